@@ -4,7 +4,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 
 #include <algorithm>
-#include <cmath>
+#include <cstdint>
 #include <vector>
 
 namespace fixwell {
@@ -25,7 +25,7 @@ std::string colorTable(const std::vector<Color>& colors)
     // Entry 0 is the reader's own text colour; ours count from 1.
     std::string table = "{\\colortbl;";
     const auto level = [](double part) {
-        return std::to_string(std::lround(part * 255));
+        return std::to_string(static_cast<int>(part * 255 + 0.5));
     };
     for (const Color& color : colors)
         table += "\\red" + level(color.red) + "\\green" + level(color.green) + "\\blue" +
@@ -63,7 +63,8 @@ std::string styleCommands(const TextStyle& style, const std::vector<Color>& colo
     std::string commands = "\\f0";
     if (style.font) {
         commands += style.font->isBold ? "\\b" : "\\b0";
-        commands += "\\fs" + std::to_string(std::lround(style.font->points * 2));  // half-points
+        commands +=
+            "\\fs" + std::to_string(static_cast<int>(style.font->points * 2 + 0.5));  // half-points
     }
     const auto found =
         style.color ? std::find(colors.begin(), colors.end(), *style.color) : colors.end();

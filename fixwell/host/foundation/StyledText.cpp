@@ -4,6 +4,7 @@
 #include "fixwell/host/foundation/Storage.h"
 
 #include <algorithm>
+#include <atomic>
 #include <deque>
 #include <mutex>
 
@@ -16,14 +17,16 @@ const TextStyle* interned(const TextStyle& style)
 {
     static std::mutex lock;
     static auto* const styles = new std::deque<TextStyle>;
-    thread_local const TextStyle* recent = nullptr;
+    static std::atomic<const TextStyle*> recent = nullptr;
 
-    if (recent != nullptr && *recent == style)
-        return recent;
+    const TextStyle* const latest = recent.load(std::memory_order_acquire);
+    if (latest != nullptr && *latest == style)
+        return latest;
     const std::lock_guard guard(lock);
     const auto found = std::find(styles->begin(), styles->end(), style);
-    recent = found != styles->end() ? &*found : &styles->emplace_back(style);
-    return recent;
+    const TextStyle* const one = found != styles->end() ? &*found : &styles->emplace_back(style);
+    recent.store(one, std::memory_order_release);
+    return one;
 }
 
 }  // namespace

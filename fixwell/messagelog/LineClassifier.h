@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/Bundle.h"
+#include "fixwell/host/foundation/PhraseMatcher.h"
+
+#include <cstdint>
+#include <optional>
+#include <string_view>
+
+namespace fixwell {
+
+/// What a plain text line of the checking tool says.
+enum FXWLineClass : int {
+    FXWLineOther = 0,
+    FXWLineFailure = 1,    ///< a problem
+    FXWLineSuccess = 2,    ///< the volume is fine, or was repaired
+    FXWLineRepairing = 3,  ///< a repair under way
+};
+
+/// Classifies a line by the result phrases of the user's language. The first phrase in their
+/// order decides, so a line that is both OK and in need of repair is a success.
+///
+/// The phrases are looked up again whenever the bundle's string tables may have changed, so an
+/// answer is always the one that a look-up per line would give.
+class LineClassifier {
+public:
+    /// `bundle` must outlive the classifier.
+    explicit LineClassifier(const Bundle& bundle) : bundle_(bundle) {}
+
+    FXWLineClass classOf(std::string_view line);
+
+private:
+    const PhraseMatcher& phrases();
+
+    const Bundle& bundle_;
+    std::optional<PhraseMatcher> phrases_;
+    std::uint64_t revision_ = 0;
+};
+
+}  // namespace fixwell

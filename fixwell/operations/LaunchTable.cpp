@@ -1,0 +1,70 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/operations/LaunchTable.h"
+
+#include "fixwell/module/Localizable.h"
+
+namespace fixwell {
+namespace {
+
+constexpr std::string_view startingVerification = "Starting verification tool: ";
+constexpr std::string_view startingRepair = "Starting repair tool: ";
+constexpr std::string_view verifyFailed = localizable("Verify failed.");
+constexpr std::string_view repairFailed = localizable("Repair failed.");
+
+}  // namespace
+
+const Launch launchVerifyDisk{
+    FXWOperationVerifyDisk,
+    localizable("Verifying volume “%@”"),
+    startingVerification,
+    verifyFailed,
+    localizable("Verify volume failed: %@\n\n"),
+    &PLRepairDisk::beginStoragesystemFilesystemVerifyForDisk,
+};
+
+const Launch launchRepairDisk{
+    FXWOperationRepairDisk,
+    localizable("Verify and Repair volume “%@”"),
+    startingRepair,
+    repairFailed,
+    localizable("Repairing volume failed: %@\n\n"),
+    &PLRepairDisk::beginStoragesystemFilesystemRepairForDisk,
+};
+
+const Launch launchVerifyPermissions{
+    FXWOperationVerifyPermissions,
+    localizable("Verifying permissions for “%@”"),
+    {},
+    verifyFailed,
+    localizable("Verify permissions failed: %@\n\n"),
+    &PLRepairDisk::beginPermissionsVerifyForDisk,
+};
+
+const Launch launchRepairPermissions{
+    FXWOperationRepairPermissions,
+    localizable("Repairing permissions for “%@”"),
+    {},
+    repairFailed,
+    localizable("Repair permissions failed: %@\n\n"),
+    &PLRepairDisk::beginPermissionsRepairForDisk,
+};
+
+const Launch launchVerifyPartitionMap{
+    FXWOperationVerifyPartitionMap,
+    localizable("Verifying partition map for “%@”"),
+    startingVerification,
+    verifyFailed,
+    {},
+    &PLRepairDisk::beginPartitionMapVerifyForDisk,
+};
+
+const Launch launchRepairPartitionMap{
+    FXWOperationRepairPartitionMap,
+    localizable("Verifying and repairing partition map for “%@”"),
+    startingRepair,
+    repairFailed,
+    {},
+    &PLRepairDisk::beginPartitionMapRepairForDisk,
+};
+
+}  // namespace fixwell

@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "fixwell/jobs/ActionCodes.h"
+
+#include <string_view>
+
+namespace fixwell {
+
+/// How an operation is announced, started and reported. The six differ in these alone.
+struct Launch {
+    FXWOperationType operationType;
+    std::string_view title;         ///< takes the disk's name
+    std::string_view startLogLine;  ///< for the activity log; empty for none
+    std::string_view failureProgressText;
+    std::string_view failureText;  ///< takes the error's text; empty for none
+    ErrorCode (PLRepairDisk::*begin)(const DiskReferencePointer&);
+};
+
+extern const Launch launchVerifyDisk;
+extern const Launch launchRepairDisk;
+extern const Launch launchVerifyPermissions;
+extern const Launch launchRepairPermissions;
+extern const Launch launchVerifyPartitionMap;
+extern const Launch launchRepairPartitionMap;
+
+constexpr bool isPermissionOperation(FXWOperationType type)
+{
+    return type == FXWOperationVerifyPermissions || type == FXWOperationRepairPermissions;
+}
+
+constexpr bool isPartitionMapOperation(FXWOperationType type)
+{
+    return type == FXWOperationVerifyPartitionMap || type == FXWOperationRepairPartitionMap;
+}
+
+}  // namespace fixwell
