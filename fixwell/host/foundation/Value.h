@@ -19,17 +19,15 @@ class StyledText;
 /// Something with an identity of its own that travels in dictionaries and notifications.
 class Object {
 public:
+    Object() = default;
+    Object(const Object&) = delete;
+    Object& operator=(const Object&) = delete;
     virtual ~Object() = default;
 
     /// "Equal by the object's own equality test"; identity unless a class knows better.
     virtual bool isEqual(const Object& other) const { return this == &other; }
     /// What a log line shows for the object.
     virtual std::string description() const { return "object"; }
-
-protected:
-    Object() = default;
-    Object(const Object&) = default;
-    Object& operator=(const Object&) = default;
 };
 
 /// Anything that a record can hold under a key, or nothing. One pointer in size; copies share.

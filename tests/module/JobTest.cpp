@@ -1,0 +1,415 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/history/CompletionReport.h"
+#include "tests/module/ModuleTest.h"
+
+namespace fixwell {
+
+// The queue
+
+TEST_F(OVFXWTest, QueuesEachDiskOnceInTheOrderOfTheSelection)
+{
+    const auto whole = addDisk("disk");
+    whole->type = OVDisk::typeWhole;
+    whole->whole = true;
+    const auto first = addDisk("disk1");
+    const auto second = addDisk("disk2");
+    select(first, whole, second, first);
+    module->verifyDisk(nullptr);
+    finish(first);
+    finish(whole);
+    finish(second);
+    const std::vector<std::string> expected{"verify disk1", "verify map disk", "verify disk2"};
+    std::vector<std::string> begun;
+    for (const std::string& entry : host.journal)
+        if (entry.starts_with("verify "))
+            begun.push_back(entry);
+    EXPECT_EQ(begun, expected);
+}
+
+TEST_F(OVFXWTest, WholeDisksAreQueuedForTheirPartitionMapAlone)
+{
+    const auto whole = addDisk("disk");
+    whole->type = OVDisk::typeWhole;
+    whole->whole = true;
+    select(whole);
+    module->repairDisk(nullptr);
+    EXPECT_TRUE(host.has("repair map disk"));
+    EXPECT_EQ(action(), FXWActionRepairPartitionMap);
+    finish(whole);
+    EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), "kOVOP_VerifyDiskKey");
+
+    host.journal.clear();
+    module->verifyPermissions(nullptr);
+    EXPECT_TRUE(host.has("lock") && host.has("unlock") && host.has("report"))
+        << "an empty queue starts and ends at once";
+    EXPECT_EQ(host.report[kOVOP_ResultKey].string(), "kOVOP_FailKey");
+    EXPECT_EQ(host.report.size(), 1U);
+
+    host.canTreatPartitionMap = false;
+    host.journal.clear();
+    module->verifyDisk(nullptr);
+    EXPECT_FALSE(host.has("verify map disk"));
+    EXPECT_EQ(action(), FXWActionNone);
+}
+
+TEST_F(OVFXWTest, EntriesCarryWhatTheJobNeedsToKnow)
+{
+    const auto disk = addDisk("a");
+    disk->name = "Data";
+    disk->mount = "/mnt";
+    disk->fileSystem.type = "qvfs";
+    select(disk);
+    module->repairDisk(nullptr);
+    const Dictionary entry = inflightItem();
+    std::vector<std::string> keys;
+    for (const auto& [key, value] : entry.entries())
+        keys.emplace_back(key.text());
+    EXPECT_EQ(keys, (std::vector<std::string>{"diskIdentifier", "volumeName", "action", "disk",
+                                              "diskWasMounted", "isQVFS", "kFXW_OperationType"}));
+    EXPECT_EQ(entry.integer(kEntryAction), 6);
+    EXPECT_EQ(entry.integer(kFXW_OperationType), 2);
+    EXPECT_TRUE(entry.boolean(kEntryIsQVFS));
+}
+
+TEST_F(OVFXWTest, StartupDiskWarningAsksBeforeAVerification)
+{
+    const auto boot = addDisk("root");
+    boot->boot = true;
+    boot->fileSystem.verifiesLive = true;
+    select(boot);
+
+    module->repairDisk(nullptr);
+    EXPECT_FALSE(host.sheet) << "only a verification warns";
+    finish(boot);
+
+    module->verifyDisk(nullptr);
+    ASSERT_TRUE(host.sheet);
+    EXPECT_EQ(action(), FXWActionNone);
+    EXPECT_EQ(host.sheet->defaultButton.key, "");
+    EXPECT_EQ(host.sheet->defaultButton.tag, 1000);
+    EXPECT_EQ(host.sheet->alternateButton.key, "\r") << "Return cancels";
+    EXPECT_EQ(host.sheet->alternateButton.tag, 1001);
+    EXPECT_FALSE(button("verifyDiskButton").enabled);
+    host.isMain = false;
+    module->selectionDidChange({OVDiskChangedNotification, nullptr, {}});
+    EXPECT_FALSE(host.sheet->defaultButton.enabled) << "the window is in the background";
+    host.isMain = true;
+
+    host.sheet->end(*host.sheet, 1001);
+    EXPECT_EQ(action(), FXWActionNone);
+    EXPECT_TRUE(module->actionList().isEmpty());
+    EXPECT_FALSE(host.has("verify root"));
+    EXPECT_TRUE(button("verifyDiskButton").enabled);
+
+    module->verifyDisk(nullptr);
+    host.sheet->end(*host.sheet, 1000);
+    EXPECT_TRUE(host.sheet->isOrderedOut);
+    EXPECT_TRUE(host.has("verify root"));
+    EXPECT_EQ(action(), FXWActionVerifyDisk);
+    finish(boot);
+
+    host.sheet.reset();
+    host.modifiers = modifierOption;
+    module->verifyDisk(nullptr);
+    EXPECT_FALSE(host.sheet) << "Option skips the warning";
+    EXPECT_EQ(host.count("verify root"), 2);
+}
+
+// The runner
+
+TEST_F(OVFXWTest, RunningStateLocksAndShowsProgress)
+{
+    const auto disk = addDisk("a");
+    select(disk);
+    module->verifyDisk(nullptr);
+    EXPECT_TRUE(host.isIndeterminate);
+    EXPECT_EQ(host.status, "Verifying volume “a”");
+    host.selection.clear();
+    host.post({OVDiskAppearedNotification, disk, {}});
+    host.post({OVDiskUnmountedNotification, disk, {}});
+    host.post({OVDiskChangedNotification, disk, {}});
+    EXPECT_EQ(module->selectionOfDisks()->size(), 1U) << "withheld while the job runs";
+    host.post({OVDiskEjectedNotification, disk, {}});
+    EXPECT_TRUE(module->selectionOfDisks()->empty()) << "ejecting is still observed";
+
+    finish(disk);
+    EXPECT_EQ(host.progress, 100.0);
+    EXPECT_EQ(host.registrations.size(), 4U);
+    EXPECT_EQ(action(), FXWActionNone);
+    EXPECT_FALSE(inflightDisk());
+    EXPECT_FALSE(host.isLocked);
+}
+
+TEST_F(OVFXWTest, OneBadDiskNeverStallsTheJob)
+{
+    const auto first = addDisk("a");
+    const auto second = addDisk("b");
+    const auto gone = addDisk("gone");
+    gone->reference.reset();
+    host.refusals = {{"a", kPLErrorToolMissing}, {"b", kPLErrorCouldNotUnmount}};
+    select(first, gone, second);
+    module->verifyDisk(nullptr);
+    EXPECT_TRUE(host.has("verify a") && host.has("verify b"));
+    EXPECT_TRUE(host.has("report"));
+    EXPECT_EQ(action(), FXWActionNone);
+    EXPECT_EQ(linesOf(first), (std::vector<std::string>{"Verifying volume “a”\n",
+                                                        "Verify volume failed: error -69704\n\n"}));
+    EXPECT_EQ(linesOf(second), (std::vector<std::string>{"Verifying volume “b”\n",
+                                                         "The disk “b” could not be unmounted\n"}));
+    EXPECT_EQ(linesOf(gone), (std::vector<std::string>{"Verifying volume “gone”\n"}));
+    EXPECT_EQ(verbosityOf(first->history.back().dictionary()), -2)
+        << "the failed attempt is closed";
+    EXPECT_EQ(verbosityOf(gone->history.back().dictionary()), -1) << "silently";
+}
+
+TEST_F(OVFXWTest, StopEndsTheJobInOrder)
+{
+    const auto first = addDisk("a");
+    const auto second = addDisk("b");
+    const auto third = addDisk("c");
+    first->mount = "/mnt/a";
+    select(first, second, third);
+    module->verifyDisk(nullptr);
+    EXPECT_EQ(button("verifyDiskButton").action, "stopAction:");
+    module->perform("stopAction:", nullptr);
+    EXPECT_FALSE(button("verifyDiskButton").enabled);
+    EXPECT_TRUE(host.has("cancel"));
+    EXPECT_EQ(completedList().size(), 2U) << "the waiting entries count as finished";
+    EXPECT_TRUE(inflightItem().boolean(kEntryStoppedByUser));
+    EXPECT_FALSE(host.has("report")) << "not before the tool has ended";
+
+    finish(first, kPLErrorCancelled);
+    EXPECT_TRUE(host.has("report"));
+    EXPECT_EQ(linesOf(first),
+              (std::vector<std::string>{"Verifying volume “a”\n", "Stopped by user\n"}));
+    EXPECT_TRUE(linesOf(second).empty());
+    EXPECT_FALSE(host.has("verify b"));
+
+    // After one stop, a job that ends well is remounted two seconds later as well.
+    select(second);
+    module->verifyDisk(nullptr);
+    finish(second);
+    EXPECT_TRUE(host.has("timer 2.0"));
+}
+
+TEST_F(OVFXWTest, RemountsAfterAStopWhatWasMountedBefore)
+{
+    const auto stopped = addDisk("a");
+    const auto other = addDisk("b");
+    const auto never = addDisk("c");
+    stopped->mount = "/mnt/a";
+    never->mount = "";
+    select(stopped, never, other);
+    module->verifyDisk(nullptr);
+    module->stopAction(nullptr);
+    stopped->mount.clear();
+    const Dictionary entry = inflightItem();
+    finish(stopped, kPLNoError);  // it had ended by itself
+    ASSERT_EQ(host.timers.size(), 1U);
+
+    // The job is over and its list is empty when the timer fires; a new one is looked through.
+    select(other, stopped);
+    host.journal.clear();
+    other->mount = "/mnt/b";
+    module->verifyDisk(nullptr);
+    fileAsCompleted(entry);
+    host.timers.front()();
+    EXPECT_TRUE(host.has("mount a synchronously"));
+    EXPECT_FALSE(host.has("mount c synchronously"));
+}
+
+TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
+{
+    struct Case {
+        FXWAction action;
+        bool isBoot;
+        bool isHome;
+        ErrorCode shown;
+    };
+    for (const Case& c : {Case{FXWActionVerifyDisk, true, false, -19997},
+                          Case{FXWActionVerifyDisk, false, true, -19997},
+                          Case{FXWActionVerifyDisk, false, false, -19998},
+                          Case{FXWActionRepairDisk, true, false, -19996},
+                          Case{FXWActionRepairDisk, false, false, -19996},
+                          Case{FXWActionVerifyPermissions, false, true, -19998},
+                          Case{FXWActionVerifyPermissions, true, false, -19997},
+                          Case{FXWActionRepairPermissions, true, false, -19997}}) {
+        const auto disk = addDisk("d" + std::to_string(host.disks.size()));
+        disk->boot = c.isBoot;
+        disk->home = c.isHome;
+        host.refusals[disk->identifier] = kPLErrorDiskInUse;
+        host.modifiers = modifierOption;
+        select(disk);
+        const Selector selectors[] = {"", "verifyPermissions:", "repairPermissions:", "",
+                                      "", "verifyDisk:",        "repairDisk:"};
+        module->perform(selectors[c.action], nullptr);
+        EXPECT_NE(linesOf(disk)[1].find("error " + std::to_string(c.shown)), std::string::npos)
+            << c.action << " " << linesOf(disk)[1];
+    }
+}
+
+TEST_F(OVFXWTest, AFailedPartitionMapJobIsQuiet)
+{
+    const auto whole = addDisk("disk");
+    whole->type = OVDisk::typeWhole;
+    whole->whole = true;
+    host.refusals["disk"] = kPLErrorCouldNotUnmount;
+    select(whole);
+    module->verifyDisk(nullptr);
+    EXPECT_EQ(linesOf(whole), (std::vector<std::string>{"Verifying partition map for “disk”\n"}));
+    EXPECT_EQ(host.status, "Verify failed.");
+}
+
+TEST_F(OVFXWTest, ADiskThatAFailedStartUnmountedIsMountedAgain)
+{
+    const auto disk = addDisk("a");
+    disk->mount = "/mnt";
+    host.refusals["a"] = kPLErrorToolMissing;
+    select(disk);
+    module->verifyDisk(nullptr);
+    EXPECT_FALSE(host.has("mount a")) << "still mounted";
+    host.whenBegun = [&disk] {
+        disk->mount.clear();
+    };
+    module->verifyDisk(nullptr);
+    EXPECT_TRUE(host.has("mount a"));
+}
+
+TEST_F(OVFXWTest, DryRunOnlyAnnounces)
+{
+    const auto disk = addDisk("a");
+    select(disk);
+    module->setActionList(Array::of({makeActionListEntry(disk, FXWActionVerifyPermissions)}));
+    simulate();
+    EXPECT_EQ(linesOf(disk), (std::vector<std::string>{"Fake Verify permissions for \"a\"\n"}));
+    EXPECT_FALSE(host.has("verify permissions a"));
+}
+
+// Disk images
+
+TEST_F(OVFXWTest, ImagesAreAttachedFirstAndEjectedAfterwards)
+{
+    const auto image = [this](const std::string& path) {
+        auto disk = addDisk(path);
+        disk->type = OVDisk::typeDiskImage;
+        disk->imagePath = path;
+        disk->offlineImage = true;
+        return disk;
+    };
+    const auto top = addDisk("top");
+    top->whole = true;
+    top->type = OVDisk::typeWhole;
+    const auto volume1 = addDisk("top#1");
+    const auto volume2 = addDisk("top#2");
+    top->volumes = {volume1, volume2};
+    const auto bare = addDisk("bare");
+    host.images = {{"/gpt.img", top}, {"/bare.img", bare}};
+    const auto plain = addDisk("sda1");
+    select(image("/gpt.img"), plain, image("/broken.img"), image("/bare.img"));
+
+    module->verifyDisk(nullptr);
+    ASSERT_EQ(host.workers.size(), 3U);
+    EXPECT_TRUE(host.has("lock")) << "the job is running already";
+    for (const auto& worker : host.workers) {
+        EXPECT_FALSE(host.has("verify sda1")) << "not before all have reported";
+        worker();
+        host.runTasks();
+    }
+    EXPECT_EQ(host.count("sleep 0.5"), 2);
+    EXPECT_NE(
+        std::find(host.developerLog.begin(), host.developerLog.end(), "2 attach failed: -69706"),
+        host.developerLog.end());
+    for (const auto& disk : {plain, volume1, volume2, bare}) {
+        EXPECT_TRUE(host.has("verify " + disk->identifier)) << disk->identifier;
+        EXPECT_FALSE(host.has("eject bare synchronously"));
+        finish(disk);
+    }
+    EXPECT_TRUE(host.has("eject top synchronously") && host.has("eject bare synchronously"));
+    EXPECT_TRUE(host.has("report"));
+}
+
+TEST_F(OVFXWTest, AnImageWithoutAPathNeverStartsTheJob)
+{
+    const auto disk = addDisk("nowhere");
+    disk->type = OVDisk::typeDiskImage;
+    select(disk, addDisk("a"));
+    module->repairDisk(nullptr);
+    host.workers.front()();
+    host.runTasks();
+    EXPECT_FALSE(host.has("repair a"));
+    EXPECT_EQ(action(), FXWActionRepairDisk);
+}
+
+// The end of a job
+
+TEST_F(OVFXWTest, OneReportAndOneWarningPerJob)
+{
+    const auto first = addDisk("a");
+    const auto second = addDisk("b");
+    const auto third = addDisk("c");
+    second->name = "B %@ \n";
+    select(first, second, third);
+    module->verifyDisk(nullptr);
+    finish(first);
+    finish(second, kPLErrorDamaged);
+    finish(third, kPLErrorToolFailed);
+    EXPECT_EQ(host.count("report"), 1);
+    EXPECT_EQ(host.report[kOVOP_ResultKey].string(), "kOVOP_SuccessKey");
+    EXPECT_EQ(host.report[kOVOP_DiskIdentifierKey].string(), "a");
+    EXPECT_EQ(host.report[kOVOP_DiskKey].object(), first);
+    EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), "kOVOP_VerifyDiskKey");
+    EXPECT_TRUE(host.has("alert [Orvane stopped verifying “B %@ \n”] [error -69701] 0"));
+    EXPECT_EQ(std::count_if(host.journal.begin(), host.journal.end(),
+                            [](const auto& entry) { return entry.starts_with("alert"); }),
+              1);
+    EXPECT_EQ(linesOf(second).back(), "\n");
+    EXPECT_TRUE(host.has("mount b with children")) << "a failed disk is mounted at once";
+    EXPECT_FALSE(host.has("mount a with children"));
+}
+
+TEST(CompletionReport, NamesTheFirstEntryAndItsAction)
+{
+    struct Case {
+        FXWAction action;
+        std::string_view key;
+    };
+    const auto disk = std::make_shared<testing::FakeDisk>("a");
+    for (const Case& c : {Case{FXWActionVerifyPermissions, "kOVOP_VerifyDiskPermissionsKey"},
+                          Case{FXWActionRepairPermissions, "kOVOP_RepairDiskPermissionsKey"},
+                          Case{FXWActionVerifyPartitionMap, "kOVOP_VerifyDiskKey"},
+                          Case{FXWActionRepairPartitionMap, "kOVOP_VerifyDiskKey"},
+                          Case{FXWActionVerifyDisk, "kOVOP_VerifyDiskKey"},
+                          Case{FXWActionRepairDisk, "kOVOP_RepairDiskKey"}})
+        EXPECT_EQ(makeCompletionReport(Array::of({makeActionListEntry(disk, c.action)}))
+                      .string(kOVOP_ActionTypeKey),
+                  c.key);
+}
+
+TEST(Warnings, TheFirstDiskOperationWithAWarningSpeaks)
+{
+    const auto entry = [](FXWOperationType type, Value warning) {
+        const Dictionary made = Dictionary::of(
+            {{kFXW_OperationType, static_cast<int>(type)}, {kEntryPostWarningTitle, "title"}});
+        made.set(kEntryPostWarning, std::move(warning));
+        return made;
+    };
+    struct Case {
+        Array completed;
+        std::optional<PostedWarning> expected;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{{}, std::nullopt, "nothing was done"},
+          Case{Array::of({entry(FXWOperationRepairPermissions, "w")}), std::nullopt,
+               "permission runs never warn"},
+          Case{Array::of({entry(FXWOperationVerifyDisk, {}), entry(FXWOperationRepairDisk, "x"),
+                          entry(FXWOperationRepairDisk, "y")}),
+               PostedWarning{"title", "x"}, "the first"},
+          Case{Array::of({entry(FXWOperationVerifyDisk, "")}), PostedWarning{},
+               "an empty warning still closes the job with an empty alert"},
+          Case{Array::of({entry(FXWOperationVerifyDisk, ""), entry(FXWOperationVerifyDisk, {})}),
+               std::nullopt, "only the last entry's counts then"}})
+        EXPECT_EQ(warningToPost(c.completed), c.expected) << c.because;
+}
+
+}  // namespace fixwell
