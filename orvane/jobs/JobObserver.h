@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/PLRepairDisk.h"
+
+#include <string_view>
+
+namespace orvane {
+
+/// What a job does to its disk.
+enum class Operation {
+    VerifyDisk,
+    RepairDisk,
+    VerifyPermissions,
+    RepairPermissions,
+    VerifyPartitionMap,
+    RepairPartitionMap,
+};
+
+/// "verify", "repair-permissions", ...: stable names for files and other programs.
+std::string_view nameOf(Operation operation);
+
+/// Hears of every job of a module, besides the module itself. Main thread only.
+class JobObserver {
+public:
+    virtual ~JobObserver() = default;
+
+    /// Before the library is asked. The module has announced the job in the disk's history.
+    virtual void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) = 0;
+    /// The library refused; the job is over.
+    virtual void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
+                                fixwell::ErrorCode error) = 0;
+    /// Before the module hears of it. `result` has the result keys.
+    virtual void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
+                               const fixwell::Dictionary& result) = 0;
+};
+
+}  // namespace orvane

@@ -1,0 +1,97 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/SupportHost.h"
+
+#include "orvane/support/disks/SystemDisks.h"
+#include "orvane/support/texts/DecimalNumbers.h"
+#include "orvane/support/texts/Language.h"
+#include "orvane/support/time/TimeEstimator.h"
+
+#include <utility>
+
+namespace orvane {
+namespace {
+
+constexpr const char* hostTable = "Orvane";
+
+std::filesystem::path in(const std::filesystem::path& directory, const char* name)
+{
+    return directory.empty() ? directory : directory / name;
+}
+
+Translator translatorOf(const ModuleBundle& bundle)
+{
+    Translator translator;
+    translator.text = [&bundle](std::string_view key) {
+        return bundle.catalogue().translate(hostTable, key);
+    };
+    translator.plural = [&bundle](std::string_view one, std::string_view many, long count) {
+        return bundle.catalogue().translatePlural(hostTable, one, many, count);
+    };
+    return translator;
+}
+
+}  // namespace
+
+SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
+    : options_(std::move(options)),
+      loop_(loop),
+      bundle_(options_.hostBundle, hostTable),
+      translator_(translatorOf(bundle_)),
+      // The logs' own trouble cannot go to the log.
+      log_({options_.paths.state, options_.keptLogLevel, options_.shownLogLevel, {}},
+           [this](const std::string& sentence) {
+               if (options_.warn)
+                   options_.warn(sentence);
+           }),
+      settings_(in(options_.paths.config, "settings.json"),
+                [this](const std::string& sentence) { warn(sentence); }),
+      preferences_(settings_),
+      store_(options_.keepsHistory ? in(options_.paths.state, "history.sqlite3") : "",
+             options_.historyLimits, [this](const std::string& sentence) { warn(sentence); }),
+      histories_(store_),
+      disks_(center_, {options_.capabilities, &histories_}),
+      images_({options_.capabilities, &histories_}, translator_),
+      threads_(loop)
+{
+    disks_.hooks().warn = [this](const std::string& sentence) {
+        warn(sentence);
+    };
+}
+
+SupportHost::~SupportHost()
+{
+    histories_.saveNew();
+}
+
+void SupportHost::warn(const std::string& sentence)
+{
+    log_.ov_log(fixwell::OVLog::error, 0, sentence);
+    if (options_.warn)
+        options_.warn(sentence);
+}
+
+std::unique_ptr<fixwell::OVTimeEstimator> SupportHost::makeTimeEstimator()
+{
+    return std::make_unique<TimeEstimator>([] { return std::chrono::system_clock::now(); },
+                                           translator_);
+}
+
+std::string SupportHost::OVLocalizedErrorString(fixwell::ErrorCode code)
+{
+    std::string text = options_.errorText ? options_.errorText(code) : std::string();
+    return text.empty() ? translator_.sentence("error %ld", {code}) : text;
+}
+
+std::string SupportHost::decimalString(const fixwell::Value& number)
+{
+    return decimalText(number, currentLanguage());
+}
+
+void SupportHost::refreshDisks()
+{
+    DiskSources sources;
+    sources.homeDirectory = environmentValue("HOME").value_or("");
+    disks_.synchronize(readSystemDisks(sources));
+}
+
+}  // namespace orvane

@@ -1,0 +1,93 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/OVDisk.h"
+#include "orvane/support/disks/DiskFacts.h"
+#include "orvane/support/disks/DiskFilesystem.h"
+#include "orvane/support/disks/HistoryKeeper.h"
+
+#include <memory>
+#include <optional>
+#include <vector>
+
+namespace orvane {
+
+/// A disk of the host: facts, and where its history is kept. Main thread only, except that any
+/// thread may make one and hand it over.
+class Disk final : public fixwell::OVDisk, public std::enable_shared_from_this<Disk> {
+public:
+    /// What every disk needs of the host. All must outlive the disks.
+    struct Surroundings {
+        CapabilityLookup capabilities;
+        HistoryKeeper* histories = nullptr;
+    };
+
+    /// A disk and, below it, its children.
+    static std::shared_ptr<Disk> make(const DiskTree& tree, const Surroundings& surroundings);
+    Disk(DiskFacts facts, Surroundings surroundings);
+
+    const DiskFacts& facts() const { return facts_; }
+    /// The identifier must stay as it is.
+    void setFacts(const DiskFacts& facts);
+    const std::vector<std::shared_ptr<Disk>>& parts() const { return children_; }
+    void setParts(std::vector<std::shared_ptr<Disk>> parts);
+    /// An image file shows the histories of what was found in it, also after it was detached.
+    void setContents(std::shared_ptr<Disk> contents) { contents_ = std::move(contents); }
+
+    std::string diskIdentifier() const override { return facts_.identifier; }
+    std::string displayName() const override { return facts_.displayName; }
+    std::int32_t diskType() const override { return facts_.type; }
+    std::int64_t diskNumber() const override { return facts_.number; }
+    bool isWhole() const override { return facts_.isWhole; }
+    std::shared_ptr<OVDisk> parentDisk() const override { return parent_.lock(); }
+    std::vector<std::shared_ptr<OVDisk>> children() const override;
+    std::string mountPoint() const override { return facts_.mountPoint; }
+    bool isMounted() const override { return !facts_.mountPoint.empty(); }
+    bool isWritableVolume() const override { return facts_.isWritable; }
+    bool isBootVolume() const override { return facts_.isBootVolume; }
+    bool containUserHomeDirectory() const override { return facts_.containsUserHome; }
+    /// Nothing here reads the self-monitoring of drives yet, so no disk is left out for it.
+    bool hasSMARTError() const override { return false; }
+    bool isDVDRAM() const override { return false; }
+    bool hasBlankOpticalMedia() const override { return facts_.isBlankOptical; }
+    bool isOfflineDiskImage() const override { return facts_.type == diskType::diskImage; }
+    std::string diskImagePath() const override { return facts_.imagePath.native(); }
+    bool permissionsEnabled() const override { return false; }
+    bool canRepairPermissions() const override { return false; }
+    const fixwell::OVFilesystem* filesystem() const override;
+    fixwell::DiskReferencePointer theKRDisk() const override { return reference_; }
+
+    fixwell::Array fsckHistory() const override;
+    fixwell::Array fsckHistoryNoChildren() const override;
+    void setFsckHistory(const fixwell::Array& history) override;
+    bool clearFsckHistory() override;
+
+private:
+    /// The histories that a merged one was put together from: enough to see that none of them has
+    /// changed since.
+    struct Part {
+        fixwell::Array history;
+        std::size_t size;
+        fixwell::Value first;
+        fixwell::Value last;
+
+        bool isCurrent(const fixwell::Array& other) const;
+    };
+
+    std::vector<std::shared_ptr<Disk>> inside() const;
+    void collectHistories(std::vector<fixwell::Array>& histories) const;
+
+    DiskFacts facts_;
+    Surroundings surroundings_;
+    std::optional<DiskFilesystem> filesystem_;
+    fixwell::DiskReferencePointer reference_;
+    std::weak_ptr<Disk> parent_;
+    std::vector<std::shared_ptr<Disk>> children_;
+    std::shared_ptr<Disk> contents_;
+
+    mutable fixwell::Array own_;
+    mutable fixwell::Array merged_;
+    mutable std::vector<Part> mergedFrom_;
+};
+
+}  // namespace orvane

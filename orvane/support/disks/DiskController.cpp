@@ -1,0 +1,250 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/disks/DiskController.h"
+
+#include <algorithm>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+using fixwell::OVDiskPointer;
+
+bool isOfImage(const Disk& disk)
+{
+    return disk.facts().storage == fixwell::DiskReference::Storage::FileRegion;
+}
+
+bool isVolume(const Disk& disk)
+{
+    const std::int32_t type = disk.diskType();
+    return type == diskType::volume || type == diskType::bareVolume || type == diskType::assembled;
+}
+
+void collect(const std::shared_ptr<Disk>& disk, std::vector<std::shared_ptr<Disk>>& all)
+{
+    all.push_back(disk);
+    for (const auto& child : disk->parts())
+        collect(child, all);
+}
+
+DiskFacts factsOf(const fixwell::DiskReference& reference)
+{
+    DiskFacts facts;
+    facts.identifier = reference.identifier;
+    facts.displayName = reference.name;
+    facts.type = reference.isWhole ? diskType::whole : diskType::volume;
+    facts.isWhole = reference.isWhole;
+    facts.storage = reference.storage;
+    facts.path = reference.path;
+    facts.offset = reference.offset;
+    facts.length = reference.length;
+    facts.filesystem = reference.filesystem;
+    facts.mountPoint = reference.mountPoint;
+    return facts;
+}
+
+}  // namespace
+
+std::vector<std::shared_ptr<Disk>> withParts(const std::shared_ptr<Disk>& disk)
+{
+    std::vector<std::shared_ptr<Disk>> all;
+    collect(disk, all);
+    return all;
+}
+
+DiskController::DiskController(fixwell::NotificationCenter& center, Disk::Surroundings surroundings)
+    : center_(center), surroundings_(std::move(surroundings))
+{
+}
+
+std::shared_ptr<Disk> DiskController::find(const std::function<bool(const Disk&)>& isMeant) const
+{
+    for (const auto& root : roots_)
+        for (const auto& disk : withParts(root))
+            if (isMeant(*disk))
+                return disk;
+    return nullptr;
+}
+
+std::shared_ptr<Disk> DiskController::diskNamed(std::string_view identifier) const
+{
+    return find([=](const Disk& disk) { return disk.facts().identifier == identifier; });
+}
+
+std::shared_ptr<Disk> DiskController::add(const DiskFacts& facts)
+{
+    if (auto known = diskNamed(facts.identifier))
+        return known;
+    auto disk = std::make_shared<Disk>(facts, surroundings_);
+    roots_.push_back(disk);
+    appear(disk);
+    return disk;
+}
+
+std::shared_ptr<Disk> DiskController::addImage(const DiskFacts& facts)
+{
+    return add(facts);
+}
+
+std::shared_ptr<Disk> DiskController::addDevice(const DiskFacts& facts)
+{
+    return add(facts);
+}
+
+void DiskController::adopt(const std::shared_ptr<Disk>& top)
+{
+    if (diskNamed(top->facts().identifier) != nullptr)
+        return;
+    const auto image = find([&](const Disk& disk) {
+        return disk.isOfflineDiskImage() && disk.facts().imagePath == top->facts().path;
+    });
+    if (image)
+        image->setContents(top);
+    roots_.push_back(top);
+    appear(top);
+}
+
+void DiskController::post(fixwell::Name name, const std::shared_ptr<Disk>& disk)
+{
+    center_.post({name, disk, {}});
+}
+
+void DiskController::appear(const std::shared_ptr<Disk>& disk)
+{
+    for (const auto& part : withParts(disk))
+        post(fixwell::OVDiskAppearedNotification, part);
+}
+
+// First forgotten, then told: whoever hears of it must not find the disk any more. The parts are
+// told before the whole.
+void DiskController::forget(const std::shared_ptr<Disk>& root)
+{
+    std::erase(roots_, root);
+    auto gone = withParts(root);
+    std::reverse(gone.begin(), gone.end());
+    for (const auto& disk : gone)
+        post(fixwell::OVDiskEjectedNotification, disk);
+}
+
+void DiskController::synchronize(const std::vector<DiskTree>& systemDisks)
+{
+    const auto previous = roots_;
+    for (const auto& root : previous) {
+        const bool isThere =
+            std::any_of(systemDisks.begin(), systemDisks.end(), [&](const DiskTree& tree) {
+                return tree.facts.identifier == root->facts().identifier;
+            });
+        if (!isOfImage(*root) && !isThere)
+            forget(root);
+    }
+    for (const DiskTree& tree : systemDisks) {
+        if (const auto known = diskNamed(tree.facts.identifier)) {
+            update(known, tree);
+        } else {
+            roots_.push_back(Disk::make(tree, surroundings_));
+            appear(roots_.back());
+        }
+    }
+}
+
+void DiskController::update(const std::shared_ptr<Disk>& disk, const DiskTree& tree)
+{
+    const bool wasMounted = disk->isMounted();
+    const bool isOther = disk->facts() != tree.facts;
+    disk->setFacts(tree.facts);
+
+    const auto before = disk->parts();
+    std::vector<std::shared_ptr<Disk>> now;
+    std::vector<std::shared_ptr<Disk>> made;
+    for (const DiskTree& child : tree.children) {
+        const auto known = std::find_if(before.begin(), before.end(), [&](const auto& part) {
+            return part->facts().identifier == child.facts.identifier;
+        });
+        if (known == before.end())
+            made.push_back(Disk::make(child, surroundings_));
+        now.push_back(known != before.end() ? *known : made.back());
+    }
+    disk->setParts(now);
+
+    if (isOther)
+        post(wasMounted && !disk->isMounted() ? fixwell::OVDiskUnmountedNotification
+                                              : fixwell::OVDiskChangedNotification,
+             disk);
+    for (const auto& part : before)
+        if (std::find(now.begin(), now.end(), part) == now.end())
+            post(fixwell::OVDiskEjectedNotification, part);
+    for (std::size_t i = 0; i < now.size(); ++i)
+        if (std::find(made.begin(), made.end(), now[i]) == made.end())
+            update(now[i], tree.children[i]);
+    for (const auto& part : made)
+        appear(part);
+}
+
+OVDiskPointer DiskController::diskWithIdentifier(std::string_view identifier)
+{
+    return diskNamed(identifier);
+}
+
+OVDiskPointer DiskController::diskWithKRDisk(const fixwell::DiskReferencePointer& disk)
+{
+    return disk ? diskNamed(disk->identifier) : nullptr;
+}
+
+OVDiskPointer DiskController::findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk)
+{
+    if (!disk)
+        return nullptr;
+    return add(factsOf(*disk));
+}
+
+std::vector<OVDiskPointer> DiskController::viewablePartitions(const OVDiskPointer& disk)
+{
+    const auto top = std::dynamic_pointer_cast<Disk>(disk);
+    if (!top)
+        return {};
+    adopt(top);
+    std::vector<OVDiskPointer> volumes;
+    for (const auto& part : withParts(top))
+        if (part->facts().isShown && isVolume(*part))
+            volumes.push_back(part);
+    return volumes;
+}
+
+void DiskController::warn(const Outcome<>& outcome)
+{
+    if (failed(outcome) && hooks_.warn)
+        hooks_.warn(failureMessage(outcome));
+}
+
+void DiskController::mountDisk(const OVDiskPointer& disk, bool includeChildren,
+                               bool /*synchronous*/)
+{
+    const auto top = std::dynamic_pointer_cast<Disk>(disk);
+    if (!top || !hooks_.mount)
+        return;
+    for (const auto& part : includeChildren ? withParts(top) : std::vector{top})
+        if (isVolume(*part) && !isOfImage(*part) && !part->isMounted())
+            warn(hooks_.mount(*part));
+}
+
+void DiskController::ejectDisk(const OVDiskPointer& disk, bool /*synchronous*/)
+{
+    const auto top = std::dynamic_pointer_cast<Disk>(disk);
+    if (!top)
+        return;
+    if (isOfImage(*top)) {
+        if (std::find(roots_.begin(), roots_.end(), top) != roots_.end())
+            forget(top);
+    } else if (hooks_.eject) {
+        warn(hooks_.eject(*top));
+    }
+}
+
+void DiskController::notifyFrontmostModulesOnly(fixwell::Name name,
+                                                const fixwell::Notification& notification)
+{
+    if (hooks_.notifyFrontmost)
+        hooks_.notifyFrontmost(name, notification);
+}
+
+}  // namespace orvane

@@ -1,0 +1,78 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/OVDiskController.h"
+#include "orvane/support/Failure.h"
+#include "orvane/support/disks/Disk.h"
+
+#include <functional>
+#include <memory>
+#include <string_view>
+#include <vector>
+
+namespace orvane {
+
+/// The disks that the host knows: those of the system, the image files that the user has named,
+/// and the attached contents of images. Main thread only; posts what happens to the disks.
+class DiskController final : public fixwell::OVDiskController {
+public:
+    /// What reaches outside. An empty function is an operation that cannot be done here.
+    struct Hooks {
+        std::function<Outcome<>(const Disk& disk)> mount;
+        std::function<Outcome<>(const Disk& disk)> eject;
+        /// How notifyFrontmostModulesOnly delivers.
+        std::function<void(fixwell::Name name, const fixwell::Notification&)> notifyFrontmost;
+        WarningSink warn;
+    };
+
+    /// The notification centre must outlive this object.
+    DiskController(fixwell::NotificationCenter& center, Disk::Surroundings surroundings);
+
+    Hooks& hooks() { return hooks_; }
+
+    /// The top of every tree of disks, in the order in which they became known.
+    const std::vector<std::shared_ptr<Disk>>& roots() const { return roots_; }
+    std::shared_ptr<Disk> diskNamed(std::string_view identifier) const;
+    /// The first in tree order for which `isMeant` answers YES; none when there is none.
+    std::shared_ptr<Disk> find(const std::function<bool(const Disk&)>& isMeant) const;
+
+    /// Takes in an image file that is not attached; the one known already when there is one.
+    std::shared_ptr<Disk> addImage(const DiskFacts& facts);
+    /// Takes in a device that the system's list does not have, until the next `synchronize`.
+    std::shared_ptr<Disk> addDevice(const DiskFacts& facts);
+    /// Makes the disk of an attached image known, with all its parts. Once is enough.
+    void adopt(const std::shared_ptr<Disk>& top);
+    /// Brings the system's disks up to date: what is new appears, what has gone is ejected, what
+    /// is different is changed or unmounted. Image files and their contents stay.
+    void synchronize(const std::vector<DiskTree>& systemDisks);
+
+    fixwell::OVDiskPointer diskWithIdentifier(std::string_view identifier) override;
+    fixwell::OVDiskPointer diskWithKRDisk(const fixwell::DiskReferencePointer& disk) override;
+    fixwell::OVDiskPointer findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk) override;
+    /// The main thread sees an attached image here first, so an unknown disk is adopted.
+    std::vector<fixwell::OVDiskPointer> viewablePartitions(
+        const fixwell::OVDiskPointer& disk) override;
+    void mountDisk(const fixwell::OVDiskPointer& disk, bool includeChildren,
+                   bool synchronous) override;
+    void ejectDisk(const fixwell::OVDiskPointer& disk, bool synchronous) override;
+    void notifyFrontmostModulesOnly(fixwell::Name name,
+                                    const fixwell::Notification& notification) override;
+
+private:
+    std::shared_ptr<Disk> add(const DiskFacts& facts);
+    void post(fixwell::Name name, const std::shared_ptr<Disk>& disk);
+    void appear(const std::shared_ptr<Disk>& disk);
+    void forget(const std::shared_ptr<Disk>& root);
+    void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
+    void warn(const Outcome<>& outcome);
+
+    fixwell::NotificationCenter& center_;
+    Disk::Surroundings surroundings_;
+    Hooks hooks_;
+    std::vector<std::shared_ptr<Disk>> roots_;
+};
+
+/// The disk and everything below it, each before its children.
+[[nodiscard]] std::vector<std::shared_ptr<Disk>> withParts(const std::shared_ptr<Disk>& disk);
+
+}  // namespace orvane

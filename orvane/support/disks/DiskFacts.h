@@ -1,0 +1,51 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/DiskReference.h"
+#include "orvane/support/disks/DiskTypes.h"
+
+#include <cstdint>
+#include <filesystem>
+#include <string>
+#include <vector>
+
+namespace orvane {
+
+/// What is known about a disk at one moment. Any thread may put it together. Labels and models
+/// are as they stand on the medium: any bytes.
+struct DiskFacts {
+    std::string identifier;  ///< of a device its node's path; of a part of an image "PATH#NUMBER"
+    std::string displayName;
+    std::int32_t type = diskType::whole;
+    std::int64_t number = 0;
+    bool isWhole = false;
+    /// Stands in the list of volumes that the user may work on.
+    bool isShown = true;
+
+    fixwell::DiskReference::Storage storage = fixwell::DiskReference::Storage::BlockDevice;
+    std::filesystem::path path;  ///< of the device node or the image file
+    std::uint64_t offset = 0;    ///< bytes
+    std::uint64_t length = 0;    ///< bytes; what the partition map states, even beyond the end
+
+    std::string filesystem;  ///< as libblkid names it; empty when unknown
+    std::string label;
+    std::string uuid;  ///< of the file system
+
+    std::string mountPoint;  ///< empty when not mounted
+    bool isWritable = true;
+    bool isBootVolume = false;
+    bool containsUserHome = false;
+    bool isBlankOptical = false;
+
+    std::filesystem::path imagePath;  ///< of an image file that is not attached
+
+    friend bool operator==(const DiskFacts&, const DiskFacts&) = default;
+};
+
+/// A disk with the disks inside it.
+struct DiskTree {
+    DiskFacts facts;
+    std::vector<DiskTree> children;
+};
+
+}  // namespace orvane

@@ -1,0 +1,245 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/disks/SystemDisks.h"
+
+#include "orvane/support/disks/BlockProbe.h"
+#include "orvane/support/disks/UdevDatabase.h"
+#include "orvane/support/files/FileDescriptor.h"
+#include "orvane/support/files/WholeFile.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <sys/sysmacros.h>
+
+#include <fmt/format.h>
+#include <algorithm>
+#include <charconv>
+#include <map>
+#include <tuple>
+
+namespace orvane {
+namespace {
+
+namespace fs = std::filesystem;
+
+/// One attribute of a device in /sys, without the line end; empty when it has none.
+std::string attribute(const fs::path& device, const char* name)
+{
+    const auto contents = readWholeFile(device / name, 4096);
+    std::string text = contents.index() == 0 ? std::get<0>(contents) : std::string();
+    text.erase(text.find_last_not_of(" \n") + 1);
+    return text;
+}
+
+std::uint64_t numberIn(const std::string& text)
+{
+    std::uint64_t number = 0;
+    std::from_chars(text.data(), text.data() + text.size(), number);
+    return number;
+}
+
+// The unit of "size" is 512 bytes whatever the device's sectors are (linux/blk_types.h).
+std::uint64_t sizeOf(const fs::path& device)
+{
+    return numberIn(attribute(device, "size")) * 512;
+}
+
+std::vector<fs::path> sortedEntries(const fs::path& directory)
+{
+    std::vector<fs::path> entries;
+    std::error_code error;
+    for (fs::directory_iterator entry(directory, error), end; !error && entry != end;
+         entry.increment(error))
+        entries.push_back(entry->path());
+    // "sda2" before "sda10".
+    std::sort(entries.begin(), entries.end(), [](const fs::path& a, const fs::path& b) {
+        return std::make_tuple(a.native().size(), a.native()) <
+               std::make_tuple(b.native().size(), b.native());
+    });
+    return entries;
+}
+
+bool isLeftOut(const fs::path& device)
+{
+    const std::string name = device.filename();
+    const bool isMemory = name.starts_with("ram") || name.starts_with("zram");
+    const bool isOptical = name.starts_with("sr");
+    return isMemory || (sizeOf(device) == 0 && !isOptical);
+}
+
+Superblock superblockFromUdev(const std::string& number, const DiskSources& sources)
+{
+    const auto contents = readWholeFile(sources.udevData / ("b" + number), 1U << 20U);
+    if (contents.index() != 0)
+        return {};
+    auto properties = parseUdevProperties(std::get<0>(contents));
+    return {properties["ID_FS_USAGE"], properties["ID_FS_TYPE"],
+            decodeUdevName(properties["ID_FS_LABEL_ENC"]), properties["ID_FS_UUID"]};
+}
+
+/// What can be found out by reading the device, or about it where it may not be read.
+struct Contents {
+    Superblock superblock;
+    std::optional<PartitionTable> table;
+    bool hasExtBackup = false;
+    bool hasTableTraces = false;
+};
+
+Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
+                    const DiskSources& sources)
+{
+    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    if (!device.isOpen())
+        return {superblockFromUdev(number, sources), {}, false, false};
+    const ByteRange all{0, size};
+    Contents contents{readSuperblock(device.number(), all), readPartitionTable(device.number()),
+                      hasExtBackupSuperblock(device.number(), all),
+                      hasPartitionTableTraces(device.number())};
+    return contents;
+}
+
+void addMount(DiskFacts& facts, const std::string& number, const DiskSources& sources)
+{
+    const auto mount = mountOfDevice(sources.mounts, number, facts.path);
+    if (!mount)
+        return;
+    facts.mountPoint = mount->mountPoint;
+    facts.isBootVolume = mount->mountPoint == "/";
+    const auto home = sources.homeDirectory.empty()
+                          ? std::nullopt
+                          : mountHolding(sources.mounts, sources.homeDirectory);
+    facts.containsUserHome = home && home->device == mount->device;
+}
+
+void addSuperblock(DiskFacts& facts, const Contents& contents)
+{
+    const Superblock& superblock = contents.superblock;
+    if (superblock.isFilesystem())
+        facts.filesystem = superblock.type;
+    else if (superblock.type.empty() && contents.hasExtBackup)
+        facts.filesystem = "ext4";
+    facts.label = superblock.label;
+    facts.uuid = superblock.isFilesystem() ? superblock.uuid : std::string();
+    if (!facts.label.empty())
+        facts.displayName = facts.label;
+}
+
+DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
+{
+    DiskFacts facts;
+    facts.path = sources.dev / device.filename();
+    facts.identifier = facts.path.native();
+    facts.displayName = device.filename();
+    facts.length = sizeOf(device);
+    facts.isWritable = attribute(device, "ro") != "1";
+    return facts;
+}
+
+std::string nameOfWhole(const fs::path& device)
+{
+    const std::string backing = attribute(device, "loop/backing_file");
+    if (!backing.empty())
+        return fs::path(backing).filename();
+    const std::string assembled = attribute(device, "dm/name");
+    if (!assembled.empty())
+        return assembled;
+    const std::string model = attribute(device, "device/model");
+    return model.empty() ? device.filename().native() : model;
+}
+
+std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool hasPartitions)
+{
+    const std::string name = device.filename();
+    if (name.starts_with("sr"))
+        return diskType::opticalDisc;
+    const bool isBare =
+        !hasPartitions && !contents.table &&
+        (!contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces));
+    if (name.starts_with("dm-") || name.starts_with("md"))
+        return hasPartitions ? diskType::whole : diskType::assembled;
+    return isBare ? diskType::bareVolume : diskType::whole;
+}
+
+DiskTree readPartition(const fs::path& device, const std::optional<PartitionTable>& table,
+                       const DiskSources& sources)
+{
+    const std::string number = attribute(device, "dev");
+    DiskFacts facts = baseFacts(device, sources);
+    facts.type = diskType::volume;
+    facts.number = static_cast<std::int64_t>(numberIn(attribute(device, "partition")));
+    const Partition* known = nullptr;
+    for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
+        if (partition.number == facts.number)
+            known = &partition;
+    // The kernel gives the device of an extended partition two sectors, for its loader.
+    const bool isContainer = known != nullptr ? known->isContainer : facts.length <= 1024;
+    const bool announces = known != nullptr && announcesFilesystem(*known);
+    if (known != nullptr && !known->name.empty())
+        facts.displayName = known->name;
+    if (isContainer) {
+        facts.type = diskType::container;
+    } else {
+        addSuperblock(facts, contentsOf(facts.path, number, facts.length, sources));
+        addMount(facts, number, sources);
+    }
+    facts.isShown = !isContainer && (!facts.filesystem.empty() || facts.isBootVolume || announces);
+    return {facts, {}};
+}
+
+DiskTree readWhole(const fs::path& device, const DiskSources& sources)
+{
+    const std::string number = attribute(device, "dev");
+    DiskFacts facts = baseFacts(device, sources);
+    facts.displayName = nameOfWhole(device);
+    const Contents contents = contentsOf(facts.path, number, facts.length, sources);
+    DiskTree tree;
+    for (const fs::path& part : sortedEntries(device))
+        if (!attribute(part, "partition").empty())
+            tree.children.push_back(readPartition(part, contents.table, sources));
+    facts.type = typeOfWhole(device, contents, !tree.children.empty());
+    facts.isWhole = facts.type == diskType::whole;
+    facts.isBlankOptical = facts.type == diskType::opticalDisc && contents.superblock.type.empty();
+    if (!facts.isWhole) {
+        addSuperblock(facts, contents);
+        addMount(facts, number, sources);
+    }
+    tree.facts = facts;
+    return tree;
+}
+
+}  // namespace
+
+std::vector<DiskTree> readSystemDisks(const DiskSources& sources)
+{
+    std::vector<DiskTree> disks;
+    for (const fs::path& device : sortedEntries(sources.sysBlock)) {
+        if (isLeftOut(device))
+            continue;
+        disks.push_back(readWhole(device, sources));
+        disks.back().facts.number = static_cast<std::int64_t>(disks.size()) - 1;
+    }
+    return disks;
+}
+
+std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources& sources)
+{
+    struct stat status = {};
+    if (::stat(node.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
+        return std::nullopt;
+    const std::string number = fmt::format("{}:{}", major(status.st_rdev), minor(status.st_rdev));
+    const fs::path device = sources.sysBlock.parent_path() / "dev/block" / number;
+    DiskFacts facts;
+    facts.path = node;
+    facts.identifier = node.native();
+    facts.displayName = node.filename();
+    facts.length = sizeOf(device);
+    facts.isWritable = attribute(device, "ro") != "1";
+    const Contents contents = contentsOf(node, number, facts.length, sources);
+    const bool isPartition = !attribute(device, "partition").empty();
+    facts.type = isPartition ? diskType::volume : typeOfWhole(device, contents, false);
+    facts.isWhole = facts.type == diskType::whole;
+    addSuperblock(facts, contents);
+    addMount(facts, number, sources);
+    return facts;
+}
+
+}  // namespace orvane

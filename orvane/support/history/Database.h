@@ -1,0 +1,96 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstdint>
+#include <filesystem>
+#include <memory>
+#include <string>
+#include <string_view>
+
+struct sqlite3;
+struct sqlite3_stmt;
+
+namespace orvane {
+
+/// A prepared statement. Text that is bound is borrowed until the statement is run again or
+/// reset; text that is read is valid until then, too. Parameters count from 1, columns from 0.
+class Statement {
+public:
+    enum class Step { Row, Done, Failed };
+
+    Statement() = default;
+    [[nodiscard]] bool isPrepared() const { return statement_ != nullptr; }
+
+    void bind(int parameter, std::int64_t number);
+    void bind(int parameter, std::string_view text);
+    void bindNothing(int parameter);
+
+    /// The next row, or the end. After the end, or a failure, the next step starts anew.
+    [[nodiscard]] Step step();
+    /// Runs a statement that gives no rows.
+    [[nodiscard]] bool run() { return step() == Step::Done; }
+    void reset();
+
+    [[nodiscard]] bool isNothing(int column) const;
+    [[nodiscard]] std::int64_t integer(int column) const;
+    [[nodiscard]] std::string_view text(int column) const;
+
+private:
+    friend class Database;
+    struct Finalize {
+        void operator()(sqlite3_stmt* statement) const;
+    };
+    explicit Statement(sqlite3_stmt* statement) : statement_(statement) {}
+
+    std::unique_ptr<sqlite3_stmt, Finalize> statement_;
+};
+
+/// A connection to an SQLite database, or none. One thread at a time; its statements must be gone
+/// before it is.
+class Database {
+public:
+    /// What the last failure was, as far as it decides what to do next.
+    enum class Trouble { None, Damaged, Locked, Other };
+
+    Database() = default;
+    /// Opens the file, which must exist; SQLite gives its companions ("-wal", "-shm") the same
+    /// access rights. Not open on failure.
+    static Database open(const std::filesystem::path& file);
+    static Database inMemory();
+
+    [[nodiscard]] bool isOpen() const { return database_ != nullptr; }
+    [[nodiscard]] bool execute(const char* statements);
+    /// Not prepared on failure.
+    [[nodiscard]] Statement prepare(std::string_view statement);
+    [[nodiscard]] std::int64_t lastInsertedRow() const;
+
+    [[nodiscard]] Trouble trouble() const;
+    [[nodiscard]] std::string lastError() const;
+
+private:
+    struct Close {
+        void operator()(sqlite3* database) const;
+    };
+    static Database opened(const char* name);
+
+    std::unique_ptr<sqlite3, Close> database_;
+};
+
+/// Everything until `commit` comes about, or nothing does. Takes the right to write at once, so
+/// that it cannot fail for that in the middle.
+class Transaction {
+public:
+    explicit Transaction(Database& database);
+    Transaction(const Transaction&) = delete;
+    Transaction& operator=(const Transaction&) = delete;
+    ~Transaction();
+
+    [[nodiscard]] bool hasBegun() const { return isOpen_; }
+    [[nodiscard]] bool commit();
+
+private:
+    Database& database_;
+    bool isOpen_;
+};
+
+}  // namespace orvane

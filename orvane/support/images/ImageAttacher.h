@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/HostServices.h"
+#include "orvane/support/disks/Disk.h"
+#include "orvane/support/texts/Translator.h"
+
+#include <filesystem>
+#include <map>
+#include <mutex>
+#include <string>
+
+namespace orvane {
+
+/// Attaches disk images without the system's help: the image is read, and its volumes become
+/// disks that name regions of the file. Nothing is mounted, no loop device is taken, nothing stays
+/// open, no privileges are needed. Any thread.
+///
+/// The disks that come out of it become known to the disk controller when the main thread first
+/// asks for their volumes, and are forgotten when they are ejected.
+class ImageAttacher final : public fixwell::ImageAttachment {
+public:
+    ImageAttacher(Disk::Surroundings surroundings, Translator translator);
+
+    /// kPLErrorCannotOpen when the file cannot be opened, is empty, or is no regular file.
+    [[nodiscard]] fixwell::ErrorCode AttachImageWithURL(const std::filesystem::path& image,
+                                                        fixwell::Dictionary& result) override;
+    fixwell::OVDiskPointer TopLevelPLDiskForImageDict(const fixwell::Dictionary& result) override;
+
+    /// Why the last attachment of this image failed, as a sentence to show ("cannot attach
+    /// ‘x.img’: the file is empty"); empty when it did not.
+    [[nodiscard]] std::string lastError(const std::filesystem::path& image) const;
+
+private:
+    const Disk::Surroundings surroundings_;
+    const Translator translator_;
+
+    mutable std::mutex lock_;
+    std::map<std::int64_t, DiskTree> attached_;      ///< by attachment, until asked for; guarded
+    std::int64_t attachments_ = 0;                   ///< guarded
+    std::map<std::string, std::string> lastErrors_;  ///< by the path as given; guarded
+};
+
+}  // namespace orvane

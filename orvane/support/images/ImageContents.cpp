@@ -1,0 +1,87 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/images/ImageContents.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+// A hybrid optical image carries a partition map for memory sticks around one real file system.
+bool isOpticalImage(const Superblock& superblock)
+{
+    return superblock.type == "iso9660" || superblock.type == "udf";
+}
+
+// A partition may claim more than the file has; what is there is still worth a look.
+ByteRange withinFile(ByteRange range, std::uint64_t fileLength)
+{
+    if (range.offset >= fileLength)
+        return {range.offset, 0};
+    return {range.offset, std::min(range.length, fileLength - range.offset)};
+}
+
+ImageVolume readVolume(const OpenImage& image, Partition partition)
+{
+    const ByteRange there = withinFile(partition.range, image.length);
+    ImageVolume volume;
+    if (!partition.isContainer) {
+        volume.superblock = readSuperblock(image.descriptor.number(), there);
+        volume.hasExtBackup = hasExtBackupSuperblock(image.descriptor.number(), there);
+    }
+    volume.partition = std::move(partition);
+    return volume;
+}
+
+}  // namespace
+
+std::string ImageVolume::filesystem() const
+{
+    if (superblock.isFilesystem())
+        return superblock.type;
+    return superblock.type.empty() && hasExtBackup ? "ext4" : "";
+}
+
+Outcome<OpenImage> openImage(const std::filesystem::path& path, const Translator& translator)
+{
+    FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
+    if (!descriptor.isOpen())
+        return Failure{errorText(errno)};
+    struct stat status = {};
+    if (::fstat(descriptor.number(), &status) != 0)
+        return Failure{errorText(errno)};
+    if (!S_ISREG(status.st_mode))
+        return Failure{translator.text("it is not a regular file")};
+    if (status.st_size == 0)
+        return Failure{translator.text("the file is empty")};
+    std::error_code error;
+    const std::filesystem::path canonical = std::filesystem::canonical(path, error);
+    if (error)
+        return Failure{error.message()};
+    return OpenImage{std::move(descriptor), canonical, static_cast<std::uint64_t>(status.st_size),
+                     ::access(canonical.c_str(), W_OK) == 0};
+}
+
+ImageContents readContents(const OpenImage& image)
+{
+    Partition all;
+    all.range = {0, image.length};
+    ImageContents contents;
+    contents.whole = readVolume(image, all);
+    if (isOpticalImage(contents.whole.superblock))
+        return contents;
+
+    const auto table = readPartitionTable(image.descriptor.number());
+    const bool isUnknown = contents.whole.filesystem().empty();
+    contents.hasPartitionMap =
+        table || (isUnknown && hasPartitionTableTraces(image.descriptor.number()));
+    for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
+        contents.partitions.push_back(readVolume(image, partition));
+    return contents;
+}
+
+}  // namespace orvane

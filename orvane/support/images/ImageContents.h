@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/Failure.h"
+#include "orvane/support/disks/BlockProbe.h"
+#include "orvane/support/files/FileDescriptor.h"
+#include "orvane/support/texts/Translator.h"
+
+#include <cstdint>
+#include <filesystem>
+#include <optional>
+#include <vector>
+
+namespace orvane {
+
+/// A disk image, open for reading.
+struct OpenImage {
+    FileDescriptor descriptor;
+    std::filesystem::path path;  ///< absolute, without symbolic links
+    std::uint64_t length = 0;    ///< bytes, never 0
+    bool isWritable = false;     ///< by this process
+};
+
+/// Opens a regular file that is not empty; otherwise the bare reason ("the file is empty"). Any
+/// thread; does not wait for whatever else the path may name.
+[[nodiscard]] Outcome<OpenImage> openImage(const std::filesystem::path& path,
+                                           const Translator& translator);
+
+/// What lies in a stretch of an image.
+struct ImageVolume {
+    Partition partition;  ///< of a bare volume: number 0, the whole file
+    Superblock superblock;
+    bool hasExtBackup = false;
+
+    /// The file system's type, also where only a backup superblock tells of one; else empty.
+    std::string filesystem() const;
+};
+
+struct ImageContents {
+    bool hasPartitionMap = false;  ///< also where it is damaged beyond reading
+    /// Of the file as a whole, where there is no partition map.
+    ImageVolume whole;
+    std::vector<ImageVolume> partitions;
+};
+
+/// Reads the partition map and the superblocks through libblkid, without attaching anything. Any
+/// thread.
+[[nodiscard]] ImageContents readContents(const OpenImage& image);
+
+}  // namespace orvane

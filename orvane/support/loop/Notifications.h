@@ -1,0 +1,31 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/NotificationCenter.h"
+
+#include <memory>
+#include <vector>
+
+namespace orvane {
+
+/// The host's notification centre. Main thread only. An observer that is added in the middle of
+/// a delivery hears of the next notification; one that is removed hears nothing more. A handler
+/// may post.
+class Notifications final : public fixwell::NotificationCenter {
+public:
+    void addObserver(const void* observer, fixwell::Name name, Handler handler) override;
+    void removeObserver(const void* observer, fixwell::Name name) override;
+    void post(const fixwell::Notification& notification) override;
+
+private:
+    struct Registration {
+        const void* observer;
+        fixwell::Name name;
+        Handler handler;
+        bool isInForce = true;
+    };
+
+    std::vector<std::shared_ptr<Registration>> registrations_;
+};
+
+}  // namespace orvane

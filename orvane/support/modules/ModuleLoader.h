@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/ModuleEntry.h"
+#include "orvane/support/Failure.h"
+#include "orvane/support/texts/ModuleBundle.h"
+
+#include <filesystem>
+#include <memory>
+#include <string>
+
+namespace orvane {
+
+/// A module whose code is in the process. It is never taken out again: names and texts of the
+/// module live on in records and in the log.
+struct LoadedModule {
+    std::string name;
+    std::unique_ptr<ModuleBundle> bundle;
+    const fixwell::ModuleEntry* entry = nullptr;
+};
+
+/// Loads the bundle's library. Refuses what other users could have changed, and a module that was
+/// built for another version of the contract, of which nothing but the version is looked at.
+/// Loading runs the library's initializers. Main thread.
+[[nodiscard]] Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle);
+
+/// Whether the module may run here; it says NO where its own switch in the settings is off.
+[[nodiscard]] bool shouldRun(const LoadedModule& module, fixwell::HostServices& host);
+
+/// A module, made and initialized, with its notifications registered. Host and site must outlive
+/// it.
+[[nodiscard]] Outcome<std::unique_ptr<fixwell::OVModule>> makeModule(const LoadedModule& module,
+                                                                     fixwell::HostServices& host,
+                                                                     fixwell::ModuleSite& site);
+
+}  // namespace orvane

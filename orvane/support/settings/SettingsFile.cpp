@@ -1,0 +1,126 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/settings/SettingsFile.h"
+
+#include "orvane/support/files/WholeFile.h"
+#include "orvane/support/settings/ValueJSON.h"
+
+#include <algorithm>
+#include <array>
+#include <cctype>
+#include <cerrno>
+#include <optional>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+constexpr std::size_t largestFile = 1U << 20U;
+
+std::optional<bool> truthValue(std::string_view text)
+{
+    constexpr std::array<std::string_view, 4> affirmative{"yes", "true", "on", "1"};
+    constexpr std::array<std::string_view, 4> negative{"no", "false", "off", "0"};
+    std::string lower(text);
+    std::transform(lower.begin(), lower.end(), lower.begin(),
+                   [](unsigned char c) { return static_cast<char>(std::tolower(c)); });
+    if (std::find(affirmative.begin(), affirmative.end(), lower) != affirmative.end())
+        return true;
+    if (std::find(negative.begin(), negative.end(), lower) != negative.end())
+        return false;
+    return std::nullopt;
+}
+
+}  // namespace
+
+SettingsFile::SettingsFile(std::filesystem::path file, WarningSink warn)
+    : file_(std::move(file)), warn_(std::move(warn))
+{
+    read();
+}
+
+fixwell::Value SettingsFile::objectForKey(std::string_view key) const
+{
+    const auto found = settings_.find(key);
+    if (found == settings_.end())
+        return {};
+    const bool isText = found->second.kind() == fixwell::Kind::String;
+    if (const auto truth = isText ? truthValue(found->second.string()) : std::nullopt)
+        return *truth;
+    return found->second;
+}
+
+void SettingsFile::setObjectForKey(const fixwell::Value& value, std::string_view key)
+{
+    read();
+    if (value.isNone())
+        settings_.erase(std::string(key));
+    else
+        settings_.insert_or_assign(std::string(key), value);
+    write();
+}
+
+void SettingsFile::read()
+{
+    if (file_.empty())
+        return;
+    const auto contents = readWholeFile(file_, largestFile);
+    if (const int* const error = std::get_if<int>(&contents)) {
+        if (*error == EFBIG || *error == EINVAL)
+            setAside();
+        else if (*error != ENOENT)
+            goOnInMemory(cannot("read the settings", file_.native(), *error).message);
+        return;
+    }
+    const auto json = nlohmann::json::parse(std::get<std::string>(contents), nullptr, false);
+    if (!json.is_object()) {
+        setAside();
+        return;
+    }
+    Settings settings;
+    try {
+        for (const auto& [key, value] : json.items())
+            settings.emplace(key, valueFromJSON(value));
+    } catch (const nlohmann::json::exception&) {
+        setAside();
+        return;
+    }
+    settings_ = std::move(settings);
+}
+
+void SettingsFile::setAside()
+{
+    std::filesystem::path aside = file_;
+    aside += ".broken";
+    std::error_code error;
+    std::filesystem::rename(file_, aside, error);
+    if (error)
+        goOnInMemory(cannot("read the settings", file_.native(), "they are damaged").message);
+    else
+        warn_(cannot("read the settings", file_.native(),
+                     "they are damaged and are kept as ‘" + aside.filename().native() + "’")
+                  .message);
+}
+
+void SettingsFile::write()
+{
+    if (file_.empty())
+        return;
+    nlohmann::json json = nlohmann::json::object();
+    for (const auto& [key, value] : settings_)
+        json[key] = jsonFromValue(value);
+    const auto replaceHandler = nlohmann::json::error_handler_t::replace;
+    const auto directory = createPrivateDirectory(file_.parent_path());
+    const auto written = failed(directory)
+                             ? directory
+                             : replaceFile(file_, json.dump(4, ' ', false, replaceHandler) + "\n");
+    if (failed(written))
+        goOnInMemory(failureMessage(written));
+}
+
+void SettingsFile::goOnInMemory(const std::string& sentence)
+{
+    file_.clear();
+    warn_(sentence + "; changed settings hold until the program ends");
+}
+
+}  // namespace orvane

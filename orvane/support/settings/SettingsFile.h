@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/UserDefaults.h"
+#include "orvane/support/Failure.h"
+
+#include <filesystem>
+#include <map>
+#include <string>
+
+namespace orvane {
+
+/// The stored settings: one JSON object in a file that is replaced as a whole. Main thread only.
+///
+/// A file that cannot be read as settings is kept aside as NAME.broken; one that may not be read
+/// or written is left alone. Either is said once through the warning sink, and the settings then
+/// hold for this run.
+class SettingsFile final : public fixwell::UserDefaults {
+public:
+    /// An empty path keeps the settings in memory.
+    SettingsFile(std::filesystem::path file, WarningSink warn);
+
+    fixwell::Value objectForKey(std::string_view key) const override;
+    /// Written at once. Reads the file again first, so that another program's change to another
+    /// key is kept.
+    void setObjectForKey(const fixwell::Value& value, std::string_view key) override;
+
+private:
+    using Settings = std::map<std::string, fixwell::Value, std::less<>>;
+
+    void read();
+    void setAside();
+    void write();
+    void goOnInMemory(const std::string& sentence);
+
+    std::filesystem::path file_;
+    WarningSink warn_;
+    Settings settings_;
+};
+
+}  // namespace orvane

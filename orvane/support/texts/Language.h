@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/settings/XDGPaths.h"
+
+#include <cstdint>
+#include <string>
+
+namespace orvane {
+
+/// The languages that the locale variables ask for, as gettext's LANGUAGE variable wants them
+/// ("de_DE", "pt_BR:pt"): LANGUAGE itself when it is set, else from LC_ALL, LC_MESSAGES or LANG,
+/// the first that is not empty. Empty for the C locale, which is English.
+[[nodiscard]] std::string wantedLanguages(const EnvironmentLookup& environment);
+
+/// Start-up, before any other thread. Adopts the user's locale. Where the system has it not, or
+/// it is not in UTF-8 (a rescue system has no locales), C.UTF-8 takes its place and LANGUAGE
+/// keeps the wish, so translated texts still come. Numbers keep the C locale's form: what the
+/// program writes for machines must not change with the user; people's numbers come from
+/// decimalText.
+void adoptUserLocale();
+
+/// Switches the language of every catalogue ("" for English). Main thread, while no other thread
+/// asks for texts: it changes the environment.
+void setLanguage(const std::string& languages);
+
+/// The first of the languages in force ("de_DE"); empty for English.
+[[nodiscard]] std::string currentLanguage();
+
+/// Another number after every setLanguage. Any thread.
+[[nodiscard]] std::uint64_t languageRevision();
+
+}  // namespace orvane

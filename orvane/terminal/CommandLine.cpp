@@ -1,0 +1,98 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/CommandLine.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/terminal/ExitStatus.h"
+
+#include <CLI/CLI.hpp>
+
+#include <array>
+
+namespace orvane {
+namespace {
+
+struct CommandText {
+    Command command;
+    const char* name;
+    const char* text;
+};
+
+constexpr std::array<CommandText, 6> commandTexts{{
+    {Command::Verify, "verify", "Look for damage; write nothing"},
+    {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
+    {Command::VerifyPermissions, "verify-permissions",
+     "Compare the permissions of installed files with what their packages say"},
+    {Command::RepairPermissions, "repair-permissions", "Set them right"},
+    {Command::List, "list", "Show disks, their last verdict and what can be done with them"},
+    {Command::History, "history", "Show what earlier checks found"},
+}};
+
+constexpr const char* diskHelp = "A device, an image file, a mount point, LABEL=… or UUID=…";
+
+constexpr const char* footer =
+    "\nExit status, added up over the disks: 0 sound, 1 damage found and repaired, 4 damage left,\n"
+    "8 could not be checked or not conclusive, 16 wrong usage, 32 stopped.";
+
+void addSharedOptions(CLI::App& app, Request& request)
+{
+    app.add_flag_callback(
+        "--details", [&request] { request.showsDetails = true; },
+        "Show every line (else the stored preference)");
+    app.add_flag_callback(
+        "--brief", [&request] { request.showsDetails = false; },
+        "Show headings and main lines only");
+    app.add_flag("--json", request.isJSON, "One JSON object per line");
+    app.add_flag("--yes", request.confirms, "Confirm the startup-disk warning");
+    const std::map<std::string, Coloring> colorings{
+        {"auto", Coloring::Auto}, {"always", Coloring::Always}, {"never", Coloring::Never}};
+    app.add_option("--color", request.coloring, "auto, always or never")
+        ->transform(CLI::CheckedTransformer(colorings).description(""))
+        ->type_name("WHEN");
+    app.add_flag_callback(
+        "--no-progress", [&request] { request.showsProgress = false; }, "No live progress line");
+    app.add_option("--log-level", request.logLevel,
+                   "Developers' log lines up to this level (1 to 3) on standard error")
+        ->check(CLI::Range(0, 3).description(""))
+        ->type_name("N");
+    app.add_flag("--trace", request.tracesCommands,
+                 "Print every command before it runs, and why an action is refused");
+}
+
+void addCommand(CLI::App& app, const CommandText& text, Request& request)
+{
+    CLI::App& command = *app.add_subcommand(text.name, text.text);
+    CLI::Option& disks = *command.add_option("DISK", request.disks, diskHelp)->type_name("");
+    if (text.command != Command::List)
+        disks.required();
+    if (text.command == Command::History)
+        command.add_flag("--clear", request.clearsHistory, "Forget these disks' histories");
+    command.callback([&request, chosen = text.command] { request.command = chosen; });
+    command.fallthrough();
+}
+
+}  // namespace
+
+std::variant<Request, Ending> readCommandLine(int argc, const char* const* argv)
+{
+    Request request;
+    CLI::App app("Fixwell: checks disks, tells what was found and what it means, and repairs.",
+                 "fixwell");
+    app.footer(footer);
+    app.require_subcommand(1);
+    addSharedOptions(app, request);
+    for (const CommandText& text : commandTexts)
+        addCommand(app, text, request);
+    try {
+        app.parse(argc, argv);
+        return request;
+    } catch (const CLI::Success& asked) {
+        std::ostringstream text;
+        app.exit(asked, text, text);
+        return Ending{exitSound, text.str()};
+    } catch (const CLI::ParseError& error) {
+        return Ending{exitUsage,
+                      "fixwell: " + fixwell::printable(error.what()) + "\nTry “fixwell --help”.\n"};
+    }
+}
+
+}  // namespace orvane

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/toolkit/Control.h"
+
+#include <string>
+
+namespace orvane {
+
+/// A button that nobody sees: a command presses it, and reads from it why it cannot.
+class TerminalButton final : public fixwell::Button {
+public:
+    void setNeedsDisplay(bool /*needsDisplay*/) override {}
+    void setEnabled(bool isEnabled) override { isEnabled_ = isEnabled; }
+    bool isEnabled() const override { return isEnabled_; }
+    void setToolTip(std::string_view text) override { toolTip_ = text; }
+    void setTitle(std::string_view title) override { title_ = title; }
+    void setAction(fixwell::Selector action) override { action_ = action; }
+    void setIntegerValue(std::int64_t /*value*/) override {}
+    void setKeyEquivalent(std::string_view key) override { key_ = key; }
+    void setTag(std::int64_t tag) override { tag_ = tag; }
+
+    const std::string& title() const { return title_; }
+    const std::string& toolTip() const { return toolTip_; }
+    fixwell::Selector action() const { return action_; }
+    std::int64_t tag() const { return tag_; }
+    const std::string& keyEquivalent() const { return key_; }
+
+    /// Why the button cannot be used: what the tooltip says beyond describing the button.
+    std::string reason() const
+    {
+        const std::size_t gap = toolTip_.find("\n\n");
+        return gap == std::string::npos ? std::string() : toolTip_.substr(gap + 2);
+    }
+
+private:
+    bool isEnabled_ = true;
+    std::string toolTip_;
+    std::string title_;
+    std::string key_;
+    fixwell::Selector action_;
+    std::int64_t tag_ = 0;
+};
+
+/// The instructions beside the log; a terminal has its help instead.
+class TerminalTextField final : public fixwell::TextField {
+public:
+    void setNeedsDisplay(bool /*needsDisplay*/) override {}
+    void setEnabled(bool isEnabled) override { isEnabled_ = isEnabled; }
+    bool isEnabled() const override { return isEnabled_; }
+    void setToolTip(std::string_view /*text*/) override {}
+    void setAttributedStringValue(const fixwell::StyledText& /*text*/) override {}
+
+private:
+    bool isEnabled_ = true;
+};
+
+class TerminalTextView final : public fixwell::TextView {
+public:
+    void setNeedsDisplay(bool /*needsDisplay*/) override {}
+    void setString(std::string_view /*text*/) override {}
+};
+
+}  // namespace orvane

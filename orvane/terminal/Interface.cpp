@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/Interface.h"
+
+namespace orvane {
+namespace {
+
+// The one custom view that a log's interface file names.
+constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
+
+}  // namespace
+
+bool Interface::loadInterface(std::string_view /*name*/, fixwell::InterfaceOwner& owner)
+{
+    owner_ = &owner;
+    for (const fixwell::Outlet& outlet : owner.outlets())
+        connect(outlet, owner);
+    owner.awakeFromNib();
+    return true;
+}
+
+void Interface::connect(const fixwell::Outlet& outlet, fixwell::InterfaceOwner& owner)
+{
+    if (auto* const button = std::get_if<fixwell::Button**>(&outlet.place)) {
+        **button = &buttons_[std::string(outlet.name)];
+    } else if (auto* const field = std::get_if<fixwell::TextField**>(&outlet.place)) {
+        **field = &textField_;
+    } else if (auto* const view = std::get_if<fixwell::TextView**>(&outlet.place)) {
+        **view = &textView_;
+    } else {
+        outlineView_ = owner.makeOutlineView(logViewClass, logView_);
+        if (!outlineView_)
+            return;
+        outlineView_->setDataSource(owner.outlineViewDelegate());
+        logView_.setView(outlineView_.get());
+        *std::get<fixwell::OutlineView**>(outlet.place) = outlineView_.get();
+    }
+}
+
+void Interface::disconnect(fixwell::InterfaceOwner& owner)
+{
+    if (owner_ == &owner)
+        owner_ = nullptr;
+}
+
+TerminalButton* Interface::button(std::string_view outlet)
+{
+    const auto found = buttons_.find(outlet);
+    return found == buttons_.end() ? nullptr : &found->second;
+}
+
+bool Interface::press(TerminalButton& button)
+{
+    return button.isEnabled() && owner_ != nullptr && owner_->perform(button.action(), &button);
+}
+
+}  // namespace orvane

@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/Interrupts.h"
+
+#include <poll.h>
+#include <sys/signalfd.h>
+#include <unistd.h>
+#include <csignal>
+
+namespace orvane {
+namespace {
+
+sigset_t endingSignals()
+{
+    sigset_t signals;
+    sigemptyset(&signals);
+    for (const int number : {SIGINT, SIGTERM, SIGHUP})
+        sigaddset(&signals, number);
+    return signals;
+}
+
+}  // namespace
+
+Interrupts::Interrupts(MainLoop& loop, std::function<void()> interrupted)
+    : loop_(loop), interrupted_(std::move(interrupted))
+{
+    // Output that nobody reads any more must not end a repair in its middle.
+    std::signal(SIGPIPE, SIG_IGN);
+    const sigset_t signals = endingSignals();
+    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    descriptor_ = ::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK);
+    if (descriptor_ >= 0)
+        loop_.watch(descriptor_, POLLIN, [this](short) { take(); });
+}
+
+Interrupts::~Interrupts()
+{
+    if (descriptor_ < 0)
+        return;
+    loop_.unwatch(descriptor_);
+    ::close(descriptor_);
+}
+
+void Interrupts::take()
+{
+    signalfd_siginfo information{};
+    while (::read(descriptor_, &information, sizeof information) == sizeof information)
+        interrupted_();
+}
+
+}  // namespace orvane

@@ -1,0 +1,156 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/JSONReporter.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "fixwell/host/pellar/MessageKeys.h"
+
+#include <nlohmann/json.hpp>
+
+#include <cmath>
+#include <cstdio>
+
+namespace orvane {
+namespace {
+
+using nlohmann::ordered_json;
+
+/// A step of this size is worth a line.
+constexpr double percentStep = 0.5;
+
+ordered_json jsonOf(const fixwell::Value& value)
+{
+    switch (value.kind()) {
+        case fixwell::Kind::Boolean: return value.boolean();
+        case fixwell::Kind::Integer: return value.integer();
+        case fixwell::Kind::Real: return value.real();
+        case fixwell::Kind::None: return nullptr;
+        default: return value.description();
+    }
+}
+
+ordered_json textOrNull(std::string_view text)
+{
+    return text.empty() ? ordered_json(nullptr) : ordered_json(std::string(text));
+}
+
+}  // namespace
+
+void JSONReporter::write(const ordered_json& event)
+{
+    const std::string line =
+        event.dump(-1, ' ', false, ordered_json::error_handler_t::replace) + "\n";
+    std::fwrite(line.data(), 1, line.size(), stdout);
+}
+
+void JSONReporter::started(const std::string& disk, std::string_view action,
+                           const std::string& title)
+{
+    write({{"event", "started"}, {"disk", disk}, {"action", action}, {"title", title}});
+    std::fflush(stdout);
+    shownPercent_.reset();
+}
+
+void JSONReporter::record(const std::string& disk, const fixwell::Dictionary& record,
+                          const fixwell::StyledText& text)
+{
+    write({{"event", "record"},
+           {"disk", disk},
+           {"type", textOrNull(record.string(fixwell::kFsckMessageType))},
+           {"verbosity", record.integer(fixwell::kFsckVerbosity)},
+           {"text", std::string(text.characters())}});
+}
+
+void JSONReporter::progress(const std::string& disk, std::optional<double> percent,
+                            const std::string& status)
+{
+    const bool hasMoved =
+        percent && (!shownPercent_ || std::abs(*percent - *shownPercent_) >= percentStep);
+    if (!hasMoved && status == shownStatus_)
+        return;
+    shownPercent_ = percent;
+    shownStatus_ = status;
+    write({{"event", "progress"},
+           {"disk", disk},
+           {"percent", percent ? ordered_json(std::round(*percent * 10) / 10) : ordered_json()},
+           {"status", status}});
+    std::fflush(stdout);
+}
+
+void JSONReporter::finished(const std::string& disk, std::string_view verdict,
+                            fixwell::ErrorCode error, std::string_view message)
+{
+    write({{"event", "finished"},
+           {"disk", disk},
+           {"verdict", verdict},
+           {"error", error},
+           {"message", std::string(message)}});
+    std::fflush(stdout);
+}
+
+void JSONReporter::report(const std::string& disk, const fixwell::Dictionary& report)
+{
+    ordered_json event{{"event", "report"}};
+    for (const auto& [key, value] : report.entries())
+        event[std::string(key.text())] =
+            value.kind() == fixwell::Kind::Object ? ordered_json(disk) : jsonOf(value);
+    write(event);
+}
+
+void JSONReporter::alert(const std::string& title, const std::string& message)
+{
+    write({{"event", "alert"}, {"title", title}, {"message", message}});
+}
+
+// A disk that never came to a job is finished all the same, so that a reader waits for nothing.
+void JSONReporter::failure(const std::string& disk, const std::string& sentence)
+{
+    write({{"event", "finished"},
+           {"disk", disk},
+           {"verdict", fixwell::kPLVerdictFailed.text()},
+           {"error", fixwell::kPLErrorCannotOpen},
+           {"message", sentence}});
+    std::fflush(stdout);
+}
+
+// Standard output is for events.
+void JSONReporter::warning(const std::string& sentence)
+{
+    const std::string line = "fixwell: " + fixwell::printable(sentence) + "\n";
+    std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+void JSONReporter::listed(const DiskLine& disk)
+{
+    ordered_json actions = ordered_json::object();
+    for (const ActionLine& action : disk.actions)
+        actions[action.command] = {{"available", action.isAvailable},
+                                   {"reason", textOrNull(action.reason)}};
+    write({{"event", "disk"},
+           {"disk", disk.disk},
+           {"name", disk.name},
+           {"kind", disk.kind},
+           {"bytes", disk.bytes},
+           {"filesystem", textOrNull(disk.filesystem)},
+           {"mountPoint", textOrNull(disk.mountPoint)},
+           {"lastChecked", textOrNull(disk.lastChecked)},
+           {"verdict", textOrNull(disk.verdict)},
+           {"actions", actions}});
+}
+
+void JSONReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
+{
+    for (const RunLine& run : runs)
+        write({{"event", "run"},
+               {"disk", disk},
+               {"started", run.started},
+               {"action", run.action},
+               {"verdict", textOrNull(run.verdict)},
+               {"message", textOrNull(run.message)}});
+}
+
+void JSONReporter::end()
+{
+    std::fflush(stdout);
+}
+
+}  // namespace orvane

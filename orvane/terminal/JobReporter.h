@@ -1,0 +1,70 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/OVDiskController.h"
+#include "orvane/jobs/JobObserver.h"
+#include "orvane/terminal/DiskNames.h"
+#include "orvane/terminal/Reporter.h"
+#include "orvane/terminal/TerminalWindow.h"
+
+#include <cstdint>
+#include <functional>
+#include <map>
+#include <optional>
+#include <string>
+
+namespace orvane {
+
+/// Follows the jobs of one run of the program: tells the reporter, remembers the verdicts for the
+/// exit status, and has them kept with the disks' histories. Main thread only.
+class JobReporter final : public JobObserver {
+public:
+    struct Outcome {
+        std::string verdict;
+        fixwell::ErrorCode error = 0;
+        std::string message;
+    };
+    struct Hooks {
+        /// A job begins on this disk; its first row is the newest of the disk's log.
+        std::function<void(const fixwell::DiskReferencePointer& disk)> follow;
+        std::function<std::string(fixwell::ErrorCode)> errorText;
+        /// Keeps a run; answers its number for `runEnded`.
+        std::function<std::int64_t(const fixwell::DiskReferencePointer&, Operation)> runBegan;
+        std::function<void(std::int64_t run, const Outcome& outcome)> runEnded;
+    };
+
+    /// All outlive this object.
+    JobReporter(Reporter& reporter, const TerminalWindow& window, const DiskNames& names,
+                Hooks hooks)
+        : reporter_(reporter), window_(window), names_(names), hooks_(std::move(hooks))
+    {
+    }
+
+    void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) override;
+    void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
+                        fixwell::ErrorCode error) override;
+    void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
+                       const fixwell::Dictionary& result) override;
+
+    /// Says that the last job has finished, once the module has added its last rows.
+    void flush();
+    /// What the user calls the disk whose rows are coming.
+    void setCurrentDisk(const std::string& name) { current_ = name; }
+    const std::string& currentDisk() const { return current_; }
+    /// By disk identifier.
+    const std::map<std::string, Outcome>& outcomes() const { return outcomes_; }
+
+private:
+    void settle(const std::string& identifier, Outcome outcome);
+
+    Reporter& reporter_;
+    const TerminalWindow& window_;
+    const DiskNames& names_;
+    Hooks hooks_;
+    std::string current_;
+    std::int64_t run_ = 0;
+    std::optional<Outcome> unsaid_;
+    std::map<std::string, Outcome> outcomes_;
+};
+
+}  // namespace orvane

@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/LogView.h"
+
+namespace orvane {
+
+void LogView::countRows()
+{
+    const bool hasSource = view_ != nullptr && view_->dataSource() != nullptr;
+    rows_ = hasSource ? view_->dataSource()->outlineViewNumberOfChildrenOfItem({}) : 0;
+}
+
+void LogView::followFromLastRow()
+{
+    countRows();
+    written_ = rows_ > 0 ? rows_ - 1 : 0;
+    isWriting_ = true;
+    writeNewRows();
+}
+
+void LogView::writeAllRows()
+{
+    countRows();
+    written_ = 0;
+    isWriting_ = true;
+    writeNewRows();
+}
+
+void LogView::reloadData()
+{
+    countRows();
+    if (isWriting_)
+        writeNewRows();
+}
+
+void LogView::writeNewRows()
+{
+    if (written_ >= rows_ || view_ == nullptr)
+        return;
+    beforeRows_();
+    fixwell::BrowserCell* const cell = view_->dataCell();
+    for (; written_ < rows_; ++written_) {
+        const fixwell::OutlineItem item = view_->itemAtRow(written_);
+        if (cell == nullptr || !item)
+            continue;
+        view_->dataSource()->outlineViewWillDisplayCellForTableColumnItem(*cell, item);
+        writeRow_(item, cell->attributedStringValue());
+    }
+}
+
+}  // namespace orvane

@@ -1,0 +1,66 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/toolkit/OutlineView.h"
+
+#include <functional>
+
+namespace orvane {
+
+/// The outline view of the log on a terminal. A terminal cannot be drawn anew, so rows are
+/// written once, in their order, when the module reloads its view.
+class LogView final : public fixwell::OutlineViewPeer {
+public:
+    /// A row with its text as the module's cell holds it.
+    using RowWriter =
+        std::function<void(const fixwell::Dictionary& record, const fixwell::StyledText& text)>;
+
+    /// `beforeRows` is called before rows are written: what is shown must be on the disk first.
+    LogView(RowWriter writeRow, std::function<void()> beforeRows)
+        : writeRow_(std::move(writeRow)), beforeRows_(std::move(beforeRows))
+    {
+    }
+
+    /// The view whose data source and cell are asked; it must live as long as this object.
+    void setView(fixwell::OutlineView* view) { view_ = view; }
+
+    /// Writes nothing until the next call of one of the two below.
+    void holdBack() { isWriting_ = false; }
+    /// Goes on with the newest row there is now, and writes every row that follows.
+    void followFromLastRow();
+    /// Writes all rows there are.
+    void writeAllRows();
+
+    void reloadData() override;
+    std::size_t numberOfRows() const override { return rows_; }
+    std::vector<std::size_t> selectedRowIndexes() const override { return {}; }
+    std::size_t numberOfSelectedRows() const override { return 0; }
+    void scrollRowToVisible(std::size_t /*row*/) override {}
+    fixwell::Rect rectOfRow(std::size_t /*row*/) const override { return {}; }
+    fixwell::Rect frameOfCellAtColumnRow(std::size_t, std::size_t) const override { return {}; }
+    fixwell::Rect frameOfOutlineCellAtRow(std::size_t /*row*/) const override { return {}; }
+    void keyDown(const fixwell::KeyEvent& /*event*/) override {}
+    void selectAll() override {}
+    void setNeedsDisplay(bool /*needsDisplay*/) override {}
+    void setNeedsDisplayInRect(const fixwell::Rect& /*rect*/) override {}
+    void setEnabled(bool isEnabled) override { isEnabled_ = isEnabled; }
+    bool isEnabled() const override { return isEnabled_; }
+    void setToolTip(std::string_view /*text*/) override {}
+    void setIndentationPerLevel(double /*points*/) override {}
+    void setDraggingSourceOperationMask(fixwell::DragOperation, bool) override {}
+    fixwell::Scroller* verticalScroller() override { return nullptr; }
+
+private:
+    void countRows();
+    void writeNewRows();
+
+    RowWriter writeRow_;
+    std::function<void()> beforeRows_;
+    fixwell::OutlineView* view_ = nullptr;
+    std::size_t rows_ = 0;
+    std::size_t written_ = 0;
+    bool isWriting_ = false;
+    bool isEnabled_ = true;
+};
+
+}  // namespace orvane

@@ -1,0 +1,74 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/Dictionary.h"
+#include "fixwell/host/foundation/StyledText.h"
+#include "fixwell/host/pellar/ErrorCodes.h"
+
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace orvane {
+
+/// Whether an action can be used on a disk, and the module's reason where it cannot.
+struct ActionLine {
+    std::string command;  ///< as the command line names it
+    std::string title;
+    bool isAvailable = false;
+    std::string reason;
+};
+
+/// One disk, volume or image of `fixwell list`.
+struct DiskLine {
+    std::string disk;  ///< what a command takes
+    std::string name;
+    std::string kind;
+    std::string filesystem;
+    std::uint64_t bytes = 0;
+    std::string mountPoint;
+    bool isVolume = false;
+    std::string lastChecked;  ///< local time; empty when never
+    std::string verdict;
+    std::vector<ActionLine> actions;
+};
+
+/// One earlier check of `fixwell history`.
+struct RunLine {
+    std::string started;  ///< local time
+    std::string action;
+    std::string verdict;  ///< empty for a run that was cut off with the program
+    std::string message;
+};
+
+/// How the program speaks: to people, or to other programs. `disk` is always what the user
+/// named, or that and the volume's number.
+class Reporter {
+public:
+    virtual ~Reporter() = default;
+
+    virtual void started(const std::string& disk, std::string_view action,
+                         const std::string& title) = 0;
+    /// A row of the log, with its text as the log view's cell holds it.
+    virtual void record(const std::string& disk, const fixwell::Dictionary& record,
+                        const fixwell::StyledText& text) = 0;
+    /// No percentage while there is no telling.
+    virtual void progress(const std::string& disk, std::optional<double> percent,
+                          const std::string& status) = 0;
+    virtual void finished(const std::string& disk, std::string_view verdict,
+                          fixwell::ErrorCode error, std::string_view message) = 0;
+    virtual void report(const std::string& disk, const fixwell::Dictionary& report) = 0;
+    virtual void alert(const std::string& title, const std::string& message) = 0;
+    /// Something that went wrong outside of a job: one sentence.
+    virtual void failure(const std::string& disk, const std::string& sentence) = 0;
+    /// Something that the program goes on without, or tells about its own doing.
+    virtual void warning(const std::string& sentence) = 0;
+    virtual void listed(const DiskLine& disk) = 0;
+    /// All runs of a disk, oldest first; its records follow.
+    virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
+    /// The last thing that is said.
+    virtual void end() {}
+};
+
+}  // namespace orvane

@@ -1,0 +1,240 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/Session.h"
+
+#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/modules/ModuleSearch.h"
+#include "pellar/ErrorTexts.h"
+
+#include <unistd.h>
+
+#include <array>
+
+namespace orvane {
+namespace {
+
+std::filesystem::path hostBundleDirectory()
+{
+    return runningExecutable().parent_path().parent_path() / "share" / "orvane";
+}
+
+TerminalAlerts::Answer answerFor(const Request& request)
+{
+    if (request.confirms)
+        return TerminalAlerts::Answer::Confirm;
+    const bool canAsk =
+        !request.isJSON && ::isatty(STDIN_FILENO) == 1 && ::isatty(STDOUT_FILENO) == 1;
+    return canAsk ? TerminalAlerts::Answer::Ask : TerminalAlerts::Answer::Decline;
+}
+
+}  // namespace
+
+Session::Session(const Request& request, Reporter& reporter)
+    : reporter_(reporter),
+      interrupts_(loop_, [this] { interrupt(); }),
+      logView_(
+          [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
+              reporter_.record(jobs_.currentDisk(), record, text);
+          },
+          [this] { host_.histories().saveNew(); }),
+      interface_(logView_),
+      alerts_(loop_, reporter, answerFor(request)),
+      hostTexts_(hostBundleDirectory() / "locale"),
+      libraryTexts_(hostTexts_),
+      library_(loop_, libraryTexts_, libraryOptions(request)),
+      host_(supportOptions(request), loop_, interface_, alerts_, reporter, request.showsDetails),
+      jobs_(reporter, window_, names_, jobHooks()),
+      observedLibrary_(library_, jobs_)
+{
+    window_.setEvents({
+        [this] { reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status()); },
+        [this](const fixwell::Dictionary& report) {
+            jobs_.flush();
+            reporter_.report(names_.nameOf(report.string(fixwell::Name("kOVOP_DiskIdentifierKey"))),
+                             report);
+        },
+    });
+}
+
+Session::~Session()
+{
+    // The module goes before what it was given, its running job with it.
+    module_.reset();
+    host_.histories().saveNew();
+}
+
+SupportOptions Session::supportOptions(const Request& request)
+{
+    SupportOptions options;
+    options.hostBundle = hostBundleDirectory();
+    options.keptLogLevel = std::max(request.logLevel, fixwell::OVLog::error);
+    options.shownLogLevel = request.logLevel;
+    options.capabilities = [this](std::string_view type) {
+        return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type), false};
+    };
+    options.errorText = [this](fixwell::ErrorCode code) {
+        return pellar::errorText(code, libraryTexts_);
+    };
+    options.warn = [this](const std::string& sentence) {
+        reporter_.warning(sentence);
+    };
+    return options;
+}
+
+pellar::ManagerOptions Session::libraryOptions(const Request& request)
+{
+    pellar::ManagerOptions options;
+    if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
+        options.toolPath = *path;
+    if (request.tracesCommands)
+        options.commandTrace = [this](std::string_view line) {
+            reporter_.warning(std::string(line));
+        };
+    return options;
+}
+
+JobReporter::Hooks Session::jobHooks()
+{
+    JobReporter::Hooks hooks;
+    hooks.follow = [this](const fixwell::DiskReferencePointer& disk) {
+        follow(disk);
+    };
+    hooks.errorText = [this](fixwell::ErrorCode code) {
+        return host_.OVLocalizedErrorString(code);
+    };
+    hooks.runBegan = [this](const fixwell::DiskReferencePointer& disk, Operation operation) {
+        const std::string key = historyKey(disk);
+        return key.empty() ? 0
+                           : host_.historyStore().beginRun(key, nameOf(operation),
+                                                           std::chrono::system_clock::now());
+    };
+    hooks.runEnded = [this](std::int64_t run, const JobReporter::Outcome& outcome) {
+        if (run != 0)
+            host_.historyStore().endRun(run, {outcome.verdict, outcome.error, outcome.message},
+                                        std::chrono::system_clock::now());
+    };
+    return hooks;
+}
+
+std::string Session::historyKey(const fixwell::DiskReferencePointer& reference)
+{
+    const auto disk =
+        std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
+    return disk ? host_.histories().keyOf(disk->facts()) : std::string();
+}
+
+Outcome<> Session::loadModule()
+{
+    const auto bundles =
+        findModuleBundles(moduleDirectories(environmentValue, runningExecutable()));
+    if (bundles.empty())
+        return cannot("find", "Fixwell.ovmodule", "no module directory holds it");
+    auto loaded = orvane::loadModule(bundles.front());
+    if (failed(loaded))
+        return Failure{failureMessage(loaded)};
+    loaded_ = std::get<LoadedModule>(std::move(loaded));
+    libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
+    if (!shouldRun(loaded_, host_))
+        return cannot("use", "Fixwell", "it is switched off in the settings (OVModule_FXW)");
+    auto made = makeModule(loaded_, host_, *this);
+    if (failed(made))
+        return Failure{failureMessage(made)};
+    module_ = std::get<std::unique_ptr<fixwell::OVModule>>(std::move(made));
+    observedLibrary_.setDelegate(module_->asyncDelegate());
+    return Done{};
+}
+
+Outcome<Session::DiskPointer> Session::findDisk(const std::string& name)
+{
+    auto found = DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
+    if (!failed(found))
+        names_.add(std::get<DiskPointer>(found)->facts().identifier, name);
+    return found;
+}
+
+Session::DiskPointer Session::attach(const DiskPointer& image)
+{
+    if (!image->isOfflineDiskImage())
+        return nullptr;
+    fixwell::Dictionary result;
+    if (host_.imageAttachment().AttachImageWithURL(image->diskImagePath(), result) != 0)
+        return nullptr;
+    const auto top =
+        std::dynamic_pointer_cast<Disk>(host_.imageAttachment().TopLevelPLDiskForImageDict(result));
+    if (top)
+        host_.sharedDiskController().adopt(top);
+    return top;
+}
+
+void Session::detach(const DiskPointer& topLevelDisk)
+{
+    if (topLevelDisk)
+        host_.sharedDiskController().ejectDisk(topLevelDisk, true);
+}
+
+void Session::select(const std::vector<DiskPointer>& disks)
+{
+    logView_.holdBack();
+    window_.select({disks.begin(), disks.end()});
+    module_->windowChangedNotication({fixwell::OVDiskChangedNotification, nullptr, {}});
+}
+
+// The disk list of a window would keep its selection; here the log goes with the disk that is
+// being worked on, so that its rows come one after the other.
+void Session::follow(const fixwell::DiskReferencePointer& reference)
+{
+    if (const auto disk =
+            std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference)))
+        select({disk});
+    logView_.followFromLastRow();
+    if (isStopping_)
+        loop_.post([this] { pressStop(); });
+}
+
+TerminalButton& Session::button(std::string_view outlet)
+{
+    static TerminalButton missing;
+    TerminalButton* const found = interface_.button(outlet);
+    return found != nullptr ? *found : missing;
+}
+
+void Session::pressAndWait(TerminalButton& button)
+{
+    if (!interface_.press(button))
+        return;
+    loop_.runUntil([this] { return !window_.interfaceLock() && !alerts_.isAsking(); });
+    jobs_.flush();
+    host_.histories().saveNew();
+}
+
+void Session::writeAllRowsOf(const std::string& name)
+{
+    jobs_.setCurrentDisk(name);
+    logView_.writeAllRows();
+}
+
+// The first interruption is the Stop button. A job whose images are still being attached cannot
+// be stopped yet; it is as soon as it begins. Every further one presses the tool harder.
+void Session::interrupt()
+{
+    const bool isFirst = !isStopping_;
+    isStopping_ = true;
+    if (!isFirst)
+        observedLibrary_.cancelAgain();
+    else
+        pressStop();
+}
+
+bool Session::pressStop()
+{
+    constexpr std::array outlets{"verifyDiskButton", "repairDiskButton", "verifyPermissionsButton",
+                                 "repairPermissionsButton"};
+    for (const char* outlet : outlets) {
+        TerminalButton& candidate = button(outlet);
+        if (!jobs_.currentDisk().empty() && candidate.action() == "stopAction:" &&
+            interface_.press(candidate))
+            return true;
+    }
+    return false;
+}
+
+}  // namespace orvane

@@ -1,0 +1,92 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/jobs/LibraryTexts.h"
+#include "orvane/jobs/ObservedManager.h"
+#include "orvane/support/modules/ModuleLoader.h"
+#include "orvane/terminal/CommandLine.h"
+#include "orvane/terminal/DiskNames.h"
+#include "orvane/terminal/Interrupts.h"
+#include "orvane/terminal/JobReporter.h"
+#include "orvane/terminal/TerminalHost.h"
+#include "orvane/terminal/TerminalWindow.h"
+#include "pellar/Manager.h"
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace orvane {
+
+/// One run of the program: the host, the library and the module, and what the commands do with
+/// them. Main thread only; one at a time.
+class Session final : private fixwell::ModuleSite {
+public:
+    using DiskPointer = std::shared_ptr<Disk>;
+
+    /// The reporter outlives the session.
+    Session(const Request& request, Reporter& reporter);
+    Session(const Session&) = delete;
+    Session& operator=(const Session&) = delete;
+    ~Session() override;
+
+    /// Loads the module; a sentence when that fails.
+    [[nodiscard]] Outcome<> loadModule();
+
+    /// The disk that the user means; its later rows and events go by that name.
+    [[nodiscard]] Outcome<DiskPointer> findDisk(const std::string& name);
+    /// Makes the volumes of an image file known, as a job would; none for any other disk. To be
+    /// given back with `detach`.
+    DiskPointer attach(const DiskPointer& image);
+    void detach(const DiskPointer& topLevelDisk);
+
+    /// What a click on these disks in a list would do.
+    void select(const std::vector<DiskPointer>& disks);
+    TerminalButton& button(std::string_view outlet);
+    /// Presses the button, and returns when the job is over or was declined.
+    void pressAndWait(TerminalButton& button);
+    /// Writes the selected disks' whole log, under the name that the user gave.
+    void writeAllRowsOf(const std::string& name);
+
+    bool wasDeclined() const { return alerts_.wasDeclined(); }
+    bool wasStopped() const { return isStopping_; }
+    TerminalHost& host() { return host_; }
+    const DiskNames& names() const { return names_; }
+    const JobReporter& jobs() const { return jobs_; }
+
+private:
+    bool isActiveTab() const override { return true; }
+    fixwell::OVWindowController& windowController() override { return window_; }
+    fixwell::OVDiskPointer workingDisk() const override { return nullptr; }
+    fixwell::Window& window() override { return window_; }
+    fixwell::Bundle& bundle() override { return *loaded_.bundle; }
+    fixwell::PLManager& pl() override { return observedLibrary_; }
+
+    SupportOptions supportOptions(const Request& request);
+    pellar::ManagerOptions libraryOptions(const Request& request);
+    JobReporter::Hooks jobHooks();
+    void follow(const fixwell::DiskReferencePointer& disk);
+    void interrupt();
+    bool pressStop();
+    std::string historyKey(const fixwell::DiskReferencePointer& disk);
+
+    Reporter& reporter_;
+    MainLoop loop_;
+    Interrupts interrupts_;
+    DiskNames names_;
+    TerminalWindow window_;
+    LogView logView_;
+    Interface interface_;
+    TerminalAlerts alerts_;
+    Catalogue hostTexts_;
+    LibraryTexts libraryTexts_;
+    pellar::Manager library_;
+    TerminalHost host_;
+    JobReporter jobs_;
+    ObservedManager observedLibrary_;
+    LoadedModule loaded_;
+    std::unique_ptr<fixwell::OVModule> module_;
+    bool isStopping_ = false;
+};
+
+}  // namespace orvane

@@ -1,0 +1,65 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/TerminalAlerts.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/terminal/Controls.h"
+
+#include <cstdio>
+#include <iostream>
+
+namespace orvane {
+
+class TerminalAlerts::Question final : public fixwell::Alert,
+                                       public std::enable_shared_from_this<Question> {
+public:
+    Question(TerminalAlerts& alerts, Text text) : alerts_(alerts), text_(std::move(text)) {}
+
+    std::vector<fixwell::Button*> buttons() override { return {&default_, &alternate_}; }
+    void orderOut() override {}
+
+    void beginSheetModalForWindow(fixwell::Window* /*window*/,
+                                  std::function<void(fixwell::Alert&, long)> end) override
+    {
+        alerts_.isAsking_ = true;
+        alerts_.loop_.performOnMainThread(
+            [self = shared_from_this(), end = std::move(end)] {
+                const bool isConfirmed = self->isConfirmed();
+                self->alerts_.isAsking_ = false;
+                self->alerts_.wasDeclined_ = !isConfirmed;
+                const TerminalButton& pressed = isConfirmed ? self->default_ : self->alternate_;
+                end(*self, static_cast<long>(pressed.tag()));
+            },
+            fixwell::RunLoop::Wait::No);
+    }
+
+private:
+    bool isConfirmed() const
+    {
+        if (alerts_.answer_ != Answer::Ask)
+            return alerts_.answer_ == Answer::Confirm;
+        alerts_.reporter_.alert(text_.message, text_.informative);
+        std::printf("%s [y/N] ", fixwell::printable(text_.defaultButton).c_str());
+        std::fflush(stdout);
+        std::string answer;
+        std::getline(std::cin, answer);
+        return answer == "y" || answer == "Y" || answer == "yes";
+    }
+
+    TerminalAlerts& alerts_;
+    Text text_;
+    TerminalButton default_;
+    TerminalButton alternate_;
+};
+
+std::shared_ptr<fixwell::Alert> TerminalAlerts::makeAlert(const fixwell::Alert::Text& text)
+{
+    return std::make_shared<Question>(*this, text);
+}
+
+void TerminalAlerts::simpleModuleAlert(const std::string& title, const std::string& message,
+                                       std::int32_t /*error*/)
+{
+    reporter_.alert(title, message);
+}
+
+}  // namespace orvane

@@ -1,0 +1,93 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/TerminalText.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+
+#include <algorithm>
+#include <cwchar>
+
+namespace orvane {
+namespace {
+
+constexpr std::string_view reset = "\x1b[0m";
+
+std::string lookOf(const fixwell::TextStyle& style)
+{
+    std::string look;
+    if (style.font && style.font->isBold)
+        look += "\x1b[1m";
+    if (style.color && style.color->red > style.color->green)
+        look += "\x1b[31m";
+    else if (style.color && style.color->green > style.color->red)
+        look += "\x1b[32m";
+    return look;
+}
+
+std::size_t columnsOf(char32_t character)
+{
+    const int columns = ::wcwidth(static_cast<wchar_t>(character));
+    return columns < 0 ? 1 : static_cast<std::size_t>(columns);
+}
+
+/// The look is given up before each line end, so that no colour runs into what follows.
+void appendLine(std::string& result, std::string_view line, const std::string& look)
+{
+    if (line.empty())
+        return;
+    result += look;
+    result += fixwell::printable(line);
+    if (!look.empty())
+        result += reset;
+}
+
+}  // namespace
+
+std::string safeLines(std::string_view text)
+{
+    std::string result;
+    while (!text.empty()) {
+        const std::size_t end = std::min(text.find('\n'), text.size());
+        result += fixwell::printable(text.substr(0, end));
+        if (end < text.size())
+            result += '\n';
+        text.remove_prefix(std::min(end + 1, text.size()));
+    }
+    return result;
+}
+
+std::string terminalText(const fixwell::StyledText& text, bool colors)
+{
+    if (!colors)
+        return safeLines(text.characters());
+    std::string result;
+    std::string_view rest = text.characters();
+    for (const fixwell::StyledText::Run& run : text.runs()) {
+        const std::string look = lookOf(*run.style);
+        std::string_view part = rest.substr(0, run.length);
+        rest.remove_prefix(run.length);
+        while (!part.empty()) {
+            const std::size_t end = std::min(part.find('\n'), part.size());
+            appendLine(result, part.substr(0, end), look);
+            if (end < part.size())
+                result += '\n';
+            part.remove_prefix(std::min(end + 1, part.size()));
+        }
+    }
+    return result;
+}
+
+std::string fittedTo(std::string_view text, std::size_t columns)
+{
+    std::string fitted;
+    while (!text.empty()) {
+        const char32_t character = fixwell::takeCharacter(text);
+        const std::size_t width = columnsOf(character);
+        if (width > columns)
+            break;
+        columns -= width;
+        fixwell::appendUTF8(fitted, character);
+    }
+    return fitted;
+}
+
+}  // namespace orvane

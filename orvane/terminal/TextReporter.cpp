@@ -1,0 +1,168 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/TextReporter.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/terminal/ByteCount.h"
+#include "orvane/terminal/TerminalText.h"
+
+#include <fmt/format.h>
+
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+namespace orvane {
+namespace {
+
+constexpr std::chrono::milliseconds redrawInterval{100};
+
+std::size_t terminalColumns()
+{
+    winsize size{};
+    if (::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 1)
+        return size.ws_col - 1U;  // the last column stays free: some terminals wrap there
+    return 79;
+}
+
+}  // namespace
+
+void TextReporter::write(std::string_view text)
+{
+    if (text.empty())
+        return;
+    hideProgress();
+    std::fwrite(text.data(), 1, text.size(), stdout);
+    isAtLineStart_ = text.back() == '\n';
+}
+
+void TextReporter::endLine()
+{
+    if (!isAtLineStart_)
+        write("\n");
+}
+
+std::string TextReporter::bold(std::string_view text) const
+{
+    const std::string safe = safeLines(text);
+    return options_.colors ? "\x1b[1m" + safe + "\x1b[0m" : safe;
+}
+
+void TextReporter::started(const std::string& /*disk*/, std::string_view /*action*/,
+                           const std::string& title)
+{
+    progress_.status = title;
+    progress_.percent.reset();
+    began_ = Clock::now();
+    endLine();
+}
+
+void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary& /*record*/,
+                          const fixwell::StyledText& text)
+{
+    write(terminalText(text, options_.colors));
+    drawProgress();
+}
+
+void TextReporter::progress(const std::string& /*disk*/, std::optional<double> percent,
+                            const std::string& status)
+{
+    progress_.percent = percent;
+    progress_.status = status;
+    drawProgress();
+}
+
+void TextReporter::drawProgress()
+{
+    const Clock::time_point now = Clock::now();
+    const bool isDue = !isProgressShown_ || now - drawn_ >= redrawInterval;
+    if (!options_.showsProgress || !isAtLineStart_ || progress_.status.empty() || !isDue)
+        return;
+    progress_.elapsed = std::chrono::duration_cast<std::chrono::seconds>(now - began_);
+    const std::string line = "\r\x1b[K" + progressLine(progress_, terminalColumns());
+    std::fwrite(line.data(), 1, line.size(), stdout);
+    std::fflush(stdout);
+    drawn_ = now;
+    isProgressShown_ = true;
+}
+
+void TextReporter::hideProgress()
+{
+    if (!isProgressShown_)
+        return;
+    std::fputs("\r\x1b[K", stdout);
+    isProgressShown_ = false;
+}
+
+// What a person needs to know of these three stands in the log's rows and in the alert.
+void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verdict*/,
+                            fixwell::ErrorCode /*error*/, std::string_view /*message*/)
+{
+    progress_.status.clear();
+    hideProgress();
+    endLine();
+    std::fflush(stdout);
+}
+
+void TextReporter::report(const std::string& /*disk*/, const fixwell::Dictionary& /*report*/) {}
+
+void TextReporter::alert(const std::string& title, const std::string& message)
+{
+    endLine();
+    write("\n" + bold(title) + "\n" + safeLines(message) + "\n");
+}
+
+void TextReporter::failure(const std::string& /*disk*/, const std::string& sentence)
+{
+    warning(sentence);
+}
+
+void TextReporter::warning(const std::string& sentence)
+{
+    hideProgress();
+    endLine();
+    std::fflush(stdout);
+    const std::string line = "fixwell: " + fixwell::printable(sentence) + "\n";
+    std::fwrite(line.data(), 1, line.size(), stderr);
+}
+
+void TextReporter::listed(const DiskLine& disk)
+{
+    const std::string indent = disk.isVolume ? "  " : "";
+    std::string facts = byteCount(disk.bytes) + "  " + disk.kind;
+    if (!disk.filesystem.empty())
+        facts += "  " + disk.filesystem;
+    if (!disk.mountPoint.empty())
+        facts += fmt::format("  mounted at {}", disk.mountPoint);
+    write(indent + bold(disk.disk) +
+          (disk.name.empty() ? "" : fixwell::printable("  “" + disk.name + "”")) + "  " +
+          fixwell::printable(facts) + "\n");
+    write(indent + "    " +
+          (disk.lastChecked.empty()
+               ? std::string("never checked")
+               : fmt::format("last checked {}: {}", disk.lastChecked, disk.verdict)) +
+          "\n");
+    for (const ActionLine& action : disk.actions)
+        write(fmt::format(
+            "{}    {:<24} {}\n", indent, action.title,
+            action.isAvailable ? std::string("available") : fixwell::printable(action.reason)));
+}
+
+void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
+{
+    endLine();
+    write(bold(disk) + (runs.empty() ? ": never checked\n" : "\n"));
+    for (const RunLine& run : runs)
+        write(fixwell::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
+                                             run.verdict.empty() ? "cut off" : run.verdict)) +
+              "\n");
+    if (!runs.empty())
+        write("\n");
+}
+
+void TextReporter::end()
+{
+    hideProgress();
+    endLine();
+    std::fflush(stdout);
+}
+
+}  // namespace orvane

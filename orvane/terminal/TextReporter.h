@@ -1,0 +1,56 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/terminal/ProgressLine.h"
+#include "orvane/terminal/Reporter.h"
+
+#include <chrono>
+#include <cstdio>
+
+namespace orvane {
+
+/// Speaks to people: rows as they come, and on a terminal one live line at the bottom.
+class TextReporter final : public Reporter {
+public:
+    struct Options {
+        bool colors = false;
+        bool showsProgress = false;
+    };
+
+    explicit TextReporter(Options options) : options_(options) {}
+    ~TextReporter() override { hideProgress(); }
+
+    void started(const std::string& disk, std::string_view action,
+                 const std::string& title) override;
+    void record(const std::string& disk, const fixwell::Dictionary& record,
+                const fixwell::StyledText& text) override;
+    void progress(const std::string& disk, std::optional<double> percent,
+                  const std::string& status) override;
+    void finished(const std::string& disk, std::string_view verdict, fixwell::ErrorCode error,
+                  std::string_view message) override;
+    void report(const std::string& disk, const fixwell::Dictionary& report) override;
+    void alert(const std::string& title, const std::string& message) override;
+    void failure(const std::string& disk, const std::string& sentence) override;
+    void warning(const std::string& sentence) override;
+    void listed(const DiskLine& disk) override;
+    void runs(const std::string& disk, const std::vector<RunLine>& runs) override;
+    void end() override;
+
+private:
+    using Clock = std::chrono::steady_clock;
+
+    void write(std::string_view text);
+    void endLine();
+    void hideProgress();
+    void drawProgress();
+    std::string bold(std::string_view text) const;
+
+    Options options_;
+    JobProgress progress_;
+    Clock::time_point began_ = Clock::now();
+    Clock::time_point drawn_{};
+    bool isProgressShown_ = false;
+    bool isAtLineStart_ = true;
+};
+
+}  // namespace orvane

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/commands/ActionButtons.h"
+
+#include <algorithm>
+
+namespace orvane {
+
+const ActionButton& actionButtonFor(Command command)
+{
+    const auto found =
+        std::find_if(actionButtons.begin(), actionButtons.end(),
+                     [command](const ActionButton& action) { return action.command == command; });
+    return found == actionButtons.end() ? actionButtons.front() : *found;
+}
+
+std::string unavailableReason(Session& session, const TerminalButton& button)
+{
+    const std::string reason = button.reason();
+    return reason.empty() ? session.host().translator().text("Not available for this disk.")
+                          : reason;
+}
+
+std::string unavailableSentence(Session& session, const TerminalButton& button,
+                                const NamedDisk& disk)
+{
+    return fixwell::format("%@: %@: %@",
+                           {disk.name, button.title(), unavailableReason(session, button)});
+}
+
+}  // namespace orvane

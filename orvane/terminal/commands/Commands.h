@@ -1,0 +1,31 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/terminal/CommandLine.h"
+#include "orvane/terminal/Reporter.h"
+#include "orvane/terminal/Session.h"
+
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace orvane {
+
+/// A disk as the user named it.
+struct NamedDisk {
+    std::string name;
+    std::shared_ptr<Disk> disk;
+};
+
+/// Finds each disk; one that cannot be found is reported, and adds exitUnchecked to `status`.
+std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session& session,
+                                 Reporter& reporter, int& status);
+
+// Each answers the exit status.
+
+/// Verify or repair: all disks together as one job, as if they were selected in a window.
+int runAction(const Request& request, Session& session, Reporter& reporter);
+int runList(const Request& request, Session& session, Reporter& reporter);
+int runHistory(const Request& request, Session& session, Reporter& reporter);
+
+}  // namespace orvane

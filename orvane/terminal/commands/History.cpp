@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/commands/Commands.h"
+#include "orvane/terminal/commands/LocalTime.h"
+
+#include <algorithm>
+
+namespace orvane {
+namespace {
+
+std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Session& session)
+{
+    std::vector<Run> runs;
+    for (const std::shared_ptr<Disk>& disk : disks) {
+        const std::vector<Run> more =
+            session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()));
+        runs.insert(runs.end(), more.begin(), more.end());
+    }
+    std::stable_sort(runs.begin(), runs.end(),
+                     [](const Run& a, const Run& b) { return a.started < b.started; });
+    std::vector<RunLine> lines;
+    for (const Run& run : runs)
+        lines.push_back({localTime(run.started), run.action, run.end ? run.end->verdict : "",
+                         run.end ? run.end->message : ""});
+    return lines;
+}
+
+}  // namespace
+
+int runHistory(const Request& request, Session& session, Reporter& reporter)
+{
+    int status = 0;
+    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
+        const std::shared_ptr<Disk> top = session.attach(named.disk);
+        const std::shared_ptr<Disk> shown = top ? top : named.disk;
+        std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
+        session.select({shown});
+        if (request.clearsHistory) {
+            // A volume's history is its own to clear, the whole disk's alone would leave it.
+            session.select(selection);
+            session.pressAndWait(session.button("clearHistoryButton"));
+        } else {
+            reporter.runs(named.name, runsOf(selection, session));
+            session.writeAllRowsOf(named.name);
+        }
+        session.detach(top);
+    }
+    return status;
+}
+
+}  // namespace orvane

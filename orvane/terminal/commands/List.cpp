@@ -1,0 +1,112 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/terminal/commands/ActionButtons.h"
+#include "orvane/terminal/commands/Commands.h"
+#include "orvane/terminal/commands/LocalTime.h"
+
+namespace orvane {
+namespace {
+
+std::string_view kindText(std::int32_t type)
+{
+    switch (type) {
+        case diskType::whole: return "disk";
+        case diskType::container: return "container";
+        case diskType::volume: return "volume";
+        case diskType::diskImage: return "disk image";
+        case diskType::bareVolume: return "volume";
+        case diskType::assembled: return "assembled volume";
+        case diskType::opticalDisc: return "optical disc";
+        default: return "disk";
+    }
+}
+
+std::vector<ActionLine> actionsFor(const std::shared_ptr<Disk>& disk, Session& session)
+{
+    session.select({disk});
+    std::vector<ActionLine> lines;
+    for (const ActionButton& action : actionButtons) {
+        const TerminalButton& button = session.button(action.outlet);
+        lines.push_back({action.name, button.title(), button.isEnabled(),
+                         button.isEnabled() ? "" : unavailableReason(session, button)});
+    }
+    return lines;
+}
+
+DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
+{
+    const DiskFacts& facts = disk->facts();
+    DiskLine line;
+    line.disk = session.names().nameOf(facts.identifier);
+    line.name = facts.displayName;
+    line.kind = session.host().translator().text(kindText(facts.type));
+    line.filesystem = facts.filesystem;
+    line.bytes = facts.length;
+    line.mountPoint = facts.mountPoint;
+    if (const auto run =
+            session.host().historyStore().lastRun(session.host().histories().keyOf(facts))) {
+        line.lastChecked = localTime(run->started);
+        line.verdict = run->end ? run->end->verdict : session.host().translator().text("cut off");
+    }
+    return line;
+}
+
+void listTree(const std::shared_ptr<Disk>& disk, bool isVolume, Session& session,
+              Reporter& reporter)
+{
+    DiskLine line = describe(disk, session);
+    line.isVolume = isVolume;
+    line.actions = actionsFor(disk, session);
+    reporter.listed(line);
+    for (const std::shared_ptr<Disk>& part : disk->parts())
+        if (part->facts().isShown)
+            listTree(part, true, session, reporter);
+}
+
+/// What an image holds is shown below it; commands take the image, and treat every volume of it.
+void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
+{
+    const std::shared_ptr<Disk> top = session.attach(image.disk);
+    DiskLine line = describe(image.disk, session);
+    line.actions = actionsFor(image.disk, session);
+    if (top && top->parts().empty()) {
+        const DiskLine volume = describe(top, session);
+        line.filesystem = volume.filesystem;
+        line.name = volume.name;
+        line.lastChecked = volume.lastChecked;
+        line.verdict = volume.verdict;
+    }
+    reporter.listed(line);
+    for (const std::shared_ptr<Disk>& part :
+         top ? top->parts() : std::vector<std::shared_ptr<Disk>>()) {
+        if (!part->facts().isShown)
+            continue;
+        DiskLine volume = describe(part, session);
+        volume.isVolume = true;
+        reporter.listed(volume);
+    }
+    session.detach(top);
+}
+
+}  // namespace
+
+int runList(const Request& request, Session& session, Reporter& reporter)
+{
+    int status = 0;
+    if (request.disks.empty()) {
+        session.host().refreshDisks();
+        for (const std::shared_ptr<Disk>& disk : session.host().sharedDiskController().roots())
+            listTree(disk, false, session, reporter);
+        return status;
+    }
+    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
+        if (named.disk->isOfflineDiskImage())
+            listImage(named, session, reporter);
+        else
+            listTree(named.disk, named.disk->parentDisk() != nullptr, session, reporter);
+    }
+    return status;
+}
+
+}  // namespace orvane

@@ -1,0 +1,98 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/terminal/ExitStatus.h"
+#include "orvane/terminal/commands/ActionButtons.h"
+#include "orvane/terminal/commands/Commands.h"
+
+#include <algorithm>
+
+namespace orvane {
+namespace {
+
+/// A button that is off for several disks may be so because of one of them, so each is asked
+/// alone: one bad disk does not keep the others from being checked.
+std::vector<NamedDisk> usableDisks(const std::vector<NamedDisk>& disks, const ActionButton& action,
+                                   Session& session, Reporter& reporter, int& status)
+{
+    std::vector<NamedDisk> usable;
+    for (const NamedDisk& named : disks) {
+        session.select({named.disk});
+        const TerminalButton& button = session.button(action.outlet);
+        if (button.isEnabled()) {
+            usable.push_back(named);
+            continue;
+        }
+        reporter.failure(named.name, unavailableSentence(session, button, named));
+        status |= exitUnchecked;
+    }
+    return usable;
+}
+
+std::vector<std::shared_ptr<Disk>> selectionOf(const std::vector<NamedDisk>& disks)
+{
+    std::vector<std::shared_ptr<Disk>> selection;
+    for (const NamedDisk& named : disks)
+        selection.push_back(named.disk);
+    return selection;
+}
+
+/// The verdicts of the disk and of what lies inside it; for a disk that no job reached, why.
+int settle(const NamedDisk& named, Session& session, Reporter& reporter)
+{
+    int status = 0;
+    bool wasReached = false;
+    for (const auto& [identifier, outcome] : session.jobs().outcomes()) {
+        if (!DiskNames::isWithin(identifier, named.disk->facts().identifier))
+            continue;
+        status |= exitStatusFor(outcome.verdict);
+        wasReached = true;
+    }
+    if (session.wasStopped())
+        return status | exitStopped;
+    if (wasReached)
+        return status;
+    const Translator& translator = session.host().translator();
+    std::string why = session.host().imageAttachment().lastError(named.disk->diskImagePath());
+    if (session.wasDeclined())
+        why = translator.sentence("“%@” was not checked: the question was not answered with yes",
+                                  {named.name});
+    else if (why.empty())
+        why = translator.sentence("cannot check “%@”: there is no volume on it that can be checked",
+                                  {named.name});
+    reporter.failure(named.name, why);
+    return exitUnchecked;
+}
+
+}  // namespace
+
+int runAction(const Request& request, Session& session, Reporter& reporter)
+{
+    int status = 0;
+    const ActionButton& action = actionButtonFor(request.command);
+    const std::vector<NamedDisk> disks = usableDisks(
+        findDisks(request.disks, session, reporter, status), action, session, reporter, status);
+    if (disks.empty())
+        return status;
+    session.select(selectionOf(disks));
+    session.pressAndWait(session.button(action.outlet));
+    for (const NamedDisk& named : disks)
+        status |= settle(named, session, reporter);
+    return status;
+}
+
+std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session& session,
+                                 Reporter& reporter, int& status)
+{
+    std::vector<NamedDisk> disks;
+    for (const std::string& name : names) {
+        auto found = session.findDisk(name);
+        if (failed(found)) {
+            reporter.failure(name, failureMessage(found));
+            status |= exitUnchecked;
+            continue;
+        }
+        disks.push_back({name, std::get<std::shared_ptr<Disk>>(std::move(found))});
+    }
+    return disks;
+}
+
+}  // namespace orvane

@@ -1,0 +1,38 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/Manager.h"
+
+#include "pellar/RepairDisk.h"
+#include "pellar/tools/Capability.h"
+
+#include <utility>
+
+namespace pellar {
+
+Manager::Manager(fixwell::RunLoop& loop, const Texts& texts, ManagerOptions options)
+    : loop_(loop), texts_(texts), options_(std::move(options))
+{
+}
+
+std::unique_ptr<fixwell::PLRepairDisk> Manager::makeRepairDisk()
+{
+    if (delegate_ == nullptr)
+        return nullptr;
+    return std::make_unique<RepairDisk>(loop_, texts_, options_, *delegate_);
+}
+
+bool Manager::canVerify(std::string_view filesystemType) const
+{
+    return capabilityFor(filesystemType, Operation::Verify, options_.toolPath).isGiven();
+}
+
+bool Manager::canRepair(std::string_view filesystemType) const
+{
+    return capabilityFor(filesystemType, Operation::Repair, options_.toolPath).isGiven();
+}
+
+std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
+{
+    return capabilityFor(filesystemType, operation, options_.toolPath).reason.in(texts_);
+}
+
+}  // namespace pellar

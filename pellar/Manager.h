@@ -1,0 +1,40 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/RunLoop.h"
+#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "pellar/ManagerOptions.h"
+#include "pellar/Texts.h"
+#include "pellar/tools/Operation.h"
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+namespace pellar {
+
+/// The library as one module sees it. Main thread; outlives the tools made with it, as the run
+/// loop and the texts outlive the manager.
+class Manager final : public fixwell::PLManager {
+public:
+    Manager(fixwell::RunLoop& loop, const Texts& texts, ManagerOptions options = {});
+
+    void setDelegate(fixwell::PLAsyncDelegate* delegate) override { delegate_ = delegate; }
+    /// Null when there is no delegate yet.
+    std::unique_ptr<fixwell::PLRepairDisk> makeRepairDisk() override;
+
+    /// There is an installed tool that can verify (repair) this kind of file system, by
+    /// libblkid's name of it. Looks in a few directories.
+    bool canVerify(std::string_view filesystemType) const;
+    bool canRepair(std::string_view filesystemType) const;
+    /// Why not, in the user's language; empty when it can.
+    std::string reasonAgainst(std::string_view filesystemType, Operation operation) const;
+
+private:
+    fixwell::RunLoop& loop_;
+    const Texts& texts_;
+    const ManagerOptions options_;
+    fixwell::PLAsyncDelegate* delegate_ = nullptr;  // not owned
+};
+
+}  // namespace pellar

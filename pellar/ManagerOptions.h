@@ -1,0 +1,28 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/process/OutputBudget.h"
+#include "pellar/volumes/SystemPaths.h"
+
+#include <chrono>
+#include <functional>
+#include <string>
+#include <string_view>
+
+namespace pellar {
+
+struct ManagerOptions {
+    /// Where tools are looked for: absolute directories, the first that has the tool wins.
+    std::string toolPath = "/usr/sbin:/usr/bin:/sbin:/bin";
+    /// For one run of a tool.
+    OutputLimits outputLimits;
+    /// A tool that prints nothing for so long is ended. None when 0: silence is no hang, a volume
+    /// with multiple-mount protection alone keeps e2fsck quiet for 11 s.
+    std::chrono::milliseconds silenceLimit{0};
+    /// Told every command before it runs, and why a tool was chosen or refused. Main thread; may be
+    /// empty. Not called after the PLRepairDisk has been destroyed.
+    std::function<void(std::string_view)> commandTrace;
+    SystemPaths systemPaths;
+};
+
+}  // namespace pellar

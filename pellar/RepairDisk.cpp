@@ -1,0 +1,129 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/RepairDisk.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "pellar/tools/Capability.h"
+#include "pellar/tools/ToolTable.h"
+
+#include <utility>
+#include <variant>
+
+namespace pellar {
+namespace {
+
+using fixwell::DiskReferencePointer;
+using fixwell::ErrorCode;
+
+bool isVolume(const DiskReferencePointer& disk)
+{
+    return disk && !disk->path.empty() && !disk->isWhole;
+}
+
+bool answer(bool value, ErrorCode* error)
+{
+    if (error != nullptr)
+        *error = fixwell::kPLNoError;
+    return value;
+}
+
+}  // namespace
+
+RepairDisk::RepairDisk(fixwell::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
+                       fixwell::PLAsyncDelegate& delegate)
+    : loop_(loop), texts_(texts), options_(options), delegate_(delegate)
+{
+}
+
+ErrorCode RepairDisk::beginStoragesystemFilesystemVerifyForDisk(const DiskReferencePointer& disk)
+{
+    return begin(disk, Operation::Verify);
+}
+
+ErrorCode RepairDisk::beginStoragesystemFilesystemRepairForDisk(const DiskReferencePointer& disk)
+{
+    return begin(disk, Operation::Repair);
+}
+
+ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer&)
+{
+    return fixwell::kPLErrorUnsupported;
+}
+
+ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer&)
+{
+    return fixwell::kPLErrorUnsupported;
+}
+
+ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer&)
+{
+    return fixwell::kPLErrorUnsupported;
+}
+
+ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer&)
+{
+    return fixwell::kPLErrorUnsupported;
+}
+
+bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer&, ErrorCode* error)
+{
+    return answer(false, error);
+}
+
+bool RepairDisk::canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
+                                                         ErrorCode* error)
+{
+    return answer(isVolume(disk), error);
+}
+
+bool RepairDisk::canVerifyStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
+                                                         ErrorCode* error)
+{
+    return answer(isVolume(disk), error);
+}
+
+void RepairDisk::cancelCurrentOperation()
+{
+    if (job_)
+        job_->stop();
+}
+
+ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operation)
+{
+    if (const ErrorCode error = refusal(disk, operation))
+        return error;
+    const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
+    if (const auto* const error = std::get_if<ErrorCode>(&claim))
+        return *error;
+    start({disk, operation, std::move(std::get<DiskClaim>(claim)), toolFor(disk->filesystem)});
+    return fixwell::kPLNoError;
+}
+
+/// What can be said without touching the disk.
+ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operation) const
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    if (disk->isWhole)
+        return fixwell::kPLErrorUnsupported;
+    if (disk->filesystem.empty())
+        return fixwell::kPLNoError;
+    const Capability capability = capabilityFor(disk->filesystem, operation, options_.toolPath);
+    if (options_.commandTrace)
+        options_.commandTrace(
+            fixwell::printable(disk->filesystem) + ": " +
+            (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
+    return capability.error;
+}
+
+void RepairDisk::start(JobRequest request)
+{
+    EventReceiver receiver{&delegate_, request.disk, options_.commandTrace, [this] {
+                               job_.reset();
+                           }};
+    job_ = std::make_unique<Job>(std::move(request), std::move(receiver), loop_, options_, texts_);
+}
+
+}  // namespace pellar

@@ -1,0 +1,25 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/Job.h"
+
+#include <memory>
+#include <utility>
+
+namespace pellar {
+
+Job::Job(JobRequest request, EventReceiver receiver, fixwell::RunLoop& loop,
+         const ManagerOptions& options, const Texts& texts)
+    : road_(loop, std::move(receiver))
+{
+    auto script = std::make_unique<JobScript>(std::move(request), options, texts, stop_, road_);
+    thread_ = std::jthread([script = std::move(script)] { script->run(); });
+}
+
+// Closed first: the job's thread must not wait for a main loop that waits for the thread.
+Job::~Job()
+{
+    road_.close();
+    stop_.pressHard();
+    thread_.join();
+}
+
+}  // namespace pellar

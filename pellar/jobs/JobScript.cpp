@@ -1,0 +1,193 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/JobScript.h"
+
+#include "pellar/jobs/ToolRun.h"
+#include "pellar/tools/ToolTable.h"
+
+#include <utility>
+
+namespace pellar {
+namespace {
+
+/// The share of the progress that a repair takes; the verification behind it takes the rest.
+constexpr double repairShare = 60;
+
+Outcome failure(fixwell::ErrorCode code, Sentence reason)
+{
+    return {Verdict::Failed, code, 0, std::move(reason)};
+}
+
+}  // namespace
+
+JobScript::JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
+                     StopSwitch& stop, EventRoad& road)
+    : claim_(std::move(request.claim)),
+      operation_(request.operation),
+      tool_(request.tool),
+      options_(options),
+      texts_(texts),
+      stop_(stop),
+      road_(road),
+      disk_(std::move(request.disk)),
+      log_(*disk_, texts, road)
+{
+}
+
+void JobScript::run()
+{
+    log_.started();
+    for (State state = State::Examining; state != State::Done;)
+        state = next(state);
+    // Given back before it is told, so that the receiver may mount it at once.
+    claim_.reset();
+    report();
+}
+
+JobScript::State JobScript::next(State state)
+{
+    switch (state) {
+        case State::Examining: return examine();
+        case State::Verifying: return verify();
+        case State::Repairing: return repair();
+        case State::Confirming: return confirm();
+        case State::Done: break;
+    }
+    return State::Done;
+}
+
+JobScript::State JobScript::examine()
+{
+    if (tool_ == nullptr)
+        tool_ = findTool();
+    if (tool_ != nullptr) {
+        program_ = findProgram(tool_->name(), options_.toolPath);
+        volume_ = factsFor(*tool_);
+    }
+    if (const auto objection = this->objection())
+        return end(*objection);
+    if (const auto objection = objectionToSize())
+        return end(*objection);
+    return operation_ == Operation::Verify ? State::Verifying : State::Repairing;
+}
+
+/// Why no tool may run; none when one may.
+std::optional<Outcome> JobScript::objection() const
+{
+    constexpr std::uint64_t smallestVolume = 2048;
+    const std::uint64_t available = claim_->availableBytes();
+    if (available <= smallestVolume)
+        return failure(fixwell::kPLErrorUnsupported,
+                       {"only %1$@ bytes are there, too few for a file system",
+                        std::to_string(available),
+                        {}});
+    if (tool_ == nullptr)
+        return failure(fixwell::kPLErrorUnsupported,
+                       {"no file system was found that can be checked", {}, {}});
+    if (volume_.isForeign)
+        return failure(fixwell::kPLErrorUnsupported,
+                       {"it holds something other than the file system it is listed with", {}, {}});
+    if (program_.empty())
+        return failure(fixwell::kPLErrorToolMissing,
+                       {"%1$@ is not installed (package %2$@)", std::string(tool_->name()),
+                        std::string(tool_->package())});
+    return std::nullopt;
+}
+
+/// A tool that repairs a volume whose end is missing throws away what it cannot reach.
+std::optional<Outcome> JobScript::objectionToSize()
+{
+    if (!volume_.isCutShort())
+        return std::nullopt;
+    log_.error({"The volume is cut short: it takes %1$@ bytes, but only %2$@ bytes are there.",
+                std::to_string(volume_.volumeBytes), std::to_string(volume_.availableBytes)});
+    if (operation_ == Operation::Verify)
+        return std::nullopt;
+    return Outcome{Verdict::Damaged,
+                   fixwell::kPLErrorNotRepaired,
+                   0,
+                   {"its end is missing, and a repair would throw away what lies there", {}, {}}};
+}
+
+JobScript::State JobScript::verify()
+{
+    return end(outcomeOfVerification(judge(runOnce(Access::ReadOnly))));
+}
+
+JobScript::State JobScript::repair()
+{
+    log_.meter().setRange(0, repairShare);
+    const RunEvidence evidence = runOnce(Access::ReadWrite);
+    const Judgement judgement = judge(evidence);
+    passes_.push_back(
+        {judgement, evidence.findings.replayedJournal, evidence.findings.problems > 0});
+    // The disk went away, or the user did not want more: nothing is left to be confirmed.
+    const bool isOver = judgement.verdict == Verdict::Stopped ||
+                        judgement.code == fixwell::kPLErrorDiskChanged ||
+                        judgement.code == fixwell::kPLErrorDiskInUse;
+    return isOver ? end(outcomeOfVerification(judgement)) : State::Confirming;
+}
+
+JobScript::State JobScript::confirm()
+{
+    log_.meter().setRange(repairShare, 100);
+    const Judgement judgement = judge(runOnce(Access::ReadOnly));
+    if (isWorthAnotherPass(passes_, judgement))
+        return State::Repairing;
+    return end(outcomeOfRepair(passes_, judgement));
+}
+
+JobScript::State JobScript::end(Outcome outcome)
+{
+    outcome_ = std::move(outcome);
+    return State::Done;
+}
+
+const Tool* JobScript::findTool() const
+{
+    for (const Tool* const tool : allTools())
+        if (factsFor(*tool).isRecognized)
+            return tool;
+    return nullptr;
+}
+
+VolumeFacts JobScript::factsFor(const Tool& tool) const
+{
+    return tool.examine(claim_->descriptor(), claim_->offset(), claim_->availableBytes());
+}
+
+RunEvidence JobScript::runOnce(Access access)
+{
+    volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
+    ToolRun run(*tool_, program_, access, {options_, log_, road_, stop_});
+    return run.run(*claim_, volume_);
+}
+
+// What was found on a disk that then went away is no answer about the disk that is left.
+Judgement JobScript::judge(const RunEvidence& evidence) const
+{
+    Judgement judgement = tool_->judge(evidence);
+    if (judgement.verdict != Verdict::Stopped && !claim_->isStillWhole())
+        return {Verdict::Failed,
+                fixwell::kPLErrorDiskChanged,
+                judgement.detail,
+                {"the disk became shorter or unreadable meanwhile", {}, {}},
+                false};
+    return judgement;
+}
+
+void JobScript::report()
+{
+    const std::string message = messageOf(outcome_, operation_, log_.diskName(), texts_);
+    const bool isUnanswered =
+        outcome_.verdict == Verdict::Failed || outcome_.verdict == Verdict::Inconclusive;
+    if (isUnanswered)
+        log_.failure(message);
+    else if (!outcome_.reason.isEmpty())
+        log_.remark(message);
+    log_.verdict(outcome_.verdict,
+                 operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite);
+    log_.trace("result: " + std::string(nameOf(outcome_.verdict).text()) + ": " + message);
+    log_.finished(outcome_.code, outcome_.detail, nameOf(outcome_.verdict), message);
+}
+
+}  // namespace pellar

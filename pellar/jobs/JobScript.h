@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/DiskReference.h"
+#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/Outcome.h"
+#include "pellar/tools/Tool.h"
+#include "pellar/volumes/DiskClaim.h"
+
+#include <filesystem>
+#include <optional>
+#include <vector>
+
+namespace pellar {
+
+struct JobRequest {
+    fixwell::DiskReferencePointer disk;
+    Operation operation = Operation::Verify;
+    DiskClaim claim;
+    const Tool* tool = nullptr;  ///< null: the kind of the volume is still to be found out
+};
+
+/// What a job does, from the claimed disk to the verdict, on the thread that calls `run`:
+///
+///     Examining ─→ Verifying ──────────────→ Done
+///              └─→ Repairing ⇄ Confirming ─→ Done
+///
+/// Whatever happens, it tells *started* once, first, and *finished* once, last. The references
+/// outlive it.
+class JobScript {
+public:
+    JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
+              StopSwitch& stop, EventRoad& road);
+
+    void run();
+
+private:
+    enum class State { Examining, Verifying, Repairing, Confirming, Done };
+
+    State next(State state);
+    State examine();
+    State verify();
+    State repair();
+    State confirm();
+    State end(Outcome outcome);
+
+    const Tool* findTool() const;
+    std::optional<Outcome> objection() const;
+    std::optional<Outcome> objectionToSize();
+    VolumeFacts factsFor(const Tool& tool) const;
+    RunEvidence runOnce(Access access);
+    Judgement judge(const RunEvidence& evidence) const;
+    void report();
+
+    std::optional<DiskClaim> claim_;  ///< none once the disk has been given back
+    const Operation operation_;
+    const Tool* tool_;
+    const ManagerOptions& options_;
+    const Texts& texts_;
+    StopSwitch& stop_;
+    EventRoad& road_;
+    const fixwell::DiskReferencePointer disk_;
+    JobLog log_;
+
+    std::filesystem::path program_;
+    VolumeFacts volume_;
+    std::vector<RepairPass> passes_;
+    Outcome outcome_;
+};
+
+}  // namespace pellar

@@ -1,0 +1,96 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/Outcome.h"
+
+#include "fixwell/host/pellar/MessageKeys.h"
+
+#include <algorithm>
+
+namespace pellar {
+namespace {
+
+bool hasChanged(const RepairPass& pass)
+{
+    return pass.judgement.madeProgress || pass.replayedJournal;
+}
+
+/// Nothing was wrong but that the journal's changes were not in their place.
+bool onlyReplayedJournal(const std::vector<RepairPass>& passes)
+{
+    const bool replayed = std::any_of(passes.begin(), passes.end(),
+                                      [](const RepairPass& pass) { return pass.replayedJournal; });
+    const bool foundProblems = std::any_of(
+        passes.begin(), passes.end(), [](const RepairPass& pass) { return pass.foundProblems; });
+    return replayed && !foundProblems;
+}
+
+std::string_view messageKey(const Outcome& outcome, Operation operation)
+{
+    const bool isRepair = operation == Operation::Repair;
+    const bool hasReason = !outcome.reason.isEmpty();
+    switch (outcome.verdict) {
+        case Verdict::Sound: return "verified “%1$@”: no damage was found";
+        case Verdict::Repaired:
+            return hasReason ? "repaired “%1$@”: %2$@" : "repaired “%1$@”: no damage is left";
+        case Verdict::Stopped:
+            return isRepair ? "stopped while repairing “%1$@”" : "stopped while verifying “%1$@”";
+        case Verdict::Damaged:
+            if (!isRepair)
+                return hasReason ? "verified “%1$@”: damage was found; %2$@"
+                                 : "verified “%1$@”: damage was found";
+            return hasReason ? "cannot repair “%1$@”: %2$@"
+                             : "cannot repair “%1$@”: damage is left";
+        case Verdict::Inconclusive:
+        case Verdict::Failed: break;
+    }
+    return isRepair ? "cannot repair “%1$@”: %2$@" : "cannot verify “%1$@”: %2$@";
+}
+
+}  // namespace
+
+Outcome outcomeOfVerification(const Judgement& judgement)
+{
+    return {judgement.verdict, judgement.code, judgement.detail, judgement.reason};
+}
+
+bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& confirmation)
+{
+    return confirmation.verdict == Verdict::Damaged && !passes.empty() &&
+           passes.size() < mostRepairPasses && passes.back().judgement.madeProgress;
+}
+
+Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation)
+{
+    Outcome outcome = outcomeOfVerification(confirmation);
+    if (confirmation.verdict == Verdict::Sound &&
+        std::any_of(passes.begin(), passes.end(), hasChanged)) {
+        outcome.verdict = Verdict::Repaired;
+        if (onlyReplayedJournal(passes))
+            outcome.reason = {"its journal was replayed; nothing else was wrong", {}, {}};
+    } else if (confirmation.verdict == Verdict::Damaged) {
+        outcome.code = fixwell::kPLErrorNotRepaired;
+        if (!passes.empty() && passes.back().judgement.verdict == Verdict::Failed)
+            outcome.reason = passes.back().judgement.reason;
+    }
+    return outcome;
+}
+
+fixwell::Name nameOf(Verdict verdict)
+{
+    switch (verdict) {
+        case Verdict::Sound: return fixwell::kPLVerdictSound;
+        case Verdict::Damaged: return fixwell::kPLVerdictDamaged;
+        case Verdict::Repaired: return fixwell::kPLVerdictRepaired;
+        case Verdict::Inconclusive: return fixwell::kPLVerdictInconclusive;
+        case Verdict::Failed: break;
+        case Verdict::Stopped: return fixwell::kPLVerdictStopped;
+    }
+    return fixwell::kPLVerdictFailed;
+}
+
+std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,
+                      const Texts& texts)
+{
+    return Sentence{messageKey(outcome, operation), diskName, outcome.reason.in(texts)}.in(texts);
+}
+
+}  // namespace pellar

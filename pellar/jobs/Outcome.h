@@ -1,0 +1,48 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/Name.h"
+#include "pellar/Texts.h"
+#include "pellar/tools/Judgement.h"
+#include "pellar/tools/Operation.h"
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace pellar {
+
+/// How a job ended.
+struct Outcome {
+    Verdict verdict = Verdict::Failed;
+    fixwell::ErrorCode code = fixwell::kPLErrorToolFailed;
+    std::int32_t detail = 0;
+    Sentence reason;
+
+    friend bool operator==(const Outcome&, const Outcome&) = default;
+};
+
+/// One repairing run of a tool.
+struct RepairPass {
+    Judgement judgement;
+    bool replayedJournal = false;
+    bool foundProblems = false;
+};
+
+inline constexpr std::size_t mostRepairPasses = 5;
+
+Outcome outcomeOfVerification(const Judgement& judgement);
+
+/// Whether to repair once more: damage is left, and the last pass got somewhere.
+bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& confirmation);
+
+/// The verification after the passes decides, whatever they said themselves.
+Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation);
+
+fixwell::Name nameOf(Verdict verdict);
+
+/// One sentence that names the attempt, the disk and the outcome.
+std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,
+                      const Texts& texts);
+
+}  // namespace pellar

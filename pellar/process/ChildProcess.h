@@ -1,0 +1,55 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/process/Command.h"
+#include "pellar/process/Ending.h"
+#include "pellar/process/FileDescriptor.h"
+
+#include <sys/types.h>
+
+#include <variant>
+
+namespace pellar {
+
+/// The numbers under which a tool finds what it inherits besides its standard descriptors.
+inline constexpr int diskDescriptorOfTool = 3;
+inline constexpr int progressDescriptorOfTool = 4;
+
+/// Borrowed for the length of the start; -1 for none.
+struct ChildStreams {
+    int output = -1;    ///< standard output and standard error
+    int disk = -1;      ///< becomes diskDescriptorOfTool
+    int progress = -1;  ///< becomes progressDescriptorOfTool
+};
+
+/// A running program, or one that has ended and was not reaped yet. Destroying it kills and
+/// reaps, so no zombie stays behind.
+///
+/// The program runs in a process group of its own, reads /dev/null, has a fixed PATH, the C
+/// locale and nothing else of our environment, and no other descriptor than those of
+/// ChildStreams. It is killed when the thread that started it ends (PR_SET_PDEATHSIG, prctl(2)),
+/// so it never outlives the host; that thread therefore stays until the program has ended.
+class ChildProcess {
+public:
+    [[nodiscard]] static std::variant<ChildProcess, NotStarted> start(const Command& command,
+                                                                      const ChildStreams& streams);
+
+    ChildProcess(ChildProcess&& other) noexcept;
+    ChildProcess& operator=(ChildProcess&&) = delete;
+    ~ChildProcess();
+
+    /// Readable once the program has ended (pidfd_open(2)).
+    int endDescriptor() const noexcept { return end_.get(); }
+    /// To the program and everything it started in its group.
+    void signalGroup(int signal) noexcept;
+    /// Waits for the end, kills what is left of the group, and gives the process back.
+    Ending reap() noexcept;
+
+private:
+    ChildProcess(pid_t id, FileDescriptor end) noexcept : id_(id), end_(std::move(end)) {}
+
+    pid_t id_;
+    FileDescriptor end_;
+};
+
+}  // namespace pellar

@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/process/Command.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+
+namespace pellar {
+
+std::string shown(const Command& command)
+{
+    std::string line = command.executable.string();
+    for (const std::string& argument : command.arguments)
+        line += ' ' + argument;
+    return fixwell::printable(line);
+}
+
+std::filesystem::path findProgram(std::string_view name, std::string_view searchPath)
+{
+    while (!searchPath.empty()) {
+        const std::size_t length = std::min(searchPath.find(':'), searchPath.size());
+        const std::filesystem::path directory = searchPath.substr(0, length);
+        searchPath.remove_prefix(std::min(length + 1, searchPath.size()));
+        if (!directory.is_absolute())
+            continue;
+        std::filesystem::path program = directory / name;
+        std::error_code error;
+        if (std::filesystem::is_regular_file(program, error) &&
+            ::access(program.c_str(), X_OK) == 0)
+            return program;
+    }
+    return {};
+}
+
+}  // namespace pellar

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <optional>
+#include <utility>
+
+namespace pellar {
+
+/// Owns an open descriptor, or none, and closes it.
+class FileDescriptor {
+public:
+    FileDescriptor() noexcept = default;
+    explicit FileDescriptor(int descriptor) noexcept : descriptor_(descriptor) {}
+    FileDescriptor(FileDescriptor&& other) noexcept
+        : descriptor_(std::exchange(other.descriptor_, -1))
+    {
+    }
+    FileDescriptor& operator=(FileDescriptor&& other) noexcept
+    {
+        std::swap(descriptor_, other.descriptor_);
+        return *this;
+    }
+    ~FileDescriptor() { reset(); }
+
+    int get() const noexcept { return descriptor_; }
+    explicit operator bool() const noexcept { return descriptor_ >= 0; }
+    void reset() noexcept;
+
+private:
+    int descriptor_ = -1;
+};
+
+/// Both ends are closed on exec; the read end does not block.
+struct Pipe {
+    FileDescriptor readEnd;
+    FileDescriptor writeEnd;
+};
+
+/// None when the process or the system has no descriptors left; errno says which.
+[[nodiscard]] std::optional<Pipe> makePipe();
+
+}  // namespace pellar

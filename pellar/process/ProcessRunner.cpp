@@ -1,0 +1,213 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/process/ProcessRunner.h"
+
+#include "pellar/process/ChildProcess.h"
+#include "pellar/process/LineSplitter.h"
+
+#include <poll.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+
+namespace pellar {
+namespace {
+
+using namespace std::chrono_literals;
+
+/// How long a lull in the output must be before the listener is told of a pause.
+constexpr auto lull = 20ms;
+
+/// One run, from the start of the child to its reaping.
+class Run {
+public:
+    Run(const RunRequest& request, StopSwitch& stop, RunListener& listener, ChildProcess child,
+        Pipe output, Pipe progress)
+        : request_(request),
+          stop_(stop),
+          listener_(listener),
+          child_(std::move(child)),
+          output_(std::move(output)),
+          progress_(std::move(progress)),
+          budget_(request.limits, request.access),
+          ladder_(request.graceTimes)
+    {
+        output_.writeEnd.reset();
+        progress_.writeEnd.reset();
+    }
+
+    RunResult toItsEnd()
+    {
+        while (!hasEnded_)
+            step();
+        drain();
+        const Ending ending = child_.reap();
+        outputLines_.finish();
+        progressLines_.finish();
+        listener_.pause();
+        return {ending, cause_};
+    }
+
+private:
+    void step()
+    {
+        const bool isQuiet = waitForEvents();
+        heedStopSwitch();
+        send(ladder_.due(Clock::now()));
+        if (isQuiet && isHeard_) {
+            listener_.pause();
+            isHeard_ = false;
+        }
+        if (request_.silenceLimit > 0ms && Clock::now() - lastHeard_ >= request_.silenceLimit)
+            endFor(StopCause::Silence);
+        listener_.tick();
+    }
+
+    /// YES when the time passed without any output.
+    bool waitForEvents()
+    {
+        std::array<pollfd, 4> events{{{output_.readEnd.get(), POLLIN, 0},
+                                      {progress_.readEnd.get(), POLLIN, 0},
+                                      {child_.endDescriptor(), POLLIN, 0},
+                                      {stop_.descriptor(), POLLIN, 0}}};
+        if (::poll(events.data(), events.size(), timeout()) < 0)
+            return false;  // interrupted
+        hasEnded_ = events[2].revents != 0;
+        const bool hasOutput = events[0].revents != 0;
+        const bool hasProgress = events[1].revents != 0;
+        if (hasOutput)
+            read(output_.readEnd, outputLines_, true);
+        if (hasProgress)
+            read(progress_.readEnd, progressLines_, false);
+        return !hasOutput && !hasProgress;
+    }
+
+    /// Milliseconds until something is due; -1 for never.
+    int timeout() const
+    {
+        if (isHeard_)
+            return static_cast<int>(lull.count());
+        std::optional<Clock::time_point> due = ladder_.deadline();
+        if (request_.silenceLimit > 0ms && !ladder_.isStopping())
+            due = std::min(due.value_or(Clock::time_point::max()),
+                           lastHeard_ + request_.silenceLimit);
+        if (!due)
+            return -1;
+        const auto left = std::chrono::ceil<std::chrono::milliseconds>(*due - Clock::now());
+        return static_cast<int>(std::clamp<std::int64_t>(left.count(), 0, 60'000));
+    }
+
+    /// NO when there is nothing more to be had for now.
+    bool read(FileDescriptor& descriptor, LineSplitter& lines, bool isOutput)
+    {
+        const ssize_t count = ::read(descriptor.get(), buffer_.data(), buffer_.size());
+        if (count < 0)
+            return false;
+        if (count == 0) {
+            descriptor.reset();  // every writer is gone; poll(2) skips the empty place
+            return false;
+        }
+        isHeard_ = true;
+        lastHeard_ = Clock::now();
+        if (isOutput)
+            budget_.countBytes(static_cast<std::uint64_t>(count));
+        lines.take({buffer_.data(), static_cast<std::size_t>(count)});
+        if (budget_.state() == OutputBudget::State::Spent)
+            endFor(StopCause::TooMuchOutput);
+        return true;
+    }
+
+    /// What the child left behind. A grandchild may still hold the pipes and print without end,
+    /// so no more is read than a pipe can hold (1 MiB, pipe(7)).
+    void drain()
+    {
+        for (int i = 0; i < 16 && output_.readEnd && read(output_.readEnd, outputLines_, true);
+             ++i) {
+        }
+        for (int i = 0;
+             i < 16 && progress_.readEnd && read(progress_.readEnd, progressLines_, false); ++i) {
+        }
+    }
+
+    void tellLine(std::string_view line, bool isCut)
+    {
+        budget_.countLine();
+        if (budget_.state() == OutputBudget::State::Heard) {
+            listener_.line(line, isCut);
+        } else if (budget_.state() == OutputBudget::State::Unheard && !isLimitTold_) {
+            isLimitTold_ = true;
+            listener_.lineLimitReached();
+        }
+    }
+
+    void heedStopSwitch()
+    {
+        if (!stop_.isPressed())
+            return;
+        stop_.rest();
+        cause_ = StopCause::User;
+        if (stop_.isHard())
+            send(ladder_.pressHard(Clock::now()));
+        for (; heededPresses_ < stop_.presses(); ++heededPresses_)
+            send(ladder_.press(Clock::now()));
+    }
+
+    void endFor(StopCause cause)
+    {
+        if (ladder_.isStopping())
+            return;
+        cause_ = cause;
+        send(ladder_.press(Clock::now()));
+    }
+
+    void send(int signal)
+    {
+        if (signal != 0)
+            child_.signalGroup(signal);
+    }
+
+    const RunRequest& request_;
+    StopSwitch& stop_;
+    RunListener& listener_;
+    ChildProcess child_;
+    Pipe output_;
+    Pipe progress_;
+    LineSplitter outputLines_{longestToolLine, [this](std::string_view line, bool isCut) {
+                                  tellLine(line, isCut);
+                              }};
+    LineSplitter progressLines_{longestToolLine, [this](std::string_view line, bool isCut) {
+                                    if (!isCut)
+                                        listener_.progressLine(line);
+                                }};
+    OutputBudget budget_;
+    StopLadder ladder_;
+    StopCause cause_ = StopCause::None;
+    unsigned heededPresses_ = 0;
+    Clock::time_point lastHeard_ = Clock::now();
+    bool isHeard_ = false;  ///< something was told since the last pause
+    bool isLimitTold_ = false;
+    bool hasEnded_ = false;
+    std::array<char, 65536> buffer_;
+};
+
+}  // namespace
+
+RunResult runTool(const RunRequest& request, StopSwitch& stop, RunListener& listener)
+{
+    if (stop.isPressed())
+        return {NotStarted{ECANCELED}, StopCause::User};
+    std::optional<Pipe> output = makePipe();
+    std::optional<Pipe> progress = makePipe();
+    if (!output || !progress)
+        return {NotStarted{errno}};
+    auto started = ChildProcess::start(
+        request.command, {output->writeEnd.get(), request.disk, progress->writeEnd.get()});
+    if (const auto* const failure = std::get_if<NotStarted>(&started))
+        return {*failure};
+    Run run(request, stop, listener, std::move(std::get<ChildProcess>(started)), std::move(*output),
+            std::move(*progress));
+    return run.toItsEnd();
+}
+
+}  // namespace pellar

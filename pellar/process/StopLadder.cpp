@@ -1,0 +1,58 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/process/StopLadder.h"
+
+#include <algorithm>
+#include <csignal>
+
+namespace pellar {
+
+using namespace std::chrono_literals;
+
+GraceTimes graceTimesFor(Access access)
+{
+    return access == Access::ReadOnly ? GraceTimes{2s, 2s, 0s} : GraceTimes{10s, 10s, 3s};
+}
+
+int StopLadder::press(Clock::time_point now)
+{
+    switch (step_) {
+        case Step::None: return enter(Step::Interrupt, now);
+        case Step::Interrupt: return enter(isLeaving_ ? Step::Kill : Step::Terminate, now);
+        case Step::Terminate: return enter(Step::Kill, now);
+        case Step::Kill: break;
+    }
+    return 0;
+}
+
+int StopLadder::pressHard(Clock::time_point now)
+{
+    if (isLeaving_ || step_ == Step::Kill)
+        return 0;
+    isLeaving_ = true;
+    if (times_.atLeaving == 0ms)
+        return enter(Step::Kill, now);
+    const int signal = isStopping() ? 0 : enter(Step::Interrupt, now);
+    deadline_ = std::min(deadline_.value_or(now + times_.atLeaving), now + times_.atLeaving);
+    return signal;
+}
+
+int StopLadder::due(Clock::time_point now)
+{
+    if (!deadline_ || now < *deadline_)
+        return 0;
+    return isLeaving_ ? enter(Step::Kill, now) : press(now);
+}
+
+int StopLadder::enter(Step step, Clock::time_point now)
+{
+    step_ = step;
+    switch (step) {
+        case Step::Interrupt: deadline_ = now + times_.afterInterrupt; return SIGINT;
+        case Step::Terminate: deadline_ = now + times_.afterTerminate; return SIGTERM;
+        case Step::Kill: deadline_.reset(); return SIGKILL;
+        case Step::None: break;
+    }
+    return 0;
+}
+
+}  // namespace pellar

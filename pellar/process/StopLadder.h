@@ -1,0 +1,52 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/process/Access.h"
+
+#include <chrono>
+#include <optional>
+
+namespace pellar {
+
+using Clock = std::chrono::steady_clock;
+
+/// How long a tool may take over each way of being asked to end.
+struct GraceTimes {
+    std::chrono::milliseconds afterInterrupt;
+    std::chrono::milliseconds afterTerminate;
+    /// After SIGINT, when the program is leaving; 0 kills at once.
+    std::chrono::milliseconds atLeaving;
+};
+
+/// A tool that writes gets time to leave the disk sound; one that only reads gets little.
+GraceTimes graceTimesFor(Access access);
+
+/// Which signal ends a tool at which time: SIGINT, then SIGTERM, then SIGKILL. Pure: it is told
+/// the time and answers the signal that is to be sent now, or 0.
+class StopLadder {
+public:
+    explicit StopLadder(GraceTimes times) : times_(times) {}
+
+    /// The next step, at once.
+    int press(Clock::time_point now);
+    /// Skips what is between SIGINT and SIGKILL and waits no longer than `atLeaving`.
+    int pressHard(Clock::time_point now);
+    /// To be asked when `deadline` has passed.
+    int due(Clock::time_point now);
+
+    bool isStopping() const { return step_ != Step::None; }
+    /// None when nothing is to happen by itself.
+    std::optional<Clock::time_point> deadline() const { return deadline_; }
+
+private:
+    enum class Step { None, Interrupt, Terminate, Kill };
+
+    int enter(Step step, Clock::time_point now);
+
+    GraceTimes times_;
+    Step step_ = Step::None;
+    bool isLeaving_ = false;
+    std::optional<Clock::time_point> deadline_;
+};
+
+}  // namespace pellar

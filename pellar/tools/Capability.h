@@ -1,0 +1,26 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/ErrorCodes.h"
+#include "pellar/Sentence.h"
+#include "pellar/tools/Operation.h"
+
+#include <filesystem>
+#include <string_view>
+
+namespace pellar {
+
+/// Whether there is an installed tool that can do something with a kind of file system.
+struct Capability {
+    fixwell::ErrorCode error = fixwell::kPLNoError;
+    Sentence reason;                ///< why not; empty when it is given
+    std::filesystem::path program;  ///< what would run
+
+    bool isGiven() const { return error == fixwell::kPLNoError; }
+};
+
+/// `filesystemType` as libblkid names it; `toolPath` is searched for the tool.
+Capability capabilityFor(std::string_view filesystemType, Operation operation,
+                         std::string_view toolPath);
+
+}  // namespace pellar

@@ -1,0 +1,176 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/E2fsck.h"
+
+#include "pellar/process/ChildProcess.h"
+#include "pellar/tools/E2fsckOutput.h"
+#include "pellar/volumes/ExtSuperblock.h"
+#include "pellar/volumes/SignatureProbe.h"
+
+#include <cstring>
+
+namespace pellar {
+namespace {
+
+// The exit status is a sum of these (e2fsck(8), EXIT CODE).
+constexpr int leftErrors = 4;
+constexpr int operationalError = 8;
+constexpr int usageError = 16;
+constexpr int cancelledByUser = 32;
+constexpr int libraryError = 128;
+constexpr int knownBits =
+    1 | 2 | leftErrors | operationalError | usageError | cancelledByUser | libraryError;
+
+Judgement failed(std::int32_t detail, Sentence reason,
+                 fixwell::ErrorCode code = fixwell::kPLErrorToolFailed)
+{
+    return {Verdict::Failed, code, detail, std::move(reason)};
+}
+
+Judgement inconclusive(std::int32_t detail, Sentence reason)
+{
+    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, detail, std::move(reason)};
+}
+
+Judgement damaged(std::int32_t detail, Sentence reason = {})
+{
+    return {Verdict::Damaged, fixwell::kPLErrorDamaged, detail, std::move(reason)};
+}
+
+Judgement stopped(std::int32_t detail)
+{
+    return {Verdict::Stopped, fixwell::kPLErrorCancelled, detail, {}};
+}
+
+bool hasDamage(const RunEvidence& evidence)
+{
+    return evidence.findings.problems > 0 || evidence.findings.hasErrorsLeft ||
+           evidence.volume.isCutShort();
+}
+
+// Ended by us for printing without end, or for silence: what it had found by then stands.
+Judgement judgeEnded(const RunEvidence& evidence)
+{
+    const bool wasSilent = evidence.result.cause == StopCause::Silence;
+    const Sentence reason{wasSilent ? "%1$@ gave no sign of life and was ended"
+                                    : "%1$@ printed without end and was ended",
+                          "e2fsck",
+                          {}};
+    if (hasDamage(evidence))
+        return damaged(0, reason);
+    return failed(0, reason, fixwell::kPLErrorToolMisbehaved);
+}
+
+Judgement judgeStatus(int status, const RunEvidence& evidence)
+{
+    const Findings& found = evidence.findings;
+    const Sentence statusReason{"%1$@ could not do its work (exit status %2$@)", "e2fsck",
+                                std::to_string(status)};
+    if ((status & cancelledByUser) != 0)
+        return stopped(status);
+    if (found.crashSignal != 0)
+        return failed(status,
+                      {"%1$@ crashed (signal %2$@)", "e2fsck", std::to_string(found.crashSignal)});
+    if ((status & (usageError | libraryError)) != 0 || (status & ~knownBits) != 0)
+        return failed(status, statusReason);
+    if (found.foundDiskInUse && (status & operationalError) != 0)
+        return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
+    // The file is shorter than the file system: no journal can make up for that.
+    if (evidence.volume.isCutShort())
+        return damaged(status);
+    if (found.lacksExternalJournal)
+        return inconclusive(status,
+                            {"its journal is kept on another disk, which was not found", {}, {}});
+    // Changes that wait in the journal may be all that seems to be wrong; it is replayed first.
+    if (evidence.access == Access::ReadOnly &&
+        (found.skippedJournal || evidence.volume.needsRecovery))
+        return inconclusive(
+            status, {"its journal has not been replayed, which only a repair does", {}, {}});
+    // Bits are added up. Known damage outranks an unfinished check: 12 means it gave up with
+    // damage in sight.
+    if ((status & leftErrors) != 0 || found.hasErrorsLeft)
+        return damaged(status);
+    if ((status & operationalError) != 0)
+        return found.problems > 0 ? damaged(status) : failed(status, statusReason);
+    return {Verdict::Sound, fixwell::kPLNoError, status, {}};
+}
+
+// Exit 0 alone says nothing: -n answers it after "Free blocks count wrong ... Fix? no", and output
+// that stops early is no complete check.
+Judgement judgeVerification(int status, const RunEvidence& evidence)
+{
+    Judgement judgement = judgeStatus(status, evidence);
+    if (judgement.verdict != Verdict::Sound)
+        return judgement;
+    if (status != 0 || hasDamage(evidence))
+        return damaged(status);
+    if (!evidence.findings.isComplete)
+        return inconclusive(status, {"%1$@ ended before it had checked everything", "e2fsck", {}});
+    return judgement;
+}
+
+Judgement judgeRepair(int status, const RunEvidence& evidence)
+{
+    constexpr int corrected = 1 | 2;
+    const Findings& found = evidence.findings;
+    Judgement judgement = judgeStatus(status, evidence);
+    judgement.madeProgress =
+        (status & corrected) != 0 || found.wasModified || found.corrections > 0;
+    return judgement;
+}
+
+}  // namespace
+
+VolumeFacts E2fsck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+{
+    VolumeFacts facts;
+    facts.availableBytes = availableBytes;
+    const auto superblock = readExtSuperblock(disk, offset, availableBytes);
+    facts.isRecognized = superblock && !superblock->isJournalDevice;
+    facts.hasPrimary = superblock && !superblock->isBackup;
+    facts.volumeBytes = superblock ? superblock->volumeBytes() : 0;
+    facts.needsRecovery = facts.hasPrimary && superblock->needsRecovery;
+    if (!facts.hasPrimary && availableBytes > 0) {
+        const Signature signature = probeSignature(disk, offset, availableBytes);
+        const bool isExt = signature.type.starts_with("ext") || signature.type.empty();
+        facts.isForeign = signature.isAmbivalent || !isExt;
+    }
+    return facts;
+}
+
+std::vector<std::string> E2fsck::arguments(Access access, const std::string& disk,
+                                           std::uint64_t offset) const
+{
+    return {"-f", access == Access::ReadOnly ? "-n" : "-y", "-C",
+            std::to_string(progressDescriptorOfTool),
+            offset == 0 ? disk : disk + "?offset=" + std::to_string(offset)};
+}
+
+std::unique_ptr<OutputReader> E2fsck::makeReader() const
+{
+    return std::make_unique<E2fsckOutput>();
+}
+
+std::optional<double> E2fsck::percentOf(std::string_view progressLine) const
+{
+    return e2fsckPercent(progressLine);
+}
+
+Judgement E2fsck::judge(const RunEvidence& evidence) const
+{
+    const Ending& ending = evidence.result.ending;
+    if (evidence.result.cause == StopCause::User)
+        return stopped(0);
+    if (const auto* const notStarted = std::get_if<NotStarted>(&ending))
+        return failed(notStarted->error, {"%1$@ could not be started: %2$@", "e2fsck",
+                                          ::strerrordesc_np(notStarted->error)});
+    if (evidence.result.cause != StopCause::None)
+        return judgeEnded(evidence);
+    if (const auto* const killed = std::get_if<Killed>(&ending))
+        return failed(killed->signal,
+                      {"%1$@ was killed (signal %2$@)", "e2fsck", std::to_string(killed->signal)});
+    const int status = std::get<Exited>(ending).status;
+    return evidence.access == Access::ReadOnly ? judgeVerification(status, evidence)
+                                               : judgeRepair(status, evidence);
+}
+
+}  // namespace pellar

@@ -1,0 +1,105 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/process/Access.h"
+#include "pellar/process/ProcessRunner.h"
+#include "pellar/tools/Judgement.h"
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace pellar {
+
+/// One line of a tool, told apart.
+struct ToolLine {
+    enum class Kind {
+        Phase,    ///< a new step begins
+        Problem,  ///< something is wrong with the disk, or with the check
+        Detail,   ///< anything else
+    };
+
+    Kind kind = Kind::Detail;
+    std::string text;
+    /// For a phase that is known: its English text, a literal.
+    std::string_view phaseKey;
+
+    friend bool operator==(const ToolLine&, const ToolLine&) = default;
+};
+
+/// What the lines of one run say together.
+struct Findings {
+    std::uint64_t problems = 0;     ///< problem lines
+    std::uint64_t corrections = 0;  ///< of these, answered with yes
+    bool isComplete = false;        ///< the line that ends a full run was printed
+    bool wasModified = false;
+    bool hasErrorsLeft = false;  ///< the tool says so itself
+    bool skippedJournal = false;
+    bool replayedJournal = false;
+    bool lacksExternalJournal = false;
+    bool foundDiskInUse = false;
+    int crashSignal = 0;  ///< caught by the tool itself; 0 for none
+
+    friend bool operator==(const Findings&, const Findings&) = default;
+};
+
+/// Reads the lines of one run. Pure but for what it remembers of the lines before.
+class OutputReader {
+public:
+    virtual ~OutputReader() = default;
+
+    /// Appends what is known by now: none, one or several lines, in the tool's order.
+    virtual void read(std::string_view line, std::vector<ToolLine>& lines) = 0;
+    /// The run has ended.
+    virtual void finish(std::vector<ToolLine>& lines) = 0;
+    virtual const Findings& findings() const = 0;
+};
+
+/// What we have seen of a volume ourselves.
+struct VolumeFacts {
+    bool isRecognized = false;  ///< it is of a kind that the tool treats
+    bool hasPrimary = false;    ///< the main superblock is in its place
+    bool isForeign = false;     ///< something else claims the place: nothing may be written
+    bool needsRecovery = false;
+    std::uint64_t volumeBytes = 0;  ///< 0 when not known
+    std::uint64_t availableBytes = 0;
+
+    bool isCutShort() const { return volumeBytes > availableBytes; }
+};
+
+/// All that is known about a run when it is judged.
+struct RunEvidence {
+    Access access = Access::ReadOnly;
+    RunResult result;
+    Findings findings;
+    VolumeFacts volume;
+};
+
+/// A checking tool: what it can do, how it is called, how it answers. Without state; lives as
+/// long as the process; any thread.
+class Tool {
+public:
+    virtual ~Tool() = default;
+
+    /// Of the executable.
+    virtual std::string_view name() const = 0;
+    /// The Debian package that brings it.
+    virtual std::string_view package() const = 0;
+    virtual bool canRepair() const = 0;
+
+    /// Reads the disk a little; never writes.
+    virtual VolumeFacts examine(int disk, std::uint64_t offset,
+                                std::uint64_t availableBytes) const = 0;
+    /// `disk` is a name that the tool can open; `offset` is where in it the volume starts, bytes.
+    virtual std::vector<std::string> arguments(Access access, const std::string& disk,
+                                               std::uint64_t offset) const = 0;
+    virtual std::unique_ptr<OutputReader> makeReader() const = 0;
+    /// From 0 to 100, of one run; none when the line is no progress report.
+    virtual std::optional<double> percentOf(std::string_view progressLine) const = 0;
+    virtual Judgement judge(const RunEvidence& evidence) const = 0;
+};
+
+}  // namespace pellar

@@ -1,0 +1,107 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/volumes/DiskClaim.h"
+
+#include "pellar/volumes/DiskUse.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <cerrno>
+
+namespace pellar {
+namespace {
+
+using fixwell::ErrorCode;
+
+// O_NONBLOCK: opening a FIFO in a disk's place must not wait for its other end. It has no effect
+// on regular files and block devices (open(2)).
+FileDescriptor openDisk(const fixwell::DiskReference& disk, int mode)
+{
+    return FileDescriptor(::open(disk.path.c_str(), mode | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+}
+
+ErrorCode openError(const fixwell::DiskReference& disk, Access access, int error)
+{
+    if (error == EBUSY || error == ETXTBSY)
+        return fixwell::kPLErrorDiskInUse;
+    const bool isRefused = error == EACCES || error == EPERM || error == EROFS;
+    if (access == Access::ReadWrite && isRefused && openDisk(disk, O_RDONLY))
+        return fixwell::kPLErrorReadOnly;
+    return fixwell::kPLErrorCannotOpen;
+}
+
+/// A device that a mount, a swap area, a RAID or a mapping holds refuses to be opened
+/// exclusively (open(2), O_EXCL on block devices). Only asked: the tool wants it for itself.
+bool isHeldByKernel(const fixwell::DiskReference& disk)
+{
+    return !openDisk(disk, O_RDONLY | O_EXCL) && errno == EBUSY;
+}
+
+ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status,
+                   const SystemPaths& paths)
+{
+    if (S_ISREG(status.st_mode))
+        return backsLoopDevice(status.st_dev, status.st_ino, paths) ? fixwell::kPLErrorDiskInUse
+                                                                    : fixwell::kPLNoError;
+    if (!S_ISBLK(status.st_mode))
+        return fixwell::kPLErrorCannotOpen;
+    if (isMounted(status.st_rdev, paths))
+        return fixwell::kPLErrorCouldNotUnmount;
+    return isHeldByKernel(disk) ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
+}
+
+ErrorCode lockError(int descriptor, Access access)
+{
+    const int kind = access == Access::ReadOnly ? LOCK_SH : LOCK_EX;
+    if (::flock(descriptor, kind | LOCK_NB) == 0)
+        return fixwell::kPLNoError;
+    // Some network file systems know no locks; that is no reason to leave a disk unchecked.
+    return errno == EWOULDBLOCK ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
+}
+
+/// Bytes, of a device as well: its end can be sought, its st_size is 0.
+std::uint64_t sizeOf(int descriptor)
+{
+    const off_t end = ::lseek(descriptor, 0, SEEK_END);
+    return end < 0 ? 0 : static_cast<std::uint64_t>(end);
+}
+
+}  // namespace
+
+std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference& disk,
+                                                   Access access, const SystemPaths& paths)
+{
+    FileDescriptor opened = openDisk(disk, access == Access::ReadOnly ? O_RDONLY : O_RDWR);
+    if (!opened)
+        return openError(disk, access, errno);
+    struct stat status = {};
+    if (::fstat(opened.get(), &status) != 0)
+        return fixwell::kPLErrorCannotOpen;
+    if (const ErrorCode error = useError(disk, status, paths))
+        return error;
+    if (const ErrorCode error = lockError(opened.get(), access))
+        return error;
+    return DiskClaim(std::move(opened), disk.offset, disk.length);
+}
+
+DiskClaim::DiskClaim(FileDescriptor disk, std::uint64_t offset, std::uint64_t length)
+    : disk_(std::move(disk)), offset_(offset)
+{
+    const std::uint64_t size = sizeOf(disk_.get());
+    const std::uint64_t rest = size > offset ? size - offset : 0;
+    availableBytes_ = length == 0 ? rest : std::min(rest, length);
+}
+
+bool DiskClaim::isStillWhole() const
+{
+    const std::uint64_t end = offset_ + availableBytes_;
+    if (sizeOf(disk_.get()) < end)
+        return false;
+    char last = 0;
+    return availableBytes_ == 0 || ::pread(disk_.get(), &last, 1, static_cast<off_t>(end - 1)) == 1;
+}
+
+}  // namespace pellar

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/DiskReference.h"
+#include "fixwell/host/pellar/ErrorCodes.h"
+#include "pellar/process/Access.h"
+#include "pellar/process/FileDescriptor.h"
+#include "pellar/volumes/SystemPaths.h"
+
+#include <cstdint>
+#include <variant>
+
+namespace pellar {
+
+/// A disk that is ours for the length of a job: opened once, locked against other users of
+/// flock(2), and found neither mounted nor attached. Everything that follows goes through the one
+/// descriptor, so it is the same disk to the end whatever happens to its name.
+class DiskClaim {
+public:
+    /// An error code when the disk is in use (kPLErrorCouldNotUnmount: mounted;
+    /// kPLErrorDiskInUse: locked, held by the kernel, or attached as a loop device), when it
+    /// cannot be opened, or is no disk at all.
+    [[nodiscard]] static std::variant<DiskClaim, fixwell::ErrorCode> take(
+        const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
+
+    int descriptor() const { return disk_.get(); }
+    std::uint64_t offset() const { return offset_; }
+    /// Bytes that are really there, from `offset` to the end of the region or the file.
+    std::uint64_t availableBytes() const { return availableBytes_; }
+
+    /// NO when the disk has become shorter since it was claimed, or its end can no longer be read.
+    bool isStillWhole() const;
+
+private:
+    DiskClaim(FileDescriptor disk, std::uint64_t offset, std::uint64_t length);
+
+    FileDescriptor disk_;
+    std::uint64_t offset_;
+    std::uint64_t availableBytes_;
+};
+
+}  // namespace pellar
