@@ -176,7 +176,7 @@ void OVFXW::noteFailure(const OVDiskPointer& disk, ErrorCode code)
         }
     }
     fileInflightItem();
-    if (!disk || disk->mountPoint().empty())
+    if (!disk || !hasMountPoint(*disk))
         diskController().mountDisk(disk, true, false);
 }
 

@@ -79,7 +79,7 @@ void OVFXW::delayedMountDisk()
         for (const Value& value : entries.values()) {
             const Dictionary entry = value.dictionary();
             const OVDiskPointer disk = diskOfEntry(entry);
-            if (entry.boolean(kEntryDiskWasMounted) && disk && !disk->isMounted())
+            if (entry.boolean(kEntryDiskWasMounted) && disk && !disk->mountPoint())
                 diskController().mountDisk(disk, false, true);
         }
     }

@@ -63,7 +63,7 @@ ErrorCode OVFXW::launchOperation(const Launch& launch, const OVDiskPointer& disk
 
 bool OVFXW::noteMountState(const OVDiskPointer& disk)
 {
-    const bool isMounted = disk && !disk->mountPoint().empty();
+    const bool isMounted = disk && hasMountPoint(*disk);
     inflightItem.set(kEntryDiskWasMounted, isMounted);
     if (isMounted)
         if (const OVFilesystem* const filesystem = disk->filesystem())
@@ -84,7 +84,7 @@ ErrorCode OVFXW::reportFailedLaunch(const Launch& launch, const OVDiskPointer& d
             code = restatedLaunchError(code, launch.operationType, *disk);
             appendErrorToMessageText(
                 localizedFormat(launch.failureText, host().OVLocalizedErrorString(code)));
-            if (wasMounted && disk->mountPoint().empty())
+            if (wasMounted && !hasMountPoint(*disk))
                 diskController().mountDisk(disk, false, false);
         }
     }

@@ -42,6 +42,7 @@ void JobReporter::settle(const std::string& identifier, Outcome outcome)
 
 void JobReporter::flush()
 {
+    hooks_.flushRows();
     if (!unsaid_)
         return;
     const Outcome outcome = *std::move(unsaid_);

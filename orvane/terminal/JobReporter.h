@@ -25,6 +25,8 @@ public:
         std::string message;
     };
     struct Hooks {
+        /// Writes the rows that are waiting.
+        std::function<void()> flushRows;
         /// A job begins on this disk; its first row is the newest of the disk's log.
         std::function<void(const fixwell::DiskReferencePointer& disk)> follow;
         std::function<std::string(fixwell::ErrorCode)> errorText;

@@ -28,8 +28,25 @@ void LogView::writeAllRows()
 void LogView::reloadData()
 {
     countRows();
-    if (isWriting_)
-        writeNewRows();
+    if (!isWriting_ || isWaiting_)
+        return;
+    isWaiting_ = true;
+    loop_.performOnMainThread([this] { flush(); }, fixwell::RunLoop::Wait::No);
+}
+
+void LogView::holdBack()
+{
+    flush();
+    isWriting_ = false;
+}
+
+void LogView::flush()
+{
+    isWaiting_ = false;
+    if (!isWriting_)
+        return;
+    countRows();
+    writeNewRows();
 }
 
 void LogView::writeNewRows()

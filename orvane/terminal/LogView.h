@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/host/foundation/RunLoop.h"
 #include "fixwell/host/toolkit/OutlineView.h"
 
 #include <functional>
@@ -8,7 +9,8 @@
 namespace orvane {
 
 /// The outline view of the log on a terminal. A terminal cannot be drawn anew, so rows are
-/// written once, in their order, when the module reloads its view.
+/// written once, in their order. As a window does, the view only notes that it has to reload, and
+/// draws when the main loop comes to it: a burst of lines is then saved and written together.
 class LogView final : public fixwell::OutlineViewPeer {
 public:
     /// A row with its text as the module's cell holds it.
@@ -16,20 +18,23 @@ public:
         std::function<void(const fixwell::Dictionary& record, const fixwell::StyledText& text)>;
 
     /// `beforeRows` is called before rows are written: what is shown must be on the disk first.
-    LogView(RowWriter writeRow, std::function<void()> beforeRows)
-        : writeRow_(std::move(writeRow)), beforeRows_(std::move(beforeRows))
+    /// The loop outlives this object, and runs nothing more once it is gone.
+    LogView(fixwell::RunLoop& loop, RowWriter writeRow, std::function<void()> beforeRows)
+        : loop_(loop), writeRow_(std::move(writeRow)), beforeRows_(std::move(beforeRows))
     {
     }
 
     /// The view whose data source and cell are asked; it must live as long as this object.
     void setView(fixwell::OutlineView* view) { view_ = view; }
 
-    /// Writes nothing until the next call of one of the two below.
-    void holdBack() { isWriting_ = false; }
+    /// Writes what is waiting, and then nothing until the next call of one of the two below.
+    void holdBack();
     /// Goes on with the newest row there is now, and writes every row that follows.
     void followFromLastRow();
     /// Writes all rows there are.
     void writeAllRows();
+    /// Writes what is waiting.
+    void flush();
 
     void reloadData() override;
     std::size_t numberOfRows() const override { return rows_; }
@@ -54,12 +59,14 @@ private:
     void countRows();
     void writeNewRows();
 
+    fixwell::RunLoop& loop_;
     RowWriter writeRow_;
     std::function<void()> beforeRows_;
     fixwell::OutlineView* view_ = nullptr;
     std::size_t rows_ = 0;
     std::size_t written_ = 0;
     bool isWriting_ = false;
+    bool isWaiting_ = false;  ///< the loop will come to `flush`
     bool isEnabled_ = true;
 };
 

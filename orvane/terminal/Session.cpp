@@ -12,11 +12,6 @@
 namespace orvane {
 namespace {
 
-std::filesystem::path hostBundleDirectory()
-{
-    return runningExecutable().parent_path().parent_path() / "share" / "orvane";
-}
-
 TerminalAlerts::Answer answerFor(const Request& request)
 {
     if (request.confirms)
@@ -32,13 +27,14 @@ Session::Session(const Request& request, Reporter& reporter)
     : reporter_(reporter),
       interrupts_(loop_, [this] { interrupt(); }),
       logView_(
+          loop_,
           [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
               reporter_.record(jobs_.currentDisk(), record, text);
           },
           [this] { host_.histories().saveNew(); }),
       interface_(logView_),
       alerts_(loop_, reporter, answerFor(request)),
-      hostTexts_(hostBundleDirectory() / "locale"),
+      hostTexts_(hostBundleDirectory(runningExecutable()) / "locale"),
       libraryTexts_(hostTexts_),
       library_(loop_, libraryTexts_, libraryOptions(request)),
       host_(supportOptions(request), loop_, interface_, alerts_, reporter, request.showsDetails),
@@ -65,7 +61,7 @@ Session::~Session()
 SupportOptions Session::supportOptions(const Request& request)
 {
     SupportOptions options;
-    options.hostBundle = hostBundleDirectory();
+    options.hostBundle = hostBundleDirectory(runningExecutable());
     options.keptLogLevel = std::max(request.logLevel, fixwell::OVLog::error);
     options.shownLogLevel = request.logLevel;
     options.capabilities = [this](std::string_view type) {
@@ -95,6 +91,9 @@ pellar::ManagerOptions Session::libraryOptions(const Request& request)
 JobReporter::Hooks Session::jobHooks()
 {
     JobReporter::Hooks hooks;
+    hooks.flushRows = [this] {
+        logView_.flush();
+    };
     hooks.follow = [this](const fixwell::DiskReferencePointer& disk) {
         follow(disk);
     };

@@ -2,6 +2,7 @@
 #include "orvane/terminal/TextReporter.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/terminal/ByteCount.h"
 #include "orvane/terminal/TerminalText.h"
 
@@ -14,6 +15,13 @@ namespace orvane {
 namespace {
 
 constexpr std::chrono::milliseconds redrawInterval{100};
+
+/// A heading that is neither good nor bad and says what it is about: a job's first line.
+bool isStartOfRun(const fixwell::Dictionary& record)
+{
+    return record.integer(fixwell::kFsckVerbosity) < 0 && !record.has(fixwell::kFsckMessageType) &&
+           record.has(fixwell::kFsckMessageString);
+}
 
 std::size_t terminalColumns()
 {
@@ -40,6 +48,17 @@ void TextReporter::endLine()
         write("\n");
 }
 
+std::string TextReporter::sentence(std::string_view key,
+                                   std::initializer_list<fixwell::FormatArgument> arguments) const
+{
+    return fixwell::format(options_.translate(key), arguments);
+}
+
+std::string TextReporter::verdictText(std::string_view verdict) const
+{
+    return options_.translate(verdict.empty() ? "cut off" : verdict);
+}
+
 std::string TextReporter::bold(std::string_view text) const
 {
     const std::string safe = safeLines(text);
@@ -55,9 +74,14 @@ void TextReporter::started(const std::string& /*disk*/, std::string_view /*actio
     endLine();
 }
 
-void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary& /*record*/,
+void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary& record,
                           const fixwell::StyledText& text)
 {
+    if (hasWrittenRows_ && isStartOfRun(record)) {
+        endLine();
+        write("\n");
+    }
+    hasWrittenRows_ = true;
     write(terminalText(text, options_.colors));
     drawProgress();
 }
@@ -131,28 +155,28 @@ void TextReporter::listed(const DiskLine& disk)
     if (!disk.filesystem.empty())
         facts += "  " + disk.filesystem;
     if (!disk.mountPoint.empty())
-        facts += fmt::format("  mounted at {}", disk.mountPoint);
+        facts += "  " + sentence("mounted at %@", {disk.mountPoint});
     write(indent + bold(disk.disk) +
           (disk.name.empty() ? "" : fixwell::printable("  “" + disk.name + "”")) + "  " +
           fixwell::printable(facts) + "\n");
     write(indent + "    " +
           (disk.lastChecked.empty()
-               ? std::string("never checked")
-               : fmt::format("last checked {}: {}", disk.lastChecked, disk.verdict)) +
+               ? sentence("never checked", {})
+               : sentence("last checked %@: %@", {disk.lastChecked, verdictText(disk.verdict)})) +
           "\n");
     for (const ActionLine& action : disk.actions)
         write(fmt::format(
             "{}    {:<24} {}\n", indent, action.title,
-            action.isAvailable ? std::string("available") : fixwell::printable(action.reason)));
+            action.isAvailable ? sentence("available", {}) : fixwell::printable(action.reason)));
 }
 
 void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
 {
     endLine();
-    write(bold(disk) + (runs.empty() ? ": never checked\n" : "\n"));
+    write(bold(disk) + (runs.empty() ? ": " + sentence("never checked", {}) + "\n" : "\n"));
     for (const RunLine& run : runs)
         write(fixwell::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
-                                             run.verdict.empty() ? "cut off" : run.verdict)) +
+                                             verdictText(run.verdict))) +
               "\n");
     if (!runs.empty())
         write("\n");

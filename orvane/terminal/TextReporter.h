@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/host/foundation/Format.h"
 #include "orvane/terminal/ProgressLine.h"
 #include "orvane/terminal/Reporter.h"
 
 #include <chrono>
 #include <cstdio>
+#include <functional>
 
 namespace orvane {
 
@@ -15,9 +17,13 @@ public:
     struct Options {
         bool colors = false;
         bool showsProgress = false;
+        /// A text of the host's own in the user's language.
+        std::function<std::string(std::string_view key)> translate = [](std::string_view key) {
+            return std::string(key);
+        };
     };
 
-    explicit TextReporter(Options options) : options_(options) {}
+    explicit TextReporter(Options options) : options_(std::move(options)) {}
     ~TextReporter() override { hideProgress(); }
 
     void started(const std::string& disk, std::string_view action,
@@ -44,6 +50,9 @@ private:
     void hideProgress();
     void drawProgress();
     std::string bold(std::string_view text) const;
+    std::string sentence(std::string_view key,
+                         std::initializer_list<fixwell::FormatArgument> arguments) const;
+    std::string verdictText(std::string_view verdict) const;
 
     Options options_;
     JobProgress progress_;
@@ -51,6 +60,7 @@ private:
     Clock::time_point drawn_{};
     bool isProgressShown_ = false;
     bool isAtLineStart_ = true;
+    bool hasWrittenRows_ = false;
 };
 
 }  // namespace orvane

@@ -1,4 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/ExitStatus.h"
@@ -37,6 +39,11 @@ std::unique_ptr<Reporter> makeReporter(const Request& request)
     if (request.isJSON)
         return std::make_unique<JSONReporter>();
     TextReporter::Options options;
+    options.translate =
+        [texts = std::make_shared<Catalogue>(hostBundleDirectory(runningExecutable()) / "locale")](
+            std::string_view key) {
+            return texts->translate("Orvane", key);
+        };
     options.colors = wantsColors(request);
     options.showsProgress = request.showsProgress && isTerminal();
     return std::make_unique<TextReporter>(options);

@@ -25,8 +25,9 @@ struct Preparation {
     FileDescriptor progress;
     FileDescriptor failure;
     std::vector<char*> arguments;
-    const char* executable;
-    pid_t parent;
+    std::string name;  ///< as a tool calls itself in its messages
+    std::string executable;
+    pid_t parent = 0;
 };
 
 /// Above the numbers that the child hands out, so no duplication overwrites another.
@@ -40,16 +41,26 @@ FileDescriptor duplicatedAbove(int descriptor)
 Preparation prepare(const Command& command, const ChildStreams& streams, int failure)
 {
     const FileDescriptor nothing(::open("/dev/null", O_RDONLY | O_CLOEXEC));
-    Preparation ready{duplicatedAbove(nothing.get()), duplicatedAbove(streams.output),
-                      duplicatedAbove(streams.disk),  duplicatedAbove(streams.progress),
-                      duplicatedAbove(failure),       {},
-                      command.executable.c_str(),     ::getpid()};
+    Preparation ready;
+    ready.input = duplicatedAbove(nothing.get());
+    ready.output = duplicatedAbove(streams.output);
+    ready.disk = duplicatedAbove(streams.disk);
+    ready.progress = duplicatedAbove(streams.progress);
+    ready.failure = duplicatedAbove(failure);
+    ready.executable = command.executable.string();
+    ready.name = command.executable.filename().string();
+    ready.parent = ::getpid();
+    return ready;
+}
+
+/// Points into `ready` and `command`, so both stay where they are until the exec.
+void pointArguments(Preparation& ready, const Command& command)
+{
     // execve(2) takes pointers to non-constant text for history's sake and changes nothing.
-    ready.arguments.push_back(const_cast<char*>(command.executable.c_str()));
+    ready.arguments.push_back(ready.name.data());
     for (const std::string& argument : command.arguments)
         ready.arguments.push_back(const_cast<char*>(argument.c_str()));
     ready.arguments.push_back(nullptr);
-    return ready;
 }
 
 bool isComplete(const Preparation& ready, const ChildStreams& streams)
@@ -90,7 +101,7 @@ bool place(const FileDescriptor& source, int number)
     const unsigned first = progressDescriptorOfTool + (ready.progress ? 1U : 0U);
     ::syscall(SYS_close_range, first, ~0U, CLOSE_RANGE_CLOEXEC);
     if (!isOrphan && isPlaced && ::chdir("/") == 0)
-        ::execve(ready.executable, ready.arguments.data(),
+        ::execve(ready.executable.c_str(), ready.arguments.data(),
                  const_cast<char* const*>(environment.data()));
     const int error = errno;
     [[maybe_unused]] const auto written = ::write(ready.failure.get(), &error, sizeof error);
@@ -145,6 +156,7 @@ std::variant<ChildProcess, NotStarted> ChildProcess::start(const Command& comman
     const FileDescriptor failure(ends[0]);
     FileDescriptor failureWriter(ends[1]);
     Preparation ready = prepare(command, streams, failureWriter.get());
+    pointArguments(ready, command);
     if (!isComplete(ready, streams))
         return NotStarted{errno};
     const pid_t id = forkTool(ready);

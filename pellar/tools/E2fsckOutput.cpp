@@ -85,6 +85,12 @@ bool isSavingOnly(std::string_view text)
            (text.starts_with(") could be narrower.") || text.starts_with(") could be shorter."));
 }
 
+/// "e2fsck 1.47.0 (5-Feb-2023)": the first line of every run.
+bool isBanner(std::string_view text)
+{
+    return take(text, "e2fsck ") && takeNumber(text) && text.starts_with(".");
+}
+
 enum class Answer { None, Yes, No };
 
 Answer answerOf(std::string_view line)
@@ -179,7 +185,7 @@ bool E2fsckOutput::readRemark(std::string_view line)
     else if (line.starts_with("Warning: skipping journal recovery"))
         findings_.skippedJournal = true;
     else
-        return false;
+        return isBanner(line);
     return true;
 }
 

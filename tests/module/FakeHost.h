@@ -44,7 +44,7 @@ struct FakeDisk final : OVDisk {
     bool whole = false;
     std::weak_ptr<OVDisk> parent;
     std::vector<OVDiskPointer> volumes;
-    std::string mount;
+    std::optional<std::string> mount;
     bool writable = true;
     bool boot = false;
     bool home = false;
@@ -66,8 +66,8 @@ struct FakeDisk final : OVDisk {
     bool isWhole() const override { return whole; }
     OVDiskPointer parentDisk() const override { return parent.lock(); }
     std::vector<OVDiskPointer> children() const override { return volumes; }
-    std::string mountPoint() const override { return mount; }
-    bool isMounted() const override { return !mount.empty(); }
+    std::optional<std::string> mountPoint() const override { return mount; }
+    bool isMounted() const override { return mount.has_value(); }
     bool isWritableVolume() const override { return writable; }
     bool isBootVolume() const override { return boot; }
     bool containUserHomeDirectory() const override { return home; }

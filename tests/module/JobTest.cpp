@@ -198,11 +198,10 @@ TEST_F(OVFXWTest, RemountsAfterAStopWhatWasMountedBefore)
     const auto other = addDisk("b");
     const auto never = addDisk("c");
     stopped->mount = "/mnt/a";
-    never->mount = "";
     select(stopped, never, other);
     module->verifyDisk(nullptr);
     module->stopAction(nullptr);
-    stopped->mount.clear();
+    stopped->mount.reset();
     const Dictionary entry = inflightItem();
     finish(stopped, kPLNoError);  // it had ended by itself
     ASSERT_EQ(host.timers.size(), 1U);
@@ -269,10 +268,32 @@ TEST_F(OVFXWTest, ADiskThatAFailedStartUnmountedIsMountedAgain)
     module->verifyDisk(nullptr);
     EXPECT_FALSE(host.has("mount a")) << "still mounted";
     host.whenBegun = [&disk] {
-        disk->mount.clear();
+        disk->mount.reset();
     };
     module->verifyDisk(nullptr);
     EXPECT_TRUE(host.has("mount a"));
+}
+
+TEST_F(OVFXWTest, AMountPointWithoutALengthIsDoubtful)
+{
+    const auto disk = addDisk("a");
+    disk->mount = "";
+    host.refusals["a"] = kPLErrorToolMissing;
+    select(disk);
+    module->verifyDisk(nullptr);
+    EXPECT_FALSE(host.has("mount a")) << "the launcher counts it as never mounted";
+    host.refusals.clear();
+    module->verifyDisk(nullptr);
+    EXPECT_FALSE(inflightItem().boolean(kEntryDiskWasMounted));
+    EXPECT_FALSE(inflightItem().has(kEntryIsQVFS));
+    const Dictionary entry = inflightItem();
+    entry.set(kEntryDiskWasMounted, true);
+    module->stopAction(nullptr);
+    finish(disk);
+    fileAsCompleted(entry);
+    host.journal.clear();
+    host.timers.front()();
+    EXPECT_FALSE(host.has("mount a synchronously")) << "the remount counts it as mounted";
 }
 
 TEST_F(OVFXWTest, DryRunOnlyAnnounces)

@@ -7,6 +7,7 @@
 
 #include <cstdint>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -46,8 +47,9 @@ public:
     virtual std::shared_ptr<OVDisk> parentDisk() const = 0;
     virtual std::vector<std::shared_ptr<OVDisk>> children() const = 0;
 
-    /// Empty when not mounted.
-    virtual std::string mountPoint() const = 0;
+    /// None when not mounted. A mount point without a length is a mount in doubt: some callers
+    /// count it as mounted, others do not.
+    virtual std::optional<std::string> mountPoint() const = 0;
     virtual bool isMounted() const = 0;
     virtual bool isWritableVolume() const = 0;
     virtual bool isBootVolume() const = 0;
@@ -86,5 +88,11 @@ public:
 };
 
 using OVDiskPointer = std::shared_ptr<OVDisk>;
+
+/// Mounted at a place that has a name.
+inline bool hasMountPoint(const OVDisk& disk)
+{
+    return !disk.mountPoint().value_or(std::string()).empty();
+}
 
 }  // namespace fixwell

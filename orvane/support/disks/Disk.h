@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/support/OVDisk.h"
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/disks/DiskFilesystem.h"
@@ -35,13 +36,17 @@ public:
     void setContents(std::shared_ptr<Disk> contents) { contents_ = std::move(contents); }
 
     std::string diskIdentifier() const override { return facts_.identifier; }
-    std::string displayName() const override { return facts_.displayName; }
+    /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.
+    std::string displayName() const override { return fixwell::printable(facts_.displayName); }
     std::int32_t diskType() const override { return facts_.type; }
     std::int64_t diskNumber() const override { return facts_.number; }
     bool isWhole() const override { return facts_.isWhole; }
     std::shared_ptr<OVDisk> parentDisk() const override { return parent_.lock(); }
     std::vector<std::shared_ptr<OVDisk>> children() const override;
-    std::string mountPoint() const override { return facts_.mountPoint; }
+    std::optional<std::string> mountPoint() const override
+    {
+        return isMounted() ? std::optional(facts_.mountPoint) : std::nullopt;
+    }
     bool isMounted() const override { return !facts_.mountPoint.empty(); }
     bool isWritableVolume() const override { return facts_.isWritable; }
     bool isBootVolume() const override { return facts_.isBootVolume; }

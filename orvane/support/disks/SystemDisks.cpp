@@ -97,12 +97,23 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
     return contents;
 }
 
+// What the kernel has mounted it as is certain, also where the device may not be read. A file
+// system in user space ("fuseblk") does not tell which it is.
+std::string filesystemOf(const Mount& mount)
+{
+    if (mount.filesystem == "ntfs3")
+        return "ntfs";
+    return mount.filesystem.starts_with("fuse") ? std::string() : mount.filesystem;
+}
+
 void addMount(DiskFacts& facts, const std::string& number, const DiskSources& sources)
 {
     const auto mount = mountOfDevice(sources.mounts, number, facts.path);
     if (!mount)
         return;
     facts.mountPoint = mount->mountPoint;
+    if (facts.filesystem.empty())
+        facts.filesystem = filesystemOf(*mount);
     facts.isBootVolume = mount->mountPoint == "/";
     const auto home = sources.homeDirectory.empty()
                           ? std::nullopt
@@ -146,14 +157,15 @@ std::string nameOfWhole(const fs::path& device)
     return model.empty() ? device.filename().native() : model;
 }
 
-std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool hasPartitions)
+std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool hasPartitions,
+                         bool isMounted)
 {
     const std::string name = device.filename();
     if (name.starts_with("sr"))
         return diskType::opticalDisc;
-    const bool isBare =
-        !hasPartitions && !contents.table &&
-        (!contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces));
+    const bool hasVolume =
+        !contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces);
+    const bool isBare = isMounted || (!hasPartitions && !contents.table && hasVolume);
     if (name.starts_with("dm-") || name.starts_with("md"))
         return hasPartitions ? diskType::whole : diskType::assembled;
     return isBare ? diskType::bareVolume : diskType::whole;
@@ -195,7 +207,8 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
     for (const fs::path& part : sortedEntries(device))
         if (!attribute(part, "partition").empty())
             tree.children.push_back(readPartition(part, contents.table, sources));
-    facts.type = typeOfWhole(device, contents, !tree.children.empty());
+    facts.type = typeOfWhole(device, contents, !tree.children.empty(),
+                             mountOfDevice(sources.mounts, number, facts.path).has_value());
     facts.isWhole = facts.type == diskType::whole;
     facts.isBlankOptical = facts.type == diskType::opticalDisc && contents.superblock.type.empty();
     if (!facts.isWhole) {
@@ -235,7 +248,10 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
     facts.isWritable = attribute(device, "ro") != "1";
     const Contents contents = contentsOf(node, number, facts.length, sources);
     const bool isPartition = !attribute(device, "partition").empty();
-    facts.type = isPartition ? diskType::volume : typeOfWhole(device, contents, false);
+    facts.type = isPartition
+                     ? diskType::volume
+                     : typeOfWhole(device, contents, false,
+                                   mountOfDevice(sources.mounts, number, facts.path).has_value());
     facts.isWhole = facts.type == diskType::whole;
     addSuperblock(facts, contents);
     addMount(facts, number, sources);

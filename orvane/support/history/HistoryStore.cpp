@@ -82,40 +82,57 @@ void HistoryStore::forgetInterned()
     shapesRead_.clear();
 }
 
-// Always NO, for the caller to pass on.
-bool HistoryStore::failedTo(std::string_view attempt)
+HistoryStore::Mishap HistoryStore::lastMishap() const
 {
-    const std::string reason = database_.lastError();
-    const bool isDamaged = database_.trouble() == Database::Trouble::Damaged;
+    return {database_.lastError(), database_.trouble() == Database::Trouble::Damaged};
+}
+
+// Always NO, for the caller to pass on.
+bool HistoryStore::failedTo(std::string_view attempt, const Mishap& mishap)
+{
     // What was interned in a transaction that failed is not in the database.
     forgetInterned();
-    if (isDamaged && isKept_) {
+    if (mishap.isDamage && isKept_) {
         statements_.reset();
         database_ = Database();
         static_cast<void>(setHistoryAside(file_, warn_));
         open();
         ++generation_;
     } else if (!std::exchange(hasWarned_, true)) {
-        warn_(cannot(attempt, file_.native(), reason).message);
+        warn_(cannot(attempt, file_.native(), mishap.reason).message);
     }
     return false;
 }
 
-std::int64_t HistoryStore::interned(Statement& find, Statement& add, const std::string& text)
+// 0 where the table has no such text.
+std::int64_t HistoryStore::found(Statement& find, std::string_view text)
 {
     find.bind(1, text);
-    if (find.step() == Statement::Step::Row) {
-        const std::int64_t number = find.integer(0);
-        find.reset();
+    if (find.step() != Statement::Step::Row)
+        return 0;
+    const std::int64_t number = find.integer(0);
+    find.reset();
+    return number;
+}
+
+// 0 where it could not be written.
+std::int64_t HistoryStore::interned(Statement& find, Statement& add, std::string_view text)
+{
+    if (const std::int64_t number = found(find, text))
         return number;
-    }
     add.bind(1, text);
     return add.run() ? database_.lastInsertedRow() : 0;
 }
 
+// Looking at a volume writes nothing.
+std::int64_t HistoryStore::knownVolume(std::string_view key)
+{
+    return found(statements_->findVolume, key);
+}
+
 std::int64_t HistoryStore::volumeNumber(std::string_view key)
 {
-    return interned(statements_->findVolume, statements_->addVolume, std::string(key));
+    return interned(statements_->findVolume, statements_->addVolume, key);
 }
 
 std::int64_t HistoryStore::styleNumber(const fixwell::TextStyle* style)
@@ -184,7 +201,14 @@ const RecordShape* HistoryStore::shapeNumbered(std::int64_t number)
 Array HistoryStore::load(std::string_view key)
 {
     const Array history = Array::make();
-    const std::int64_t volume = volumeNumber(key);
+    const std::int64_t volume = knownVolume(key);
+    if (volume != 0 && !read(volume, history))
+        failedTo("read the history", lastMishap());
+    return history;
+}
+
+bool HistoryStore::read(std::int64_t volume, const Array& history)
+{
     Statement& row = statements_->read;
     row.bind(1, firstOf(volume));
     row.bind(2, firstOf(volume + 1));
@@ -197,9 +221,7 @@ Array HistoryStore::load(std::string_view key)
             columns.style = styleNumbered(row.integer(5));
         history.append(recordFrom(columns, *shape));
     }
-    if (step == Statement::Step::Failed || volume == 0)
-        failedTo("read the history");
-    return history;
+    return step == Statement::Step::Done;
 }
 
 bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew)
@@ -207,7 +229,7 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
     // In memory the lists themselves are all there is to keep.
     if (!isKept_ || firstNew >= history.size())
         return true;
-    const std::uint64_t generation = generation_;
+    Mishap mishap;
     {
         Transaction transaction(database_);
         const std::int64_t volume = transaction.hasBegun() ? volumeNumber(key) : 0;
@@ -215,8 +237,10 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
         if (volume != 0 && makeRoom(volume, added) && insertAll(volume, history, firstNew) &&
             transaction.commit())
             return true;
+        // Rolling back would forget it.
+        mishap = lastMishap();
     }
-    return generation == generation_ && failedTo("save the history");
+    return failedTo("save the history", mishap);
 }
 
 std::int64_t HistoryStore::nextRecord(std::int64_t volume)
@@ -250,7 +274,7 @@ bool HistoryStore::makeRoom(std::int64_t volume, std::int64_t added)
     endOfRun.bind(1, from - 1);
     endOfRun.bind(2, next);
     const bool hasEnd = endOfRun.step() == Statement::Step::Row;
-    const std::int64_t kept = hasEnd ? endOfRun.integer(0) + 1 : std::min(next, first + surplus);
+    const std::int64_t kept = hasEnd ? endOfRun.integer(0) + 1 : from;
     endOfRun.reset();
     statements_->remove.bind(1, first);
     statements_->remove.bind(2, kept);
@@ -306,10 +330,10 @@ bool HistoryStore::insert(std::int64_t id, const Dictionary& record, std::int64_
 
 bool HistoryStore::clear(std::string_view key)
 {
-    const std::int64_t volume = volumeNumber(key);
+    const std::int64_t volume = knownVolume(key);
     statements_->remove.bind(1, firstOf(volume));
     statements_->remove.bind(2, firstOf(volume + 1));
-    return (volume != 0 && statements_->remove.run()) || failedTo("clear the history");
+    return volume == 0 || statements_->remove.run() || failedTo("clear the history", lastMishap());
 }
 
 std::int64_t HistoryStore::beginRun(std::string_view key, std::string_view action,
@@ -318,7 +342,7 @@ std::int64_t HistoryStore::beginRun(std::string_view key, std::string_view actio
     const std::int64_t volume = volumeNumber(key);
     const std::int64_t run = volume != 0 ? statements_->runs.begin(volume, action, started) : 0;
     if (run == 0)
-        failedTo("note the run in the history");
+        failedTo("note the run in the history", lastMishap());
     return run;
 }
 
@@ -330,12 +354,12 @@ void HistoryStore::endRun(std::int64_t run, const RunEnd& end, Run::Time finishe
 
 std::vector<Run> HistoryStore::runs(std::string_view key)
 {
-    return statements_->runs.runs(volumeNumber(key));
+    return statements_->runs.runs(knownVolume(key));
 }
 
 std::optional<Run> HistoryStore::lastRun(std::string_view key)
 {
-    auto newest = statements_->runs.runs(volumeNumber(key), 1);
+    auto newest = statements_->runs.runs(knownVolume(key), 1);
     return newest.empty() ? std::nullopt : std::optional(std::move(newest.back()));
 }
 

@@ -58,17 +58,26 @@ public:
 
 private:
     struct Statements;
+    /// Why the database did not do what it was asked.
+    struct Mishap {
+        std::string reason;
+        bool isDamage = false;
+    };
     struct KnownShape {
         RecordShape shape;
         std::int64_t number;
     };
 
     void open();
-    bool failedTo(std::string_view attempt);
+    Mishap lastMishap() const;
+    bool failedTo(std::string_view attempt, const Mishap& mishap);
+    std::int64_t knownVolume(std::string_view key);
     std::int64_t volumeNumber(std::string_view key);
+    bool read(std::int64_t volume, const fixwell::Array& history);
     std::int64_t nextRecord(std::int64_t volume);
     bool makeRoom(std::int64_t volume, std::int64_t added);
-    std::int64_t interned(Statement& find, Statement& add, const std::string& text);
+    std::int64_t found(Statement& find, std::string_view text);
+    std::int64_t interned(Statement& find, Statement& add, std::string_view text);
     const KnownShape* shapeOf(const fixwell::Dictionary& record);
     std::int64_t styleNumber(const fixwell::TextStyle* style);
     const fixwell::TextStyle* styleNumbered(std::int64_t number);

@@ -71,11 +71,12 @@ int RotatingFile::open()
     return descriptor_.isOpen() ? 0 : errno;
 }
 
+// The oldest is removed first: renaming one file over another makes ext4 bring the data to the
+// disk at once (ext4(5), auto_da_alloc), which a log is not worth.
 void RotatingFile::rotate()
 {
     std::error_code ignored;
-    if (limits_.oldFiles == 0)
-        std::filesystem::remove(file_, ignored);
+    std::filesystem::remove(oldFile(limits_.oldFiles), ignored);
     for (int number = limits_.oldFiles; number > 0; --number)
         std::filesystem::rename(oldFile(number - 1), oldFile(number), ignored);
 }

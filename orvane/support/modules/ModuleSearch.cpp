@@ -25,9 +25,17 @@ bool isPlainFileName(const fs::path& name)
     return !name.empty() && name == name.filename() && name != "." && name != "..";
 }
 
+/// Whoever owns the program itself could change that just as well: a module beside a program that
+/// a user built is trusted when root runs the two.
+bool isProgramOwner(uid_t owner)
+{
+    struct stat status = {};
+    return ::stat("/proc/self/exe", &status) == 0 && status.st_uid == owner;
+}
+
 bool isTrustedOwner(uid_t owner)
 {
-    return owner == 0 || owner == ::geteuid();
+    return owner == 0 || owner == ::geteuid() || isProgramOwner(owner);
 }
 
 // A group that only the user is in is the user; which groups are like that cannot be told, so of
@@ -100,6 +108,11 @@ Outcome<ModuleDescription> readModuleDescription(const fs::path& bundle)
     if (!isPlainFileName(library))
         return cannot(attempt, bundle.native(), "module.json names no library inside the bundle");
     return ModuleDescription{text("name", ""), bundle / library, text("table", "FXW")};
+}
+
+fs::path hostBundleDirectory(const fs::path& executable)
+{
+    return executable.parent_path().parent_path() / "share" / "orvane";
 }
 
 Outcome<> checkIsTrustworthy(const fs::path& path)

@@ -15,6 +15,9 @@ namespace orvane {
 [[nodiscard]] std::vector<std::filesystem::path> moduleDirectories(
     const EnvironmentLookup& environment, const std::filesystem::path& executable);
 
+/// The host's own bundle, beside the program: the directory with its `locale`.
+[[nodiscard]] std::filesystem::path hostBundleDirectory(const std::filesystem::path& executable);
+
 /// The program that is running; empty when /proc is not there.
 [[nodiscard]] std::filesystem::path runningExecutable();
 

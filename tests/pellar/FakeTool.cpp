@@ -1,0 +1,103 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// A tool that does what the file "script" beside it says, one action per line:
+//   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
+//   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <csignal>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+
+extern char** environ;
+
+namespace {
+
+void put(int descriptor, const std::string& text)
+{
+    if (::write(descriptor, text.data(), text.size()) < 0)
+        std::exit(99);
+}
+
+[[noreturn]] void flood(const std::string& piece)
+{
+    std::string block;
+    while (block.size() < 60'000)
+        block += piece;
+    for (;;)
+        put(STDOUT_FILENO, block);
+}
+
+/// A grandchild that outlives the tool with its output open.
+void holdPipe()
+{
+    if (::fork() != 0)
+        return;
+    ::setsid();
+    ::sleep(5);
+    ::_exit(0);
+}
+
+void tellDescriptors()
+{
+    for (int descriptor = 0; descriptor < 256; ++descriptor)
+        if (::fcntl(descriptor, F_GETFD) >= 0)
+            put(STDOUT_FILENO, "descriptor " + std::to_string(descriptor) + "\n");
+}
+
+void act(const std::string& action, const std::string& text)
+{
+    const int number = std::atoi(text.c_str());
+    if (action == "say")
+        put(STDOUT_FILENO, text + "\n");
+    else if (action == "progress")
+        put(4, text + "\n");
+    else if (action == "exit")
+        std::exit(number);
+    else if (action == "kill") {
+        std::signal(number, SIG_DFL);  // a sanitizer would catch a crash
+        ::kill(::getpid(), number);
+    } else if (action == "ignore")
+        std::signal(number, SIG_IGN);
+    else if (action == "wait")
+        for (;;)
+            ::pause();
+    else if (action == "sleep")
+        ::usleep(static_cast<unsigned>(number) * 1000);
+    else if (action == "flood-lines")
+        flood("Inode 12 is wrong.  Fix? no\n");
+    else if (action == "flood-bytes")
+        flood("x");
+    else if (action == "hold-pipe")
+        holdPipe();
+    else if (action == "shrink" && ::truncate("/proc/self/fd/3", number) != 0)
+        std::exit(98);
+    else if (action == "environment")
+        for (char** entry = environ; *entry != nullptr; ++entry)
+            put(STDOUT_FILENO, std::string("environment ") + *entry + "\n");
+    else if (action == "descriptors")
+        tellDescriptors();
+}
+
+}  // namespace
+
+int main()
+{
+    const auto self = std::filesystem::read_symlink("/proc/self/exe");
+    std::ifstream script(self.parent_path() / "script");
+    for (std::string line; std::getline(script, line);) {
+        std::istringstream words(line);
+        std::string action;
+        std::string text;
+        words >> action >> std::ws;
+        std::getline(words, text);
+        act(action, text);
+    }
+    return 0;
+}

@@ -1,0 +1,187 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/pellar/Workshop.h"
+
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <cerrno>
+
+namespace {
+
+using namespace std::chrono_literals;
+using namespace pellar;
+
+const std::string soundRun =
+    "say Pass 1: Checking inodes, blocks, and sizes\n"
+    "say Disk: 11/2048 files (9.1% non-contiguous), 1618/8192 blocks\n";
+
+/// Jobs on a sound volume with a tool that does what a script says.
+struct Stage {
+    explicit Stage(std::string_view script, ManagerOptions options = {})
+        : disk(test::reference(workshop.makeExt("disk", 8U << 20U))), bench([&] {
+              options.toolPath = workshop.fakeTools(script);
+              return options;
+          }())
+    {
+    }
+
+    test::Workshop workshop;
+    fixwell::DiskReferencePointer disk;
+    test::Bench bench;
+    test::Listener& heard = bench.listener;
+};
+
+void expectOneEnd(Stage& stage)
+{
+    stage.bench.loop.drain();
+    EXPECT_EQ(stage.heard.started, 1);
+    EXPECT_EQ(stage.heard.finished, 1);
+    EXPECT_EQ(stage.heard.callsAfterFinished, 0);
+    EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << "a process is left";
+}
+
+ManagerOptions fewLines()
+{
+    ManagerOptions options;
+    options.outputLimits = {1000, 10U << 20U};
+    return options;
+}
+
+TEST(Job, VerifyAnswersWhatIsTrue)
+{
+    struct Case {
+        std::string script;
+        fixwell::ErrorCode error;
+        std::string_view verdict;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{soundRun, 0, "sound", "all is said"},
+          Case{"say Pass 1: Checking inodes, blocks, and sizes\n", fixwell::kPLErrorInconclusive,
+               "inconclusive", "it never came to the end"},
+          Case{"", fixwell::kPLErrorInconclusive, "inconclusive", "it said nothing"},
+          Case{soundRun + "exit 16", fixwell::kPLErrorToolFailed, "failed", "usage"},
+          Case{soundRun + "kill 9", fixwell::kPLErrorToolFailed, "failed", "killed"},
+          Case{soundRun + "shrink 4194304", fixwell::kPLErrorDiskChanged, "failed",
+               "the file shrank below it"},
+          Case{"flood-lines", fixwell::kPLErrorDamaged, "damaged", "problems without end"},
+          Case{"flood-bytes", fixwell::kPLErrorToolMisbehaved, "failed", "noise without end"}}) {
+        Stage stage(c.script, fewLines());
+        // The claim is read-only, so the tool needs write access of its own to cut the file.
+        EXPECT_EQ(stage.bench.verify(stage.disk), fixwell::kPLNoError) << c.because;
+        EXPECT_EQ(stage.heard.error, c.error) << c.because;
+        EXPECT_EQ(stage.heard.verdict, c.verdict) << c.because;
+        EXPECT_FALSE(stage.heard.message.empty()) << c.because;
+        expectOneEnd(stage);
+    }
+}
+
+TEST(Job, FloodIsEndedWithASentence)
+{
+    Stage stage("flood-lines", fewLines());
+    ASSERT_EQ(stage.bench.verify(stage.disk), 0);
+    EXPECT_EQ(stage.heard.textsOf(fixwell::kFsckFail).size(), 1U);
+    EXPECT_EQ(stage.heard.textsOf(fixwell::kFsckError).size(), 11U) << "ten, and how many more";
+}
+
+TEST(Job, CancelIsHeardAndReported)
+{
+    Stage stage("ignore 2\nignore 15\nsay e2fsck 1.47.0\nwait");
+    const auto press = [&stage] {
+        stage.bench.tool->cancelCurrentOperation();
+    };
+    stage.heard.onMessage = [&] {
+        for (int i = 0; stage.heard.hasPlainLine("e2fsck 1.47.0") && i < 3; ++i)
+            press();
+    };
+    ASSERT_EQ(stage.bench.verify(stage.disk), 0);
+    EXPECT_EQ(stage.heard.error, fixwell::kPLErrorCancelled);
+    EXPECT_EQ(stage.heard.verdict, "stopped");
+    press();  // nothing runs
+    expectOneEnd(stage);
+}
+
+TEST(Job, DestroyingTheToolEndsEverything)
+{
+    for (const std::string_view script : {"wait", "flood-lines", "ignore 2\nignore 15\nwait"}) {
+        Stage stage(script);
+        ASSERT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk), 0);
+        while (stage.bench.loop.waiting() == 0)
+            std::this_thread::yield();
+        stage.bench.tool.reset();
+        stage.bench.loop.drain();
+        EXPECT_EQ(stage.heard.started + stage.heard.finished, 0) << script;
+        EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << script;
+        EXPECT_EQ(errno, ECHILD) << script;
+    }
+}
+
+TEST(Job, MayBeDestroyedByTheOneWhoHearsIt)
+{
+    Stage stage("wait");
+    stage.heard.onMessage = [&stage] {
+        stage.bench.tool.reset();
+    };
+    ASSERT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk), 0);
+    ASSERT_TRUE(stage.bench.loop.runUntil([&stage] { return !stage.bench.tool; }));
+    stage.bench.loop.drain();
+    EXPECT_EQ(stage.heard.finished, 0);
+}
+
+TEST(Job, TheNextMayBeginInTheFinishedOfTheLast)
+{
+    Stage stage(soundRun);
+    fixwell::ErrorCode second = -1;
+    stage.heard.onFinished = [&] {
+        if (stage.heard.finished == 1)
+            second = stage.bench.tool->beginStoragesystemFilesystemRepairForDisk(stage.disk);
+    };
+    ASSERT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk), 0);
+    EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk),
+              fixwell::kPLErrorBusy);
+    ASSERT_TRUE(stage.bench.loop.runUntil([&] { return stage.heard.finished == 2; }));
+    EXPECT_EQ(second, fixwell::kPLNoError);
+    EXPECT_EQ(stage.heard.verdict, "sound");
+}
+
+TEST(Job, RefusesBeforeItStarts)
+{
+    Stage stage(soundRun);
+    const auto begin = [&stage](const fixwell::DiskReference& disk) {
+        return stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(
+            std::make_shared<fixwell::DiskReference>(disk));
+    };
+    fixwell::DiskReference disk = *stage.disk;
+    disk.filesystem = "%@fs";
+    EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
+    disk.isWhole = true;
+    EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
+    disk = *stage.disk;
+    disk.path.clear();
+    EXPECT_EQ(begin(disk), fixwell::kPLErrorNoDiskReference);
+    EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(nullptr),
+              fixwell::kPLErrorNoDiskReference);
+    std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
+    EXPECT_EQ(begin(*stage.disk), fixwell::kPLErrorToolMissing);
+    EXPECT_FALSE(stage.bench.manager.canVerify("ext4"));
+    EXPECT_EQ(stage.bench.manager.reasonAgainst("ext4", Operation::Repair),
+              "e2fsck is not installed (package e2fsprogs)");
+    stage.bench.loop.drain();
+    EXPECT_EQ(stage.heard.started, 0) << "a refused begin calls nobody back";
+}
+
+TEST(Job, ProgressOnlyGrows)
+{
+    Stage stage(
+        "progress 1 1 4\nsleep 120\nprogress 1 3 4\nsleep 120\nprogress 2 1 2\n"
+        "progress nonsense\n" +
+        soundRun);
+    ASSERT_EQ(stage.bench.repair(stage.disk), 0);
+    const std::vector<double>& progress = stage.heard.progress;
+    ASSERT_GE(progress.size(), 3U);
+    EXPECT_TRUE(std::is_sorted(progress.begin(), progress.end()));
+    EXPECT_GT(progress.front(), 0);
+    EXPECT_LT(progress.back(), 100);
+}
+
+}  // namespace

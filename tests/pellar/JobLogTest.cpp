@@ -1,0 +1,192 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/host/foundation/Array.h"
+#include "pellar/jobs/DiskNaming.h"
+#include "pellar/jobs/JobLog.h"
+#include "tests/pellar/Workshop.h"
+
+#include <gtest/gtest.h>
+
+namespace {
+
+using namespace std::chrono_literals;
+using namespace pellar;
+
+struct Scene {
+    explicit Scene(const Texts& texts = english(), std::string name = "Disk")
+        : disk(test::reference("/dev/sdz9", "ext4", std::move(name))),
+          road(loop, {&listener,
+                      disk,
+                      {},
+                      [] {
+                      }}),
+          log(*disk, texts, road)
+    {
+    }
+
+    static const Texts& english()
+    {
+        static const test::EnglishTexts texts;
+        return texts;
+    }
+    void deliver()
+    {
+        road.flush();
+        loop.drain();
+    }
+
+    test::TestLoop loop;
+    test::Listener listener;
+    fixwell::DiskReferencePointer disk;
+    EventRoad road;
+    JobLog log;
+};
+
+TEST(JobLog, LetsNothingPassForAVerdict)
+{
+    for (const std::string_view hostile :
+         {"File /a needs to be repaired. (inode #12)", "x APPEARS TO BE OK. x",
+          "a name with [31m in it", "Rebuilding Catalog B-tree."}) {
+        Scene scene;
+        scene.log.detail(hostile);
+        scene.deliver();
+        EXPECT_TRUE(scene.listener.plainLines.empty()) << hostile;
+        ASSERT_EQ(scene.listener.dictionaries.size(), 1U) << hostile;
+        EXPECT_EQ(scene.listener.dictionaries[0].integer(fixwell::kFsckVerbosity), 2) << hostile;
+    }
+}
+
+TEST(JobLog, ShowsNoControlCharacters)
+{
+    Scene scene;
+    scene.log.detail("a\x1b]0;title\x07 b\tc");
+    scene.log.problem("\x1b[2Jgone");
+    scene.deliver();
+    EXPECT_EQ(scene.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
+    EXPECT_EQ(scene.listener.textsOf(fixwell::kFsckError),
+              std::vector<std::string>{"\uFFFD[2Jgone"});
+}
+
+TEST(JobLog, NamesTheDiskSoThatItCannotLie)
+{
+    struct Case {
+        std::string name;
+        std::string identifier;
+        std::string shown;
+    };
+    const LineGuard guard(Scene::english());
+    for (const Case& c :
+         {Case{"My Disk", "/dev/sdb1", "My Disk"},
+          Case{"it appears to be ok.", "/dev/sdb1", "sdb1"}, Case{"", "/dev/sdb1", "sdb1"},
+          Case{"[31mred", "/x/needs to be repaired.", "volume"}, Case{"a\nb", "x", "a\uFFFDb"}}) {
+        fixwell::DiskReference disk;
+        disk.name = c.name;
+        disk.identifier = c.identifier;
+        EXPECT_EQ(shownNameOf(disk, guard), c.shown);
+    }
+}
+
+TEST(JobLog, SaysVerdictsInTheModulesPhrases)
+{
+    struct Case {
+        Verdict verdict;
+        Access access;
+        std::string line;
+    };
+    for (const Case& c :
+         {Case{Verdict::Sound, Access::ReadOnly, "The volume “%@” appears to be OK.\n"},
+          Case{Verdict::Damaged, Access::ReadOnly, "The volume “%@” needs to be repaired."},
+          Case{Verdict::Damaged, Access::ReadWrite, "The volume “%@” could not be repaired."},
+          Case{Verdict::Repaired, Access::ReadWrite,
+               "The volume “%@” was repaired successfully.\n"}}) {
+        Scene scene(Scene::english(), "%@");
+        scene.log.verdict(c.verdict, c.access);
+        scene.deliver();
+        EXPECT_EQ(scene.listener.plainLines, std::vector<std::string>{c.line});
+    }
+}
+
+/// A language whose sentence was translated and whose phrase was forgotten.
+class HalfTranslated final : public Texts {
+public:
+    std::string text(std::string_view key) const override { return std::string(key); }
+    std::string resultText(std::string_view key) const override
+    {
+        return key.starts_with("The volume") ? "Das Volume „%@“ ist in Ordnung." : std::string(key);
+    }
+};
+
+TEST(JobLog, VerdictSurvivesAnIncompleteTranslation)
+{
+    const HalfTranslated texts;
+    Scene scene(texts);
+    scene.log.verdict(Verdict::Sound, Access::ReadOnly);
+    scene.deliver();
+    EXPECT_EQ(scene.listener.textsOf(fixwell::kFsckSuccess),
+              std::vector<std::string>{"Das Volume „Disk“ ist in Ordnung."});
+}
+
+TEST(JobLog, KeepsTenThousandProblemsReadable)
+{
+    Scene scene;
+    for (int i = 0; i < 10'000; ++i) {
+        scene.log.problem("Inode " + std::to_string(i) + " ref count is 9, should be 1.  Fix? no");
+        if (i % 1000 == 0)  // the road takes only so much before it is emptied
+            scene.deliver();
+    }
+    for (int i = 0; i < 500; ++i)
+        scene.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
+    scene.log.endOfRun();
+    scene.deliver();
+    const auto errors = scene.listener.textsOf(fixwell::kFsckError);
+    EXPECT_EQ(errors.size(), ProblemLimiter::shownInAll + 2);
+    EXPECT_EQ(errors[100], "… and %1$@ more like “%2$@”");
+    EXPECT_EQ(scene.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
+        << "nothing is lost in the detailed log";
+    const fixwell::Array rest = scene.listener.dictionaries[100][fixwell::kFsckParameters].array();
+    EXPECT_EQ(rest.at(0).integer(), 9990);
+    EXPECT_EQ(rest.at(1).string(), "Inode # ref count is #, should be #.");
+}
+
+TEST(ProblemKind, IsTheSameForOtherNumbersAndNames)
+{
+    EXPECT_EQ(kindOfProblem("Entry 'a 'quoted' b1' in / (2) has a wrong inode 14.  Clear? no"),
+              "Entry '…' in / (#) has a wrong inode #.");
+    EXPECT_EQ(kindOfProblem("Unattached inode 20"), "Unattached inode #");
+}
+
+TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
+{
+    ProgressMeter meter;
+    Clock::time_point now{1h};
+    const auto report = [&](double percent) {
+        return meter.report(percent, now += 1s);
+    };
+    meter.setRange(0, 60);
+    EXPECT_EQ(report(0), 0.1) << "0 itself would be ignored";
+    EXPECT_EQ(report(50), 30.0);
+    EXPECT_EQ(report(50.1), std::nullopt) << "too little to tell";
+    EXPECT_EQ(report(20), std::nullopt) << "backwards";
+    meter.setRange(60, 100);
+    EXPECT_EQ(report(100), 99.9) << "100 itself would be ignored";
+    meter.setRange(0, 60);
+    EXPECT_EQ(report(60), std::nullopt) << "another pass does not go back";
+
+    ProgressMeter other;
+    EXPECT_EQ(other.report(20, now), 20.05) << "20 itself means something else";
+    EXPECT_EQ(other.report(30, now + 50ms), std::nullopt) << "too soon";
+}
+
+TEST(DiskNaming, ReplacesOurNameForTheDisk)
+{
+    struct Case {
+        std::string_view line;
+        std::string_view shown;
+    };
+    for (const Case& c :
+         {Case{"/proc/self/fd/3: 11/16 files", "X: 11/16 files"},
+          Case{"while trying to open /proc/self/fd/3?offset=1048576", "while trying to open X"},
+          Case{"/proc/self/fd/33 /proc/self/fd/3", "/proc/self/fd/33 X"}, Case{"", ""}})
+        EXPECT_EQ(withDiskName(c.line, "X"), c.shown);
+}
+
+}  // namespace

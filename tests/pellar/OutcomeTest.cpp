@@ -1,0 +1,104 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/ErrorTexts.h"
+#include "pellar/jobs/Outcome.h"
+#include "tests/pellar/Workshop.h"
+
+#include <gtest/gtest.h>
+
+#include <set>
+
+namespace {
+
+using namespace pellar;
+
+Judgement sound()
+{
+    return {Verdict::Sound, 0, 0, {}, false};
+}
+
+Judgement damaged(bool madeProgress = false)
+{
+    return {Verdict::Damaged, fixwell::kPLErrorDamaged, 4, {}, madeProgress};
+}
+
+Judgement corrected()
+{
+    return {Verdict::Sound, 0, 1, {}, true};
+}
+
+Judgement killed()
+{
+    return {Verdict::Failed, fixwell::kPLErrorToolFailed, 9, {"killed", {}, {}}, false};
+}
+
+TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
+{
+    struct Case {
+        std::vector<RepairPass> passes;
+        Judgement confirmation;
+        Verdict verdict;
+        fixwell::ErrorCode code;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{{{sound(), false, false}}, sound(), Verdict::Sound, 0, "nothing to do"},
+          Case{{{corrected(), false, true}}, sound(), Verdict::Repaired, 0, "all put right"},
+          Case{{{sound(), true, false}}, sound(), Verdict::Repaired, 0, "a replayed journal"},
+          Case{{{corrected(), false, true}},
+               damaged(),
+               Verdict::Damaged,
+               fixwell::kPLErrorNotRepaired,
+               "the tool was too sure of itself"},
+          Case{{{damaged(true), false, true}, {corrected(), false, true}},
+               sound(),
+               Verdict::Repaired,
+               0,
+               "the second pass did it"},
+          Case{{{killed(), false, false}},
+               damaged(),
+               Verdict::Damaged,
+               fixwell::kPLErrorNotRepaired,
+               "the repair was killed"}}) {
+        const Outcome outcome = outcomeOfRepair(c.passes, c.confirmation);
+        EXPECT_EQ(outcome.verdict, c.verdict) << c.because;
+        EXPECT_EQ(outcome.code, c.code) << c.because;
+    }
+}
+
+TEST(Outcome, RepairsAgainOnlyWhileThatHelps)
+{
+    EXPECT_TRUE(isWorthAnotherPass({{damaged(true), false, true}}, damaged()));
+    EXPECT_FALSE(isWorthAnotherPass({{damaged(false), false, true}}, damaged())) << "got nowhere";
+    EXPECT_FALSE(isWorthAnotherPass({{corrected(), false, true}}, sound())) << "is done";
+    EXPECT_FALSE(isWorthAnotherPass({{corrected(), false, true}}, killed())) << "is not known";
+    const std::vector<RepairPass> many(mostRepairPasses, {damaged(true), false, true});
+    EXPECT_FALSE(isWorthAnotherPass(many, damaged())) << "goes on for ever";
+}
+
+TEST(Outcome, SaysSoWhenOnlyTheJournalWasReplayed)
+{
+    const test::EnglishTexts texts;
+    const auto message = [&texts](bool foundProblems) {
+        return messageOf(outcomeOfRepair({{sound(), true, foundProblems}}, sound()),
+                         Operation::Repair, "%2$@", texts);
+    };
+    EXPECT_EQ(message(false), "repaired “%2$@”: its journal was replayed; nothing else was wrong");
+    EXPECT_EQ(message(true), "repaired “%2$@”: no damage is left");
+}
+
+TEST(ErrorTexts, EveryCodeHasItsOwn)
+{
+    const test::EnglishTexts texts;
+    std::set<std::string> seen;
+    for (fixwell::ErrorCode code = fixwell::kPLErrorBusy; code <= fixwell::kPLErrorDamaged; ++code)
+        EXPECT_TRUE(seen.insert(errorText(code, texts)).second) << code;
+    for (const fixwell::ErrorCode code :
+         {fixwell::kPLErrorNoDiskReference, fixwell::kPLErrorCouldNotUnmount,
+          fixwell::kPLErrorDiskInUse, fixwell::kPLErrorCancelled,
+          fixwell::kOVErrorCannotRepairInUse, fixwell::kOVErrorSystemDiskInUse,
+          fixwell::kOVErrorDiskInUse})
+        EXPECT_FALSE(errorTextKey(code).empty()) << code;
+    EXPECT_EQ(errorText(-12345, texts), "Error -12345.");
+}
+
+}  // namespace

@@ -1,0 +1,188 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/process/ProcessRunner.h"
+
+#include "tests/pellar/Workshop.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+
+#include <cerrno>
+#include <csignal>
+
+namespace {
+
+using namespace std::chrono_literals;
+using namespace pellar;
+
+/// Keeps the lines; presses the stop switch at the first one when asked to.
+class Lines final : public RunListener {
+public:
+    void line(std::string_view line, bool) override
+    {
+        output.emplace_back(line);
+        if (onLine)
+            onLine();
+    }
+    void progressLine(std::string_view line) override { progress.emplace_back(line); }
+    void lineLimitReached() override { ++limits; }
+    void pause() override {}
+    void tick() override {}
+
+    std::vector<std::string> output;
+    std::vector<std::string> progress;
+    int limits = 0;
+    std::function<void()> onLine;
+};
+
+struct Runner {
+    RunResult run(std::string_view script)
+    {
+        request.command = {workshop.fakeTools(script) + "/e2fsck", {}};
+        return runTool(request, stop, lines);
+    }
+
+    test::Workshop workshop;
+    RunRequest request{{}, Access::ReadOnly, -1, {}, 0ms, {100ms, 100ms, 0ms}};
+    StopSwitch stop;
+    Lines lines;
+};
+
+/// Nothing of ours is left: not even an ended process that nobody has reaped.
+void expectNoChildren()
+{
+    EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
+    EXPECT_EQ(errno, ECHILD);
+}
+
+TEST(ProcessRunner, TellsHowAToolEnded)
+{
+    struct Case {
+        std::string_view script;
+        Ending ending;
+        std::string_view because;
+    };
+    for (const Case& c : {Case{"say a\nexit 0", Exited{0}, "sound"},
+                          Case{"say a\nexit 137", Exited{137}, "a status is no signal"},
+                          Case{"say a\nkill 9", Killed{9}, "killed from outside"},
+                          Case{"say a\nkill 11", Killed{11}, "crashed"}}) {
+        Runner runner;
+        const RunResult result = runner.run(c.script);
+        EXPECT_EQ(result.ending, c.ending) << c.because;
+        EXPECT_EQ(result.cause, StopCause::None) << c.because;
+        EXPECT_EQ(runner.lines.output, std::vector<std::string>{"a"}) << c.because;
+        expectNoChildren();
+    }
+}
+
+TEST(ProcessRunner, SaysWhyAToolDidNotStart)
+{
+    Runner runner;
+    runner.request.command = {runner.workshop.path("nothing"), {}};
+    EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
+              Ending(NotStarted{ENOENT}));
+    runner.workshop.write("text", "no program");
+    std::filesystem::permissions(runner.workshop.path("text"), std::filesystem::perms::owner_all);
+    runner.request.command = {runner.workshop.path("text"), {}};
+    EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
+              Ending(NotStarted{ENOEXEC}));
+    expectNoChildren();
+}
+
+TEST(ProcessRunner, GivesTheToolNothingButItsOwn)
+{
+    ::setenv("E2FSCK_CONFIG", "/tmp/hostile", 1);
+    const FileDescriptor disk(::open("/dev/null", O_RDONLY | O_CLOEXEC));
+    const FileDescriptor leaked(::open("/dev/null", O_RDONLY));  // not closed on exec
+    Runner runner;
+    runner.request.disk = disk.get();
+    (void)runner.run("environment\ndescriptors\nprogress 1 2 3");
+    EXPECT_EQ(
+        runner.lines.output,
+        (std::vector<std::string>{"environment PATH=/usr/sbin:/usr/bin:/sbin:/bin",
+                                  "environment LC_ALL=C", "environment LANG=C", "descriptor 0",
+                                  "descriptor 1", "descriptor 2", "descriptor 3", "descriptor 4",
+                                  // the script that the fake tool reads
+                                  "descriptor 5"}));
+    EXPECT_EQ(runner.lines.progress, std::vector<std::string>{"1 2 3"});
+    ::unsetenv("E2FSCK_CONFIG");
+}
+
+TEST(ProcessRunner, EndsAToolThatWillNotStop)
+{
+    struct Case {
+        std::string_view script;
+        Ending ending;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{"say a\nwait", Killed{SIGINT}, "it heeds the first signal"},
+          Case{"ignore 2\nsay a\nwait", Killed{SIGTERM}, "it heeds the second"},
+          Case{"ignore 2\nignore 15\nsay a\nwait", Killed{SIGKILL}, "it heeds none"}}) {
+        Runner runner;
+        runner.lines.onLine = [&runner] {
+            runner.stop.press();
+        };
+        const RunResult result = runner.run(c.script);
+        EXPECT_EQ(result.ending, c.ending) << c.because;
+        EXPECT_EQ(result.cause, StopCause::User) << c.because;
+        expectNoChildren();
+    }
+}
+
+TEST(ProcessRunner, BoundsWhatAToolPrints)
+{
+    struct Case {
+        std::string_view script;
+        std::size_t lines;
+        std::string_view because;
+    };
+    for (const Case& c : {Case{"flood-lines", 1000, "lines without end"},
+                          Case{"flood-bytes", 1, "a line without end is one line, cut"}}) {
+        Runner runner;
+        runner.request.limits = {1000, 1U << 20U};
+        const RunResult result = runner.run(c.script);
+        EXPECT_EQ(result.cause, StopCause::TooMuchOutput) << c.because;
+        EXPECT_EQ(runner.lines.output.size(), c.lines) << c.because;
+        EXPECT_LE(runner.lines.output.back().size(), longestToolLine) << c.because;
+    }
+}
+
+TEST(ProcessRunner, LetsARepairRunOnUnheardBeforeItEndsIt)
+{
+    Runner runner;
+    runner.request.access = Access::ReadWrite;
+    runner.request.limits = {1000, 1U << 30U};
+    EXPECT_EQ(runner.run("flood-lines").cause, StopCause::TooMuchOutput);
+    EXPECT_EQ(runner.lines.output.size(), 1000U);
+    EXPECT_EQ(runner.lines.limits, 1) << "one sentence says so";
+}
+
+TEST(ProcessRunner, EndsASilentToolOnlyWhenAskedTo)
+{
+    Runner runner;
+    runner.request.silenceLimit = 50ms;
+    EXPECT_EQ(runner.run("say a\nwait").cause, StopCause::Silence);
+    runner.request.silenceLimit = 0ms;
+    EXPECT_EQ(runner.run("say a\nsleep 200\nexit 0").cause, StopCause::None);
+}
+
+TEST(ProcessRunner, IsNotHeldUpByWhatTheToolLeftBehind)
+{
+    Runner runner;
+    const auto before = std::chrono::steady_clock::now();
+    EXPECT_EQ(runner.run("hold-pipe\nsay a\nexit 0").ending, Ending(Exited{0}));
+    // The grandchild keeps the pipe open for five seconds.
+    EXPECT_LT(std::chrono::steady_clock::now() - before, 4s);
+    EXPECT_EQ(runner.lines.output, std::vector<std::string>{"a"});
+}
+
+TEST(ProcessRunner, DoesNotStartWhatIsAlreadyStopped)
+{
+    Runner runner;
+    runner.stop.press();
+    EXPECT_EQ(runner.run("say a").cause, StopCause::User);
+    EXPECT_TRUE(runner.lines.output.empty());
+}
+
+}  // namespace

@@ -1,0 +1,213 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/pellar/Workshop.h"
+
+#include "fixwell/host/foundation/Array.h"
+#include "pellar/process/ChildProcess.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <fstream>
+#include <stdexcept>
+
+namespace pellar::test {
+namespace {
+
+constexpr std::string_view systemPath = "/usr/sbin:/usr/bin:/sbin:/bin";
+
+/// Fails the test that cannot be prepared, loudly.
+void runProgram(std::string_view name, std::vector<std::string> arguments)
+{
+    const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
+    auto child =
+        ChildProcess::start({findProgram(name, systemPath), std::move(arguments)}, {sink.get()});
+    if (!std::holds_alternative<ChildProcess>(child) ||
+        std::get<ChildProcess>(child).reap() != Ending(Exited{0}))
+        throw std::runtime_error("cannot prepare the test: " + std::string(name) + " failed");
+}
+
+}  // namespace
+
+void TestLoop::performOnMainThread(Task task, Wait)
+{
+    const std::lock_guard guard(lock_);
+    tasks_.push_back(std::move(task));
+    arrived_.notify_one();
+}
+
+bool TestLoop::runUntil(const std::function<bool()>& isDone)
+{
+    const auto deadline = std::chrono::steady_clock::now() + std::chrono::minutes(1);
+    while (!isDone()) {
+        std::unique_lock guard(lock_);
+        if (!arrived_.wait_until(guard, deadline, [this] { return !tasks_.empty(); }))
+            return false;
+        const Task task = std::move(tasks_.front());
+        tasks_.pop_front();
+        guard.unlock();
+        task();
+    }
+    return true;
+}
+
+void TestLoop::drain()
+{
+    while (waiting() > 0) {
+        std::unique_lock guard(lock_);
+        const Task task = std::move(tasks_.front());
+        tasks_.pop_front();
+        guard.unlock();
+        task();
+    }
+}
+
+std::size_t TestLoop::waiting()
+{
+    const std::lock_guard guard(lock_);
+    return tasks_.size();
+}
+
+void Listener::plAsyncMessageForDisk(const fixwell::DiskReferencePointer&, std::string_view string,
+                                     const fixwell::Dictionary& dictionary)
+{
+    callsAfterFinished += finished > 0 ? 1 : 0;
+    if (!dictionary)
+        plainLines.emplace_back(string);
+    else if (dictionary.string(fixwell::kFsckMessageType) == fixwell::kFsckProgress.text())
+        progress.push_back(dictionary[fixwell::kFsckParameters].array().front().real());
+    else
+        dictionaries.push_back(dictionary);
+    if (onMessage)
+        onMessage();
+}
+
+void Listener::plAsyncFinishedForDisk(const fixwell::DiskReferencePointer&,
+                                      fixwell::ErrorCode mainError, fixwell::ErrorCode,
+                                      const fixwell::Dictionary& result)
+{
+    ++finished;
+    error = mainError;
+    verdict = result.string(fixwell::kPLVerdict);
+    message = result.string(fixwell::kPLMessage);
+    if (onFinished)
+        onFinished();
+}
+
+std::vector<std::string> Listener::textsOf(fixwell::Name type) const
+{
+    std::vector<std::string> texts;
+    for (const fixwell::Dictionary& dictionary : dictionaries)
+        if (dictionary.string(fixwell::kFsckMessageType) == type.text())
+            texts.emplace_back(dictionary.string(fixwell::kFsckMessageString));
+    return texts;
+}
+
+bool Listener::hasPlainLine(std::string_view part) const
+{
+    return std::any_of(plainLines.begin(), plainLines.end(), [part](const std::string& line) {
+        return line.find(part) != std::string::npos;
+    });
+}
+
+bool Listener::hasErrorWith(std::string_view part) const
+{
+    const auto errors = textsOf(fixwell::kFsckError);
+    return std::any_of(errors.begin(), errors.end(), [part](const std::string& line) {
+        return line.find(part) != std::string::npos;
+    });
+}
+
+Workshop::Workshop()
+{
+    std::string pattern = (std::filesystem::temp_directory_path() / "pellar-XXXXXX").string();
+    if (::mkdtemp(pattern.data()) == nullptr)
+        throw std::runtime_error("cannot make a directory for the test");
+    directory_ = pattern;
+}
+
+Workshop::~Workshop()
+{
+    std::error_code error;
+    std::filesystem::remove_all(directory_, error);
+}
+
+void Workshop::write(std::string_view name, std::string_view bytes) const
+{
+    std::ofstream(path(name), std::ios::binary) << bytes;
+}
+
+std::filesystem::path Workshop::makeExt(std::string_view name, std::uint64_t bytes,
+                                        std::vector<std::string> options) const
+{
+    write(name, {});
+    std::filesystem::resize_file(path(name), bytes);
+    options.insert(options.begin(), {"-q", "-F", "-t", "ext4"});
+    options.push_back(path(name));
+    runProgram("mke2fs", std::move(options));
+    return path(name);
+}
+
+void Workshop::damage(const std::filesystem::path& image, std::string command) const
+{
+    runProgram("debugfs", {"-w", "-R", std::move(command), image});
+}
+
+std::string Workshop::fakeTools(std::string_view script) const
+{
+    const std::filesystem::path tools = path("tools");
+    std::filesystem::create_directories(tools);
+    std::filesystem::copy_file(PELLAR_FAKE_TOOL, tools / "e2fsck",
+                               std::filesystem::copy_options::overwrite_existing);
+    std::ofstream(tools / "script") << script;
+    return tools;
+}
+
+fixwell::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,
+                                        std::string name)
+{
+    auto disk = std::make_shared<fixwell::DiskReference>();
+    disk->storage = fixwell::DiskReference::Storage::FileRegion;
+    disk->path = image;
+    std::error_code error;
+    disk->length = std::filesystem::file_size(image, error);
+    disk->identifier = image;
+    disk->filesystem = std::move(filesystem);
+    disk->name = std::move(name);
+    return disk;
+}
+
+Bench::Bench(ManagerOptions options)
+    : manager(loop, texts, [this, &options] {
+          options.commandTrace = [this](std::string_view line) {
+              traces.emplace_back(line);
+          };
+          return options;
+      }())
+{
+    manager.setDelegate(&listener);
+    tool = manager.makeRepairDisk();
+}
+
+fixwell::ErrorCode Bench::verify(const fixwell::DiskReferencePointer& disk)
+{
+    return finish(tool->beginStoragesystemFilesystemVerifyForDisk(disk));
+}
+
+fixwell::ErrorCode Bench::repair(const fixwell::DiskReferencePointer& disk)
+{
+    return finish(tool->beginStoragesystemFilesystemRepairForDisk(disk));
+}
+
+fixwell::ErrorCode Bench::finish(fixwell::ErrorCode begun)
+{
+    const int before = listener.finished;
+    if (begun != fixwell::kPLNoError)
+        return begun;
+    EXPECT_EQ(listener.finished, before) << "called back from inside the begin";
+    EXPECT_TRUE(loop.runUntil([&] { return listener.finished > before; })) << "never finished";
+    return begun;
+}
+
+}  // namespace pellar::test

@@ -1,0 +1,231 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "TemporaryDirectory.h"
+#include "orvane/support/disks/DiskController.h"
+#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/disks/MountTable.h"
+#include "orvane/support/disks/SystemDisks.h"
+#include "orvane/support/disks/UdevDatabase.h"
+#include "orvane/support/loop/Notifications.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace orvane {
+namespace {
+
+using test::TemporaryDirectory;
+namespace fs = std::filesystem;
+
+DiskTree tree(const std::string& identifier, std::vector<DiskTree> children = {})
+{
+    DiskTree made{{}, std::move(children)};
+    made.facts.identifier = identifier;
+    made.facts.displayName = identifier;
+    made.facts.type = made.children.empty() ? diskType::volume : diskType::whole;
+    return made;
+}
+
+/// A controller with an ear for what it posts.
+struct Host {
+    Host()
+    {
+        for (const fixwell::Name name :
+             {fixwell::OVDiskAppearedNotification, fixwell::OVDiskUnmountedNotification,
+              fixwell::OVDiskChangedNotification, fixwell::OVDiskEjectedNotification})
+            center.addObserver(this, name, [this](const fixwell::Notification& notification) {
+                heard += notification.name.text().substr(6, 2);
+                heard += ' ' + notification.object->description() + '\n';
+            });
+    }
+    std::string takeHeard() { return std::exchange(heard, {}); }
+
+    Notifications center;
+    std::string heard;
+    DiskController controller{center, {[](std::string_view) {
+                                  return FilesystemCapabilities();
+                              }}};
+};
+
+TEST(DiskController, TellsWhatHasHappenedToTheSystemsDisks)
+{
+    Host host;
+    host.controller.synchronize({tree("sda", {tree("sda1"), tree("sda2")})});
+    EXPECT_EQ(host.takeHeard(), "Ap sda\nAp sda1\nAp sda2\n");
+    const auto kept = host.controller.diskNamed("sda1");
+
+    DiskTree mounted = tree("sda1");
+    mounted.facts.mountPoint = "/mnt";
+    host.controller.synchronize({tree("sda", {mounted, tree("sda3")})});
+    EXPECT_EQ(host.takeHeard(), "Ej sda2\nCh sda1\nAp sda3\n");
+    EXPECT_EQ(host.controller.diskNamed("sda1"), kept) << "a known disk stays the same object";
+    EXPECT_EQ(kept->parentDisk()->diskIdentifier(), "sda");
+
+    host.controller.synchronize({tree("sda", {tree("sda1"), tree("sda3")})});
+    EXPECT_EQ(host.takeHeard(), "Un sda1\n");
+    host.controller.synchronize({});
+    EXPECT_EQ(host.takeHeard(), "Ej sda3\nEj sda1\nEj sda\n");
+    EXPECT_EQ(host.controller.diskWithIdentifier("sda1"), nullptr);
+}
+
+TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
+{
+    const auto record = [](int number) {
+        return fixwell::Dictionary::of({{fixwell::Name("n"), number}});
+    };
+    const auto disk = Disk::make(tree("sda", {tree("sda1"), tree("sda2")}), {});
+    const auto shown = [&] {
+        return fixwell::Value(disk->fsckHistory()).description();
+    };
+    disk->fsckHistoryNoChildren().append(record(1));
+    disk->parts()[1]->fsckHistoryNoChildren().append(record(3));
+    EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
+    EXPECT_TRUE(disk->fsckHistory().isSameAs(disk->fsckHistory())) << "put together once";
+    disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
+    EXPECT_EQ(shown(), "({n = 1}, {n = 2}, {n = 3})");
+    disk->parts()[0]->clearFsckHistory();
+    disk->parts()[0]->fsckHistoryNoChildren().append(record(4));
+    EXPECT_EQ(shown(), "({n = 1}, {n = 4}, {n = 3})") << "as many as before, but others";
+    EXPECT_TRUE(disk->clearFsckHistory());
+    EXPECT_FALSE(disk->clearFsckHistory()) << "nothing was left";
+}
+
+TEST(MountTable, ReadsWhatTheKernelWrites)
+{
+    const auto mounts = parseMountInfo(
+        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw\n"
+        "30 22 8:3 /sub /bind rw - ext4 /dev/sda3 rw\n"
+        "31 22 8:3 / /media/My\\040Disk\\134 ro,nosuid - ext4 /dev/sda3 rw\n"
+        "32 22 0:40 / /home rw master:2 shared:3 - btrfs /dev/sdb1 rw\n"
+        "nonsense\n33 22 8:4\n");
+    ASSERT_EQ(mounts.size(), 4U) << "lines that are no mounts are left out";
+    const auto media = mountOfDevice(mounts, "8:3", "/dev/sda3");
+    ASSERT_TRUE(media);
+    EXPECT_EQ(media->mountPoint, "/media/My Disk\\") << "the whole goes before a part of it";
+    EXPECT_TRUE(media->isReadOnly);
+    EXPECT_EQ(mountOfDevice(mounts, "8:17", "/dev/sdb1")->mountPoint, "/home")
+        << "several devices, one number of its own";
+    EXPECT_FALSE(mountOfDevice(mounts, "8:9", "/dev/sda9"));
+    EXPECT_EQ(mountHolding(mounts, "/home/me")->device, "0:40");
+    EXPECT_EQ(mountHolding(mounts, "/homes")->device, "8:2");
+}
+
+TEST(UdevDatabase, HostileLabelsAreDecodedAndOddLinesSkipped)
+{
+    auto properties = parseUdevProperties("S:disk/by-id\nE:ID_FS_TYPE=ext4\nE:NOVALUE\nE:A=b=c\n");
+    EXPECT_EQ(properties["ID_FS_TYPE"], "ext4");
+    EXPECT_EQ(properties["A"], "b=c");
+    EXPECT_EQ(decodeUdevName("a\\x20b\\x1b\\x"), "a b\x1b\\x");
+}
+
+TEST(SystemDisks, ReadsAMachineMadeOfFiles)
+{
+    const TemporaryDirectory machine;
+    const auto device = [&](const std::string& name, const char* number, const char* size) {
+        test::write(machine.path / "sys" / name / "dev", std::string(number) + "\n");
+        test::write(machine.path / "sys" / name / "size", std::string(size) + "\n");
+    };
+    device("sda", "8:0", "2048");
+    device("sda/sda1", "8:1", "1024");
+    device("sda/sda10", "8:10", "2");
+    device("sda/sda2", "8:2", "1024");
+    for (const char* const number : {"1", "2", "10"})
+        test::write(machine.path / "sys/sda" / ("sda" + std::string(number)) / "partition", number);
+    test::write(machine / "sys/sda/device/model", "Model \x1b[1m X  \n");
+    device("loop0", "7:0", "0");
+    device("zram0", "252:0", "4096");
+    device("sdb", "8:16", "4096");
+    device("sdc", "8:32", "4096");
+    test::write(machine / "udev/b8:1",
+                "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=ext4\nE:ID_FS_UUID=u-1\n"
+                "E:ID_FS_LABEL_ENC=My\\x20Disk\n");
+    test::write(machine / "udev/b8:16", "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=vfat\n");
+
+    DiskSources sources{machine / "sys", machine / "dev", machine / "udev",
+                        parseMountInfo("22 1 8:1 / / rw - ext4 /dev/sda1 rw\n"
+                                       "23 22 8:32 / /mnt rw - xfs /dev/sdc rw\n"),
+                        "/root"};
+    const auto disks = readSystemDisks(sources);
+    ASSERT_EQ(disks.size(), 3U) << "no memory, no unused loop device";
+    EXPECT_EQ(disks[0].facts.displayName, "Model \x1b[1m X") << "bytes as they are";
+    EXPECT_TRUE(disks[0].facts.isWhole);
+    ASSERT_EQ(disks[0].children.size(), 3U);
+    const DiskFacts& root = disks[0].children[0].facts;
+    EXPECT_EQ(root.displayName, "My Disk") << "from udev, as the device cannot be read";
+    EXPECT_TRUE(root.isBootVolume && root.containsUserHome && root.isShown);
+    EXPECT_EQ(disks[0].children[1].facts.number, 2) << "2 before 10";
+    EXPECT_EQ(disks[0].children[2].facts.type, diskType::container);
+    EXPECT_EQ(disks[1].facts.type, diskType::bareVolume);
+    EXPECT_FALSE(disks[1].facts.isWhole);
+    EXPECT_EQ(disks[2].facts.type, diskType::bareVolume) << "it is mounted, so it is a volume";
+    EXPECT_EQ(disks[2].facts.filesystem, "xfs");
+}
+
+TEST(DiskLookup, ABadNameGetsOneClearSentence)
+{
+    const TemporaryDirectory directory;
+    test::write(directory / "empty.img", "");
+    test::write(directory / "secret.img", "x");
+    fs::permissions(directory / "secret.img", fs::perms::none);
+    ASSERT_EQ(::mkfifo((directory / "fifo").c_str(), 0600), 0);
+    const std::string path = directory.path.native() + "/";
+
+    struct Case {
+        std::string name;
+        std::string reason;
+    };
+    for (const Case& c :
+         {Case{"", "it has no name"}, Case{path + "missing.img", "No such file or directory"},
+          Case{path + "empty.img", "the file is empty"},
+          Case{path + "secret.img", "Permission denied"},
+          Case{path + "fifo", "it is neither a disk nor a disk image"},
+          Case{"/dev/null", "it is neither a disk nor a disk image"},
+          Case{directory.path, "this directory is no mount point"},
+          Case{"/proc", "no disk is mounted on this directory"},
+          Case{"LABEL=", "no disk has this label"}, Case{"UUID=1234", "no disk has this UUID"}}) {
+        if (c.reason == "Permission denied" && ::geteuid() == 0)
+            continue;  // root may read everything
+        Host host;
+        const Translator translator;
+        const auto found = DiskLookup(host.controller, translator).find(c.name);
+        ASSERT_TRUE(failed(found)) << c.name;
+        EXPECT_EQ(failureMessage(found), "cannot check ‘" + c.name + "’: " + c.reason);
+        EXPECT_EQ(host.takeHeard(), "") << "nothing became known";
+    }
+}
+
+TEST(DiskLookup, FindsByEveryKindOfName)
+{
+    const TemporaryDirectory directory;
+    test::write(directory / "a.img", "contents");
+    fs::create_symlink("a.img", directory / "link");
+    Host host;
+    DiskTree volume = tree("/dev/x1");
+    volume.facts.label = "Hostile \x1b[2J %s";
+    volume.facts.uuid = "u-1";
+    volume.facts.mountPoint = directory.path;
+    DiskTree twin = tree("/dev/x2");
+    twin.facts.uuid = "u-2";
+    DiskTree other = tree("/dev/x3");
+    other.facts.uuid = "u-2";
+    host.controller.synchronize({volume, twin, other});
+    const Translator translator;
+    DiskLookup lookup(host.controller, translator);
+    for (const std::string& name : {std::string("/dev/x1"), std::string("LABEL=Hostile \x1b[2J %s"),
+                                    std::string("UUID=u-1"), directory.path.native()}) {
+        const auto found = lookup.find(name);
+        ASSERT_FALSE(failed(found)) << failureMessage(found);
+        EXPECT_EQ(std::get<std::shared_ptr<Disk>>(found)->diskIdentifier(), "/dev/x1");
+    }
+    EXPECT_TRUE(failed(lookup.find("UUID=u-2"))) << "two have it: not a guess";
+
+    const auto image = lookup.find((directory / "link").native());
+    ASSERT_FALSE(failed(image));
+    const auto disk = std::get<std::shared_ptr<Disk>>(image);
+    EXPECT_EQ(disk->diskIdentifier(), (directory / "a.img").native());
+    EXPECT_TRUE(disk->isOfflineDiskImage());
+    EXPECT_EQ(std::get<std::shared_ptr<Disk>>(lookup.find((directory / "a.img").native())), disk);
+}
+
+}  // namespace
+}  // namespace orvane

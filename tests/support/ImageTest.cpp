@@ -1,0 +1,193 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "TemporaryDirectory.h"
+#include "ToolRun.h"
+#include "orvane/support/disks/DiskController.h"
+#include "orvane/support/images/ImageAttacher.h"
+#include "orvane/support/images/ImageContents.h"
+#include "orvane/support/images/ImageDisks.h"
+#include "orvane/support/loop/Notifications.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+
+namespace orvane {
+namespace {
+
+using test::runTool;
+using test::TemporaryDirectory;
+namespace fs = std::filesystem;
+
+constexpr std::uint64_t mebibyte = 1U << 20U;
+
+fs::path makeImage(const TemporaryDirectory& directory, std::uint64_t bytes)
+{
+    const fs::path image = directory / "disk.img";
+    test::write(image, "");
+    fs::resize_file(image, bytes);
+    return image;
+}
+
+void put(const fs::path& image, std::uint64_t offset, std::string_view bytes)
+{
+    std::fstream file(image, std::ios::in | std::ios::out | std::ios::binary);
+    file.seekp(static_cast<std::streamoff>(offset));
+    file.write(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+}
+
+int makeExt(const fs::path& image, std::uint64_t offset, std::uint64_t bytes,
+            const std::string& label)
+{
+    return runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label, "-E",
+                    "offset=" + std::to_string(offset), image.native(),
+                    std::to_string(bytes / 1024) + "k"});
+}
+
+DiskTree disksIn(const fs::path& image)
+{
+    const auto opened = openImage(image, Translator());
+    if (failed(opened)) {
+        ADD_FAILURE() << failureMessage(opened);
+        return {};
+    }
+    const auto& open = std::get<OpenImage>(opened);
+    return disksOfImage(open, readContents(open));
+}
+
+std::string outline(const DiskTree& tree)
+{
+    const DiskFacts& facts = tree.facts;
+    std::string text = std::to_string(facts.number) + ":type" + std::to_string(facts.type) + ":" +
+                       facts.filesystem + (facts.isShown ? "" : ":hidden");
+    for (const DiskTree& child : tree.children)
+        text += " " + outline(child);
+    return text;
+}
+
+TEST(ImageDisks, ABareFileSystemIsOneVolume)
+{
+    const TemporaryDirectory directory;
+    const fs::path image = makeImage(directory, 8 * mebibyte);
+    ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "B\x1b[31m\xff%s"), 0) << "mke2fs is needed";
+    const DiskTree disk = disksIn(image);
+    EXPECT_EQ(outline(disk), "0:type6:ext4");
+    EXPECT_EQ(disk.facts.displayName, "B\x1b[31m\xff%s") << "a label is any bytes";
+    EXPECT_EQ(disk.facts.length, 8 * mebibyte);
+    EXPECT_FALSE(disk.facts.isWhole);
+    EXPECT_FALSE(disk.facts.uuid.empty());
+}
+
+TEST(ImageDisks, UnknownContentsAreStillAVolume)
+{
+    const TemporaryDirectory directory;
+    EXPECT_EQ(outline(disksIn(makeImage(directory, 100))), "0:type6:");
+}
+
+TEST(ImageDisks, AVolumeWhoseSuperblockIsGoneIsKnownByItsBackup)
+{
+    const TemporaryDirectory directory;
+    const fs::path image = makeImage(directory, 32 * mebibyte);
+    ASSERT_EQ(makeExt(image, 0, 32 * mebibyte, "X"), 0) << "mke2fs is needed";
+    put(image, 1024, std::string(1024, '\0'));
+    EXPECT_EQ(outline(disksIn(image)), "0:type6:ext4");
+}
+
+TEST(ImageDisks, PartitionsOfAGPT)
+{
+    const TemporaryDirectory directory;
+    const fs::path image = makeImage(directory, 64 * mebibyte);
+    ASSERT_EQ(runTool({"sfdisk", "-q", image.native()},
+                      "label: gpt\n"
+                      "start=2048, size=32768, type=linux\n"
+                      "size=16384, type=swap\n"
+                      "size=16384, type=linux\n"
+                      "size=16384, type=E6D6D379-F507-44C2-A23C-238F2A3DF928\n"),
+              0)
+        << "sfdisk is needed";
+    ASSERT_EQ(makeExt(image, mebibyte, 16 * mebibyte, ""), 0);
+    const DiskTree disk = disksIn(image);
+    EXPECT_EQ(outline(disk), "0:type1: 1:type3:ext4 2:type3::hidden 3:type3: 4:type3::hidden")
+        << "a Linux partition without a file system may be a damaged one";
+    ASSERT_EQ(disk.children.size(), 4U);
+    EXPECT_EQ(disk.children[0].facts.offset, mebibyte);
+    EXPECT_EQ(disk.children[0].facts.length, 16 * mebibyte);
+    EXPECT_EQ(disk.children[0].facts.displayName, "disk.img#1");
+    EXPECT_EQ(disk.children[0].facts.identifier, image.native() + "#1");
+
+    fs::resize_file(image, 20 * mebibyte);
+    EXPECT_TRUE(disksIn(image).facts.isWhole) << "cut short, it is still a partitioned disk";
+    put(image, 512, std::string(512, 'x'));
+    EXPECT_TRUE(disksIn(image).facts.isWhole) << "and with a destroyed header, too";
+}
+
+TEST(ImageDisks, LogicalPartitionsOfAnMBRAndOneBeyondTheEnd)
+{
+    const TemporaryDirectory directory;
+    const fs::path image = makeImage(directory, 64 * mebibyte);
+    ASSERT_EQ(runTool({"sfdisk", "-q", image.native()},
+                      "label: dos\n"
+                      "start=2048, size=16384, type=83\n"
+                      "start=20480, size=65536, type=5\n"
+                      "start=22528, size=16384, type=83\n"
+                      "start=43008, size=16384, type=82\n"),
+              0)
+        << "sfdisk is needed";
+    const std::string expected = "0:type1: 1:type3: 2:type2::hidden 5:type3:";
+    EXPECT_EQ(outline(disksIn(image)).substr(0, expected.size()), expected)
+        << "the extended partition is a container";
+    fs::resize_file(image, 15 * mebibyte);
+    const DiskTree cut = disksIn(image);
+    ASSERT_GE(cut.children.size(), 3U);
+    EXPECT_EQ(cut.children[2].facts.length, 8 * mebibyte) << "what the map states, to be reported";
+}
+
+TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
+{
+    const TemporaryDirectory directory;
+    const fs::path image = makeImage(directory, 8 * mebibyte);
+    ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "Data"), 0) << "mke2fs is needed";
+    Notifications center;
+    DiskController controller(center, {});
+    const auto offline =
+        controller.addImage(factsOfImage(std::get<OpenImage>(openImage(image, Translator()))));
+    ImageAttacher attacher({}, Translator());
+    fixwell::Dictionary result;
+    fixwell::OVDiskPointer top;
+    std::thread worker([&] {
+        ASSERT_EQ(attacher.AttachImageWithURL(image, result), 0);
+        top = attacher.TopLevelPLDiskForImageDict(result);
+    });
+    worker.join();
+    ASSERT_NE(top, nullptr);
+    EXPECT_EQ(controller.diskWithIdentifier(top->diskIdentifier()), nullptr) << "not known yet";
+    ASSERT_EQ(controller.viewablePartitions(top).size(), 1U);
+    EXPECT_EQ(controller.diskWithKRDisk(top->theKRDisk()), top) << "known once it was asked for";
+
+    top->fsckHistoryNoChildren().append(fixwell::Dictionary::make());
+    controller.ejectDisk(top, true);
+    EXPECT_EQ(controller.diskWithIdentifier(top->diskIdentifier()), nullptr);
+    EXPECT_EQ(offline->fsckHistory().size(), 1U) << "the image still shows what was found in it";
+}
+
+TEST(ImageAttacher, FailuresAreCodesWithASentence)
+{
+    const TemporaryDirectory directory;
+    test::write(directory / "x\x1b.img", "");
+    ASSERT_EQ(::mkfifo((directory / "fifo").c_str(), 0600), 0);
+    ImageAttacher attacher({}, Translator());
+    struct Case {
+        const char* name;
+        const char* sentence;
+    };
+    for (const Case& c : {Case{"x\x1b.img", "cannot attach ‘x\uFFFD.img’: the file is empty"},
+                          Case{"none", "cannot attach ‘none’: No such file or directory"},
+                          Case{"fifo", "cannot attach ‘fifo’: it is not a regular file"}}) {
+        fixwell::Dictionary result;
+        EXPECT_EQ(attacher.AttachImageWithURL(directory / c.name, result),
+                  fixwell::kPLErrorCannotOpen);
+        EXPECT_EQ(attacher.lastError(directory / c.name), c.sentence);
+        EXPECT_EQ(attacher.TopLevelPLDiskForImageDict(result), nullptr);
+    }
+}
+
+}  // namespace
+}  // namespace orvane

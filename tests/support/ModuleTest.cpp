@@ -1,0 +1,94 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "TemporaryDirectory.h"
+#include "orvane/support/modules/ModuleLoader.h"
+#include "orvane/support/modules/ModuleSearch.h"
+
+#include <gtest/gtest.h>
+
+namespace orvane {
+namespace {
+
+using test::TemporaryDirectory;
+namespace fs = std::filesystem;
+
+fs::path makeBundle(const TemporaryDirectory& directory, const char* library)
+{
+    const fs::path bundle = directory / "Test.ovmodule";
+    test::write(bundle / "module.json", R"({"name": "Test", "library": "test.so"})");
+    fs::copy_file(library, bundle / "test.so");
+    for (const fs::path& path : {bundle, bundle / "test.so"})
+        fs::permissions(path, fs::perms::owner_all);
+    return bundle;
+}
+
+TEST(ModuleLoader, LoadsAModuleOfTheSameContract)
+{
+    const TemporaryDirectory directory;
+    makeBundle(directory, TEST_MODULE_RIGHT);
+    const auto bundles = findModuleBundles({directory / "missing", directory.path});
+    ASSERT_EQ(bundles.size(), 1U);
+    const auto loaded = loadModule(bundles.front());
+    ASSERT_FALSE(failed(loaded)) << failureMessage(loaded);
+    EXPECT_EQ(std::get<LoadedModule>(loaded).name, "Test");
+    EXPECT_NE(std::get<LoadedModule>(loaded).entry->make, nullptr);
+}
+
+TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
+{
+    using Change = void (*)(const fs::path& bundle);
+    struct Case {
+        const char* library;
+        Change change;
+        const char* sentence;
+    };
+    const auto nothing = [](const fs::path&) {
+    };
+    for (const Case& c :
+         {Case{TEST_MODULE_WRONG, nothing,
+               "version 42 of the module contract, and this program has version 1"},
+          Case{TEST_MODULE_NO_ENTRY, nothing, "OVModuleEntry"},
+          Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::resize_file(b / "test.so", 100); },
+               "cannot read file data"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) {
+                   fs::permissions(b / "test.so", fs::perms::others_write, fs::perm_options::add);
+               },
+               "other users may change it"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) {
+                   fs::permissions(b, fs::perms::others_write, fs::perm_options::add);
+               },
+               "other users may change it"},
+          Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::remove(b / "module.json"); },
+               "module.json: No such file"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) {
+                   test::write(b / "module.json", R"({"name":"T","library":"../../evil.so"})");
+               },
+               "no library inside the bundle"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) { test::write(b / "module.json", R"({"name": 3)"); },
+               "does not name the module"}}) {
+        const TemporaryDirectory directory;
+        const fs::path bundle = makeBundle(directory, c.library);
+        c.change(bundle);
+        const auto loaded = loadModule(bundle);
+        ASSERT_TRUE(failed(loaded)) << c.sentence;
+        EXPECT_NE(failureMessage(loaded).find(c.sentence), std::string::npos)
+            << failureMessage(loaded);
+        EXPECT_NE(failureMessage(loaded).find("Test.ovmodule"), std::string::npos)
+            << "names the object";
+    }
+}
+
+TEST(ModuleSearch, WhereModulesAreLookedFor)
+{
+    const auto directories = moduleDirectories(
+        [](const char*) { return std::optional<std::string>("/a:relative::/b"); }, "/opt/bin/tool");
+    const std::vector<fs::path> expected{"/a", "/b", "/opt/lib/orvane/modules", "/opt/modules",
+                                         "/usr/lib/orvane/modules"};
+    EXPECT_EQ(directories, expected);
+}
+
+}  // namespace
+}  // namespace orvane
