@@ -1,0 +1,71 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/module/OVFXW.h"
+#include "orvane/terminal/TerminalHost.h"
+#include "orvane/terminal/TerminalWindow.h"
+
+#include <filesystem>
+#include <memory>
+
+namespace orvane::bench {
+
+/// Says nothing: what is measured ends before a reporter would begin.
+class SilentReporter final : public Reporter {
+    void started(const std::string&, std::string_view, const std::string&) override {}
+    void record(const std::string&, const fixwell::Dictionary&, const fixwell::StyledText&) override
+    {
+    }
+    void progress(const std::string&, std::optional<double>, const std::string&) override {}
+    void finished(const std::string&, std::string_view, fixwell::ErrorCode,
+                  std::string_view) override
+    {
+    }
+    void report(const std::string&, const fixwell::Dictionary&) override {}
+    void alert(const std::string&, const std::string&) override {}
+    void failure(const std::string&, const std::string&) override {}
+    void warning(const std::string&) override {}
+    void listed(const DiskLine&) override {}
+    void runs(const std::string&, const std::vector<RunLine>&) override {}
+};
+
+/// The real host of the terminal program with the real module in it, and a library whose one job
+/// never ends: a benchmark says what the tool says.
+class BenchHost final : public fixwell::ModuleSite, public fixwell::PLManager {
+public:
+    /// Logs and histories go below `state`.
+    explicit BenchHost(const std::filesystem::path& state);
+    ~BenchHost() override;
+
+    fixwell::OVFXW& module() { return *module_; }
+    fixwell::OutlineViewDelegate& rows() { return *module_; }
+    const fixwell::DiskReferencePointer& reference() const { return reference_; }
+    Disk& disk() { return *disk_; }
+    TerminalHost& host() { return host_; }
+    void selectDisk();
+    void showDetails(bool shows);
+
+private:
+    bool isActiveTab() const override { return true; }
+    fixwell::OVWindowController& windowController() override { return window_; }
+    fixwell::OVDiskPointer workingDisk() const override { return nullptr; }
+    fixwell::Window& window() override { return window_; }
+    fixwell::Bundle& bundle() override { return bundle_; }
+    fixwell::PLManager& pl() override { return *this; }
+    void setDelegate(fixwell::PLAsyncDelegate*) override {}
+    std::unique_ptr<fixwell::PLRepairDisk> makeRepairDisk() override;
+
+    SilentReporter reporter_;
+    MainLoop loop_;
+    TerminalWindow window_;
+    LogView logView_;
+    Interface interface_;
+    TerminalAlerts alerts_;
+    ModuleBundle bundle_;
+    TerminalHost host_;
+    std::shared_ptr<Disk> disk_;
+    fixwell::DiskReferencePointer reference_;
+    std::unique_ptr<fixwell::OVFXW> module_;
+};
+
+}  // namespace orvane::bench
