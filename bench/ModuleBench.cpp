@@ -156,6 +156,7 @@ void openHistory(benchmark::State& state)
     std::filesystem::remove_all(scratch / "state");
     BenchHost host(scratch / "state");
     host.disk().setFsckHistory(makeHistory(static_cast<std::size_t>(state.range(0))));
+    host.selectDisk();
     for (auto iteration : state) {
         state.PauseTiming();
         host.showDetails(true);

@@ -176,6 +176,14 @@ private:
                                  bool wasMounted);
     bool canVerifyPartitionMap(const OVDiskPointer& disk);
     bool canRepairPartitionMap(const OVDiskPointer& disk);
+    /// A plain line of a tool's output as the log takes it.
+    struct TextLine {
+        std::string_view text;
+        Value type;  ///< none for a line that says nothing by itself
+        std::int64_t level;
+        bool addsLineFeed;
+    };
+    TextLine classifiedLine(std::string_view line);
     void addTextLine(const OVDiskPointer& disk, std::string_view line);
     bool noteFirstProgress(float percent);
     float rescaledForKestron(float percent);

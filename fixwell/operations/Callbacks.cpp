@@ -47,35 +47,28 @@ void OVFXW::plAsyncMessageForDisk(const DiskReferencePointer& reference, std::st
 
 // The tool's own lines end in a line feed; one is added only where a line was cut or is not
 // classified, so that a marked error keeps its line break.
+OVFXW::TextLine OVFXW::classifiedLine(std::string_view line)
+{
+    if (!isDiskAction(action))
+        return {line, {}, verbosity::fine, true};
+    if (scanForSpecialChars(line))
+        return {removeSpecialChars(line), kFsckError, verbosity::main, true};
+    switch (scanForType(line)) {
+        case FXWLineFailure: return {line, kFsckError, verbosity::main, true};
+        case FXWLineRepairing: return {line, kFsckRepair, verbosity::main, false};
+        case FXWLineSuccess: return {line, kFsckSuccess, verbosity::main, false};
+        default: return {line, {}, verbosity::fine, false};
+    }
+}
+
 void OVFXW::addTextLine(const OVDiskPointer& disk, std::string_view line)
 {
-    const Dictionary record = Dictionary::of({{kOV_typeOfOutputKey, kOV_typeOfOutput_string}});
-    const auto describe = [&record](std::optional<Name> type, std::int64_t level) {
-        if (type)
-            record.set(kFsckMessageType, *type);
-        record.set(kFsckVerbosity, level);
-    };
-    bool addsLineFeed = false;
-    if (!isDiskAction(action)) {
-        describe(std::nullopt, verbosity::fine);
-        addsLineFeed = true;
-    } else if (scanForSpecialChars(line)) {
-        line = removeSpecialChars(line);
-        describe(kFsckError, verbosity::main);
-        addsLineFeed = true;
-    } else {
-        switch (scanForType(line)) {
-            case FXWLineFailure:
-                describe(kFsckError, verbosity::main);
-                addsLineFeed = true;
-                break;
-            case FXWLineRepairing: describe(kFsckRepair, verbosity::main); break;
-            case FXWLineSuccess: describe(kFsckSuccess, verbosity::main); break;
-            default: describe(std::nullopt, verbosity::fine); break;
-        }
-    }
-    const StyledText text = attributedStringForContext(record, line);
-    if (addsLineFeed)
+    const TextLine classified = classifiedLine(line);
+    const Dictionary record = Dictionary::of({{kOV_typeOfOutputKey, kOV_typeOfOutput_string},
+                                              {kFsckMessageType, classified.type},
+                                              {kFsckVerbosity, classified.level}});
+    const StyledText text = attributedStringForContext(record, classified.text);
+    if (classified.addsLineFeed)
         text.append("\n");
     record.set(kOV_finalAttributedString_type, text);
     const Array history = disk->fsckHistoryNoChildren();

@@ -52,7 +52,8 @@ Dictionary Dictionary::of(std::initializer_list<Entry> entries)
 {
     const Dictionary dictionary = make();
     for (const Entry& entry : entries)
-        dictionary.set(entry.key, entry.value);
+        if (entry.value)
+            dictionary.storage()->append(entry.key, entry.value);
     return dictionary;
 }
 
@@ -73,6 +74,10 @@ std::span<const Dictionary::Entry> Dictionary::entries() const noexcept
 
 const Dictionary::Entry* Dictionary::find(Name key) const noexcept
 {
+    // Most keys come from the table that the entries' keys come from: addresses tell.
+    for (const Entry& entry : entries())
+        if (entry.key.isSameNode(key))
+            return &entry;
     for (const Entry& entry : entries())
         if (entry.key == key)
             return &entry;

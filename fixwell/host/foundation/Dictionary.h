@@ -25,6 +25,7 @@ public:
 
     Dictionary() noexcept = default;
     static Dictionary make();
+    /// The keys must be different ones; entries without a value are left out.
     static Dictionary of(std::initializer_list<Entry> entries);
     /// A new dictionary with the same entries; the values are shared.
     Dictionary mutableCopy() const;

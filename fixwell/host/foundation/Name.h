@@ -22,6 +22,8 @@ public:
 
     std::string_view text() const noexcept;
 
+    /// Equal for certain; names from two tables may be equal all the same.
+    bool isSameNode(Name other) const noexcept { return node_ == other.node_; }
     friend bool operator==(Name a, Name b) noexcept { return a.node_ == b.node_ || sameText(a, b); }
 
 private:

@@ -120,6 +120,7 @@ void DiskController::appear(const std::shared_ptr<Disk>& disk)
 void DiskController::forget(const std::shared_ptr<Disk>& root)
 {
     std::erase(roots_, root);
+    forgetAsked();
     auto gone = withParts(root);
     std::reverse(gone.begin(), gone.end());
     for (const auto& disk : gone)
@@ -128,6 +129,7 @@ void DiskController::forget(const std::shared_ptr<Disk>& root)
 
 void DiskController::synchronize(const std::vector<DiskTree>& systemDisks)
 {
+    forgetAsked();
     const auto previous = roots_;
     for (const auto& root : previous) {
         const bool isThere =
@@ -185,16 +187,35 @@ OVDiskPointer DiskController::diskWithIdentifier(std::string_view identifier)
     return diskNamed(identifier);
 }
 
+std::shared_ptr<Disk> DiskController::diskReferredTo(
+    const fixwell::DiskReferencePointer& reference)
+{
+    if (!reference)
+        return nullptr;
+    if (reference != askedReference_) {
+        asked_ = diskNamed(reference->identifier);
+        askedReference_ = asked_ ? reference : nullptr;
+    }
+    return asked_;
+}
+
+void DiskController::forgetAsked()
+{
+    asked_.reset();
+    askedReference_.reset();
+}
+
 OVDiskPointer DiskController::diskWithKRDisk(const fixwell::DiskReferencePointer& disk)
 {
-    return disk ? diskNamed(disk->identifier) : nullptr;
+    return diskReferredTo(disk);
 }
 
 OVDiskPointer DiskController::findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk)
 {
     if (!disk)
         return nullptr;
-    return add(factsOf(*disk));
+    const auto known = diskReferredTo(disk);
+    return known ? known : add(factsOf(*disk));
 }
 
 std::vector<OVDiskPointer> DiskController::viewablePartitions(const OVDiskPointer& disk)

@@ -61,6 +61,8 @@ public:
 private:
     std::shared_ptr<Disk> add(const DiskFacts& facts);
     void post(fixwell::Name name, const std::shared_ptr<Disk>& disk);
+    std::shared_ptr<Disk> diskReferredTo(const fixwell::DiskReferencePointer& reference);
+    void forgetAsked();
     void appear(const std::shared_ptr<Disk>& disk);
     void forget(const std::shared_ptr<Disk>& root);
     void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
@@ -70,6 +72,10 @@ private:
     Disk::Surroundings surroundings_;
     Hooks hooks_;
     std::vector<std::shared_ptr<Disk>> roots_;
+
+    // The disk of the job at hand: the library asks for it with every line of output.
+    std::shared_ptr<Disk> asked_;
+    fixwell::DiskReferencePointer askedReference_;
 };
 
 /// The disk and everything below it, each before its children.
