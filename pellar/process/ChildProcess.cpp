@@ -28,6 +28,7 @@ struct Preparation {
     std::string name;  ///< as a tool calls itself in its messages
     std::string executable;
     pid_t parent = 0;
+    Access access = Access::ReadOnly;
 };
 
 /// Above the numbers that the child hands out, so no duplication overwrites another.
@@ -50,6 +51,7 @@ Preparation prepare(const Command& command, const ChildStreams& streams, int fai
     ready.executable = command.executable.string();
     ready.name = command.executable.filename().string();
     ready.parent = ::getpid();
+    ready.access = streams.access;
     return ready;
 }
 
@@ -90,9 +92,12 @@ bool place(const FileDescriptor& source, int number)
     static constexpr std::array environment{"PATH=/usr/sbin:/usr/bin:/sbin:/bin", "LC_ALL=C",
                                             "LANG=C", static_cast<const char*>(nullptr)};
     ::setpgid(0, 0);
-    ::prctl(PR_SET_PDEATHSIG, SIGKILL);
+    const bool writes = ready.access == Access::ReadWrite;
+    ::prctl(PR_SET_PDEATHSIG, writes ? SIGTERM : SIGKILL);
     const bool isOrphan = ::getppid() != ready.parent;  // it died before the line above
     resetSignals();
+    if (writes)
+        ::signal(SIGPIPE, SIG_IGN);
     const bool isPlaced = place(ready.input, STDIN_FILENO) && place(ready.output, STDOUT_FILENO) &&
                           place(ready.output, STDERR_FILENO) &&
                           place(ready.disk, diskDescriptorOfTool) &&

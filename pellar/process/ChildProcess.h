@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/process/Access.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/Ending.h"
 #include "pellar/process/FileDescriptor.h"
@@ -20,6 +21,9 @@ struct ChildStreams {
     int output = -1;    ///< standard output and standard error
     int disk = -1;      ///< becomes diskDescriptorOfTool
     int progress = -1;  ///< becomes progressDescriptorOfTool
+    /// A program that writes to a disk is asked to end when the host dies, and may go on printing
+    /// to nobody until it has come to a good place; any other is killed.
+    Access access = Access::ReadOnly;
 };
 
 /// A running program, or one that has ended and was not reaped yet. Destroying it kills and
@@ -27,8 +31,9 @@ struct ChildStreams {
 ///
 /// The program runs in a process group of its own, reads /dev/null, has a fixed PATH, the C
 /// locale and nothing else of our environment, and no other descriptor than those of
-/// ChildStreams. It is killed when the thread that started it ends (PR_SET_PDEATHSIG, prctl(2)),
-/// so it never outlives the host; that thread therefore stays until the program has ended.
+/// ChildStreams. It is signalled when the thread that started it ends (PR_SET_PDEATHSIG,
+/// prctl(2)), so it does not outlive the host; that thread therefore stays until the program has
+/// ended.
 class ChildProcess {
 public:
     [[nodiscard]] static std::variant<ChildProcess, NotStarted> start(const Command& command,

@@ -201,8 +201,8 @@ RunResult runTool(const RunRequest& request, StopSwitch& stop, RunListener& list
     std::optional<Pipe> progress = makePipe();
     if (!output || !progress)
         return {NotStarted{errno}};
-    auto started = ChildProcess::start(
-        request.command, {output->writeEnd.get(), request.disk, progress->writeEnd.get()});
+    auto started = ChildProcess::start(request.command, {output->writeEnd.get(), request.disk,
+                                                         progress->writeEnd.get(), request.access});
     if (const auto* const failure = std::get_if<NotStarted>(&started))
         return {*failure};
     Run run(request, stop, listener, std::move(std::get<ChildProcess>(started)), std::move(*output),
