@@ -206,8 +206,8 @@ TEST(RealE2fsck, StopsWhenAsked)
 {
     const test::Workshop workshop;
     const auto image = workshop.makeExt(
-        "disk", 3ULL << 30U,
-        {"-O", "^metadata_csum,^uninit_bg", "-N", "600000", "-E", "lazy_itable_init=0"});
+        "disk", 24ULL << 30U,
+        {"-O", "^metadata_csum,^uninit_bg", "-N", "6000000", "-E", "lazy_itable_init=0"});
     test::Bench bench;
     bench.listener.onMessage = [&bench] {
         if (bench.listener.hasPlainLine("e2fsck 1"))
