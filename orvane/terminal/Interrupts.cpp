@@ -27,23 +27,21 @@ Interrupts::Interrupts(MainLoop& loop, std::function<void()> interrupted)
     std::signal(SIGPIPE, SIG_IGN);
     const sigset_t signals = endingSignals();
     ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
-    descriptor_ = ::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK);
-    if (descriptor_ >= 0)
-        loop_.watch(descriptor_, POLLIN, [this](short) { take(); });
+    descriptor_ = FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
+    if (descriptor_)
+        loop_.watch(descriptor_.get(), POLLIN, [this](short) { take(); });
 }
 
 Interrupts::~Interrupts()
 {
-    if (descriptor_ < 0)
-        return;
-    loop_.unwatch(descriptor_);
-    ::close(descriptor_);
+    if (descriptor_)
+        loop_.unwatch(descriptor_.get());
 }
 
 void Interrupts::take()
 {
     signalfd_siginfo information{};
-    while (::read(descriptor_, &information, sizeof information) == sizeof information)
+    while (::read(descriptor_.get(), &information, sizeof information) == sizeof information)
         interrupted_();
 }
 

@@ -23,7 +23,7 @@ private:
 
     MainLoop& loop_;
     std::function<void()> interrupted_;
-    int descriptor_ = -1;
+    FileDescriptor descriptor_;
 };
 
 }  // namespace orvane

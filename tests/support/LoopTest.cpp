@@ -81,10 +81,10 @@ TEST(MainLoop, NeitherTasksNorTimersStarveADescriptor)
     };
     forever();
     ticking();
-    ASSERT_EQ(::write(writing.number(), "x", 1), 1);
-    loop.watch(reading.number(), POLLIN, [&](short events) {
+    ASSERT_EQ(::write(writing.get(), "x", 1), 1);
+    loop.watch(reading.get(), POLLIN, [&](short events) {
         EXPECT_TRUE(events & POLLIN);
-        loop.unwatch(reading.number());
+        loop.unwatch(reading.get());
         loop.stop();
     });
     loop.run();

@@ -187,8 +187,7 @@ OVDiskPointer DiskController::diskWithIdentifier(std::string_view identifier)
     return diskNamed(identifier);
 }
 
-std::shared_ptr<Disk> DiskController::diskReferredTo(
-    const fixwell::DiskReferencePointer& reference)
+std::shared_ptr<Disk> DiskController::diskReferredTo(const fixwell::DiskReferencePointer& reference)
 {
     if (!reference)
         return nullptr;

@@ -88,12 +88,12 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
                     const DiskSources& sources)
 {
     const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
-    if (!device.isOpen())
+    if (!device)
         return {superblockFromUdev(number, sources), {}, false, false};
     const ByteRange all{0, size};
-    Contents contents{readSuperblock(device.number(), all), readPartitionTable(device.number()),
-                      hasExtBackupSuperblock(device.number(), all),
-                      hasPartitionTableTraces(device.number())};
+    Contents contents{readSuperblock(device.get(), all), readPartitionTable(device.get()),
+                      hasExtBackupSuperblock(device.get(), all),
+                      hasPartitionTableTraces(device.get())};
     return contents;
 }
 

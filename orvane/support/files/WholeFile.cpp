@@ -5,6 +5,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <array>
 #include <cerrno>
@@ -24,18 +25,18 @@ public:
     TemporaryFile& operator=(const TemporaryFile&) = delete;
     ~TemporaryFile()
     {
-        if (descriptor_.isOpen() && !isRenamed_)
+        if (descriptor_ && !isRenamed_)
             ::unlink(name_.c_str());
     }
 
     /// 0, or the error number.
     [[nodiscard]] int become(const std::filesystem::path& file, std::string_view contents)
     {
-        if (!descriptor_.isOpen())
+        if (!descriptor_)
             return errno;
-        if (const int error = writeAll(descriptor_.number(), contents))
+        if (const int error = writeAll(descriptor_.get(), contents))
             return error;
-        if (::fsync(descriptor_.number()) != 0 || std::rename(name_.c_str(), file.c_str()) != 0)
+        if (::fsync(descriptor_.get()) != 0 || std::rename(name_.c_str(), file.c_str()) != 0)
             return errno;
         isRenamed_ = true;
         return 0;
@@ -52,8 +53,8 @@ private:
 void syncDirectory(const std::filesystem::path& directory)
 {
     const FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (opened.isOpen())
-        ::fsync(opened.number());
+    if (opened)
+        ::fsync(opened.get());
 }
 
 std::filesystem::path targetOf(const std::filesystem::path& file)
@@ -81,10 +82,10 @@ int writeAll(int descriptor, std::string_view bytes)
 std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
 {
     const FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
-    if (!opened.isOpen())
+    if (!opened)
         return errno;
     struct stat status = {};
-    if (::fstat(opened.number(), &status) != 0)
+    if (::fstat(opened.get(), &status) != 0)
         return errno;
     if (!S_ISREG(status.st_mode))
         return EINVAL;
@@ -93,7 +94,7 @@ std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, 
     std::string contents;
     std::array<char, 16384> piece;
     while (true) {
-        const ssize_t count = ::read(opened.number(), piece.data(), piece.size());
+        const ssize_t count = ::read(opened.get(), piece.data(), piece.size());
         if (count < 0 && errno == EINTR)
             continue;
         if (count < 0)

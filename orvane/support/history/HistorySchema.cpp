@@ -85,7 +85,7 @@ int createPrivateFile(const std::filesystem::path& file)
 {
     const FileDescriptor made(
         ::open(file.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
-    return made.isOpen() ? 0 : errno;
+    return made ? 0 : errno;
 }
 
 HistoryDatabase inMemory()

@@ -3,6 +3,7 @@
 
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
@@ -30,8 +31,8 @@ ImageVolume readVolume(const OpenImage& image, Partition partition)
     const ByteRange there = withinFile(partition.range, image.length);
     ImageVolume volume;
     if (!partition.isContainer) {
-        volume.superblock = readSuperblock(image.descriptor.number(), there);
-        volume.hasExtBackup = hasExtBackupSuperblock(image.descriptor.number(), there);
+        volume.superblock = readSuperblock(image.descriptor.get(), there);
+        volume.hasExtBackup = hasExtBackupSuperblock(image.descriptor.get(), there);
     }
     volume.partition = std::move(partition);
     return volume;
@@ -49,10 +50,10 @@ std::string ImageVolume::filesystem() const
 Outcome<OpenImage> openImage(const std::filesystem::path& path, const Translator& translator)
 {
     FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
-    if (!descriptor.isOpen())
+    if (!descriptor)
         return Failure{errorText(errno)};
     struct stat status = {};
-    if (::fstat(descriptor.number(), &status) != 0)
+    if (::fstat(descriptor.get(), &status) != 0)
         return Failure{errorText(errno)};
     if (!S_ISREG(status.st_mode))
         return Failure{translator.text("it is not a regular file")};
@@ -75,10 +76,10 @@ ImageContents readContents(const OpenImage& image)
     if (isOpticalImage(contents.whole.superblock))
         return contents;
 
-    const auto table = readPartitionTable(image.descriptor.number());
+    const auto table = readPartitionTable(image.descriptor.get());
     const bool isUnknown = contents.whole.filesystem().empty();
     contents.hasPartitionMap =
-        table || (isUnknown && hasPartitionTableTraces(image.descriptor.number()));
+        table || (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
     for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
         contents.partitions.push_back(readVolume(image, partition));
     return contents;

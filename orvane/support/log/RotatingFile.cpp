@@ -29,7 +29,7 @@ void RotatingFile::flush()
     if (!file_.empty()) {
         error = makeReady();
         if (error == 0)
-            error = writeAll(descriptor_.number(), buffer_);
+            error = writeAll(descriptor_.get(), buffer_);
     }
     buffer_.clear();
     if (error != 0 && !std::exchange(hasWarned_, true))
@@ -42,7 +42,7 @@ int RotatingFile::makeReady()
         if (const int error = open())
             return error;
     struct stat status = {};
-    if (::fstat(descriptor_.number(), &status) != 0)
+    if (::fstat(descriptor_.get(), &status) != 0)
         return errno;
     const auto size = static_cast<std::size_t>(status.st_size);
     if (size == 0 || size + buffer_.size() <= limits_.bytes)
@@ -56,7 +56,7 @@ bool RotatingFile::isStillTheFile() const
 {
     struct stat mine = {};
     struct stat named = {};
-    return descriptor_.isOpen() && ::fstat(descriptor_.number(), &mine) == 0 &&
+    return descriptor_ && ::fstat(descriptor_.get(), &mine) == 0 &&
            ::stat(file_.c_str(), &named) == 0 && mine.st_ino == named.st_ino &&
            mine.st_dev == named.st_dev;
 }
@@ -68,7 +68,7 @@ int RotatingFile::open()
     // A link or a FIFO that somebody has put in the log's place is refused, not written to.
     const int flags = O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
     descriptor_ = FileDescriptor(::open(file_.c_str(), flags, 0600));
-    return descriptor_.isOpen() ? 0 : errno;
+    return descriptor_ ? 0 : errno;
 }
 
 // The oldest is removed first: renaming one file over another makes ext4 bring the data to the

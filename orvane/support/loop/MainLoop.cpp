@@ -4,6 +4,8 @@
 #include "orvane/support/loop/Outbox.h"
 #include "orvane/support/loop/Rendezvous.h"
 
+#include <unistd.h>
+
 #include <poll.h>
 #include <sys/eventfd.h>
 
@@ -23,7 +25,7 @@ constexpr int tasksInOneTurn = 512;
 FileDescriptor makeWakeup()
 {
     FileDescriptor wakeup(::eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC));
-    if (!wakeup.isOpen())
+    if (!wakeup)
         throw std::system_error(errno, std::generic_category(), "cannot make an event descriptor");
     return wakeup;
 }
@@ -74,7 +76,7 @@ void MainLoop::wake()
 {
     const std::uint64_t one = 1;
     // The only failure, EAGAIN, means that the descriptor is readable already.
-    [[maybe_unused]] const ssize_t written = ::write(wakeup_.number(), &one, sizeof one);
+    [[maybe_unused]] const ssize_t written = ::write(wakeup_.get(), &one, sizeof one);
 }
 
 void MainLoop::scheduleTimer(std::chrono::duration<double> delay, Task task)
@@ -144,7 +146,7 @@ int MainLoop::pollTimeout()
 
 void MainLoop::waitForWork()
 {
-    pollfd wakeup{wakeup_.number(), POLLIN, 0};
+    pollfd wakeup{wakeup_.get(), POLLIN, 0};
     std::vector<pollfd> polled{wakeup};
     for (const Watch& watch : watches_)
         polled.push_back({watch.descriptor, watch.events, 0});
@@ -156,7 +158,7 @@ void MainLoop::waitForWork()
 void MainLoop::serveDescriptors()
 {
     std::uint64_t count = 0;
-    [[maybe_unused]] const ssize_t taken = ::read(wakeup_.number(), &count, sizeof count);
+    [[maybe_unused]] const ssize_t taken = ::read(wakeup_.get(), &count, sizeof count);
 
     const std::vector<Watch> watched = watches_;
     for (const Watch& watch : watched) {
