@@ -14,12 +14,12 @@ namespace orvane::test {
 int runTool(const std::vector<std::string>& arguments, std::string_view input)
 {
     const FileDescriptor standardInput(::memfd_create("input", 0));
-    if (writeAll(standardInput.number(), input) != 0 ||
-        ::lseek(standardInput.number(), 0, SEEK_SET) != 0)
+    if (writeAll(standardInput.get(), input) != 0 ||
+        ::lseek(standardInput.get(), 0, SEEK_SET) != 0)
         return -1;
     posix_spawn_file_actions_t actions;
     ::posix_spawn_file_actions_init(&actions);
-    ::posix_spawn_file_actions_adddup2(&actions, standardInput.number(), 0);
+    ::posix_spawn_file_actions_adddup2(&actions, standardInput.get(), 0);
     ::posix_spawn_file_actions_addopen(&actions, 1, "/dev/null", O_WRONLY, 0);
     ::posix_spawn_file_actions_addopen(&actions, 2, "/dev/null", O_WRONLY, 0);
 
