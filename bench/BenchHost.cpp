@@ -52,7 +52,7 @@ DiskTree sampleDisk()
 
 BenchHost::BenchHost(const std::filesystem::path& state)
     : logView_(
-          loop_, [](const auto&, const auto&) {}, [] {}),
+          loop_, [](const auto&, const auto&) {}, [] {}, [] {}),
       interface_(logView_),
       alerts_(loop_, reporter_, TerminalAlerts::Answer::Confirm),
       bundle_(runningExecutable().parent_path().parent_path() / "modules" / "Fixwell.ovmodule",

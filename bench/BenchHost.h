@@ -16,6 +16,7 @@ class SilentReporter final : public Reporter {
     void record(const std::string&, const fixwell::Dictionary&, const fixwell::StyledText&) override
     {
     }
+    void rowsWritten() override {}
     void progress(const std::string&, std::optional<double>, const std::string&) override {}
     void finished(const std::string&, std::string_view, fixwell::ErrorCode,
                   std::string_view) override

@@ -4,6 +4,14 @@
 namespace orvane {
 namespace {
 
+/// What the interface file says of a button; the module sets the others itself.
+fixwell::Selector actionInFile(std::string_view outlet)
+{
+    if (outlet == "showDetailsButton")
+        return "showDetailsAction:";
+    return outlet == "clearHistoryButton" ? "clearHistoryAction:" : "";
+}
+
 // The one custom view that a log's interface file names.
 constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
 
@@ -21,7 +29,9 @@ bool Interface::loadInterface(std::string_view /*name*/, fixwell::InterfaceOwner
 void Interface::connect(const fixwell::Outlet& outlet, fixwell::InterfaceOwner& owner)
 {
     if (auto* const button = std::get_if<fixwell::Button**>(&outlet.place)) {
-        **button = &buttons_[std::string(outlet.name)];
+        TerminalButton& made = buttons_[std::string(outlet.name)];
+        made.setAction(actionInFile(outlet.name));
+        **button = &made;
     } else if (auto* const field = std::get_if<fixwell::TextField**>(&outlet.place)) {
         **field = &textField_;
     } else if (auto* const view = std::get_if<fixwell::TextView**>(&outlet.place)) {

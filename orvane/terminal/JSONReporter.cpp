@@ -60,6 +60,11 @@ void JSONReporter::record(const std::string& disk, const fixwell::Dictionary& re
            {"text", std::string(text.characters())}});
 }
 
+void JSONReporter::rowsWritten()
+{
+    std::fflush(stdout);
+}
+
 void JSONReporter::progress(const std::string& disk, std::optional<double> percent,
                             const std::string& status)
 {

@@ -10,6 +10,7 @@ void JobReporter::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operat
     flush();
     current_ = names_.nameOf(disk->identifier);
     run_ = hooks_.runBegan(disk, operation);
+    isInFlight_ = true;
     reporter_.started(current_, nameOf(operation), window_.status());
     hooks_.follow(disk);
 }
@@ -35,6 +36,7 @@ void JobReporter::jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwe
 
 void JobReporter::settle(const std::string& identifier, Outcome outcome)
 {
+    isInFlight_ = false;
     hooks_.runEnded(run_, outcome);
     unsaid_ = outcome;
     outcomes_[identifier] = std::move(outcome);

@@ -53,6 +53,8 @@ public:
     /// What the user calls the disk whose rows are coming.
     void setCurrentDisk(const std::string& name) { current_ = name; }
     const std::string& currentDisk() const { return current_; }
+    /// Between a job's beginning and its end.
+    bool isInFlight() const { return isInFlight_; }
     /// By disk identifier.
     const std::map<std::string, Outcome>& outcomes() const { return outcomes_; }
 
@@ -65,6 +67,7 @@ private:
     Hooks hooks_;
     std::string current_;
     std::int64_t run_ = 0;
+    bool isInFlight_ = false;
     std::optional<Outcome> unsaid_;
     std::map<std::string, Outcome> outcomes_;
 };

@@ -62,6 +62,7 @@ void LogView::writeNewRows()
         view_->dataSource()->outlineViewWillDisplayCellForTableColumnItem(*cell, item);
         writeRow_(item, cell->attributedStringValue());
     }
+    afterRows_();
 }
 
 }  // namespace orvane

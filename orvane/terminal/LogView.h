@@ -18,9 +18,14 @@ public:
         std::function<void(const fixwell::Dictionary& record, const fixwell::StyledText& text)>;
 
     /// `beforeRows` is called before rows are written: what is shown must be on the disk first.
+    /// `afterRows` is called when no more are waiting.
     /// The loop outlives this object, and runs nothing more once it is gone.
-    LogView(fixwell::RunLoop& loop, RowWriter writeRow, std::function<void()> beforeRows)
-        : loop_(loop), writeRow_(std::move(writeRow)), beforeRows_(std::move(beforeRows))
+    LogView(fixwell::RunLoop& loop, RowWriter writeRow, std::function<void()> beforeRows,
+            std::function<void()> afterRows)
+        : loop_(loop),
+          writeRow_(std::move(writeRow)),
+          beforeRows_(std::move(beforeRows)),
+          afterRows_(std::move(afterRows))
     {
     }
 
@@ -62,6 +67,7 @@ private:
     fixwell::RunLoop& loop_;
     RowWriter writeRow_;
     std::function<void()> beforeRows_;
+    std::function<void()> afterRows_;
     fixwell::OutlineView* view_ = nullptr;
     std::size_t rows_ = 0;
     std::size_t written_ = 0;

@@ -53,6 +53,8 @@ public:
     /// A row of the log, with its text as the log view's cell holds it.
     virtual void record(const std::string& disk, const fixwell::Dictionary& record,
                         const fixwell::StyledText& text) = 0;
+    /// The rows that were waiting are written; a reader should see them now.
+    virtual void rowsWritten() = 0;
     /// No percentage while there is no telling.
     virtual void progress(const std::string& disk, std::optional<double> percent,
                           const std::string& status) = 0;

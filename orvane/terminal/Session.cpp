@@ -31,7 +31,7 @@ Session::Session(const Request& request, Reporter& reporter)
           [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
               reporter_.record(jobs_.currentDisk(), record, text);
           },
-          [this] { host_.histories().saveNew(); }),
+          [this] { host_.histories().saveNew(); }, [this] { reporter_.rowsWritten(); }),
       interface_(logView_),
       alerts_(loop_, reporter, answerFor(request)),
       hostTexts_(hostBundleDirectory(runningExecutable()) / "locale"),
@@ -42,7 +42,10 @@ Session::Session(const Request& request, Reporter& reporter)
       observedLibrary_(library_, jobs_)
 {
     window_.setEvents({
-        [this] { reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status()); },
+        [this] {
+            if (jobs_.isInFlight())
+                reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status());
+        },
         [this](const fixwell::Dictionary& report) {
             jobs_.flush();
             reporter_.report(names_.nameOf(report.string(fixwell::Name("kOVOP_DiskIdentifierKey"))),
@@ -144,6 +147,12 @@ Outcome<> Session::loadModule()
 
 Outcome<Session::DiskPointer> Session::findDisk(const std::string& name)
 {
+    // Only what is no file needs the system's disks: a mount point, a label, a UUID.
+    std::error_code error;
+    if (!knowsSystemDisks_ && !std::filesystem::is_regular_file(name, error)) {
+        host_.refreshDisks();
+        knowsSystemDisks_ = true;
+    }
     auto found = DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
     if (!failed(found))
         names_.add(std::get<DiskPointer>(found)->facts().identifier, name);

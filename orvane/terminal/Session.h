@@ -87,6 +87,7 @@ private:
     LoadedModule loaded_;
     std::unique_ptr<fixwell::OVModule> module_;
     bool isStopping_ = false;
+    bool knowsSystemDisks_ = false;
 };
 
 }  // namespace orvane

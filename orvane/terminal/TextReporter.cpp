@@ -83,7 +83,12 @@ void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary
     }
     hasWrittenRows_ = true;
     write(terminalText(text, options_.colors));
+}
+
+void TextReporter::rowsWritten()
+{
     drawProgress();
+    std::fflush(stdout);
 }
 
 void TextReporter::progress(const std::string& /*disk*/, std::optional<double> percent,

@@ -30,6 +30,7 @@ public:
                  const std::string& title) override;
     void record(const std::string& disk, const fixwell::Dictionary& record,
                 const fixwell::StyledText& text) override;
+    void rowsWritten() override;
     void progress(const std::string& disk, std::optional<double> percent,
                   const std::string& status) override;
     void finished(const std::string& disk, std::string_view verdict, fixwell::ErrorCode error,

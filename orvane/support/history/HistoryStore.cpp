@@ -333,7 +333,9 @@ bool HistoryStore::clear(std::string_view key)
     const std::int64_t volume = knownVolume(key);
     statements_->remove.bind(1, firstOf(volume));
     statements_->remove.bind(2, firstOf(volume + 1));
-    return volume == 0 || statements_->remove.run() || failedTo("clear the history", lastMishap());
+    const bool isCleared =
+        volume == 0 || (statements_->remove.run() && statements_->runs.keepNewest(volume, 0));
+    return isCleared || failedTo("clear the history", lastMishap());
 }
 
 std::int64_t HistoryStore::beginRun(std::string_view key, std::string_view action,

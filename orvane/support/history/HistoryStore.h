@@ -43,6 +43,7 @@ public:
     /// NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const fixwell::Array& history,
                               std::size_t firstNew);
+    /// The volume's records and its runs.
     [[nodiscard]] bool clear(std::string_view key);
 
     /// The run's number; 0 when it could not be written.

@@ -33,14 +33,19 @@ RunLedger::RunLedger(Database& database)
 {
 }
 
-std::int64_t RunLedger::begin(std::int64_t volume, std::string_view action, Run::Time started)
+bool RunLedger::keepNewest(std::int64_t volume, std::int64_t count)
 {
     trim_.bind(1, volume);
-    trim_.bind(2, keptRuns - 1);
+    trim_.bind(2, count);
+    return trim_.run();
+}
+
+std::int64_t RunLedger::begin(std::int64_t volume, std::string_view action, Run::Time started)
+{
     begin_.bind(1, volume);
     begin_.bind(2, milliseconds(started));
     begin_.bind(3, action);
-    const bool isWritten = trim_.run() && begin_.run();
+    const bool isWritten = keepNewest(volume, keptRuns - 1) && begin_.run();
     return isWritten ? database_.lastInsertedRow() : 0;
 }
 

@@ -45,6 +45,9 @@ public:
     /// At most `limit` of the newest ones.
     [[nodiscard]] std::vector<Run> runs(std::int64_t volume, std::int64_t limit = 1000);
 
+    /// Forgets all but the newest `count`; 0 forgets all.
+    [[nodiscard]] bool keepNewest(std::int64_t volume, std::int64_t count);
+
 private:
     Statement begin_;
     Statement end_;

@@ -39,7 +39,7 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     const DiskFacts& facts = disk->facts();
     DiskLine line;
     line.disk = session.names().nameOf(facts.identifier);
-    line.name = facts.displayName;
+    line.name = disk->displayName();
     line.kind = session.host().translator().text(kindText(facts.type));
     line.filesystem = facts.filesystem;
     line.bytes = facts.length;

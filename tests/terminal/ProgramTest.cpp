@@ -1,0 +1,182 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/terminal/ProgramTest.h"
+
+#include "tests/support/ToolRun.h"
+
+#include <sys/prctl.h>
+#include <sys/wait.h>
+
+#include <csignal>
+#include <cstdlib>
+#include <fstream>
+#include <stdexcept>
+#include <thread>
+
+namespace orvane::test {
+namespace {
+
+/// Fails the test that cannot be prepared, loudly.
+void prepareWith(const std::vector<std::string>& arguments)
+{
+    if (const int status = runTool(arguments); status != 0)
+        throw std::runtime_error("cannot prepare the test: " + arguments.front() + " answered " +
+                                 std::to_string(status));
+}
+
+}  // namespace
+
+// A sanitizer's settings belong to the machine, everything else to the test.
+ProgramTest::ProgramTest()
+    : environment_{{"PATH", "/usr/sbin:/usr/bin:/sbin:/bin"},
+                   {"LC_ALL", "C.UTF-8"},
+                   {"TERM", "xterm"},
+                   {"HOME", path("home")},
+                   {"XDG_STATE_HOME", path("state")},
+                   {"XDG_CONFIG_HOME", path("config")}}
+{
+    for (const char* const name : {"ASAN_OPTIONS", "UBSAN_OPTIONS", "LSAN_OPTIONS"})
+        if (const char* const value = std::getenv(name))
+            environment_[name] = value;
+}
+
+// Whatever the program leaves behind comes to the test.
+void ProgramTest::SetUp()
+{
+    ASSERT_EQ(::prctl(PR_SET_CHILD_SUBREAPER, 1), 0);
+}
+
+void ProgramTest::TearDown()
+{
+    EXPECT_EQ(endStrayProcesses(), 0) << "processes were left behind";
+}
+
+Launch ProgramTest::launch(std::vector<std::string> arguments) const
+{
+    Launch started;
+    started.arguments = std::move(arguments);
+    started.environment = environment_;
+    started.directory = directory_.path;
+    return started;
+}
+
+RunResult ProgramTest::run(std::vector<std::string> arguments) const
+{
+    return Program(launch(std::move(arguments))).finish();
+}
+
+RunResult ProgramTest::runOnTerminal(std::vector<std::string> arguments) const
+{
+    Launch started = launch(std::move(arguments));
+    started.columns = 80;
+    return Program(started).finish();
+}
+
+std::filesystem::path ProgramTest::makeVolume(std::string_view name, std::uint64_t bytes,
+                                              const std::vector<std::string>& options) const
+{
+    write(path(name), {});
+    std::filesystem::resize_file(path(name), bytes);
+    std::vector<std::string> arguments{"mke2fs", "-q", "-F", "-t", "ext4"};
+    arguments.insert(arguments.end(), options.begin(), options.end());
+    arguments.push_back(path(name));
+    prepareWith(arguments);
+    return path(name);
+}
+
+// Without marks of unused inodes all tables are read; they are holes and cost no room.
+std::filesystem::path ProgramTest::makeSlowVolume(std::string_view name) const
+{
+    return makeVolume(name, 6144 * mebibyte, {"-O", "^metadata_csum,^uninit_bg", "-N", "3000000"});
+}
+
+void ProgramTest::change(const std::filesystem::path& image, const std::string& command) const
+{
+    prepareWith({"debugfs", "-w", "-R", command, image});
+}
+
+std::filesystem::path ProgramTest::makeDamagedVolume(std::string_view name,
+                                                     const std::vector<std::string>& options) const
+{
+    const std::filesystem::path image = makeVolume(name, 8 * mebibyte, options);
+    change(image, "clri <2>");
+    return image;
+}
+
+void ProgramTest::patch(const std::filesystem::path& image, std::uint64_t offset,
+                        std::string_view bytes) const
+{
+    std::fstream file(image, std::ios::binary | std::ios::in | std::ios::out);
+    file.seekp(static_cast<std::streamoff>(offset));
+    if (!file.write(bytes.data(), static_cast<std::streamsize>(bytes.size())))
+        throw std::runtime_error("cannot prepare the test: " + image.string());
+}
+
+void ProgramTest::useTool(std::string_view script)
+{
+    std::filesystem::create_directories(path("tools"));
+    std::filesystem::copy_file(TERMINAL_FAKE_TOOL, path("tools/e2fsck"),
+                               std::filesystem::copy_options::overwrite_existing);
+    write(path("tools/script"), script);
+    environment_["FIXWELL_TOOL_PATH"] = path("tools");
+}
+
+std::vector<pid_t> strayProcesses()
+{
+    std::vector<pid_t> found;
+    const std::string self = std::to_string(::getpid());
+    std::ifstream children("/proc/self/task/" + self + "/children");
+    for (pid_t child = 0; children >> child;)
+        found.push_back(child);
+    return found;
+}
+
+// A tool whose program was killed is killed by the kernel a moment later: two seconds are waited,
+// and whoever is there then was left behind.
+int endStrayProcesses()
+{
+    constexpr std::chrono::milliseconds pause{20};
+    for (int i = 0; i < 100 && ::waitpid(-1, nullptr, WNOHANG) >= 0; ++i)
+        std::this_thread::sleep_for(pause);
+    const std::vector<pid_t> strays = strayProcesses();
+    for (const pid_t stray : strays)
+        ::kill(stray, SIGKILL);
+    int reaped = 0;
+    while (::waitpid(-1, nullptr, 0) > 0)
+        ++reaped;
+    return reaped;
+}
+
+std::vector<std::string> linesOf(std::string_view text)
+{
+    std::vector<std::string> lines;
+    while (!text.empty()) {
+        const std::size_t end = std::min(text.find('\n'), text.size());
+        lines.emplace_back(text.substr(0, end));
+        text.remove_prefix(std::min(end + 1, text.size()));
+    }
+    return lines;
+}
+
+std::size_t countOf(std::string_view part, std::string_view text)
+{
+    std::size_t count = 0;
+    for (std::size_t at = text.find(part); at != std::string_view::npos;
+         at = text.find(part, at + part.size()))
+        ++count;
+    return count;
+}
+
+bool holdsControls(std::string_view text)
+{
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        const auto byte = static_cast<unsigned char>(text[i]);
+        const auto next = static_cast<unsigned char>(i + 1 < text.size() ? text[i + 1] : 0);
+        if ((byte < 0x20 && byte != '\n') || byte == 0x7F)
+            return true;
+        if (byte == 0xC2 && next >= 0x80 && next < 0xA0)  // U+0080 to U+009F, such as CSI
+            return true;
+    }
+    return text.find("\xE2\x80\xAE") != std::string_view::npos;  // right-to-left override
+}
+
+}  // namespace orvane::test

@@ -1,0 +1,79 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "tests/support/TemporaryDirectory.h"
+#include "tests/terminal/Events.h"
+#include "tests/terminal/Program.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdint>
+#include <filesystem>
+#include <map>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace orvane::test {
+
+inline constexpr std::uint64_t mebibyte = 1U << 20U;
+
+/// What a tool says that has checked everything and found nothing.
+inline const std::string soundRun =
+    "say Pass 1: Checking inodes, blocks, and sizes\n"
+    "say Disk: 11/2048 files (9.1% non-contiguous), 1618/8192 blocks\n";
+
+/// A user with a directory of images, who has never used the program before. When the test ends no
+/// process that came from it may be left.
+class ProgramTest : public ::testing::Test {
+protected:
+    ProgramTest();
+
+    void SetUp() override;
+    void TearDown() override;
+
+    /// Started in the test's directory.
+    Launch launch(std::vector<std::string> arguments) const;
+    /// In pipes, to the end.
+    RunResult run(std::vector<std::string> arguments) const;
+    /// On a terminal of 80 columns, to the end.
+    RunResult runOnTerminal(std::vector<std::string> arguments) const;
+
+    std::filesystem::path path(std::string_view name) const { return directory_ / name; }
+
+    /// A sparse file with a sound volume.
+    std::filesystem::path makeVolume(std::string_view name, std::uint64_t bytes = 8 * mebibyte,
+                                     const std::vector<std::string>& options = {}) const;
+    /// A volume that a check has to read for a second or longer.
+    std::filesystem::path makeSlowVolume(std::string_view name) const;
+    /// debugfs(8), writing.
+    void change(const std::filesystem::path& image, const std::string& command) const;
+    /// A volume that has lost its root directory.
+    std::filesystem::path makeDamagedVolume(std::string_view name,
+                                            const std::vector<std::string>& options = {}) const;
+    /// Replaces bytes of the file.
+    void patch(const std::filesystem::path& image, std::uint64_t offset,
+               std::string_view bytes) const;
+
+    /// From now on e2fsck does what the script says; it is described in the fake tool's source.
+    void useTool(std::string_view script);
+
+private:
+    TemporaryDirectory directory_;  // before the environment, which names it
+
+protected:
+    std::map<std::string, std::string> environment_;
+};
+
+/// Ends all processes that were left to the test, and tells how many there were. Those that are
+/// about to end by themselves are waited for.
+int endStrayProcesses();
+/// The processes that have been left to the test and still run.
+std::vector<pid_t> strayProcesses();
+
+std::vector<std::string> linesOf(std::string_view text);
+std::size_t countOf(std::string_view part, std::string_view text);
+/// Whether a terminal would find something to obey in it, apart from line ends.
+bool holdsControls(std::string_view text);
+
+}  // namespace orvane::test
