@@ -46,7 +46,7 @@ void JSONReporter::started(const std::string& disk, std::string_view action,
                            const std::string& title)
 {
     write({{"event", "started"}, {"disk", disk}, {"action", action}, {"title", title}});
-    std::fflush(stdout);
+    flush();
     shownPercent_.reset();
 }
 
@@ -62,7 +62,7 @@ void JSONReporter::record(const std::string& disk, const fixwell::Dictionary& re
 
 void JSONReporter::rowsWritten()
 {
-    std::fflush(stdout);
+    flush();
 }
 
 void JSONReporter::progress(const std::string& disk, std::optional<double> percent,
@@ -78,7 +78,7 @@ void JSONReporter::progress(const std::string& disk, std::optional<double> perce
            {"disk", disk},
            {"percent", percent ? ordered_json(std::round(*percent * 10) / 10) : ordered_json()},
            {"status", status}});
-    std::fflush(stdout);
+    flush();
 }
 
 void JSONReporter::finished(const std::string& disk, std::string_view verdict,
@@ -89,7 +89,7 @@ void JSONReporter::finished(const std::string& disk, std::string_view verdict,
            {"verdict", verdict},
            {"error", error},
            {"message", std::string(message)}});
-    std::fflush(stdout);
+    flush();
 }
 
 void JSONReporter::report(const std::string& disk, const fixwell::Dictionary& report)
@@ -114,7 +114,7 @@ void JSONReporter::failure(const std::string& disk, const std::string& sentence)
            {"verdict", fixwell::kPLVerdictFailed.text()},
            {"error", fixwell::kPLErrorCannotOpen},
            {"message", sentence}});
-    std::fflush(stdout);
+    flush();
 }
 
 // Standard output is for events.
@@ -151,11 +151,6 @@ void JSONReporter::runs(const std::string& disk, const std::vector<RunLine>& run
                {"action", run.action},
                {"verdict", textOrNull(run.verdict)},
                {"message", textOrNull(run.message)}});
-}
-
-void JSONReporter::end()
-{
-    std::fflush(stdout);
 }
 
 }  // namespace orvane

@@ -28,7 +28,6 @@ public:
     void warning(const std::string& sentence) override;
     void listed(const DiskLine& disk) override;
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override;
-    void end() override;
 
 private:
     static void write(const nlohmann::ordered_json& event);

@@ -69,8 +69,16 @@ public:
     virtual void listed(const DiskLine& disk) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
-    /// The last thing that is said.
-    virtual void end() {}
+    /// The last thing that is said. NO, with a word on standard error, when some of what was said
+    /// could not be written.
+    virtual bool end();
+
+protected:
+    /// Hands what is buffered to the system, after every burst: a reader sees it at once.
+    void flush();
+
+private:
+    bool hasLostOutput_ = false;
 };
 
 }  // namespace orvane

@@ -88,7 +88,7 @@ void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary
 void TextReporter::rowsWritten()
 {
     drawProgress();
-    std::fflush(stdout);
+    flush();
 }
 
 void TextReporter::progress(const std::string& /*disk*/, std::optional<double> percent,
@@ -108,7 +108,7 @@ void TextReporter::drawProgress()
     progress_.elapsed = std::chrono::duration_cast<std::chrono::seconds>(now - began_);
     const std::string line = "\r\x1b[K" + progressLine(progress_, terminalColumns());
     std::fwrite(line.data(), 1, line.size(), stdout);
-    std::fflush(stdout);
+    flush();
     drawn_ = now;
     isProgressShown_ = true;
 }
@@ -128,7 +128,7 @@ void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verd
     progress_.status.clear();
     hideProgress();
     endLine();
-    std::fflush(stdout);
+    flush();
 }
 
 void TextReporter::report(const std::string& /*disk*/, const fixwell::Dictionary& /*report*/) {}
@@ -148,7 +148,7 @@ void TextReporter::warning(const std::string& sentence)
 {
     hideProgress();
     endLine();
-    std::fflush(stdout);
+    flush();
     const std::string line = "fixwell: " + fixwell::printable(sentence) + "\n";
     std::fwrite(line.data(), 1, line.size(), stderr);
 }
@@ -187,11 +187,11 @@ void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& run
         write("\n");
 }
 
-void TextReporter::end()
+bool TextReporter::end()
 {
     hideProgress();
     endLine();
-    std::fflush(stdout);
+    return Reporter::end();
 }
 
 }  // namespace orvane

@@ -41,7 +41,7 @@ public:
     void warning(const std::string& sentence) override;
     void listed(const DiskLine& disk) override;
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override;
-    void end() override;
+    bool end() override;
 
 private:
     using Clock = std::chrono::steady_clock;

@@ -9,6 +9,7 @@
 #include "orvane/terminal/TextReporter.h"
 #include "orvane/terminal/commands/Commands.h"
 
+#include <fcntl.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -62,8 +63,18 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     }
 }
 
+/// A standard stream that was closed leaves its number to the next file that is opened, and what
+/// is printed would go there: into a disk image, say. What takes the place cannot be written.
+void keepStandardDescriptorsTaken()
+{
+    for (int number = STDIN_FILENO; number <= STDERR_FILENO; ++number)
+        if (::fcntl(number, F_GETFD) < 0)
+            static_cast<void>(::open("/dev/null", O_RDONLY));
+}
+
 int run(int argc, const char* const* argv)
 {
+    keepStandardDescriptorsTaken();
     adoptUserLocale();
     const auto read = readCommandLine(argc, argv);
     if (const auto* const ending = std::get_if<Ending>(&read)) {
@@ -77,8 +88,7 @@ int run(int argc, const char* const* argv)
         Session session(request, *reporter);
         status = carryOut(request, session, *reporter);
     }
-    reporter->end();
-    return status;
+    return reporter->end() ? status : status | exitUnchecked;
 }
 
 }  // namespace

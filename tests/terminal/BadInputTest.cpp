@@ -184,6 +184,20 @@ TEST_F(BadInputTest, WrongUsageIsSaidWithoutObeyingIt)
     EXPECT_EQ(help.errors, "");
 }
 
+// With standard output closed, its number goes to the next file that is opened: never the image.
+TEST_F(BadInputTest, OutputThatCannotBeWrittenIsSaidAndHarmsNothing)
+{
+    for (const Launch::Output output : {Launch::Output::Closed, Launch::Output::Full}) {
+        makeDamagedVolume("image");
+        Launch launched = launch({"repair", "image"});
+        launched.output = output;
+        const RunResult result = Program(launched).finish();
+        EXPECT_EQ(result.status, 1 | 8) << "repaired, but not all was told";
+        EXPECT_EQ(result.errors, "fixwell: not all of the output could be written\n");
+        EXPECT_EQ(run({"verify", "image"}).status, 0);
+    }
+}
+
 TEST_F(BadInputTest, AnActionThatIsNotThereSaysTheModulesReason)
 {
     for (const char* const command : {"verify-permissions", "repair-permissions"}) {

@@ -99,10 +99,14 @@ void Program::startInPipes(const Launch& launch)
     Pipe output;
     Pipe errors;
     const FileDescriptor nothing(::open("/dev/null", O_RDONLY | O_CLOEXEC));
+    const FileDescriptor full(::open("/dev/full", O_WRONLY | O_CLOEXEC));
     id_ = ::fork();
     if (id_ == 0) {
         ::dup2(nothing.get(), STDIN_FILENO);
-        ::dup2(output.writer.get(), STDOUT_FILENO);
+        ::dup2(launch.output == Launch::Output::Full ? full.get() : output.writer.get(),
+               STDOUT_FILENO);
+        if (launch.output == Launch::Output::Closed)
+            ::close(STDOUT_FILENO);
         ::dup2(errors.writer.get(), STDERR_FILENO);
         words.execute(launch);
     }

@@ -21,6 +21,8 @@ struct Launch {
     std::string directory;                           ///< where it is started
     std::optional<uid_t> user;                       ///< else the test's own
     std::chrono::seconds limit{60};                  ///< a longer run is killed
+    enum class Output { Read, Closed, Full };
+    Output output = Output::Read;           ///< in pipes: or none at all, or a device that is full
     std::optional<unsigned short> columns;  ///< on a pseudo-terminal of this width, else in pipes
 };
 

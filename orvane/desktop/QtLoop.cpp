@@ -1,0 +1,102 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/QtLoop.h"
+
+#include "orvane/support/loop/Outbox.h"
+#include "orvane/support/loop/Rendezvous.h"
+
+#include <QThread>
+
+#include <memory>
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+// Short enough for sixty pictures a second.
+constexpr std::chrono::milliseconds longestTurn{8};
+
+}  // namespace
+
+QtLoop::QtLoop()
+{
+    // Unlike a posted event, a timer waits until the window has had its turn.
+    nextTurn_.setInterval(0);
+    nextTurn_.setSingleShot(true);
+    QObject::connect(&nextTurn_, &QTimer::timeout, &receiver_, [this] { runTurn(); });
+}
+
+bool QtLoop::isMainThread() const
+{
+    return QThread::currentThread() == receiver_.thread();
+}
+
+void QtLoop::performOnMainThread(Task task, Wait wait)
+{
+    if (Outbox* const outbox = Outbox::ofThisThread()) {
+        outbox->perform(std::move(task), wait);
+    } else if (wait == Wait::No) {
+        post(std::move(task));
+    } else if (isMainThread()) {
+        task();
+    } else {
+        const auto rendezvous = std::make_shared<Rendezvous>();
+        post(Rendezvous::taskFor(rendezvous, std::move(task)));
+        rendezvous->wait();
+    }
+}
+
+void QtLoop::scheduleTimer(std::chrono::duration<double> delay, Task task)
+{
+    const auto wait = std::chrono::ceil<std::chrono::milliseconds>(delay);
+    QTimer::singleShot(wait, Qt::PreciseTimer, &receiver_, std::move(task));
+}
+
+void QtLoop::post(Task task)
+{
+    bool mustWake = false;
+    {
+        const std::lock_guard guard(lock_);
+        tasks_.push_back(std::move(task));
+        mustWake = !std::exchange(isWakeupPending_, true);
+    }
+    if (mustWake)
+        QMetaObject::invokeMethod(&receiver_, [this] { runTurn(); }, Qt::QueuedConnection);
+}
+
+void QtLoop::runTurn()
+{
+    // Set before the tasks run: one of them may open a dialog and return only when it is closed.
+    nextTurn_.start();
+    const Clock::time_point end = Clock::now() + longestTurn;
+    while (runNextTask() && Clock::now() < end) {
+    }
+    if (hasTasks())
+        nextTurn_.start();
+    else
+        nextTurn_.stop();
+}
+
+bool QtLoop::runNextTask()
+{
+    Task task;
+    {
+        const std::lock_guard guard(lock_);
+        if (tasks_.empty())
+            return false;
+        task = std::move(tasks_.front());
+        tasks_.pop_front();
+    }
+    task();
+    return true;
+}
+
+bool QtLoop::hasTasks()
+{
+    const std::lock_guard guard(lock_);
+    isWakeupPending_ = !tasks_.empty();
+    return isWakeupPending_;
+}
+
+}  // namespace orvane::desktop

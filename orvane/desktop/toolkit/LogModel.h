@@ -1,0 +1,43 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/toolkit/OutlineView.h"
+
+#include <QAbstractListModel>
+
+namespace orvane::desktop {
+
+/// The text of a row as the module's cell shows it; none for a row that does not exist (any
+/// more), or while the view has no data source or no cell.
+fixwell::StyledText textOfItem(fixwell::OutlineView& view, const fixwell::OutlineItem& item);
+fixwell::StyledText textOfRow(fixwell::OutlineView& view, std::size_t row);
+
+/// The rows of an outline view without levels. Rows are asked for when they are shown: the model
+/// keeps their number alone, so a million rows cost as much as one. Main thread.
+class LogModel final : public QAbstractListModel {
+public:
+    /// The view whose data source is asked; it must live until it is taken away with none.
+    void setView(fixwell::OutlineView* view);
+    fixwell::OutlineView* view() const { return view_; }
+
+    /// Takes up the rows there are now. When there are only more of them, the selection and the
+    /// place of the view stay.
+    void reload();
+
+    int rowCount(const QModelIndex& parent = {}) const override;
+    /// The row's plain text for Qt::DisplayRole; the rest is the delegate's.
+    QVariant data(const QModelIndex& index, int role) const override;
+    Qt::ItemFlags flags(const QModelIndex& index) const override;
+
+private:
+    std::size_t countRows() const;
+    bool hasOnlyGrown(int rows) const;
+    void remember(int rows);
+
+    fixwell::OutlineView* view_ = nullptr;
+    int rows_ = 0;
+    fixwell::OutlineItem first_;  ///< as last loaded, to tell growth from another log
+    fixwell::OutlineItem last_;
+};
+
+}  // namespace orvane::desktop

@@ -1,0 +1,41 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <QTableView>
+
+#include <functional>
+
+namespace orvane::desktop {
+
+/// The widget of the log: one column, equal rows, no header. A table rather than a tree, because
+/// a tree lays all its rows out anew whenever one is added.
+class LogTable final : public QTableView {
+public:
+    struct Handlers {
+        std::function<void(QKeyEvent&)> keyDown;
+        /// Selected rows are dragged.
+        std::function<void()> drag;
+    };
+
+    explicit LogTable(QWidget* parent);
+
+    void setHandlers(Handlers handlers) { handlers_ = std::move(handlers); }
+    /// Selected rows can be dragged out of the log.
+    void setDraggable(bool isDraggable) { isDraggable_ = isDraggable; }
+    /// What a table does with a key that nobody else wants.
+    void handleKey(QKeyEvent& event) { QTableView::keyPressEvent(&event); }
+
+protected:
+    void keyPressEvent(QKeyEvent* event) override;
+    void mousePressEvent(QMouseEvent* event) override;
+    void startDrag(Qt::DropActions supported) override;
+    void changeEvent(QEvent* event) override;
+
+private:
+    void adoptFont();
+
+    Handlers handlers_;
+    bool isDraggable_ = true;
+};
+
+}  // namespace orvane::desktop

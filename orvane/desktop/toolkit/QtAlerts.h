@@ -1,0 +1,37 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/toolkit/Alert.h"
+
+#include <QPointer>
+#include <QWidget>
+
+#include <functional>
+#include <memory>
+#include <string>
+
+namespace orvane::desktop {
+
+/// Alerts as sheets: modal for their window alone, with plain text only.
+class QtAlerts final : public fixwell::Alerts {
+public:
+    /// `errorText` explains an error code.
+    explicit QtAlerts(std::function<std::string(std::int32_t)> errorText)
+        : errorText_(std::move(errorText))
+    {
+    }
+
+    /// The window that sheets are shown on, whichever window a module names.
+    void setWindow(QWidget* window) { window_ = window; }
+
+    std::shared_ptr<fixwell::Alert> makeAlert(const fixwell::Alert::Text& text) override;
+    /// Returns at once; the sheet goes away with its button.
+    void simpleModuleAlert(const std::string& title, const std::string& message,
+                           std::int32_t error) override;
+
+private:
+    std::function<std::string(std::int32_t)> errorText_;
+    QPointer<QWidget> window_;
+};
+
+}  // namespace orvane::desktop

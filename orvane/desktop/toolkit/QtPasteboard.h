@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/toolkit/Pasteboard.h"
+
+#include <QMimeData>
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace orvane::desktop {
+
+/// Collects what a module puts on a pasteboard as MIME data: text/plain,
+/// text/tab-separated-values, text/rtf and application/rtf, application/x-rtfd.
+class MimePasteboard : public fixwell::Pasteboard {
+public:
+    void declareTypes(const std::vector<fixwell::PasteboardType>& types,
+                      const void* owner) override;
+    void setData(std::string_view data, fixwell::PasteboardType type) override;
+
+    /// What was collected; none when nothing was declared since the last call.
+    std::unique_ptr<QMimeData> take() { return std::move(data_); }
+
+protected:
+    /// The last one of the declared types has got its data.
+    virtual void isComplete(QMimeData& /*data*/) {}
+
+private:
+    std::unique_ptr<QMimeData> data_;
+    std::vector<fixwell::PasteboardType> missing_;
+};
+
+/// The clipboard. Everything that was declared goes there together.
+class QtPasteboard final : public MimePasteboard {
+public:
+    using HTMLSource = std::function<std::string()>;
+
+    /// Asked for an HTML version of what is copied; an empty answer is none.
+    void setHTMLSource(HTMLSource source) { html_ = std::move(source); }
+
+private:
+    void isComplete(QMimeData& data) override;
+
+    HTMLSource html_;
+};
+
+}  // namespace orvane::desktop

@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/StyledText.h"
+
+#include <QFontMetricsF>
+#include <QPainter>
+#include <QPalette>
+#include <QString>
+
+#include <vector>
+
+namespace orvane::desktop {
+
+/// A styled text as one line: what a row of the log shows.
+struct StyledLine {
+    struct Run {
+        qsizetype length;
+        const fixwell::TextStyle* style;
+    };
+
+    QString text;
+    std::vector<Run> runs;
+    fixwell::LineBreak lineBreak = fixwell::LineBreak::Clip;
+};
+
+/// Line ends at the end are dropped, others become spaces; control characters become U+FFFD.
+/// Of a text too long for any screen the middle is left out.
+StyledLine oneLine(const fixwell::StyledText& text);
+
+/// The line with an ellipsis where its paragraph style wants it, when it is wider than `width`.
+/// The measure is `metrics`; take those of the widest font in the line.
+StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double width);
+
+/// How a line is put on a screen or on paper.
+struct LineLooks {
+    double fontScale = 1;         ///< of the points of the text
+    fixwell::Font defaultFont;    ///< for runs that name none
+    QColor textColor;             ///< for runs that name none
+    QColor background;            ///< colours are made readable on it
+    bool keepsTextColor = false;  ///< as for selected rows: `textColor` for everything
+};
+
+/// The font that the line's widest run has.
+QFont widestFont(const StyledLine& line, const LineLooks& looks);
+/// Fits the line into the rectangle and draws it, centred vertically.
+void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks);
+
+}  // namespace orvane::desktop

@@ -1,0 +1,29 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/StyledText.h"
+
+#include <QString>
+
+#include <string>
+#include <string_view>
+
+namespace orvane::desktop {
+
+/// UTF-8 for Qt; what is no UTF-8 becomes U+FFFD. Nothing is interpreted: show it where the text
+/// format is Qt::PlainText.
+QString toQt(std::string_view text);
+std::string fromQt(const QString& text);
+
+/// A title for a button or menu, where Qt takes an ampersand for the mark of a shortcut.
+QString toQtTitle(std::string_view title);
+
+/// A tool tip. Qt guesses whether a tool tip is HTML, so this is HTML with everything escaped and
+/// with its line ends kept; long lines are wrapped.
+QString toQtToolTip(std::string_view text);
+
+/// The text as a fragment of HTML, everything escaped: bold, colour and size (in points,
+/// multiplied by `fontScale`) of each run, and one paragraph for each line.
+std::string html(const fixwell::StyledText& text, double fontScale = 1);
+
+}  // namespace orvane::desktop

@@ -1,0 +1,31 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/window/LastCheck.h"
+#include "orvane/support/texts/Translator.h"
+
+#include <QString>
+
+namespace orvane::desktop {
+
+/// The columns of the disk list.
+enum class DiskColumn { Name, Size, Format, MountPoint, Verdict, LastCheck };
+inline constexpr int diskColumnCount = 6;
+
+/// What the disk list says about one disk, beside its name. A bare image file and the volume that
+/// fills it are one row.
+struct DiskRow {
+    DiskFacts facts;
+    std::string filesystem;
+    std::optional<LastCheck> lastCheck;
+};
+
+/// One line, fit to be shown; empty where there is nothing to say.
+[[nodiscard]] QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts);
+[[nodiscard]] QString columnTitle(DiskColumn column, const Translator& texts);
+/// Everything there is to say, on several lines of plain text.
+[[nodiscard]] QString rowToolTip(const DiskRow& row, const Translator& texts);
+/// The library's verdict in the user's language.
+[[nodiscard]] QString verdictText(const LastCheck& check, const Translator& texts);
+
+}  // namespace orvane::desktop

@@ -1,0 +1,101 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/window/MainWindow.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QApplication>
+#include <QCloseEvent>
+#include <QDropEvent>
+#include <QMimeData>
+#include <QTimer>
+#include <QUrl>
+#include <QVBoxLayout>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr QSize firstSize{1120, 720};
+
+std::vector<std::filesystem::path> localFiles(const QMimeData* data)
+{
+    std::vector<std::filesystem::path> files;
+    for (const QUrl& url : data->urls())
+        if (url.isLocalFile())
+            files.emplace_back(url.toLocalFile().toLocal8Bit().toStdString());
+    return files;
+}
+
+}  // namespace
+
+MainWindow::MainWindow(const Translator& texts)
+    : disks_(new DiskList(texts)),
+      tabs_(new QTabWidget),
+      splitter_(new QSplitter(Qt::Horizontal)),
+      progress_(new ProgressArea(toQt(texts.text("Progress")), this))
+{
+    setObjectName(QStringLiteral("mainWindow"));
+    setWindowTitle(QStringLiteral("Orvane"));
+    setAcceptDrops(true);
+    resize(firstSize);
+
+    tabs_->setDocumentMode(true);
+    splitter_->addWidget(disks_);
+    splitter_->addWidget(tabs_);
+    splitter_->setChildrenCollapsible(false);
+    splitter_->setStretchFactor(0, 2);
+    splitter_->setStretchFactor(1, 3);
+    splitter_->setSizes({460, 660});
+
+    auto* const content = new QWidget(this);
+    auto* const layout = new QVBoxLayout(content);
+    layout->setContentsMargins(0, 0, 0, 0);
+    layout->setSpacing(0);
+    layout->addWidget(splitter_, 1);
+    layout->addWidget(progress_);
+    setCentralWidget(content);
+
+    connect(tabs_, &QTabWidget::currentChanged, this, [this] {
+        if (events_.tabChanged)
+            events_.tabChanged();
+    });
+}
+
+bool MainWindow::hasAttention() const
+{
+    const QWidget* const sheet = QApplication::activeModalWidget();
+    return isActiveWindow() || (sheet != nullptr && sheet->parentWidget() != nullptr &&
+                                sheet->parentWidget()->window() == this);
+}
+
+void MainWindow::closeEvent(QCloseEvent* event)
+{
+    event->setAccepted(!events_.mayClose || events_.mayClose());
+}
+
+void MainWindow::dragEnterEvent(QDragEnterEvent* event)
+{
+    if (events_.canOpenFiles && events_.canOpenFiles() && !localFiles(event->mimeData()).empty())
+        event->acceptProposedAction();
+}
+
+void MainWindow::dropEvent(QDropEvent* event)
+{
+    if (!events_.canOpenFiles || !events_.canOpenFiles())
+        return;
+    event->acceptProposedAction();
+    events_.filesDropped(localFiles(event->mimeData()));
+}
+
+void MainWindow::paintEvent(QPaintEvent* event)
+{
+    QMainWindow::paintEvent(event);
+    if (std::exchange(hasAppeared_, true))
+        return;
+    // Behind the rest of this painting, and behind its way to the screen.
+    QTimer::singleShot(0, this, [this] {
+        if (events_.appeared)
+            events_.appeared();
+    });
+}
+
+}  // namespace orvane::desktop

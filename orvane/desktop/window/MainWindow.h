@@ -1,0 +1,60 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/window/DiskList.h"
+#include "orvane/desktop/window/ProgressArea.h"
+
+#include <QMainWindow>
+#include <QSplitter>
+#include <QTabWidget>
+
+#include <filesystem>
+#include <functional>
+#include <vector>
+
+namespace orvane::desktop {
+
+/// The host's window: the disks on the left, the modules' tabs on the right, progress below.
+/// Knows how they lie, not what they do. Main thread.
+class MainWindow final : public QMainWindow {
+public:
+    struct Events {
+        /// NO keeps the window open.
+        std::function<bool()> mayClose;
+        /// Files were dropped on the window; asked before, with `canOpenFiles`.
+        std::function<void(const std::vector<std::filesystem::path>&)> filesDropped;
+        std::function<bool()> canOpenFiles;
+        /// Another tab is shown.
+        std::function<void()> tabChanged;
+        /// The window was painted for the first time.
+        std::function<void()> appeared;
+    };
+
+    /// `texts` must outlive the window.
+    explicit MainWindow(const Translator& texts);
+    void setEvents(Events events) { events_ = std::move(events); }
+
+    DiskList& disks() { return *disks_; }
+    QTabWidget& tabs() { return *tabs_; }
+    QSplitter& splitter() { return *splitter_; }
+    ProgressArea& progress() { return *progress_; }
+
+    /// The user's attention is here, or on a sheet of this window.
+    bool hasAttention() const;
+
+protected:
+    void closeEvent(QCloseEvent* event) override;
+    void dragEnterEvent(QDragEnterEvent* event) override;
+    void dropEvent(QDropEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
+
+private:
+    Events events_;
+    DiskList* disks_;
+    QTabWidget* tabs_;
+    QSplitter* splitter_;
+    ProgressArea* progress_;
+    bool hasAppeared_ = false;
+};
+
+}  // namespace orvane::desktop

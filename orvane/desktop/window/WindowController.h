@@ -1,0 +1,46 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/support/OVWindowController.h"
+#include "fixwell/host/toolkit/Control.h"
+#include "orvane/desktop/window/MainWindow.h"
+
+#include <functional>
+
+namespace orvane::desktop {
+
+/// What the modules see of the window. Main thread; the window must outlive it.
+class WindowController final : public fixwell::OVWindowController, public fixwell::Window {
+public:
+    struct Events {
+        std::function<void(bool isLocked)> lockChanged;
+        std::function<void(const fixwell::Dictionary& report)> completed;
+    };
+
+    explicit WindowController(MainWindow& window) : window_(window) {}
+    void setEvents(Events events) { events_ = std::move(events); }
+
+    std::vector<fixwell::OVDiskPointer> allSelectedItemsFilterDuplicates(
+        bool flag, bool filtersDuplicates) override;
+    void setInterfaceLock() override { setLocked(true); }
+    void resetInterfaceLock() override { setLocked(false); }
+    bool interfaceLock() const override { return isLocked_; }
+    void activateGlobalProgressBar(bool isActive) override;
+    void activateGlobalProgressText(bool isActive) override;
+    void setGlobalProgressBarIndeterminate(bool isIndeterminate) override;
+    /// The bar moves by itself whenever there is no telling how far a job is.
+    void startGlobalProgressBarAnimation(const void* /*sender*/) override {}
+    void setGlobalProgressBarValue(double percent) override;
+    void setGlobalProgressText(std::string_view text) override;
+    void notifyWindowOfCompletion(const fixwell::Dictionary& report) override;
+    bool isMainWindow() const override { return window_.hasAttention(); }
+
+private:
+    void setLocked(bool isLocked);
+
+    MainWindow& window_;
+    Events events_;
+    bool isLocked_ = false;
+};
+
+}  // namespace orvane::desktop
