@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobScript.h"
 
+#include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -110,7 +111,12 @@ std::optional<Outcome> JobScript::objectionToSize()
 
 JobScript::State JobScript::verify()
 {
-    return end(outcomeOfVerification(judge(runOnce(Access::ReadOnly))));
+    const RunEvidence evidence = runOnce(Access::ReadOnly);
+    const Judgement judgement = judge(evidence);
+    if (judgement.verdict == Verdict::Damaged && !volume_.isCutShort())
+        for (const std::string_view meaning : meaningOf(evidence.findings.damage))
+            log_.remark(texts_.text(meaning));
+    return end(outcomeOfVerification(judgement));
 }
 
 JobScript::State JobScript::repair()

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/E2fsckOutput.h"
 
+#include "pellar/tools/E2fsckDamage.h"
+
 #include <algorithm>
 #include <array>
 #include <charconv>
@@ -165,8 +167,10 @@ bool E2fsckOutput::readTrouble(std::string_view line)
         findings_.crashSignal = signal;
     findings_.foundDiskInUse = findings_.foundDiskInUse || isInUse;
     findings_.lacksExternalJournal = findings_.lacksExternalJournal || lacksJournal;
-    if (line.starts_with("e2fsck: Superblock invalid, "))
+    if (line.starts_with("e2fsck: Superblock invalid, ")) {
         ++findings_.problems;
+        findings_.damage.add(Damage::Structure);
+    }
     return signal != 0 || isInUse || lacksJournal || line.starts_with("e2fsck: ") ||
            line.starts_with("ext2fs_");
 }
@@ -193,6 +197,8 @@ void E2fsckOutput::readAnswer(std::string_view line, bool isYes, std::vector<Too
 {
     const bool hasItsText = !isBareAnswer(line) || kept_.empty();
     const bool isProblem = !isSavingOnly(line);
+    if (isProblem)
+        findings_.damage.add(e2fsckDamageOf(hasItsText ? line : std::string_view(kept_.front())));
     releaseKept(hasItsText ? Kind::Detail : Kind::Problem, lines);
     lines.push_back(
         {hasItsText && isProblem ? Kind::Problem : Kind::Detail, std::string(line), {}});

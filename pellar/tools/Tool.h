@@ -3,6 +3,7 @@
 
 #include "pellar/process/Access.h"
 #include "pellar/process/ProcessRunner.h"
+#include "pellar/tools/Damage.h"
 #include "pellar/tools/Judgement.h"
 
 #include <cstdint>
@@ -33,6 +34,7 @@ struct ToolLine {
 /// What the lines of one run say together.
 struct Findings {
     std::uint64_t problems = 0;     ///< problem lines
+    Damage damage;                  ///< what they mean together
     std::uint64_t corrections = 0;  ///< of these, answered with yes
     bool isComplete = false;        ///< the line that ends a full run was printed
     bool wasModified = false;

@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include <cstdint>
+
+namespace pellar {
+
+/// Kinds of damage, by what they mean to the owner of the files; a set of them.
+class Damage {
+public:
+    enum Kind : std::uint8_t {
+        Bookkeeping = 1,   ///< counts and maps that follow from the rest
+        LostPlaces = 2,    ///< files and directories that nothing names any more
+        Contents = 4,      ///< files or directories with parts that make no sense
+        SharedBlocks = 8,  ///< two files lay claim to one place on the disk
+        Structure = 16,    ///< what the file system itself is built on
+    };
+
+    constexpr Damage() = default;
+    constexpr Damage(Kind kind) : kinds_(kind) {}
+
+    constexpr bool has(Kind kind) const { return (kinds_ & kind) != 0; }
+    constexpr bool isNothing() const { return kinds_ == 0; }
+    constexpr bool isOnly(Kind kind) const { return kinds_ == kind; }
+    constexpr void add(Damage other) { kinds_ = static_cast<std::uint8_t>(kinds_ | other.kinds_); }
+
+    friend constexpr bool operator==(Damage, Damage) = default;
+
+private:
+    std::uint8_t kinds_ = 0;
+};
+
+}  // namespace pellar
