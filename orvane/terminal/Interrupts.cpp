@@ -26,7 +26,7 @@ Interrupts::Interrupts(MainLoop& loop, std::function<void()> interrupted)
     // Output that nobody reads any more must not end a repair in its middle.
     std::signal(SIGPIPE, SIG_IGN);
     const sigset_t signals = endingSignals();
-    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
+    ::pthread_sigmask(SIG_BLOCK, &signals, &before_);
     descriptor_ = FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
     if (descriptor_)
         loop_.watch(descriptor_.get(), POLLIN, [this](short) { take(); });
@@ -36,6 +36,7 @@ Interrupts::~Interrupts()
 {
     if (descriptor_)
         loop_.unwatch(descriptor_.get());
+    ::pthread_sigmask(SIG_SETMASK, &before_, nullptr);
 }
 
 void Interrupts::take()

@@ -3,13 +3,14 @@
 
 #include "orvane/support/loop/MainLoop.h"
 
+#include <csignal>
 #include <functional>
 
 namespace orvane {
 
 /// Turns the signals by which a user or the system ends a program (SIGINT, SIGTERM, SIGHUP) into
-/// calls on the main thread, from this object's making until its end. Made before any thread is
-/// started: the signals stay blocked in all of them.
+/// calls on the main thread, from this object's making until its end. Threads that are started
+/// meanwhile leave the signals alone; none may be running before.
 class Interrupts {
 public:
     /// The loop outlives this object.
@@ -21,6 +22,7 @@ public:
 private:
     void take();
 
+    sigset_t before_{};
     MainLoop& loop_;
     std::function<void()> interrupted_;
     FileDescriptor descriptor_;

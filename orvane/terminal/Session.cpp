@@ -25,7 +25,6 @@ TerminalAlerts::Answer answerFor(const Request& request)
 
 Session::Session(const Request& request, Reporter& reporter)
     : reporter_(reporter),
-      interrupts_(loop_, [this] { interrupt(); }),
       logView_(
           loop_,
           [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
@@ -207,6 +206,8 @@ TerminalButton& Session::button(std::string_view outlet)
 
 void Session::pressAndWait(TerminalButton& button)
 {
+    // Before, an interruption just ends the program: there is nothing yet to be ended in order.
+    const Interrupts interrupts(loop_, [this] { interrupt(); });
     if (!interface_.press(button))
         return;
     loop_.runUntil([this] { return !window_.interfaceLock() && !alerts_.isAsking(); });

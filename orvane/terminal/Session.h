@@ -72,7 +72,6 @@ private:
 
     Reporter& reporter_;
     MainLoop loop_;
-    Interrupts interrupts_;
     DiskNames names_;
     TerminalWindow window_;
     LogView logView_;
