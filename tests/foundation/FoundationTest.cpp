@@ -103,7 +103,7 @@ TEST(Formats, FillPlaceholdersAndNeverReadAnArgument)
              Case{"%%%ld$@", {3}, "%3$@"},
              Case{"100%", {"x"}, "100%"},
              Case{"%q %@", {"x"}, "%q x"},
-             Case{"%@", {std::string("nul\0byte", 8)}, std::string_view("nul\0byte", 8)},
+             Case{"%@", {std::string_view("nul\0byte", 8)}, std::string_view("nul\0byte", 8)},
              Case{"%99999999999999$@", {"x"}, "%99999999999999$@"},
              Case{"%s %@", {1.5, 12}, "1.5 12"},
          })

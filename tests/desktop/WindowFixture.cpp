@@ -1,0 +1,171 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/desktop/WindowFixture.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+#include "tests/support/ToolRun.h"
+
+#include <QAbstractButton>
+#include <QApplication>
+#include <QElapsedTimer>
+#include <QTest>
+
+#include <cstdlib>
+
+namespace orvane::desktop::test {
+
+using orvane::test::runTool;
+
+namespace fs = std::filesystem;
+
+std::string WindowFixture::makeImage(const std::string& name)
+{
+    const std::string image = directory_ / (name + ".img");
+    orvane::test::write(image, "");
+    fs::resize_file(image, 8 << 20);
+    EXPECT_EQ(runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", name, image}), 0);
+    return image;
+}
+
+std::string WindowFixture::makeDamagedImage(const std::string& name)
+{
+    const std::string image = makeImage(name);
+    EXPECT_EQ(runTool({"debugfs", "-w", "-R", "set_super_value free_blocks_count 7", image}), 0);
+    EXPECT_EQ(runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
+    return image;
+}
+
+std::string WindowFixture::makePartitionedImage(const std::string& name)
+{
+    const std::string image = directory_ / (name + ".img");
+    orvane::test::write(image, "");
+    fs::resize_file(image, 24 << 20);
+    EXPECT_EQ(runTool({"sfdisk", "-q", image}, "label: gpt\nstart=2048,size=16384\nsize=16384\n"), 0);
+    EXPECT_EQ(runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "inner", "-E", "offset=1048576",
+                       image, "8192k"}),
+              0);
+    return image;
+}
+
+void WindowFixture::useEndlessTool()
+{
+    const fs::path tool = directory_ / "tools/e2fsck";
+    orvane::test::write(tool, "#!/bin/sh\n"
+                              "trap 'exit 32' INT TERM\n"
+                              "echo 'Pass 1: Checking inodes, blocks, and sizes'\n"
+                              "while :; do sleep 0.05; done\n");
+    fs::permissions(tool, fs::perms::owner_all);
+    ::setenv("FIXWELL_TOOL_PATH", tool.parent_path().c_str(), 1);
+}
+
+void WindowFixture::TearDown()
+{
+    session_.reset();
+    ::unsetenv("FIXWELL_TOOL_PATH");
+}
+
+void WindowFixture::open(const std::vector<std::string>& images)
+{
+    SessionOptions options;
+    options.paths = {directory_ / "config", directory_ / "state", directory_ / "cache",
+                     directory_ / "data"};
+    options.disksToOpen = images;
+    options.scansSystemDisks = false;
+    options.closed = [this] {
+        wasClosed_ = true;
+    };
+    wasClosed_ = false;
+    session_ = std::make_unique<DesktopSession>(std::move(options));
+    session_->show();
+    // An image is known with what is in it.
+    ASSERT_TRUE(waitUntil([&] {
+        return session_->host().sharedDiskController().roots().size() == 2 * images.size();
+    }));
+}
+
+bool WindowFixture::waitUntil(const std::function<bool()>& isDone)
+{
+    constexpr int longestWait = 30'000;  // milliseconds
+    return QTest::qWaitFor(isDone, longestWait);
+}
+
+bool WindowFixture::waitForJob()
+{
+    return waitUntil([this] { return button("verifyDiskButton").title() == "Verify Disk" &&
+                                     button("repairDiskButton").title() == "Repair Disk"; });
+}
+
+QModelIndex WindowFixture::row(const std::string& image)
+{
+    const QAbstractItemModel& model = *window().disks().model();
+    const QModelIndexList found = model.match(model.index(0, 0), Qt::UserRole, toQt(image), 1,
+                                              Qt::MatchExactly | Qt::MatchRecursive);
+    return found.isEmpty() ? QModelIndex() : found.front();
+}
+
+void WindowFixture::select(const std::string& image)
+{
+    const QModelIndex index = row(image);
+    ASSERT_TRUE(index.isValid()) << image;
+    QTest::mouseClick(window().disks().viewport(), Qt::LeftButton, {},
+                      window().disks().visualRect(index).center());
+}
+
+std::string WindowFixture::cell(const std::string& image, DiskColumn column)
+{
+    return fromQt(row(image).siblingAtColumn(static_cast<int>(column)).data().toString());
+}
+
+QtButton& WindowFixture::button(const char* name)
+{
+    return *session_->activeTab()->interface()->button(name);
+}
+
+std::vector<std::string> WindowFixture::logRows()
+{
+    OutlinePeer& peer = *session_->activeTab()->interface()->outlinePeer();
+    peer.flush();
+    const QAbstractItemModel& model = *peer.table().model();
+    std::vector<std::string> rows;
+    for (int row = 0; row < model.rowCount(); ++row)
+        rows.push_back(fromQt(model.index(row, 0).data(Qt::DisplayRole).toString()));
+    return rows;
+}
+
+bool WindowFixture::logHolds(const std::string& text)
+{
+    for (const std::string& row : logRows())
+        if (row.find(text) != std::string::npos)
+            return true;
+    return false;
+}
+
+QAction& WindowFixture::command(const char* name)
+{
+    return *window().findChild<QAction*>(QLatin1String(name));
+}
+
+QMessageBox* WindowFixture::sheet()
+{
+    for (QMessageBox* box : window().findChildren<QMessageBox*>())
+        if (box->isVisible())
+            return box;
+    return nullptr;
+}
+
+void WindowFixture::press(QMessageBox& box, const QString& title)
+{
+    for (QAbstractButton* button : box.buttons())
+        if (button->text().remove(QLatin1Char('&')) == title) {
+            QTest::mouseClick(button, Qt::LeftButton);
+            return;
+        }
+    FAIL() << "the sheet has no button " << fromQt(title);
+}
+
+void WindowFixture::takePicture(const std::string& name)
+{
+    fs::create_directories(SCREENSHOT_DIRECTORY);
+    EXPECT_TRUE(window().grab().save(toQt(SCREENSHOT_DIRECTORY "/" + name + ".png")));
+}
+
+}  // namespace orvane::desktop::test

@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/DesktopSession.h"
+#include "tests/support/TemporaryDirectory.h"
+
+#include <gtest/gtest.h>
+
+#include <QMessageBox>
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace orvane::desktop::test {
+
+/// The real window with the real module, a history of its own, and real images; no disk of the
+/// machine is in its list.
+class WindowFixture : public testing::Test {
+protected:
+    /// An ext4 image of 8 MiB whose label is its name; its file name.
+    std::string makeImage(const std::string& name);
+    std::string makeDamagedImage(const std::string& name);
+    /// Two partitions, the first with an ext4 volume.
+    std::string makePartitionedImage(const std::string& name);
+    /// A checking tool that runs until it is told to end takes the place of e2fsck.
+    void useEndlessTool();
+
+    /// Opens the window, and waits until the images are in the list.
+    void open(const std::vector<std::string>& images);
+    void close() { session_.reset(); }
+
+    /// Lets the event loop run until `isDone`; NO when that takes too long.
+    [[nodiscard]] static bool waitUntil(const std::function<bool()>& isDone);
+    [[nodiscard]] bool waitForJob();
+    void select(const std::string& image);
+    QtButton& button(const char* name);
+    std::vector<std::string> logRows();
+    bool logHolds(const std::string& text);
+    /// What the disk list says about the image.
+    std::string cell(const std::string& image, DiskColumn column);
+    QAction& command(const char* name);
+    /// The sheet that is open; none when there is none.
+    QMessageBox* sheet();
+    static void press(QMessageBox& box, const QString& button);
+    /// Keeps a picture of the window with the build.
+    void takePicture(const std::string& name);
+
+    DesktopSession& session() { return *session_; }
+    MainWindow& window() { return session_->window(); }
+
+    orvane::test::TemporaryDirectory directory_;
+    bool wasClosed_ = false;
+    std::unique_ptr<DesktopSession> session_;
+
+private:
+    void TearDown() override;
+    QModelIndex row(const std::string& image);
+};
+
+}  // namespace orvane::desktop::test

@@ -1,0 +1,193 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/desktop/WindowFixture.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+#include "tests/support/ToolRun.h"
+
+#include <QMimeData>
+#include <QSignalSpy>
+#include <QTest>
+
+namespace orvane::desktop::test {
+namespace {
+
+using WindowTest = WindowFixture;
+
+TEST_F(WindowTest, TheVerifyButtonFindsWhatIsSoundAndWhatIsNot)
+{
+    struct Case {
+        std::string image;
+        std::string verdict;
+        std::string row;
+        bool alerts;
+    };
+    const std::string sound = makeImage("sound");
+    const std::string damaged = makeDamagedImage("damaged");
+    open({sound, damaged});
+    for (const Case& c : {Case{sound, "sound", "appears to be OK", false},
+                          Case{damaged, "damaged", "needs to be repaired", true}}) {
+        select(c.image);
+        EXPECT_EQ(cell(c.image, DiskColumn::Verdict), "") << "before it was checked";
+        button("verifyDiskButton").press();
+        EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
+        EXPECT_FALSE(button("repairDiskButton").isEnabled()) << "another job runs";
+        ASSERT_TRUE(waitForJob());
+        EXPECT_EQ(cell(c.image, DiskColumn::Verdict), c.verdict);
+        EXPECT_NE(cell(c.image, DiskColumn::LastCheck), "");
+        EXPECT_TRUE(logHolds(c.row)) << testing::PrintToString(logRows());
+        takePicture("verified-" + c.verdict);
+        EXPECT_EQ(sheet() != nullptr, c.alerts);
+        if (QMessageBox* const box = sheet()) {
+            EXPECT_NE(fromQt(box->text() + box->informativeText()).find("damaged"),
+                      std::string::npos);
+            box->close();
+        }
+    }
+}
+
+TEST_F(WindowTest, ARepairedDiskIsShownAsRepairedAndThenAsSound)
+{
+    const std::string image = makeDamagedImage("damaged");
+    open({image});
+    select(image);
+    button("repairDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "repaired");
+    EXPECT_EQ(orvane::test::runTool({"e2fsck", "-f", "-n", image}), 0) << "by e2fsck's own word";
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound");
+}
+
+TEST_F(WindowTest, HistoryIsThereAgainAfterARestart)
+{
+    const std::string image = makeImage("sound");
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    const std::vector<std::string> rows = logRows();
+    close();
+    open({image});
+    select(image);
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound");
+    EXPECT_EQ(logRows(), rows);
+}
+
+TEST_F(WindowTest, WhatIsSelectedTogetherIsCheckedTogether)
+{
+    const std::vector<std::string> images{makeImage("one"), makeImage("two"), makeImage("three")};
+    open(images);
+    window().disks().setFocus();
+    command("selectAll").trigger();
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    for (const std::string& image : images)
+        EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound") << image;
+}
+
+TEST_F(WindowTest, AJobCanBeStopped)
+{
+    useEndlessTool();
+    const std::string image = makeImage("sound");
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_TRUE(logHolds("Stopped by user")) << testing::PrintToString(logRows());
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "stopped");
+}
+
+TEST_F(WindowTest, ClosingDuringAJobAsks)
+{
+    useEndlessTool();
+    const std::string image = makeImage("sound");
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
+
+    window().close();
+    ASSERT_NE(sheet(), nullptr);
+    takePicture("closing");
+    press(*sheet(), QStringLiteral("Keep Open"));
+    EXPECT_TRUE(window().isVisible());
+    EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify") << "the job goes on";
+
+    ASSERT_TRUE(waitUntil([&] { return sheet() == nullptr; }));
+    window().close();
+    ASSERT_NE(sheet(), nullptr);
+    press(*sheet(), QStringLiteral("Stop and Quit"));
+    EXPECT_TRUE(waitUntil([&] { return wasClosed_; }));
+    EXPECT_FALSE(window().isVisible());
+}
+
+// As the system asks when it is shut down: nobody is there to answer a question.
+TEST_F(WindowTest, AProgramThatIsToldToEndStopsItsJobUnasked)
+{
+    useEndlessTool();
+    const std::string image = makeImage("sound");
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    session().end();
+    EXPECT_TRUE(waitUntil([&] { return wasClosed_; }));
+    close();
+    ::unsetenv("FIXWELL_TOOL_PATH");
+    open({image});
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "stopped");
+}
+
+TEST_F(WindowTest, AnImageWithPartitionsShowsItsVolumes)
+{
+    const std::string image = makePartitionedImage("partitioned");
+    open({image});
+    const QAbstractItemModel& disks = *window().disks().model();
+    ASSERT_EQ(disks.rowCount(), 1);
+    ASSERT_EQ(disks.rowCount(disks.index(0, 0)), 2);
+    const std::string volume = image + "#1";
+    EXPECT_EQ(cell(volume, DiskColumn::Format), "ext4");
+    select(volume);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(volume, DiskColumn::Verdict), "sound");
+    EXPECT_EQ(disks.rowCount(disks.index(0, 0)), 2) << "they stay after the job";
+
+    command("eject").trigger();
+    EXPECT_EQ(disks.rowCount(), 0);
+    EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "nothing is selected any more";
+}
+
+TEST_F(WindowTest, WhatCannotBeOpenedIsSaidInOneSheet)
+{
+    const std::string image = makeImage("sound");
+    const std::string missing = directory_ / "<b>missing</b>.img";
+    open({image});
+    QMimeData files;
+    files.setUrls({QUrl::fromLocalFile(toQt(missing)), QUrl::fromLocalFile(QStringLiteral("/dev/null"))});
+    QDropEvent drop({10, 10}, Qt::CopyAction, &files, Qt::LeftButton, {});
+    QCoreApplication::sendEvent(&window(), &drop);
+    ASSERT_NE(sheet(), nullptr);
+    const std::string text = fromQt(sheet()->text() + sheet()->informativeText());
+    EXPECT_NE(text.find("<b>missing</b>.img"), std::string::npos) << text;
+    EXPECT_NE(text.find("/dev/null"), std::string::npos) << text;
+    takePicture("not-opened");
+}
+
+TEST_F(WindowTest, TheWindowStandsWhereItStood)
+{
+    open({});
+    window().resize(900, 650);
+    window().splitter().setSizes({300, 600});
+    const QList<int> sizes = window().splitter().sizes();
+    window().close();
+    close();
+    open({});
+    EXPECT_EQ(window().size(), QSize(900, 650));
+    EXPECT_EQ(window().splitter().sizes(), sizes);
+}
+
+}  // namespace
+}  // namespace orvane::desktop::test
