@@ -62,7 +62,8 @@ void QtLoop::post(Task task)
         mustWake = !std::exchange(isWakeupPending_, true);
     }
     if (mustWake)
-        QMetaObject::invokeMethod(&receiver_, [this] { runTurn(); }, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(
+            &receiver_, [this] { runTurn(); }, Qt::QueuedConnection);
 }
 
 void QtLoop::runTurn()
@@ -72,7 +73,7 @@ void QtLoop::runTurn()
     const Clock::time_point end = Clock::now() + longestTurn;
     while (runNextTask() && Clock::now() < end) {
     }
-    if (hasTasks())
+    if (mustGoOn())
         nextTurn_.start();
     else
         nextTurn_.stop();
@@ -93,6 +94,12 @@ bool QtLoop::runNextTask()
 }
 
 bool QtLoop::hasTasks()
+{
+    const std::lock_guard guard(lock_);
+    return !tasks_.empty();
+}
+
+bool QtLoop::mustGoOn()
 {
     const std::lock_guard guard(lock_);
     isWakeupPending_ = !tasks_.empty();

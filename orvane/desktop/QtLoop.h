@@ -30,11 +30,13 @@ public:
     void performOnMainThread(Task task, Wait wait) override;
     void scheduleTimer(std::chrono::duration<double> delay, Task task) override;
     void post(Task task) override;
+    /// Any thread.
+    bool hasTasks();
 
 private:
     void runTurn();
     bool runNextTask();
-    bool hasTasks();
+    bool mustGoOn();
 
     std::mutex lock_;
     std::deque<Task> tasks_;        ///< guarded by the lock

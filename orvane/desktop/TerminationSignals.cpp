@@ -12,11 +12,11 @@ namespace {
 
 sigset_t endingSignals()
 {
-    sigset_t signals;
-    sigemptyset(&signals);
+    sigset_t ending;
+    sigemptyset(&ending);
     for (const int number : {SIGINT, SIGTERM, SIGHUP})
-        sigaddset(&signals, number);
-    return signals;
+        sigaddset(&ending, number);
+    return ending;
 }
 
 }  // namespace
@@ -25,9 +25,9 @@ TerminationSignals::TerminationSignals()
 {
     // Output that nobody reads any more must not end a repair in its middle.
     std::signal(SIGPIPE, SIG_IGN);
-    const sigset_t signals = endingSignals();
-    ::pthread_sigmask(SIG_BLOCK, &signals, nullptr);
-    descriptor_ = FileDescriptor(::signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK));
+    const sigset_t ending = endingSignals();
+    ::pthread_sigmask(SIG_BLOCK, &ending, nullptr);
+    descriptor_ = FileDescriptor(::signalfd(-1, &ending, SFD_CLOEXEC | SFD_NONBLOCK));
 }
 
 void TerminationSignals::watch(std::function<void()> received)

@@ -15,6 +15,7 @@ using fixwell::Dictionary;
 using fixwell::LinePhrase;
 using fixwell::Name;
 
+constexpr int errorLevel = -1;  // always shown, as a heading is
 constexpr int mainLevel = 0;
 constexpr int detailLevel = 2;
 
@@ -100,14 +101,14 @@ void JobLog::detail(std::string_view line)
 void JobLog::problem(std::string_view line)
 {
     if (problems_.admits(line))
-        add(message(fixwell::kFsckError, fixwell::printable(line), mainLevel));
+        add(message(fixwell::kFsckError, fixwell::printable(line), errorLevel));
     else
         detail(line);
 }
 
 void JobLog::error(const Sentence& sentence)
 {
-    add(message(fixwell::kFsckError, text(sentence), mainLevel));
+    add(message(fixwell::kFsckError, text(sentence), errorLevel));
 }
 
 void JobLog::remark(std::string_view text)

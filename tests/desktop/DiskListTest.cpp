@@ -41,8 +41,8 @@ protected:
 
     Translator texts_;
     Notifications center_;
-    DiskController controller_{center_, {[](std::string_view) { return FilesystemCapabilities(); },
-                                         nullptr}};
+    DiskController controller_{
+        center_, {[](std::string_view) { return FilesystemCapabilities(); }, nullptr}};
     DiskTreeModel model_{controller_, [](const Disk&) { return std::optional<LastCheck>(); },
                          texts_};
     DiskList list_{texts_};
@@ -50,7 +50,8 @@ protected:
 
 TEST_F(DiskListTest, FollowsDisksThatComeGoAndChange)
 {
-    const QAbstractItemModelTester tester(&model_, QAbstractItemModelTester::FailureReportingMode::Fatal);
+    const QAbstractItemModelTester tester(&model_,
+                                          QAbstractItemModelTester::FailureReportingMode::Fatal);
     list_.show(model_, [] {});
     struct Case {
         std::vector<DiskTree> disks;
@@ -61,7 +62,8 @@ TEST_F(DiskListTest, FollowsDisksThatComeGoAndChange)
              Case{{disk("a", {disk("a1"), disk("a2")})}, "a\n a1\n a2\n", "the first disk"},
              Case{{disk("a", {disk("a1"), disk("a2")}), disk("b")}, "a\n a1\n a2\nb\n", "one more"},
              Case{{disk("a", {disk("a2")}), disk("b")}, "a\n a2\nb\n", "a partition was deleted"},
-             Case{{disk("b"), disk("a", {disk("a0"), disk("a2")})}, "a\n a0\n a2\nb\n",
+             Case{{disk("b"), disk("a", {disk("a0"), disk("a2")})},
+                  "a\n a0\n a2\nb\n",
                   "one was made before it"},
              Case{{disk("b")}, "b\n", "a disk with partitions was taken out"},
              Case{{}, "", "all are gone"},

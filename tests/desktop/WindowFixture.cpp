@@ -39,7 +39,8 @@ std::string WindowFixture::makePartitionedImage(const std::string& name)
     const std::string image = directory_ / (name + ".img");
     orvane::test::write(image, "");
     fs::resize_file(image, 24 << 20);
-    EXPECT_EQ(runTool({"sfdisk", "-q", image}, "label: gpt\nstart=2048,size=16384\nsize=16384\n"), 0);
+    EXPECT_EQ(runTool({"sfdisk", "-q", image}, "label: gpt\nstart=2048,size=16384\nsize=16384\n"),
+              0);
     EXPECT_EQ(runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "inner", "-E", "offset=1048576",
                        image, "8192k"}),
               0);
@@ -49,10 +50,11 @@ std::string WindowFixture::makePartitionedImage(const std::string& name)
 void WindowFixture::useEndlessTool()
 {
     const fs::path tool = directory_ / "tools/e2fsck";
-    orvane::test::write(tool, "#!/bin/sh\n"
-                              "trap 'exit 32' INT TERM\n"
-                              "echo 'Pass 1: Checking inodes, blocks, and sizes'\n"
-                              "while :; do sleep 0.05; done\n");
+    orvane::test::write(tool,
+                        "#!/bin/sh\n"
+                        "trap 'exit 32' INT TERM\n"
+                        "echo 'Pass 1: Checking inodes, blocks, and sizes'\n"
+                        "while :; do sleep 0.05; done\n");
     fs::permissions(tool, fs::perms::owner_all);
     ::setenv("FIXWELL_TOOL_PATH", tool.parent_path().c_str(), 1);
 }
@@ -90,8 +92,10 @@ bool WindowFixture::waitUntil(const std::function<bool()>& isDone)
 
 bool WindowFixture::waitForJob()
 {
-    return waitUntil([this] { return button("verifyDiskButton").title() == "Verify Disk" &&
-                                     button("repairDiskButton").title() == "Repair Disk"; });
+    return waitUntil([this] {
+        return button("verifyDiskButton").title() == "Verify Disk" &&
+               button("repairDiskButton").title() == "Repair Disk";
+    });
 }
 
 QModelIndex WindowFixture::row(const std::string& image)

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/desktop/toolkit/LogModel.h"
-
 #include <QStyledItemDelegate>
 
 namespace orvane::desktop {
@@ -11,17 +9,11 @@ namespace orvane::desktop {
 /// gives, in colours that are readable on the desktop's palette.
 class LogDelegate final : public QStyledItemDelegate {
 public:
-    /// The model is the one of the view, and outlives this object.
-    LogDelegate(const LogModel& model, QObject* parent)
-        : QStyledItemDelegate(parent), model_(model)
-    {
-    }
+    /// For views of a LogModel.
+    using QStyledItemDelegate::QStyledItemDelegate;
 
     void paint(QPainter* painter, const QStyleOptionViewItem& option,
                const QModelIndex& index) const override;
-
-private:
-    const LogModel& model_;
 };
 
 }  // namespace orvane::desktop

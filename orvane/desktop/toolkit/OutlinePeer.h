@@ -6,6 +6,8 @@
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/QtScroller.h"
 
+#include <QPointer>
+
 #include <functional>
 #include <optional>
 
@@ -26,7 +28,7 @@ public:
     void setView(fixwell::OutlineView* view);
     /// Shows what is waiting.
     void flush();
-    LogTable& table() { return table_; }
+    LogTable& table() { return *table_; }
     /// The selected rows as HTML, for the pasteboard.
     std::string selectionHTML() const;
 
@@ -43,8 +45,8 @@ public:
     void selectAll() override;
     void setNeedsDisplay(bool needsDisplay) override;
     void setNeedsDisplayInRect(const fixwell::Rect& rect) override;
-    void setEnabled(bool isEnabled) override { table_.setEnabled(isEnabled); }
-    bool isEnabled() const override { return table_.isEnabled(); }
+    void setEnabled(bool isEnabled) override { table_->setEnabled(isEnabled); }
+    bool isEnabled() const override { return table_->isEnabled(); }
     void setToolTip(std::string_view text) override;
     /// The log has no levels to indent.
     void setIndentationPerLevel(double /*points*/) override {}
@@ -56,7 +58,7 @@ private:
     void sendKey(QKeyEvent& event);
     void drag();
 
-    LogTable& table_;
+    QPointer<LogTable> table_;
     std::function<void()> beforeRows_;
     LogModel model_;
     QtScroller scroller_;

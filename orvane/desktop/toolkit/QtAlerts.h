@@ -30,6 +30,8 @@ public:
                            std::int32_t error) override;
 
 private:
+    class Sheet;
+
     std::function<std::string(std::int32_t)> errorText_;
     QPointer<QWidget> window_;
 };

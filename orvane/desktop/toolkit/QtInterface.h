@@ -19,7 +19,8 @@
 
 namespace orvane::desktop {
 
-/// The controls of one module. They can be used until the module has been disconnected.
+/// The controls of one module. The loader keeps them, without a module behind them when it has
+/// gone.
 class LoadedInterface {
 public:
     /// `root` is the widget that the interface file describes; this object owns it, wherever it
@@ -30,7 +31,7 @@ public:
     LoadedInterface& operator=(const LoadedInterface&) = delete;
     ~LoadedInterface();
 
-    /// To be put in the window.
+    /// To be put in the window; it can be used as long as this object.
     QWidget& widget() { return *root_; }
     /// None when the file has no button of that name.
     QtButton* button(std::string_view name);

@@ -25,7 +25,7 @@ public:
 
 protected:
     /// The last one of the declared types has got its data.
-    virtual void isComplete(QMimeData& /*data*/) {}
+    virtual void becameComplete() {}
 
 private:
     std::unique_ptr<QMimeData> data_;
@@ -41,7 +41,7 @@ public:
     void setHTMLSource(HTMLSource source) { html_ = std::move(source); }
 
 private:
-    void isComplete(QMimeData& data) override;
+    void becameComplete() override;
 
     HTMLSource html_;
 };

@@ -9,7 +9,7 @@
 
 namespace orvane::desktop {
 
-/// From the desktop's theme, or the style's own where that has none.
+/// By the kind of disk.
 [[nodiscard]] QIcon diskIcon(const DiskFacts& facts);
 
 /// A mark for one of the library's verdicts; the text beside it says the same.

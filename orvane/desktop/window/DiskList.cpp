@@ -28,7 +28,7 @@ void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged
 {
     disks_ = &disks;
     setModel(&disks);
-    constexpr int widths[diskColumnCount] = {190, 80, 64, 100, 100, 120};
+    constexpr int widths[diskColumnCount] = {170, 110, 76, 62, 90, 120};
     for (int column = 0; column < diskColumnCount; ++column)
         setColumnWidth(column, widths[column]);
     // Volumes are what the user is here for.
@@ -53,9 +53,8 @@ std::vector<DiskList::DiskPointer> DiskList::selectedDisks() const
             numbers.insert(numbers.begin(), index.row());
         return numbers;
     };
-    std::sort(rows.begin(), rows.end(), [&](const QModelIndex& a, const QModelIndex& b) {
-        return path(a) < path(b);
-    });
+    std::sort(rows.begin(), rows.end(),
+              [&](const QModelIndex& a, const QModelIndex& b) { return path(a) < path(b); });
     std::vector<DiskPointer> disks;
     for (const QModelIndex& row : rows)
         disks.push_back(disks_->diskAt(row));

@@ -39,8 +39,7 @@ QString sizeText(std::uint64_t bytes)
 {
     if (bytes == 0)
         return {};
-    return QLocale().formattedDataSize(static_cast<qint64>(bytes), 1,
-                                       QLocale::DataSizeIecFormat);
+    return QLocale().formattedDataSize(static_cast<qint64>(bytes), 1, QLocale::DataSizeIecFormat);
 }
 
 QString timeText(const LastCheck& check)
@@ -52,8 +51,7 @@ QString timeText(const LastCheck& check)
 
 QString verdictText(const LastCheck& check, const Translator& texts)
 {
-    return toQt(
-        texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
+    return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
 }
 
 QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts)
@@ -95,16 +93,14 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
     if (!row.filesystem.empty())
         lines.back() += QStringLiteral(", ") + shown(row.filesystem);
     if (!row.facts.mountPoint.empty())
-        lines += toQt(
-            texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
+        lines += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
     if (!row.lastCheck) {
         lines += toQt(texts.text("never checked"));
         return lines.join(QLatin1Char('\n'));
     }
-    lines += toQt(
-        texts.sentence("last checked %@: %@",
-                       {fromQt(timeText(*row.lastCheck)),
-                        fromQt(verdictText(*row.lastCheck, texts))}));
+    lines +=
+        toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(*row.lastCheck)),
+                                                    fromQt(verdictText(*row.lastCheck, texts))}));
     if (!row.lastCheck->message.empty())
         lines += shown(row.lastCheck->message);
     return lines.join(QLatin1Char('\n'));

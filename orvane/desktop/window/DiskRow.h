@@ -9,7 +9,7 @@
 namespace orvane::desktop {
 
 /// The columns of the disk list.
-enum class DiskColumn { Name, Size, Format, MountPoint, Verdict, LastCheck };
+enum class DiskColumn { Name, Verdict, Size, Format, MountPoint, LastCheck };
 inline constexpr int diskColumnCount = 6;
 
 /// What the disk list says about one disk, beside its name. A bare image file and the volume that

@@ -148,9 +148,8 @@ DiskTreeModel::DiskPointer DiskTreeModel::diskAt(const QModelIndex& index) const
 
 QModelIndex DiskTreeModel::indexOf(const Disk& disk) const
 {
-    const QModelIndexList found =
-        match(index(0, 0), Qt::UserRole, toQt(disk.facts().identifier), 1,
-              Qt::MatchExactly | Qt::MatchRecursive | Qt::MatchWrap);
+    const QModelIndexList found = match(index(0, 0), Qt::UserRole, toQt(disk.facts().identifier), 1,
+                                        Qt::MatchExactly | Qt::MatchRecursive | Qt::MatchWrap);
     return found.isEmpty() ? QModelIndex() : found.front();
 }
 

@@ -6,6 +6,7 @@
 #include <QApplication>
 #include <QCloseEvent>
 #include <QDropEvent>
+#include <QFile>
 #include <QMimeData>
 #include <QTimer>
 #include <QUrl>
@@ -21,7 +22,7 @@ std::vector<std::filesystem::path> localFiles(const QMimeData* data)
     std::vector<std::filesystem::path> files;
     for (const QUrl& url : data->urls())
         if (url.isLocalFile())
-            files.emplace_back(url.toLocalFile().toLocal8Bit().toStdString());
+            files.emplace_back(QFile::encodeName(url.toLocalFile()).toStdString());
     return files;
 }
 
@@ -54,17 +55,33 @@ MainWindow::MainWindow(const Translator& texts)
     layout->addWidget(progress_);
     setCentralWidget(content);
 
-    connect(tabs_, &QTabWidget::currentChanged, this, [this] {
-        if (events_.tabChanged)
-            events_.tabChanged();
-    });
+    connect(tabs_, &QTabWidget::currentChanged, this, [this] { tellOfChange(); });
+}
+
+void MainWindow::tellOfChange()
+{
+    hadAttention_ = hasAttention();
+    if (events_.changed)
+        events_.changed();
 }
 
 bool MainWindow::hasAttention() const
 {
-    const QWidget* const sheet = QApplication::activeModalWidget();
-    return isActiveWindow() || (sheet != nullptr && sheet->parentWidget() != nullptr &&
-                                sheet->parentWidget()->window() == this);
+    const QWidget* const active = QApplication::activeWindow();
+    return active == nullptr || active == this ||
+           (active->isModal() && active->parentWidget() != nullptr &&
+            active->parentWidget()->window() == this);
+}
+
+// Which window is the active one is settled only when every window has heard of the change.
+void MainWindow::changeEvent(QEvent* event)
+{
+    QMainWindow::changeEvent(event);
+    if (event->type() == QEvent::ActivationChange)
+        QTimer::singleShot(0, this, [this] {
+            if (hasAttention() != hadAttention_)
+                tellOfChange();
+        });
 }
 
 void MainWindow::closeEvent(QCloseEvent* event)

@@ -24,8 +24,8 @@ public:
         /// Files were dropped on the window; asked before, with `canOpenFiles`.
         std::function<void(const std::vector<std::filesystem::path>&)> filesDropped;
         std::function<bool()> canOpenFiles;
-        /// Another tab is shown.
-        std::function<void()> tabChanged;
+        /// Another tab is shown, or `hasAttention` answers otherwise than before.
+        std::function<void()> changed;
         /// The window was painted for the first time.
         std::function<void()> appeared;
     };
@@ -39,21 +39,27 @@ public:
     QSplitter& splitter() { return *splitter_; }
     ProgressArea& progress() { return *progress_; }
 
-    /// The user's attention is here, or on a sheet of this window.
+    /// The user's attention is here: no other window of this program has it, but for a sheet of
+    /// this one. A window behind another program's keeps it, so that a button is ready when the
+    /// click that brings the window to the front falls on it.
     bool hasAttention() const;
 
 protected:
+    void changeEvent(QEvent* event) override;
     void closeEvent(QCloseEvent* event) override;
     void dragEnterEvent(QDragEnterEvent* event) override;
     void dropEvent(QDropEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
 
 private:
+    void tellOfChange();
+
     Events events_;
     DiskList* disks_;
     QTabWidget* tabs_;
     QSplitter* splitter_;
     ProgressArea* progress_;
+    bool hadAttention_ = true;
     bool hasAppeared_ = false;
 };
 
