@@ -135,7 +135,7 @@ void JobLog::endOfRun()
         Dictionary line = message(fixwell::kFsckError,
                                   texts_.text(isVarious ? "… and %1$@ more problems of other kinds"
                                                         : "… and %1$@ more like “%2$@”"),
-                                  mainLevel);
+                                  errorLevel);
         line.set(fixwell::kFsckParameters,
                  fixwell::Array::of({rest.count, fixwell::printable(rest.kind)}));
         add(std::move(line));
