@@ -53,15 +53,12 @@ void QtLoop::scheduleTimer(std::chrono::duration<double> delay, Task task)
     QTimer::singleShot(wait, Qt::PreciseTimer, &receiver_, std::move(task));
 }
 
+// Woken while the lock is held: who has seen the task in the queue may end the loop.
 void QtLoop::post(Task task)
 {
-    bool mustWake = false;
-    {
-        const std::lock_guard guard(lock_);
-        tasks_.push_back(std::move(task));
-        mustWake = !std::exchange(isWakeupPending_, true);
-    }
-    if (mustWake)
+    const std::lock_guard guard(lock_);
+    tasks_.push_back(std::move(task));
+    if (!std::exchange(isWakeupPending_, true))
         QMetaObject::invokeMethod(
             &receiver_, [this] { runTurn(); }, Qt::QueuedConnection);
 }

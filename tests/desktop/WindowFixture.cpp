@@ -6,7 +6,7 @@
 
 #include <QAbstractButton>
 #include <QApplication>
-#include <QElapsedTimer>
+#include <QPainter>
 #include <QTest>
 
 #include <cstdlib>
@@ -169,7 +169,12 @@ void WindowFixture::press(QMessageBox& box, const QString& title)
 void WindowFixture::takePicture(const std::string& name)
 {
     fs::create_directories(SCREENSHOT_DIRECTORY);
-    EXPECT_TRUE(window().grab().save(toQt(SCREENSHOT_DIRECTORY "/" + name + ".png")));
+    QPixmap picture = window().grab();
+    if (QMessageBox* const box = sheet()) {
+        const QPoint corner = box->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
+        QPainter(&picture).drawPixmap(corner, box->grab());
+    }
+    EXPECT_TRUE(picture.save(toQt(SCREENSHOT_DIRECTORY "/" + name + ".png")));
 }
 
 }  // namespace orvane::desktop::test

@@ -4,8 +4,9 @@
 #include "orvane/desktop/toolkit/Text.h"
 #include "tests/support/ToolRun.h"
 
+#include <QApplication>
+#include <QClipboard>
 #include <QMimeData>
-#include <QSignalSpy>
 #include <QTest>
 
 namespace orvane::desktop::test {
@@ -86,6 +87,29 @@ TEST_F(WindowTest, WhatIsSelectedTogetherIsCheckedTogether)
         EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound") << image;
 }
 
+TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
+{
+    const std::string image = makeImage("a <b>");
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    ASSERT_FALSE(logRows().empty());
+    QApplication::clipboard()->clear();
+    command("copy").trigger();
+    EXPECT_EQ(fromQt(QApplication::clipboard()->text()), "") << "no row is selected";
+    session().activeTab()->interface()->outlinePeer()->table().setFocus();
+    command("selectAll").trigger();
+    command("copy").trigger();
+    const QMimeData& copied = *QApplication::clipboard()->mimeData();
+    EXPECT_NE(fromQt(copied.text()).find("“a <b>” appears to be OK"), std::string::npos);
+    EXPECT_NE(fromQt(copied.html()).find("“a &lt;b&gt;” appears to be OK"), std::string::npos)
+        << fromQt(copied.html());
+    EXPECT_TRUE(copied.hasFormat(QStringLiteral("text/rtf")));
+    command("delete").trigger();
+    EXPECT_TRUE(logRows().empty());
+}
+
 TEST_F(WindowTest, AJobCanBeStopped)
 {
     useEndlessTool();
@@ -131,7 +155,7 @@ TEST_F(WindowTest, AProgramThatIsToldToEndStopsItsJobUnasked)
     open({image});
     select(image);
     button("verifyDiskButton").press();
-    session().end();
+    session().end();  // before the image was even read
     EXPECT_TRUE(waitUntil([&] { return wasClosed_; }));
     close();
     ::unsetenv("FIXWELL_TOOL_PATH");
@@ -167,6 +191,9 @@ TEST_F(WindowTest, WhatCannotBeOpenedIsSaidInOneSheet)
     QMimeData files;
     files.setUrls(
         {QUrl::fromLocalFile(toQt(missing)), QUrl::fromLocalFile(QStringLiteral("/dev/null"))});
+    QDragEnterEvent enter({10, 10}, Qt::CopyAction, &files, Qt::LeftButton, {});
+    QCoreApplication::sendEvent(&window(), &enter);
+    EXPECT_TRUE(enter.isAccepted());
     QDropEvent drop({10, 10}, Qt::CopyAction, &files, Qt::LeftButton, {});
     QCoreApplication::sendEvent(&window(), &drop);
     ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; }));

@@ -1,0 +1,40 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/QtLoop.h"
+#include "orvane/desktop/toolkit/QtAlerts.h"
+#include "orvane/desktop/toolkit/QtEvents.h"
+#include "orvane/desktop/toolkit/QtHelp.h"
+#include "orvane/desktop/toolkit/QtInterface.h"
+#include "orvane/desktop/toolkit/QtPasteboard.h"
+#include "orvane/desktop/toolkit/QtPrinting.h"
+#include "orvane/support/SupportHost.h"
+
+namespace orvane::desktop {
+
+/// The host on a desktop: the shared services, and the toolkit on Qt. Main thread.
+class DesktopHost final : public SupportHost {
+public:
+    /// The loop outlives this object.
+    DesktopHost(SupportOptions options, QtLoop& loop);
+
+    /// The window that sheets are shown on.
+    void setWindow(QWidget* window);
+
+    QtAlerts& alerts() override { return alerts_; }
+    fixwell::Events& events() override { return events_; }
+    QtHelp& sharedHelpManager() override { return help_; }
+    QtInterface& interfaceLoader() override { return interface_; }
+    QtPasteboard& generalPasteboard() override { return pasteboard_; }
+    QtPrinting& printing() override { return printing_; }
+
+private:
+    QtAlerts alerts_;
+    QtEvents events_;
+    QtHelp help_;
+    QtInterface interface_;
+    QtPasteboard pasteboard_;
+    QtPrinting printing_;
+};
+
+}  // namespace orvane::desktop

@@ -1,0 +1,107 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/DesktopHost.h"
+#include "orvane/desktop/DiskScan.h"
+#include "orvane/desktop/ImageOpener.h"
+#include "orvane/desktop/JobLedger.h"
+#include "orvane/desktop/ModuleTab.h"
+#include "orvane/desktop/window/DiskTreeModel.h"
+#include "orvane/desktop/window/MainWindow.h"
+#include "orvane/desktop/window/Menus.h"
+#include "orvane/desktop/window/WindowController.h"
+#include "orvane/support/modules/ModuleSearch.h"
+
+#include <QMessageBox>
+
+#include <functional>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace orvane::desktop {
+
+struct SessionOptions {
+    XDGPaths paths = userXDGPaths();
+    std::vector<std::filesystem::path> moduleDirectories =
+        orvane::moduleDirectories(environmentValue, runningExecutable());
+    std::vector<std::string> disksToOpen;  ///< as orvane/support/disks/DiskLookup.h takes them
+    bool scansSystemDisks = true;
+    std::function<void()> closed;  ///< the window is closed for good
+};
+
+/// One run of the program: the host, the modules and the window, and what the window's commands do
+/// with them. Main thread; one at a time, with the application object there before and after.
+class DesktopSession {
+public:
+    explicit DesktopSession(SessionOptions options);
+    DesktopSession(const DesktopSession&) = delete;
+    DesktopSession& operator=(const DesktopSession&) = delete;
+    ~DesktopSession();
+
+    /// Shows the window; disks are looked for once it is on the screen.
+    void show();
+    /// Ends the program in order, unasked; a job that runs is stopped first. Asked again, the job
+    /// is stopped harder.
+    void end();
+
+    MainWindow& window() { return window_; }
+    DesktopHost& host() { return host_; }
+    /// The tab that is shown; none when there is no module.
+    ModuleTab* activeTab();
+
+private:
+    SupportOptions supportOptions();
+    pellar::ManagerOptions libraryOptions() const;
+    std::optional<LastCheck> lastCheckOf(const Disk& disk);
+    void observeDisks();
+    void connectWindow();
+
+    void loadModules();
+    void addTab(std::unique_ptr<ModuleTab> tab);
+    void updateTabs();
+    void selectionChanged();
+    void windowAppeared();
+
+    std::vector<Menu> menus();
+    void chooseImages();
+    void ejectSelection();
+    bool canEjectSelection();
+    fixwell::OutlineView* log();
+    std::string selectionHTML();
+    bool canEdit(fixwell::Selector action);
+    void selectAll();
+    QtButton* detailsButton();
+
+    bool mayClose();
+    void askWhetherToStop();
+    void stopAndClose();
+    void stopJob();
+    void lockChanged(bool isLocked);
+    void jobBegan();
+
+    void warn(const std::string& sentence);
+    void showWarnings();
+    std::string text(std::string_view key) { return host_.translator().text(key); }
+
+    const SessionOptions options_;
+    std::vector<std::string> warnings_;  ///< not shown yet
+    bool hasAppeared_ = false;
+    bool isEnding_ = false;
+
+    QtLoop loop_;
+    Catalogue hostTexts_;
+    LibraryTexts libraryTexts_;
+    pellar::Manager library_;  ///< answers what the tools can do; runs no jobs
+    DesktopHost host_;
+    MainWindow window_;
+    DiskTreeModel disks_;
+    WindowController controller_;
+    JobLedger jobs_;
+    ImageOpener images_;
+    std::vector<std::unique_ptr<ModuleTab>> tabs_;  ///< in the order of the window's tabs
+    DiskScan scan_;
+    QPointer<QMessageBox> question_;
+};
+
+}  // namespace orvane::desktop

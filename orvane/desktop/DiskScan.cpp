@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/DiskScan.h"
+
+#include "orvane/support/settings/XDGPaths.h"
+
+#include <system_error>
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+std::vector<DiskTree> readDisks()
+{
+    DiskSources sources;
+    sources.homeDirectory = environmentValue("HOME").value_or("");
+    return readSystemDisks(sources);
+}
+
+}  // namespace
+
+DiskScan::~DiskScan()
+{
+    *liveness_ = nullptr;
+}
+
+void DiskScan::start()
+{
+    if (std::exchange(isScanning_, true))
+        return;
+    const auto scan = [&loop = loop_, scan = liveness_] {
+        loop.post([scan, disks = readDisks()] {
+            if (*scan != nullptr)
+                (*scan)->finish(disks);
+        });
+    };
+    try {
+        thread_ = std::jthread(scan);
+    } catch (const std::system_error&) {
+        finish(readDisks());
+    }
+}
+
+void DiskScan::finish(const std::vector<DiskTree>& disks)
+{
+    isScanning_ = false;
+    finished_(disks);
+}
+
+}  // namespace orvane::desktop

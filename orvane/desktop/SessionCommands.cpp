@@ -1,0 +1,138 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the window's menus do.
+
+#include "orvane/desktop/DesktopSession.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QFile>
+#include <QFileDialog>
+
+#include <algorithm>
+
+namespace orvane::desktop {
+
+std::vector<Menu> DesktopSession::menus()
+{
+    const auto isUnlocked = [this] {
+        return !controller_.interfaceLock();
+    };
+    const MenuCommand line{};
+    Menu file{
+        "&File",
+        {{"openImage", "&Open Image…", QKeySequence::Open, [this] { chooseImages(); }, isUnlocked},
+         {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { scan_.start(); }, isUnlocked},
+         {"eject",
+          "&Eject",
+          {},
+          [this] { ejectSelection(); },
+          [this] {
+              return canEjectSelection();
+          }},
+         line,
+         {"print", "&Print…", QKeySequence::Print,
+          [this] { activeTab()->module().printModuleSpecific(&window_); },
+          [this] {
+              return activeTab() != nullptr && activeTab()->module().canPrint();
+          }},
+         line,
+         {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {
+              window_.close();
+          }}}};
+    Menu edit{"&Edit",
+              {{"copy", "&Copy", QKeySequence::Copy, [this] { log()->copy(&window_); },
+                [this] {
+                    return canEdit("copy:");
+                }},
+               {"selectAll", "Select &All", QKeySequence::SelectAll, [this] { selectAll(); },
+                [this] {
+                    return window_.disks().hasFocus() || canEdit("selectAll:");
+                }},
+               // The key itself belongs to the log, which sees it first.
+               {"delete",
+                "&Delete",
+                {},
+                [this] { log()->delete_(&window_); },
+                [this] {
+                    return canEdit("delete:");
+                }}}};
+    Menu view{"&View",
+              {{"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
+                [this] { detailsButton()->press(); },
+                [this] { return detailsButton() != nullptr && detailsButton()->isEnabled(); },
+                [this] {
+                    return detailsButton() != nullptr && detailsButton()->isChecked();
+                }}}};
+    Menu help{"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
+                             host_.sharedHelpManager().openHelpAnchor("");
+                         }}}};
+    return {file, edit, view, help};
+}
+
+void DesktopSession::chooseImages()
+{
+    auto* const dialog = new QFileDialog(&window_, toQt(text("Open Image")));
+    dialog->setAttribute(Qt::WA_DeleteOnClose);
+    dialog->setFileMode(QFileDialog::ExistingFiles);
+    dialog->setNameFilters(
+        {toQt(text("Disk images")) + QStringLiteral(" (*.img *.raw *.iso *.bin)"),
+         toQt(text("All files")) + QStringLiteral(" (*)")});
+    QObject::connect(dialog, &QFileDialog::filesSelected, &window_,
+                     [this](const QStringList& files) {
+                         std::vector<std::string> names;
+                         for (const QString& file : files)
+                             names.push_back(QFile::encodeName(file).toStdString());
+                         images_.open(names);
+                     });
+    dialog->open();
+}
+
+bool DesktopSession::canEjectSelection()
+{
+    const auto disks = window_.disks().selectedDisks();
+    return !controller_.interfaceLock() &&
+           std::any_of(disks.begin(), disks.end(),
+                       [](const auto& disk) { return ImageOpener::canEject(*disk); });
+}
+
+void DesktopSession::ejectSelection()
+{
+    for (const auto& disk : window_.disks().selectedDisks())
+        images_.eject(*disk);
+}
+
+fixwell::OutlineView* DesktopSession::log()
+{
+    ModuleTab* const tab = activeTab();
+    return tab != nullptr && tab->interface() != nullptr ? tab->interface()->outlineView()
+                                                         : nullptr;
+}
+
+std::string DesktopSession::selectionHTML()
+{
+    return log() != nullptr ? activeTab()->interface()->outlinePeer()->selectionHTML()
+                            : std::string();
+}
+
+bool DesktopSession::canEdit(fixwell::Selector action)
+{
+    return log() != nullptr && log()->validateMenuItem({action});
+}
+
+// The list and the log both have rows; the one that the user is in is meant.
+void DesktopSession::selectAll()
+{
+    if (window_.disks().hasFocus())
+        window_.disks().selectAll();
+    else
+        log()->selectAll(&window_);
+}
+
+QtButton* DesktopSession::detailsButton()
+{
+    ModuleTab* const tab = activeTab();
+    return tab != nullptr && tab->interface() != nullptr
+               ? tab->interface()->button("showDetailsButton")
+               : nullptr;
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,106 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/DesktopSession.h"
+#include "orvane/desktop/TerminationSignals.h"
+#include "orvane/support/texts/Language.h"
+
+#include <QApplication>
+#include <QIcon>
+
+#include <cstdio>
+#include <exception>
+#include <optional>
+#include <string_view>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr int exitWrongUsage = 2;
+
+constexpr const char* usage =
+    "Usage: orvane [IMAGE...]\n"
+    "Opens the window for checking and repairing disks, with these disk images in its list.\n"
+    "A device, a mount point, LABEL=... or UUID=... selects that disk.\n"
+    "\n"
+    "  --help       shows this\n"
+    "  --version    shows the version\n"
+    "\n"
+    "“fixwell” does the same in a terminal.\n";
+
+/// What is left of the command line when Qt has taken its own options.
+struct CommandLine {
+    std::vector<std::string> names;
+    std::optional<int> exitStatus;
+};
+
+CommandLine readCommandLine(int argc, char** argv)
+{
+    CommandLine line;
+    bool takesOptions = true;
+    for (int i = 1; i < argc; ++i) {
+        const std::string_view argument = argv[i];
+        if (!takesOptions || !argument.starts_with("-")) {
+            line.names.emplace_back(argument);
+        } else if (argument == "--") {
+            takesOptions = false;
+        } else if (argument == "--help" || argument == "-h") {
+            std::fputs(usage, stdout);
+            return {{}, 0};
+        } else if (argument == "--version") {
+            std::puts("orvane " ORVANE_VERSION);
+            return {{}, 0};
+        } else {
+            std::fprintf(stderr, "orvane: there is no option %s\n%s", argv[i], usage);
+            return {{}, exitWrongUsage};
+        }
+    }
+    return line;
+}
+
+bool asksForText(int argc, char** argv)
+{
+    for (int i = 1; i < argc; ++i)
+        for (const std::string_view option : {"--help", "-h", "--version"})
+            if (argv[i] == option)
+                return true;
+    return false;
+}
+
+int run(int argc, char** argv)
+{
+    adoptUserLocale();
+    // Where there is no display, the application object would end the program.
+    if (asksForText(argc, argv))
+        return readCommandLine(argc, argv).exitStatus.value_or(0);
+    TerminationSignals termination;
+    QApplication application(argc, argv);
+    QApplication::setApplicationName(QStringLiteral("orvane"));
+    QApplication::setApplicationDisplayName(QStringLiteral("Orvane"));
+    QApplication::setDesktopFileName(QStringLiteral("orvane"));
+    QApplication::setWindowIcon(QIcon::fromTheme(QStringLiteral("orvane")));
+    const CommandLine line = readCommandLine(argc, argv);
+    if (line.exitStatus)
+        return *line.exitStatus;
+
+    SessionOptions options;
+    options.disksToOpen = line.names;
+    options.closed = [] {
+        QCoreApplication::exit();
+    };
+    DesktopSession session(std::move(options));
+    termination.watch([&session] { session.end(); });
+    session.show();
+    return QApplication::exec();
+}
+
+}  // namespace
+}  // namespace orvane::desktop
+
+int main(int argc, char** argv)
+{
+    try {
+        return orvane::desktop::run(argc, argv);
+    } catch (const std::exception& error) {
+        std::fprintf(stderr, "orvane: unexpected failure: %s\n", error.what());
+        return 1;
+    }
+}

@@ -1,0 +1,72 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/LogTable.h"
+
+#include <QEvent>
+#include <QFontMetrics>
+#include <QHeaderView>
+#include <QMouseEvent>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr int spaceBetweenRows = 2;  // pixels
+
+}  // namespace
+
+LogTable::LogTable(QWidget* parent) : QTableView(parent)
+{
+    horizontalHeader()->hide();
+    horizontalHeader()->setStretchLastSection(true);
+    verticalHeader()->hide();
+    verticalHeader()->setSectionResizeMode(QHeaderView::Fixed);
+    verticalHeader()->setMinimumSectionSize(1);
+    setShowGrid(false);
+    setWordWrap(false);
+    setCornerButtonEnabled(false);
+    setTabKeyNavigation(false);
+    setEditTriggers(NoEditTriggers);
+    setSelectionBehavior(SelectRows);
+    setSelectionMode(ExtendedSelection);
+    setVerticalScrollMode(ScrollPerPixel);
+    setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
+    setAcceptDrops(false);
+    adoptFont();
+}
+
+void LogTable::keyPressEvent(QKeyEvent* event)
+{
+    if (handlers_.keyDown)
+        handlers_.keyDown(*event);
+    else
+        handleKey(*event);
+}
+
+// Dragging a selected row drags the selection; dragging any other selects rows.
+void LogTable::mousePressEvent(QMouseEvent* event)
+{
+    const QModelIndex index = indexAt(event->position().toPoint());
+    setDragEnabled(isDraggable_ && index.isValid() && selectionModel()->isSelected(index));
+    QTableView::mousePressEvent(event);
+}
+
+void LogTable::startDrag(Qt::DropActions /*supported*/)
+{
+    if (handlers_.drag)
+        handlers_.drag();
+}
+
+void LogTable::changeEvent(QEvent* event)
+{
+    QTableView::changeEvent(event);
+    if (event->type() == QEvent::FontChange || event->type() == QEvent::StyleChange)
+        adoptFont();
+}
+
+void LogTable::adoptFont()
+{
+    QFont bold = font();
+    bold.setBold(true);
+    verticalHeader()->setDefaultSectionSize(QFontMetrics(bold).height() + spaceBetweenRows);
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,217 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/OutlinePeer.h"
+
+#include "orvane/desktop/toolkit/LogDelegate.h"
+#include "orvane/desktop/toolkit/QtEvents.h"
+#include "orvane/desktop/toolkit/QtPasteboard.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QDrag>
+#include <QKeyEvent>
+#include <QMetaObject>
+
+#include <algorithm>
+#include <memory>
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+// Where an outline without indentation leaves room for the arrow of a row, and at its end.
+constexpr double roomForArrow = 16;
+constexpr double roomAtTheEnd = 4;
+
+bool allows(fixwell::DragOperation mask, fixwell::DragOperation operation)
+{
+    return (static_cast<std::uint32_t>(mask) & static_cast<std::uint32_t>(operation)) != 0;
+}
+
+}  // namespace
+
+OutlinePeer::OutlinePeer(LogTable& table, std::function<void()> beforeRows)
+    : table_(&table), beforeRows_(std::move(beforeRows)), scroller_(*table.verticalScrollBar())
+{
+    table.setModel(&model_);
+    table.setItemDelegate(new LogDelegate(&table));
+    table.setHandlers({[this](QKeyEvent& event) { sendKey(event); },
+                       [this] {
+                           drag();
+                       }});
+}
+
+OutlinePeer::~OutlinePeer()
+{
+    if (table_)
+        table_->setHandlers({});
+}
+
+void OutlinePeer::setView(fixwell::OutlineView* view)
+{
+    view_ = view;
+    model_.setView(view);
+    rows_ = static_cast<std::size_t>(model_.rowCount());
+}
+
+void OutlinePeer::reloadData()
+{
+    const bool hasSource = view_ != nullptr && view_->dataSource() != nullptr;
+    rows_ = hasSource ? view_->dataSource()->outlineViewNumberOfChildrenOfItem({}) : 0;
+    mustReload_ = true;
+    noteChange();
+}
+
+void OutlinePeer::noteChange()
+{
+    if (isWaiting_)
+        return;
+    isWaiting_ = true;
+    // In the model's name: what is waiting goes away together with this object.
+    QMetaObject::invokeMethod(
+        &model_, [this] { flush(); }, Qt::QueuedConnection);
+}
+
+void OutlinePeer::flush()
+{
+    isWaiting_ = false;
+    if (std::exchange(mustReload_, false)) {
+        beforeRows_();
+        model_.reload();
+        rows_ = static_cast<std::size_t>(model_.rowCount());
+        table_->viewport()->update();
+    }
+    const auto row = std::exchange(mustShow_, std::nullopt);
+    if (!row || *row >= rows_)
+        return;
+    if (*row == rows_ - 1)
+        table_->scrollToBottom();
+    else
+        table_->scrollTo(model_.index(static_cast<int>(*row)));
+}
+
+std::string OutlinePeer::selectionHTML() const
+{
+    std::string result;
+    if (view_ != nullptr)
+        for (const std::size_t row : selectedRowIndexes())
+            result += html(textOfRow(*view_, row));
+    return result;
+}
+
+std::vector<std::size_t> OutlinePeer::selectedRowIndexes() const
+{
+    std::vector<std::size_t> rows;
+    rows.reserve(numberOfSelectedRows());
+    for (const QItemSelectionRange& range : table_->selectionModel()->selection())
+        for (int row = range.top(); row <= range.bottom(); ++row)
+            rows.push_back(static_cast<std::size_t>(row));
+    std::sort(rows.begin(), rows.end());
+    return rows;
+}
+
+std::size_t OutlinePeer::numberOfSelectedRows() const
+{
+    std::size_t count = 0;
+    for (const QItemSelectionRange& range : table_->selectionModel()->selection())
+        count += static_cast<std::size_t>(range.height());
+    return count;
+}
+
+void OutlinePeer::scrollRowToVisible(std::size_t row)
+{
+    mustShow_ = row;
+    noteChange();
+}
+
+fixwell::Rect OutlinePeer::rectOfRow(std::size_t row) const
+{
+    if (row >= static_cast<std::size_t>(model_.rowCount()))
+        return {};
+    const QRect rect = table_->visualRect(model_.index(static_cast<int>(row)));
+    return {static_cast<double>(rect.x()), static_cast<double>(rect.y()),
+            static_cast<double>(rect.width()), static_cast<double>(rect.height())};
+}
+
+fixwell::Rect OutlinePeer::frameOfCellAtColumnRow(std::size_t /*column*/, std::size_t row) const
+{
+    fixwell::Rect frame = rectOfRow(row);
+    if (frame == fixwell::Rect())
+        return frame;
+    frame.x += roomForArrow;
+    frame.width = std::max(0.0, frame.width - roomForArrow - roomAtTheEnd);
+    return frame;
+}
+
+fixwell::Rect OutlinePeer::frameOfOutlineCellAtRow(std::size_t row) const
+{
+    fixwell::Rect frame = rectOfRow(row);
+    frame.width = std::min(frame.width, roomForArrow);
+    return frame;
+}
+
+void OutlinePeer::sendKey(QKeyEvent& event)
+{
+    if (view_ == nullptr)
+        table_->handleKey(event);
+    else if (event.matches(QKeySequence::SelectAll))
+        view_->selectAll(&table());
+    else if (event.matches(QKeySequence::Copy) && view_->validateMenuItem({"copy:"}))
+        view_->copy(&table());
+    else if (!event.matches(QKeySequence::Copy))
+        view_->keyDown({keyCodeOf(event.key()), modifierFlags(event.modifiers()), &event});
+}
+
+void OutlinePeer::keyDown(const fixwell::KeyEvent& event)
+{
+    if (event.native != nullptr)
+        table_->handleKey(*static_cast<QKeyEvent*>(event.native));
+}
+
+void OutlinePeer::selectAll()
+{
+    flush();
+    table_->selectAll();
+}
+
+void OutlinePeer::setNeedsDisplay(bool needsDisplay)
+{
+    if (needsDisplay)
+        table_->viewport()->update();
+}
+
+void OutlinePeer::setNeedsDisplayInRect(const fixwell::Rect& rect)
+{
+    table_->viewport()->update(QRectF(rect.x, rect.y, rect.width, rect.height).toAlignedRect());
+}
+
+void OutlinePeer::setToolTip(std::string_view text)
+{
+    table_->setToolTip(toQtToolTip(text));
+}
+
+void OutlinePeer::setDraggingSourceOperationMask(fixwell::DragOperation mask, bool isLocal)
+{
+    (isLocal ? localMask_ : outsideMask_) = mask;
+    table_->setDraggable(allows(localMask_, fixwell::DragOperation::Copy) ||
+                         allows(outsideMask_, fixwell::DragOperation::Copy));
+}
+
+void OutlinePeer::drag()
+{
+    fixwell::OutlineViewDelegate* const source = view_ != nullptr ? view_->dataSource() : nullptr;
+    if (source == nullptr ||
+        !allows(source->draggingSourceOperationMaskForLocal(false), fixwell::DragOperation::Copy))
+        return;
+    std::vector<fixwell::OutlineItem> items;
+    for (const std::size_t row : selectedRowIndexes())
+        items.push_back(view_->itemAtRow(row));
+    MimePasteboard pasteboard;
+    if (!source->outlineViewWriteItemsToPasteboard(items, pasteboard))
+        return;
+    std::unique_ptr<QMimeData> data = pasteboard.take();
+    data->setHtml(toQt(selectionHTML()));
+    auto* const drag = new QDrag(table_);  // Qt deletes it when the drag is over
+    drag->setMimeData(data.release());
+    drag->exec(Qt::CopyAction);
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,61 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/QtButton.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QPushButton>
+
+namespace orvane::desktop {
+
+QtButton::QtButton(QAbstractButton& widget, Pressed pressed)
+    : widget_(widget),
+      clicks_(QObject::connect(&widget, &QAbstractButton::clicked, &widget,
+                               [this, pressed = std::move(pressed)] { pressed(*this); })),
+      title_(fromQt(widget.text()))
+{
+}
+
+QtButton::~QtButton()
+{
+    QObject::disconnect(clicks_);
+}
+
+void QtButton::setNeedsDisplay(bool needsDisplay)
+{
+    if (needsDisplay)
+        widget_.update();
+}
+
+void QtButton::setToolTip(std::string_view text)
+{
+    if (toolTip_ == text)
+        return;
+    toolTip_ = text;
+    widget_.setToolTip(toQtToolTip(text));
+    widget_.setAccessibleDescription(toQt(text));
+}
+
+void QtButton::setTitle(std::string_view title)
+{
+    if (title_ == title)
+        return;
+    title_ = title;
+    // A new text would replace the shortcut by the text's own, which has none.
+    const QKeySequence shortcut = widget_.shortcut();
+    widget_.setText(toQtTitle(title));
+    widget_.setShortcut(shortcut);
+    widget_.setAccessibleName(toQt(title));
+}
+
+void QtButton::setKeyEquivalent(std::string_view key)
+{
+    isDefault_ = key == "\r";
+    if (auto* const push = qobject_cast<QPushButton*>(&widget_)) {
+        push->setAutoDefault(isDefault_);
+        push->setDefault(isDefault_);
+    }
+    if (!isDefault_)
+        widget_.setShortcut(QKeySequence(toQt(key)));
+}
+
+}  // namespace orvane::desktop

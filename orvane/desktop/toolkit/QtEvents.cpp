@@ -1,0 +1,35 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/QtEvents.h"
+
+#include <QGuiApplication>
+
+namespace orvane::desktop {
+
+std::uint64_t modifierFlags(Qt::KeyboardModifiers modifiers)
+{
+    std::uint64_t flags = 0;
+    if (modifiers.testFlag(Qt::ShiftModifier))
+        flags |= fixwell::modifierShift;
+    if (modifiers.testFlag(Qt::ControlModifier))
+        flags |= fixwell::modifierControl;
+    if (modifiers.testFlag(Qt::AltModifier))
+        flags |= fixwell::modifierOption;
+    return flags;
+}
+
+std::uint16_t keyCodeOf(int qtKey)
+{
+    switch (qtKey) {
+        case Qt::Key_Backspace: return fixwell::keyDelete;
+        case Qt::Key_Delete: return fixwell::keyForwardDelete;
+        case Qt::Key_Clear: return fixwell::keyKeypadClear;
+        default: return otherKey;
+    }
+}
+
+std::uint64_t QtEvents::currentModifierFlags() const
+{
+    return modifierFlags(QGuiApplication::queryKeyboardModifiers());
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,77 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/QtPasteboard.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QClipboard>
+#include <QGuiApplication>
+
+#include <algorithm>
+
+namespace orvane::desktop {
+namespace {
+
+// Whoever pastes into a terminal must not have a disk's label press keys there.
+QByteArray withoutControls(std::string_view text)
+{
+    std::string result;
+    result.reserve(text.size());
+    fixwell::forEachCharacter(text, [&result](char32_t character) {
+        const bool isControl = (character < 0x20 && character != '\n' && character != '\t') ||
+                               (character >= 0x7F && character < 0xA0);
+        fixwell::appendUTF8(result, isControl ? U'\uFFFD' : character);
+    });
+    return {result.data(), static_cast<qsizetype>(result.size())};
+}
+
+void put(QMimeData& data, std::string_view bytes, fixwell::PasteboardType type)
+{
+    const QByteArray raw(bytes.data(), static_cast<qsizetype>(bytes.size()));
+    switch (type) {
+        case fixwell::PasteboardType::PlainString:
+            data.setText(QString::fromUtf8(withoutControls(bytes)));
+            return;
+        case fixwell::PasteboardType::TabularText:
+            data.setData(QStringLiteral("text/tab-separated-values"), withoutControls(bytes));
+            return;
+        case fixwell::PasteboardType::RTF:
+            data.setData(QStringLiteral("text/rtf"), raw);
+            data.setData(QStringLiteral("application/rtf"), raw);
+            return;
+        case fixwell::PasteboardType::RTFD:
+            data.setData(QStringLiteral("application/x-rtfd"), raw);
+            return;
+    }
+}
+
+}  // namespace
+
+void MimePasteboard::declareTypes(const std::vector<fixwell::PasteboardType>& types,
+                                  const void* /*owner*/)
+{
+    data_ = std::make_unique<QMimeData>();
+    missing_ = types;
+}
+
+void MimePasteboard::setData(std::string_view data, fixwell::PasteboardType type)
+{
+    const auto declared = std::find(missing_.begin(), missing_.end(), type);
+    if (!data_ || declared == missing_.end())
+        return;
+    put(*data_, data, type);
+    missing_.erase(declared);
+    if (missing_.empty())
+        becameComplete();
+}
+
+void QtPasteboard::becameComplete()
+{
+    std::unique_ptr<QMimeData> data = take();
+    const std::string html = html_ ? html_() : std::string();
+    if (!html.empty())
+        data->setHtml(toQt(html));
+    QGuiApplication::clipboard()->setMimeData(data.release());
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,169 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/StyledLine.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/desktop/toolkit/Contrast.h"
+#include "orvane/desktop/toolkit/DesktopFont.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QTextLayout>
+
+#include <algorithm>
+
+namespace orvane::desktop {
+namespace {
+
+// No screen shows more; laying out a line of a megabyte would take seconds.
+constexpr std::size_t keptBytesAtEachEnd = 4096;
+
+void append(StyledLine& line, std::string_view bytes, const fixwell::TextStyle* style)
+{
+    std::string spaced(bytes);
+    std::replace(spaced.begin(), spaced.end(), '\n', ' ');
+    const QString part = toQt(fixwell::printable(spaced));
+    if (part.isEmpty())
+        return;
+    line.text += part;
+    line.runs.push_back({part.size(), style});
+}
+
+/// The runs of the stretch of `line` that starts at `start` and is `length` long.
+void appendRuns(std::vector<StyledLine::Run>& runs, const StyledLine& line, qsizetype start,
+                qsizetype length)
+{
+    const qsizetype end = start + length;
+    qsizetype at = 0;
+    for (const StyledLine::Run& run : line.runs) {
+        const qsizetype first = std::max(at, start);
+        const qsizetype last = std::min(at + run.length, end);
+        if (first < last)
+            runs.push_back({last - first, run.style});
+        at += run.length;
+    }
+}
+
+Qt::TextElideMode elideMode(fixwell::LineBreak lineBreak)
+{
+    switch (lineBreak) {
+        case fixwell::LineBreak::TruncateHead: return Qt::ElideLeft;
+        case fixwell::LineBreak::TruncateTail: return Qt::ElideRight;
+        case fixwell::LineBreak::TruncateMiddle: return Qt::ElideMiddle;
+        default: return Qt::ElideNone;
+    }
+}
+
+fixwell::Font fontOf(const fixwell::TextStyle& style, const LineLooks& looks)
+{
+    return style.font.value_or(looks.defaultFont);
+}
+
+QColor colorOf(const fixwell::TextStyle& style, const LineLooks& looks)
+{
+    if (!style.color || looks.keepsTextColor)
+        return looks.textColor;
+    const fixwell::Color& color = *style.color;
+    const auto part = [](double value) {
+        return static_cast<float>(std::clamp(value, 0.0, 1.0));
+    };
+    return readableOn(looks.background,
+                      QColor::fromRgbF(part(color.red), part(color.green), part(color.blue)));
+}
+
+QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLooks& looks)
+{
+    QList<QTextLayout::FormatRange> formats;
+    int start = 0;
+    for (const StyledLine::Run& run : line.runs) {
+        QTextCharFormat format;
+        format.setFont(scaledFont(fontOf(*run.style, looks), looks.fontScale));
+        format.setForeground(colorOf(*run.style, looks));
+        formats.append({start, static_cast<int>(run.length), format});
+        start += static_cast<int>(run.length);
+    }
+    return formats;
+}
+
+}  // namespace
+
+StyledLine oneLine(const fixwell::StyledText& text)
+{
+    const std::string_view all = text.characters();
+    const std::size_t end = all.find_last_not_of('\n') + 1;
+    const bool isCut = end > 2 * keptBytesAtEachEnd;
+    const std::size_t headEnd = isCut ? keptBytesAtEachEnd : end;
+    const std::size_t tailStart = isCut ? end - keptBytesAtEachEnd : end;
+
+    StyledLine line;
+    std::size_t at = 0;
+    for (const fixwell::StyledText::Run& run : text.runs()) {
+        const std::size_t runEnd = at + run.length;
+        if (at < headEnd)
+            append(line, all.substr(at, std::min(runEnd, headEnd) - at), run.style);
+        if (isCut && at <= headEnd && headEnd < runEnd)
+            append(line, "…", run.style);
+        const std::size_t from = std::max(at, tailStart);
+        if (from < std::min(runEnd, end))
+            append(line, all.substr(from, std::min(runEnd, end) - from), run.style);
+        at = runEnd;
+    }
+    if (text.style().paragraph)
+        line.lineBreak = text.style().paragraph->lineBreak;
+    return line;
+}
+
+StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double width)
+{
+    StyledLine result;
+    result.lineBreak = line.lineBreak;
+    result.text = metrics.elidedText(line.text, elideMode(line.lineBreak), width);
+    if (result.text == line.text || line.runs.empty())
+        return line;
+    const auto mismatch =
+        std::mismatch(result.text.begin(), result.text.end(), line.text.begin(), line.text.end());
+    const qsizetype head = mismatch.first - result.text.begin();
+    qsizetype tail = 0;
+    while (head + tail < std::min(result.text.size(), line.text.size()) &&
+           result.text[result.text.size() - 1 - tail] == line.text[line.text.size() - 1 - tail])
+        ++tail;
+    appendRuns(result.runs, line, 0, head);
+    const qsizetype ellipsis = result.text.size() - head - tail;
+    if (ellipsis > 0)
+        result.runs.push_back(
+            {ellipsis, result.runs.empty() ? line.runs.front().style : result.runs.back().style});
+    appendRuns(result.runs, line, line.text.size() - tail, tail);
+    return result;
+}
+
+QFont widestFont(const StyledLine& line, const LineLooks& looks)
+{
+    fixwell::Font widest = line.runs.empty() ? looks.defaultFont : fixwell::Font();
+    for (const StyledLine::Run& run : line.runs) {
+        const fixwell::Font font = fontOf(*run.style, looks);
+        widest.isBold = widest.isBold || font.isBold;
+        widest.points = std::max(widest.points, font.points);
+    }
+    return scaledFont(widest, looks.fontScale);
+}
+
+void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks)
+{
+    const QFont font = widestFont(line, looks);
+    const StyledLine shown = fitted(line, QFontMetricsF(font, painter.device()), rect.width());
+    QTextLayout layout(shown.text, font, painter.device());
+    QTextOption option;
+    option.setWrapMode(QTextOption::NoWrap);
+    layout.setTextOption(option);
+    layout.setFormats(formatsOf(shown, looks));
+    layout.beginLayout();
+    QTextLine textLine = layout.createLine();
+    if (textLine.isValid())
+        textLine.setLineWidth(rect.width());
+    layout.endLayout();
+    const double top = rect.top() + (rect.height() - layout.boundingRect().height()) / 2;
+    painter.save();
+    painter.setClipRect(rect, Qt::IntersectClip);
+    layout.draw(&painter, QPointF(rect.left(), top));
+    painter.restore();
+}
+
+}  // namespace orvane::desktop

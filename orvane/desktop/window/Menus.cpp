@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/window/Menus.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QMenu>
+#include <QMenuBar>
+
+namespace orvane::desktop {
+namespace {
+
+bool isAvailable(const MenuCommand& command)
+{
+    return !command.isAvailable || command.isAvailable();
+}
+
+void perform(const MenuCommand& command, QAction& action)
+{
+    if (isAvailable(command))
+        command.perform();
+    if (command.isOn)
+        action.setChecked(command.isOn());
+}
+
+void addCommand(QMenu& menu, const MenuCommand& command, const Translator& texts)
+{
+    if (command.title.empty()) {
+        menu.addSeparator();
+        return;
+    }
+    QAction* const action = menu.addAction(toQt(texts.text(command.title)));
+    action->setObjectName(QLatin1String(command.objectName));
+    action->setShortcut(command.shortcut);
+    action->setCheckable(static_cast<bool>(command.isOn));
+    QObject::connect(action, &QAction::triggered, action,
+                     [command, action] { perform(command, *action); });
+    QObject::connect(&menu, &QMenu::aboutToShow, action, [command, action] {
+        action->setEnabled(isAvailable(command));
+        if (command.isOn)
+            action->setChecked(command.isOn());
+    });
+    // A disabled action would not hear its shortcut.
+    QObject::connect(
+        &menu, &QMenu::aboutToHide, action, [action] { action->setEnabled(true); },
+        Qt::QueuedConnection);
+}
+
+}  // namespace
+
+void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Translator& texts)
+{
+    for (const Menu& menu : menus) {
+        QMenu* const added = window.menuBar()->addMenu(toQt(texts.text(menu.title)));
+        for (const MenuCommand& command : menu.commands)
+            addCommand(*added, command, texts);
+    }
+}
+
+}  // namespace orvane::desktop

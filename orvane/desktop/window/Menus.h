@@ -1,0 +1,36 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/texts/Translator.h"
+
+#include <QAction>
+#include <QMainWindow>
+
+#include <functional>
+#include <vector>
+
+namespace orvane::desktop {
+
+/// One command of the menus.
+struct MenuCommand {
+    const char* objectName;  ///< also finds the command in the window
+    std::string_view title;  ///< English, with an ampersand before the letter to underline
+    QKeySequence shortcut;   ///< empty for none
+    std::function<void()> perform;
+    /// Asked when the menu opens and when the command is given; YES when empty.
+    std::function<bool()> isAvailable = {};
+    /// For a command that is a switch: its state, asked when the menu opens.
+    std::function<bool()> isOn = {};
+};
+
+/// A menu of the window's menu bar; a command without a title is a line between others.
+struct Menu {
+    std::string_view title;
+    std::vector<MenuCommand> commands;
+};
+
+/// Gives the window a menu bar. Whether a command is available is found out when it matters:
+/// while no menu is open every shortcut works, and asks first.
+void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Translator& texts);
+
+}  // namespace orvane::desktop

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/window/WindowState.h"
+
+#include <QHeaderView>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr std::string_view geometryKey = "MainWindow.geometry";
+constexpr std::string_view splitterKey = "MainWindow.splitter";
+constexpr std::string_view columnsKey = "MainWindow.columns";
+
+QByteArray stored(const fixwell::UserDefaults& settings, std::string_view key)
+{
+    const fixwell::Value value = settings.objectForKey(key);
+    return QByteArray::fromBase64(QByteArray::fromStdString(std::string(value.string())));
+}
+
+void store(fixwell::UserDefaults& settings, std::string_view key, const QByteArray& bytes)
+{
+    const std::string text = bytes.toBase64().toStdString();
+    if (settings.objectForKey(key).string() != text)
+        settings.setObjectForKey(fixwell::Value(text), key);
+}
+
+}  // namespace
+
+void restoreWindow(MainWindow& window, const fixwell::UserDefaults& settings)
+{
+    window.restoreGeometry(stored(settings, geometryKey));
+    window.splitter().restoreState(stored(settings, splitterKey));
+    window.disks().header()->restoreState(stored(settings, columnsKey));
+}
+
+void saveWindow(MainWindow& window, fixwell::UserDefaults& settings)
+{
+    store(settings, geometryKey, window.saveGeometry());
+    store(settings, splitterKey, window.splitter().saveState());
+    store(settings, columnsKey, window.disks().header()->saveState());
+}
+
+}  // namespace orvane::desktop

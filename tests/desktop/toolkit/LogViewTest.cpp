@@ -1,0 +1,139 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/desktop/toolkit/ToolkitFixture.h"
+
+#include <QClipboard>
+#include <QKeyEvent>
+#include <QMimeData>
+#include <QPrinter>
+#include <QScrollBar>
+#include <QTemporaryDir>
+
+namespace orvane::desktop {
+namespace {
+
+using LogView = ToolkitTest;
+
+void press(QWidget& widget, int key, Qt::KeyboardModifiers modifiers = Qt::NoModifier)
+{
+    QKeyEvent event(QEvent::KeyPress, key, modifiers);
+    QApplication::sendEvent(&widget, &event);
+}
+
+TEST_F(LogView, RowsAreCountedAtOnceAndShownTogetherAfterTheyAreSaved)
+{
+    addRow("Verifying volume “USB”", -1);
+    addRow("detail", 2);
+    const int before = host.savesBeforeRows;
+    for (int i = 0; i < 3; ++i)
+        view->reloadData();
+    EXPECT_EQ(view->numberOfRows(), 1U) << "details are off";
+    EXPECT_EQ(table().model()->rowCount(), 0) << "not shown before the loop comes to it";
+    settle();
+    EXPECT_EQ(host.savesBeforeRows, before + 1);
+    EXPECT_EQ(rowText(0), QStringLiteral("Verifying volume “USB”"));
+    interface->button("showDetailsButton")->press();
+    settle();
+    EXPECT_EQ(rowText(1), QStringLiteral("detail"));
+}
+
+TEST_F(LogView, SelectionStaysWhileTheLogGrowsAndGoesWithTheLog)
+{
+    addRow("one");
+    addRow("two");
+    reload();
+    table().selectRow(1);
+    addRow("three");
+    reload();
+    EXPECT_EQ(view->selectedRowIndexes(), std::vector<std::size_t>{1});
+    disk->history = fixwell::Array::make();
+    for (const char* text : {"a", "b", "c", "d"})
+        addRow(text);
+    selectDisk();
+    reload();
+    EXPECT_EQ(view->numberOfSelectedRows(), 0U) << "another log has other rows";
+    EXPECT_EQ(rowText(3), QStringLiteral("d"));
+}
+
+TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
+{
+    for (int i = 0; i < 1'000'000; ++i)
+        disk->history.append(fixwell::Dictionary::of(
+            {{fixwell::kOV_finalAttributedString_type, fixwell::StyledText::make("line\n")}}));
+    reload();
+    view->selectAll(nullptr);
+    EXPECT_EQ(view->numberOfSelectedRows(), 1'000'000U);
+    view->scrollRowToVisible(999'999);
+    settle();
+    EXPECT_EQ(view->verticalScroller()->value(), 1.0);
+    EXPECT_TRUE(table().viewport()->rect().contains(
+        table().visualRect(table().model()->index(999'999, 0)).center()));
+    for (int i = 0; i < 50; ++i) {
+        addRow("more");
+        reload();
+    }
+    EXPECT_EQ(view->numberOfRows(), 1'000'050U);
+    EXPECT_EQ(view->numberOfSelectedRows(), 1'000'000U);
+}
+
+TEST_F(LogView, DeletingKeysClearTheHistoryOnlyWhenEverythingIsSelected)
+{
+    for (const int key : {Qt::Key_Backspace, Qt::Key_Delete, Qt::Key_Clear}) {
+        disk->history = fixwell::Array::make();
+        addRow("one");
+        addRow("two");
+        selectDisk();
+        reload();
+        table().selectRow(0);
+        press(table(), key);
+        EXPECT_EQ(disk->history.size(), 2U) << "one row alone is never deleted: key " << key;
+        press(table(), Qt::Key_A, Qt::ControlModifier);
+        press(table(), key);
+        EXPECT_TRUE(disk->history.isEmpty()) << "key " << key;
+    }
+}
+
+TEST_F(LogView, CopiedRowsGoToTheClipboardInEveryFormat)
+{
+    addRow("<one> \x1b]0;title\x07", -1);
+    addRow("two", 0, {{}, fixwell::Color{1, 0, 0, 1}, {}});
+    reload();
+    host.qtPasteboard.setHTMLSource([this] { return interface->outlinePeer()->selectionHTML(); });
+    view->selectAll(nullptr);
+    press(table(), Qt::Key_C, Qt::ControlModifier);
+    const QMimeData* const data = QGuiApplication::clipboard()->mimeData();
+    EXPECT_EQ(data->text(), QStringLiteral("<one> \uFFFD]0;title\uFFFD\ntwo\n"));
+    EXPECT_EQ(QString::fromUtf8(data->data("text/tab-separated-values")), data->text());
+    EXPECT_TRUE(data->data("text/rtf").startsWith("{\\rtf1"));
+    EXPECT_EQ(data->data("application/rtf"), data->data("text/rtf"));
+    EXPECT_EQ(data->data("application/x-rtfd"), data->data("text/rtf"));
+    EXPECT_TRUE(data->html().contains(QStringLiteral("&lt;one&gt;")));
+}
+
+TEST_F(LogView, PrintsEveryRowOnPages)
+{
+    for (int i = 0; i < 300; ++i)
+        addRow("Row " + std::to_string(i) + " " + std::string(i == 7 ? 150 : 20, 'w'), i % 3 - 1);
+    reload();
+    const QTemporaryDir directory;
+    QPrinter printer;
+    printer.setOutputFormat(QPrinter::PdfFormat);
+    printer.setPageSize(QPageSize(QPageSize::A4));
+    printer.setOutputFileName(directory.filePath("log.pdf"));
+    fixwell::PrintInfo info;
+    info.horizontalPagination = fixwell::Pagination::Fit;
+    info.isVerticallyCentered = false;
+    EXPECT_TRUE(printRows(printer, *view, info));
+    QFile file(printer.outputFileName());
+    ASSERT_TRUE(file.open(QIODevice::ReadOnly));
+    const QByteArray pdf = file.readAll();
+    EXPECT_TRUE(pdf.startsWith("%PDF"));
+    EXPECT_GE(pdf.count("/Type /Page\n"), 2);
+    QFile::remove(QStringLiteral(SCREENSHOTS "/log.pdf"));
+    QFile::copy(printer.outputFileName(), QStringLiteral(SCREENSHOTS "/log.pdf"));
+
+    printer.setOutputFileName(QStringLiteral("/nonexistent/log.pdf"));
+    EXPECT_FALSE(printRows(printer, *view, info));
+}
+
+}  // namespace
+}  // namespace orvane::desktop

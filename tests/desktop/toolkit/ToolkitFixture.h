@@ -1,0 +1,142 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/messagelog/MessageRecord.h"
+#include "fixwell/module/OVFXW.h"
+#include "orvane/desktop/toolkit/QtAlerts.h"
+#include "orvane/desktop/toolkit/QtEvents.h"
+#include "orvane/desktop/toolkit/QtInterface.h"
+#include "orvane/desktop/toolkit/QtPasteboard.h"
+#include "orvane/desktop/toolkit/QtPrinting.h"
+#include "tests/module/FakeHost.h"
+
+#include <QApplication>
+
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+namespace orvane::desktop {
+
+/// The directory of the interface file, and texts in a language of its own.
+struct TestBundle final : fixwell::Bundle {
+    std::string localizedString(std::string_view key, std::string_view,
+                                std::string_view) const override
+    {
+        return key == "Clear History" ? "Verlauf löschen" : std::string(key);
+    }
+    std::uint64_t stringRevision() const override { return 1; }
+    std::filesystem::path pathForResource(std::string_view name) const override
+    {
+        return name == "FXW.ui" ? FXW_UI : std::filesystem::path();
+    }
+};
+
+/// A fake host, except for its screen.
+struct ScreenHost final : fixwell::HostServices {
+    fixwell::testing::FakeHost fake;
+    TestBundle bundle;
+    QtAlerts qtAlerts{[](std::int32_t code) {
+        return "code " + std::to_string(code);
+    }};
+    QtEvents qtEvents;
+    int savesBeforeRows = 0;
+    QtInterface qtInterface{[this] {
+        ++savesBeforeRows;
+    }};
+    QtPasteboard qtPasteboard;
+    QtPrinting qtPrinting{[] {
+        FAIL() << "not printed";
+    }};
+
+    ScreenHost() { qtInterface.setBundle(bundle); }
+
+    fixwell::OVPreferences& sharedPreferences() override { return fake; }
+    fixwell::OVDiskController& sharedDiskController() override { return fake; }
+    fixwell::OVLog& log() override { return fake; }
+    fixwell::NotificationCenter& defaultCenter() override { return fake; }
+    fixwell::RunLoop& mainRunLoop() override { return fake; }
+    fixwell::Threads& threads() override { return fake; }
+    fixwell::UserDefaults& standardUserDefaults() override { return fake; }
+    fixwell::Bundle& hostBundle() override { return fake; }
+    fixwell::ImageAttachment& imageAttachment() override { return fake; }
+    fixwell::Alerts& alerts() override { return qtAlerts; }
+    fixwell::Events& events() override { return qtEvents; }
+    fixwell::HelpManager& sharedHelpManager() override { return fake; }
+    QtInterface& interfaceLoader() override { return qtInterface; }
+    fixwell::Pasteboard& generalPasteboard() override { return qtPasteboard; }
+    fixwell::Printing& printing() override { return qtPrinting; }
+    std::unique_ptr<fixwell::OVTimeEstimator> makeTimeEstimator() override
+    {
+        return fake.makeTimeEstimator();
+    }
+    std::string OVLocalizedErrorString(fixwell::ErrorCode code) override
+    {
+        return fake.OVLocalizedErrorString(code);
+    }
+    std::string decimalString(const fixwell::Value& number) override
+    {
+        return fake.decimalString(number);
+    }
+};
+
+/// The module with its controls, one selected disk, and that disk's log to write into.
+class ToolkitTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        module = std::make_unique<fixwell::OVFXW>(host, host.fake);
+        ASSERT_TRUE(module->init());
+        module->registerForNotifications();
+        interface = host.qtInterface.latest();
+        ASSERT_NE(interface, nullptr);
+        view = interface->outlineView();
+        ASSERT_NE(view, nullptr);
+        disk->history = fixwell::Array::make();
+        host.fake.disks.push_back(disk);
+        host.fake.selection = {disk};
+        interface->widget().resize(640, 560);
+        interface->widget().show();
+        selectDisk();
+    }
+    void TearDown() override { module.reset(); }
+
+    void selectDisk()
+    {
+        module->selectionDidChange({fixwell::OVDiskChangedNotification, nullptr, {}});
+        settle();
+    }
+
+    void addRow(std::string_view text, std::int64_t verbosity = 0,
+                const fixwell::TextStyle& style = {})
+    {
+        fixwell::TextStyle complete = style;
+        if (!complete.font)
+            complete.font = fixwell::Font{verbosity < 0, 11};
+        disk->history.append(fixwell::Dictionary::of(
+            {{fixwell::kFsckVerbosity, verbosity},
+             {fixwell::kOV_finalAttributedString_type,
+              fixwell::StyledText::make(std::string(text) + "\n", complete)}}));
+    }
+
+    void reload()
+    {
+        view->reloadData();
+        settle();
+    }
+    static void settle() { QApplication::processEvents(); }
+
+    LogTable& table() { return interface->outlinePeer()->table(); }
+    QString rowText(int row) { return table().model()->index(row, 0).data().toString(); }
+
+    ScreenHost host;
+    std::shared_ptr<fixwell::testing::FakeDisk> disk =
+        std::make_shared<fixwell::testing::FakeDisk>("loop0");
+    std::unique_ptr<fixwell::OVFXW> module;
+    LoadedInterface* interface = nullptr;
+    fixwell::OutlineView* view = nullptr;
+};
+
+}  // namespace orvane::desktop
