@@ -32,21 +32,6 @@ bool QtLoop::isMainThread() const
     return QThread::currentThread() == receiver_.thread();
 }
 
-void QtLoop::performOnMainThread(Task task, Wait wait)
-{
-    if (Outbox* const outbox = Outbox::ofThisThread()) {
-        outbox->perform(std::move(task), wait);
-    } else if (wait == Wait::No) {
-        post(std::move(task));
-    } else if (isMainThread()) {
-        task();
-    } else {
-        const auto rendezvous = std::make_shared<Rendezvous>();
-        post(Rendezvous::taskFor(rendezvous, std::move(task)));
-        rendezvous->wait();
-    }
-}
-
 void QtLoop::scheduleTimer(std::chrono::duration<double> delay, Task task)
 {
     const auto wait = std::chrono::ceil<std::chrono::milliseconds>(delay);

@@ -27,7 +27,6 @@ public:
     ~QtLoop() override = default;
 
     bool isMainThread() const override;
-    void performOnMainThread(Task task, Wait wait) override;
     void scheduleTimer(std::chrono::duration<double> delay, Task task) override;
     void post(Task task) override;
     /// Any thread.

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "orvane/support/loop/EndingSignals.h"
 
 #include <QSocketNotifier>
 
@@ -10,23 +10,15 @@
 
 namespace orvane::desktop {
 
-/// Turns the signals by which the system ends a program (SIGINT, SIGTERM, SIGHUP) into calls from
-/// the event loop. Made before any thread is started: the signals stay blocked in all of them.
+/// Calls back from the event loop for each signal that would end the program. Made before any
+/// thread is started.
 class TerminationSignals {
 public:
-    TerminationSignals();
-    TerminationSignals(const TerminationSignals&) = delete;
-    TerminationSignals& operator=(const TerminationSignals&) = delete;
-    ~TerminationSignals() = default;
-
     /// From here on, with the application object there, each signal calls `received`.
     void watch(std::function<void()> received);
 
 private:
-    void take();
-
-    FileDescriptor descriptor_;
-    std::function<void()> received_;
+    EndingSignals signals_;
     std::unique_ptr<QSocketNotifier> notifier_;
 };
 

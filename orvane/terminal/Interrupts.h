@@ -1,16 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/support/loop/EndingSignals.h"
 #include "orvane/support/loop/MainLoop.h"
 
-#include <csignal>
 #include <functional>
 
 namespace orvane {
 
-/// Turns the signals by which a user or the system ends a program (SIGINT, SIGTERM, SIGHUP) into
-/// calls on the main thread, from this object's making until its end. Threads that are started
-/// meanwhile leave the signals alone; none may be running before.
+/// Calls back on the main thread for each signal that would end the program, from this object's
+/// making until its end. No thread may be running when it is made.
 class Interrupts {
 public:
     /// The loop outlives this object.
@@ -20,12 +19,9 @@ public:
     ~Interrupts();
 
 private:
-    void take();
-
-    sigset_t before_{};
+    EndingSignals signals_;
     MainLoop& loop_;
     std::function<void()> interrupted_;
-    FileDescriptor descriptor_;
 };
 
 }  // namespace orvane

@@ -5,10 +5,11 @@
 
 namespace orvane {
 
-/// A front end's main loop. An implementation of performOnMainThread looks for the calling
-/// thread's Outbox first, so that what workers hand over arrives in the workers' order.
+/// A front end's main loop. What a worker hands over goes through the calling thread's Outbox,
+/// where it has one, so that it arrives in the workers' order.
 class HostLoop : public fixwell::RunLoop {
 public:
+    void performOnMainThread(Task task, Wait wait) final;
     /// Any thread. Queues the task behind what was posted before, past any outbox.
     virtual void post(Task task) = 0;
 };

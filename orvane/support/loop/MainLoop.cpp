@@ -45,21 +45,6 @@ bool MainLoop::isMainThread() const
     return std::this_thread::get_id() == mainThread_;
 }
 
-void MainLoop::performOnMainThread(Task task, Wait wait)
-{
-    if (Outbox* const outbox = Outbox::ofThisThread()) {
-        outbox->perform(std::move(task), wait);
-    } else if (wait == Wait::No) {
-        post(std::move(task));
-    } else if (isMainThread()) {
-        task();
-    } else {
-        const auto rendezvous = std::make_shared<Rendezvous>();
-        post(Rendezvous::taskFor(rendezvous, std::move(task)));
-        rendezvous->wait();
-    }
-}
-
 void MainLoop::post(Task task)
 {
     bool mustWake = false;

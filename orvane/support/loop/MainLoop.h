@@ -31,7 +31,6 @@ public:
     ~MainLoop() override;
 
     bool isMainThread() const override;
-    void performOnMainThread(Task task, Wait wait) override;
     void scheduleTimer(std::chrono::duration<double> delay, Task task) override;
     void post(Task task) override;
 
