@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/jobs/JobObserver.h"
-#include "orvane/support/SupportHost.h"
+#include "orvane/jobs/RunKeeper.h"
 
 #include <functional>
 
@@ -17,7 +17,7 @@ public:
     };
 
     /// The host outlives this object.
-    JobLedger(SupportHost& host, Events events) : host_(host), events_(std::move(events)) {}
+    JobLedger(SupportHost& host, Events events) : runs_(host), events_(std::move(events)) {}
 
     /// A tool is at work. It is not while a job's images are being read.
     bool isJobRunning() const { return isJobRunning_; }
@@ -29,12 +29,10 @@ public:
                        const fixwell::Dictionary& result) override;
 
 private:
-    std::string keyOf(const fixwell::DiskReferencePointer& disk);
-    void end(const RunEnd& end);
+    void end();
 
-    SupportHost& host_;
+    RunKeeper runs_;
     const Events events_;
-    std::int64_t run_ = 0;  ///< the one that is under way; 0 when it could not be written
     bool isJobRunning_ = false;
 };
 

@@ -3,11 +3,11 @@
 
 #include "fixwell/host/support/OVDiskController.h"
 #include "orvane/jobs/JobObserver.h"
+#include "orvane/jobs/RunKeeper.h"
 #include "orvane/terminal/DiskNames.h"
 #include "orvane/terminal/Reporter.h"
 #include "orvane/terminal/TerminalWindow.h"
 
-#include <cstdint>
 #include <functional>
 #include <map>
 #include <optional>
@@ -19,26 +19,17 @@ namespace orvane {
 /// exit status, and has them kept with the disks' histories. Main thread only.
 class JobReporter final : public JobObserver {
 public:
-    struct Outcome {
-        std::string verdict;
-        fixwell::ErrorCode error = 0;
-        std::string message;
-    };
     struct Hooks {
         /// Writes the rows that are waiting.
         std::function<void()> flushRows;
         /// A job begins on this disk; its first row is the newest of the disk's log.
         std::function<void(const fixwell::DiskReferencePointer& disk)> follow;
-        std::function<std::string(fixwell::ErrorCode)> errorText;
-        /// Keeps a run; answers its number for `runEnded`.
-        std::function<std::int64_t(const fixwell::DiskReferencePointer&, Operation)> runBegan;
-        std::function<void(std::int64_t run, const Outcome& outcome)> runEnded;
     };
 
     /// All outlive this object.
     JobReporter(Reporter& reporter, const TerminalWindow& window, const DiskNames& names,
-                Hooks hooks)
-        : reporter_(reporter), window_(window), names_(names), hooks_(std::move(hooks))
+                SupportHost& host, Hooks hooks)
+        : reporter_(reporter), window_(window), names_(names), runs_(host), hooks_(std::move(hooks))
     {
     }
 
@@ -56,20 +47,20 @@ public:
     /// Between a job's beginning and its end.
     bool isInFlight() const { return isInFlight_; }
     /// By disk identifier.
-    const std::map<std::string, Outcome>& outcomes() const { return outcomes_; }
+    const std::map<std::string, RunEnd>& outcomes() const { return outcomes_; }
 
 private:
-    void settle(const std::string& identifier, Outcome outcome);
+    void settle(const std::string& identifier, RunEnd outcome);
 
     Reporter& reporter_;
     const TerminalWindow& window_;
     const DiskNames& names_;
+    RunKeeper runs_;
     Hooks hooks_;
     std::string current_;
-    std::int64_t run_ = 0;
     bool isInFlight_ = false;
-    std::optional<Outcome> unsaid_;
-    std::map<std::string, Outcome> outcomes_;
+    std::optional<RunEnd> unsaid_;
+    std::map<std::string, RunEnd> outcomes_;
 };
 
 }  // namespace orvane

@@ -37,7 +37,7 @@ Session::Session(const Request& request, Reporter& reporter)
       libraryTexts_(hostTexts_),
       library_(loop_, libraryTexts_, libraryOptions(request)),
       host_(supportOptions(request), loop_, interface_, alerts_, reporter, request.showsDetails),
-      jobs_(reporter, window_, names_, jobHooks()),
+      jobs_(reporter, window_, names_, host_, jobHooks()),
       observedLibrary_(library_, jobs_)
 {
     window_.setEvents({
@@ -99,28 +99,7 @@ JobReporter::Hooks Session::jobHooks()
     hooks.follow = [this](const fixwell::DiskReferencePointer& disk) {
         follow(disk);
     };
-    hooks.errorText = [this](fixwell::ErrorCode code) {
-        return host_.OVLocalizedErrorString(code);
-    };
-    hooks.runBegan = [this](const fixwell::DiskReferencePointer& disk, Operation operation) {
-        const std::string key = historyKey(disk);
-        return key.empty() ? 0
-                           : host_.historyStore().beginRun(key, nameOf(operation),
-                                                           std::chrono::system_clock::now());
-    };
-    hooks.runEnded = [this](std::int64_t run, const JobReporter::Outcome& outcome) {
-        if (run != 0)
-            host_.historyStore().endRun(run, {outcome.verdict, outcome.error, outcome.message},
-                                        std::chrono::system_clock::now());
-    };
     return hooks;
-}
-
-std::string Session::historyKey(const fixwell::DiskReferencePointer& reference)
-{
-    const auto disk =
-        std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
-    return disk ? host_.histories().keyOf(disk->facts()) : std::string();
 }
 
 Outcome<> Session::loadModule()

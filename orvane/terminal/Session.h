@@ -68,7 +68,6 @@ private:
     void follow(const fixwell::DiskReferencePointer& disk);
     void interrupt();
     bool pressStop();
-    std::string historyKey(const fixwell::DiskReferencePointer& disk);
 
     Reporter& reporter_;
     MainLoop loop_;

@@ -1,0 +1,29 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/jobs/JobObserver.h"
+#include "orvane/support/SupportHost.h"
+
+namespace orvane {
+
+/// Keeps the runs of one module with their disks' histories: when each began, and how it ended.
+/// One run at a time. Main thread.
+class RunKeeper {
+public:
+    /// The host outlives this object.
+    explicit RunKeeper(SupportHost& host) : host_(host) {}
+
+    void begin(const fixwell::DiskReferencePointer& disk, Operation operation);
+    /// The run did not begin after all; answers its end.
+    RunEnd refuse(fixwell::ErrorCode error);
+    /// `result` has the result keys. Where it names no verdict, the error decides.
+    RunEnd finish(fixwell::ErrorCode error, const fixwell::Dictionary& result);
+
+private:
+    void keep(const RunEnd& end);
+
+    SupportHost& host_;
+    std::int64_t run_ = 0;  ///< the one that is under way; 0 when it could not be written
+};
+
+}  // namespace orvane
