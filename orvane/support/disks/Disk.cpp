@@ -51,11 +51,27 @@ Disk::Disk(DiskFacts facts, Surroundings surroundings) : surroundings_(std::move
 
 void Disk::setFacts(const DiskFacts& facts)
 {
+    // A disk that was formatted anew has another history. One that cannot be read for a moment has
+    // no other.
+    if (facts.uuid != facts_.uuid && !facts.uuid.empty() && surroundings_.histories != nullptr)
+        own_ = {};
     facts_ = facts;
     reference_ = referenceTo(facts_);
     filesystem_.reset();
     if (!facts_.filesystem.empty())
         filesystem_.emplace(facts_.filesystem, surroundings_.capabilities);
+}
+
+// Without a path, so that an operation on it is refused with a reason. The node may be another
+// disk's by now.
+void Disk::setGone()
+{
+    DiskFacts nothing = facts_;
+    nothing.path.clear();
+    nothing.mountPoint.clear();
+    facts_.mountPoint.clear();
+    reference_ = referenceTo(nothing);
+    hasGone_ = true;
 }
 
 void Disk::setParts(std::vector<std::shared_ptr<Disk>> parts)

@@ -32,6 +32,9 @@ public:
     void setFacts(const DiskFacts& facts);
     const std::vector<std::shared_ptr<Disk>>& parts() const { return children_; }
     void setParts(std::vector<std::shared_ptr<Disk>> parts);
+    /// The medium is gone, though the object is still needed: nothing can begin on it any more.
+    void setGone();
+    bool hasGone() const { return hasGone_; }
     /// An image file shows the histories of what was found in it, also after it was detached.
     void setContents(std::shared_ptr<Disk> contents) { contents_ = std::move(contents); }
 
@@ -83,6 +86,7 @@ private:
     void collectHistories(std::vector<fixwell::Array>& histories) const;
 
     DiskFacts facts_;
+    bool hasGone_ = false;
     Surroundings surroundings_;
     std::optional<DiskFilesystem> filesystem_;
     fixwell::DiskReferencePointer reference_;
