@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogModel.h"
 
+#include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include <algorithm>
@@ -76,9 +77,27 @@ int LogModel::rowCount(const QModelIndex& parent) const
 
 QVariant LogModel::data(const QModelIndex& index, int role) const
 {
-    if (role != Qt::DisplayRole || !index.isValid() || view_ == nullptr)
+    if (!index.isValid() || view_ == nullptr)
         return {};
-    return oneLine(textOfRow(*view_, static_cast<std::size_t>(index.row()))).text;
+    const fixwell::OutlineItem item = view_->itemAtRow(static_cast<std::size_t>(index.row()));
+    switch (role) {
+        case Qt::DisplayRole: return oneLine(textOfItem(*view_, item)).text;
+        case Qt::AccessibleTextRole: return spokenText(item);
+        default: return {};
+    }
+}
+
+QString LogModel::spokenText(const fixwell::OutlineItem& item) const
+{
+    const QString text = oneLine(textOfItem(*view_, item)).text;
+    const std::string_view type = item.string(fixwell::kFsckMessageType);
+    const bool isProblem = type == fixwell::kFsckError.text() || type == fixwell::kFsckFail.text();
+    QString word;
+    if (isProblem)
+        word = spoken_.problem;
+    else if (type == fixwell::kFsckSuccess.text())
+        word = spoken_.success;
+    return word.isEmpty() ? text : word + QStringLiteral(": ") + text;
 }
 
 Qt::ItemFlags LogModel::flags(const QModelIndex& index) const

@@ -40,6 +40,7 @@ MainWindow::MainWindow(const Translator& texts)
     resize(firstSize);
 
     tabs_->setDocumentMode(true);
+    tabs_->setAccessibleName(toQt(texts.text("What can be done")));
     splitter_->addWidget(disks_);
     splitter_->addWidget(tabs_);
     splitter_->setChildrenCollapsible(false);
