@@ -85,6 +85,9 @@ SupportOptions DesktopSession::supportOptions()
     options.errorText = [this](fixwell::ErrorCode code) {
         return pellar::errorText(code, libraryTexts_);
     };
+    options.historyCompleted = [this] {
+        reloadLog();
+    };
     options.warn = [this](const std::string& sentence) {
         warn(sentence);
     };
@@ -94,6 +97,7 @@ SupportOptions DesktopSession::supportOptions()
 pellar::ManagerOptions DesktopSession::libraryOptions() const
 {
     pellar::ManagerOptions options;
+    options.outputLimits = options_.outputLimits;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
     return options;

@@ -27,6 +27,7 @@ struct SessionOptions {
         orvane::moduleDirectories(environmentValue, runningExecutable());
     std::vector<std::string> disksToOpen;  ///< as orvane/support/disks/DiskLookup.h takes them
     bool scansSystemDisks = true;
+    pellar::OutputLimits outputLimits;
     std::function<void()> closed;  ///< the window is closed for good
 };
 
@@ -68,6 +69,8 @@ private:
     void ejectSelection();
     bool canEjectSelection();
     fixwell::OutlineView* log();
+    void reloadLog();
+    void completeLog();
     std::string selectionHTML();
     bool canEdit(fixwell::Selector action);
     void selectAll();

@@ -22,7 +22,9 @@ public:
 
     /// Takes up the rows there are now. When there are only more of them, the selection and the
     /// place of the view stay.
-    void reload();
+    /// How the rows differ from those before.
+    enum class Change { None, MoreAtEnd, MoreInFront, Other };
+    Change reload();
 
     int rowCount(const QModelIndex& parent = {}) const override;
     /// The row's plain text for Qt::DisplayRole; the rest is the delegate's.
@@ -31,7 +33,8 @@ public:
 
 private:
     std::size_t countRows() const;
-    bool hasOnlyGrown(int rows) const;
+    Change changeTo(int rows) const;
+    bool holdsOldRows(int offset) const;
     void remember(int rows);
 
     fixwell::OutlineView* view_ = nullptr;
