@@ -80,6 +80,9 @@ SupportOptions DesktopSession::supportOptions()
     options.errorText = [this](fixwell::ErrorCode code) {
         return pellar::errorText(code, libraryTexts_);
     };
+    options.historyCompleted = [this] {
+        reloadLog();
+    };
     options.warn = [this](const std::string& sentence) {
         warn(sentence);
     };

@@ -80,6 +80,8 @@ private:
     void ejectSelection();
     bool canEjectSelection();
     fixwell::OutlineView* log();
+    void reloadLog();
+    void completeLog();
     std::string selectionHTML();
     bool canEdit(fixwell::Selector action);
     void selectAll();

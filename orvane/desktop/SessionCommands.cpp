@@ -30,7 +30,10 @@ std::vector<Menu> DesktopSession::menus()
           }},
          line,
          {"print", "&Print…", QKeySequence::Print,
-          [this] { activeTab()->module().printModuleSpecific(&window_); },
+          [this] {
+              completeLog();
+              activeTab()->module().printModuleSpecific(&window_);
+          },
           [this] {
               return activeTab() != nullptr && activeTab()->module().canPrint();
           }},
@@ -107,6 +110,19 @@ fixwell::OutlineView* DesktopSession::log()
                                                          : nullptr;
 }
 
+void DesktopSession::reloadLog()
+{
+    if (log() != nullptr)
+        activeTab()->interface()->outlinePeer()->reloadData();
+}
+
+// Who takes the whole log wants the oldest rows, too.
+void DesktopSession::completeLog()
+{
+    if (host_.histories().loadAll())
+        reloadLog();
+}
+
 std::string DesktopSession::selectionHTML()
 {
     return log() != nullptr ? activeTab()->interface()->outlinePeer()->selectionHTML()
@@ -123,8 +139,10 @@ void DesktopSession::selectAll()
 {
     if (window_.disks().hasFocus())
         window_.disks().selectAll();
-    else
+    else {
+        completeLog();
         log()->selectAll(&window_);
+    }
 }
 
 QtButton* DesktopSession::detailsButton()

@@ -130,7 +130,7 @@ TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
     EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
     EXPECT_TRUE(disk->fsckHistory().isSameAs(disk->fsckHistory())) << "put together once";
     disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 2}, {n = 3})");
+    EXPECT_EQ(shown(), "({n = 1}, {n = 3}, {n = 2})") << "the newest is the last";
     disk->parts()[0]->clearFsckHistory();
     disk->parts()[0]->fsckHistoryNoChildren().append(record(4));
     EXPECT_EQ(shown(), "({n = 1}, {n = 4}, {n = 3})") << "as many as before, but others";

@@ -29,7 +29,9 @@ public:
 
     /// Takes up the rows there are now. When there are only more of them, the selection and the
     /// place of the view stay.
-    void reload();
+    /// How the rows differ from those before.
+    enum class Change { None, MoreAtEnd, MoreInFront, Other };
+    Change reload();
 
     int rowCount(const QModelIndex& parent = {}) const override;
     /// The row's plain text for Qt::DisplayRole, and with its type for Qt::AccessibleTextRole; the
@@ -40,7 +42,8 @@ public:
 private:
     QString spokenText(const fixwell::OutlineItem& item) const;
     std::size_t countRows() const;
-    bool hasOnlyGrown(int rows) const;
+    Change changeTo(int rows) const;
+    bool holdsOldRows(int offset) const;
     void remember(int rows);
 
     fixwell::OutlineView* view_ = nullptr;

@@ -46,7 +46,7 @@ MainWindow::MainWindow(const Translator& texts)
     splitter_->setChildrenCollapsible(false);
     splitter_->setStretchFactor(0, 2);
     splitter_->setStretchFactor(1, 3);
-    splitter_->setSizes({460, 660});
+    splitter_->setSizes({380, 740});
 
     auto* const content = new QWidget(this);
     auto* const layout = new QVBoxLayout(content);

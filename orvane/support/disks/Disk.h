@@ -6,6 +6,7 @@
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/disks/DiskFilesystem.h"
 #include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/MergedHistory.h"
 
 #include <memory>
 #include <optional>
@@ -71,17 +72,6 @@ public:
     bool clearFsckHistory() override;
 
 private:
-    /// The histories that a merged one was put together from: enough to see that none of them has
-    /// changed since.
-    struct Part {
-        fixwell::Array history;
-        std::size_t size;
-        fixwell::Value first;
-        fixwell::Value last;
-
-        bool isCurrent(const fixwell::Array& other) const;
-    };
-
     std::vector<std::shared_ptr<Disk>> inside() const;
     void collectHistories(std::vector<fixwell::Array>& histories) const;
 
@@ -95,8 +85,8 @@ private:
     std::shared_ptr<Disk> contents_;
 
     mutable fixwell::Array own_;
-    mutable fixwell::Array merged_;
-    mutable std::vector<Part> mergedFrom_;
+    mutable std::uint64_t ownRevision_ = 0;  ///< of the keeper, when it was asked
+    mutable MergedHistory merged_;
 };
 
 }  // namespace orvane

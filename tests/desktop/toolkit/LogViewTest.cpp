@@ -52,6 +52,31 @@ TEST_F(LogView, SelectionStaysWhileTheLogGrowsAndGoesWithTheLog)
     EXPECT_EQ(rowText(3), QStringLiteral("d"));
 }
 
+TEST_F(LogView, ALogOpensAtItsEndAndStaysWhereItIsWhenOlderRowsComeInFront)
+{
+    for (int i = 100; i < 300; ++i)
+        addRow("row " + std::to_string(i));
+    selectDisk();
+    EXPECT_EQ(view->verticalScroller()->value(), 1.0);
+    table().selectRow(50);
+    table().verticalScrollBar()->setValue(table().verticalScrollBar()->maximum() / 2);
+    const auto rowInSight = [&] {
+        return rowText(table().rowAt(1));
+    };
+    const QString before = rowInSight();
+
+    const fixwell::Array newest = disk->history;
+    disk->history = fixwell::Array::make();
+    for (int i = 0; i < 100; ++i)
+        addRow("row " + std::to_string(i));
+    disk->history.append(newest);
+    reload();
+    EXPECT_EQ(rowText(0), QStringLiteral("row 0"));
+    EXPECT_EQ(rowInSight(), before);
+    EXPECT_EQ(view->selectedRowIndexes(), std::vector<std::size_t>{150})
+        << "the same row as before";
+}
+
 TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
 {
     for (int i = 0; i < 1'000'000; ++i)
