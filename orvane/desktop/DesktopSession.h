@@ -84,6 +84,7 @@ private:
     void completeLog();
     std::string selectionHTML();
     bool canEdit(fixwell::Selector action);
+    bool isInDiskList() const;
     void selectAll();
     QtButton* detailsButton();
 

@@ -52,8 +52,8 @@ TEST_F(TwoWindowsTest, NeitherLosesARecordOfTheOther)
     open({ours, theirs, shared});
     verify(ours);
     session().host().histories().saveNew();
-    const std::size_t rowsOfOne = store().load(keyOf(ours)).size();
-    ASSERT_GT(rowsOfOne, 0U);
+    const std::int64_t rowsOfOne = store().recordsOf(keyOf(ours)).size();
+    ASSERT_GT(rowsOfOne, 0);
 
     const pid_t children[] = {startOtherWindow(theirs, times), startOtherWindow(shared, times)};
     for (int i = 0; i < times; ++i) {
@@ -79,7 +79,9 @@ TEST_F(TwoWindowsTest, NeitherLosesARecordOfTheOther)
         EXPECT_EQ(runs.size(), c.runs) << c.because;
         for (const orvane::Run& run : runs)
             EXPECT_EQ(run.end ? run.end->verdict : "cut off", "sound") << c.because;
-        EXPECT_EQ(store().load(keyOf(c.image)).size(), c.runs * rowsOfOne) << c.because;
+        EXPECT_EQ(store().recordsOf(keyOf(c.image)).size(),
+                  static_cast<std::int64_t>(c.runs) * rowsOfOne)
+            << c.because;
     }
     EXPECT_EQ(sheet(), nullptr) << "nobody was warned";
 }

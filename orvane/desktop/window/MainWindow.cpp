@@ -68,17 +68,19 @@ void MainWindow::tellOfChange()
 
 bool MainWindow::hasAttention() const
 {
+    if (isMinimized())
+        return false;
+    // Who reads the help beside the window goes on working in the window.
     const QWidget* const active = QApplication::activeWindow();
-    return active == nullptr || active == this ||
-           (active->isModal() && active->parentWidget() != nullptr &&
-            active->parentWidget()->window() == this);
+    return active == nullptr || active == this || !active->isModal() ||
+           (active->parentWidget() != nullptr && active->parentWidget()->window() == this);
 }
 
 // Which window is the active one is settled only when every window has heard of the change.
 void MainWindow::changeEvent(QEvent* event)
 {
     QMainWindow::changeEvent(event);
-    if (event->type() == QEvent::ActivationChange)
+    if (event->type() == QEvent::ActivationChange || event->type() == QEvent::WindowStateChange)
         QTimer::singleShot(0, this, [this] {
             if (hasAttention() != hadAttention_)
                 tellOfChange();
