@@ -7,6 +7,9 @@
 #include <QApplication>
 #include <QPainter>
 
+#include <algorithm>
+#include <cmath>
+
 namespace orvane::desktop {
 namespace {
 
@@ -57,8 +60,9 @@ public:
 
     void drawAtEnd(const QString& text)
     {
-        const int width = std::min(painter_.fontMetrics().horizontalAdvance(text), left_.width());
-        draw(takeFromEnd(width), text);
+        // Whole pixels hold what was measured in fractions of them.
+        const double width = std::ceil(QFontMetricsF(painter_.font()).horizontalAdvance(text)) + 1;
+        draw(takeFromEnd(std::min(static_cast<int>(width), left_.width())), text);
     }
 
     void drawAtEnd(const QIcon& icon)
