@@ -5,6 +5,7 @@
 #include "pellar/volumes/SystemPaths.h"
 
 #include <chrono>
+#include <filesystem>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -23,6 +24,10 @@ struct ManagerOptions {
     /// empty. Not called after the PLRepairDisk has been destroyed.
     std::function<void(std::string_view)> commandTrace;
     SystemPaths systemPaths;
+    /// Where it is kept what archives have said about their packages' files, so that the next
+    /// verification of permissions needs no archive; absolute, made when it is needed, of no use
+    /// when others can write to it. Empty: nothing is kept.
+    std::filesystem::path permissionReferences;
 };
 
 }  // namespace pellar

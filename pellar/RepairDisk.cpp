@@ -2,6 +2,8 @@
 #include "pellar/RepairDisk.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/jobs/PermissionsScript.h"
+#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -47,14 +49,14 @@ ErrorCode RepairDisk::beginStoragesystemFilesystemRepairForDisk(const DiskRefere
     return begin(disk, Operation::Repair);
 }
 
-ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPermissions(disk, Operation::Verify);
 }
 
-ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPermissions(disk, Operation::Repair);
 }
 
 ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer&)
@@ -121,6 +123,27 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     return fixwell::kPLNoError;
 }
 
+ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operation operation)
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    const bool isSystem = !disk->isWhole && !disk->mountPoint.empty() &&
+                          installedSystemAt(disk->mountPoint) != PackageDatabase::None;
+    if (!isSystem) {
+        if (options_.commandTrace)
+            options_.commandTrace(
+                texts_.text("the volume is not mounted as the root of a system "
+                            "with a package database that is known here"));
+        return fixwell::kPLErrorUnsupported;
+    }
+    start(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
+    });
+    return fixwell::kPLNoError;
+}
+
 /// What can be said without touching the disk.
 ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operation) const
 {
@@ -140,12 +163,22 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
     return capability.error;
 }
 
+// A script maker can be copied, a claim cannot.
 void RepairDisk::start(JobRequest request)
 {
-    EventReceiver receiver{&delegate_, request.disk, options_.commandTrace, [this] {
+    const DiskReferencePointer disk = request.disk;
+    const auto shared = std::make_shared<JobRequest>(std::move(request));
+    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+    });
+}
+
+void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
+{
+    EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();
                            }};
-    job_ = std::make_unique<Job>(std::move(request), std::move(receiver), loop_, options_, texts_);
+    job_ = std::make_unique<Job>(makeScript, std::move(receiver), loop_);
 }
 
 }  // namespace pellar

@@ -6,6 +6,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
+#include "pellar/jobs/JobScript.h"
 
 #include <memory>
 
@@ -45,7 +46,10 @@ private:
                                     fixwell::ErrorCode error);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
+    fixwell::ErrorCode beginPermissions(const fixwell::DiskReferencePointer& disk,
+                                        Operation operation);
     void start(JobRequest request);
+    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;
