@@ -6,6 +6,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
+#include "pellar/tools/Operation.h"
 
 #include <memory>
 
@@ -41,9 +42,11 @@ public:
 
 private:
     fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
+    fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
+                                         Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
-    void start(JobRequest request);
+    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;
