@@ -139,7 +139,13 @@ JobScript::State JobScript::confirm()
     const Judgement judgement = judge(runOnce(Access::ReadOnly));
     if (isWorthAnotherPass(passes_, judgement))
         return State::Repairing;
-    return end(outcomeOfRepair(passes_, judgement));
+    const Outcome outcome = outcomeOfRepair(passes_, judgement);
+    // The verification behind it decides, but a repair that was cut off is not kept quiet about.
+    if (outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired)
+        for (const RepairPass& pass : passes_)
+            if (pass.judgement.verdict == Verdict::Failed)
+                log_.failure(pass.judgement.reason.in(texts_));
+    return end(outcome);
 }
 
 JobScript::State JobScript::end(Outcome outcome)
@@ -172,12 +178,19 @@ RunEvidence JobScript::runOnce(Access access)
 Judgement JobScript::judge(const RunEvidence& evidence) const
 {
     Judgement judgement = tool_->judge(evidence);
-    if (judgement.verdict != Verdict::Stopped && !claim_->isStillWhole())
-        return {Verdict::Failed,
-                fixwell::kPLErrorDiskChanged,
-                judgement.detail,
-                {"the disk became shorter or unreadable meanwhile", {}, {}},
-                false};
+    if (judgement.verdict == Verdict::Stopped)
+        return judgement;
+    const auto lost = [&judgement](std::string_view reason) {
+        return Judgement{Verdict::Failed,
+                         fixwell::kPLErrorDiskChanged,
+                         judgement.detail,
+                         {reason, {}, {}},
+                         false};
+    };
+    if (!claim_->isStillWhole())
+        return lost("the disk became shorter or unreadable meanwhile");
+    if (!claim_->isStillInPlace())
+        return lost("the disk was deleted, moved or replaced meanwhile");
     return judgement;
 }
 
