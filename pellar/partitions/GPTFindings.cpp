@@ -73,8 +73,9 @@ void addCopies(const PartitionMap& map, Findings& findings)
     if (map.primary.isGood() && map.backup.isGood() &&
         !isSameTable(map.primary.header.header, map.backup.header.header))
         findings.push_back({FindingKind::CopiesDiffer, {}});
-    // Restoring the main copy would overwrite the start of what fills the disk.
-    if (!map.primary.isGood() && !map.wholeSignature.empty())
+    // A repair would write over the start or the end of what fills the disk: a file system, or the
+    // superblock that a RAID keeps behind an array with a map of its own.
+    if (!map.hasCopiesInPlace() && !map.wholeSignature.empty())
         findings.push_back({FindingKind::DiskFilled, {map.wholeSignature}});
 }
 

@@ -54,14 +54,13 @@ FileSectors sectorsOf(int descriptor, std::uint64_t offset, std::uint64_t length
     return !hasGPTHeader(usual) && hasGPTHeader(large) ? large : usual;
 }
 
-// What fills the disk matters only where no map is plainly in force, and takes longer to find out.
+// What fills the disk matters only where the map is not plainly in force, and takes longer to find.
 PartitionMap readMapOf(int descriptor, const FileSectors& sectors, std::uint64_t offset,
                        std::uint64_t length)
 {
     PartitionMap map = readPartitionMap(sectors, {});
-    const bool isInForce =
-        map.boot.hasProtective() ? map.primary.isGood() : map.boot.ordinaryCount() > 0;
-    if (isInForce && map.kind != PartitionMap::Kind::None)
+    const bool isPlainMBR = map.kind == PartitionMap::Kind::MBR && map.boot.ordinaryCount() > 0;
+    if (isPlainMBR || (map.boot.hasProtective() && map.hasCopiesInPlace()))
         return map;
     const Signature signature = probeSignature(descriptor, offset, length);
     return readPartitionMap(sectors, signature.isAmbivalent ? "?" : signature.type);

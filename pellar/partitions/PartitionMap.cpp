@@ -94,6 +94,11 @@ const GPTCopy* PartitionMap::validCopy() const
     return backup.isGood() ? &backup : nullptr;
 }
 
+bool PartitionMap::hasCopiesInPlace() const
+{
+    return primary.isGood() && backup.isGood() && backupPlace == lastSector();
+}
+
 PartitionMap readPartitionMap(const Sectors& sectors, std::string wholeSignature)
 {
     constexpr std::uint64_t fewestSectors = 2;

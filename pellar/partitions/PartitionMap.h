@@ -41,6 +41,8 @@ struct PartitionMap {
     std::uint64_t lastSector() const { return sectorCount - 1; }
     /// The copy that counts: the primary where it is good. Null when neither is.
     const GPTCopy* validCopy() const;
+    /// Both copies are good, and the backup is the disk's last sector.
+    bool hasCopiesInPlace() const;
 };
 
 /// Reads the map, from a few sectors at the start and the end of the disk.

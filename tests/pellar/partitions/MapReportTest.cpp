@@ -269,6 +269,25 @@ TEST(MapReport, AFileSystemInAnOldMapsPlaceIsLeftAlone)
         << kindsOf(report);
 }
 
+// A RAID keeps its superblock behind the array's map, which then is not at the end of the disk; the
+// mark of an optical disc is easier to make.
+TEST(MapReport, WhatFillsTheDiskMayOwnItsEnd)
+{
+    const test::Workshop workshop;
+    const DiskImage disk = DiskImage::gpt(workshop);
+    disk.put(32768, Bytes{1, 'C', 'D', '0', '0', '1', 1});
+    disk.put(32768 + 2048, Bytes{255, 'C', 'D', '0', '0', '1', 1});
+    EXPECT_EQ(reportOf(disk.path()).verdict, MapVerdict::Sound);
+    disk.resize(20 * test::mebibyte);
+    const MapReport grown = reportOf(disk.path());
+    EXPECT_TRUE(grown.verdict == MapVerdict::NeedsPerson && grown.has(DiskFilled))
+        << kindsOf(grown);
+    disk.resize(16 * test::mebibyte);
+    disk.fill(backupHeader, 512, 0);
+    const MapReport lost = reportOf(disk.path());
+    EXPECT_TRUE(lost.verdict == MapVerdict::NeedsPerson && lost.has(DiskFilled)) << kindsOf(lost);
+}
+
 TEST(MapReport, AnOlderGPTUnderAnMBRIsANote)
 {
     const test::Workshop workshop;
