@@ -3,6 +3,7 @@
 
 #include "pellar/RepairDisk.h"
 #include "pellar/partitions/MapDisk.h"
+#include "pellar/partitions/MapOutcome.h"
 #include "pellar/tools/Capability.h"
 
 #include <utility>
@@ -31,14 +32,17 @@ bool Manager::canRepair(std::string_view filesystemType) const
     return capabilityFor(filesystemType, Operation::Repair, options_.toolPath).isGiven();
 }
 
-bool Manager::hasPartitionMap(const fixwell::DiskReference& disk) const
-{
-    return glanceAtMap(disk).kind != PartitionMap::Kind::None;
-}
-
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
 {
     return capabilityFor(filesystemType, operation, options_.toolPath).reason.in(texts_);
+}
+
+std::string Manager::reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const
+{
+    const PartitionMap map = glanceAtMap(disk);
+    return map.kind == PartitionMap::Kind::None
+               ? outcomeOfMapVerification(map, reportOn(map)).reason.in(texts_)
+               : std::string();
 }
 
 }  // namespace pellar

@@ -30,9 +30,9 @@ public:
     /// Why not, in the user's language; empty when it can.
     std::string reasonAgainst(std::string_view filesystemType, Operation operation) const;
 
-    /// The disk has a partition map that can be verified, and repaired where a copy of it is left.
-    /// Reads a few sectors.
-    bool hasPartitionMap(const fixwell::DiskReference& disk) const;
+    /// Why the disk's partition map cannot be verified, in the user's language: it has none, or
+    /// cannot be read; empty when it can. Reads a few sectors.
+    std::string reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const;
 
 private:
     fixwell::RunLoop& loop_;

@@ -160,10 +160,9 @@ void Session::detach(const DiskPointer& topLevelDisk)
         host_.sharedDiskController().ejectDisk(topLevelDisk, true);
 }
 
-bool Session::hasPartitionMap(const DiskPointer& disk) const
+std::string Session::reasonAgainstPartitionMap(const DiskPointer& disk) const
 {
-    const fixwell::DiskReferencePointer reference = disk->theKRDisk();
-    return reference && library_.hasPartitionMap(*reference);
+    return library_.reasonAgainstPartitionMap(*disk->theKRDisk());
 }
 
 void Session::select(const std::vector<DiskPointer>& disks)

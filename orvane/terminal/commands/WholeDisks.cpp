@@ -46,14 +46,17 @@ std::string WholeDisks::objection(const NamedDisk& named, const std::shared_ptr<
     const Translator& translator = session_.host().translator();
     if (!whole)
         return session_.host().imageAttachment().lastError(named.disk->diskImagePath());
+    std::string why;
     if (whole->parentDisk() != nullptr)
-        return translator.sentence(
-            "cannot check the partition map of “%@”: it is a part of a disk, not a whole one",
-            {named.name});
-    if (!whole->isWhole() || !session_.hasPartitionMap(whole))
-        return translator.sentence(
-            "cannot check the partition map of “%@”: there is no partition map", {named.name});
-    return {};
+        why = translator.text("it is a part of a disk, not a whole one");
+    else
+        why = session_.reasonAgainstPartitionMap(whole);
+    // What fills a disk and looks like a map besides (an optical image) is listed as one volume.
+    if (why.empty() && !whole->isWhole())
+        why = translator.text("it is one volume, not a disk with partitions");
+    return why.empty() ? why
+                       : translator.sentence("cannot check the partition map of “%@”: %@",
+                                             {named.name, why});
 }
 
 }  // namespace orvane

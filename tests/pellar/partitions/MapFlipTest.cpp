@@ -109,6 +109,48 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
     }
 }
 
+// The power may fail at any moment of a repair: after a write, or with half of one on the disk.
+TEST(MapFlips, AnInterruptedRepairCanAlwaysBeFinished)
+{
+    struct Case {
+        std::string_view because;
+        std::size_t from;
+        std::size_t length;  ///< set to zero
+        std::size_t grownBy;
+    };
+    const test::Workshop workshop;
+    const Bytes sound = DiskImage::smallGPT(workshop).bytes();
+    const std::size_t last = sound.size() - 512;
+    for (const Case& c :
+         {Case{"main copy lost", 512, 33UL * 512, 0}, Case{"main list lost", 1024, 512, 0},
+          Case{"backup lost", last - 32UL * 512, 33UL * 512, 0},
+          Case{"everything but the backup lost", 0, 34UL * 512, 0}, Case{"grown", 0, 0, 100},
+          Case{"grown by less than a copy takes", 0, 0, 5},
+          Case{"grown, main copy lost", 512, 33UL * 512, 100},
+          Case{"grown a little, main copy lost", 512, 33UL * 512, 5}}) {
+        MemorySectors disk(sound);
+        std::fill_n(disk.bytes.begin() + static_cast<std::ptrdiff_t>(c.from), c.length,
+                    std::uint8_t{0});
+        disk.bytes.resize(sound.size() + c.grownBy * 512);
+        const Bytes finished = repaired(disk);
+        const PartitionMap map = readPartitionMap(disk, {});
+        const auto planned = planRepair(map, reportOn(map), disk);
+        ASSERT_TRUE(std::holds_alternative<RepairPlan>(planned)) << c.because;
+        for (const SectorWrite& write : std::get<RepairPlan>(planned).writes) {
+            const auto place = static_cast<std::ptrdiff_t>(write.first * 512);
+            for (std::size_t done = 0; done <= write.after.size(); done += 512) {
+                std::copy_n(write.after.begin(), done, disk.bytes.begin() + place);
+                if (disk.bytes != finished) {
+                    EXPECT_EQ(reportOf(disk).verdict, MapVerdict::Repairable)
+                        << c.because << ", sector " << write.first << ", byte " << done;
+                }
+                EXPECT_TRUE(repaired(disk) == finished)
+                    << c.because << ", sector " << write.first << ", byte " << done;
+            }
+        }
+    }
+}
+
 // A disk of noise behind the right signatures: nothing crashes, nothing is sound.
 TEST(MapFlips, NoiseIsNeverSound)
 {
