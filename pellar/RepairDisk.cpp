@@ -8,6 +8,9 @@
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
+#include <sys/stat.h>
+
+#include <algorithm>
 #include <utility>
 #include <variant>
 
@@ -98,13 +101,27 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
-        return *error;
-    // A script maker can be copied, a claim cannot.
-    const auto request = std::make_shared<JobRequest>(JobRequest{
-        disk, operation, std::move(std::get<DiskClaim>(claim)), toolFor(disk->filesystem)});
-    start(disk, [this, request](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<JobScript>(std::move(*request), options_, texts_, stop, road);
-    });
+        return beginMounted(disk, operation, *error);
+    start({disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    return fixwell::kPLNoError;
+}
+
+// Unmounting may take long, so it is the job's. What the system itself runs from is not tried.
+ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation operation,
+                                   ErrorCode error)
+{
+    struct stat status = {};
+    const bool isDevice = ::stat(disk->path.c_str(), &status) == 0 && S_ISBLK(status.st_mode);
+    const bool mayBeMounted =
+        error == fixwell::kPLErrorCouldNotUnmount || error == fixwell::kPLErrorDiskInUse;
+    if (!isDevice || !mayBeMounted)
+        return error;
+    auto mounts = mountPlacesOf(status.st_rdev, options_.systemPaths);
+    const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
+                                    [](const MountPlace& place) { return place.target == "/"; });
+    if (mounts.empty() || isRoot)
+        return error;
+    start({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
 }
 
@@ -118,7 +135,7 @@ ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operat
         return fixwell::kPLErrorNoDiskReference;
     if (!disk->isWhole)
         return fixwell::kPLErrorUnsupported;
-    start(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+    run(disk, [&, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
     });
     return fixwell::kPLNoError;
@@ -143,7 +160,16 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
     return capability.error;
 }
 
-void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
+void RepairDisk::start(JobRequest request)
+{
+    // A script maker can be copied, a claim cannot.
+    const auto kept = std::make_shared<JobRequest>(std::move(request));
+    run(kept->disk, [this, kept](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*kept), options_, texts_, stop, road);
+    });
+}
+
+void RepairDisk::run(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
     EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();

@@ -6,6 +6,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
+#include "pellar/jobs/JobScript.h"
 #include "pellar/tools/Operation.h"
 
 #include <memory>
@@ -42,11 +43,14 @@ public:
 
 private:
     fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
+    fixwell::ErrorCode beginMounted(const fixwell::DiskReferencePointer& disk, Operation operation,
+                                    fixwell::ErrorCode error);
     fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
                                          Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
-    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
+    void start(JobRequest request);
+    void run(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;

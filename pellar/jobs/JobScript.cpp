@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobScript.h"
 
+#include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/ToolTable.h"
@@ -23,6 +24,7 @@ Outcome failure(fixwell::ErrorCode code, Sentence reason)
 JobScript::JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
                      StopSwitch& stop, EventRoad& road)
     : claim_(std::move(request.claim)),
+      mounts_(std::move(request.mounts)),
       operation_(request.operation),
       tool_(request.tool),
       options_(options),
@@ -40,7 +42,7 @@ void JobScript::run()
     for (State state = State::Examining; state != State::Done;)
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
-    claim_.reset();
+    giveDiskBack();
     report();
 }
 
@@ -56,8 +58,40 @@ JobScript::State JobScript::next(State state)
     return State::Done;
 }
 
+/// Why the disk cannot be had; none when it is ours.
+std::optional<Outcome> JobScript::takeDisk()
+{
+    if (claim_)
+        return std::nullopt;
+    log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
+    road_.flush();  // what is still to be written may take long
+    auto unmounted = UnmountedDisk::take(std::move(mounts_), options_.systemPaths);
+    if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
+        return failure(fixwell::kPLErrorCouldNotUnmount, *refusal);
+    unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
+    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    auto claim = DiskClaim::take(*disk_, access, options_.systemPaths);
+    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
+        return failure(*error, {"it was unmounted, but could not be opened", {}, {}});
+    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
+    return std::nullopt;
+}
+
+void JobScript::giveDiskBack()
+{
+    claim_.reset();
+    if (!unmounted_)
+        return;
+    log_.step(fixwell::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
+    for (const Sentence& failure : unmounted_->mountAgain())
+        log_.error(failure);
+    unmounted_.reset();
+}
+
 JobScript::State JobScript::examine()
 {
+    if (const auto refusal = takeDisk())
+        return end(*refusal);
     if (tool_ == nullptr)
         tool_ = findTool();
     if (tool_ != nullptr) {

@@ -64,7 +64,8 @@ PartitionMap MapClaim::readMap() const
 
 bool MapClaim::rereadPartitions() const
 {
-    return !isBlockDevice(disk_.get()) || ::ioctl(disk_.get(), BLKRRPART) == 0;
+    // EINVAL: a device that takes no partitions of itself, as most loop devices.
+    return !isBlockDevice(disk_.get()) || ::ioctl(disk_.get(), BLKRRPART) == 0 || errno == EINVAL;
 }
 
 }  // namespace pellar
