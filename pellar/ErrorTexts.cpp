@@ -3,6 +3,7 @@
 
 #include "fixwell/host/foundation/Format.h"
 #include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/partitions/MapErrorCodes.h"
 
 #include <algorithm>
 #include <array>
@@ -46,6 +47,11 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorDiskChanged, "The disk changed while it was being checked."},
     ErrorText{fixwell::kPLErrorReadOnly, "The disk cannot be written, so it cannot be repaired."},
     ErrorText{fixwell::kPLErrorBusy, "Another operation is still running."},
+    ErrorText{kPLErrorNoPartitionMap, "There is no partition map on the disk."},
+    ErrorText{kPLErrorMapDamaged, "The partition map is damaged; use Repair Disk."},
+    ErrorText{kPLErrorMapNeedsPerson,
+              "The partition map is damaged in a way that only a person can put right."},
+    ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},
 };
 
 }  // namespace

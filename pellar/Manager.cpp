@@ -2,6 +2,8 @@
 #include "pellar/Manager.h"
 
 #include "pellar/RepairDisk.h"
+#include "pellar/partitions/MapDisk.h"
+#include "pellar/partitions/MapOutcome.h"
 #include "pellar/tools/Capability.h"
 
 #include <utility>
@@ -33,6 +35,14 @@ bool Manager::canRepair(std::string_view filesystemType) const
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
 {
     return capabilityFor(filesystemType, operation, options_.toolPath).reason.in(texts_);
+}
+
+std::string Manager::reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const
+{
+    const PartitionMap map = glanceAtMap(disk);
+    return map.kind == PartitionMap::Kind::None
+               ? outcomeOfMapVerification(map, reportOn(map)).reason.in(texts_)
+               : std::string();
 }
 
 }  // namespace pellar

@@ -30,6 +30,10 @@ public:
     /// Why not, in the user's language; empty when it can.
     std::string reasonAgainst(std::string_view filesystemType, Operation operation) const;
 
+    /// Why the disk's partition map cannot be verified, in the user's language: it has none, or
+    /// cannot be read; empty when it can. Reads a few sectors.
+    std::string reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const;
+
 private:
     fixwell::RunLoop& loop_;
     const Texts& texts_;

@@ -2,7 +2,10 @@
 #include "pellar/RepairDisk.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/MapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/partitions/MapDisk.h"
 #include "pellar/permissions/InstalledSystem.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
@@ -59,19 +62,20 @@ ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer& 
     return beginPermissions(disk, Operation::Repair);
 }
 
-ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Verify);
 }
 
-ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Repair);
 }
 
-bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer&, ErrorCode* error)
+bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
 {
-    return answer(false, error);
+    const bool isDisk = disk && !disk->path.empty() && disk->isWhole;
+    return answer(isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None, error);
 }
 
 bool RepairDisk::canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
@@ -123,22 +127,38 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     return fixwell::kPLNoError;
 }
 
+// The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
+// begin says nothing.
+ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operation operation)
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    if (!disk->isWhole)
+        return fixwell::kPLErrorUnsupported;
+    run(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
+    });
+    return fixwell::kPLNoError;
+}
+
+// The volume stays mounted, and need not be claimed: its files are what is looked at.
 ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operation operation)
 {
     if (job_)
         return fixwell::kPLErrorBusy;
     if (!disk || disk->path.empty())
         return fixwell::kPLErrorNoDiskReference;
-    const bool isSystem = !disk->isWhole && !disk->mountPoint.empty() &&
-                          installedSystemAt(disk->mountPoint) != PackageDatabase::None;
-    if (!isSystem) {
+    if (disk->isWhole || disk->mountPoint.empty() ||
+        installedSystemAt(disk->mountPoint) == PackageDatabase::None) {
         if (options_.commandTrace)
             options_.commandTrace(
-                texts_.text("the volume is not mounted as the root of a system "
-                            "with a package database that is known here"));
+                texts_.text("the volume is not mounted as the root of a system with a package "
+                            "database that is known here"));
         return fixwell::kPLErrorUnsupported;
     }
-    start(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+    run(disk, [&, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
     });
     return fixwell::kPLNoError;
@@ -163,17 +183,16 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
     return capability.error;
 }
 
-// A script maker can be copied, a claim cannot.
 void RepairDisk::start(JobRequest request)
 {
-    const DiskReferencePointer disk = request.disk;
-    const auto shared = std::make_shared<JobRequest>(std::move(request));
-    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+    // A script maker can be copied, a claim cannot.
+    const auto kept = std::make_shared<JobRequest>(std::move(request));
+    run(kept->disk, [this, kept](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*kept), options_, texts_, stop, road);
     });
 }
 
-void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
+void RepairDisk::run(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
     EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();

@@ -7,6 +7,7 @@
 #include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobScript.h"
+#include "pellar/tools/Operation.h"
 
 #include <memory>
 
@@ -44,12 +45,14 @@ private:
     fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
     fixwell::ErrorCode beginMounted(const fixwell::DiskReferencePointer& disk, Operation operation,
                                     fixwell::ErrorCode error);
-    fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
-                               Operation operation) const;
+    fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
+                                         Operation operation);
     fixwell::ErrorCode beginPermissions(const fixwell::DiskReferencePointer& disk,
                                         Operation operation);
+    fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
+                               Operation operation) const;
     void start(JobRequest request);
-    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
+    void run(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;

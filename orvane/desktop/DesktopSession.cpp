@@ -95,6 +95,8 @@ pellar::ManagerOptions DesktopSession::libraryOptions() const
     options.outputLimits = options_.outputLimits;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
+    if (!options_.paths.state.empty())
+        options.savedSectorsDirectory = options_.paths.state / "partition-maps";
     return options;
 }
 

@@ -39,6 +39,8 @@ public:
     /// given back with `detach`.
     DiskPointer attach(const DiskPointer& image);
     void detach(const DiskPointer& topLevelDisk);
+    /// Why the library cannot treat the disk's partition map; empty when it can.
+    std::string reasonAgainstPartitionMap(const DiskPointer& disk) const;
 
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);

@@ -25,9 +25,13 @@ public:
 
     explicit LoopDevice(const std::string& image)
     {
+        // Another test may take the free one first.
+        constexpr int mostTries = 20;
         const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
-        number_ = control ? ::ioctl(control.get(), LOOP_CTL_GET_FREE) : -1;
-        attach(image);
+        for (int i = 0; control && number_ < 0 && i < mostTries; ++i) {
+            number_ = ::ioctl(control.get(), LOOP_CTL_GET_FREE);
+            attach(image);
+        }
     }
     LoopDevice(const LoopDevice&) = delete;
     LoopDevice& operator=(const LoopDevice&) = delete;
