@@ -95,8 +95,10 @@ pellar::ManagerOptions DesktopSession::libraryOptions() const
     options.outputLimits = options_.outputLimits;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
-    if (!options_.paths.state.empty())
+    if (!options_.paths.state.empty()) {
         options.savedSectorsDirectory = options_.paths.state / "partition-maps";
+        options.permissionReferences = options_.paths.state / "permissions";
+    }
     return options;
 }
 

@@ -84,8 +84,10 @@ pellar::ManagerOptions Session::libraryOptions(const Request& request)
     pellar::ManagerOptions options;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
-    if (const auto state = userXDGPaths().state; !state.empty())
+    if (const auto state = userXDGPaths().state; !state.empty()) {
         options.savedSectorsDirectory = state / "partition-maps";
+        options.permissionReferences = state / "permissions";
+    }
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));

@@ -36,6 +36,7 @@ PermissionsScript::PermissionsScript(fixwell::DiskReferencePointer disk, Operati
       road_(road),
       log_(*disk_, texts, road)
 {
+    log_.leaveLinesOpen();
 }
 
 void PermissionsScript::run()

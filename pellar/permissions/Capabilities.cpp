@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/Capabilities.h"
 
+#include "pellar/process/FileDescriptor.h"
+
+#include <fcntl.h>
 #include <sys/capability.h>
 #include <sys/xattr.h>
 
@@ -61,7 +64,9 @@ int setCapabilities(int object, const std::string& text)
     const CapabilitySet set(::cap_from_text(text.c_str()));
     if (!set)
         return EINVAL;
-    return ::cap_set_file(path.c_str(), set.get()) == 0 ? 0 : errno;
+    // libcap takes neither an O_PATH descriptor nor a name that is a link.
+    const FileDescriptor file(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    return file && ::cap_set_fd(file.get(), set.get()) == 0 ? 0 : errno;
 }
 
 }  // namespace pellar

@@ -24,6 +24,7 @@ bool isNameCharacter(char c)
 struct Token {
     std::string_view text;
     bool followsVariable;  ///< "$directory/x", "${directory}/x"
+    bool isOpen;           ///< "/usr/bin/$x", "/etc/x/*": it goes on with what is not known
 };
 
 /// Names and paths; everything else only separates them.
@@ -41,8 +42,10 @@ std::vector<Token> tokensIn(std::string_view line)
         place = start;
         while (place < line.size() && isNameCharacter(line[place]))
             ++place;
+        const bool isOpen =
+            place < line.size() && std::string_view("$*?[{").find(line[place]) != std::string::npos;
         if (place > start)
-            tokens.push_back({line.substr(start, place - start), isVariable});
+            tokens.push_back({line.substr(start, place - start), isVariable, isOpen});
         else if (!isVariable)
             ++place;
     }
@@ -112,13 +115,22 @@ void ScriptMentions::add(std::string_view script, const PathAliases& aliases)
         for (const Token& token : line) {
             if (token.text.find('/') == std::string_view::npos)
                 words_.emplace(token.text);
+            else if (token.isOpen && !token.followsVariable)
+                addTree(aliases.canonical(token.text.substr(0, token.text.rfind('/'))));
             else
                 addPath(token.text, !token.followsVariable, isCommand, aliases);
         }
     }
     if (isDeep)
-        std::copy_if(paths_.begin(), paths_.end(), std::back_inserter(trees_),
-                     [](const std::string& path) { return depthOf(path) > 2; });
+        std::for_each(paths_.begin(), paths_.end(),
+                      [this](const std::string& path) { addTree(path); });
+}
+
+// Nobody means all of usr/bin.
+void ScriptMentions::addTree(const std::string& path)
+{
+    if (depthOf(path) > 2)
+        trees_.push_back(path);
 }
 
 // "VARIABLE=/path" and "root:/path" come here whole: the path begins at the first "/".

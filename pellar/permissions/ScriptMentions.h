@@ -31,6 +31,8 @@ private:
     void addPath(std::string_view token, bool isWhole, bool isOnPermissionLine,
                  const PathAliases& aliases);
 
+    void addTree(const std::string& path);
+
     std::set<std::string> paths_;         ///< "/usr/bin/x", without the first "/"
     std::set<std::string> commandPaths_;  ///< those in a line that sets permissions
     std::set<std::string> words_;         ///< names, for loops over them
