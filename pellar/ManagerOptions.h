@@ -5,6 +5,7 @@
 #include "pellar/volumes/SystemPaths.h"
 
 #include <chrono>
+#include <filesystem>
 #include <functional>
 #include <string>
 #include <string_view>
@@ -23,6 +24,9 @@ struct ManagerOptions {
     /// empty. Not called after the PLRepairDisk has been destroyed.
     std::function<void(std::string_view)> commandTrace;
     SystemPaths systemPaths;
+    /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
+    /// made when it is needed. Empty: no partition map is repaired.
+    std::filesystem::path savedSectorsDirectory;
 };
 
 }  // namespace pellar

@@ -2,6 +2,9 @@
 #include "pellar/RepairDisk.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/MapScript.h"
+#include "pellar/partitions/MapDisk.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -57,19 +60,20 @@ ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer&)
     return fixwell::kPLErrorUnsupported;
 }
 
-ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Verify);
 }
 
-ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Repair);
 }
 
-bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer&, ErrorCode* error)
+bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
 {
-    return answer(false, error);
+    const bool isDisk = disk && !disk->path.empty() && disk->isWhole;
+    return answer(isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None, error);
 }
 
 bool RepairDisk::canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
@@ -98,7 +102,8 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
-    start({disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    startVolume(
+        {disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
 }
 
@@ -117,7 +122,33 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
                                     [](const MountPlace& place) { return place.target == "/"; });
     if (mounts.empty() || isRoot)
         return error;
-    start({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    return fixwell::kPLNoError;
+}
+
+// A script maker can be copied, a claim cannot.
+void RepairDisk::startVolume(JobRequest request)
+{
+    const auto disk = request.disk;
+    const auto shared = std::make_shared<JobRequest>(std::move(request));
+    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+    });
+}
+
+// The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
+// begin says nothing.
+ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operation operation)
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    if (!disk->isWhole)
+        return fixwell::kPLErrorUnsupported;
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
+    });
     return fixwell::kPLNoError;
 }
 
@@ -140,12 +171,12 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
     return capability.error;
 }
 
-void RepairDisk::start(JobRequest request)
+void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
-    EventReceiver receiver{&delegate_, request.disk, options_.commandTrace, [this] {
+    EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();
                            }};
-    job_ = std::make_unique<Job>(std::move(request), std::move(receiver), loop_, options_, texts_);
+    job_ = std::make_unique<Job>(makeScript, std::move(receiver), loop_);
 }
 
 }  // namespace pellar

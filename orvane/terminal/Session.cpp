@@ -3,6 +3,7 @@
 
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/settings/XDGPaths.h"
 #include "pellar/ErrorTexts.h"
 
 #include <unistd.h>
@@ -83,6 +84,8 @@ pellar::ManagerOptions Session::libraryOptions(const Request& request)
     pellar::ManagerOptions options;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
+    if (const auto state = userXDGPaths().state; !state.empty())
+        options.savedSectorsDirectory = state / "partition-maps";
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));
@@ -155,6 +158,12 @@ void Session::detach(const DiskPointer& topLevelDisk)
 {
     if (topLevelDisk)
         host_.sharedDiskController().ejectDisk(topLevelDisk, true);
+}
+
+bool Session::hasPartitionMap(const DiskPointer& disk) const
+{
+    const fixwell::DiskReferencePointer reference = disk->theKRDisk();
+    return reference && library_.hasPartitionMap(*reference);
 }
 
 void Session::select(const std::vector<DiskPointer>& disks)
