@@ -49,6 +49,7 @@ private:
                                          Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
+    bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);
     void startVolume(JobRequest request);
     void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
