@@ -9,6 +9,7 @@
 
 #include <limits>
 #include <system_error>
+#include <thread>
 #include <utility>
 
 namespace pellar {
@@ -47,6 +48,11 @@ Sentence reasonOf(fixwell::ErrorCode claimError)
     }
 }
 
+Outcome stopped()
+{
+    return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+}
+
 }  // namespace
 
 MapScript::MapScript(fixwell::DiskReferencePointer disk, Operation operation,
@@ -68,22 +74,40 @@ void MapScript::run()
     report(carryOut());
 }
 
+// udev locks a device while it looks at it, as it does after every change (systemd's "Locking Block
+// Device Access"). That is over in a moment; a mount is not.
+std::variant<MapClaim, fixwell::ErrorCode> MapScript::claim() const
+{
+    constexpr std::chrono::milliseconds pause{50};
+    constexpr int mostTries = 40;
+    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    for (int tries = 1;; ++tries) {
+        auto taken = MapClaim::take(*disk_, access, options_.systemPaths);
+        const auto* const error = std::get_if<fixwell::ErrorCode>(&taken);
+        const bool isBusy = error != nullptr && *error == fixwell::kPLErrorDiskInUse;
+        if (!isBusy || tries == mostTries || stop_.isPressed())
+            return taken;
+        std::this_thread::sleep_for(pause);
+    }
+}
+
 // The claim ends here: the disk is given back before the end is told.
 Outcome MapScript::carryOut()
 {
-    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     step({"Reading the partition map of “%1$@”", log_.diskName(), {}}, 5);
-    const auto taken = MapClaim::take(*disk_, access, options_.systemPaths);
+    const auto taken = claim();
+    if (stop_.isPressed())
+        return stopped();
     if (const auto* const error = std::get_if<fixwell::ErrorCode>(&taken))
         return {Verdict::Failed, *error, 0, reasonOf(*error)};
-    const auto& claim = std::get<MapClaim>(taken);
-    const PartitionMap map = claim.readMap();
+    const auto& disk = std::get<MapClaim>(taken);
+    const PartitionMap map = disk.readMap();
     const MapReport found = reportOn(map);
     tellMap(map);
     for (const Finding& finding : found.findings)
         tell(finding);
     if (operation_ == Operation::Repair && found.verdict == MapVerdict::Repairable)
-        return repair(claim, map, found);
+        return repair(disk, map, found);
     const Outcome outcome = outcomeOfMapVerification(map, found);
     return operation_ == Operation::Repair && outcome.verdict == Verdict::Damaged
                ? outcomeOfRefusedRepair(
@@ -101,7 +125,7 @@ Outcome MapScript::repair(const MapClaim& claim, const PartitionMap& map, const 
     if (!save(claim, plan, outcome))
         return outcome;
     if (stop_.isPressed())
-        return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+        return stopped();
     outcome = write(claim, plan);
     if (outcome.verdict == Verdict::Repaired && !claim.rereadPartitions())
         log_.remark(

@@ -22,6 +22,7 @@ public:
 
 private:
     Outcome carryOut();
+    std::variant<MapClaim, fixwell::ErrorCode> claim() const;
     Outcome repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report);
     Outcome write(const MapClaim& claim, const RepairPlan& plan);
     bool save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome);
