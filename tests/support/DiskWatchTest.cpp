@@ -76,8 +76,8 @@ class DiskWatchTest : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "only root can set up a loop device";
+        if (const char* const obstacle = test::LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
         ASSERT_EQ(
             test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "watched", image_, "8M"}), 0);
         ASSERT_FALSE(failed(watch_.start()));

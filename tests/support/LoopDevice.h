@@ -6,6 +6,7 @@
 #include <fcntl.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
+#include <unistd.h>
 
 #include <string>
 
@@ -14,6 +15,14 @@ namespace orvane::test {
 /// A loop device of the kernel over an image file, by loop(4); given back at the end. Needs root.
 class LoopDevice {
 public:
+    /// Why there can be none; null when there can.
+    static const char* obstacle()
+    {
+        if (::geteuid() != 0)
+            return "only root can set up a loop device";
+        return ::access("/sys/block", R_OK) != 0 ? "/sys is not mounted" : nullptr;
+    }
+
     explicit LoopDevice(const std::string& image)
     {
         const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
