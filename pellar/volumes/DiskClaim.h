@@ -28,6 +28,10 @@ public:
     /// Bytes that are really there, from `offset` to the end of the region or the file.
     std::uint64_t availableBytes() const { return availableBytes_; }
 
+    /// The volume takes all of the file or device, from its first byte to its last.
+    bool isAllOfIt() const { return isAllOfIt_; }
+    bool isBlockDevice() const;
+
     /// NO when the disk has become shorter since it was claimed, or its end can no longer be read.
     bool isStillWhole() const;
 
@@ -37,6 +41,7 @@ private:
     FileDescriptor disk_;
     std::uint64_t offset_;
     std::uint64_t availableBytes_;
+    bool isAllOfIt_;
 };
 
 }  // namespace pellar
