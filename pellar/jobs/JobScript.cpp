@@ -105,7 +105,9 @@ JobScript::State JobScript::next(State state)
 
 JobScript::State JobScript::examine()
 {
-    if (tool_ == nullptr)
+    // Only where nothing is known: what is listed as something else may hold the remains of a file
+    // system that was there before.
+    if (tool_ == nullptr && disk_->filesystem.empty())
         tool_ = findTool();
     if (tool_ != nullptr) {
         program_ = findProgram(tool_->name(), options_.toolPath);
@@ -134,10 +136,7 @@ std::optional<Outcome> JobScript::objection() const
     if (tool_ == nullptr)
         return withoutTool();
     if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failure(fixwell::kPLErrorUnsupported,
-                       {"%1$@ can verify this file system, but not repair it",
-                        std::string(tool_->name()),
-                        {}});
+        return failure(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair());
     if (volume_.isForeign)
         return failure(fixwell::kPLErrorUnsupported,
                        {"it holds something other than the file system it is listed with", {}, {}});
@@ -152,16 +151,18 @@ std::optional<Outcome> JobScript::objection() const
 /// What is there is named, where it is something.
 Outcome JobScript::withoutTool() const
 {
-    const Signature found =
-        probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes());
-    if (found.type.empty())
+    std::string type = disk_->filesystem;
+    if (type.empty())
+        type =
+            probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
+    if (type.empty())
         return failure(fixwell::kPLErrorUnsupported,
                        {"no file system was found that can be checked", {}, {}});
-    const Capability capability = capabilityFor(found.type, operation_, options_.toolPath);
+    const Capability capability = capabilityFor(type, operation_, options_.toolPath);
     return failure(fixwell::kPLErrorUnsupported,
                    capability.isGiven()
                        ? Sentence{"its file system looks like “%1$@”, but too little of it is left",
-                                  fixwell::printable(found.type),
+                                  fixwell::printable(type),
                                   {}}
                        : capability.reason);
 }

@@ -91,6 +91,15 @@ constexpr std::array damagedStatuses{1};
 
 }  // namespace
 
+Sentence BtrfsCheck::reasonAgainstRepair() const
+{
+    return {
+        "to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
+        "volume and make this one anew",
+        {},
+        {}};
+}
+
 VolumeFacts BtrfsCheck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
 {
     const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);

@@ -12,6 +12,7 @@ public:
     std::string_view name() const override { return "btrfs"; }
     std::string_view package() const override { return "btrfs-progs"; }
     bool canRepair() const override { return false; }
+    Sentence reasonAgainstRepair() const override;
 
     VolumeFacts examine(int disk, std::uint64_t offset,
                         std::uint64_t availableBytes) const override;

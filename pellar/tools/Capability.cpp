@@ -39,10 +39,7 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
                 {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
                 {}};
     if (operation == Operation::Repair && !tool->canRepair())
-        return {
-            fixwell::kPLErrorUnsupported,
-            {"%1$@ can verify this file system, but not repair it", std::string(tool->name()), {}},
-            {}};
+        return {fixwell::kPLErrorUnsupported, tool->reasonAgainstRepair(), {}};
     // A repair is confirmed by verifying, so it needs both.
     std::filesystem::path program = findProgram(tool->name(), toolPath);
     if (program.empty())

@@ -23,7 +23,7 @@ constexpr std::array phases{
 
 // dosfstools 4.2, boot.c, fat.c and check.c. An uninitialised summary is no damage.
 constexpr std::array signs{
-    DamageSign{"Dirty bit is set.", Damage::Bookkeeping},
+    DamageSign{"Dirty bit is set.", Damage::Unfinished},
     DamageSign{"Free cluster summary wrong", Damage::Bookkeeping},
     DamageSign{"FATs differ", Damage::Structure},
     DamageSign{"FATs appear to be corrupt", Damage::Structure},

@@ -27,7 +27,6 @@ constexpr std::array signs{
     DamageSign{"$MFTMirr does not match", Damage::Structure},
     DamageSign{"has no FILE magic", Damage::Structure},
     DamageSign{"ntfs_mst_post_read_fixup", Damage::Structure},
-    DamageSign{"NTFS is inconsistent", Damage::Structure},
     DamageSign{"multiple referenced", Damage::SharedBlocks},
     DamageSign{"orrupt", Damage::Contents},
     DamageSign{"referenced outside", Damage::Contents},
@@ -71,6 +70,8 @@ class NtfsOutput final : public LineOutput {
         if (line.starts_with("Correcting differences in") ||
             line.starts_with("The boot sector has been rewritten"))
             ++findings_.corrections;
+        if (line.find("NTFS is inconsistent") != std::string_view::npos)
+            findings_.hasErrorsLeft = true;
         if (line.find("is hibernated") != std::string_view::npos ||
             line.find("unclean file system") != std::string_view::npos)
             findings_.skippedJournal = true;

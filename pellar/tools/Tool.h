@@ -113,6 +113,11 @@ public:
     /// The Debian package that brings it.
     virtual std::string_view package() const = 0;
     virtual bool canRepair() const = 0;
+    /// Why not, where it cannot.
+    virtual Sentence reasonAgainstRepair() const
+    {
+        return {"%1$@ can verify this file system, but not repair it", std::string(name()), {}};
+    }
     virtual ToolHabits habits() const { return {}; }
 
     /// Reads the disk a little; never writes.
