@@ -23,7 +23,7 @@ constexpr std::array phases{
 
 // Lines that tell of no damage (xfsprogs 6.1, repair/). Everything else does: xfs_repair has many
 // hundreds of messages, and few for a sound volume.
-constexpr std::array<std::string_view, 25> harmless{
+constexpr std::array<std::string_view, 27> harmless{
     "        - ",
     "Cannot get host filesystem geometry",
     "Repair may fail if there is a sector size mismatch",
@@ -49,6 +49,8 @@ constexpr std::array<std::string_view, 25> harmless{
     "Format log to cycle",
     "clearing needsrepair flag",
     "sb root inode value",
+    "Cannot proceed further in no_modify mode",
+    "Exiting now.",
 };
 
 constexpr std::array signs{
@@ -103,8 +105,7 @@ class XfsOutput final : public LineOutput {
             line.starts_with("No modify flag set, skipping filesystem flush") || line == "done";
         const bool isLog =
             line.find("valuable metadata changes in a log") != std::string_view::npos;
-        const bool isElsewhere = line.find("has external log") != std::string_view::npos ||
-                                 line.find("external log device") != std::string_view::npos;
+        const bool isElsewhere = line.find("external log") != std::string_view::npos;
         findings_.isComplete = findings_.isComplete || isEnd;
         findings_.skippedJournal = findings_.skippedJournal || isLog;
         findings_.lacksExternalJournal = findings_.lacksExternalJournal || isElsewhere;

@@ -15,7 +15,7 @@ std::variant<DiskForTool, int> DiskForTool::prepare(const DiskClaim& claim, Form
         LoopDevice::attach(claim.descriptor(), claim.offset(), claim.availableBytes(), access);
     if (const int* const error = std::get_if<int>(&loop))
         return *error;
-    disk.loop_ = std::move(std::get<LoopDevice>(loop));
+    disk.loop_.emplace(std::move(std::get<LoopDevice>(loop)));
     return std::variant<DiskForTool, int>(std::move(disk));
 }
 

@@ -7,9 +7,15 @@
 #include <unistd.h>
 
 #include <cerrno>
-#include <string>
+#include <chrono>
+#include <fstream>
+#include <iterator>
+#include <thread>
 
 namespace pellar {
+
+using namespace std::chrono_literals;
+
 namespace {
 
 constexpr std::uint64_t sectorBytes = 512;
@@ -26,15 +32,16 @@ loop_config configurationFor(int file, std::uint64_t offset, std::uint64_t lengt
     return configuration;
 }
 
-/// A device that is free for the moment; somebody else may be faster.
-FileDescriptor openFreeDevice(int control, Access access)
+FileDescriptor openDevice(const std::string& name, Access access)
 {
-    const int number = ::ioctl(control, LOOP_CTL_GET_FREE);
-    if (number < 0)
-        return {};
-    const std::string path = "/dev/loop" + std::to_string(number);
     const int mode = access == Access::ReadOnly ? O_RDONLY : O_RDWR;
-    return FileDescriptor(::open(path.c_str(), mode | O_CLOEXEC));
+    return FileDescriptor(::open(("/dev/" + name).c_str(), mode | O_CLOEXEC));
+}
+
+std::string contentsOf(const std::filesystem::path& path)
+{
+    std::ifstream file(path, std::ios::binary);
+    return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 }  // namespace
@@ -49,22 +56,36 @@ std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
         return errno;
     constexpr int mostAttempts = 16;
     for (int attempt = 0; attempt < mostAttempts; ++attempt) {
-        FileDescriptor device = openFreeDevice(control.get(), access);
+        // Free for the moment; somebody else may be faster.
+        const int number = ::ioctl(control.get(), LOOP_CTL_GET_FREE);
+        if (number < 0)
+            return errno;
+        const std::string name = "loop" + std::to_string(number);
+        FileDescriptor device = openDevice(name, access);
         if (!device)
             return errno;
         const loop_config configuration = configurationFor(file, offset, length, access);
         if (::ioctl(device.get(), LOOP_CONFIGURE, &configuration) == 0)
-            return LoopDevice(std::move(device));
+            return LoopDevice(std::move(device), "/sys/block/" + name + "/loop/backing_file");
         if (errno != EBUSY)
             return errno;
     }
     return EBUSY;
 }
 
+LoopDevice::LoopDevice(FileDescriptor device, std::filesystem::path place)
+    : device_(std::move(device)), place_(std::move(place)), behind_(contentsOf(place_))
+{
+}
+
 LoopDevice::~LoopDevice()
 {
-    if (device_)
-        ::fsync(device_.get());
+    if (!device_)
+        return;
+    ::fsync(device_.get());
+    device_.reset();
+    for (int i = 0; i < 100 && !behind_.empty() && contentsOf(place_) == behind_; ++i)
+        std::this_thread::sleep_for(10ms);
 }
 
 }  // namespace pellar

@@ -5,6 +5,8 @@
 #include "pellar/process/FileDescriptor.h"
 
 #include <cstdint>
+#include <filesystem>
+#include <string>
 #include <variant>
 
 namespace pellar {
@@ -13,7 +15,8 @@ namespace pellar {
 /// where a volume begins (loop(4)). Needs the right to set up loop devices.
 ///
 /// The kernel takes the device down when nobody has it open any more (LO_FLAGS_AUTOCLEAR), so none
-/// is left behind, however the process ends.
+/// is left behind, however the process ends. Another program that looks at all disks may have it
+/// open for a moment: giving it back waits for that, a second at most.
 class LoopDevice {
 public:
     /// An errno when the kernel refuses: EACCES without the right to, ENOENT where there is no
@@ -23,16 +26,18 @@ public:
                                                               std::uint64_t length, Access access);
 
     LoopDevice(LoopDevice&&) = default;
-    LoopDevice& operator=(LoopDevice&&) = default;
+    LoopDevice& operator=(LoopDevice&&) = delete;
     /// What was written through the device is in the file when it is gone.
     ~LoopDevice();
 
     int descriptor() const { return device_.get(); }
 
 private:
-    explicit LoopDevice(FileDescriptor device) : device_(std::move(device)) {}
+    LoopDevice(FileDescriptor device, std::filesystem::path place);
 
     FileDescriptor device_;
+    std::filesystem::path place_;  ///< where the kernel tells what is behind the device
+    std::string behind_;
 };
 
 }  // namespace pellar
