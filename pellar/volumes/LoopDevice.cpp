@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/volumes/LoopDevice.h"
 
+#include "pellar/volumes/KernelFile.h"
+
 #include <fcntl.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
@@ -8,8 +10,6 @@
 
 #include <cerrno>
 #include <chrono>
-#include <fstream>
-#include <iterator>
 #include <thread>
 
 namespace pellar {
@@ -36,12 +36,6 @@ FileDescriptor openDevice(const std::string& name, Access access)
 {
     const int mode = access == Access::ReadOnly ? O_RDONLY : O_RDWR;
     return FileDescriptor(::open(("/dev/" + name).c_str(), mode | O_CLOEXEC));
-}
-
-std::string contentsOf(const std::filesystem::path& path)
-{
-    std::ifstream file(path, std::ios::binary);
-    return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 }  // namespace
@@ -74,7 +68,7 @@ std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
 }
 
 LoopDevice::LoopDevice(FileDescriptor device, std::filesystem::path place)
-    : device_(std::move(device)), place_(std::move(place)), behind_(contentsOf(place_))
+    : device_(std::move(device)), place_(std::move(place)), behind_(readKernelFile(place_))
 {
 }
 
@@ -84,7 +78,7 @@ LoopDevice::~LoopDevice()
         return;
     ::fsync(device_.get());
     device_.reset();
-    for (int i = 0; i < 100 && !behind_.empty() && contentsOf(place_) == behind_; ++i)
+    for (int i = 0; i < 100 && behind_ && readKernelFile(place_) == behind_; ++i)
         std::this_thread::sleep_for(10ms);
 }
 

@@ -6,6 +6,7 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <variant>
 
@@ -37,7 +38,7 @@ private:
 
     FileDescriptor device_;
     std::filesystem::path place_;  ///< where the kernel tells what is behind the device
-    std::string behind_;
+    std::optional<std::string> behind_;
 };
 
 }  // namespace pellar
