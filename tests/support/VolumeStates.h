@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdint>
+#include <ostream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -32,6 +33,12 @@ struct VolumeState {
     std::string_view afterwards;  ///< verified once more
     std::string_view because;
 };
+
+/// For the names of tests.
+inline void PrintTo(const VolumeState& state, std::ostream* stream)
+{
+    *stream << state.filesystem << ", " << state.state;
+}
 
 inline std::string zeros(std::size_t count)
 {
