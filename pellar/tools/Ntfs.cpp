@@ -5,6 +5,7 @@
 #include "pellar/tools/LineOutput.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/NtfsBootSector.h"
+#include "pellar/volumes/NtfsState.h"
 
 #include <array>
 #include <charconv>
@@ -92,7 +93,7 @@ int statusWithoutResizing(int status, const Findings& findings)
 Judgement judgeNtfs(int status, const RunEvidence& evidence)
 {
     RunEvidence checked = evidence;
-    checked.volume.isMarkedDirty = false;
+    checked.volume.isMarkedDirty = checked.volume.needsRecovery = false;
     Judgement judgement = judgeVerification(statusWithoutResizing(status, evidence.findings),
                                             checked, {"ntfsresize", damagedStatuses});
     if (judgement.verdict == Verdict::Damaged)
@@ -105,6 +106,12 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
                      "was found",
                      {},
                      {}});
+    if (judgement.verdict == Verdict::Sound && evidence.volume.needsRecovery)
+        return inconclusive(
+            status,
+            {"its journal has not been replayed, which only the system that it comes from does",
+             {},
+             {}});
     return judgement;
 }
 
@@ -116,6 +123,7 @@ VolumeFacts Ntfs::examine(int disk, std::uint64_t offset, std::uint64_t availabl
     VolumeFacts facts = factsFrom(sector, "ntfs", disk, offset, availableBytes);
     facts.volumeBytes = sector ? sector->volumeBytes : 0;
     facts.isMarkedDirty = sector && isNtfsMarkedDirty(disk, offset, *sector).value_or(false);
+    facts.needsRecovery = sector && hasNtfsJournalWaiting(disk, offset, *sector).value_or(false);
     return facts;
 }
 

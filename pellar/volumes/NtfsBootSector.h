@@ -12,6 +12,7 @@ struct NtfsBootSector {
 
     std::uint64_t volumeBytes = 0;  ///< with the backup behind its end
     std::uint32_t sectorBytes = 0;
+    std::uint64_t clusterBytes = 0;
     std::uint64_t fileTablePlace = 0;  ///< of the master file table, bytes from the start
     std::uint32_t fileRecordBytes = 0;
     bool isBackup = false;
@@ -24,10 +25,5 @@ std::optional<NtfsBootSector> parseNtfsBootSector(Bytes bytes);
 /// The boot sector of the volume that starts at `offset`, or its backup in the last sector.
 std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t offset,
                                                  std::uint64_t availableBytes);
-
-/// Whether the volume's own record says that it was not properly unmounted or is to be checked by
-/// its own system. None when the record cannot be read.
-std::optional<bool> isNtfsMarkedDirty(int descriptor, std::uint64_t offset,
-                                      const NtfsBootSector& sector);
 
 }  // namespace pellar
