@@ -200,7 +200,7 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
         options_.commandTrace(
             fixwell::printable(disk->filesystem) + ": " +
             (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
-    return capability.error;
+    return fixwell::kPLNoError;  // the job itself says why there is no way
 }
 
 void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
