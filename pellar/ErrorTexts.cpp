@@ -31,8 +31,7 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},
     ErrorText{fixwell::kPLErrorToolMissing,
-              "The checking tool for this file system is not installed (for ext2, ext3 and ext4: "
-              "package e2fsprogs)."},
+              "The checking tool for this file system is not installed."},
     ErrorText{fixwell::kPLErrorToolFailed, "The checking tool failed."},
     ErrorText{fixwell::kPLErrorCannotOpen, "The disk could not be opened."},
     ErrorText{fixwell::kPLErrorUnsupported, "There is no tool for this kind of disk."},

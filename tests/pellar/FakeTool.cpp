@@ -2,9 +2,10 @@
 //
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
-//   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors
+//   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
 
 #include <fcntl.h>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -51,6 +52,17 @@ void tellDescriptors()
             put(STDOUT_FILENO, "descriptor " + std::to_string(descriptor) + "\n");
 }
 
+/// Of the standard output, and whether the tool could be reached from a keyboard.
+void tellTerminal()
+{
+    winsize size{};
+    const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
+    ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size);
+    put(STDOUT_FILENO, "terminal " + std::to_string(isTerminal) + " input " +
+                           std::to_string(::isatty(STDIN_FILENO)) + " columns " +
+                           std::to_string(size.ws_col) + "\n");
+}
+
 void act(const std::string& action, const std::string& text)
 {
     const int number = std::atoi(text.c_str());
@@ -81,6 +93,8 @@ void act(const std::string& action, const std::string& text)
     else if (action == "environment")
         for (char** entry = environ; *entry != nullptr; ++entry)
             put(STDOUT_FILENO, std::string("environment ") + *entry + "\n");
+    else if (action == "terminal")
+        tellTerminal();
     else if (action == "descriptors")
         tellDescriptors();
 }

@@ -152,8 +152,6 @@ TEST(Job, RefusesBeforeItStarts)
             std::make_shared<fixwell::DiskReference>(disk));
     };
     fixwell::DiskReference disk = *stage.disk;
-    disk.filesystem = "%@fs";
-    EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
     disk.isWhole = true;
     EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
     disk = *stage.disk;
@@ -161,13 +159,35 @@ TEST(Job, RefusesBeforeItStarts)
     EXPECT_EQ(begin(disk), fixwell::kPLErrorNoDiskReference);
     EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(nullptr),
               fixwell::kPLErrorNoDiskReference);
-    std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
-    EXPECT_EQ(begin(*stage.disk), fixwell::kPLErrorToolMissing);
-    EXPECT_FALSE(stage.bench.manager.canVerify("ext4"));
-    EXPECT_EQ(stage.bench.manager.reasonAgainst("ext4", Operation::Repair),
-              "e2fsck is not installed (package e2fsprogs)");
     stage.bench.loop.drain();
     EXPECT_EQ(stage.heard.started, 0) << "a refused begin calls nobody back";
+}
+
+// The log is the place where a reason can be read.
+TEST(Job, SaysWhyThereIsNoWay)
+{
+    Stage stage(soundRun);
+    std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
+    struct Case {
+        std::string_view filesystem;
+        fixwell::ErrorCode error;
+        std::string_view says;
+    };
+    for (const Case& c :
+         {Case{"%@fs", fixwell::kPLErrorUnsupported, "no tool for the file system “%@fs”"},
+          Case{"swap", fixwell::kPLErrorUnsupported, "it is swap space"},
+          Case{"crypto_LUKS", fixwell::kPLErrorUnsupported, "it is encrypted"},
+          Case{"ext4", fixwell::kPLErrorToolMissing,
+               "e2fsck is not installed (package e2fsprogs)"}}) {
+        fixwell::DiskReference disk = *stage.disk;
+        disk.filesystem = c.filesystem;
+        ASSERT_EQ(stage.bench.repair(std::make_shared<fixwell::DiskReference>(disk)), 0);
+        EXPECT_EQ(stage.heard.error, c.error) << c.filesystem;
+        EXPECT_NE(stage.heard.message.find(c.says), std::string::npos) << stage.heard.message;
+        EXPECT_FALSE(stage.bench.manager.canRepair(c.filesystem));
+        EXPECT_NE(stage.bench.manager.reasonAgainst(c.filesystem, Operation::Repair).find(c.says),
+                  std::string::npos);
+    }
 }
 
 TEST(Job, ProgressOnlyGrows)

@@ -122,6 +122,11 @@ std::optional<PartitionTable> readPartitionTable(int descriptor)
 // ext4(5) and mke2fs(8): the first backup stands at the start of group 1, which is 8193 blocks of
 // 1 KiB, 16384 of 2 KiB or 32768 of 4 KiB from the start. The magic number 0xEF53 lies 56 bytes
 // into the superblock, its group's number (here 1) 90 bytes into it.
+bool mayBeBootSector(const PartitionTable& table, const Superblock& superblock)
+{
+    return table.type == "dos" && table.partitions.empty() && superblock.isFilesystem();
+}
+
 bool hasExtBackupSuperblock(int descriptor, ByteRange range)
 {
     constexpr std::array<std::uint64_t, 3> firstBackups{8193ULL << 10U, 16384ULL << 11U,

@@ -167,7 +167,9 @@ std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool 
         return diskType::opticalDisc;
     const bool hasVolume =
         !contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces);
-    const bool isBare = isMounted || (!hasPartitions && !contents.table && hasVolume);
+    const bool hasTable =
+        contents.table && !mayBeBootSector(*contents.table, contents.superblock);
+    const bool isBare = isMounted || (!hasPartitions && !hasTable && hasVolume);
     if (name.starts_with("dm-") || name.starts_with("md"))
         return hasPartitions ? diskType::whole : diskType::assembled;
     return isBare ? diskType::bareVolume : diskType::whole;
