@@ -5,6 +5,9 @@
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
+#include <sys/stat.h>
+
+#include <algorithm>
 #include <utility>
 #include <variant>
 
@@ -94,8 +97,27 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
-        return *error;
-    start({disk, operation, std::move(std::get<DiskClaim>(claim)), toolFor(disk->filesystem)});
+        return beginMounted(disk, operation, *error);
+    start({disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    return fixwell::kPLNoError;
+}
+
+// Unmounting may take long, so it is the job's. What the system itself runs from is not tried.
+ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation operation,
+                                   ErrorCode error)
+{
+    struct stat status = {};
+    const bool isDevice = ::stat(disk->path.c_str(), &status) == 0 && S_ISBLK(status.st_mode);
+    const bool mayBeMounted =
+        error == fixwell::kPLErrorCouldNotUnmount || error == fixwell::kPLErrorDiskInUse;
+    if (!isDevice || !mayBeMounted)
+        return error;
+    auto mounts = mountPlacesOf(status.st_rdev, options_.systemPaths);
+    const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
+                                    [](const MountPlace& place) { return place.target == "/"; });
+    if (mounts.empty() || isRoot)
+        return error;
+    start({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
 }
 

@@ -41,6 +41,8 @@ public:
 
 private:
     fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
+    fixwell::ErrorCode beginMounted(const fixwell::DiskReferencePointer& disk, Operation operation,
+                                    fixwell::ErrorCode error);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
     void start(JobRequest request);

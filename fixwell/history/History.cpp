@@ -10,25 +10,32 @@ namespace fixwell {
 
 Array OVFXW::allFsckHistoryOfSelection() const
 {
-    if (!selectionOfDisks_ || selectionOfDisks_->empty())
-        return {};
-    if (selectionOfDisks_->size() == 1)
+    if (selectionOfDisks_ && selectionOfDisks_->size() == 1)
         return selectionOfDisks_->front()->fsckHistory();
+    const Array all = Array::make();
+    for (const Array& history : historiesOfSelection())
+        all.append(history);
+    return all.isEmpty() ? Array() : all;
+}
 
+std::vector<Array> OVFXW::historiesOfSelection() const
+{
+    if (!selectionOfDisks_)
+        return {};
     DiskList taken;
     const auto isTaken = [&taken](const OVDiskPointer& disk) {
         return disk && std::any_of(taken.begin(), taken.end(), [&disk](const OVDiskPointer& other) {
                    return other->isEqual(*disk);
                });
     };
-    const Array all = Array::make();
+    std::vector<Array> histories;
     for (const OVDiskPointer& disk : *selectionOfDisks_) {
         if (isTaken(disk) || isTaken(disk->parentDisk()))
             continue;
         taken.push_back(disk);
-        all.append(disk->fsckHistory());
+        histories.push_back(disk->fsckHistory());
     }
-    return all.isEmpty() ? Array() : all;
+    return histories;
 }
 
 void OVFXW::createDiskSummaryRecord()

@@ -3,59 +3,79 @@
 
 #include "fixwell/messagelog/MessageRecord.h"
 
+#include <algorithm>
+
 namespace fixwell {
 
-void MessageRows::update(const Array& history, bool showsDetails)
+void MessageRows::update(const std::vector<Array>& histories, bool showsDetails)
 {
-    const bool hasOnlyGrown = isValid_ && history.isSameAs(history_) &&
-                              showsDetails == showsDetails_ && history.size() >= examined_;
-    if (!hasOnlyGrown) {
+    if (!isValid_ || showsDetails != showsDetails_ || !haveOnlyGrown(histories)) {
         invalidate();
-        history_ = history;
         showsDetails_ = showsDetails;
+        for (const Array& history : histories)
+            histories_.push_back({history, 0, {}});
     }
     isValid_ = true;
-    if (showsDetails_)
-        examined_ = history_.size();
-    else
-        findVisible();
+    for (History& history : histories_)
+        if (showsDetails_)
+            history.examined = history.records.size();
+        else
+            findVisible(history);
 }
 
-void MessageRows::findVisible()
+bool MessageRows::haveOnlyGrown(const std::vector<Array>& histories) const
 {
-    const std::vector<Value>& records = history_.values();
-    for (; examined_ < records.size(); ++examined_)
-        if (isShownInBrief(records[examined_].dictionary()))
-            visible_.push_back(static_cast<std::uint32_t>(examined_));
+    return std::equal(histories_.begin(), histories_.end(), histories.begin(), histories.end(),
+                      [](const History& before, const Array& now) {
+                          return now.isSameAs(before.records) && now.size() >= before.examined;
+                      });
+}
+
+void MessageRows::findVisible(History& history)
+{
+    const std::vector<Value>& records = history.records.values();
+    for (; history.examined < records.size(); ++history.examined)
+        if (isShownInBrief(records[history.examined].dictionary()))
+            history.visible.push_back(static_cast<std::uint32_t>(history.examined));
 }
 
 void MessageRows::invalidate()
 {
     isValid_ = false;
-    history_ = {};
-    examined_ = 0;
-    visible_.clear();
+    histories_.clear();
 }
 
-std::size_t MessageRows::visibleRecords() const
+std::size_t MessageRows::visibleRecords(const History& history) const
 {
-    return showsDetails_ ? examined_ : visible_.size();
+    return showsDetails_ ? history.examined : history.visible.size();
+}
+
+bool MessageRows::endsWithSummary() const
+{
+    const auto last = std::find_if(histories_.rbegin(), histories_.rend(),
+                                   [](const History& history) { return history.examined != 0; });
+    return last != histories_.rend() && last->examined <= last->records.size() &&
+           verbosityOf(last->records.at(last->examined - 1).dictionary()) == verbosity::summary;
 }
 
 std::size_t MessageRows::count() const
 {
-    if (examined_ == 0 || examined_ > history_.size())
-        return 0;
-    const Dictionary last = history_.at(examined_ - 1).dictionary();
-    const bool endsWithSummary = verbosityOf(last) == verbosity::summary;
-    return visibleRecords() - (endsWithSummary ? 1 : 0);
+    std::size_t count = 0;
+    for (const History& history : histories_)
+        if (history.examined <= history.records.size())
+            count += visibleRecords(history);
+    return count - (endsWithSummary() ? 1 : 0);
 }
 
 Dictionary MessageRows::at(std::size_t row) const
 {
-    if (row >= visibleRecords())
-        return {};
-    return history_.at(showsDetails_ ? row : visible_[row]).dictionary();
+    for (const History& history : histories_) {
+        const std::size_t visible = visibleRecords(history);
+        if (row < visible)
+            return history.records.at(showsDetails_ ? row : history.visible[row]).dictionary();
+        row -= visible;
+    }
+    return {};
 }
 
 }  // namespace fixwell

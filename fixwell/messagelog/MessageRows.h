@@ -10,15 +10,16 @@
 
 namespace fixwell {
 
-/// Which records of a history are rows of the log, with and without details.
+/// Which records of some histories, one after the other, are rows of the log, with and without
+/// details.
 ///
 /// Histories grow at the end or are replaced, so only what is new is looked at: keeping up with
-/// a growing log costs the same per record however long it is.
+/// a growing log costs the same per record however long it is, and whichever history grows.
 class MessageRows {
 public:
-    /// Takes up the history as it now stands.
-    void update(const Array& history, bool showsDetails);
-    /// Forgets the history, which may have changed in other ways than by growing.
+    /// Takes up the histories as they now stand.
+    void update(const std::vector<Array>& histories, bool showsDetails);
+    /// Forgets the histories, which may have changed in other ways than by growing.
     void invalidate();
     bool isValid() const { return isValid_; }
 
@@ -28,14 +29,20 @@ public:
     Dictionary at(std::size_t row) const;
 
 private:
-    void findVisible();
-    std::size_t visibleRecords() const;
+    struct History {
+        Array records;
+        std::size_t examined = 0;            ///< records that were looked at
+        std::vector<std::uint32_t> visible;  ///< their positions, when details are off
+    };
 
-    Array history_;
+    bool haveOnlyGrown(const std::vector<Array>& histories) const;
+    static void findVisible(History& history);
+    std::size_t visibleRecords(const History& history) const;
+    bool endsWithSummary() const;
+
+    std::vector<History> histories_;
     bool showsDetails_ = false;
     bool isValid_ = false;
-    std::size_t examined_ = 0;            ///< records of the history that were looked at
-    std::vector<std::uint32_t> visible_;  ///< their positions, when details are off
 };
 
 }  // namespace fixwell

@@ -9,7 +9,7 @@ std::size_t OVFXW::outlineViewNumberOfChildrenOfItem(const OutlineItem& item)
 {
     if (item)
         return 0;
-    rows_.update(allFsckHistoryOfSelection(), showDetails);
+    rows_.update(historiesOfSelection(), showDetails);
     return rows_.count();
 }
 
@@ -21,7 +21,7 @@ OutlineItem OVFXW::outlineViewChildOfItem(std::size_t index, const OutlineItem& 
 const MessageRows& OVFXW::currentRows()
 {
     if (!rows_.isValid())
-        rows_.update(allFsckHistoryOfSelection(), showDetails);
+        rows_.update(historiesOfSelection(), showDetails);
     return rows_;
 }
 

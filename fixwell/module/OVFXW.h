@@ -234,6 +234,9 @@ private:
 
     // history/
     Array allFsckHistoryOfSelection() const;
+    /// What allFsckHistoryOfSelection puts together, disk by disk: the same lists as long as they
+    /// only grow.
+    std::vector<Array> historiesOfSelection() const;
     void createDiskSummaryRecord();
     void notifyDiskChanged(const OVDiskPointer& disk);
     void displaySummary();

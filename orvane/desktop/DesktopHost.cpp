@@ -1,18 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopHost.h"
 
+#include "orvane/desktop/toolkit/QtTexts.h"
+
 namespace orvane::desktop {
 
 DesktopHost::DesktopHost(SupportOptions options, QtLoop& loop)
     : SupportHost(std::move(options), loop),
       alerts_([this](std::int32_t code) { return OVLocalizedErrorString(code); }),
-      help_(hostBundle().pathForResource("help/index.html"), hostBundle()),
+      help_(hostBundle(), standardUserDefaults()),
       // What the user has seen is kept, whatever happens to the program.
       interface_([this] { histories().saveNew(); }),
-      printing_([this] {
+      printing_(hostBundle(), [this] {
           alerts_.simpleModuleAlert(translator().text("The log could not be printed."), "", 0);
       })
 {
+    translateQt(hostBundle());
     // Every volume of an image is there when the attachment has returned.
     threads().setAttachesSynchronously(true);
 }

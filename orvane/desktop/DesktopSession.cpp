@@ -40,18 +40,13 @@ DesktopSession::DesktopSession(SessionOptions options)
           host_.sharedDiskController(), [this](const Disk& disk) { return lastCheckOf(disk); },
           host_.translator()),
       controller_(window_),
-      jobs_(host_, {[this] { jobBegan(); },
-                    [this] {
-                        window_.disks().synchronize();
-                    }}),
+      jobs_(host_, ledgerEvents()),
       images_(host_, {[this](const Disk& disk) { window_.disks().select(disk); },
                       [this](const std::vector<std::string>& sentences) {
                           host_.alerts().simpleModuleAlert(text("Not everything could be opened."),
                                                            joined(sentences), 0);
                       }}),
-      scan_(loop_, [this](const std::vector<DiskTree>& disks) {
-          host_.sharedDiskController().synchronize(disks);
-      })
+      scan_(loop_, [this](const std::vector<DiskTree>& disks) { disksRead(disks); })
 {
     host_.setWindow(&window_);
     // Before the modules do: the list must have changed when they ask it for the selection.
@@ -85,6 +80,9 @@ SupportOptions DesktopSession::supportOptions()
     options.errorText = [this](fixwell::ErrorCode code) {
         return pellar::errorText(code, libraryTexts_);
     };
+    options.historyCompleted = [this] {
+        reloadLog();
+    };
     options.warn = [this](const std::string& sentence) {
         warn(sentence);
     };
@@ -94,6 +92,7 @@ SupportOptions DesktopSession::supportOptions()
 pellar::ManagerOptions DesktopSession::libraryOptions() const
 {
     pellar::ManagerOptions options;
+    options.outputLimits = options_.outputLimits;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
     return options;
@@ -136,6 +135,12 @@ void DesktopSession::connectWindow()
         [this] { windowAppeared(); },
     });
     host_.generalPasteboard().setHTMLSource([this] { return selectionHTML(); });
+    host_.printing().setTitle([this] {
+        std::string names;
+        for (const auto& disk : window_.disks().selectedDisks())
+            names += (names.empty() ? "" : ", ") + disk->displayName();
+        return names;
+    });
     controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); }, {}});
 }
 
@@ -202,10 +207,10 @@ void DesktopSession::windowAppeared()
 {
     hasAppeared_ = true;
     showWarnings();
-    if (options_.scansSystemDisks)
-        scan_.start();
-    if (!options_.disksToOpen.empty())
-        images_.open(options_.disksToOpen);
+    watchSystemDisks();
+    openNamed(true);
+    if (!options_.scansSystemDisks)
+        openNamed(false);
 }
 
 void DesktopSession::warn(const std::string& sentence)

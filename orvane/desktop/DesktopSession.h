@@ -6,14 +6,18 @@
 #include "orvane/desktop/ImageOpener.h"
 #include "orvane/desktop/JobLedger.h"
 #include "orvane/desktop/ModuleTab.h"
+#include "orvane/desktop/session/DesktopNotifier.h"
+#include "orvane/desktop/session/SleepInhibitor.h"
 #include "orvane/desktop/window/DiskTreeModel.h"
 #include "orvane/desktop/window/MainWindow.h"
 #include "orvane/desktop/window/Menus.h"
 #include "orvane/desktop/window/WindowController.h"
+#include "orvane/support/disks/DiskWatch.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
 #include <QMessageBox>
 
+#include <chrono>
 #include <functional>
 #include <memory>
 #include <string>
@@ -27,6 +31,9 @@ struct SessionOptions {
         orvane::moduleDirectories(environmentValue, runningExecutable());
     std::vector<std::string> disksToOpen;  ///< as orvane/support/disks/DiskLookup.h takes them
     bool scansSystemDisks = true;
+    pellar::OutputLimits outputLimits;
+    SessionBuses buses;
+    std::chrono::milliseconds longestGlanceAway = desktop::longestGlanceAway;
     std::function<void()> closed;  ///< the window is closed for good
 };
 
@@ -55,6 +62,11 @@ private:
     pellar::ManagerOptions libraryOptions() const;
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
     void observeDisks();
+    void watchSystemDisks();
+    void disksRead(const std::vector<DiskTree>& disks);
+    void openNamed(bool areFiles);
+    void holdDisks();
+    void releaseDisks();
     void connectWindow();
 
     void loadModules();
@@ -68,8 +80,11 @@ private:
     void ejectSelection();
     bool canEjectSelection();
     fixwell::OutlineView* log();
+    void reloadLog();
+    void completeLog();
     std::string selectionHTML();
     bool canEdit(fixwell::Selector action);
+    bool isInDiskList() const;
     void selectAll();
     QtButton* detailsButton();
 
@@ -78,7 +93,13 @@ private:
     void stopAndClose();
     void stopJob();
     void lockChanged(bool isLocked);
+
+    JobLedger::Events ledgerEvents();
+    DesktopNotifier::Options notifierOptions();
+    void runBegan(const StartedRun& run);
+    void runEnded(const StartedRun& run, const RunEnd& end);
     void jobBegan();
+    void jobEnded();
 
     void warn(const std::string& sentence);
     void showWarnings();
@@ -87,6 +108,7 @@ private:
     const SessionOptions options_;
     std::vector<std::string> warnings_;  ///< not shown yet
     bool hasAppeared_ = false;
+    bool hasReadDisks_ = false;
     bool isEnding_ = false;
 
     QtLoop loop_;
@@ -101,7 +123,15 @@ private:
     ImageOpener images_;
     std::vector<std::unique_ptr<ModuleTab>> tabs_;  ///< in the order of the window's tabs
     DiskScan scan_;
+    DiskWatch watch_{loop_, [this] {
+                         scan_.start();
+                     }};
     QPointer<QMessageBox> question_;
+
+    SleepInhibitor wakefulness_{options_.buses.system};
+    DesktopNotifier notifier_{notifierOptions()};
+    std::chrono::steady_clock::time_point jobStart_;
+    std::vector<FinishedRun> finishedRuns_;  ///< of the job that runs
 };
 
 }  // namespace orvane::desktop

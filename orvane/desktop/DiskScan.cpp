@@ -25,8 +25,10 @@ DiskScan::~DiskScan()
 
 void DiskScan::start()
 {
-    if (std::exchange(isScanning_, true))
+    if (std::exchange(isScanning_, true)) {
+        mustScanAgain_ = true;
         return;
+    }
     const auto scan = [&loop = loop_, scan = liveness_] {
         loop.post([scan, disks = readDisks()] {
             if (*scan != nullptr)
@@ -43,7 +45,10 @@ void DiskScan::start()
 void DiskScan::finish(const std::vector<DiskTree>& disks)
 {
     isScanning_ = false;
+    const bool mustScanAgain = std::exchange(mustScanAgain_, false);
     finished_(disks);
+    if (mustScanAgain)
+        start();
 }
 
 }  // namespace orvane::desktop

@@ -24,8 +24,8 @@ public:
     /// Waits for a scan that is under way; nothing is heard of it any more.
     ~DiskScan();
 
-    /// Does nothing while a scan is under way. Where the system gives no thread, the scan is done
-    /// before this returns.
+    /// While a scan is under way, another one follows it: what it has read already may be out of
+    /// date. Where the system gives no thread, the scan is done before this returns.
     void start();
 
 private:
@@ -36,6 +36,7 @@ private:
     HostLoop& loop_;
     Finished finished_;
     bool isScanning_ = false;
+    bool mustScanAgain_ = false;
     /// Handed to the task that reports back, which finds it empty when this object has gone.
     Liveness liveness_ = std::make_shared<DiskScan*>(this);
     std::jthread thread_;

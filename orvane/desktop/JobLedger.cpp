@@ -7,27 +7,26 @@ void JobLedger::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operatio
 {
     runs_.begin(disk, operation);
     isJobRunning_ = true;
-    events_.began();
+    run_ = {operation, disk ? disk->name : std::string()};
+    events_.began(run_);
 }
 
 void JobLedger::jobDidNotBegin(const fixwell::DiskReferencePointer& /*disk*/,
                                fixwell::ErrorCode error)
 {
-    runs_.refuse(error);
-    end();
+    end(runs_.refuse(error));
 }
 
 void JobLedger::jobWillFinish(const fixwell::DiskReferencePointer& /*disk*/,
                               fixwell::ErrorCode error, const fixwell::Dictionary& result)
 {
-    runs_.finish(error, result);
-    end();
+    end(runs_.finish(error, result));
 }
 
-void JobLedger::end()
+void JobLedger::end(const RunEnd& end)
 {
     isJobRunning_ = false;
-    events_.ended();
+    events_.ended(run_, end);
 }
 
 }  // namespace orvane::desktop

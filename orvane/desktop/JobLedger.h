@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/desktop/session/FinishedRun.h"
 #include "orvane/jobs/JobObserver.h"
 #include "orvane/jobs/RunKeeper.h"
 
@@ -12,8 +13,8 @@ namespace orvane::desktop {
 class JobLedger final : public JobObserver {
 public:
     struct Events {
-        std::function<void()> began;
-        std::function<void()> ended;  ///< the run is kept
+        std::function<void(const StartedRun&)> began;
+        std::function<void(const StartedRun&, const RunEnd&)> ended;  ///< the run is kept
     };
 
     /// The host outlives this object.
@@ -29,10 +30,11 @@ public:
                        const fixwell::Dictionary& result) override;
 
 private:
-    void end();
+    void end(const RunEnd& end);
 
     RunKeeper runs_;
     const Events events_;
+    StartedRun run_;
     bool isJobRunning_ = false;
 };
 

@@ -30,7 +30,10 @@ std::vector<Menu> DesktopSession::menus()
           }},
          line,
          {"print", "&Print…", QKeySequence::Print,
-          [this] { activeTab()->module().printModuleSpecific(&window_); },
+          [this] {
+              completeLog();
+              activeTab()->module().printModuleSpecific(&window_);
+          },
           [this] {
               return activeTab() != nullptr && activeTab()->module().canPrint();
           }},
@@ -45,7 +48,7 @@ std::vector<Menu> DesktopSession::menus()
                 }},
                {"selectAll", "Select &All", QKeySequence::SelectAll, [this] { selectAll(); },
                 [this] {
-                    return window_.disks().hasFocus() || canEdit("selectAll:");
+                    return isInDiskList() || canEdit("selectAll:");
                 }},
                // The key itself belongs to the log, which sees it first.
                {"delete",
@@ -63,7 +66,7 @@ std::vector<Menu> DesktopSession::menus()
                     return detailsButton() != nullptr && detailsButton()->isChecked();
                 }}}};
     Menu help{"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
-                             host_.sharedHelpManager().openHelpAnchor("");
+                             host_.sharedHelpManager().openHelpAnchor("ovhelp11868");
                          }}}};
     return {file, edit, view, help};
 }
@@ -107,6 +110,19 @@ fixwell::OutlineView* DesktopSession::log()
                                                          : nullptr;
 }
 
+void DesktopSession::reloadLog()
+{
+    if (log() != nullptr)
+        activeTab()->interface()->outlinePeer()->reloadData();
+}
+
+// Who takes the whole log wants the oldest rows, too.
+void DesktopSession::completeLog()
+{
+    if (host_.histories().loadAll())
+        reloadLog();
+}
+
 std::string DesktopSession::selectionHTML()
 {
     return log() != nullptr ? activeTab()->interface()->outlinePeer()->selectionHTML()
@@ -118,13 +134,21 @@ bool DesktopSession::canEdit(fixwell::Selector action)
     return log() != nullptr && log()->validateMenuItem({action});
 }
 
-// The list and the log both have rows; the one that the user is in is meant.
+// The list and the log both have rows; the one that the user is in is meant. Asked of the window,
+// which knows it also while its menu is open.
+bool DesktopSession::isInDiskList() const
+{
+    return window_.focusWidget() == &window_.disks();
+}
+
 void DesktopSession::selectAll()
 {
-    if (window_.disks().hasFocus())
+    if (isInDiskList())
         window_.disks().selectAll();
-    else
+    else {
+        completeLog();
         log()->selectAll(&window_);
+    }
 }
 
 QtButton* DesktopSession::detailsButton()

@@ -71,12 +71,6 @@ void DesktopSession::stopJob()
         tab->stopHarder();
 }
 
-void DesktopSession::jobBegan()
-{
-    if (isEnding_)
-        stopAndClose();
-}
-
 void DesktopSession::end()
 {
     if (isEnding_)
@@ -88,8 +82,11 @@ void DesktopSession::end()
 // Posted, because the module has not finished with the job when it gives the window free.
 void DesktopSession::lockChanged(bool isLocked)
 {
-    if (isLocked)
+    if (isLocked) {
+        jobBegan();
         return;
+    }
+    jobEnded();
     if (question_ != nullptr)
         question_->close();
     if (isEnding_)

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/DesktopEntry.h"
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/desktop/TerminationSignals.h"
+#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/texts/Language.h"
 
 #include <QApplication>
@@ -75,14 +77,21 @@ int run(int argc, char** argv)
     QApplication application(argc, argv);
     QApplication::setApplicationName(QStringLiteral("orvane"));
     QApplication::setApplicationDisplayName(QStringLiteral("Orvane"));
-    QApplication::setDesktopFileName(QStringLiteral("orvane"));
-    QApplication::setWindowIcon(QIcon::fromTheme(QStringLiteral("orvane")));
+    QApplication::setDesktopFileName(QLatin1String(desktopEntry));
+    // The desktop has the icon only where the program is installed.
+    QApplication::setWindowIcon(QIcon::fromTheme(QLatin1String(desktopEntry),
+                                                 QIcon(QStringLiteral(":/icons/program.svg"))));
     const CommandLine line = readCommandLine(argc, argv);
     if (line.exitStatus)
         return *line.exitStatus;
 
+    std::optional<ColorScheme> colors;
+    if (const auto bus = realBuses().session())
+        colors.emplace(*bus);
+
     SessionOptions options;
     options.disksToOpen = line.names;
+    options.buses = realBuses();
     options.closed = [] {
         QCoreApplication::exit();
     };

@@ -53,6 +53,8 @@ SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
       images_({options_.capabilities, &histories_}, translator_),
       threads_(loop)
 {
+    if (options_.historyCompleted)
+        histories_.loadGradually([this] { loadHistoriesLater(); });
     disks_.hooks().warn = [this](const std::string& sentence) {
         warn(sentence);
     };
@@ -60,7 +62,25 @@ SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
 
 SupportHost::~SupportHost()
 {
+    *isThere_ = false;
     histories_.saveNew();
+}
+
+void SupportHost::loadHistoriesLater()
+{
+    loop_.scheduleTimer(std::chrono::duration<double>(0), [this, isThere = isThere_] {
+        if (*isThere)
+            loadHistories();
+    });
+}
+
+void SupportHost::loadHistories()
+{
+    const DiskHistories::Progress progress = histories_.loadMore();
+    if (progress == DiskHistories::Progress::Completed)
+        options_.historyCompleted();
+    if (progress != DiskHistories::Progress::Nothing)
+        loadHistoriesLater();
 }
 
 void SupportHost::warn(const std::string& sentence)

@@ -32,6 +32,10 @@ struct SupportOptions {
     bool keepsHistory = true;
     HistoryStore::Limits historyLimits = {};
 
+    /// Long histories come in two steps, the newest records first; called when one is complete.
+    /// None: each is read at once.
+    std::function<void()> historyCompleted;
+
     /// What the installed tools can do; nothing unless told.
     CapabilityLookup capabilities = [](std::string_view) {
         return FilesystemCapabilities();
@@ -75,6 +79,8 @@ public:
 
 private:
     void warn(const std::string& sentence);
+    void loadHistoriesLater();
+    void loadHistories();
 
     SupportOptions options_;
     HostLoop& loop_;
@@ -88,6 +94,7 @@ private:
     DiskHistories histories_;
     DiskController disks_;
     ImageAttacher images_;
+    std::shared_ptr<bool> isThere_ = std::make_shared<bool>(true);  ///< for tasks that come later
     WorkerThreads threads_;  ///< last: no worker may be left when the others go
 };
 

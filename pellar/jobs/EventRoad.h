@@ -29,7 +29,7 @@ struct EventReceiver {
 /// tool waits on its pipe. So memory stays bounded whatever a tool prints.
 class EventRoad {
 public:
-    static constexpr std::size_t batchEvents = 4096;
+    static constexpr std::size_t batchEvents = 2048;
     static constexpr std::size_t batchBytes = 256U << 10U;
     static constexpr int batchesUnderWay = 4;
 

@@ -68,6 +68,7 @@ Outcome notReplayed(int error)
 JobScript::JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
                      StopSwitch& stop, EventRoad& road)
     : claim_(std::move(request.claim)),
+      mounts_(std::move(request.mounts)),
       operation_(request.operation),
       tool_(request.tool),
       options_(options),
@@ -85,7 +86,7 @@ void JobScript::run()
     for (State state = State::Examining; state != State::Done;)
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
-    claim_.reset();
+    giveDiskBack();
     report();
 }
 
@@ -103,8 +104,42 @@ JobScript::State JobScript::next(State state)
     return State::Done;
 }
 
+/// Why the disk cannot be had; none when it is ours.
+std::optional<Outcome> JobScript::takeDisk()
+{
+    if (claim_)
+        return std::nullopt;
+    log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
+    road_.flush();  // what is still to be written may take long
+    auto unmounted = UnmountedDisk::take(std::move(mounts_), options_.systemPaths);
+    if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
+        return failure(fixwell::kPLErrorCouldNotUnmount, *refusal);
+    unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
+    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    auto claim = DiskClaim::take(*disk_, access, options_.systemPaths);
+    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
+        return failure(*error, {"it was unmounted, but could not be opened", {}, {}});
+    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
+    return std::nullopt;
+}
+
+void JobScript::giveDiskBack()
+{
+    claim_.reset();
+    if (!unmounted_)
+        return;
+    log_.step(fixwell::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
+    for (const Sentence& failure : unmounted_->mountAgain())
+        log_.error(failure);
+    unmounted_.reset();
+}
+
 JobScript::State JobScript::examine()
 {
+    if (const auto objection = objectionToJob())
+        return end(*objection);
+    if (const auto refusal = takeDisk())
+        return end(*refusal);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
     if (tool_ == nullptr && disk_->filesystem.empty())
@@ -121,6 +156,16 @@ JobScript::State JobScript::examine()
     if (operation_ == Operation::Verify)
         return State::Verifying;
     return tool_->habits().isLookedAtBeforeRepair ? State::Looking : State::Repairing;
+}
+
+/// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
+std::optional<Outcome> JobScript::objectionToJob() const
+{
+    if (disk_->filesystem.empty())
+        return std::nullopt;
+    const Capability capability = capabilityFor(disk_->filesystem, operation_, options_.toolPath);
+    return capability.isGiven() ? std::nullopt
+                                : std::optional(failure(capability.error, capability.reason));
 }
 
 /// Why no tool may run; none when one may.
@@ -151,10 +196,8 @@ std::optional<Outcome> JobScript::objection() const
 /// What is there is named, where it is something.
 Outcome JobScript::withoutTool() const
 {
-    std::string type = disk_->filesystem;
-    if (type.empty())
-        type =
-            probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
+    const std::string type =
+        probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
     if (type.empty())
         return failure(fixwell::kPLErrorUnsupported,
                        {"no file system was found that can be checked", {}, {}});
@@ -246,7 +289,13 @@ JobScript::State JobScript::confirm()
     const Judgement judgement = judge(runOnce(Access::ReadOnly));
     if (isWorthAnotherPass(passes_, judgement))
         return State::Repairing;
-    return end(outcomeOfRepair(passes_, judgement));
+    const Outcome outcome = outcomeOfRepair(passes_, judgement);
+    // The verification behind it decides, but a repair that was cut off is not kept quiet about.
+    if (outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired)
+        for (const RepairPass& pass : passes_)
+            if (pass.judgement.verdict == Verdict::Failed)
+                log_.failure(pass.judgement.reason.in(texts_));
+    return end(outcome);
 }
 
 JobScript::State JobScript::end(Outcome outcome)
@@ -287,12 +336,19 @@ RunEvidence JobScript::runOnce(Access access)
 Judgement JobScript::judge(const RunEvidence& evidence) const
 {
     Judgement judgement = obstacle_ ? *obstacle_ : tool_->judge(evidence);
-    if (judgement.verdict != Verdict::Stopped && !claim_->isStillWhole())
-        return {Verdict::Failed,
-                fixwell::kPLErrorDiskChanged,
-                judgement.detail,
-                {"the disk became shorter or unreadable meanwhile", {}, {}},
-                false};
+    if (judgement.verdict == Verdict::Stopped)
+        return judgement;
+    const auto lost = [&judgement](std::string_view reason) {
+        return Judgement{Verdict::Failed,
+                         fixwell::kPLErrorDiskChanged,
+                         judgement.detail,
+                         {reason, {}, {}},
+                         false};
+    };
+    if (!claim_->isStillWhole())
+        return lost("the disk became shorter or unreadable meanwhile");
+    if (!claim_->isStillInPlace())
+        return lost("the disk was deleted, moved or replaced meanwhile");
     return judgement;
 }
 

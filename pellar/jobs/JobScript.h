@@ -5,6 +5,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Outcome.h"
+#include "pellar/mounts/UnmountedDisk.h"
 #include "pellar/tools/Tool.h"
 #include "pellar/volumes/DiskClaim.h"
 
@@ -17,8 +18,9 @@ namespace pellar {
 struct JobRequest {
     fixwell::DiskReferencePointer disk;
     Operation operation = Operation::Verify;
-    DiskClaim claim;
-    const Tool* tool = nullptr;  ///< null: the kind of the volume is still to be found out
+    std::optional<DiskClaim> claim;  ///< none: the job unmounts the disk and claims it itself
+    std::vector<MountPlace> mounts;  ///< where it is mounted, when there is no claim
+    const Tool* tool = nullptr;      ///< null: the kind of the volume is still to be found out
 };
 
 /// What a job does, from the claimed disk to the verdict, on the thread that calls `run`:
@@ -30,8 +32,8 @@ struct JobRequest {
 /// Looking verifies before a repair, for tools that need it; Replaying brings a log to its place
 /// by mounting.
 ///
-/// Whatever happens, it tells *started* once, first, and *finished* once, last. The references
-/// outlive it.
+/// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
+/// tells *started* once, first, and *finished* once, last. The references outlive it.
 class JobScript {
 public:
     JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
@@ -51,7 +53,10 @@ private:
     State confirm();
     State end(Outcome outcome);
 
+    std::optional<Outcome> takeDisk();
+    void giveDiskBack();
     const Tool* findTool() const;
+    std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToSize();
     VolumeFacts factsFor(const Tool& tool) const;
@@ -61,6 +66,8 @@ private:
     void report();
 
     std::optional<DiskClaim> claim_;  ///< none once the disk has been given back
+    std::vector<MountPlace> mounts_;
+    std::optional<UnmountedDisk> unmounted_;
     const Operation operation_;
     const Tool* tool_;
     const ManagerOptions& options_;

@@ -84,11 +84,12 @@ std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference&
         return error;
     if (const ErrorCode error = lockError(opened.get(), access))
         return error;
-    return DiskClaim(std::move(opened), disk.offset, disk.length);
+    return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
 }
 
-DiskClaim::DiskClaim(FileDescriptor disk, std::uint64_t offset, std::uint64_t length)
-    : disk_(std::move(disk)), offset_(offset)
+DiskClaim::DiskClaim(FileDescriptor disk, std::filesystem::path path, std::uint64_t offset,
+                     std::uint64_t length)
+    : disk_(std::move(disk)), path_(std::move(path)), offset_(offset)
 {
     const std::uint64_t size = sizeOf(disk_.get());
     const std::uint64_t rest = size > offset ? size - offset : 0;
@@ -100,6 +101,17 @@ bool DiskClaim::isBlockDevice() const
 {
     struct stat status = {};
     return ::fstat(disk_.get(), &status) == 0 && S_ISBLK(status.st_mode);
+}
+
+bool DiskClaim::isStillInPlace() const
+{
+    struct stat claimed = {};
+    struct stat named = {};
+    if (::fstat(disk_.get(), &claimed) != 0 || ::stat(path_.c_str(), &named) != 0)
+        return false;
+    if (S_ISBLK(claimed.st_mode))
+        return S_ISBLK(named.st_mode) && named.st_rdev == claimed.st_rdev;
+    return named.st_dev == claimed.st_dev && named.st_ino == claimed.st_ino;
 }
 
 bool DiskClaim::isStillWhole() const

@@ -8,6 +8,7 @@
 #include "pellar/volumes/SystemPaths.h"
 
 #include <cstdint>
+#include <filesystem>
 #include <variant>
 
 namespace pellar {
@@ -34,11 +35,16 @@ public:
 
     /// NO when the disk has become shorter since it was claimed, or its end can no longer be read.
     bool isStillWhole() const;
+    /// NO when the name no longer leads to the disk that was claimed: an image was deleted, moved
+    /// or replaced, a device went away. What was found is then true of nothing that is left.
+    bool isStillInPlace() const;
 
 private:
-    DiskClaim(FileDescriptor disk, std::uint64_t offset, std::uint64_t length);
+    DiskClaim(FileDescriptor disk, std::filesystem::path path, std::uint64_t offset,
+              std::uint64_t length);
 
     FileDescriptor disk_;
+    std::filesystem::path path_;
     std::uint64_t offset_;
     std::uint64_t availableBytes_;
     bool isAllOfIt_;

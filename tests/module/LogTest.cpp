@@ -140,6 +140,31 @@ TEST_F(OVFXWTest, RowsKeepUpWithAHistoryThatGrowsAndIsCleared)
     EXPECT_EQ(module->outlineViewNumberOfChildrenOfItem(record(0)), 0U) << "one level only";
 }
 
+// The rows of a disk stand in the selection's order, also while a disk in front still grows.
+TEST_F(OVFXWTest, RowsKeepUpWithSeveralHistories)
+{
+    const auto first = addDisk("a");
+    const auto second = addDisk("b");
+    first->history = historyOf({0, 2});
+    second->history = historyOf({-1, 2, -2});
+    select(first, second);
+    EXPECT_EQ(host.outlinePeer.rows, 2U) << "the summary at the very end is no row";
+    first->history.append(record(0, {}, "new\n"));
+    first->history.append(record(-2, {}, "summary\n"));
+    host.outlineView->reloadData();
+    EXPECT_EQ(host.outlinePeer.rows, 4U) << "one in the middle is";
+    EXPECT_EQ(finalText(module->outlineViewChildOfItem(1, {})).characters(), "new\n");
+    EXPECT_EQ(verbosityOf(module->outlineViewChildOfItem(3, {})), -1);
+    second->history = historyOf({0});
+    host.outlineView->reloadData();
+    EXPECT_EQ(host.outlinePeer.rows, 4U);
+    EXPECT_EQ(verbosityOf(module->outlineViewChildOfItem(3, {})), 0) << "another list";
+    first->history.removeAll();
+    second->history.removeAll();
+    host.outlineView->reloadData();
+    EXPECT_EQ(host.outlinePeer.rows, 0U);
+}
+
 TEST_F(OVFXWTest, RecordsAreStyledByTypeAndLevel)
 {
     struct Case {

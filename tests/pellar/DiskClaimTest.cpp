@@ -76,6 +76,25 @@ TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
     EXPECT_FALSE(claim.isStillWhole());
 }
 
+TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
+{
+    const test::Workshop workshop;
+    for (const char* const what : {"deleted", "moved", "replaced"}) {
+        workshop.write("disk", std::string(10'000, 'x'));
+        const auto disk = *test::reference(workshop.path("disk"));
+        const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
+        const auto& claim = std::get<DiskClaim>(taken);
+        EXPECT_TRUE(claim.isStillInPlace());
+        std::filesystem::rename(disk.path, workshop.path("elsewhere"));
+        if (what == std::string_view("deleted"))
+            std::filesystem::remove(workshop.path("elsewhere"));
+        else if (what == std::string_view("replaced"))
+            workshop.write("disk", std::string(10'000, 'x'));
+        EXPECT_FALSE(claim.isStillInPlace()) << what;
+        EXPECT_TRUE(claim.isStillWhole()) << what;
+    }
+}
+
 TEST(MountInfo, FindsADeviceByItsNumber)
 {
     constexpr std::string_view mountInfo =

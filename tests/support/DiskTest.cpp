@@ -68,6 +68,54 @@ TEST(DiskController, TellsWhatHasHappenedToTheSystemsDisks)
     EXPECT_EQ(host.controller.diskWithIdentifier("sda1"), nullptr);
 }
 
+TEST(DiskController, ADiskThatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
+{
+    Host host;
+    const auto sda = tree("sda", {tree("sda1"), tree("sda2")});
+    const auto sdb = tree("sdb", {tree("sdb1")});
+    host.controller.synchronize({sda, sdb});
+    const auto volume = host.controller.diskNamed("sda1");
+    const auto reference = volume->theKRDisk();
+    host.controller.hold({volume});
+    host.takeHeard();
+
+    host.controller.synchronize({});
+    EXPECT_EQ(host.takeHeard(), "Ej sda2\nEj sda1\nEj sda\nEj sdb1\nEj sdb\n");
+    EXPECT_EQ(host.controller.diskWithKRDisk(reference), volume) << "the tool still speaks of it";
+    EXPECT_EQ(host.controller.findOrCreateOVDisk(reference), volume);
+    EXPECT_TRUE(volume->theKRDisk()->path.empty()) << "nothing more can begin on it";
+    EXPECT_EQ(host.controller.diskNamed("sdb"), nullptr) << "nobody works on that one";
+
+    host.controller.synchronize({sda});
+    EXPECT_EQ(host.takeHeard(), "") << "another disk with its name has to wait";
+    EXPECT_EQ(host.controller.diskNamed("sda1"), volume);
+
+    EXPECT_TRUE(host.controller.release());
+    EXPECT_EQ(host.takeHeard(), "") << "it was told already";
+    EXPECT_EQ(host.controller.diskNamed("sda1"), nullptr);
+    EXPECT_FALSE(host.controller.release());
+    host.controller.synchronize({sda});
+    EXPECT_EQ(host.takeHeard(), "Ap sda\nAp sda1\nAp sda2\n");
+    EXPECT_NE(host.controller.diskNamed("sda1"), volume);
+}
+
+TEST(DiskController, APartitionThatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
+{
+    Host host;
+    host.controller.synchronize({tree("sda", {tree("sda1"), tree("sda2")})});
+    const auto volume = host.controller.diskNamed("sda1");
+    host.controller.hold({volume});
+    host.takeHeard();
+    for (int i = 0; i < 2; ++i) {
+        host.controller.synchronize({tree("sda", {tree("sda2")})});
+        EXPECT_EQ(host.takeHeard(), i == 0 ? "Ej sda1\n" : "") << "told once";
+        EXPECT_EQ(host.controller.diskNamed("sda1"), volume);
+    }
+    EXPECT_TRUE(host.controller.release());
+    EXPECT_EQ(host.controller.diskNamed("sda1"), nullptr);
+    EXPECT_NE(host.controller.diskNamed("sda2"), nullptr);
+}
+
 TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
 {
     const auto record = [](int number) {
@@ -82,7 +130,7 @@ TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
     EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
     EXPECT_TRUE(disk->fsckHistory().isSameAs(disk->fsckHistory())) << "put together once";
     disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 2}, {n = 3})");
+    EXPECT_EQ(shown(), "({n = 1}, {n = 3}, {n = 2})") << "the newest is the last";
     disk->parts()[0]->clearFsckHistory();
     disk->parts()[0]->fsckHistoryNoChildren().append(record(4));
     EXPECT_EQ(shown(), "({n = 1}, {n = 4}, {n = 3})") << "as many as before, but others";

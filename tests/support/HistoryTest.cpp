@@ -47,6 +47,13 @@ std::string exactly(const Value& value)
     return jsonFromValue(value).dump();
 }
 
+Array loaded(HistoryStore& store, std::string_view volume)
+{
+    const Array history = Array::make();
+    store.load(store.recordsOf(volume), history);
+    return history;
+}
+
 struct Store {
     std::filesystem::path file;
     std::vector<std::string> warnings;
@@ -86,8 +93,8 @@ TEST(HistoryStore, RecordsComeBackAsTheyWere)
     Store store{directory / "state/history.sqlite3", {}};
     ASSERT_TRUE(store.open().append("v", history, 0));
     HistoryStore reopened = store.open();
-    EXPECT_EQ(exactly(reopened.load("v")), exactly(history));
-    EXPECT_TRUE(reopened.load("another").isEmpty());
+    EXPECT_EQ(exactly(loaded(reopened, "v")), exactly(history));
+    EXPECT_TRUE(loaded(reopened, "another").isEmpty());
     EXPECT_TRUE(store.warnings.empty());
     struct stat status = {};
     ASSERT_EQ(::stat(store.file.c_str(), &status), 0);
@@ -123,7 +130,8 @@ TEST(HistoryStore, WhatWasSavedIsThereAfterTheProgramWasKilled)
     ::close(ends[1]);
     ASSERT_TRUE(WIFSIGNALED(status)) << "the child must not have ended by itself";
 
-    const Array history = store.open().load("v");
+    HistoryStore mine = store.open();
+    const Array history = loaded(mine, "v");
     ASSERT_GE(history.size(), static_cast<std::size_t>(savedCount));
     for (std::size_t i = 0; i < history.size(); ++i)
         EXPECT_EQ(exactly(history.at(i)), exactly(line(static_cast<int>(i))));
@@ -140,7 +148,7 @@ TEST(HistoryStore, TwoProgramsAddToOneVolume)
         ASSERT_TRUE(one.append("v", Array::of({line(i)}), 0));
         ASSERT_TRUE(other.append("v", Array::of({line(100 + i)}), 0));
     }
-    EXPECT_EQ(one.load("v").size(), 6U);
+    EXPECT_EQ(loaded(one, "v").size(), 6U);
 }
 
 TEST(HistoryStore, OlderRunsAreDroppedWhole)
@@ -154,7 +162,7 @@ TEST(HistoryStore, OlderRunsAreDroppedWhole)
     run.append(summary());
     for (int i = 0; i < 4; ++i)
         ASSERT_TRUE(mine.append("v", run, 0));
-    const Array kept = mine.load("v");
+    const Array kept = loaded(mine, "v");
     EXPECT_LE(kept.size(), 100U);
     EXPECT_GE(kept.size(), 60U);
     EXPECT_EQ(exactly(kept.front()), exactly(line(0))) << "starts with the start of a run";
@@ -163,8 +171,34 @@ TEST(HistoryStore, OlderRunsAreDroppedWhole)
     for (int i = 0; i < 250; ++i)
         giant.append(line(i));
     ASSERT_TRUE(mine.append("v", giant, 0));
-    EXPECT_LE(mine.load("v").size(), 100U);
-    EXPECT_EQ(exactly(mine.load("v").back()), exactly(line(249))) << "the newest are kept";
+    EXPECT_LE(loaded(mine, "v").size(), 100U);
+    EXPECT_EQ(exactly(loaded(mine, "v").back()), exactly(line(249))) << "the newest are kept";
+}
+
+// As many at once as a flood of output brings: nothing is dropped that must stay, and what must go
+// has gone at the latest when the store is closed.
+TEST(HistoryStore, AFullVolumeIsTrimmedLittleByLittle)
+{
+    const TemporaryDirectory directory;
+    Store store{directory / "history.sqlite3", {}, {20'000}};
+    const Array portion = Array::make();
+    for (int i = 0; i < 2000; ++i)
+        portion.append(line(i));
+    {
+        HistoryStore mine = store.open();
+        std::int64_t most = 0;
+        for (int i = 0; i < 40; ++i) {
+            const auto before = mine.recordsOf("v");
+            ASSERT_TRUE(mine.append("v", portion, 0));
+            const auto after = mine.recordsOf("v");
+            most = std::max(most, after.size());
+            EXPECT_LE(i == 0 ? 0 : after.next - before.next, 5000) << "dropped at once";
+        }
+        EXPECT_LE(most, 25'000);
+    }
+    HistoryStore mine = store.open();
+    EXPECT_LE(mine.recordsOf("v").size(), 20'000);
+    EXPECT_GE(mine.recordsOf("v").size(), 15'000);
 }
 
 TEST(HistoryStore, ADamagedDatabaseIsKeptAsideAndANewOneBegun)
@@ -209,7 +243,7 @@ TEST(HistoryStore, DamageThatShowsOnlyLaterIsSetAsideAndEverythingSavedAgain)
     EXPECT_LT(histories.historyOf(damaged).size(), 5000U) << "what could still be read";
     EXPECT_EQ(store.warnings.size(), 1U);
     histories.saveNew();
-    EXPECT_EQ(mine.load(histories.keyOf(disk)).size(), 1U) << "saved again in the new database";
+    EXPECT_EQ(loaded(mine, histories.keyOf(disk)).size(), 1U) << "saved again in the new database";
 }
 
 TEST(HistoryStore, WhatCannotBeKeptHoldsInMemoryWithOneWarning)
@@ -268,6 +302,68 @@ TEST(HistoryKey, CopiesOfAVolumeAreNotMixed)
     EXPECT_NE(historyKeyOf(image, false), historyKeyOf(imageCopy, false));
 }
 
+TEST(DiskHistories, ALongOneComesInTwoStepsAndTakesNewRecordsInBetween)
+{
+    constexpr int count = 10'000;
+    const TemporaryDirectory directory;
+    Store store{directory / "history.sqlite3", {}};
+    DiskFacts disk;
+    disk.identifier = "/dev/x";
+    {
+        HistoryStore mine = store.open();
+        DiskHistories histories(mine);
+        for (int i = 0; i < count; ++i)
+            histories.historyOf(disk).append(line(i));
+        histories.saveNew();
+    }
+    {
+        HistoryStore mine = store.open();
+        DiskHistories histories(mine);
+        int begun = 0;
+        histories.loadGradually([&begun] { ++begun; });
+        const Array newest = histories.historyOf(disk);
+        EXPECT_EQ(begun, 1);
+        EXPECT_LT(newest.size(), 5000U);
+        EXPECT_EQ(exactly(newest.back()), exactly(line(count - 1)));
+        const auto revision = histories.revision();
+        EXPECT_EQ(histories.loadMore(), DiskHistories::Progress::More);
+        newest.append(line(count));
+        histories.saveNew();
+        newest.append(line(count + 1));  // not saved yet when the list becomes another
+        EXPECT_TRUE(histories.loadAll());
+        EXPECT_NE(histories.revision(), revision) << "whoever holds the list must ask again";
+        histories.historyOf(disk).append(line(count + 2));
+        histories.saveNew();
+        EXPECT_FALSE(histories.loadAll()) << "all are there";
+    }
+    HistoryStore mine = store.open();
+    const Array all = loaded(mine, DiskHistories(mine).keyOf(disk));
+    ASSERT_EQ(all.size(), static_cast<std::size_t>(count + 3));
+    for (int i : {0, 3999, 4000, 5999, 6000, count - 1, count, count + 1, count + 2})
+        EXPECT_EQ(exactly(all.at(static_cast<std::size_t>(i))), exactly(line(i)));
+}
+
+TEST(DiskHistories, ALongOneThatIsClearedWhileItComesStaysClear)
+{
+    const TemporaryDirectory directory;
+    Store store{directory / "history.sqlite3", {}};
+    HistoryStore mine = store.open();
+    DiskFacts disk;
+    disk.identifier = "/dev/x";
+    const Array lines = Array::make();
+    for (int i = 0; i < 9000; ++i)
+        lines.append(line(i));
+    ASSERT_TRUE(mine.append(DiskHistories(mine).keyOf(disk), lines, 0));
+    DiskHistories histories(mine);
+    histories.loadGradually([] {});
+    ASSERT_FALSE(histories.historyOf(disk).isEmpty());
+    EXPECT_TRUE(histories.clearHistoryOf(disk));
+    EXPECT_FALSE(histories.loadAll());
+    EXPECT_TRUE(histories.historyOf(disk).isEmpty());
+    histories.saveNew();
+    EXPECT_EQ(mine.recordsOf(histories.keyOf(disk)).size(), 0);
+}
+
 TEST(DiskHistories, SaveWhatIsNewAndSeeAListThatWasEmptiedBehindTheirBack)
 {
     const TemporaryDirectory directory;
@@ -282,7 +378,7 @@ TEST(DiskHistories, SaveWhatIsNewAndSeeAListThatWasEmptiedBehindTheirBack)
         history.append(line(2));
         histories.saveNew();
         histories.saveNew();
-        EXPECT_EQ(mine.load(histories.keyOf(disk)).size(), 2U) << "each once";
+        EXPECT_EQ(loaded(mine, histories.keyOf(disk)).size(), 2U) << "each once";
         history.removeAll();
         history.append(line(3));
         history.append(line(4));
@@ -294,7 +390,7 @@ TEST(DiskHistories, SaveWhatIsNewAndSeeAListThatWasEmptiedBehindTheirBack)
     EXPECT_EQ(exactly(histories.historyOf(disk)), exactly(Array::of({line(3), line(4), line(5)})));
     EXPECT_TRUE(histories.clearHistoryOf(disk));
     EXPECT_FALSE(histories.clearHistoryOf(disk));
-    EXPECT_TRUE(mine.load(histories.keyOf(disk)).isEmpty());
+    EXPECT_TRUE(loaded(mine, histories.keyOf(disk)).isEmpty());
 }
 
 }  // namespace

@@ -40,6 +40,12 @@ void translate(QWidget& widget, const fixwell::Bundle& texts)
     } else if (auto* const label = qobject_cast<QLabel*>(&widget)) {
         label->setText(translated(label->text(), texts));
     }
+    for (const char* const name : {emptyNoteProperty, problemProperty, successProperty})
+        if (const QVariant text = widget.property(name); text.isValid())
+            widget.setProperty(name, translated(text.toString(), texts));
+    // The tool tip becomes HTML, which must not be read out.
+    if (widget.accessibleDescription().isEmpty())
+        widget.setAccessibleDescription(widget.toolTip());
     widget.setToolTip(toQtToolTip(fromQt(translated(widget.toolTip(), texts))));
     widget.setAccessibleName(translated(widget.accessibleName(), texts));
     widget.setAccessibleDescription(translated(widget.accessibleDescription(), texts));

@@ -13,6 +13,9 @@ namespace orvane::desktop {
 
 /// Dynamic properties of the widgets of an interface file.
 inline constexpr const char* actionProperty = "action";        ///< of buttons, in the file
+inline constexpr const char* emptyNoteProperty = "emptyNote";  ///< of a LogTable, in the file
+inline constexpr const char* problemProperty = "problemWord";  ///< likewise: spoken for a red row
+inline constexpr const char* successProperty = "successWord";  ///< likewise: for a green one
 inline constexpr const char* viewClassProperty = "viewClass";  ///< of a LogTable, set by the loader
 
 /// Makes the widgets of a file of Qt Designer, with their texts as the bundle translates them. A

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogModel.h"
 
+#include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include <algorithm>
@@ -28,21 +29,30 @@ void LogModel::setView(fixwell::OutlineView* view)
     reload();
 }
 
-void LogModel::reload()
+LogModel::Change LogModel::reload()
 {
     const auto rows =
         static_cast<int>(std::min<std::size_t>(countRows(), std::numeric_limits<int>::max() / 64));
-    if (hasOnlyGrown(rows)) {
-        if (rows > rows_) {
+    const Change change = changeTo(rows);
+    switch (change) {
+        case Change::None: break;
+        case Change::MoreAtEnd:
             beginInsertRows({}, rows_, rows - 1);
             remember(rows);
             endInsertRows();
-        }
-        return;
+            break;
+        case Change::MoreInFront:
+            beginInsertRows({}, 0, rows - rows_ - 1);
+            remember(rows);
+            endInsertRows();
+            break;
+        case Change::Other:
+            beginResetModel();
+            remember(rows);
+            endResetModel();
+            break;
     }
-    beginResetModel();
-    remember(rows);
-    endResetModel();
+    return change;
 }
 
 std::size_t LogModel::countRows() const
@@ -51,14 +61,23 @@ std::size_t LogModel::countRows() const
     return hasSource ? view_->dataSource()->outlineViewNumberOfChildrenOfItem({}) : 0;
 }
 
-// Records are only ever added to a history, or replaced altogether: where the first and the last
-// of the old rows are what they were, so are those between.
-bool LogModel::hasOnlyGrown(int rows) const
+LogModel::Change LogModel::changeTo(int rows) const
 {
     if (rows_ == 0)
-        return true;
-    return rows >= rows_ && view_->itemAtRow(0).isSameAs(first_) &&
-           view_->itemAtRow(static_cast<std::size_t>(rows_ - 1)).isSameAs(last_);
+        return rows == 0 ? Change::None : Change::Other;
+    if (rows < rows_)
+        return Change::Other;
+    if (holdsOldRows(0))
+        return rows == rows_ ? Change::None : Change::MoreAtEnd;
+    return holdsOldRows(rows - rows_) ? Change::MoreInFront : Change::Other;
+}
+
+// Records are only ever added to a history, or replaced altogether: where the first and the last
+// of the old rows are what they were, so are those between.
+bool LogModel::holdsOldRows(int offset) const
+{
+    return view_->itemAtRow(static_cast<std::size_t>(offset)).isSameAs(first_) &&
+           view_->itemAtRow(static_cast<std::size_t>(offset + rows_ - 1)).isSameAs(last_);
 }
 
 void LogModel::remember(int rows)
@@ -76,9 +95,27 @@ int LogModel::rowCount(const QModelIndex& parent) const
 
 QVariant LogModel::data(const QModelIndex& index, int role) const
 {
-    if (role != Qt::DisplayRole || !index.isValid() || view_ == nullptr)
+    if (!index.isValid() || view_ == nullptr)
         return {};
-    return oneLine(textOfRow(*view_, static_cast<std::size_t>(index.row()))).text;
+    const fixwell::OutlineItem item = view_->itemAtRow(static_cast<std::size_t>(index.row()));
+    switch (role) {
+        case Qt::DisplayRole: return oneLine(textOfItem(*view_, item)).text;
+        case Qt::AccessibleTextRole: return spokenText(item);
+        default: return {};
+    }
+}
+
+QString LogModel::spokenText(const fixwell::OutlineItem& item) const
+{
+    const QString text = oneLine(textOfItem(*view_, item)).text;
+    const std::string_view type = item.string(fixwell::kFsckMessageType);
+    const bool isProblem = type == fixwell::kFsckError.text() || type == fixwell::kFsckFail.text();
+    QString word;
+    if (isProblem)
+        word = spoken_.problem;
+    else if (type == fixwell::kFsckSuccess.text())
+        word = spoken_.success;
+    return word.isEmpty() ? text : word + QStringLiteral(": ") + text;
 }
 
 Qt::ItemFlags LogModel::flags(const QModelIndex& index) const

@@ -20,21 +20,34 @@ public:
     void setView(fixwell::OutlineView* view);
     fixwell::OutlineView* view() const { return view_; }
 
+    /// What is said before a row's text where its type is shown by its colour alone.
+    struct SpokenTypes {
+        QString problem;
+        QString success;
+    };
+    void setSpokenTypes(SpokenTypes types) { spoken_ = std::move(types); }
+
     /// Takes up the rows there are now. When there are only more of them, the selection and the
     /// place of the view stay.
-    void reload();
+    /// How the rows differ from those before.
+    enum class Change { None, MoreAtEnd, MoreInFront, Other };
+    Change reload();
 
     int rowCount(const QModelIndex& parent = {}) const override;
-    /// The row's plain text for Qt::DisplayRole; the rest is the delegate's.
+    /// The row's plain text for Qt::DisplayRole, and with its type for Qt::AccessibleTextRole; the
+    /// rest is the delegate's.
     QVariant data(const QModelIndex& index, int role) const override;
     Qt::ItemFlags flags(const QModelIndex& index) const override;
 
 private:
+    QString spokenText(const fixwell::OutlineItem& item) const;
     std::size_t countRows() const;
-    bool hasOnlyGrown(int rows) const;
+    Change changeTo(int rows) const;
+    bool holdsOldRows(int offset) const;
     void remember(int rows);
 
     fixwell::OutlineView* view_ = nullptr;
+    SpokenTypes spoken_;
     int rows_ = 0;
     fixwell::OutlineItem first_;  ///< as last loaded, to tell growth from another log
     fixwell::OutlineItem last_;

@@ -5,6 +5,7 @@
 #include <QFontMetrics>
 #include <QHeaderView>
 #include <QMouseEvent>
+#include <QScrollBar>
 
 namespace orvane::desktop {
 namespace {
@@ -31,6 +32,18 @@ LogTable::LogTable(QWidget* parent) : QTableView(parent)
     setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
     setAcceptDrops(false);
     adoptFont();
+}
+
+int LogTable::pixelsToEnd() const
+{
+    return verticalScrollBar()->maximum() - verticalScrollBar()->value();
+}
+
+void LogTable::scrollToPixelsBeforeEnd(int pixels)
+{
+    executeDelayedItemsLayout();
+    updateGeometries();
+    verticalScrollBar()->setValue(verticalScrollBar()->maximum() - pixels);
 }
 
 void LogTable::keyPressEvent(QKeyEvent* event)

@@ -23,6 +23,9 @@ public:
     /// Selected rows can be dragged out of the log.
     void setDraggable(bool isDraggable) { isDraggable_ = isDraggable; }
     /// What a table does with a key that nobody else wants.
+    /// What is hidden below the last visible row.
+    int pixelsToEnd() const;
+    void scrollToPixelsBeforeEnd(int pixels);
     void handleKey(QKeyEvent& event) { QTableView::keyPressEvent(&event); }
 
 protected:

@@ -75,8 +75,7 @@ void OutlinePeer::flush()
     isWaiting_ = false;
     if (std::exchange(mustReload_, false)) {
         beforeRows_();
-        model_.reload();
-        rows_ = static_cast<std::size_t>(model_.rowCount());
+        reload();
         table_->viewport()->update();
     }
     const auto row = std::exchange(mustShow_, std::nullopt);
@@ -86,6 +85,19 @@ void OutlinePeer::flush()
         table_->scrollToBottom();
     else
         table_->scrollTo(model_.index(static_cast<int>(*row)));
+}
+
+// Another log is shown from its end, where the last verdict stands. Where older rows come in front
+// of those that are there, these stay where they are.
+void OutlinePeer::reload()
+{
+    const int pixelsBelow = table_->pixelsToEnd();
+    const LogModel::Change change = model_.reload();
+    rows_ = static_cast<std::size_t>(model_.rowCount());
+    if (change == LogModel::Change::Other)
+        table_->scrollToBottom();
+    else if (change == LogModel::Change::MoreInFront)
+        table_->scrollToPixelsBeforeEnd(pixelsBelow);
 }
 
 std::string OutlinePeer::selectionHTML() const

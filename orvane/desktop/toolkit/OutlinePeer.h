@@ -55,6 +55,7 @@ public:
 
 private:
     void noteChange();
+    void reload();
     void sendKey(QKeyEvent& event);
     void drag();
 

@@ -29,7 +29,7 @@ std::uint16_t keyCodeOf(int qtKey)
 
 std::uint64_t QtEvents::currentModifierFlags() const
 {
-    return modifierFlags(QGuiApplication::queryKeyboardModifiers());
+    return modifierFlags(QGuiApplication::keyboardModifiers());
 }
 
 }  // namespace orvane::desktop

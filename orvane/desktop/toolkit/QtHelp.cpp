@@ -1,58 +1,49 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtHelp.h"
 
-#include "fixwell/host/foundation/Format.h"
-#include "orvane/desktop/toolkit/Text.h"
-
-#include <QFileInfo>
-#include <QUrl>
+#include "orvane/desktop/toolkit/QtTexts.h"
 
 namespace orvane::desktop {
 namespace {
 
-constexpr QSize windowSize(640, 560);
+constexpr std::string_view geometryKey = "HelpWindow.geometry";
+constexpr std::string_view books = "help/";
+
+// English where the language has texts, but no book.
+std::filesystem::path bookDirectory(const fixwell::Bundle& bundle)
+{
+    const auto translated = bundle.pathForResource(std::string(books) + languageOf(bundle));
+    return translated.empty() ? bundle.pathForResource(std::string(books) + "en") : translated;
+}
 
 }  // namespace
-
-QtHelp::QtHelp(std::filesystem::path book, const fixwell::Bundle& texts)
-    : book_(std::move(book)), texts_(texts)
-{
-}
 
 QtHelp::~QtHelp()
 {
     delete window_;
 }
 
-QTextBrowser& QtHelp::window()
+void QtHelp::makeWindow()
 {
-    if (!window_) {
-        window_ = new QTextBrowser;
-        window_->setAttribute(Qt::WA_DeleteOnClose);
-        // The program ends with its main window, whatever help is open.
-        window_->setAttribute(Qt::WA_QuitOnClose, false);
-        window_->setWindowTitle(toQt(texts_.localizedString("Orvane Help")));
-        window_->setAccessibleName(window_->windowTitle());
-        window_->resize(windowSize);
-    }
-    return *window_;
+    window_ = new HelpWindow(HelpBook(bookDirectory(bundle_)), bundle_);
+    window_->setAttribute(Qt::WA_DeleteOnClose);
+    // The program ends with its main window, whatever help is open.
+    window_->setAttribute(Qt::WA_QuitOnClose, false);
+    window_->restoreGeometry(QByteArray::fromBase64(
+        QByteArray::fromStdString(std::string(settings_.objectForKey(geometryKey).string()))));
+    window_->setClosed([this](const QByteArray& geometry) {
+        settings_.setObjectForKey(fixwell::Value(geometry.toBase64().toStdString()), geometryKey);
+    });
 }
 
 void QtHelp::openHelpAnchor(std::string_view anchor)
 {
-    QTextBrowser& browser = window();
-    browser.show();
-    const QString file = QString::fromStdString(book_.string());
-    if (QFileInfo(file).isReadable()) {
-        QUrl place = QUrl::fromLocalFile(file);
-        place.setFragment(toQt(anchor));
-        browser.setSource(place);
-    } else {
-        browser.setPlainText(toQt(fixwell::format(
-            texts_.localizedString("The help book %@ cannot be read."), {book_.string()})));
-    }
-    browser.raise();
-    browser.activateWindow();
+    if (!window_)
+        makeWindow();
+    window_->show();
+    window_->open(anchor);
+    window_->raise();
+    window_->activateWindow();
 }
 
 }  // namespace orvane::desktop

@@ -2,21 +2,24 @@
 #pragma once
 
 #include "fixwell/host/foundation/Bundle.h"
+#include "fixwell/host/foundation/UserDefaults.h"
 #include "fixwell/host/toolkit/Help.h"
+#include "orvane/desktop/toolkit/HelpWindow.h"
 
 #include <QPointer>
-#include <QTextBrowser>
-
-#include <filesystem>
 
 namespace orvane::desktop {
 
-/// The help book in a window of its own; no network and no browser is needed.
+/// The help book in a window of its own; no network and no browser is needed. The book is in the
+/// language of the bundle's texts, in `help/LANGUAGE`.
 class QtHelp final : public fixwell::HelpManager {
 public:
-    /// `book` is an HTML file. `texts` gives the window's own few texts, and outlives this
-    /// object.
-    QtHelp(std::filesystem::path book, const fixwell::Bundle& texts);
+    /// `bundle` holds the book and the window's own few texts; `settings` keeps the window's size
+    /// and place. Both outlive this object.
+    QtHelp(const fixwell::Bundle& bundle, fixwell::UserDefaults& settings)
+        : bundle_(bundle), settings_(settings)
+    {
+    }
     QtHelp(const QtHelp&) = delete;
     QtHelp& operator=(const QtHelp&) = delete;
     ~QtHelp() override;
@@ -24,13 +27,15 @@ public:
     /// Opens the book, or brings it to the front. An empty anchor is the book's beginning. A book
     /// that cannot be read is said so in the window.
     void openHelpAnchor(std::string_view anchor) override;
+    /// None while it is closed.
+    HelpWindow* window() { return window_; }
 
 private:
-    QTextBrowser& window();
+    void makeWindow();
 
-    std::filesystem::path book_;
-    const fixwell::Bundle& texts_;
-    QPointer<QTextBrowser> window_;
+    const fixwell::Bundle& bundle_;
+    fixwell::UserDefaults& settings_;
+    QPointer<HelpWindow> window_;
 };
 
 }  // namespace orvane::desktop

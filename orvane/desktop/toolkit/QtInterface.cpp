@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtInterface.h"
 
+#include "orvane/desktop/toolkit/EmptyNote.h"
+#include "orvane/desktop/toolkit/FittingPane.h"
 #include "orvane/desktop/toolkit/InterfaceFile.h"
 #include "orvane/desktop/toolkit/Text.h"
 
@@ -80,6 +82,13 @@ void LoadedInterface::makeOutlineView(fixwell::OutlineView** place, LogTable& ta
     *place = outlineView_.get();
     outlineView_->setDataSource(owner_->outlineViewDelegate());
     peer_->setView(outlineView_.get());
+    const auto word = [&table](const char* property) {
+        return table.property(property).toString();
+    };
+    static_cast<LogModel*>(table.model())
+        ->setSpokenTypes({word(problemProperty), word(successProperty)});
+    if (const QString note = word(emptyNoteProperty); !note.isEmpty())
+        new EmptyNote(table, note);
 }
 
 // The divider stands below the first pane: its limits are the pane's.
@@ -99,6 +108,8 @@ void LoadedInterface::limitSplitView()
     if (splitter->orientation() == Qt::Vertical) {
         pane.setMinimumHeight(least);
         pane.setMaximumHeight(most);
+        if (auto* const text = pane.findChild<QScrollArea*>())
+            new FittingPane(*splitter, *text);
     } else {
         pane.setMinimumWidth(least);
         pane.setMaximumWidth(most);

@@ -17,11 +17,12 @@ QByteArray withoutControls(std::string_view text)
 {
     std::string result;
     result.reserve(text.size());
-    fixwell::forEachCharacter(text, [&result](char32_t character) {
-        const bool isControl = (character < 0x20 && character != '\n' && character != '\t') ||
-                               (character >= 0x7F && character < 0xA0);
-        fixwell::appendUTF8(result, isControl ? U'\uFFFD' : character);
-    });
+    while (!text.empty()) {
+        const std::size_t end = std::min(text.find_first_of("\n\t"), text.size());
+        result += fixwell::printable(text.substr(0, end));
+        result += text.substr(end, 1);
+        text.remove_prefix(std::min(end + 1, text.size()));
+    }
     return {result.data(), static_cast<qsizetype>(result.size())};
 }
 

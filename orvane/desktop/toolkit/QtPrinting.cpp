@@ -1,123 +1,88 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtPrinting.h"
 
-#include "orvane/desktop/toolkit/DesktopFont.h"
+#include "fixwell/host/foundation/Format.h"
+#include "fixwell/host/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/LogModel.h"
-#include "orvane/desktop/toolkit/StyledLine.h"
+#include "orvane/desktop/toolkit/Text.h"
 
-#include <QPainter>
+#include <QDateTime>
+#include <QLocale>
 #include <QPrintDialog>
-
-#include <algorithm>
-#include <cmath>
-#include <memory>
 
 namespace orvane::desktop {
 namespace {
 
-constexpr double smallestScale = 0.5;
-constexpr double lineSpacing = 1.15;
+constexpr std::chrono::milliseconds slice{20};
+constexpr double paperMargin = 15;  // millimetres
+constexpr int progressSteps = 1000;
 
-/// How the rows lie on the pages, in units of the scaled painter.
-struct PageLayout {
-    double scale = 1;
-    double width = 0;  ///< of the page
-    double height = 0;
-    double left = 0;  ///< where rows start
-    double rowHeight = 1;
-    std::size_t rowsPerPage = 1;
-};
-
-LineLooks paperLooks(const fixwell::OutlineView& view)
+// The records are shared with the history, not copied.
+std::vector<fixwell::StyledText> rowsOf(fixwell::OutlineView& view)
 {
-    LineLooks looks;
-    looks.defaultFont = view.dataCell() != nullptr ? view.dataCell()->font() : fixwell::Font();
-    looks.textColor = Qt::black;
-    looks.background = Qt::white;
-    return looks;
-}
-
-double widestRow(fixwell::OutlineView& view, QPrinter& printer, const LineLooks& looks)
-{
-    double widest = 0;
-    for (std::size_t row = 0; row < view.numberOfRows(); ++row) {
-        const StyledLine line = oneLine(textOfRow(view, row));
-        const QFontMetricsF metrics(widestFont(line, looks), &printer);
-        widest = std::max(widest, metrics.horizontalAdvance(line.text));
-    }
-    return widest;
-}
-
-PageLayout layoutOf(fixwell::OutlineView& view, QPrinter& printer, const fixwell::PrintInfo& info,
-                    const LineLooks& looks)
-{
-    const QRectF page = printer.pageLayout().paintRectPixels(printer.resolution());
-    const double widest = std::max(1.0, widestRow(view, printer, looks) + 1);
-    PageLayout layout;
-    if (info.horizontalPagination == fixwell::Pagination::Fit)
-        layout.scale = std::clamp(page.width() / widest, smallestScale, 1.0);
-    layout.width = page.width() / layout.scale;
-    layout.height = page.height() / layout.scale;
-    if (info.isHorizontallyCentered)
-        layout.left = std::max(0.0, (layout.width - widest) / 2);
-    fixwell::Font bold = looks.defaultFont;
-    bold.isBold = true;
-    layout.rowHeight =
-        QFontMetricsF(scaledFont(bold, looks.fontScale), &printer).height() * lineSpacing;
-    layout.rowsPerPage =
-        std::max<std::size_t>(1, static_cast<std::size_t>(layout.height / layout.rowHeight));
-    return layout;
-}
-
-void printPage(QPainter& painter, fixwell::OutlineView& view, std::size_t first, std::size_t count,
-               const PageLayout& layout, const LineLooks& looks, bool isCentered)
-{
-    const double used = static_cast<double>(count) * layout.rowHeight;
-    const double top = isCentered ? std::max(0.0, (layout.height - used) / 2) : 0;
-    for (std::size_t i = 0; i < count; ++i)
-        draw(painter,
-             QRectF(layout.left, top + static_cast<double>(i) * layout.rowHeight,
-                    layout.width - layout.left, layout.rowHeight),
-             oneLine(textOfRow(view, first + i)), looks);
+    std::vector<fixwell::StyledText> rows;
+    rows.reserve(view.numberOfRows());
+    for (std::size_t row = 0; row < view.numberOfRows(); ++row)
+        rows.push_back(textOfRow(view, row));
+    return rows;
 }
 
 }  // namespace
 
-bool printRows(QPrinter& printer, fixwell::OutlineView& view, const fixwell::PrintInfo& info)
+QtPrinting::QtPrinting(const fixwell::Bundle& texts, Failed failed)
+    : texts_(texts), failed_(std::move(failed))
 {
-    QPainter painter;
-    if (!painter.begin(&printer))
-        return false;
-    const LineLooks looks = paperLooks(view);
-    const PageLayout layout = layoutOf(view, printer, info, looks);
-    painter.scale(layout.scale, layout.scale);
-    const std::size_t rows = view.numberOfRows();
-    for (std::size_t first = 0; first < rows; first += layout.rowsPerPage) {
-        if (first > 0 && !printer.newPage())
-            return false;
-        printPage(painter, view, first, std::min(layout.rowsPerPage, rows - first), layout, looks,
-                  info.isVerticallyCentered);
-    }
-    return painter.end() && printer.printerState() != QPrinter::Error;
+    // A timer leaves the window its turn between two slices.
+    nextSlice_.setInterval(0);
+    QObject::connect(&nextSlice_, &QTimer::timeout, &nextSlice_, [this] { goOn(); });
 }
 
 QtPrinting::~QtPrinting()
 {
     delete panel_;
+    delete progress_;
+}
+
+QString QtPrinting::text(std::string_view key) const
+{
+    return toQt(texts_.localizedString(key));
+}
+
+QString QtPrinting::title() const
+{
+    const std::string title = title_ ? title_() : std::string();
+    return title.empty() ? text("Log of checks and repairs") : toQt(fixwell::printable(title));
+}
+
+PrintHeader QtPrinting::header() const
+{
+    return {
+        title(), QLocale().toString(QDateTime::currentDateTime(), QLocale::ShortFormat),
+        [this](int page, int pages) {
+            return toQt(fixwell::format(texts_.localizedString("Page %ld of %ld"), {page, pages}));
+        }};
 }
 
 void QtPrinting::forget(const fixwell::OutlineView& view)
 {
-    if (panelView_ == &view)
-        delete panel_;
+    if (view_ != &view)
+        return;
+    delete panel_;
+    end(false);
 }
 
 void QtPrinting::runPrintOperation(fixwell::OutlineView& view, const fixwell::PrintInfo& info,
                                    bool showsPanel, fixwell::Window* /*window*/)
 {
+    if (isPrinting())
+        return;
+    view_ = &view;
     const auto printer = std::make_shared<QPrinter>(QPrinter::HighResolution);
+    printer->setDocName(title());
+    printer->setPageMargins({paperMargin, paperMargin, paperMargin, paperMargin},
+                            QPageLayout::Millimeter);
     if (!showsPanel) {
-        print(*printer, view, info);
+        start(printer, info);
         return;
     }
     delete panel_;
@@ -125,16 +90,48 @@ void QtPrinting::runPrintOperation(fixwell::OutlineView& view, const fixwell::Pr
     panel->setAttribute(Qt::WA_DeleteOnClose);
     panel->setOptions(QAbstractPrintDialog::PrintToFile);
     QObject::connect(panel, &QDialog::accepted, panel,
-                     [this, printer, &view, info] { print(*printer, view, info); });
+                     [this, printer, info] { start(printer, info); });
     panel_ = panel;
-    panelView_ = &view;
     panel->open();
 }
 
-void QtPrinting::print(QPrinter& printer, fixwell::OutlineView& view,
-                       const fixwell::PrintInfo& info)
+void QtPrinting::start(std::shared_ptr<QPrinter> printer, const fixwell::PrintInfo& info)
 {
-    if (!printRows(printer, view, info) && failed_)
+    printer_ = std::move(printer);
+    const fixwell::Font font =
+        view_->dataCell() != nullptr ? view_->dataCell()->font() : fixwell::Font();
+    job_ = std::make_unique<PrintJob>(*printer_, rowsOf(*view_), font, info, header());
+    // It shows itself when printing takes longer than a moment.
+    progress_ =
+        new QProgressDialog(text("Printing the log…"), text("Cancel"), 0, progressSteps, window_);
+    progress_->setWindowModality(Qt::WindowModal);
+    progress_->setAutoClose(false);
+    progress_->setAutoReset(false);
+    QObject::connect(
+        progress_, &QProgressDialog::canceled, &nextSlice_, [this] { end(false); },
+        Qt::QueuedConnection);
+    nextSlice_.start();
+}
+
+void QtPrinting::goOn()
+{
+    const PrintJob::State state = job_->work(slice);
+    if (state == PrintJob::State::Working)
+        progress_->setValue(static_cast<int>(job_->progress() * progressSteps));
+    else
+        end(state == PrintJob::State::Failed);
+}
+
+void QtPrinting::end(bool hasFailed)
+{
+    nextSlice_.stop();
+    if (progress_)
+        progress_->deleteLater();
+    progress_.clear();
+    job_.reset();
+    printer_.reset();
+    view_ = nullptr;
+    if (hasFailed && failed_)
         failed_();
 }
 

@@ -1,47 +1,65 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/host/foundation/Bundle.h"
 #include "fixwell/host/toolkit/Printing.h"
+#include "orvane/desktop/toolkit/PrintJob.h"
 
 #include <QPointer>
 #include <QPrinter>
+#include <QProgressDialog>
+#include <QTimer>
 #include <QWidget>
 
 #include <functional>
+#include <memory>
 
 namespace orvane::desktop {
 
-/// Prints all rows, with page breaks between rows. With `Pagination::Fit` the widest row is
-/// scaled down to the width of the page, but to no less than half its size; what is still wider
-/// is shortened as on the screen. NO when the printer cannot be written to.
-[[nodiscard]] bool printRows(QPrinter& printer, fixwell::OutlineView& view,
-                             const fixwell::PrintInfo& info);
-
+/// Prints logs: the desktop's print panel, then the pages in slices, with a sheet that shows how
+/// far it is once that takes long, and can give it up. One log at a time. Main thread.
 class QtPrinting final : public fixwell::Printing {
 public:
-    /// Told when a page could not be printed.
+    /// Told when a log could not be printed.
     using Failed = std::function<void()>;
 
-    explicit QtPrinting(Failed failed) : failed_(std::move(failed)) {}
+    /// `texts` outlives this object.
+    QtPrinting(const fixwell::Bundle& texts, Failed failed);
     ~QtPrinting() override;
 
-    /// The window that the print panel is shown on, whichever window a module names.
+    /// The window that sheets are shown on, whichever window a module names.
     void setWindow(QWidget* window) { window_ = window; }
-    /// A view goes away: a print panel that is still open for it is closed.
+    /// Asked what is printed, for the head of the pages: the names of the disks. One line; what it
+    /// answers may be hostile.
+    void setTitle(std::function<std::string()> title) { title_ = std::move(title); }
+    /// A view goes away: what is being printed of it is given up.
     void forget(const fixwell::OutlineView& view);
 
     fixwell::PrintInfo& sharedPrintInfo() override { return info_; }
     void runPrintOperation(fixwell::OutlineView& view, const fixwell::PrintInfo& info,
                            bool showsPanel, fixwell::Window* window) override;
 
-private:
-    void print(QPrinter& printer, fixwell::OutlineView& view, const fixwell::PrintInfo& info);
+    bool isPrinting() const { return job_ != nullptr; }
 
+private:
+    QString text(std::string_view key) const;
+    QString title() const;
+    PrintHeader header() const;
+    void start(std::shared_ptr<QPrinter> printer, const fixwell::PrintInfo& info);
+    void goOn();
+    void end(bool hasFailed);
+
+    const fixwell::Bundle& texts_;
     Failed failed_;
+    std::function<std::string()> title_;
     fixwell::PrintInfo info_;
     QPointer<QWidget> window_;
     QPointer<QWidget> panel_;
-    const fixwell::OutlineView* panelView_ = nullptr;  ///< only an identity
+    fixwell::OutlineView* view_ = nullptr;  ///< of the panel or the job
+    std::shared_ptr<QPrinter> printer_;
+    std::unique_ptr<PrintJob> job_;
+    QPointer<QProgressDialog> progress_;
+    QTimer nextSlice_;
 };
 
 }  // namespace orvane::desktop

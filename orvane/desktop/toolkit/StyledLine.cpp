@@ -6,8 +6,6 @@
 #include "orvane/desktop/toolkit/DesktopFont.h"
 #include "orvane/desktop/toolkit/Text.h"
 
-#include <QTextLayout>
-
 #include <algorithm>
 
 namespace orvane::desktop {
@@ -57,6 +55,15 @@ fixwell::Font fontOf(const fixwell::TextStyle& style, const LineLooks& looks)
     return style.font.value_or(looks.defaultFont);
 }
 
+QFont qtFont(const fixwell::Font& font, const LineLooks& looks)
+{
+    QFont result = scaledFont(font, looks.fontScale);
+    // Spaced letters are never joined.
+    if (!looks.joinsLetters)
+        result.setLetterSpacing(QFont::AbsoluteSpacing, 1.0 / 16);
+    return result;
+}
+
 QColor colorOf(const fixwell::TextStyle& style, const LineLooks& looks)
 {
     if (!style.color || looks.keepsTextColor)
@@ -67,20 +74,6 @@ QColor colorOf(const fixwell::TextStyle& style, const LineLooks& looks)
     };
     return readableOn(looks.background,
                       QColor::fromRgbF(part(color.red), part(color.green), part(color.blue)));
-}
-
-QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLooks& looks)
-{
-    QList<QTextLayout::FormatRange> formats;
-    int start = 0;
-    for (const StyledLine::Run& run : line.runs) {
-        QTextCharFormat format;
-        format.setFont(scaledFont(fontOf(*run.style, looks), looks.fontScale));
-        format.setForeground(colorOf(*run.style, looks));
-        formats.append({start, static_cast<int>(run.length), format});
-        start += static_cast<int>(run.length);
-    }
-    return formats;
 }
 
 }  // namespace
@@ -142,7 +135,21 @@ QFont widestFont(const StyledLine& line, const LineLooks& looks)
         widest.isBold = widest.isBold || font.isBold;
         widest.points = std::max(widest.points, font.points);
     }
-    return scaledFont(widest, looks.fontScale);
+    return qtFont(widest, looks);
+}
+
+QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLooks& looks)
+{
+    QList<QTextLayout::FormatRange> formats;
+    int start = 0;
+    for (const StyledLine::Run& run : line.runs) {
+        QTextCharFormat format;
+        format.setFont(qtFont(fontOf(*run.style, looks), looks));
+        format.setForeground(colorOf(*run.style, looks));
+        formats.append({start, static_cast<int>(run.length), format});
+        start += static_cast<int>(run.length);
+    }
+    return formats;
 }
 
 void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks)

@@ -7,6 +7,7 @@
 #include <QPainter>
 #include <QPalette>
 #include <QString>
+#include <QTextLayout>
 
 #include <vector>
 
@@ -34,15 +35,18 @@ StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double w
 
 /// How a line is put on a screen or on paper.
 struct LineLooks {
-    double fontScale = 1;         ///< of the points of the text
-    fixwell::Font defaultFont;    ///< for runs that name none
-    QColor textColor;             ///< for runs that name none
-    QColor background;            ///< colours are made readable on it
+    double fontScale = 1;       ///< of the points of the text
+    fixwell::Font defaultFont;  ///< for runs that name none
+    QColor textColor;           ///< for runs that name none
+    QColor background;          ///< colours are made readable on it
+    bool joinsLetters = true;   ///< NO where the text is searched later: “fi” stays two letters
     bool keepsTextColor = false;  ///< as for selected rows: `textColor` for everything
 };
 
 /// The font that the line's widest run has.
 QFont widestFont(const StyledLine& line, const LineLooks& looks);
+/// The styles of the line's runs, for laying it out.
+QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLooks& looks);
 /// Fits the line into the rectangle and draws it, centred vertically.
 void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks);
 

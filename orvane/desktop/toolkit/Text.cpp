@@ -12,7 +12,6 @@
 namespace orvane::desktop {
 namespace {
 
-// Control characters are dropped: HTML 5 has no place for them.
 void appendEscaped(std::string& html, char32_t character)
 {
     switch (character) {
@@ -23,10 +22,7 @@ void appendEscaped(std::string& html, char32_t character)
         case '\'': html += "&#39;"; return;
         default: break;
     }
-    const bool isControl =
-        (character < 0x20 && character != '\t') || (character >= 0x7F && character < 0xA0);
-    if (!isControl)
-        fixwell::appendUTF8(html, character);
+    fixwell::appendUTF8(html, character);
 }
 
 std::string points(double number)
@@ -109,8 +105,10 @@ std::string html(const fixwell::StyledText& text, double fontScale)
             const std::size_t end = std::min(characters.find('\n'), characters.size());
             const std::string_view line = characters.substr(0, end);
             result += span;
-            fixwell::forEachCharacter(
-                line, [&result](char32_t character) { appendEscaped(result, character); });
+            // HTML 5 has no place for control characters.
+            fixwell::forEachCharacter(fixwell::printable(line), [&result](char32_t character) {
+                appendEscaped(result, character);
+            });
             // A paragraph without contents would have no height.
             result += line.empty() && startsParagraph ? "&nbsp;</span>" : "</span>";
             if (end < characters.size()) {

@@ -25,11 +25,11 @@ const QColor greenColor(0x2e, 0x8b, 0x45);
 const QColor redColor(0xc6, 0x2f, 0x2f);
 const QColor amberColor(0xc9, 0x8a, 0x10);
 
-// In two sizes, so that it is sharp on screens with twice the density as well.
+// In several sizes, so that it is sharp in a menu, in the list, and on denser screens.
 QIcon drawn(const Drawing& draw)
 {
     QIcon icon;
-    for (const int pixels : {16, 32}) {
+    for (const int pixels : {16, 24, 32, 48, 64}) {
         QPixmap pixmap(pixels, pixels);
         pixmap.fill(Qt::transparent);
         QPainter painter(&pixmap);

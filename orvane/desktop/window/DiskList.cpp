@@ -2,6 +2,7 @@
 #include "orvane/desktop/window/DiskList.h"
 
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/desktop/window/DiskDelegate.h"
 
 #include <QHeaderView>
 
@@ -17,20 +18,18 @@ DiskList::DiskList(const Translator& texts, QWidget* parent) : QTreeView(parent)
     setSelectionMode(ExtendedSelection);
     setSelectionBehavior(SelectRows);
     setUniformRowHeights(true);
-    setAllColumnsShowFocus(true);
-    setAlternatingRowColors(true);
     setEditTriggers(NoEditTriggers);
-    setTextElideMode(Qt::ElideMiddle);
-    header()->setStretchLastSection(false);
+    setHeaderHidden(true);
+    setItemDelegate(new DiskDelegate(this));
 }
 
 void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged)
 {
     disks_ = &disks;
     setModel(&disks);
-    constexpr int widths[diskColumnCount] = {170, 110, 76, 62, 90, 120};
-    for (int column = 0; column < diskColumnCount; ++column)
-        setColumnWidth(column, widths[column]);
+    // The others are drawn in the first one.
+    for (int column = 1; column < diskColumnCount; ++column)
+        setColumnHidden(column, true);
     // Volumes are what the user is here for.
     connect(&disks, &QAbstractItemModel::rowsInserted, this,
             [this](const QModelIndex& parent) { setExpanded(parent, true); });

@@ -84,6 +84,28 @@ QString columnTitle(DiskColumn column, const Translator& texts)
     return {};
 }
 
+QString rowDetails(const DiskRow& row, const Translator& texts)
+{
+    QStringList parts{row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
+                                             : shown(row.filesystem)};
+    if (row.facts.length != 0)
+        parts += sizeText(row.facts.length);
+    if (!row.facts.mountPoint.empty())
+        parts += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
+    return parts.join(QStringLiteral(", "));
+}
+
+QString rowSummary(const DiskRow& row, const Translator& texts)
+{
+    QStringList parts{nameText(row.facts)};
+    if (row.lastCheck)
+        parts += verdictText(*row.lastCheck, texts);
+    parts += rowDetails(row, texts);
+    if (row.lastCheck)
+        parts += toQt(texts.sentence("last checked %@", {fromQt(timeText(*row.lastCheck))}));
+    return parts.join(QStringLiteral(", "));
+}
+
 QString rowToolTip(const DiskRow& row, const Translator& texts)
 {
     QStringList lines{nameText(row.facts), shown(row.facts.path.native()),

@@ -24,6 +24,10 @@ struct DiskRow {
 [[nodiscard]] QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts);
 [[nodiscard]] QString columnTitle(DiskColumn column, const Translator& texts);
 /// Everything there is to say, on several lines of plain text.
+/// What the disk is: its format or kind, size and mount point.
+[[nodiscard]] QString rowDetails(const DiskRow& row, const Translator& texts);
+/// Everything in one line, for those who hear it.
+[[nodiscard]] QString rowSummary(const DiskRow& row, const Translator& texts);
 [[nodiscard]] QString rowToolTip(const DiskRow& row, const Translator& texts);
 /// The library's verdict in the user's language.
 [[nodiscard]] QString verdictText(const LastCheck& check, const Translator& texts);

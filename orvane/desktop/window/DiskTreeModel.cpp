@@ -186,8 +186,11 @@ QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
     const DiskRow& row = nodeAt(index).row;
     const auto column = static_cast<DiskColumn>(index.column());
     switch (role) {
-        case Qt::DisplayRole:
-        case Qt::AccessibleTextRole: return cellText(row, column, texts_);
+        case Qt::DisplayRole: return cellText(row, column, texts_);
+        case Qt::AccessibleTextRole:
+            return column == DiskColumn::Name ? rowSummary(row, texts_)
+                                              : cellText(row, column, texts_);
+        case DetailsRole: return rowDetails(row, texts_);
         case Qt::ToolTipRole: return toQtToolTip(fromQt(rowToolTip(row, texts_)));
         case Qt::UserRole: return toQt(row.facts.identifier);
         case Qt::DecorationRole:

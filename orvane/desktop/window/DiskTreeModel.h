@@ -16,6 +16,8 @@ namespace orvane::desktop {
 class DiskTreeModel final : public QAbstractItemModel {
 public:
     using DiskPointer = std::shared_ptr<Disk>;
+    /// One line about what the disk is, of any column.
+    static constexpr int DetailsRole = Qt::UserRole + 1;
 
     /// All outlive this object.
     DiskTreeModel(const DiskController& disks, LastCheckLookup lastCheckOf,

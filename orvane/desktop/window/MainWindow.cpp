@@ -40,12 +40,13 @@ MainWindow::MainWindow(const Translator& texts)
     resize(firstSize);
 
     tabs_->setDocumentMode(true);
+    tabs_->setAccessibleName(toQt(texts.text("What can be done")));
     splitter_->addWidget(disks_);
     splitter_->addWidget(tabs_);
     splitter_->setChildrenCollapsible(false);
     splitter_->setStretchFactor(0, 2);
     splitter_->setStretchFactor(1, 3);
-    splitter_->setSizes({460, 660});
+    splitter_->setSizes({380, 740});
 
     auto* const content = new QWidget(this);
     auto* const layout = new QVBoxLayout(content);
@@ -67,17 +68,19 @@ void MainWindow::tellOfChange()
 
 bool MainWindow::hasAttention() const
 {
+    if (isMinimized())
+        return false;
+    // Who reads the help beside the window goes on working in the window.
     const QWidget* const active = QApplication::activeWindow();
-    return active == nullptr || active == this ||
-           (active->isModal() && active->parentWidget() != nullptr &&
-            active->parentWidget()->window() == this);
+    return active == nullptr || active == this || !active->isModal() ||
+           (active->parentWidget() != nullptr && active->parentWidget()->window() == this);
 }
 
 // Which window is the active one is settled only when every window has heard of the change.
 void MainWindow::changeEvent(QEvent* event)
 {
     QMainWindow::changeEvent(event);
-    if (event->type() == QEvent::ActivationChange)
+    if (event->type() == QEvent::ActivationChange || event->type() == QEvent::WindowStateChange)
         QTimer::singleShot(0, this, [this] {
             if (hasAttention() != hadAttention_)
                 tellOfChange();

@@ -35,13 +35,14 @@ public:
     void setEvents(Events events) { events_ = std::move(events); }
 
     DiskList& disks() { return *disks_; }
+    const DiskList& disks() const { return *disks_; }
     QTabWidget& tabs() { return *tabs_; }
     QSplitter& splitter() { return *splitter_; }
     ProgressArea& progress() { return *progress_; }
 
-    /// The user's attention is here: no other window of this program has it, but for a sheet of
-    /// this one. A window behind another program's keeps it, so that a button is ready when the
-    /// click that brings the window to the front falls on it.
+    /// The user's attention is here: the window is open, and no dialog that is not its own waits
+    /// for an answer. A window behind another program's keeps it, so that a button is ready when
+    /// the click that brings the window to the front falls on it; so does one beside its help.
     bool hasAttention() const;
 
 protected:

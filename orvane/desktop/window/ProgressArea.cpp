@@ -4,7 +4,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 
-#include <QVBoxLayout>
+#include <QHBoxLayout>
 
 #include <algorithm>
 #include <cmath>
@@ -34,11 +34,11 @@ ProgressArea::ProgressArea(const QString& accessibleName, QWidget* parent)
     label_->setMinimumWidth(1);
     label_->setSizePolicy(QSizePolicy::Ignored, QSizePolicy::Fixed);
 
-    auto* const layout = new QVBoxLayout(this);
-    layout->setContentsMargins(12, 4, 12, 8);
-    layout->setSpacing(4);
-    layout->addWidget(bar_);
-    layout->addWidget(label_);
+    auto* const layout = new QHBoxLayout(this);
+    layout->setContentsMargins(12, 6, 12, 6);
+    layout->setSpacing(12);
+    layout->addWidget(label_, 3);
+    layout->addWidget(bar_, 2);
     keepRoomWhenHidden(*bar_);
     keepRoomWhenHidden(*label_);
 }

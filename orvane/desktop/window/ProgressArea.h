@@ -9,7 +9,7 @@
 
 namespace orvane::desktop {
 
-/// The window's progress bar, and below it the status line. Both keep their room when they are
+/// The window's status line, and beside it the progress bar. Both keep their room when they are
 /// not in use, so that nothing in the window jumps.
 class ProgressArea final : public QWidget {
 public:

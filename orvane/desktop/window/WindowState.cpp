@@ -1,14 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/WindowState.h"
 
-#include <QHeaderView>
-
 namespace orvane::desktop {
 namespace {
 
 constexpr std::string_view geometryKey = "MainWindow.geometry";
 constexpr std::string_view splitterKey = "MainWindow.splitter";
-constexpr std::string_view columnsKey = "MainWindow.columns";
 
 QByteArray stored(const fixwell::UserDefaults& settings, std::string_view key)
 {
@@ -29,14 +26,12 @@ void restoreWindow(MainWindow& window, const fixwell::UserDefaults& settings)
 {
     window.restoreGeometry(stored(settings, geometryKey));
     window.splitter().restoreState(stored(settings, splitterKey));
-    window.disks().header()->restoreState(stored(settings, columnsKey));
 }
 
 void saveWindow(MainWindow& window, fixwell::UserDefaults& settings)
 {
     store(settings, geometryKey, window.saveGeometry());
     store(settings, splitterKey, window.splitter().saveState());
-    store(settings, columnsKey, window.disks().header()->saveState());
 }
 
 }  // namespace orvane::desktop

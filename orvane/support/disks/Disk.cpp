@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/Disk.h"
 
-#include "fixwell/host/foundation/Dictionary.h"
-
 #include <algorithm>
 #include <utility>
 
@@ -27,11 +25,6 @@ fixwell::DiskReferencePointer referenceTo(const DiskFacts& facts)
     return std::make_shared<const fixwell::DiskReference>(std::move(reference));
 }
 
-bool isSameRecord(const Value& a, const Value& b)
-{
-    return a.dictionary().isSameAs(b.dictionary());
-}
-
 }  // namespace
 
 std::shared_ptr<Disk> Disk::make(const DiskTree& tree, const Surroundings& surroundings)
@@ -51,11 +44,27 @@ Disk::Disk(DiskFacts facts, Surroundings surroundings) : surroundings_(std::move
 
 void Disk::setFacts(const DiskFacts& facts)
 {
+    // A disk that was formatted anew has another history. One that cannot be read for a moment has
+    // no other.
+    if (facts.uuid != facts_.uuid && !facts.uuid.empty() && surroundings_.histories != nullptr)
+        own_ = {};
     facts_ = facts;
     reference_ = referenceTo(facts_);
     filesystem_.reset();
     if (!facts_.filesystem.empty())
         filesystem_.emplace(facts_.filesystem, surroundings_.capabilities);
+}
+
+// Without a path, so that an operation on it is refused with a reason. The node may be another
+// disk's by now.
+void Disk::setGone()
+{
+    DiskFacts nothing = facts_;
+    nothing.path.clear();
+    nothing.mountPoint.clear();
+    facts_.mountPoint.clear();
+    reference_ = referenceTo(nothing);
+    hasGone_ = true;
 }
 
 void Disk::setParts(std::vector<std::shared_ptr<Disk>> parts)
@@ -77,16 +86,12 @@ const fixwell::OVFilesystem* Disk::filesystem() const
 
 Array Disk::fsckHistoryNoChildren() const
 {
-    if (!own_)
-        own_ = surroundings_.histories != nullptr ? surroundings_.histories->historyOf(facts_)
-                                                  : Array::make();
+    HistoryKeeper* const keeper = surroundings_.histories;
+    if (!own_ || (keeper != nullptr && ownRevision_ != keeper->revision())) {
+        own_ = keeper != nullptr ? keeper->historyOf(facts_) : Array::make();
+        ownRevision_ = keeper != nullptr ? keeper->revision() : 0;
+    }
     return own_;
-}
-
-bool Disk::Part::isCurrent(const Array& other) const
-{
-    return history.isSameAs(other) && size == other.size() && isSameRecord(first, other.front()) &&
-           isSameRecord(last, other.back());
 }
 
 std::vector<std::shared_ptr<Disk>> Disk::inside() const
@@ -104,35 +109,20 @@ void Disk::collectHistories(std::vector<Array>& histories) const
         disk->collectHistories(histories);
 }
 
-// The log asks for the history with every row it draws, so a merged list is kept as long as
-// nothing has been added to its parts.
 Array Disk::fsckHistory() const
 {
     std::vector<Array> histories;
     collectHistories(histories);
-    if (histories.size() == 1)
-        return histories.front();
-
-    const bool isCurrent =
-        merged_ &&
-        std::equal(mergedFrom_.begin(), mergedFrom_.end(), histories.begin(), histories.end(),
-                   [](const Part& part, const Array& history) { return part.isCurrent(history); });
-    if (isCurrent)
-        return merged_;
-    merged_ = Array::make();
-    mergedFrom_.clear();
-    for (const Array& history : histories) {
-        merged_.append(history);
-        mergedFrom_.push_back({history, history.size(), history.front(), history.back()});
-    }
-    return merged_;
+    return histories.size() == 1 ? histories.front() : merged_.of(histories);
 }
 
 void Disk::setFsckHistory(const Array& history)
 {
     own_ = history ? history : Array::make();
-    if (surroundings_.histories != nullptr)
-        surroundings_.histories->replaceHistoryOf(facts_, own_);
+    if (surroundings_.histories == nullptr)
+        return;
+    surroundings_.histories->replaceHistoryOf(facts_, own_);
+    ownRevision_ = surroundings_.histories->revision();
 }
 
 // What is shown for the disk is what goes: its own records and those of the disks inside it.

@@ -6,6 +6,7 @@
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/disks/DiskFilesystem.h"
 #include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/MergedHistory.h"
 
 #include <memory>
 #include <optional>
@@ -32,6 +33,9 @@ public:
     void setFacts(const DiskFacts& facts);
     const std::vector<std::shared_ptr<Disk>>& parts() const { return children_; }
     void setParts(std::vector<std::shared_ptr<Disk>> parts);
+    /// The medium is gone, though the object is still needed: nothing can begin on it any more.
+    void setGone();
+    bool hasGone() const { return hasGone_; }
     /// An image file shows the histories of what was found in it, also after it was detached.
     void setContents(std::shared_ptr<Disk> contents) { contents_ = std::move(contents); }
 
@@ -68,21 +72,11 @@ public:
     bool clearFsckHistory() override;
 
 private:
-    /// The histories that a merged one was put together from: enough to see that none of them has
-    /// changed since.
-    struct Part {
-        fixwell::Array history;
-        std::size_t size;
-        fixwell::Value first;
-        fixwell::Value last;
-
-        bool isCurrent(const fixwell::Array& other) const;
-    };
-
     std::vector<std::shared_ptr<Disk>> inside() const;
     void collectHistories(std::vector<fixwell::Array>& histories) const;
 
     DiskFacts facts_;
+    bool hasGone_ = false;
     Surroundings surroundings_;
     std::optional<DiskFilesystem> filesystem_;
     fixwell::DiskReferencePointer reference_;
@@ -91,8 +85,8 @@ private:
     std::shared_ptr<Disk> contents_;
 
     mutable fixwell::Array own_;
-    mutable fixwell::Array merged_;
-    mutable std::vector<Part> mergedFrom_;
+    mutable std::uint64_t ownRevision_ = 0;  ///< of the keeper, when it was asked
+    mutable MergedHistory merged_;
 };
 
 }  // namespace orvane

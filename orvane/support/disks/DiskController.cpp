@@ -20,6 +20,14 @@ bool isVolume(const Disk& disk)
     return type == diskType::volume || type == diskType::bareVolume || type == diskType::assembled;
 }
 
+// A name may be given to another device, as those of loop devices and sticks are.
+bool isSameDisk(const DiskFacts& now, const DiskFacts& before)
+{
+    const bool isOther =
+        now.sequence != before.sequence && now.sequence != 0 && before.sequence != 0;
+    return now.identifier == before.identifier && !isOther;
+}
+
 void collect(const std::shared_ptr<Disk>& disk, std::vector<std::shared_ptr<Disk>>& all)
 {
     all.push_back(disk);
@@ -115,16 +123,56 @@ void DiskController::appear(const std::shared_ptr<Disk>& disk)
         post(fixwell::OVDiskAppearedNotification, part);
 }
 
-// First forgotten, then told: whoever hears of it must not find the disk any more. The parts are
-// told before the whole.
-void DiskController::forget(const std::shared_ptr<Disk>& root)
+// Of a disk that is worked on, everything above and below it is.
+bool DiskController::isHeld(const std::shared_ptr<Disk>& disk) const
 {
-    std::erase(roots_, root);
-    forgetAsked();
-    auto gone = withParts(root);
+    const auto isOneOf = [](const std::shared_ptr<Disk>& wanted, const std::shared_ptr<Disk>& top) {
+        const auto all = withParts(top);
+        return std::find(all.begin(), all.end(), wanted) != all.end();
+    };
+    return std::any_of(held_.begin(), held_.end(), [&](const std::shared_ptr<Disk>& held) {
+        return isOneOf(held, disk) || isOneOf(disk, held);
+    });
+}
+
+// The parts are told before the whole, and each once.
+void DiskController::tellGone(const std::shared_ptr<Disk>& top)
+{
+    auto gone = withParts(top);
     std::reverse(gone.begin(), gone.end());
     for (const auto& disk : gone)
-        post(fixwell::OVDiskEjectedNotification, disk);
+        if (!disk->hasGone()) {
+            disk->setGone();
+            post(fixwell::OVDiskEjectedNotification, disk);
+        }
+}
+
+// First forgotten, then told: whoever hears of it must not find the disk any more.
+void DiskController::forget(const std::shared_ptr<Disk>& root)
+{
+    if (!isHeld(root))
+        std::erase(roots_, root);
+    forgetAsked();
+    tellGone(root);
+}
+
+bool DiskController::release()
+{
+    held_.clear();
+    forgetAsked();
+    const auto hasGone = [](const std::shared_ptr<Disk>& disk) {
+        return disk->hasGone();
+    };
+    bool hasForgotten = std::erase_if(roots_, hasGone) > 0;
+    for (const auto& root : roots_)
+        for (const auto& disk : withParts(root)) {
+            auto parts = disk->parts();
+            if (std::erase_if(parts, hasGone) == 0)
+                continue;
+            disk->setParts(std::move(parts));
+            hasForgotten = true;
+        }
+    return hasForgotten;
 }
 
 void DiskController::synchronize(const std::vector<DiskTree>& systemDisks)
@@ -132,10 +180,9 @@ void DiskController::synchronize(const std::vector<DiskTree>& systemDisks)
     forgetAsked();
     const auto previous = roots_;
     for (const auto& root : previous) {
-        const bool isThere =
-            std::any_of(systemDisks.begin(), systemDisks.end(), [&](const DiskTree& tree) {
-                return tree.facts.identifier == root->facts().identifier;
-            });
+        const bool isThere = std::any_of(
+            systemDisks.begin(), systemDisks.end(),
+            [&](const DiskTree& tree) { return isSameDisk(tree.facts, root->facts()); });
         if (!isOfImage(*root) && !isThere)
             forget(root);
     }
@@ -149,36 +196,56 @@ void DiskController::synchronize(const std::vector<DiskTree>& systemDisks)
     }
 }
 
+/// The parts of a disk that is read again, in the order in which they were read.
+struct DiskController::PartsReadAgain {
+    std::vector<std::shared_ptr<Disk>> now;
+    std::vector<std::shared_ptr<Disk>> made;  ///< those that were not known
+    std::vector<std::shared_ptr<Disk>> gone;
+};
+
+DiskController::PartsReadAgain DiskController::readAgain(const Disk& disk,
+                                                         const std::vector<DiskTree>& trees) const
+{
+    PartsReadAgain parts;
+    parts.gone = disk.parts();
+    for (const DiskTree& tree : trees) {
+        const auto known = std::find_if(
+            parts.gone.begin(), parts.gone.end(),
+            [&](const auto& part) { return part->facts().identifier == tree.facts.identifier; });
+        if (known != parts.gone.end()) {
+            parts.now.push_back(*known);
+            parts.gone.erase(known);
+        } else {
+            parts.made.push_back(Disk::make(tree, surroundings_));
+            parts.now.push_back(parts.made.back());
+        }
+    }
+    return parts;
+}
+
 void DiskController::update(const std::shared_ptr<Disk>& disk, const DiskTree& tree)
 {
+    if (disk->hasGone())
+        return;
     const bool wasMounted = disk->isMounted();
     const bool isOther = disk->facts() != tree.facts;
     disk->setFacts(tree.facts);
-
-    const auto before = disk->parts();
-    std::vector<std::shared_ptr<Disk>> now;
-    std::vector<std::shared_ptr<Disk>> made;
-    for (const DiskTree& child : tree.children) {
-        const auto known = std::find_if(before.begin(), before.end(), [&](const auto& part) {
-            return part->facts().identifier == child.facts.identifier;
-        });
-        if (known == before.end())
-            made.push_back(Disk::make(child, surroundings_));
-        now.push_back(known != before.end() ? *known : made.back());
-    }
-    disk->setParts(now);
+    const PartsReadAgain parts = readAgain(*disk, tree.children);
+    auto all = parts.now;
+    std::copy_if(parts.gone.begin(), parts.gone.end(), std::back_inserter(all),
+                 [this](const auto& part) { return isHeld(part); });
+    disk->setParts(std::move(all));
 
     if (isOther)
         post(wasMounted && !disk->isMounted() ? fixwell::OVDiskUnmountedNotification
                                               : fixwell::OVDiskChangedNotification,
              disk);
-    for (const auto& part : before)
-        if (std::find(now.begin(), now.end(), part) == now.end())
-            post(fixwell::OVDiskEjectedNotification, part);
-    for (std::size_t i = 0; i < now.size(); ++i)
-        if (std::find(made.begin(), made.end(), now[i]) == made.end())
-            update(now[i], tree.children[i]);
-    for (const auto& part : made)
+    for (const auto& part : parts.gone)
+        tellGone(part);
+    for (std::size_t i = 0; i < parts.now.size(); ++i)
+        if (std::find(parts.made.begin(), parts.made.end(), parts.now[i]) == parts.made.end())
+            update(parts.now[i], tree.children[i]);
+    for (const auto& part : parts.made)
         appear(part);
 }
 

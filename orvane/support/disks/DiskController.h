@@ -46,6 +46,12 @@ public:
     /// is different is changed or unmounted. Image files and their contents stay.
     void synchronize(const std::vector<DiskTree>& systemDisks);
 
+    /// A job works on these disks. Should one of them go, that is told, but it keeps its place
+    /// until `release`, and no other disk gets its name.
+    void hold(std::vector<std::shared_ptr<Disk>> disks) { held_ = std::move(disks); }
+    /// Forgets, without a further word, what has gone while it was held; NO when nothing has.
+    bool release();
+
     fixwell::OVDiskPointer diskWithIdentifier(std::string_view identifier) override;
     fixwell::OVDiskPointer diskWithKRDisk(const fixwell::DiskReferencePointer& disk) override;
     fixwell::OVDiskPointer findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk) override;
@@ -59,11 +65,16 @@ public:
                                     const fixwell::Notification& notification) override;
 
 private:
+    struct PartsReadAgain;
+
+    PartsReadAgain readAgain(const Disk& disk, const std::vector<DiskTree>& trees) const;
     std::shared_ptr<Disk> add(const DiskFacts& facts);
     void post(fixwell::Name name, const std::shared_ptr<Disk>& disk);
     std::shared_ptr<Disk> diskReferredTo(const fixwell::DiskReferencePointer& reference);
     void forgetAsked();
     void appear(const std::shared_ptr<Disk>& disk);
+    bool isHeld(const std::shared_ptr<Disk>& disk) const;
+    void tellGone(const std::shared_ptr<Disk>& disk);
     void forget(const std::shared_ptr<Disk>& root);
     void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
     void warn(const Outcome<>& outcome);
@@ -72,6 +83,7 @@ private:
     Disk::Surroundings surroundings_;
     Hooks hooks_;
     std::vector<std::shared_ptr<Disk>> roots_;
+    std::vector<std::shared_ptr<Disk>> held_;
 
     // The disk of the job at hand: the library asks for it with every line of output.
     std::shared_ptr<Disk> asked_;

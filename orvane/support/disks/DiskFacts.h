@@ -19,6 +19,9 @@ struct DiskFacts {
     std::int32_t type = diskType::whole;
     std::int64_t number = 0;
     bool isWhole = false;
+    /// Another one when the device was given another medium, or its name to another device; 0 when
+    /// it is not known.
+    std::uint64_t sequence = 0;
     /// Stands in the list of volumes that the user may work on.
     bool isShown = true;
 

@@ -3,6 +3,8 @@
 
 #include "fixwell/host/foundation/Array.h"
 
+#include <cstdint>
+
 namespace orvane {
 
 struct DiskFacts;
@@ -12,8 +14,10 @@ class HistoryKeeper {
 public:
     virtual ~HistoryKeeper() = default;
 
-    /// The list that the disk's records are appended to: always the same for one volume.
+    /// The list that the disk's records are appended to: the same for one volume until `revision`
+    /// grows.
     virtual fixwell::Array historyOf(const DiskFacts& disk) = 0;
+    virtual std::uint64_t revision() const = 0;
     virtual void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) = 0;
     /// Empties the list; NO when it was empty.
     virtual bool clearHistoryOf(const DiskFacts& disk) = 0;

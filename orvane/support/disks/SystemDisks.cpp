@@ -142,6 +142,8 @@ DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
     facts.displayName = device.filename();
     facts.length = sizeOf(device);
     facts.isWritable = attribute(device, "ro") != "1";
+    // Of whole disks only (Linux, Documentation/ABI/stable/sysfs-block, diskseq).
+    facts.sequence = numberIn(attribute(device, "diskseq"));
     return facts;
 }
 

@@ -4,9 +4,18 @@
 #include "fixwell/host/foundation/Dictionary.h"
 #include "orvane/support/history/HistoryKey.h"
 
+#include <algorithm>
+
 namespace orvane {
 
 using fixwell::Array;
+
+namespace {
+
+// A few milliseconds' worth; more than fits into a window.
+constexpr std::int64_t recordsAtOnce = 4000;
+
+}  // namespace
 
 std::string DiskHistories::keyOf(const DiskFacts& disk)
 {
@@ -20,8 +29,56 @@ DiskHistories::History& DiskHistories::find(const DiskFacts& disk)
     const auto known = histories_.find(key);
     if (known != histories_.end())
         return known->second;
-    const Array records = store_.load(key);
-    return histories_.emplace(key, History{records, records.size(), records.back()}).first->second;
+    return histories_.emplace(key, load(key)).first->second;
+}
+
+DiskHistories::History DiskHistories::load(const std::string& key)
+{
+    const HistoryStore::Range all = store_.recordsOf(key);
+    const bool isGradual = isIncomplete_ && all.size() > recordsAtOnce;
+    const std::int64_t first = isGradual ? all.end - recordsAtOnce : all.next;
+    const Array records = Array::make();
+    store_.load({first, all.end}, records);
+    History history{records, records.size(), records.back()};
+    if (isGradual) {
+        history.older = {Array::make(), {all.next, first}};
+        isIncomplete_();
+    }
+    return history;
+}
+
+DiskHistories::Progress DiskHistories::loadMore()
+{
+    const auto found = std::find_if(histories_.begin(), histories_.end(),
+                                    [](const auto& entry) { return entry.second.older; });
+    if (found == histories_.end())
+        return Progress::Nothing;
+    Older& older = *found->second.older;
+    const std::int64_t end = std::min(older.left.end, older.left.next + recordsAtOnce);
+    store_.load({older.left.next, end}, older.records);
+    older.left.next = end;
+    if (older.left.size() > 0)
+        return Progress::More;
+    complete(found->second);
+    ++revision_;
+    return Progress::Completed;
+}
+
+bool DiskHistories::loadAll()
+{
+    bool wasIncomplete = false;
+    while (loadMore() != Progress::Nothing)
+        wasIncomplete = true;
+    return wasIncomplete;
+}
+
+void DiskHistories::complete(History& history)
+{
+    const Array all = history.older->records;
+    history.savedCount += all.size();
+    all.append(history.records);
+    history.records = all;
+    history.older.reset();
 }
 
 Array DiskHistories::historyOf(const DiskFacts& disk)
@@ -41,6 +98,7 @@ bool DiskHistories::clearHistoryOf(const DiskFacts& disk)
     History& history = find(disk);
     const bool hadRecords = !history.records.isEmpty();
     history.records.removeAll();
+    history.older.reset();
     if (store_.clear(keyOf(disk))) {
         history.savedCount = 0;
         history.lastSaved = {};
@@ -52,8 +110,10 @@ void DiskHistories::saveNew()
 {
     if (generation_ != store_.generation()) {
         generation_ = store_.generation();
-        for (auto& [key, history] : histories_)
+        for (auto& [key, history] : histories_) {
             history.savedCount = 0;
+            history.older.reset();
+        }
     }
     for (auto& [key, history] : histories_)
         save(key, history);

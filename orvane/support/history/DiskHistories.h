@@ -4,7 +4,9 @@
 #include "orvane/support/disks/HistoryKeeper.h"
 #include "orvane/support/history/HistoryStore.h"
 
+#include <functional>
 #include <map>
+#include <optional>
 #include <string>
 
 namespace orvane {
@@ -12,14 +14,31 @@ namespace orvane {
 /// The histories in memory: each is read from the store when it is first asked for, and lives
 /// until the program ends, so that a disk that goes and comes again finds its records. Main thread
 /// only.
+///
+/// A long history may come in two steps, so that nobody waits for its oldest records: at first the
+/// newest ones alone, and the complete list when `loadMore` has read the others.
 class DiskHistories final : public HistoryKeeper {
 public:
     /// The store must outlive this object.
     explicit DiskHistories(HistoryStore& store) : store_(store) {}
 
+    /// From now on long histories come in two steps. `isIncomplete` is called when one has begun
+    /// to; somebody must then call `loadMore` until it answers NO.
+    void loadGradually(std::function<void()> isIncomplete)
+    {
+        isIncomplete_ = std::move(isIncomplete);
+    }
+    enum class Progress { Nothing, More, Completed };
+    /// Reads for a few milliseconds. `Completed`: one of the lists is another now, and there may
+    /// be more to do.
+    Progress loadMore();
+    /// Returns when every list is complete. NO when all were.
+    bool loadAll();
+
     fixwell::Array historyOf(const DiskFacts& disk) override;
     void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) override;
     bool clearHistoryOf(const DiskFacts& disk) override;
+    std::uint64_t revision() const override { return revision_; }
 
     /// Saves every record that is not in the store yet. A front end calls it right before it shows
     /// rows: what the user has seen is then kept, whatever happens to the program. Costs next to
@@ -30,19 +49,30 @@ public:
     std::string keyOf(const DiskFacts& disk);
 
 private:
+    /// The records before those that are in the list already.
+    struct Older {
+        fixwell::Array records;
+        HistoryStore::Range left;
+    };
+
     struct History {
         fixwell::Array records;
         std::size_t savedCount = 0;
         fixwell::Value lastSaved;
+        std::optional<Older> older = std::nullopt;
     };
 
     History& find(const DiskFacts& disk);
+    History load(const std::string& key);
+    static void complete(History& history);
     void save(const std::string& key, History& history);
     static bool hasOnlyGrown(const History& history);
 
     HistoryStore& store_;
     std::map<std::string, History> histories_;               ///< by key
     std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it
+    std::function<void()> isIncomplete_;
+    std::uint64_t revision_ = 1;
     std::uint64_t generation_ = 0;
 };
 

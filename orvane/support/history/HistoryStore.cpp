@@ -15,6 +15,7 @@ using fixwell::Value;
 
 // A volume's records have the numbers from `volume << recordBits` on.
 constexpr int recordBits = 36;
+constexpr std::int64_t noRecord = -1;
 
 std::int64_t firstOf(std::int64_t volume)
 {
@@ -62,15 +63,24 @@ HistoryStore::HistoryStore(std::filesystem::path file, Limits limits, WarningSin
     open();
 }
 
-HistoryStore::~HistoryStore() = default;
+HistoryStore::~HistoryStore()
+{
+    // What cannot be dropped now will be when the volume is saved to again.
+    const auto surplus = surplus_;
+    for (const auto& [volume, end] : surplus)
+        static_cast<void>(dropSurplus(volume, end));
+}
 
 void HistoryStore::open()
 {
     statements_.reset();
     forgetInterned();
+    surplus_.clear();
     HistoryDatabase opened = openHistory(file_, warn_);
     database_ = std::move(opened.database);
     isKept_ = opened.isKept;
+    if (isKept_)
+        checkpointer_.emplace(file_);
     statements_ = std::make_unique<Statements>(database_);
 }
 
@@ -93,6 +103,7 @@ bool HistoryStore::failedTo(std::string_view attempt, const Mishap& mishap)
     // What was interned in a transaction that failed is not in the database.
     forgetInterned();
     if (mishap.isDamage && isKept_) {
+        checkpointer_.reset();
         statements_.reset();
         database_ = Database();
         static_cast<void>(setHistoryAside(file_, warn_));
@@ -198,20 +209,28 @@ const RecordShape* HistoryStore::shapeNumbered(std::int64_t number)
     return &shapesRead_.emplace(number, shape.value_or(RecordShape())).first->second;
 }
 
-Array HistoryStore::load(std::string_view key)
+HistoryStore::Range HistoryStore::recordsOf(std::string_view key)
 {
-    const Array history = Array::make();
     const std::int64_t volume = knownVolume(key);
-    if (volume != 0 && !read(volume, history))
-        failedTo("read the history", lastMishap());
-    return history;
+    const std::int64_t first = volume != 0 ? oldestRecord(volume) : noRecord;
+    if (first != noRecord)
+        return {first, nextRecord(volume)};
+    if (const Mishap mishap = lastMishap(); mishap.isDamage)
+        failedTo("read the history", mishap);
+    return {};
 }
 
-bool HistoryStore::read(std::int64_t volume, const Array& history)
+void HistoryStore::load(Range records, const Array& history)
+{
+    if (records.size() > 0 && !read(records, history))
+        failedTo("read the history", lastMishap());
+}
+
+bool HistoryStore::read(Range records, const Array& history)
 {
     Statement& row = statements_->read;
-    row.bind(1, firstOf(volume));
-    row.bind(2, firstOf(volume + 1));
+    row.bind(1, records.next);
+    row.bind(2, records.end);
     Statement::Step step = Statement::Step::Done;
     while ((step = row.step()) == Statement::Step::Row) {
         const RecordShape* const shape = shapeNumbered(row.integer(0));
@@ -235,8 +254,10 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
         const std::int64_t volume = transaction.hasBegun() ? volumeNumber(key) : 0;
         const auto added = static_cast<std::int64_t>(history.size() - firstNew);
         if (volume != 0 && makeRoom(volume, added) && insertAll(volume, history, firstNew) &&
-            transaction.commit())
+            transaction.commit()) {
+            countAdded(added);
             return true;
+        }
         // Rolling back would forget it.
         mishap = lastMishap();
     }
@@ -254,30 +275,67 @@ std::int64_t HistoryStore::nextRecord(std::int64_t volume)
     return next;
 }
 
+void HistoryStore::countAdded(std::int64_t records)
+{
+    constexpr std::int64_t recordsOfACheckpoint = 50'000;  // a few megabytes
+    addedSinceCheckpoint_ += records;
+    if (addedSinceCheckpoint_ < recordsOfACheckpoint || !checkpointer_)
+        return;
+    addedSinceCheckpoint_ = 0;
+    checkpointer_->request();
+}
+
 // Drops a quarter more than it must, so that a volume at its limit is not trimmed at every save.
 bool HistoryStore::makeRoom(std::int64_t volume, std::int64_t added)
+{
+    const std::int64_t first = oldestRecord(volume);
+    const std::int64_t next = nextRecord(volume);
+    const std::int64_t surplus = next - first + added - limits_.recordsOfVolume;
+    if (first != noRecord && surplus > 0 && !surplus_.contains(volume))
+        surplus_[volume] =
+            endOfRunAt(std::min(next, first + surplus + limits_.recordsOfVolume / 4), next);
+    // A million records at once would keep the user waiting.
+    constexpr std::int64_t fewestRemoved = 1000;
+    return dropSurplus(volume, added + added / 4 + fewestRemoved);
+}
+
+std::int64_t HistoryStore::oldestRecord(std::int64_t volume)
 {
     Statement& oldest = statements_->oldest;
     oldest.bind(1, firstOf(volume));
     oldest.bind(2, firstOf(volume + 1));
-    if (oldest.step() != Statement::Step::Row)
-        return true;
-    const std::int64_t first = oldest.integer(0);
+    const std::int64_t record =
+        oldest.step() == Statement::Step::Row ? oldest.integer(0) : noRecord;
     oldest.reset();
-    const std::int64_t next = nextRecord(volume);
-    const std::int64_t surplus = next - first + added - limits_.recordsOfVolume;
-    if (surplus <= 0)
-        return true;
+    return record;
+}
 
-    const std::int64_t from = std::min(next, first + surplus + limits_.recordsOfVolume / 4);
+// Where the run that holds the record before `record` ends; `record` when that run goes on to
+// the newest record.
+std::int64_t HistoryStore::endOfRunAt(std::int64_t record, std::int64_t next)
+{
     Statement& endOfRun = statements_->endOfRun;
-    endOfRun.bind(1, from - 1);
+    endOfRun.bind(1, record - 1);
     endOfRun.bind(2, next);
     const bool hasEnd = endOfRun.step() == Statement::Step::Row;
-    const std::int64_t kept = hasEnd ? endOfRun.integer(0) + 1 : from;
+    const std::int64_t end = hasEnd ? endOfRun.integer(0) + 1 : record;
     endOfRun.reset();
+    return end;
+}
+
+bool HistoryStore::dropSurplus(std::int64_t volume, std::int64_t most)
+{
+    const auto surplus = surplus_.find(volume);
+    if (surplus == surplus_.end())
+        return true;
+    const std::int64_t first = oldestRecord(volume);
+    const std::int64_t end = std::min(surplus->second, first + most);
+    if (end >= surplus->second)
+        surplus_.erase(surplus);
+    if (first == noRecord)
+        return true;
     statements_->remove.bind(1, first);
-    statements_->remove.bind(2, kept);
+    statements_->remove.bind(2, end);
     return statements_->remove.run();
 }
 
@@ -331,6 +389,7 @@ bool HistoryStore::insert(std::int64_t id, const Dictionary& record, std::int64_
 bool HistoryStore::clear(std::string_view key)
 {
     const std::int64_t volume = knownVolume(key);
+    surplus_.erase(volume);
     statements_->remove.bind(1, firstOf(volume));
     statements_->remove.bind(2, firstOf(volume + 1));
     const bool isCleared =

@@ -3,6 +3,7 @@
 
 #include "fixwell/host/foundation/Array.h"
 #include "orvane/support/Failure.h"
+#include "orvane/support/history/Checkpointer.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/HistorySchema.h"
 #include "orvane/support/history/RecordEncoding.h"
@@ -13,6 +14,7 @@
 #include <filesystem>
 #include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -24,7 +26,8 @@ namespace orvane {
 ///
 /// What `save` has answered YES to is there after the program was killed. A volume keeps a limited
 /// number of records: older runs are dropped whole, and of a run that alone exceeds the limit, the
-/// oldest records.
+/// oldest records. They are dropped little by little while others are appended, and the rest at
+/// the end.
 class HistoryStore {
 public:
     struct Limits {
@@ -37,8 +40,19 @@ public:
     HistoryStore& operator=(const HistoryStore&) = delete;
     ~HistoryStore();
 
-    /// A new list of the volume's records, oldest first; empty when there are none.
-    [[nodiscard]] fixwell::Array load(std::string_view key);
+    /// The numbers of some records of a volume. They follow each other closely, and newer records
+    /// have higher ones.
+    struct Range {
+        std::int64_t next = 0;
+        std::int64_t end = 0;  ///< behind the newest
+
+        std::int64_t size() const { return end - next; }
+    };
+
+    /// All that the volume has.
+    [[nodiscard]] Range recordsOf(std::string_view key);
+    /// Appends those of the records that are still there, oldest first.
+    void load(Range records, const fixwell::Array& history);
     /// Appends the records from `firstNew` on to the volume's. All of them or, when it answers
     /// NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const fixwell::Array& history,
@@ -74,9 +88,12 @@ private:
     bool failedTo(std::string_view attempt, const Mishap& mishap);
     std::int64_t knownVolume(std::string_view key);
     std::int64_t volumeNumber(std::string_view key);
-    bool read(std::int64_t volume, const fixwell::Array& history);
+    bool read(Range records, const fixwell::Array& history);
     std::int64_t nextRecord(std::int64_t volume);
+    std::int64_t oldestRecord(std::int64_t volume);
+    std::int64_t endOfRunAt(std::int64_t record, std::int64_t next);
     bool makeRoom(std::int64_t volume, std::int64_t added);
+    bool dropSurplus(std::int64_t volume, std::int64_t most);
     std::int64_t found(Statement& find, std::string_view text);
     std::int64_t interned(Statement& find, Statement& add, std::string_view text);
     const KnownShape* shapeOf(const fixwell::Dictionary& record);
@@ -86,16 +103,22 @@ private:
     bool insert(std::int64_t id, const fixwell::Dictionary& record, std::int64_t time);
     bool insertAll(std::int64_t volume, const fixwell::Array& history, std::size_t firstNew);
     void forgetInterned();
+    void countAdded(std::int64_t records);
 
     const std::filesystem::path file_;
     const Limits limits_;
     const WarningSink warn_;
 
     Database database_;
-    std::unique_ptr<Statements> statements_;  ///< gone before the database is
+    std::unique_ptr<Statements> statements_;    ///< gone before the database is
+    std::optional<Checkpointer> checkpointer_;  ///< where the histories are kept
+    std::int64_t addedSinceCheckpoint_ = 0;
     bool isKept_ = false;
     bool hasWarned_ = false;
     std::uint64_t generation_ = 0;
+
+    /// Volumes with more records than they may have: up to where theirs are to be dropped.
+    std::map<std::int64_t, std::int64_t> surplus_;
 
     // What the interning tables are known to hold.
     std::deque<KnownShape> shapes_;

@@ -1,11 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/desktop/toolkit/QtHelp.h"
+#include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/texts/Language.h"
+#include "orvane/support/texts/ModuleBundle.h"
 #include "tests/desktop/toolkit/ToolkitFixture.h"
 
 #include <QFile>
-#include <QScrollBar>
+#include <QScrollArea>
 #include <QSplitter>
-#include <QTemporaryDir>
+#include <QTest>
+#include <QXmlStreamReader>
+
+#include <clocale>
 
 namespace orvane::desktop {
 namespace {
@@ -22,7 +27,7 @@ TEST_F(Interface, EveryOutletIsFilledAndEveryControlCanBeHeard)
         EXPECT_FALSE(button->action().empty()) << name;
         EXPECT_FALSE(button->widget().text().isEmpty()) << name;
     }
-    EXPECT_EQ(interface->button("clearHistoryButton")->title(), "Verlauf löschen");
+    EXPECT_EQ(interface->button("clearHistoryButton")->title(), "Verlauf &löschen");
     auto* const instructions =
         interface->widget().findChild<QLabel*>(QStringLiteral("instructionalTextField"));
     EXPECT_TRUE(instructions->text().contains(QStringLiteral("click Verify Disk")));
@@ -52,6 +57,60 @@ TEST_F(Interface, DividerStandsBetweenTheLimitsOfTheModule)
     }
 }
 
+TEST_F(Interface, InstructionsHaveJustTheRoomTheyNeedUntilTheUserMovesTheDivider)
+{
+    auto& splitter = *interface->widget().findChild<QSplitter*>();
+    auto& scroll = *interface->widget().findChild<QScrollArea*>();
+    for (const int width : {640, 420, 900}) {
+        interface->widget().resize(width, 560);
+        settle();
+        const int wanted = scroll.widget()->heightForWidth(scroll.viewport()->width());
+        EXPECT_EQ(splitter.widget(0)->height(), qBound(80, wanted, 210)) << width;
+    }
+    splitter.setSizes({160, splitter.height() - 160});
+    emit splitter.splitterMoved(160, 1);
+    const int moved = splitter.widget(0)->height();
+    interface->widget().resize(640, 560);
+    settle();
+    EXPECT_EQ(splitter.widget(0)->height(), moved);
+}
+
+TEST_F(Interface, AnEmptyLogSaysWhatToDo)
+{
+    const auto* const note = table().viewport()->findChild<QLabel*>();
+    ASSERT_NE(note, nullptr);
+    EXPECT_TRUE(note->isVisible());
+    EXPECT_EQ(note->geometry(), table().viewport()->rect());
+    addRow("one");
+    reload();
+    EXPECT_FALSE(note->isVisible());
+    disk->history = fixwell::Array::make();
+    selectDisk();
+    reload();
+    EXPECT_TRUE(note->isVisible());
+}
+
+TEST_F(Interface, EveryTextOfTheFileHasAGermanOne)
+{
+    QFile file(QStringLiteral(FXW_UI));
+    ASSERT_TRUE(file.open(QIODevice::ReadOnly));
+    std::setlocale(LC_ALL, "C.UTF-8");
+    std::setlocale(LC_NUMERIC, "C");
+    setLanguage("de");
+    const ModuleBundle bundle(MODULE_BUNDLE, "FXW");
+    int texts = 0;
+    for (QXmlStreamReader reader(&file); !reader.atEnd(); reader.readNext()) {
+        if (!reader.isStartElement() || reader.name() != QLatin1String("string") ||
+            reader.attributes().hasAttribute(QStringLiteral("notr")))
+            continue;
+        const std::string text = fromQt(reader.readElementText());
+        EXPECT_TRUE(bundle.catalogue().find("FXW", text)) << text;
+        ++texts;
+    }
+    EXPECT_GE(texts, 15);
+    setLanguage("");
+}
+
 TEST_F(Interface, NothingIsSentToAModuleThatHasGone)
 {
     addRow("one");
@@ -63,39 +122,6 @@ TEST_F(Interface, NothingIsSentToAModuleThatHasGone)
     EXPECT_EQ(table().model()->rowCount(), 0);
     interface->button("showDetailsButton")->press();
     interface->widget().grab();
-}
-
-TEST_F(Interface, HelpOpensAtItsAnchorOrSaysThatThereIsNoBook)
-{
-    const QTemporaryDir directory;
-    const QString book = directory.filePath(QStringLiteral("index.html"));
-    QFile file(book);
-    ASSERT_TRUE(file.open(QIODevice::WriteOnly));
-    file.write("<h1>Book</h1><p>" + QByteArray("line<br/>").repeated(200) +
-               "</p><h2><a name=\"ovhelp11868\">Checking</a></h2>" +
-               QByteArray("line<br/>").repeated(200));
-    file.close();
-    const auto window = [] {
-        for (QWidget* candidate : QApplication::topLevelWidgets())
-            if (auto* const browser = qobject_cast<QTextBrowser*>(candidate))
-                return browser;
-        return static_cast<QTextBrowser*>(nullptr);
-    };
-    {
-        QtHelp help(book.toStdString(), host.bundle);
-        help.openHelpAnchor("ovhelp11868");
-        settle();
-        ASSERT_NE(window(), nullptr);
-        EXPECT_GT(window()->verticalScrollBar()->value(), 0);
-        help.openHelpAnchor("");
-        settle();
-        EXPECT_EQ(window()->verticalScrollBar()->value(), 0);
-    }
-    EXPECT_EQ(window(), nullptr);
-    QtHelp missing("/nonexistent/book.html", host.bundle);
-    missing.openHelpAnchor("ovhelp11868");
-    EXPECT_EQ(window()->toPlainText(),
-              QStringLiteral("The help book /nonexistent/book.html cannot be read."));
 }
 
 TEST_F(Interface, LooksAsItShouldInLightAndDark)

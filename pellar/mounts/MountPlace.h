@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/volumes/SystemPaths.h"
+
+#include <sys/types.h>
+
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace pellar {
+
+/// Where and how a file system is mounted: all that is needed to mount it so again.
+struct MountPlace {
+    std::string source;
+    std::string target;
+    std::string root;  ///< what of the file system is mounted; "/" unless it is a bind mount
+    std::string filesystem;
+    std::string options;  ///< as mount(8) takes them
+
+    bool isBind() const { return root != "/" && filesystem != "btrfs"; }
+
+    friend bool operator==(const MountPlace&, const MountPlace&) = default;
+};
+
+/// Where a block device's file system is mounted, in the order in which it was. Also of a file
+/// system on several devices, which has a device number of its own and is found by its source.
+/// Empty as well when the table cannot be read.
+[[nodiscard]] std::vector<MountPlace> mountPlacesOf(dev_t device, const SystemPaths& paths);
+
+/// Where something else is mounted below the directory.
+[[nodiscard]] std::vector<std::string> mountsBelow(std::string_view directory,
+                                                   const SystemPaths& paths);
+
+/// The options without those that the kernel tells but does not take (a security module's own).
+[[nodiscard]] std::string mountableOptions(std::string_view options);
+
+}  // namespace pellar

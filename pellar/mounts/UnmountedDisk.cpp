@@ -1,0 +1,157 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/mounts/UnmountedDisk.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "pellar/mounts/Holders.h"
+
+#include <libmount/libmount.h>
+
+#include <algorithm>
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+#include <thread>
+#include <utility>
+
+namespace pellar {
+namespace {
+
+struct FreeContext {
+    void operator()(libmnt_context* context) const { mnt_free_context(context); }
+};
+using Context = std::unique_ptr<libmnt_context, FreeContext>;
+
+// No other program is run, and no table but the kernel's is asked.
+Context makeContext(const MountPlace& place)
+{
+    Context context(mnt_new_context());
+    if (context) {
+        mnt_context_disable_helpers(context.get(), 1);
+        mnt_context_set_optsmode(context.get(), MNT_OMODE_NOTAB);
+        mnt_context_set_target(context.get(), place.target.c_str());
+    }
+    return context;
+}
+
+// 0, or an errno value. The library answers its own failures negative, and a system call's with a
+// status of its own (libmount's documentation, "Mount context").
+int errorOf(Context& context, int answer)
+{
+    if (answer == 0)
+        return 0;
+    const int error = mnt_context_get_syscall_errno(context.get());
+    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
+}
+
+int unmount(const MountPlace& place)
+{
+    // A file manager or an indexer that has just looked is gone in a moment.
+    constexpr int attempts = 4;
+    int error = 0;
+    for (int attempt = 0; attempt < attempts; ++attempt) {
+        if (attempt > 0)
+            std::this_thread::sleep_for(std::chrono::milliseconds(150));
+        Context context = makeContext(place);
+        error = context ? errorOf(context, mnt_context_umount(context.get())) : ENOMEM;
+        if (error != EBUSY)
+            break;
+    }
+    return error;
+}
+
+int mount(const MountPlace& place, const std::string& source)
+{
+    // Whoever had made the directory may have taken it away with the mount.
+    std::error_code ignored;
+    std::filesystem::create_directories(place.target, ignored);
+    Context context = makeContext(place);
+    if (!context)
+        return ENOMEM;
+    mnt_context_set_source(context.get(), source.c_str());
+    std::string options = place.options;
+    if (place.isBind())
+        options += ",bind";
+    else
+        mnt_context_set_fstype(context.get(), place.filesystem.c_str());
+    mnt_context_set_options(context.get(), options.c_str());
+    return errorOf(context, mnt_context_mount(context.get()));
+}
+
+std::string joined(std::vector<std::string> names)
+{
+    constexpr std::size_t most = 4;
+    const bool areMore = names.size() > most;
+    names.resize(std::min(names.size(), most));
+    std::string text;
+    for (const std::string& name : names)
+        text += (text.empty() ? "" : ", ") + fixwell::printable(name);
+    return areMore ? text + ", …" : text;
+}
+
+Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
+{
+    const std::string target = fixwell::printable(place.target);
+    if (error == EPERM || error == EACCES)
+        return {"it is mounted at “%1$@”, and only an administrator may unmount it", target, {}};
+    if (error != EBUSY)
+        return {"it cannot be unmounted from “%1$@”: %2$@", target, ::strerrordesc_np(error)};
+    if (const auto below = mountsBelow(place.target, paths); !below.empty())
+        return {"it is mounted at “%1$@”, and something else below, at %2$@", target,
+                joined(below)};
+    if (const auto holders = holdersOf(place.target); !holders.empty())
+        return {"it is mounted at “%1$@” and in use by %2$@", target, joined(holders)};
+    return {"it is mounted at “%1$@” and in use", target, {}};
+}
+
+/// Where all of the file system is mounted; empty when only parts are.
+std::string wholeTargetOf(const std::vector<MountPlace>& places)
+{
+    const auto whole = std::find_if(places.begin(), places.end(),
+                                    [](const MountPlace& place) { return !place.isBind(); });
+    return whole != places.end() ? whole->target : std::string();
+}
+
+/// Why it could not be mounted again as it is; nothing when it could.
+Sentence objectionTo(const std::vector<MountPlace>& places)
+{
+    const bool isWhole = !wholeTargetOf(places).empty();
+    for (const MountPlace& place : places)
+        if (place.filesystem.starts_with("fuse") || !isWhole)
+            return {"it is mounted at “%1$@” in a way that could not be put back (%2$@)",
+                    fixwell::printable(place.target), fixwell::printable(place.filesystem)};
+    return {};
+}
+
+}  // namespace
+
+std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<MountPlace> places,
+                                                          const SystemPaths& paths)
+{
+    if (const Sentence objection = objectionTo(places); !objection.isEmpty())
+        return objection;
+    UnmountedDisk disk(wholeTargetOf(places));
+    while (!places.empty()) {
+        // The last one first: it may lie over or below the others.
+        if (const int error = unmount(places.back()))
+            return refusal(places.back(), error, paths);
+        disk.places_.insert(disk.places_.begin(), std::move(places.back()));
+        places.pop_back();
+    }
+    return disk;
+}
+
+std::vector<Sentence> UnmountedDisk::mountAgain()
+{
+    std::vector<Sentence> failures;
+    for (const MountPlace& place : std::exchange(places_, {})) {
+        const std::string source = place.isBind() ? wholeTarget_ + place.root : place.source;
+        if (const int error = mount(place, source))
+            failures.push_back({"It could not be mounted again at “%1$@”: %2$@.",
+                                fixwell::printable(place.target), ::strerrordesc_np(error)});
+    }
+    return failures;
+}
+
+}  // namespace pellar

@@ -1,0 +1,133 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/session/DesktopNotifier.h"
+#include "orvane/desktop/session/JobNotice.h"
+#include "tests/desktop/session/FakeServices.h"
+#include "tests/desktop/session/PrivateBus.h"
+
+#include <gtest/gtest.h>
+
+#include <QTest>
+
+namespace orvane::desktop::test {
+namespace {
+
+using namespace std::chrono_literals;
+
+FinishedRun finished(const std::string& disk, const std::string& verdict,
+                     const std::string& message = "", Operation operation = Operation::VerifyDisk)
+{
+    return {{operation, disk}, {verdict, 0, message}};
+}
+
+TEST(JobNotice, OnlyALongJobThatNobodyWatchedIsNews)
+{
+    EXPECT_TRUE(isWorthANotice(11s, false));
+    EXPECT_FALSE(isWorthANotice(11s, true)) << "the user has seen it";
+    EXPECT_FALSE(isWorthANotice(9s, false)) << "the user has hardly looked away";
+}
+
+TEST(JobNotice, SaysWhatWasDoneOnWhatAndHowItWent)
+{
+    struct Case {
+        std::vector<FinishedRun> runs;
+        std::string title;
+        std::string body;
+        std::string_view because;
+    };
+    const auto sound = [](const char* disk) {
+        return finished(disk, "sound", std::string(disk) + " is OK");
+    };
+    for (const Case& c :
+         {Case{{finished("data", "sound", "The volume “data” appears to be OK.")},
+               "Verification of “data”",
+               "The volume “data” appears to be OK.",
+               "one disk"},
+          Case{{finished("data", "repaired", "", Operation::RepairDisk)},
+               "Repair of “data”",
+               "data: repaired",
+               "a tool that says nothing more"},
+          Case{{sound("a"), finished("b", "damaged", "b needs repair"), sound("c")},
+               "Verification of 3 disks",
+               "b needs repair\na is OK\nc is OK",
+               "bad news first"},
+          Case{{sound("a"), sound("b"), sound("c"), sound("d"), sound("e")},
+               "Verification of 5 disks",
+               "a is OK\nb is OK\nc is OK\nand 2 more",
+               "more than a bubble holds"},
+          Case{{finished("<b>&\n\x1b[1m\xff", "failed", "no <img src='x'> in it\n\a")},
+               "Verification of “<b>&\uFFFD\uFFFD[1m\uFFFD”",
+               "no &lt;img src='x'&gt; in it\uFFFD\uFFFD",
+               "a hostile label is no markup, and the title is none anyway"}}) {
+        const Notice notice = noticeOf(c.runs, Translator());
+        EXPECT_EQ(notice.title, c.title) << c.because;
+        EXPECT_EQ(notice.body, c.body) << c.because;
+    }
+}
+
+class DesktopNotifierTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (!bus_.isRunning())
+            GTEST_SKIP() << "there is no dbus-daemon";
+    }
+
+    static bool waitUntil(const std::function<bool()>& isDone)
+    {
+        return QTest::qWaitFor(isDone, 20'000);
+    }
+
+    PrivateBus bus_;
+    int clicks_ = 0;
+};
+
+TEST_F(DesktopNotifierTest, ANoticeArrivesAndItsClickComesBack)
+{
+    FakeNotifications server(bus_.connection("server"));
+    DesktopNotifier notifier({bus_.lookup("program"), "org.orvane.Orvane", "Show", [this] {
+                                  ++clicks_;
+                              }});
+    notifier.show({"Title", "Body"});
+    ASSERT_TRUE(waitUntil([&] { return server.shown.size() == 1; }));
+    const auto& shown = server.shown.front();
+    EXPECT_EQ(shown.program, QStringLiteral("Orvane"));
+    EXPECT_EQ(shown.title, QStringLiteral("Title"));
+    EXPECT_EQ(shown.body, QStringLiteral("Body"));
+    EXPECT_EQ(shown.actions.value(0), QStringLiteral("default"));
+    EXPECT_EQ(shown.hints.value(QStringLiteral("desktop-entry")).toString(),
+              QStringLiteral("org.orvane.Orvane"));
+
+    // The next one tells that the number of the first has arrived.
+    ASSERT_TRUE(waitUntil([&] {
+        notifier.show({"Another", ""});
+        return server.shown.back().replaced == 7;
+    })) << "the old notice is out of date";
+    emit server.ActionInvoked(8, QStringLiteral("default"));  // another program's
+    emit server.ActionInvoked(7, QStringLiteral("settings"));
+    emit server.ActionInvoked(7, QStringLiteral("default"));
+    EXPECT_TRUE(waitUntil([&] { return clicks_ > 0; }));
+    EXPECT_EQ(clicks_, 1) << "the others came before";
+}
+
+TEST_F(DesktopNotifierTest, WithoutAServerOrABusNothingHappens)
+{
+    DesktopNotifier alone({bus_.lookup("program"), "e", "Show", [this] {
+                               ++clicks_;
+                           }});
+    alone.show({"Title", "Body"});
+    QTest::qWait(100);
+    DesktopNotifier nowhere({SessionBuses().session, "e", "Show", [this] {
+                                 ++clicks_;
+                             }});
+    nowhere.show({"Title", "Body"});
+    QTest::qWait(10);
+    EXPECT_EQ(clicks_, 0);
+
+    FakeNotifications late(bus_.connection("server"));
+    alone.show({"Title", "Body"});
+    EXPECT_TRUE(waitUntil([&] { return late.shown.size() == 1; })) << "a server may come later";
+    EXPECT_EQ(late.shown.front().replaced, 0U);
+}
+
+}  // namespace
+}  // namespace orvane::desktop::test

@@ -1,0 +1,173 @@
+// SPDX-License-Identifier: Apache-2.0
+// Jobs on volumes that are mounted, on real loop devices. Needs root.
+
+#include "pellar/mounts/Holders.h"
+#include "pellar/mounts/MountPlace.h"
+#include "tests/pellar/Workshop.h"
+#include "tests/support/LoopDevice.h"
+
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <fstream>
+
+namespace {
+
+using namespace pellar;
+
+namespace fs = std::filesystem;
+
+/// A mounted volume, and a second place with a part of it.
+class MountedDisk : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (::geteuid() != 0)
+            GTEST_SKIP() << "mounting needs root";
+        device_ = std::make_unique<orvane::test::LoopDevice>(workshop_.makeExt("disk", 16U << 20U));
+        if (device_->name().empty())
+            GTEST_SKIP() << "the system gives no loop device";
+        for (const char* name : {"place", "other"})
+            fs::create_directory(workshop_.path(name));
+        if (::mount(device_->name().c_str(), place().c_str(), "ext4",
+                    MS_NOSUID | MS_NOATIME | MS_NODEV, "errors=continue,commit=7") != 0)
+            GTEST_SKIP() << "the system lets nobody mount here";
+        fs::create_directory(place() / "part");
+        ASSERT_EQ(::mount((place() / "part").c_str(), workshop_.path("other").c_str(), nullptr,
+                          MS_BIND, nullptr),
+                  0);
+        before_ = mounts();
+        ASSERT_EQ(before_.size(), 2U);
+    }
+
+    void TearDown() override
+    {
+        while (device_ && !mounts().empty())
+            if (::umount2(mounts().back().target.c_str(), MNT_DETACH) != 0)
+                break;
+    }
+
+    fs::path place() const { return workshop_.path("place"); }
+    std::vector<MountPlace> mounts() const
+    {
+        struct stat status = {};
+        ::stat(device_->name().c_str(), &status);
+        return mountPlacesOf(status.st_rdev, {});
+    }
+    fixwell::DiskReferencePointer disk() const { return test::reference(device_->name()); }
+
+    test::Workshop workshop_;
+    std::unique_ptr<orvane::test::LoopDevice> device_;
+    std::vector<MountPlace> before_;
+};
+
+TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
+{
+    struct Case {
+        const char* script;  ///< of the tool; empty for the real one
+        bool repairs;
+        std::string verdict;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{"", false, "sound", "an ordinary check"},
+             Case{"", true, "sound", "a repair with nothing to do"},
+             Case{"kill 9", false, "failed", "the tool was killed"},
+             Case{"exit 16", true, "failed", "the tool did not start properly"},
+         }) {
+        ManagerOptions options;
+        if (*c.script != '\0')
+            options.toolPath = workshop_.fakeTools(c.script);
+        test::Bench bench(options);
+        EXPECT_EQ(c.repairs ? bench.repair(disk()) : bench.verify(disk()), 0) << c.because;
+        EXPECT_EQ(bench.listener.verdict, c.verdict) << c.because;
+        EXPECT_EQ(mounts(), before_) << c.because;
+        EXPECT_TRUE(fs::is_directory(workshop_.path("place") / "part"));
+    }
+}
+
+TEST_F(MountedDisk, IsMountedAgainAfterAStop)
+{
+    ManagerOptions options;
+    options.toolPath = workshop_.fakeTools("say Pass 1: Checking inodes\nwait");
+    test::Bench bench(options);
+    ASSERT_EQ(bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+    ASSERT_TRUE(bench.loop.runUntil([&] { return mounts().empty(); })) << "taken for the job";
+    bench.tool->cancelCurrentOperation();
+    ASSERT_TRUE(bench.loop.runUntil([&] { return bench.listener.finished == 1; }));
+    EXPECT_EQ(bench.listener.verdict, "stopped");
+    EXPECT_EQ(mounts(), before_);
+}
+
+TEST_F(MountedDisk, WhoHoldsItIsNamedAndNothingIsChanged)
+{
+    const auto refusal = [this] {
+        test::Bench bench;
+        EXPECT_EQ(bench.verify(disk()), 0);
+        EXPECT_EQ(bench.listener.error, fixwell::kPLErrorCouldNotUnmount);
+        EXPECT_EQ(mounts(), before_);
+        return bench.listener.message;
+    };
+    {
+        const std::ofstream open(place() / "file");
+        EXPECT_NE(refusal().find("in use by pellar-tests (" + std::to_string(::getpid()) + ")"),
+                  std::string::npos)
+            << refusal();
+    }
+    fs::create_directory(place() / "below");
+    ASSERT_EQ(::mount("tmpfs", (place() / "below").c_str(), "tmpfs", 0, nullptr), 0);
+    EXPECT_NE(refusal().find("something else below, at " + (place() / "below").native()),
+              std::string::npos);
+    ASSERT_EQ(::umount((place() / "below").c_str()), 0);
+}
+
+TEST(Holders, AreFoundByEveryWayOfHolding)
+{
+    const test::Workshop workshop;
+    const auto mount = workshop.path("mount");
+    const auto process = workshop.path("proc/77");
+    struct Case {
+        const char* link;
+        std::string target;
+        bool holds;
+    };
+    for (const Case& c : {
+             Case{"cwd", mount / "deep/directory", true},
+             Case{"root", mount, true},
+             Case{"exe", mount / "bin/tool (deleted)", true},
+             Case{"fd/3", mount / "file", true},
+             Case{"fd/3", mount.native() + "ain/file", false},
+             Case{"cwd", "/", false},
+         }) {
+        fs::remove_all(workshop.path("proc"));
+        fs::create_directories(process / "fd");
+        fs::create_directory(workshop.path("proc/self"));
+        fs::create_symlink(c.target, process / c.link);
+        std::ofstream(process / "comm") << "vim\n";
+        const auto holders = holdersOf(mount.native(), workshop.path("proc"), "/none");
+        EXPECT_EQ(holders,
+                  c.holds ? std::vector<std::string>{"vim (77)"} : std::vector<std::string>())
+            << c.link << " " << c.target;
+    }
+    fs::remove(process / "cwd");
+    std::ofstream(process / "maps")
+        << "7f3a-7f3b r--p 00000000 08:01 131 " << mount.native() << "/lib.so\n";
+    EXPECT_EQ(holdersOf(mount.native(), workshop.path("proc"), "/none").size(), 1U) << "mapped";
+    fs::create_directories(workshop.path("block/loop3/loop"));
+    std::ofstream(workshop.path("block/loop3/loop/backing_file")) << (mount / "a.img").native();
+    EXPECT_EQ(holdersOf(mount.native(), "/none", workshop.path("block")),
+              std::vector<std::string>{"loop3"});
+}
+
+TEST(MountOptions, WhatTheKernelOnlyTellsIsNotGivenBack)
+{
+    EXPECT_EQ(mountableOptions("rw,seclabel,relatime,errors=remount-ro"),
+              "rw,relatime,errors=remount-ro");
+    EXPECT_EQ(mountableOptions("seclabel"), "");
+}
+
+}  // namespace

@@ -1,0 +1,148 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "TemporaryDirectory.h"
+#include "ToolRun.h"
+#include "orvane/support/disks/DiskController.h"
+#include "orvane/support/disks/DiskEvents.h"
+#include "orvane/support/disks/DiskWatch.h"
+#include "orvane/support/disks/SystemDisks.h"
+#include "orvane/support/loop/MainLoop.h"
+#include "orvane/support/loop/Notifications.h"
+#include "tests/support/LoopDevice.h"
+
+#include <gtest/gtest.h>
+#include <sys/mount.h>
+#include <unistd.h>
+
+namespace orvane {
+namespace {
+
+using namespace std::string_view_literals;
+using namespace std::chrono_literals;
+using test::LoopDevice;
+using test::TemporaryDirectory;
+
+TEST(DiskEvents, OnlyBlockDevicesMatter)
+{
+    struct Case {
+        std::string_view message;
+        bool isMeant;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{"change@/devices/virtual/block/loop0\0ACTION=change\0SUBSYSTEM=block\0MAJOR=7\0"sv,
+               true, "as the kernel says it"},
+          Case{"libudev\0\xfe\xed\xca\xfe\x28\0\0\0ACTION=add\0SUBSYSTEM=block\0"sv, true,
+               "as udevd says it"},
+          Case{"add@/devices/x\0ACTION=add\0SUBSYSTEM=usb\0"sv, false, "another device"},
+          Case{"add@/devices/x\0SUBSYSTEM=blocks\0"sv, false, "a longer name"},
+          Case{"add@/devices/x\0MY=SUBSYSTEM=block\0"sv, false, "the value of another field"},
+          Case{"\0SUBSYSTEM=block"sv, false, "cut off"}, Case{""sv, false, "empty"}})
+        EXPECT_EQ(isAboutBlockDevice(c.message), c.isMeant) << c.because;
+}
+
+TEST(DiskEvents, MountsWithoutADeviceDoNotMatter)
+{
+    const auto kept = deviceMounts(
+        parseMountInfo("22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
+                       "32 22 0:40 / /home rw - btrfs /dev/sdb1 rw\n"
+                       "33 22 0:50 / /c/1 rw - overlay overlay rw\n"));
+    ASSERT_EQ(kept.size(), 2U);
+    EXPECT_EQ(kept[1].filesystem, "btrfs") << "it has a number of its own, but a device";
+}
+
+TEST(DiskEvents, ABurstIsOneChange)
+{
+    const EventBurst::Clock::time_point start{};
+    EventBurst burst;
+    EXPECT_FALSE(burst.timeLeft(start));
+    EXPECT_FALSE(burst.takeDue(start)) << "nothing has happened";
+    burst.note(start);
+    burst.note(start + 150ms);
+    EXPECT_FALSE(burst.takeDue(start + 210ms)) << "not quiet yet";
+    EXPECT_EQ(burst.timeLeft(start + 210ms), 140ms);
+    EXPECT_TRUE(burst.takeDue(start + 350ms));
+    EXPECT_FALSE(burst.takeDue(start + 999ms)) << "told once";
+
+    int told = 0;
+    for (auto now = start; now < start + 10s; now += 100ms) {
+        burst.note(now);
+        told += burst.takeDue(now) ? 1 : 0;
+    }
+    EXPECT_EQ(told, 9) << "events without end cannot keep the news back";
+}
+
+/// The machine's own disks, as a front end follows them.
+class DiskWatchTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (const char* const obstacle = test::LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
+        ASSERT_EQ(
+            test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "watched", image_, "8M"}), 0);
+        ASSERT_FALSE(failed(watch_.start()));
+    }
+
+    void read() { disks_.synchronize(readSystemDisks(DiskSources())); }
+    std::shared_ptr<Disk> found()
+    {
+        return disks_.find([](const Disk& disk) { return disk.facts().label == "watched"; });
+    }
+    bool waitUntil(const std::function<bool()>& isDone)
+    {
+        bool isLate = false;
+        loop_.scheduleTimer(20s, [&] { isLate = true; });
+        loop_.runUntil([&] { return isLate || isDone(); });
+        return isDone();
+    }
+
+    const TemporaryDirectory directory_;
+    const std::string image_ = directory_ / "watched.img";
+    MainLoop loop_;
+    Notifications center_;
+    DiskController disks_{center_, {[](std::string_view) {
+                              return FilesystemCapabilities();
+                          }}};
+    DiskWatch watch_{loop_, [this] {
+                         read();
+                     }};
+};
+
+TEST_F(DiskWatchTest, ARealDeviceComesIsMountedUnmountedAndGoes)
+{
+    LoopDevice device(image_);
+    if (device.name().empty())
+        GTEST_SKIP() << "no loop device can be set up here";
+    ASSERT_TRUE(waitUntil([&] { return found() != nullptr; }));
+    const auto disk = found();
+    EXPECT_EQ(disk->diskIdentifier(), device.name());
+    const std::string mountPoint = directory_ / "mnt";
+    std::filesystem::create_directory(mountPoint);
+    if (::mount(device.name().c_str(), mountPoint.c_str(), "ext4", 0, nullptr) == 0) {
+        EXPECT_TRUE(waitUntil([&] { return disk->mountPoint() == mountPoint; }));
+        ASSERT_EQ(::umount(mountPoint.c_str()), 0);
+        EXPECT_TRUE(waitUntil([&] { return !disk->isMounted(); }));
+    }
+    device.detach();
+    EXPECT_TRUE(waitUntil([&] { return found() == nullptr; }));
+    EXPECT_TRUE(disk->hasGone());
+}
+
+TEST_F(DiskWatchTest, ADeviceThatIsGivenAnotherImageIsAnotherDisk)
+{
+    LoopDevice device(image_);
+    if (device.name().empty())
+        GTEST_SKIP() << "no loop device can be set up here";
+    ASSERT_TRUE(waitUntil([&] { return found() != nullptr; }));
+    const auto before = found();
+    if (before->facts().sequence == 0)
+        GTEST_SKIP() << "this kernel does not number its disks";
+    device.detach();
+    device.attach(image_);
+    read();
+    ASSERT_NE(found(), nullptr);
+    EXPECT_NE(found(), before) << "though all that can be read of it is the same";
+}
+
+}  // namespace
+}  // namespace orvane

@@ -1,0 +1,62 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/files/FileDescriptor.h"
+
+#include <fcntl.h>
+#include <linux/loop.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <string>
+
+namespace orvane::test {
+
+/// A loop device of the kernel over an image file, by loop(4); given back at the end. Needs root.
+class LoopDevice {
+public:
+    /// Why there can be none; null when there can.
+    static const char* obstacle()
+    {
+        if (::geteuid() != 0)
+            return "only root can set up a loop device";
+        return ::access("/sys/block", R_OK) != 0 ? "/sys is not mounted" : nullptr;
+    }
+
+    explicit LoopDevice(const std::string& image)
+    {
+        const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
+        number_ = control ? ::ioctl(control.get(), LOOP_CTL_GET_FREE) : -1;
+        attach(image);
+    }
+    LoopDevice(const LoopDevice&) = delete;
+    LoopDevice& operator=(const LoopDevice&) = delete;
+    ~LoopDevice() { detach(); }
+
+    /// Empty when the system gives none.
+    std::string name() const
+    {
+        return number_ < 0 ? std::string() : "/dev/loop" + std::to_string(number_);
+    }
+
+    void attach(const std::string& image)
+    {
+        const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
+        const FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
+        if (!device || !file || ::ioctl(device.get(), LOOP_SET_FD, file.get()) != 0)
+            number_ = -1;
+    }
+
+    /// Nothing happens when it is detached already.
+    void detach()
+    {
+        const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
+        if (device)
+            ::ioctl(device.get(), LOOP_CLR_FD);
+    }
+
+private:
+    int number_ = -1;
+};
+
+}  // namespace orvane::test
