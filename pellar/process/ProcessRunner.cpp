@@ -168,7 +168,8 @@ private:
         if (ladder_.isStopping())
             return;
         cause_ = cause;
-        send(ladder_.press(Clock::now()));
+        // One that ignores being asked has no more time than when the program is leaving.
+        send(request_.ignoresStops ? ladder_.pressHard(Clock::now()) : ladder_.press(Clock::now()));
     }
 
     void send(int signal)
