@@ -2,6 +2,7 @@
 #include "pellar/ErrorTexts.h"
 
 #include "fixwell/host/foundation/Format.h"
+#include "pellar/partitions/MapErrorCodes.h"
 
 #include <algorithm>
 #include <array>
@@ -39,6 +40,11 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorDiskChanged, "The disk changed while it was being checked."},
     ErrorText{fixwell::kPLErrorReadOnly, "The disk cannot be written, so it cannot be repaired."},
     ErrorText{fixwell::kPLErrorBusy, "Another operation is still running."},
+    ErrorText{kPLErrorNoPartitionMap, "There is no partition map on the disk."},
+    ErrorText{kPLErrorMapDamaged, "The partition map is damaged; use Repair Disk."},
+    ErrorText{kPLErrorMapNeedsPerson,
+              "The partition map is damaged in a way that only a person can put right."},
+    ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},
 };
 
 }  // namespace

@@ -2,6 +2,7 @@
 #include "pellar/Manager.h"
 
 #include "pellar/RepairDisk.h"
+#include "pellar/partitions/MapDisk.h"
 #include "pellar/tools/Capability.h"
 
 #include <utility>
@@ -28,6 +29,11 @@ bool Manager::canVerify(std::string_view filesystemType) const
 bool Manager::canRepair(std::string_view filesystemType) const
 {
     return capabilityFor(filesystemType, Operation::Repair, options_.toolPath).isGiven();
+}
+
+bool Manager::hasPartitionMap(const fixwell::DiskReference& disk) const
+{
+    return glanceAtMap(disk).kind != PartitionMap::Kind::None;
 }
 
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const

@@ -30,6 +30,10 @@ public:
     /// Why not, in the user's language; empty when it can.
     std::string reasonAgainst(std::string_view filesystemType, Operation operation) const;
 
+    /// The disk has a partition map that can be verified, and repaired where a copy of it is left.
+    /// Reads a few sectors.
+    bool hasPartitionMap(const fixwell::DiskReference& disk) const;
+
 private:
     fixwell::RunLoop& loop_;
     const Texts& texts_;

@@ -2,10 +2,14 @@
 #include "pellar/RepairDisk.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/MapScript.h"
+#include "pellar/partitions/MapDisk.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <utility>
@@ -20,6 +24,18 @@ using fixwell::ErrorCode;
 bool isVolume(const DiskReferencePointer& disk)
 {
     return disk && !disk->path.empty() && !disk->isWhole;
+}
+
+/// Whether a device may be neither opened as the operation must, nor unmounted, by this user.
+bool needsPrivileges(const fixwell::DiskReference& disk, Operation operation,
+                     const SystemPaths& paths)
+{
+    struct stat status = {};
+    if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
+        return false;
+    const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
+    return ::access(disk.path.c_str(), wanted) != 0 ||
+           !mountPlacesOf(status.st_rdev, paths).empty();
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -57,19 +73,24 @@ ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer&)
     return fixwell::kPLErrorUnsupported;
 }
 
-ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Verify);
 }
 
-ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPartitionMap(disk, Operation::Repair);
 }
 
-bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer&, ErrorCode* error)
+bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
 {
-    return answer(false, error);
+    const bool isDisk = disk && !disk->path.empty() && disk->isWhole;
+    // What this user may not read is looked at when the job has the right to.
+    const bool isUnknown = isDisk && options_.privileged &&
+                           needsPrivileges(*disk, Operation::Verify, options_.systemPaths);
+    return answer(isUnknown || (isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None),
+                  error);
 }
 
 bool RepairDisk::canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
@@ -94,12 +115,26 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
 {
     if (const ErrorCode error = refusal(disk, operation))
         return error;
+    if (beginPrivileged(disk, operation))
+        return fixwell::kPLNoError;
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
-    start({disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    startVolume(
+        {disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
+}
+
+/// NO when the job needs nobody's help, or there is none.
+bool RepairDisk::beginPrivileged(const DiskReferencePointer& disk, Operation operation)
+{
+    if (!options_.privileged || !needsPrivileges(*disk, operation, options_.systemPaths))
+        return false;
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return options_.privileged(*disk, operation, stop, road);
+    });
+    return true;
 }
 
 // Unmounting may take long, so it is the job's. What the system itself runs from is not tried.
@@ -117,7 +152,35 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
                                     [](const MountPlace& place) { return place.target == "/"; });
     if (mounts.empty() || isRoot)
         return error;
-    start({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    return fixwell::kPLNoError;
+}
+
+// A script maker can be copied, a claim cannot.
+void RepairDisk::startVolume(JobRequest request)
+{
+    const auto disk = request.disk;
+    const auto shared = std::make_shared<JobRequest>(std::move(request));
+    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+    });
+}
+
+// The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
+// begin says nothing.
+ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operation operation)
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    if (!disk->isWhole)
+        return fixwell::kPLErrorUnsupported;
+    if (beginPrivileged(disk, operation))
+        return fixwell::kPLNoError;
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
+    });
     return fixwell::kPLNoError;
 }
 
@@ -140,12 +203,12 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
     return fixwell::kPLNoError;  // the job itself says why there is no way
 }
 
-void RepairDisk::start(JobRequest request)
+void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
-    EventReceiver receiver{&delegate_, request.disk, options_.commandTrace, [this] {
+    EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();
                            }};
-    job_ = std::make_unique<Job>(std::move(request), std::move(receiver), loop_, options_, texts_);
+    job_ = std::make_unique<Job>(makeScript, std::move(receiver), loop_);
 }
 
 }  // namespace pellar

@@ -6,6 +6,8 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
+#include "pellar/jobs/JobScript.h"
+#include "pellar/tools/Operation.h"
 
 #include <memory>
 
@@ -43,9 +45,13 @@ private:
     fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
     fixwell::ErrorCode beginMounted(const fixwell::DiskReferencePointer& disk, Operation operation,
                                     fixwell::ErrorCode error);
+    fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
+                                         Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
-    void start(JobRequest request);
+    bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);
+    void startVolume(JobRequest request);
+    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;

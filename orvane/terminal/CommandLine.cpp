@@ -66,6 +66,9 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
         disks.required();
     if (text.command == Command::History)
         command.add_flag("--clear", request.clearsHistory, "Forget these disks' histories");
+    if (text.command == Command::Verify || text.command == Command::Repair)
+        command.add_flag("--partition-map", request.treatsPartitionMap,
+                         "Treat the disk's partition map (GPT or MBR) instead of its volumes");
     command.callback([&request, chosen = text.command] { request.command = chosen; });
     command.fallthrough();
 }

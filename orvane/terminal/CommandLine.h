@@ -17,6 +17,7 @@ struct Request {
     Command command = Command::List;
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
     bool clearsHistory = false;
+    bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;
     bool confirms = false;  ///< answers the startup-disk warning

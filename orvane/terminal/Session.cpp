@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/settings/XDGPaths.h"
 #include "pellar/ErrorTexts.h"
 
 #include <unistd.h>
@@ -80,9 +82,7 @@ SupportOptions Session::supportOptions(const Request& request)
 
 pellar::ManagerOptions Session::libraryOptions(const Request& request)
 {
-    pellar::ManagerOptions options;
-    if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
-        options.toolPath = *path;
+    pellar::ManagerOptions options = orvane::libraryOptions(userXDGPaths(), libraryTexts_);
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));
@@ -155,6 +155,12 @@ void Session::detach(const DiskPointer& topLevelDisk)
 {
     if (topLevelDisk)
         host_.sharedDiskController().ejectDisk(topLevelDisk, true);
+}
+
+bool Session::hasPartitionMap(const DiskPointer& disk) const
+{
+    const fixwell::DiskReferencePointer reference = disk->theKRDisk();
+    return reference && library_.hasPartitionMap(*reference);
 }
 
 void Session::select(const std::vector<DiskPointer>& disks)

@@ -39,6 +39,8 @@ public:
     /// given back with `detach`.
     DiskPointer attach(const DiskPointer& image);
     void detach(const DiskPointer& topLevelDisk);
+    /// The library finds a partition map on it that it can treat.
+    bool hasPartitionMap(const DiskPointer& disk) const;
 
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);

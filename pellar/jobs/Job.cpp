@@ -6,11 +6,10 @@
 
 namespace pellar {
 
-Job::Job(JobRequest request, EventReceiver receiver, fixwell::RunLoop& loop,
-         const ManagerOptions& options, const Texts& texts)
+Job::Job(const ScriptMaker& makeScript, EventReceiver receiver, fixwell::RunLoop& loop)
     : road_(loop, std::move(receiver))
 {
-    auto script = std::make_unique<JobScript>(std::move(request), options, texts, stop_, road_);
+    auto script = makeScript(stop_, road_);
     thread_ = std::jthread([script = std::move(script)] { script->run(); });
 }
 

@@ -2,10 +2,8 @@
 #pragma once
 
 #include "fixwell/host/foundation/RunLoop.h"
-#include "pellar/ManagerOptions.h"
-#include "pellar/Texts.h"
 #include "pellar/jobs/EventRoad.h"
-#include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/Script.h"
 #include "pellar/process/StopSwitch.h"
 
 #include <thread>
@@ -14,11 +12,10 @@ namespace pellar {
 
 /// A job under way, on a thread of its own. Main thread. Destroying it ends the tool as fast as
 /// is safe for the disk, waits until nothing of the job is left, and drops what it still had to
-/// tell. The references outlive it.
+/// tell. The loop outlives it.
 class Job {
 public:
-    Job(JobRequest request, EventReceiver receiver, fixwell::RunLoop& loop,
-        const ManagerOptions& options, const Texts& texts);
+    Job(const ScriptMaker& makeScript, EventReceiver receiver, fixwell::RunLoop& loop);
     Job(const Job&) = delete;
     Job& operator=(const Job&) = delete;
     ~Job();

@@ -5,6 +5,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Outcome.h"
+#include "pellar/jobs/Script.h"
 #include "pellar/mounts/UnmountedDisk.h"
 #include "pellar/tools/Tool.h"
 #include "pellar/volumes/DiskClaim.h"
@@ -34,12 +35,12 @@ struct JobRequest {
 ///
 /// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
 /// tells *started* once, first, and *finished* once, last. The references outlive it.
-class JobScript {
+class JobScript final : public Script {
 public:
     JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
               StopSwitch& stop, EventRoad& road);
 
-    void run();
+    void run() override;
 
 private:
     enum class State { Examining, Verifying, Looking, Replaying, Repairing, Confirming, Done };

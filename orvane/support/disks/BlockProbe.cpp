@@ -145,12 +145,19 @@ bool hasExtBackupSuperblock(int descriptor, ByteRange range)
 
 bool hasPartitionTableTraces(int descriptor)
 {
-    // UEFI Specification 2.10, 5.2.3 and 5.3.2: the header in block 1, of 512 or 4096 bytes; the
-    // protective partition of type 0xEE first in the MBR.
-    const bool hasProtectiveMBR =
-        hasBytes(descriptor, 510, "\x55\xAA") && hasBytes(descriptor, 446 + 4, "\xEE");
-    return hasProtectiveMBR || hasBytes(descriptor, 512, "EFI PART") ||
-           hasBytes(descriptor, 4096, "EFI PART");
+    // UEFI Specification 2.10, 5.2.1 and 5.3.2: four entries of 16 bytes in the MBR, their types 4
+    // bytes into each; the headers in block 1 and in the last, of 512 or 4096 bytes.
+    const bool hasMBR = hasBytes(descriptor, 510, "\x55\xAA");
+    for (std::uint64_t entry = 446; hasMBR && entry < 510; entry += 16)
+        if (!hasBytes(descriptor, entry + 4, std::string_view("\0", 1)))
+            return true;
+    const off_t end = ::lseek(descriptor, 0, SEEK_END);
+    const std::uint64_t length = end < 0 ? 0 : static_cast<std::uint64_t>(end);
+    for (const std::uint64_t block : {512U, 4096U})
+        if (hasBytes(descriptor, block, "EFI PART") ||
+            (length >= 2 * block && hasBytes(descriptor, (length / block - 1) * block, "EFI PART")))
+            return true;
+    return false;
 }
 
 bool announcesFilesystem(const Partition& partition)

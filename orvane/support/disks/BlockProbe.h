@@ -54,7 +54,8 @@ struct PartitionTable {
 /// A backup superblock of ext2, ext3 or ext4 stands where mke2fs puts the first one: the volume
 /// was made by it even though its own superblock is gone.
 [[nodiscard]] bool hasExtBackupSuperblock(int descriptor, ByteRange range);
-/// A GPT header or its protective MBR stands at the start, whether or not it makes sense.
+/// A GPT header stands at the start or the end, or an MBR with entries, whether or not it makes
+/// sense. A FAT volume can look like that too: to be asked where no file system was found.
 [[nodiscard]] bool hasPartitionTableTraces(int descriptor);
 
 /// The partition's type announces a file system of a kind that can be checked.

@@ -2,6 +2,7 @@
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
+#include "orvane/terminal/commands/WholeDisks.h"
 
 #include <algorithm>
 
@@ -62,14 +63,11 @@ int settle(const NamedDisk& named, Session& session, Reporter& reporter)
     return exitUnchecked;
 }
 
-}  // namespace
-
-int runAction(const Request& request, Session& session, Reporter& reporter)
+int treat(const std::vector<NamedDisk>& wanted, const ActionButton& action, Session& session,
+          Reporter& reporter)
 {
     int status = 0;
-    const ActionButton& action = actionButtonFor(request.command);
-    const std::vector<NamedDisk> disks = usableDisks(
-        findDisks(request.disks, session, reporter, status), action, session, reporter, status);
+    const std::vector<NamedDisk> disks = usableDisks(wanted, action, session, reporter, status);
     if (disks.empty())
         return status;
     session.select(selectionOf(disks));
@@ -77,6 +75,19 @@ int runAction(const Request& request, Session& session, Reporter& reporter)
     for (const NamedDisk& named : disks)
         status |= settle(named, session, reporter);
     return status;
+}
+
+}  // namespace
+
+int runAction(const Request& request, Session& session, Reporter& reporter)
+{
+    int status = 0;
+    const ActionButton& action = actionButtonFor(request.command);
+    const std::vector<NamedDisk> named = findDisks(request.disks, session, reporter, status);
+    if (!request.treatsPartitionMap)
+        return status | treat(named, action, session, reporter);
+    const WholeDisks whole(named, session, reporter, status);
+    return status | treat(whole.disks(), action, session, reporter);
 }
 
 std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session& session,

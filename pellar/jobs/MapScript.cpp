@@ -1,0 +1,242 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/MapScript.h"
+
+#include "fixwell/host/foundation/Array.h"
+#include "fixwell/host/foundation/UTF8.h"
+#include "fixwell/host/pellar/MessageKeys.h"
+#include "pellar/partitions/MapOutcome.h"
+#include "pellar/partitions/SavedSectors.h"
+
+#include <limits>
+#include <system_error>
+#include <thread>
+#include <utility>
+
+namespace pellar {
+namespace {
+
+// The levels at which the module shows a message: always as a heading is, or as a main line is.
+constexpr int errorLevel = -1;
+constexpr int mainLevel = 0;
+
+fixwell::Value valueOf(const FindingArgument& argument)
+{
+    if (const auto* const text = std::get_if<std::string>(&argument))
+        return std::string_view(*text);
+    const std::uint64_t number = std::get<std::uint64_t>(argument);
+    if (number > std::uint64_t{std::numeric_limits<std::int64_t>::max()})
+        return std::to_string(number);
+    return static_cast<std::int64_t>(number);
+}
+
+fixwell::Array parametersOf(const Finding& finding)
+{
+    const fixwell::Array parameters = fixwell::Array::make();
+    for (const FindingArgument& argument : finding.arguments)
+        parameters.append(valueOf(argument));
+    return parameters;
+}
+
+Sentence reasonOf(fixwell::ErrorCode claimError)
+{
+    switch (claimError) {
+        case fixwell::kPLErrorDiskInUse:
+        case fixwell::kPLErrorCouldNotUnmount:
+            return {"the disk, or a part of it, is mounted or in use", {}, {}};
+        case fixwell::kPLErrorReadOnly: return {"the disk cannot be written", {}, {}};
+        default: return {"the disk cannot be opened", {}, {}};
+    }
+}
+
+Outcome stopped()
+{
+    return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+}
+
+}  // namespace
+
+MapScript::MapScript(fixwell::DiskReferencePointer disk, Operation operation,
+                     const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
+                     EventRoad& road)
+    : disk_(std::move(disk)),
+      operation_(operation),
+      options_(options),
+      texts_(texts),
+      stop_(stop),
+      road_(road),
+      log_(*disk_, texts, road)
+{
+}
+
+void MapScript::run()
+{
+    log_.started();
+    report(carryOut());
+}
+
+// udev locks a device while it looks at it, as it does after every change (systemd's "Locking Block
+// Device Access"). That is over in a moment; a mount is not.
+std::variant<MapClaim, fixwell::ErrorCode> MapScript::claim() const
+{
+    constexpr std::chrono::milliseconds pause{50};
+    constexpr int mostTries = 40;
+    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    for (int tries = 1;; ++tries) {
+        auto taken = MapClaim::take(*disk_, access, options_.systemPaths);
+        const auto* const error = std::get_if<fixwell::ErrorCode>(&taken);
+        const bool isBusy = error != nullptr && *error == fixwell::kPLErrorDiskInUse;
+        if (!isBusy || tries == mostTries || stop_.isPressed())
+            return taken;
+        std::this_thread::sleep_for(pause);
+    }
+}
+
+// The claim ends here: the disk is given back before the end is told.
+Outcome MapScript::carryOut()
+{
+    step({"Reading the partition map of “%1$@”", log_.diskName(), {}}, 5);
+    const auto taken = claim();
+    if (stop_.isPressed())
+        return stopped();
+    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&taken))
+        return {Verdict::Failed, *error, 0, reasonOf(*error)};
+    const auto& disk = std::get<MapClaim>(taken);
+    const PartitionMap map = disk.readMap();
+    const MapReport found = reportOn(map);
+    tellMap(map);
+    for (const Finding& finding : found.findings)
+        tell(finding);
+    if (operation_ == Operation::Repair && found.verdict == MapVerdict::Repairable)
+        return repair(disk, map, found);
+    const Outcome outcome = outcomeOfMapVerification(map, found);
+    return operation_ == Operation::Repair && outcome.verdict == Verdict::Damaged
+               ? outcomeOfRefusedRepair(
+                     {"only a person can decide what is right; nothing was written", {}, {}})
+               : outcome;
+}
+
+Outcome MapScript::repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report)
+{
+    const auto planned = planRepair(map, report, claim.sectors());
+    if (const auto* const refusal = std::get_if<Sentence>(&planned))
+        return outcomeOfRefusedRepair(*refusal);
+    const auto& plan = std::get<RepairPlan>(planned);
+    Outcome outcome;
+    if (!save(claim, plan, outcome))
+        return outcome;
+    if (stop_.isPressed())
+        return stopped();
+    outcome = write(claim, plan);
+    if (outcome.verdict == Verdict::Repaired && !claim.rereadPartitions())
+        log_.remark(
+            texts_.text("The system has not taken up the repaired map yet; it does when "
+                        "the disk is connected again."));
+    return outcome;
+}
+
+bool MapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome)
+{
+    const SavedDisk disk{disk_->path, claim.offset(), claim.sectors().sectorBytes(),
+                         std::chrono::system_clock::now()};
+    const auto saved = saveSectors(plan, disk, options_.savedSectorsDirectory);
+    if (const auto* const refusal = std::get_if<Sentence>(&saved)) {
+        outcome = outcomeOfRefusedRepair(*refusal);
+        return false;
+    }
+    const std::string directory =
+        fixwell::printable(std::get<std::filesystem::path>(saved).native());
+    log_.remark(
+        log_.text(Sentence{"The sectors that are overwritten are kept in %1$@; the "
+                           "README.txt there tells how to put them back.",
+                           directory,
+                           {}}));
+    return true;
+}
+
+// Whatever has happened on the way, what can be read afterwards is the answer.
+Outcome MapScript::write(const MapClaim& claim, const RepairPlan& plan)
+{
+    const FileSectors sectors = claim.sectors();
+    for (const SectorWrite& write : plan.writes) {
+        step({write.what, {}, {}}, 50);
+        if (const int error = sectors.write(write.first, write.after))
+            return outcomeOfRefusedRepair({"sector %1$@ cannot be written: %2$@",
+                                           std::to_string(write.first),
+                                           std::generic_category().message(error)});
+    }
+    step({"Verifying the repaired partition map of “%1$@”", log_.diskName(), {}}, 80);
+    sectors.forgetCached();
+    for (const SectorWrite& write : plan.writes)
+        if (sectors.read(write.first, write.after.size() / sectors.sectorBytes()) != write.after)
+            return outcomeOfRefusedRepair(
+                {"sector %1$@ does not hold what was written", std::to_string(write.first), {}});
+    const PartitionMap map = claim.readMap();
+    const MapReport found = reportOn(map);
+    for (const Finding& finding : found.findings)
+        if (levelOf(finding.kind) != FindingLevel::Note)
+            tell(finding);
+    return outcomeOfMapRepair(map, found);
+}
+
+void MapScript::tellMap(const PartitionMap& map)
+{
+    if (map.kind == PartitionMap::Kind::None)
+        return;
+    const GPTCopy* const valid = map.validCopy();
+    const bool isGPT = map.kind == PartitionMap::Kind::GPT;
+    const std::size_t count = !isGPT ? map.mbr.partitions.size()
+                              : valid != nullptr
+                                  ? usedEntries(valid->entries, valid->header.header).size()
+                                  : 0;
+    step({isGPT ? "GUID partition table, %1$@ partitions, sectors of %2$@ bytes"
+                : "MBR partition table, %1$@ partitions, sectors of %2$@ bytes",
+          std::to_string(count), std::to_string(map.sectorBytes)},
+         30);
+}
+
+void MapScript::tell(const Finding& finding)
+{
+    const bool isNote = levelOf(finding.kind) == FindingLevel::Note;
+    const fixwell::Dictionary message =
+        fixwell::Dictionary::of({{fixwell::kFsckMessageString, texts_.text(textOf(finding.kind))},
+                                 {fixwell::kFsckVerbosity, isNote ? mainLevel : errorLevel},
+                                 {fixwell::kFsckParameters, parametersOf(finding)}});
+    if (!isNote)
+        message.set(fixwell::kFsckMessageType, fixwell::kFsckError);
+    road_.add(Message{{}, message});
+}
+
+void MapScript::step(Sentence sentence, double percent)
+{
+    log_.step(stepType(), log_.text(sentence));
+    log_.progress(percent);
+}
+
+void MapScript::report(const Outcome& outcome)
+{
+    const std::string message =
+        mapMessageOf(outcome, operation_, log_.diskName(), texts_).in(texts_);
+    if (outcome.verdict == Verdict::Failed)
+        log_.failure(message);
+    else if (!outcome.reason.isEmpty())
+        log_.remark(message);
+    const Sentence line = mapVerdictLine(outcome.verdict, operation_, log_.diskName());
+    if (!line.isEmpty()) {
+        const bool isGood = outcome.code == fixwell::kPLNoError;
+        road_.add(Message{
+            {},
+            fixwell::Dictionary::of(
+                {{fixwell::kFsckMessageType, isGood ? fixwell::kFsckSuccess : fixwell::kFsckError},
+                 {fixwell::kFsckMessageString, line.in(texts_)},
+                 {fixwell::kFsckVerbosity, mainLevel}})});
+    }
+    log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
+    log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
+}
+
+fixwell::Name MapScript::stepType() const
+{
+    return operation_ == Operation::Verify ? fixwell::kFsckVerify : fixwell::kFsckRepair;
+}
+
+}  // namespace pellar

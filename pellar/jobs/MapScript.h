@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/Outcome.h"
+#include "pellar/jobs/Script.h"
+#include "pellar/partitions/MapClaim.h"
+#include "pellar/partitions/MapReport.h"
+#include "pellar/partitions/RepairPlan.h"
+
+namespace pellar {
+
+/// Verifies or repairs a disk's partition map: reads and judges it; to repair, plans, keeps what
+/// will be overwritten, writes, and reads and judges it again. The references outlive it.
+class MapScript final : public Script {
+public:
+    MapScript(fixwell::DiskReferencePointer disk, Operation operation,
+              const ManagerOptions& options, const Texts& texts, StopSwitch& stop, EventRoad& road);
+
+    void run() override;
+
+private:
+    Outcome carryOut();
+    std::variant<MapClaim, fixwell::ErrorCode> claim() const;
+    Outcome repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report);
+    Outcome write(const MapClaim& claim, const RepairPlan& plan);
+    bool save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome);
+    void tellMap(const PartitionMap& map);
+    void tell(const Finding& finding);
+    void step(Sentence sentence, double percent);
+    void report(const Outcome& outcome);
+    fixwell::Name stepType() const;
+
+    const fixwell::DiskReferencePointer disk_;
+    const Operation operation_;
+    const ManagerOptions& options_;
+    const Texts& texts_;
+    StopSwitch& stop_;
+    EventRoad& road_;
+    JobLog log_;
+};
+
+}  // namespace pellar

@@ -1,0 +1,114 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/partitions/Finding.h"
+
+#include <algorithm>
+#include <array>
+
+namespace pellar {
+namespace {
+
+struct KnownFinding {
+    FindingKind kind;
+    FindingLevel level;
+    std::string_view text;
+};
+
+using enum FindingKind;
+using enum FindingLevel;
+
+constexpr std::array findings{
+    KnownFinding{PrimaryUnreadable, Repairable,
+                 "The main copy of the partition map cannot be read."},
+    KnownFinding{PrimaryMissing, Repairable, "The main copy of the partition map is missing."},
+    KnownFinding{PrimaryHeaderChecksum, Repairable,
+                 "The header of the partition map's main copy is damaged: its checksum is wrong."},
+    KnownFinding{PrimaryHeaderNumbers, Repairable,
+                 "The header of the partition map's main copy is damaged: its numbers make no "
+                 "sense."},
+    KnownFinding{PrimaryEntriesChecksum, Repairable,
+                 "The list of partitions in the main copy is damaged: its checksum is wrong."},
+    KnownFinding{BackupUnreadable, Repairable,
+                 "The backup copy of the partition map cannot be read."},
+    KnownFinding{BackupMissing, Repairable, "The backup copy of the partition map is missing."},
+    KnownFinding{BackupHeaderChecksum, Repairable,
+                 "The header of the partition map's backup copy is damaged: its checksum is "
+                 "wrong."},
+    KnownFinding{BackupHeaderNumbers, Repairable,
+                 "The header of the partition map's backup copy is damaged: its numbers make no "
+                 "sense."},
+    KnownFinding{BackupEntriesChecksum, Repairable,
+                 "The list of partitions in the backup copy is damaged: its checksum is wrong."},
+    KnownFinding{BackupNotAtEnd, Repairable,
+                 "The backup copy of the partition map is not at the end of the disk: the disk has "
+                 "grown by %1$@ sectors."},
+    KnownFinding{CopiesDiffer, Repairable, "The two copies of the partition map differ."},
+    KnownFinding{NoValidCopy, NeedsPerson, "Neither copy of the partition map is valid."},
+    KnownFinding{DiskCut, NeedsPerson,
+                 "The disk is shorter than its partition map says: the map was made for %1$@ "
+                 "sectors, but only %2$@ are there."},
+    KnownFinding{DiskFilled, NeedsPerson,
+                 "The disk also bears the mark of something that fills the whole of it: %1$@."},
+    KnownFinding{ProtectiveMissing, Repairable, "The protective MBR is missing."},
+    KnownFinding{ProtectiveWrongSize, Repairable, "The protective MBR states a wrong size."},
+    KnownFinding{ProtectiveWrongStart, Repairable,
+                 "The protective MBR does not begin where it should."},
+    KnownFinding{Hybrid, Note,
+                 "The disk has a hybrid MBR: some partitions are listed there as well. It is left "
+                 "as it is."},
+    KnownFinding{Remnants, Note,
+                 "Remnants of an older partition map (GPT) are on the disk; the MBR counts."},
+    KnownFinding{EndBeforeStart, NeedsPerson,
+                 "Partition %3$@ ends before it starts (sector %1$@ to sector %2$@)."},
+    KnownFinding{BeyondDisk, NeedsPerson,
+                 "Partition %3$@ reaches beyond the end of the disk (to sector %1$@; the last is "
+                 "%2$@)."},
+    KnownFinding{OutsideUsable, NeedsPerson,
+                 "Partition %3$@ lies outside of the sectors that the map allows (%1$@ to %2$@)."},
+    KnownFinding{Overlap, NeedsPerson, "Partitions %1$@ and %2$@ overlap."},
+    KnownFinding{SameIdentifier, NeedsPerson,
+                 "Partitions %1$@ and %2$@ have the same unique identifier."},
+    KnownFinding{StartsAtMap, NeedsPerson,
+                 "Partition %1$@ starts where the partition map itself stands."},
+    KnownFinding{EmptyPartition, NeedsPerson, "Partition %1$@ has no sectors."},
+    KnownFinding{OutsideExtended, NeedsPerson,
+                 "The logical partition %1$@ lies outside of the extended partition."},
+    KnownFinding{BadBootFlag, NeedsPerson,
+                 "The boot flag of partition %1$@ is neither on nor off."},
+    KnownFinding{TwoActive, NeedsPerson, "Partitions %1$@ and %2$@ are both marked active."},
+    KnownFinding{SeveralExtended, NeedsPerson, "There is more than one extended partition."},
+    KnownFinding{ChainBroken, NeedsPerson,
+                 "The chain of logical partitions is broken; there may be more of them."},
+    KnownFinding{ChainOutside, NeedsPerson,
+                 "The chain of logical partitions leads out of the extended partition."},
+    KnownFinding{ChainLoop, NeedsPerson, "The chain of logical partitions runs in a circle."},
+    KnownFinding{ChainTooLong, NeedsPerson,
+                 "The chain of logical partitions is too long to be true."},
+    KnownFinding{More, Note, "… and %1$@ more problems of the partition map"},
+};
+
+const KnownFinding& known(FindingKind kind)
+{
+    return *std::find_if(findings.begin(), findings.end(),
+                         [kind](const KnownFinding& finding) { return finding.kind == kind; });
+}
+
+static_assert([] {
+    for (std::size_t i = 0; i < findings.size(); ++i)
+        if (static_cast<std::size_t>(findings[i].kind) != i)
+            return false;
+    return findings.size() == static_cast<std::size_t>(More) + 1;
+}());
+
+}  // namespace
+
+FindingLevel levelOf(FindingKind kind)
+{
+    return known(kind).level;
+}
+
+std::string_view textOf(FindingKind kind)
+{
+    return known(kind).text;
+}
+
+}  // namespace pellar

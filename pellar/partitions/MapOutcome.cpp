@@ -1,0 +1,100 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/partitions/MapOutcome.h"
+
+#include "pellar/partitions/MapErrorCodes.h"
+
+namespace pellar {
+namespace {
+
+std::string_view messageKey(Verdict verdict, bool isRepair)
+{
+    switch (verdict) {
+        case Verdict::Sound: return "verified the partition map of “%1$@”: no damage was found";
+        case Verdict::Repaired: return "repaired the partition map of “%1$@”: no damage is left";
+        case Verdict::Stopped:
+            return isRepair ? "stopped before the partition map of “%1$@” was repaired"
+                            : "stopped while verifying the partition map of “%1$@”";
+        case Verdict::Damaged:
+            return isRepair ? "cannot repair the partition map of “%1$@”: %2$@"
+                            : "verified the partition map of “%1$@”: damage was found; %2$@";
+        case Verdict::Inconclusive:
+        case Verdict::Failed: break;
+    }
+    return isRepair ? "cannot repair the partition map of “%1$@”: %2$@"
+                    : "cannot verify the partition map of “%1$@”: %2$@";
+}
+
+// A disk that cannot be read is not one without a map.
+Outcome outcomeWithoutMap(const PartitionMap& map)
+{
+    if (!map.boot.isReadable)
+        return {Verdict::Failed,
+                fixwell::kPLErrorCannotOpen,
+                0,
+                {"the start of the disk cannot be read", {}, {}}};
+    return {Verdict::Failed, kPLErrorNoPartitionMap, 0, {"there is no partition map", {}, {}}};
+}
+
+}  // namespace
+
+Outcome outcomeOfMapVerification(const PartitionMap& map, const MapReport& report)
+{
+    switch (report.verdict) {
+        case MapVerdict::None: return outcomeWithoutMap(map);
+        case MapVerdict::Sound: return {Verdict::Sound, fixwell::kPLNoError, 0, {}};
+        case MapVerdict::Repairable:
+            return {Verdict::Damaged,
+                    kPLErrorMapDamaged,
+                    0,
+                    {"a repair can restore it from the copy that is sound", {}, {}}};
+        case MapVerdict::NeedsPerson: break;
+    }
+    return {Verdict::Damaged,
+            kPLErrorMapNeedsPerson,
+            0,
+            {"only a person can decide what is right, so no repair will touch it", {}, {}}};
+}
+
+Outcome outcomeOfMapRepair(const PartitionMap& map, const MapReport& confirmation)
+{
+    Outcome outcome = outcomeOfMapVerification(map, confirmation);
+    if (outcome.verdict == Verdict::Sound)
+        outcome.verdict = Verdict::Repaired;
+    else if (outcome.verdict == Verdict::Damaged)
+        outcome = {Verdict::Damaged,
+                   kPLErrorMapNotRepaired,
+                   0,
+                   {"it was written, but is still damaged", {}, {}}};
+    return outcome;
+}
+
+Outcome outcomeOfRefusedRepair(Sentence reason)
+{
+    return {Verdict::Damaged, kPLErrorMapNotRepaired, 0, std::move(reason)};
+}
+
+Sentence mapMessageOf(const Outcome& outcome, Operation operation, const std::string& diskName,
+                      const Texts& texts)
+{
+    return {messageKey(outcome.verdict, operation == Operation::Repair), diskName,
+            outcome.reason.in(texts)};
+}
+
+Sentence mapVerdictLine(Verdict verdict, Operation operation, const std::string& diskName)
+{
+    switch (verdict) {
+        case Verdict::Sound: return {"The partition map of “%1$@” appears to be OK.", diskName, {}};
+        case Verdict::Repaired:
+            return {"The partition map of “%1$@” was repaired successfully.", diskName, {}};
+        case Verdict::Damaged:
+            if (operation == Operation::Repair)
+                return {"The partition map of “%1$@” could not be repaired.", diskName, {}};
+            return {"The partition map of “%1$@” is damaged.", diskName, {}};
+        case Verdict::Inconclusive:
+        case Verdict::Failed:
+        case Verdict::Stopped: break;
+    }
+    return {};
+}
+
+}  // namespace pellar

@@ -1,0 +1,30 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/Sentence.h"
+#include "pellar/partitions/MapReport.h"
+
+#include <variant>
+
+namespace pellar {
+
+/// Whole sectors that take the place of others.
+struct SectorWrite {
+    std::uint64_t first = 0;
+    Bytes before;  ///< what stands there, of the same length
+    Bytes after;
+    std::string_view what;  ///< a step in English, which is the text key
+};
+
+/// What makes the map sound again, in the order in which it is to be written: as long as not all
+/// of it is, the copy that the repair came from stays valid. Nothing in it touches a partition.
+struct RepairPlan {
+    std::vector<SectorWrite> writes;
+};
+
+/// The plan for a map that can be repaired, or why there is none. Reads, never writes.
+[[nodiscard]] std::variant<RepairPlan, Sentence> planRepair(const PartitionMap& map,
+                                                            const MapReport& report,
+                                                            const Sectors& sectors);
+
+}  // namespace pellar

@@ -1,0 +1,85 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/partitions/PartitionMap.h"
+#include "tests/pellar/Workshop.h"
+
+#include <filesystem>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace pellar::test {
+
+inline constexpr std::uint64_t mebibyte = 1U << 20U;
+
+/// A disk in memory.
+class MemorySectors final : public Sectors {
+public:
+    explicit MemorySectors(Bytes disk, std::uint32_t sectorBytes = 512)
+        : bytes(std::move(disk)), sectorBytes_(sectorBytes)
+    {
+    }
+
+    std::uint32_t sectorBytes() const override { return sectorBytes_; }
+    std::uint64_t count() const override { return bytes.size() / sectorBytes_; }
+    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override;
+
+    Bytes bytes;
+
+private:
+    std::uint32_t sectorBytes_;
+};
+
+Bytes fileBytes(const std::filesystem::path& path);
+
+struct ToolAnswer {
+    int status = -1;  ///< -1 when the tool is not installed or was killed
+    std::string output;
+};
+
+/// Runs a system tool to its end.
+ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = {});
+
+/// A disk image that real tools have partitioned, and the ways in which it gets damaged. Sectors
+/// have 512 bytes.
+class DiskImage {
+public:
+    /// Throws when the tools cannot make it.
+    static DiskImage gpt(const Workshop& workshop, std::string_view name = "disk.img");
+    /// The same on 256 KiB: partitions at the sectors 64 to 319, nothing else between the copies.
+    static DiskImage smallGPT(const Workshop& workshop);
+    static DiskImage mbr(const Workshop& workshop, std::string_view script,
+                         std::string_view name = "disk.img");
+
+    const std::filesystem::path& path() const { return path_; }
+    Bytes bytes() const;
+    Bytes part(std::uint64_t offset, std::uint64_t length) const;
+    std::uint64_t sectorCount() const;
+
+    void put(std::uint64_t offset, ByteView bytes) const;
+    void fill(std::uint64_t offset, std::uint64_t length, std::uint8_t value) const;
+    void flip(std::uint64_t offset) const;
+    void resize(std::uint64_t bytes) const;
+    /// A number, least significant byte first.
+    void set(std::uint64_t offset, std::size_t length, std::uint64_t value) const;
+
+    /// Changes entry `number` (from 1) of both lists and gives both copies right checksums again.
+    void setEntry(std::uint32_t number, std::uint64_t first, std::uint64_t last) const;
+    /// Puts bytes into the same place of both lists, and seals them.
+    void putIntoEntries(std::uint64_t offset, ByteView bytes) const;
+    /// Gives the copy whose header is at this sector right checksums for what stands there.
+    void seal(std::uint64_t headerPlace) const;
+
+private:
+    static DiskImage made(const Workshop& workshop, std::string_view name, std::uint64_t bytes,
+                          const std::string& script);
+    explicit DiskImage(std::filesystem::path path) : path_(std::move(path)) {}
+
+    std::filesystem::path path_;
+};
+
+/// The reference to a whole disk.
+fixwell::DiskReferencePointer wholeDisk(const std::filesystem::path& path);
+
+}  // namespace pellar::test

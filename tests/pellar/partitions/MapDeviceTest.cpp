@@ -1,0 +1,80 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/partitions/MapErrorCodes.h"
+#include "tests/pellar/partitions/DiskMaker.h"
+#include "tests/support/LoopDevice.h"
+
+#include <gtest/gtest.h>
+#include <sys/mount.h>
+#include <unistd.h>
+
+namespace {
+
+using namespace pellar;
+using test::DiskImage;
+
+/// A mounted file system, unmounted at the end.
+class Mounted {
+public:
+    Mounted(const std::string& device, std::filesystem::path at) : at_(std::move(at))
+    {
+        isThere_ = ::mount(device.c_str(), at_.c_str(), "ext4", 0, nullptr) == 0;
+    }
+    Mounted(const Mounted&) = delete;
+    Mounted& operator=(const Mounted&) = delete;
+    ~Mounted()
+    {
+        if (isThere_)
+            ::umount(at_.c_str());
+    }
+    explicit operator bool() const { return isThere_; }
+
+private:
+    std::filesystem::path at_;
+    bool isThere_ = false;
+};
+
+// The kernel here may know no partition tables, so partx(8) adds the partition.
+TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "loop devices need root";
+    const test::Workshop workshop;
+    const DiskImage disk = DiskImage::gpt(workshop);
+    const Bytes sound = [&] {
+        workshop.makeExt("volume", 4 * test::mebibyte);
+        disk.put(2048 * 512, test::fileBytes(workshop.path("volume")));
+        return disk.bytes();
+    }();
+    disk.fill(512, 512, 0);
+    const orvane::test::LoopDevice device(disk.path());
+    if (device.name().empty())
+        GTEST_SKIP() << "the system gives no loop device";
+    auto reference = std::make_shared<fixwell::DiskReference>(*test::wholeDisk(device.name()));
+    reference->storage = fixwell::DiskReference::Storage::BlockDevice;
+    reference->length = 0;
+    ManagerOptions options;
+    options.savedSectorsDirectory = workshop.path("saved");
+    test::Bench bench(options);
+
+    if (test::runTool({"partx", "-a", "--nr", "1", device.name()}).status == 0) {
+        std::filesystem::create_directory(workshop.path("mount"));
+        const Mounted mounted(device.name() + "p1", workshop.path("mount"));
+        if (mounted) {
+            bench.finish(bench.tool->beginPartitionMapRepairForDisk(reference));
+            EXPECT_EQ(bench.listener.error, fixwell::kPLErrorDiskInUse) << bench.listener.message;
+            bench.finish(bench.tool->beginPartitionMapVerifyForDisk(reference));
+            EXPECT_EQ(bench.listener.error, kPLErrorMapDamaged) << bench.listener.message;
+        } else {
+            ADD_FAILURE() << "a partition could not be mounted, so its use is not tested";
+        }
+    }
+    bench.finish(bench.tool->beginPartitionMapRepairForDisk(reference));
+    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.listener.message;
+    bench.finish(bench.tool->beginPartitionMapVerifyForDisk(reference));
+    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
+    test::runTool({"partx", "-d", device.name()});
+    const Bytes after = disk.bytes();
+    EXPECT_TRUE(std::equal(after.begin(), after.begin() + 34 * 512, sound.begin()));
+}
+
+}  // namespace
