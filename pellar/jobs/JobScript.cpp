@@ -4,6 +4,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
+#include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
@@ -11,8 +12,6 @@
 #include "pellar/volumes/LogReplay.h"
 #include "pellar/volumes/SignatureProbe.h"
 
-#include <cerrno>
-#include <cstring>
 #include <utility>
 
 namespace pellar {
@@ -26,41 +25,6 @@ constexpr double lookShare = 30;
 Outcome failure(fixwell::ErrorCode code, Sentence reason)
 {
     return {Verdict::Failed, code, 0, std::move(reason)};
-}
-
-bool isMissingRight(int error)
-{
-    return error == EPERM || error == EACCES;
-}
-
-std::string textOf(int error)
-{
-    return ::strerrordesc_np(error);
-}
-
-Judgement notAttached(const Tool& tool, int error)
-{
-    const std::string name(tool.name());
-    const Sentence reason =
-        isMissingRight(error)
-            ? Sentence{"%1$@ needs the volume as a disk of its own, which only an administrator "
-                       "may make of a part of an image",
-                       name,
-                       {}}
-            : Sentence{"the volume could not be made a disk of its own for %1$@: %2$@", name,
-                       textOf(error)};
-    return {Verdict::Failed, fixwell::kPLErrorCannotOpen, error, reason};
-}
-
-Outcome notReplayed(int error)
-{
-    const Sentence reason =
-        isMissingRight(error)
-            ? Sentence{"its log has to be replayed by mounting it, which only an administrator may",
-                       {},
-                       {}}
-            : Sentence{"its log could not be replayed by mounting it: %1$@", textOf(error), {}};
-    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, error, reason};
 }
 
 }  // namespace
@@ -136,6 +100,8 @@ void JobScript::giveDiskBack()
 
 JobScript::State JobScript::examine()
 {
+    if (const auto objection = objectionToJob())
+        return end(*objection);
     if (const auto refusal = takeDisk())
         return end(*refusal);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
@@ -154,6 +120,16 @@ JobScript::State JobScript::examine()
     if (operation_ == Operation::Verify)
         return State::Verifying;
     return tool_->habits().isLookedAtBeforeRepair ? State::Looking : State::Repairing;
+}
+
+/// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
+std::optional<Outcome> JobScript::objectionToJob() const
+{
+    if (disk_->filesystem.empty())
+        return std::nullopt;
+    const Capability capability = capabilityFor(disk_->filesystem, operation_, options_.toolPath);
+    return capability.isGiven() ? std::nullopt
+                                : std::optional(failure(capability.error, capability.reason));
 }
 
 /// Why no tool may run; none when one may.
@@ -184,10 +160,8 @@ std::optional<Outcome> JobScript::objection() const
 /// What is there is named, where it is something.
 Outcome JobScript::withoutTool() const
 {
-    std::string type = disk_->filesystem;
-    if (type.empty())
-        type =
-            probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
+    const std::string type =
+        probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
     if (type.empty())
         return failure(fixwell::kPLErrorUnsupported,
                        {"no file system was found that can be checked", {}, {}});

@@ -89,6 +89,12 @@ bool ToolRun::isUnstoppable() const
     return access_ == Access::ReadWrite && !tool_.habits().endsInOrder;
 }
 
+/// The verification before the repair has shown them.
+bool ToolRun::areProblemsKnown() const
+{
+    return access_ == Access::ReadWrite && tool_.habits().isLookedAtBeforeRepair;
+}
+
 void ToolRun::stopAsked()
 {
     if (isUnstoppable())
@@ -106,7 +112,9 @@ void ToolRun::tellToolLines()
         const std::string text = withDiskName(line.text, log.diskName());
         switch (line.kind) {
             case ToolLine::Kind::Phase: log.step(stepType(), log.text(line.phaseKey)); break;
-            case ToolLine::Kind::Problem: log.problem(text); break;
+            case ToolLine::Kind::Problem:
+                areProblemsKnown() ? log.detail(text) : log.problem(text);
+                break;
             case ToolLine::Kind::Detail: log.detail(text); break;
             case ToolLine::Kind::Progress: log.progress(line.percent); break;
         }

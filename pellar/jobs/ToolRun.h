@@ -33,6 +33,7 @@ public:
 private:
     RunRequest requestFor(const DiskForTool& disk) const;
     bool isUnstoppable() const;
+    bool areProblemsKnown() const;
     void tellEndOf(const RunResult& result);
     void tellToolLines();
     fixwell::Name stepType() const;

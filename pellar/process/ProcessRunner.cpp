@@ -11,6 +11,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <utility>
 
 namespace pellar {
 namespace {
@@ -154,9 +155,10 @@ private:
             return;
         stop_.rest();
         cause_ = StopCause::User;
-        listener_.stopAsked();
         if (stop_.isHard())
             send(ladder_.pressHard(Clock::now()));
+        if (!std::exchange(isStopTold_, true))
+            listener_.stopAsked();
         for (; heededPresses_ < stop_.presses(); ++heededPresses_)
             send(ladder_.press(Clock::now()));
     }
@@ -166,7 +168,8 @@ private:
         if (ladder_.isStopping())
             return;
         cause_ = cause;
-        send(ladder_.press(Clock::now()));
+        // One that ignores being asked has no more time than when the program is leaving.
+        send(request_.ignoresStops ? ladder_.pressHard(Clock::now()) : ladder_.press(Clock::now()));
     }
 
     void send(int signal)
@@ -195,6 +198,7 @@ private:
     Clock::time_point lastHeard_ = Clock::now();
     bool isHeard_ = false;  ///< something was told since the last pause
     bool isLimitTold_ = false;
+    bool isStopTold_ = false;
     bool hasEnded_ = false;
     std::array<char, 65536> buffer_;
 };

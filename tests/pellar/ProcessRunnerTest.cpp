@@ -222,6 +222,19 @@ TEST(ProcessRunner, LetsAWriterComeToItsEndThatWouldBreakOff)
     expectNoChildren();
 }
 
+TEST(ProcessRunner, EndsAWriterThatIgnoresStopsAndPrintsWithoutEnd)
+{
+    Runner runner;
+    runner.request.access = Access::ReadWrite;
+    runner.request.ignoresStops = true;
+    runner.request.limits = {100, 10000};
+    runner.request.graceTimes = {24h, 24h, 50ms};
+    const RunResult result = runner.run("flood-lines");
+    EXPECT_EQ(result.ending, Ending(Killed{SIGKILL}));
+    EXPECT_EQ(result.cause, StopCause::TooMuchOutput);
+    EXPECT_EQ(runner.lines.limits, 1);
+}
+
 TEST(ProcessRunner, DoesNotStartWhatIsAlreadyStopped)
 {
     Runner runner;

@@ -122,9 +122,14 @@ std::optional<PartitionTable> readPartitionTable(int descriptor)
 // ext4(5) and mke2fs(8): the first backup stands at the start of group 1, which is 8193 blocks of
 // 1 KiB, 16384 of 2 KiB or 32768 of 4 KiB from the start. The magic number 0xEF53 lies 56 bytes
 // into the superblock, its group's number (here 1) 90 bytes into it.
-bool mayBeBootSector(const PartitionTable& table, const Superblock& superblock)
+bool isBootSector(int descriptor, const PartitionTable& table, const Superblock& superblock)
 {
-    return table.type == "dos" && table.partitions.empty() && superblock.isFilesystem();
+    if (table.type != "dos" || !table.partitions.empty())
+        return false;
+    // The maker's name of NTFS and exFAT, and where FAT has its own.
+    return superblock.isFilesystem() || hasBytes(descriptor, 3, "NTFS    ") ||
+           hasBytes(descriptor, 3, "EXFAT   ") || hasBytes(descriptor, 54, "FAT1") ||
+           hasBytes(descriptor, 82, "FAT32   ");
 }
 
 bool hasExtBackupSuperblock(int descriptor, ByteRange range)

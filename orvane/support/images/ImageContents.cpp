@@ -79,7 +79,7 @@ ImageContents readContents(const OpenImage& image)
     const auto table = readPartitionTable(image.descriptor.get());
     const bool isUnknown = contents.whole.filesystem().empty();
     contents.hasPartitionMap =
-        (table && !mayBeBootSector(*table, contents.whole.superblock)) ||
+        (table && !isBootSector(image.descriptor.get(), *table, contents.whole.superblock)) ||
         (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
     for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
         contents.partitions.push_back(readVolume(image, partition));
