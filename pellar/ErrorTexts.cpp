@@ -32,8 +32,7 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},
     ErrorText{fixwell::kPLErrorToolMissing,
-              "The checking tool for this file system is not installed (for ext2, ext3 and ext4: "
-              "package e2fsprogs)."},
+              "The checking tool for this file system is not installed."},
     ErrorText{fixwell::kPLErrorToolFailed, "The checking tool failed."},
     ErrorText{kPLErrorNoReferences,
               "It is not known here what permissions the installed files should have."},

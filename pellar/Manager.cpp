@@ -40,9 +40,11 @@ std::string Manager::reasonAgainst(std::string_view filesystemType, Operation op
 std::string Manager::reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const
 {
     const PartitionMap map = glanceAtMap(disk);
-    return map.kind == PartitionMap::Kind::None
-               ? outcomeOfMapVerification(map, reportOn(map)).reason.in(texts_)
-               : std::string();
+    // What this user may not read is looked at when the job has the right to.
+    const bool isUnknown = !map.boot.isReadable && options_.privileged;
+    if (isUnknown || map.kind != PartitionMap::Kind::None)
+        return {};
+    return outcomeOfMapVerification(map, reportOn(map)).reason.in(texts_);
 }
 
 }  // namespace pellar

@@ -11,6 +11,7 @@
 #include "pellar/tools/ToolTable.h"
 
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <utility>
@@ -25,6 +26,18 @@ using fixwell::ErrorCode;
 bool isVolume(const DiskReferencePointer& disk)
 {
     return disk && !disk->path.empty() && !disk->isWhole;
+}
+
+/// Whether a device may be neither opened as the operation must, nor unmounted, by this user.
+bool needsPrivileges(const fixwell::DiskReference& disk, Operation operation,
+                     const SystemPaths& paths)
+{
+    struct stat status = {};
+    if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
+        return false;
+    const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
+    return ::access(disk.path.c_str(), wanted) != 0 ||
+           !mountPlacesOf(status.st_rdev, paths).empty();
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -75,7 +88,11 @@ ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer&
 bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
 {
     const bool isDisk = disk && !disk->path.empty() && disk->isWhole;
-    return answer(isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None, error);
+    // What this user may not read is looked at when the job has the right to.
+    const bool isUnknown = isDisk && options_.privileged &&
+                           needsPrivileges(*disk, Operation::Verify, options_.systemPaths);
+    return answer(isUnknown || (isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None),
+                  error);
 }
 
 bool RepairDisk::canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer& disk,
@@ -100,12 +117,26 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
 {
     if (const ErrorCode error = refusal(disk, operation))
         return error;
+    if (beginPrivileged(disk, operation))
+        return fixwell::kPLNoError;
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
-    start({disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    startVolume(
+        {disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
+}
+
+/// NO when the job needs nobody's help, or there is none.
+bool RepairDisk::beginPrivileged(const DiskReferencePointer& disk, Operation operation)
+{
+    if (!options_.privileged || !needsPrivileges(*disk, operation, options_.systemPaths))
+        return false;
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return options_.privileged(*disk, operation, stop, road);
+    });
+    return true;
 }
 
 // Unmounting may take long, so it is the job's. What the system itself runs from is not tried.
@@ -123,8 +154,18 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
                                     [](const MountPlace& place) { return place.target == "/"; });
     if (mounts.empty() || isRoot)
         return error;
-    start({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
+}
+
+// A script maker can be copied, a claim cannot.
+void RepairDisk::startVolume(JobRequest request)
+{
+    const auto disk = request.disk;
+    const auto shared = std::make_shared<JobRequest>(std::move(request));
+    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+    });
 }
 
 // The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
@@ -137,7 +178,9 @@ ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operat
         return fixwell::kPLErrorNoDiskReference;
     if (!disk->isWhole)
         return fixwell::kPLErrorUnsupported;
-    run(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+    if (beginPrivileged(disk, operation))
+        return fixwell::kPLNoError;
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
     });
     return fixwell::kPLNoError;
@@ -180,19 +223,10 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
         options_.commandTrace(
             fixwell::printable(disk->filesystem) + ": " +
             (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
-    return capability.error;
+    return fixwell::kPLNoError;  // the job itself says why there is no way
 }
 
-void RepairDisk::start(JobRequest request)
-{
-    // A script maker can be copied, a claim cannot.
-    const auto kept = std::make_shared<JobRequest>(std::move(request));
-    run(kept->disk, [this, kept](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<JobScript>(std::move(*kept), options_, texts_, stop, road);
-    });
-}
-
-void RepairDisk::run(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
+void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
     EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
                                job_.reset();

@@ -51,8 +51,9 @@ private:
                                         Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
-    void start(JobRequest request);
-    void run(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
+    bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);
+    void startVolume(JobRequest request);
+    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;
     const Texts& texts_;

@@ -3,6 +3,7 @@
 
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/WindowState.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "pellar/ErrorTexts.h"
 
 #include <QFile>
@@ -91,14 +92,8 @@ SupportOptions DesktopSession::supportOptions()
 
 pellar::ManagerOptions DesktopSession::libraryOptions() const
 {
-    pellar::ManagerOptions options;
+    pellar::ManagerOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
     options.outputLimits = options_.outputLimits;
-    if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
-        options.toolPath = *path;
-    if (!options_.paths.state.empty()) {
-        options.savedSectorsDirectory = options_.paths.state / "partition-maps";
-        options.permissionReferences = options_.paths.state / "permissions";
-    }
     return options;
 }
 

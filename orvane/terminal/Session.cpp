@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
@@ -81,13 +82,7 @@ SupportOptions Session::supportOptions(const Request& request)
 
 pellar::ManagerOptions Session::libraryOptions(const Request& request)
 {
-    pellar::ManagerOptions options;
-    if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
-        options.toolPath = *path;
-    if (const auto state = userXDGPaths().state; !state.empty()) {
-        options.savedSectorsDirectory = state / "partition-maps";
-        options.permissionReferences = state / "permissions";
-    }
+    pellar::ManagerOptions options = orvane::libraryOptions(userXDGPaths(), libraryTexts_);
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));

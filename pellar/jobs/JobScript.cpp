@@ -1,10 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobScript.h"
 
+#include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
+#include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/ToolRun.h"
+#include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
+#include "pellar/volumes/DiskForTool.h"
+#include "pellar/volumes/LogReplay.h"
+#include "pellar/volumes/SignatureProbe.h"
 
 #include <utility>
 
@@ -13,6 +19,8 @@ namespace {
 
 /// The share of the progress that a repair takes; the verification behind it takes the rest.
 constexpr double repairShare = 60;
+/// And that of the verification before it.
+constexpr double lookShare = 30;
 
 Outcome failure(fixwell::ErrorCode code, Sentence reason)
 {
@@ -51,6 +59,8 @@ JobScript::State JobScript::next(State state)
     switch (state) {
         case State::Examining: return examine();
         case State::Verifying: return verify();
+        case State::Looking: return look();
+        case State::Replaying: return replay();
         case State::Repairing: return repair();
         case State::Confirming: return confirm();
         case State::Done: break;
@@ -90,19 +100,36 @@ void JobScript::giveDiskBack()
 
 JobScript::State JobScript::examine()
 {
+    if (const auto objection = objectionToJob())
+        return end(*objection);
     if (const auto refusal = takeDisk())
         return end(*refusal);
-    if (tool_ == nullptr)
+    // Only where nothing is known: what is listed as something else may hold the remains of a file
+    // system that was there before.
+    if (tool_ == nullptr && disk_->filesystem.empty())
         tool_ = findTool();
     if (tool_ != nullptr) {
         program_ = findProgram(tool_->name(), options_.toolPath);
+        repairProgram_ = findProgram(tool_->repairName(), options_.toolPath);
         volume_ = factsFor(*tool_);
     }
     if (const auto objection = this->objection())
         return end(*objection);
     if (const auto objection = objectionToSize())
         return end(*objection);
-    return operation_ == Operation::Verify ? State::Verifying : State::Repairing;
+    if (operation_ == Operation::Verify)
+        return State::Verifying;
+    return tool_->habits().isLookedAtBeforeRepair ? State::Looking : State::Repairing;
+}
+
+/// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
+std::optional<Outcome> JobScript::objectionToJob() const
+{
+    if (disk_->filesystem.empty())
+        return std::nullopt;
+    const Capability capability = capabilityFor(disk_->filesystem, operation_, options_.toolPath);
+    return capability.isGiven() ? std::nullopt
+                                : std::optional(failure(capability.error, capability.reason));
 }
 
 /// Why no tool may run; none when one may.
@@ -116,16 +143,35 @@ std::optional<Outcome> JobScript::objection() const
                         std::to_string(available),
                         {}});
     if (tool_ == nullptr)
-        return failure(fixwell::kPLErrorUnsupported,
-                       {"no file system was found that can be checked", {}, {}});
+        return withoutTool();
+    if (operation_ == Operation::Repair && !tool_->canRepair())
+        return failure(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair());
     if (volume_.isForeign)
         return failure(fixwell::kPLErrorUnsupported,
                        {"it holds something other than the file system it is listed with", {}, {}});
-    if (program_.empty())
+    if (program_.empty() || (operation_ == Operation::Repair && repairProgram_.empty()))
         return failure(fixwell::kPLErrorToolMissing,
-                       {"%1$@ is not installed (package %2$@)", std::string(tool_->name()),
+                       {"%1$@ is not installed (package %2$@)",
+                        std::string(program_.empty() ? tool_->name() : tool_->repairName()),
                         std::string(tool_->package())});
     return std::nullopt;
+}
+
+/// What is there is named, where it is something.
+Outcome JobScript::withoutTool() const
+{
+    const std::string type =
+        probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
+    if (type.empty())
+        return failure(fixwell::kPLErrorUnsupported,
+                       {"no file system was found that can be checked", {}, {}});
+    const Capability capability = capabilityFor(type, operation_, options_.toolPath);
+    return failure(fixwell::kPLErrorUnsupported,
+                   capability.isGiven()
+                       ? Sentence{"its file system looks like “%1$@”, but too little of it is left",
+                                  fixwell::printable(type),
+                                  {}}
+                       : capability.reason);
 }
 
 /// A tool that repairs a volume whose end is missing throws away what it cannot reach.
@@ -153,13 +199,47 @@ JobScript::State JobScript::verify()
     return end(outcomeOfVerification(judgement));
 }
 
+/// A sound volume is not written to, and what is not known to be damaged is not repaired.
+JobScript::State JobScript::look()
+{
+    log_.meter().setRange(0, lookShare);
+    const RunEvidence evidence = runOnce(Access::ReadOnly);
+    const Judgement judgement = judge(evidence);
+    const bool waitsForReplay = judgement.verdict == Verdict::Inconclusive &&
+                                evidence.findings.skippedJournal &&
+                                !tool_->habits().logReplayedAs.empty();
+    if (waitsForReplay)
+        return State::Replaying;
+    return judgement.verdict == Verdict::Damaged ? State::Repairing
+                                                 : end(outcomeOfVerification(judgement));
+}
+
+JobScript::State JobScript::replay()
+{
+    log_.step(fixwell::kFsckRepair, texts_.text("Replaying the log by mounting the volume"));
+    const std::string filesystem(tool_->habits().logReplayedAs);
+    log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
+    road_.flush();
+    const auto disk =
+        DiskForTool::prepare(*claim_, DiskForTool::Form::BlockDevice, Access::ReadWrite);
+    const int* const prepareError = std::get_if<int>(&disk);
+    const int error = prepareError != nullptr
+                          ? *prepareError
+                          : replayLog(filesystem, std::get<DiskForTool>(disk).descriptor());
+    if (error != 0)
+        return end(notReplayed(error));
+    passes_.push_back({{Verdict::Inconclusive, fixwell::kPLErrorInconclusive, 0, {}, true}, true});
+    return State::Confirming;
+}
+
 JobScript::State JobScript::repair()
 {
-    log_.meter().setRange(0, repairShare);
+    log_.meter().setRange(passes_.empty() && tool_->habits().isLookedAtBeforeRepair ? lookShare : 0,
+                          repairShare);
     const RunEvidence evidence = runOnce(Access::ReadWrite);
     const Judgement judgement = judge(evidence);
-    passes_.push_back(
-        {judgement, evidence.findings.replayedJournal, evidence.findings.problems > 0});
+    passes_.push_back({judgement, evidence.findings.replayedJournal,
+                       evidence.findings.problems > 0 || tool_->habits().isLookedAtBeforeRepair});
     // The disk went away, or the user did not want more: nothing is left to be confirmed.
     const bool isOver = judgement.verdict == Verdict::Stopped ||
                         judgement.code == fixwell::kPLErrorDiskChanged ||
@@ -204,14 +284,22 @@ VolumeFacts JobScript::factsFor(const Tool& tool) const
 RunEvidence JobScript::runOnce(Access access)
 {
     volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
-    ToolRun run(*tool_, program_, access, {options_, log_, road_, stop_});
-    return run.run(*claim_, volume_);
+    const auto form =
+        tool_->habits().takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
+    const auto disk = DiskForTool::prepare(*claim_, form, access);
+    if (const int* const error = std::get_if<int>(&disk)) {
+        obstacle_ = notAttached(*tool_, *error);
+        return {access, {NotStarted{*error}}, {}, volume_};
+    }
+    ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access,
+                {options_, log_, road_, stop_});
+    return run.run(std::get<DiskForTool>(disk), volume_);
 }
 
 // What was found on a disk that then went away is no answer about the disk that is left.
 Judgement JobScript::judge(const RunEvidence& evidence) const
 {
-    Judgement judgement = tool_->judge(evidence);
+    Judgement judgement = obstacle_ ? *obstacle_ : tool_->judge(evidence);
     if (judgement.verdict == Verdict::Stopped)
         return judgement;
     const auto lost = [&judgement](std::string_view reason) {

@@ -27,7 +27,11 @@ struct JobRequest {
 /// What a job does, from the claimed disk to the verdict, on the thread that calls `run`:
 ///
 ///     Examining ─→ Verifying ──────────────→ Done
-///              └─→ Repairing ⇄ Confirming ─→ Done
+///              ├─→ Repairing ⇄ Confirming ─→ Done
+///              └─→ Looking ─→ Repairing, or ─→ Replaying ─→ Confirming, or ─→ Done
+///
+/// Looking verifies before a repair, for tools that need it; Replaying brings a log to its place
+/// by mounting.
 ///
 /// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
 /// tells *started* once, first, and *finished* once, last. The references outlive it.
@@ -39,11 +43,13 @@ public:
     void run() override;
 
 private:
-    enum class State { Examining, Verifying, Repairing, Confirming, Done };
+    enum class State { Examining, Verifying, Looking, Replaying, Repairing, Confirming, Done };
 
     State next(State state);
     State examine();
     State verify();
+    State look();
+    State replay();
     State repair();
     State confirm();
     State end(Outcome outcome);
@@ -51,9 +57,11 @@ private:
     std::optional<Outcome> takeDisk();
     void giveDiskBack();
     const Tool* findTool() const;
+    std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToSize();
     VolumeFacts factsFor(const Tool& tool) const;
+    Outcome withoutTool() const;
     RunEvidence runOnce(Access access);
     Judgement judge(const RunEvidence& evidence) const;
     void report();
@@ -71,7 +79,9 @@ private:
     JobLog log_;
 
     std::filesystem::path program_;
+    std::filesystem::path repairProgram_;
     VolumeFacts volume_;
+    std::optional<Judgement> obstacle_;  ///< why the last run could not even be prepared
     std::vector<RepairPass> passes_;
     Outcome outcome_;
 };

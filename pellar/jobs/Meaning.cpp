@@ -20,10 +20,14 @@ std::vector<std::string_view> meaningOf(Damage damage)
         sentences.push_back(
             "Some files or directories are damaged; a repair may have to cut or clear them. Copy "
             "what matters before it.");
+    if (damage.has(Damage::Unfinished))
+        sentences.push_back(
+            "The volume was not properly unmounted; what was being written then may be "
+            "incomplete.");
     if (damage.has(Damage::LostPlaces))
         sentences.push_back(
             "Files or directories have lost their names or places; a repair collects what is left "
-            "of them in the folder lost+found.");
+            "of them under new names, in the folder lost+found where there is one.");
     return sentences;
 }
 

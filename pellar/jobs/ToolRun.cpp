@@ -18,12 +18,12 @@ ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access,
 {
 }
 
-RunEvidence ToolRun::run(const DiskClaim& disk, const VolumeFacts& volume)
+RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 {
     JobLog& log = surroundings_.log;
     const RunRequest request = requestFor(disk);
     log.trace("run: " + shown(request.command));
-    log.step(stepType(), log.text(Sentence{"Running %1$@ on “%2$@”", std::string(tool_.name()),
+    log.step(stepType(), log.text(Sentence{"Running %1$@ on “%2$@”", program_.filename().string(),
                                            log.diskName()}));
     surroundings_.road.flush();
     const RunResult result = runTool(request, surroundings_.stop, *this);
@@ -34,15 +34,17 @@ RunEvidence ToolRun::run(const DiskClaim& disk, const VolumeFacts& volume)
     return {access_, result, reader_->findings(), volume};
 }
 
-RunRequest ToolRun::requestFor(const DiskClaim& disk) const
+RunRequest ToolRun::requestFor(const DiskForTool& disk) const
 {
     RunRequest request;
+    request.wantsTerminal = tool_.habits().wantsTerminal;
+    request.ignoresStops = isUnstoppable();
     request.command = {program_, tool_.arguments(access_, diskArgumentOfTool(), disk.offset())};
     request.access = access_;
     request.disk = disk.descriptor();
     request.limits = surroundings_.options.outputLimits;
     request.silenceLimit = surroundings_.options.silenceLimit;
-    request.graceTimes = graceTimesFor(access_);
+    request.graceTimes = isUnstoppable() ? graceTimesOfUnstoppable() : graceTimesFor(access_);
     return request;
 }
 
@@ -52,11 +54,11 @@ void ToolRun::tellEndOf(const RunResult& result)
     if (result.cause == StopCause::TooMuchOutput)
         log.failure(log.text(
             Sentence{"%1$@ printed more than a check can need; it was ended and the rest is cut",
-                     std::string(tool_.name()),
+                     program_.filename().string(),
                      {}}));
     else if (result.cause == StopCause::Silence)
         log.failure(log.text(Sentence{"%1$@ gave no sign of life for too long; it was ended",
-                                      std::string(tool_.name()),
+                                      program_.filename().string(),
                                       {}}));
 }
 
@@ -78,8 +80,29 @@ void ToolRun::lineLimitReached()
 {
     surroundings_.log.failure(surroundings_.log.text(
         Sentence{"%1$@ prints very much; the repair goes on, but no more lines are shown",
-                 std::string(tool_.name()),
+                 program_.filename().string(),
                  {}}));
+}
+
+bool ToolRun::isUnstoppable() const
+{
+    return access_ == Access::ReadWrite && !tool_.habits().endsInOrder;
+}
+
+/// The verification before the repair has shown them.
+bool ToolRun::areProblemsKnown() const
+{
+    return access_ == Access::ReadWrite && tool_.habits().isLookedAtBeforeRepair;
+}
+
+void ToolRun::stopAsked()
+{
+    if (isUnstoppable())
+        surroundings_.log.remark(surroundings_.log.text(
+            Sentence{"%1$@ is writing and cannot be interrupted without damage; the run is let "
+                     "come to its end",
+                     program_.filename().string(),
+                     {}}));
 }
 
 void ToolRun::tellToolLines()
@@ -89,8 +112,11 @@ void ToolRun::tellToolLines()
         const std::string text = withDiskName(line.text, log.diskName());
         switch (line.kind) {
             case ToolLine::Kind::Phase: log.step(stepType(), log.text(line.phaseKey)); break;
-            case ToolLine::Kind::Problem: log.problem(text); break;
+            case ToolLine::Kind::Problem:
+                areProblemsKnown() ? log.detail(text) : log.problem(text);
+                break;
             case ToolLine::Kind::Detail: log.detail(text); break;
+            case ToolLine::Kind::Progress: log.progress(line.percent); break;
         }
     }
     lines_.clear();

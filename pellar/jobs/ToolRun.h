@@ -4,7 +4,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/tools/Tool.h"
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/volumes/DiskForTool.h"
 
 #include <filesystem>
 #include <memory>
@@ -28,10 +28,12 @@ public:
             RunSurroundings surroundings);
 
     /// Runs the tool to its end. `volume` is what was seen of the disk before.
-    [[nodiscard]] RunEvidence run(const DiskClaim& disk, const VolumeFacts& volume);
+    [[nodiscard]] RunEvidence run(const DiskForTool& disk, const VolumeFacts& volume);
 
 private:
-    RunRequest requestFor(const DiskClaim& disk) const;
+    RunRequest requestFor(const DiskForTool& disk) const;
+    bool isUnstoppable() const;
+    bool areProblemsKnown() const;
     void tellEndOf(const RunResult& result);
     void tellToolLines();
     fixwell::Name stepType() const;
@@ -39,6 +41,7 @@ private:
     void line(std::string_view line, bool isCut) override;
     void progressLine(std::string_view line) override;
     void lineLimitReached() override;
+    void stopAsked() override;
     void pause() override { surroundings_.road.flush(); }
     void tick() override { surroundings_.road.flushIfDue(); }
 

@@ -22,9 +22,9 @@ bool hasSignature(const Bytes& sector)
 
 std::uint32_t checksumOf(const Bytes& sector, std::uint64_t headerBytes)
 {
-    Bytes header(sector.begin(), sector.begin() + static_cast<std::ptrdiff_t>(headerBytes));
+    Bytes header = sector;
     putLittleEndian(header, 16, 4, 0);
-    return crc32(header);
+    return crc32(ByteView(header).first(headerBytes));
 }
 
 bool hasRightChecksum(const Bytes& sector)

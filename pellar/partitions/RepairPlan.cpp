@@ -2,8 +2,10 @@
 #include "pellar/partitions/RepairPlan.h"
 
 #include <algorithm>
+#include <array>
 #include <limits>
 #include <optional>
+#include <utility>
 
 namespace pellar {
 namespace {

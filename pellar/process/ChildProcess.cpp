@@ -29,6 +29,7 @@ struct Preparation {
     std::string executable;
     pid_t parent = 0;
     Access access = Access::ReadOnly;
+    bool ignoresStops = false;
 };
 
 /// Above the numbers that the child hands out, so no duplication overwrites another.
@@ -52,6 +53,7 @@ Preparation prepare(const Command& command, const ChildStreams& streams, int fai
     ready.name = command.executable.filename().string();
     ready.parent = ::getpid();
     ready.access = streams.access;
+    ready.ignoresStops = streams.ignoresStops;
     return ready;
 }
 
@@ -98,6 +100,11 @@ bool place(const FileDescriptor& source, int number)
     resetSignals();
     if (writes)
         ::signal(SIGPIPE, SIG_IGN);
+    // What is ignored stays so across the exec (execve(2)).
+    if (ready.ignoresStops) {
+        ::signal(SIGINT, SIG_IGN);
+        ::signal(SIGTERM, SIG_IGN);
+    }
     const bool isPlaced = place(ready.input, STDIN_FILENO) && place(ready.output, STDOUT_FILENO) &&
                           place(ready.output, STDERR_FILENO) &&
                           place(ready.disk, diskDescriptorOfTool) &&

@@ -24,6 +24,8 @@ struct ChildStreams {
     /// A program that writes to a disk is asked to end when the host dies, and may go on printing
     /// to nobody until it has come to a good place; any other is killed.
     Access access = Access::ReadOnly;
+    /// Starts with SIGINT and SIGTERM ignored: nothing but SIGKILL ends it before its time.
+    bool ignoresStops = false;
 };
 
 /// A running program, or one that has ended and was not reaped yet. Destroying it kills and

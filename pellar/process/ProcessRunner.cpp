@@ -3,6 +3,7 @@
 
 #include "pellar/process/ChildProcess.h"
 #include "pellar/process/LineSplitter.h"
+#include "pellar/process/PseudoTerminal.h"
 
 #include <poll.h>
 #include <unistd.h>
@@ -10,6 +11,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <utility>
 
 namespace pellar {
 namespace {
@@ -98,16 +100,15 @@ private:
         return static_cast<int>(std::clamp<std::int64_t>(left.count(), 0, 60'000));
     }
 
-    /// NO when there is nothing more to be had for now.
-    bool read(FileDescriptor& descriptor, LineSplitter& lines, bool isOutput)
+    /// The number of bytes; 0 when there is nothing more to be had for now.
+    std::size_t read(FileDescriptor& descriptor, LineSplitter& lines, bool isOutput)
     {
         const ssize_t count = ::read(descriptor.get(), buffer_.data(), buffer_.size());
-        if (count < 0)
-            return false;
-        if (count == 0) {
-            descriptor.reset();  // every writer is gone; poll(2) skips the empty place
-            return false;
-        }
+        // Every writer is gone, which a terminal says with EIO; poll(2) skips the empty place.
+        if (count == 0 || (count < 0 && errno == EIO))
+            descriptor.reset();
+        if (count <= 0)
+            return 0;
         isHeard_ = true;
         lastHeard_ = Clock::now();
         if (isOutput)
@@ -115,18 +116,25 @@ private:
         lines.take({buffer_.data(), static_cast<std::size_t>(count)});
         if (budget_.state() == OutputBudget::State::Spent)
             endFor(StopCause::TooMuchOutput);
-        return true;
+        return static_cast<std::size_t>(count);
     }
 
     /// What the child left behind. A grandchild may still hold the pipes and print without end,
     /// so no more is read than a pipe can hold (1 MiB, pipe(7)).
     void drain()
     {
-        for (int i = 0; i < 16 && output_.readEnd && read(output_.readEnd, outputLines_, true);
-             ++i) {
-        }
-        for (int i = 0;
-             i < 16 && progress_.readEnd && read(progress_.readEnd, progressLines_, false); ++i) {
+        drain(output_.readEnd, outputLines_, true);
+        drain(progress_.readEnd, progressLines_, false);
+    }
+
+    void drain(FileDescriptor& descriptor, LineSplitter& lines, bool isOutput)
+    {
+        std::size_t left = 1U << 20U;
+        while (descriptor && left > 0) {
+            const std::size_t count = read(descriptor, lines, isOutput);
+            if (count == 0)
+                return;
+            left -= std::min(left, count);
         }
     }
 
@@ -149,6 +157,8 @@ private:
         cause_ = StopCause::User;
         if (stop_.isHard())
             send(ladder_.pressHard(Clock::now()));
+        if (!std::exchange(isStopTold_, true))
+            listener_.stopAsked();
         for (; heededPresses_ < stop_.presses(); ++heededPresses_)
             send(ladder_.press(Clock::now()));
     }
@@ -158,7 +168,8 @@ private:
         if (ladder_.isStopping())
             return;
         cause_ = cause;
-        send(ladder_.press(Clock::now()));
+        // One that ignores being asked has no more time than when the program is leaving.
+        send(request_.ignoresStops ? ladder_.pressHard(Clock::now()) : ladder_.press(Clock::now()));
     }
 
     void send(int signal)
@@ -187,9 +198,18 @@ private:
     Clock::time_point lastHeard_ = Clock::now();
     bool isHeard_ = false;  ///< something was told since the last pause
     bool isLimitTold_ = false;
+    bool isStopTold_ = false;
     bool hasEnded_ = false;
     std::array<char, 65536> buffer_;
 };
+
+std::optional<Pipe> makeOutput(const RunRequest& request)
+{
+    std::optional<Pipe> terminal;
+    if (request.wantsTerminal)
+        terminal = makePseudoTerminal();
+    return terminal ? std::move(terminal) : makePipe();
+}
 
 }  // namespace
 
@@ -197,12 +217,13 @@ RunResult runTool(const RunRequest& request, StopSwitch& stop, RunListener& list
 {
     if (stop.isPressed())
         return {NotStarted{ECANCELED}, StopCause::User};
-    std::optional<Pipe> output = makePipe();
+    std::optional<Pipe> output = makeOutput(request);
     std::optional<Pipe> progress = makePipe();
     if (!output || !progress)
         return {NotStarted{errno}};
-    auto started = ChildProcess::start(request.command, {output->writeEnd.get(), request.disk,
-                                                         progress->writeEnd.get(), request.access});
+    auto started = ChildProcess::start(
+        request.command, {output->writeEnd.get(), request.disk, progress->writeEnd.get(),
+                          request.access, request.ignoresStops});
     if (const auto* const failure = std::get_if<NotStarted>(&started))
         return {*failure};
     Run run(request, stop, listener, std::move(std::get<ChildProcess>(started)), std::move(*output),

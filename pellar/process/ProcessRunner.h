@@ -30,6 +30,8 @@ public:
     virtual void progressLine(std::string_view line) = 0;
     /// The output limit of a repair is reached: it goes on, its lines are no longer told.
     virtual void lineLimitReached() = 0;
+    /// The user wants it to end.
+    virtual void stopAsked() {}
     /// There is nothing to read for the moment.
     virtual void pause() = 0;
     /// Between two pieces of output, now and then.
@@ -46,6 +48,10 @@ struct RunRequest {
     OutputLimits limits;
     std::chrono::milliseconds silenceLimit{0};  ///< none when 0
     GraceTimes graceTimes;
+    /// It holds its output back unless that is a terminal. A pipe where there are none.
+    bool wantsTerminal = false;
+    /// It would leave the disk half written if it were asked to end.
+    bool ignoresStops = false;
 };
 
 /// A line longer than this is cut.

@@ -13,6 +13,11 @@ GraceTimes graceTimesFor(Access access)
     return access == Access::ReadOnly ? GraceTimes{2s, 2s, 0s} : GraceTimes{10s, 10s, 3s};
 }
 
+GraceTimes graceTimesOfUnstoppable()
+{
+    return {24h, 24h, 30s};
+}
+
 int StopLadder::press(Clock::time_point now)
 {
     switch (step_) {

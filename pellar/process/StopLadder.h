@@ -20,6 +20,9 @@ struct GraceTimes {
 
 /// A tool that writes gets time to leave the disk sound; one that only reads gets little.
 GraceTimes graceTimesFor(Access access);
+/// For a tool that would leave the disk half written: only being asked three times ends it, or the
+/// program's leaving after a long wait.
+GraceTimes graceTimesOfUnstoppable();
 
 /// Which signal ends a tool at which time: SIGINT, then SIGTERM, then SIGKILL. Pure: it is told
 /// the time and answers the signal that is to be sent now, or 0.

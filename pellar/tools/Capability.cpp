@@ -6,27 +6,48 @@
 #include "pellar/tools/ToolTable.h"
 
 namespace pellar {
+namespace {
+
+Capability missing(const Tool& tool, std::string_view name)
+{
+    return {
+        fixwell::kPLErrorToolMissing,
+        {"%1$@ is not installed (package %2$@)", std::string(name), std::string(tool.package())},
+        {}};
+}
+
+/// Some things on a disk are no file system and need no check.
+std::string_view objectionTo(std::string_view filesystemType)
+{
+    if (filesystemType == "swap")
+        return "it is swap space, which holds no files and is never checked";
+    if (filesystemType == "crypto_LUKS" || filesystemType == "BitLocker")
+        return "it is encrypted; unlock it and check what is in it";
+    if (filesystemType == "LVM2_member" || filesystemType == "linux_raid_member")
+        return "it is a part of a volume that is put together from several disks";
+    return "there is no tool for the file system “%1$@”";
+}
+
+}  // namespace
 
 Capability capabilityFor(std::string_view filesystemType, Operation operation,
                          std::string_view toolPath)
 {
     const Tool* const tool = toolFor(filesystemType);
     if (tool == nullptr)
-        return {
-            fixwell::kPLErrorUnsupported,
-            {"there is no tool for the file system “%1$@”", fixwell::printable(filesystemType), {}},
-            {}};
+        return {fixwell::kPLErrorUnsupported,
+                {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
+                {}};
     if (operation == Operation::Repair && !tool->canRepair())
-        return {
-            fixwell::kPLErrorUnsupported,
-            {"%1$@ can verify this file system, but not repair it", std::string(tool->name()), {}},
-            {}};
+        return {fixwell::kPLErrorUnsupported, tool->reasonAgainstRepair(), {}};
+    // A repair is confirmed by verifying, so it needs both.
     std::filesystem::path program = findProgram(tool->name(), toolPath);
     if (program.empty())
-        return {fixwell::kPLErrorToolMissing,
-                {"%1$@ is not installed (package %2$@)", std::string(tool->name()),
-                 std::string(tool->package())},
-                {}};
+        return missing(*tool, tool->name());
+    if (operation == Operation::Repair)
+        program = findProgram(tool->repairName(), toolPath);
+    if (program.empty())
+        return missing(*tool, tool->repairName());
     return {fixwell::kPLNoError, {}, std::move(program)};
 }
 

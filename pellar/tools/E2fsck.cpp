@@ -3,10 +3,9 @@
 
 #include "pellar/process/ChildProcess.h"
 #include "pellar/tools/E2fsckOutput.h"
+#include "pellar/tools/Judging.h"
 #include "pellar/volumes/ExtSuperblock.h"
 #include "pellar/volumes/SignatureProbe.h"
-
-#include <cstring>
 
 namespace pellar {
 namespace {
@@ -19,46 +18,6 @@ constexpr int cancelledByUser = 32;
 constexpr int libraryError = 128;
 constexpr int knownBits =
     1 | 2 | leftErrors | operationalError | usageError | cancelledByUser | libraryError;
-
-Judgement failed(std::int32_t detail, Sentence reason,
-                 fixwell::ErrorCode code = fixwell::kPLErrorToolFailed)
-{
-    return {Verdict::Failed, code, detail, std::move(reason)};
-}
-
-Judgement inconclusive(std::int32_t detail, Sentence reason)
-{
-    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, detail, std::move(reason)};
-}
-
-Judgement damaged(std::int32_t detail, Sentence reason = {})
-{
-    return {Verdict::Damaged, fixwell::kPLErrorDamaged, detail, std::move(reason)};
-}
-
-Judgement stopped(std::int32_t detail)
-{
-    return {Verdict::Stopped, fixwell::kPLErrorCancelled, detail, {}};
-}
-
-bool hasDamage(const RunEvidence& evidence)
-{
-    return evidence.findings.problems > 0 || evidence.findings.hasErrorsLeft ||
-           evidence.volume.isCutShort();
-}
-
-// Ended by us for printing without end, or for silence: what it had found by then stands.
-Judgement judgeEnded(const RunEvidence& evidence)
-{
-    const bool wasSilent = evidence.result.cause == StopCause::Silence;
-    const Sentence reason{wasSilent ? "%1$@ gave no sign of life and was ended"
-                                    : "%1$@ printed without end and was ended",
-                          "e2fsck",
-                          {}};
-    if (hasDamage(evidence))
-        return damaged(0, reason);
-    return failed(0, reason, fixwell::kPLErrorToolMisbehaved);
-}
 
 Judgement judgeStatus(int status, const RunEvidence& evidence)
 {
@@ -157,18 +116,9 @@ std::optional<double> E2fsck::percentOf(std::string_view progressLine) const
 
 Judgement E2fsck::judge(const RunEvidence& evidence) const
 {
-    const Ending& ending = evidence.result.ending;
-    if (evidence.result.cause == StopCause::User)
-        return stopped(0);
-    if (const auto* const notStarted = std::get_if<NotStarted>(&ending))
-        return failed(notStarted->error, {"%1$@ could not be started: %2$@", "e2fsck",
-                                          ::strerrordesc_np(notStarted->error)});
-    if (evidence.result.cause != StopCause::None)
-        return judgeEnded(evidence);
-    if (const auto* const killed = std::get_if<Killed>(&ending))
-        return failed(killed->signal,
-                      {"%1$@ was killed (signal %2$@)", "e2fsck", std::to_string(killed->signal)});
-    const int status = std::get<Exited>(ending).status;
+    if (const auto judgement = judgementOfEnding(evidence, "e2fsck"))
+        return *judgement;
+    const int status = std::get<Exited>(evidence.result.ending).status;
     return evidence.access == Access::ReadOnly ? judgeVerification(status, evidence)
                                                : judgeRepair(status, evidence);
 }

@@ -11,6 +11,14 @@ public:
     std::string_view name() const override { return "e2fsck"; }
     std::string_view package() const override { return "e2fsprogs"; }
     bool canRepair() const override { return true; }
+    ToolHabits habits() const override
+    {
+        return {.takesOffset = true,
+                .wantsTerminal = false,
+                .isLookedAtBeforeRepair = false,
+                .endsInOrder = true,
+                .logReplayedAs = {}};
+    }
 
     VolumeFacts examine(int disk, std::uint64_t offset,
                         std::uint64_t availableBytes) const override;

@@ -18,15 +18,17 @@ namespace pellar {
 /// One line of a tool, told apart.
 struct ToolLine {
     enum class Kind {
-        Phase,    ///< a new step begins
-        Problem,  ///< something is wrong with the disk, or with the check
-        Detail,   ///< anything else
+        Phase,     ///< a new step begins
+        Problem,   ///< something is wrong with the disk, or with the check
+        Detail,    ///< anything else
+        Progress,  ///< how far the run has come, and nothing to be shown as a line
     };
 
     Kind kind = Kind::Detail;
     std::string text;
     /// For a phase that is known: its English text, a literal.
     std::string_view phaseKey;
+    double percent = 0;  ///< of a progress line, of this run
 
     friend bool operator==(const ToolLine&, const ToolLine&) = default;
 };
@@ -42,6 +44,7 @@ struct Findings {
     bool skippedJournal = false;
     bool replayedJournal = false;
     bool lacksExternalJournal = false;
+    bool lacksOtherDisk = false;  ///< a part of the volume is on a disk that was not found
     bool foundDiskInUse = false;
     int crashSignal = 0;  ///< caught by the tool itself; 0 for none
 
@@ -66,6 +69,7 @@ struct VolumeFacts {
     bool hasPrimary = false;    ///< the main superblock is in its place
     bool isForeign = false;     ///< something else claims the place: nothing may be written
     bool needsRecovery = false;
+    bool isMarkedDirty = false;     ///< it says itself that it was not properly unmounted
     std::uint64_t volumeBytes = 0;  ///< 0 when not known
     std::uint64_t availableBytes = 0;
 
@@ -80,17 +84,41 @@ struct RunEvidence {
     VolumeFacts volume;
 };
 
+/// In what tools differ besides the disks that they treat.
+struct ToolHabits {
+    /// It finds a volume inside a larger file or disk when it is told where.
+    bool takesOffset = false;
+    /// It holds its output back unless it writes to a terminal.
+    bool wantsTerminal = true;
+    /// Its repair would write to a sound volume as well, or does not say whether it has changed
+    /// anything: so the volume is verified before.
+    bool isLookedAtBeforeRepair = true;
+    /// Asked to end in the middle of a repair, it leaves the disk in order.
+    bool endsInOrder = false;
+    /// A log that waits is brought to its place by mounting, as this file system; empty: the tool
+    /// does it, or there is no log.
+    std::string_view logReplayedAs;
+};
+
 /// A checking tool: what it can do, how it is called, how it answers. Without state; lives as
 /// long as the process; any thread.
 class Tool {
 public:
     virtual ~Tool() = default;
 
-    /// Of the executable.
+    /// Of the executable that verifies.
     virtual std::string_view name() const = 0;
+    /// Of the executable that repairs.
+    virtual std::string_view repairName() const { return name(); }
     /// The Debian package that brings it.
     virtual std::string_view package() const = 0;
     virtual bool canRepair() const = 0;
+    /// Why not, where it cannot.
+    virtual Sentence reasonAgainstRepair() const
+    {
+        return {"%1$@ can verify this file system, but not repair it", std::string(name()), {}};
+    }
+    virtual ToolHabits habits() const { return {}; }
 
     /// Reads the disk a little; never writes.
     virtual VolumeFacts examine(int disk, std::uint64_t offset,
@@ -99,8 +127,9 @@ public:
     virtual std::vector<std::string> arguments(Access access, const std::string& disk,
                                                std::uint64_t offset) const = 0;
     virtual std::unique_ptr<OutputReader> makeReader() const = 0;
-    /// From 0 to 100, of one run; none when the line is no progress report.
-    virtual std::optional<double> percentOf(std::string_view progressLine) const = 0;
+    /// Of a line from the progress descriptor. From 0 to 100, of one run; none when the line is no
+    /// progress report.
+    virtual std::optional<double> percentOf(std::string_view) const { return std::nullopt; }
     virtual Judgement judge(const RunEvidence& evidence) const = 0;
 };
 

@@ -94,6 +94,13 @@ DiskClaim::DiskClaim(FileDescriptor disk, std::filesystem::path path, std::uint6
     const std::uint64_t size = sizeOf(disk_.get());
     const std::uint64_t rest = size > offset ? size - offset : 0;
     availableBytes_ = length == 0 ? rest : std::min(rest, length);
+    isAllOfIt_ = offset == 0 && availableBytes_ == size;
+}
+
+bool DiskClaim::isBlockDevice() const
+{
+    struct stat status = {};
+    return ::fstat(disk_.get(), &status) == 0 && S_ISBLK(status.st_mode);
 }
 
 bool DiskClaim::isStillInPlace() const

@@ -29,6 +29,10 @@ public:
     /// Bytes that are really there, from `offset` to the end of the region or the file.
     std::uint64_t availableBytes() const { return availableBytes_; }
 
+    /// The volume takes all of the file or device, from its first byte to its last.
+    bool isAllOfIt() const { return isAllOfIt_; }
+    bool isBlockDevice() const;
+
     /// NO when the disk has become shorter since it was claimed, or its end can no longer be read.
     bool isStillWhole() const;
     /// NO when the name no longer leads to the disk that was claimed: an image was deleted, moved
@@ -43,6 +47,7 @@ private:
     std::filesystem::path path_;
     std::uint64_t offset_;
     std::uint64_t availableBytes_;
+    bool isAllOfIt_;
 };
 
 }  // namespace pellar

@@ -1,25 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/volumes/DiskUse.h"
 
+#include "pellar/volumes/KernelFile.h"
+
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 
 #include <algorithm>
-#include <fstream>
-#include <iterator>
 #include <optional>
 #include <string>
 
 namespace pellar {
 namespace {
-
-std::optional<std::string> contentsOf(const std::filesystem::path& path)
-{
-    std::ifstream file(path, std::ios::binary);
-    if (!file)
-        return std::nullopt;
-    return std::string(std::istreambuf_iterator<char>(file), {});
-}
 
 std::string_view takeUntil(std::string_view& text, char end)
 {
@@ -52,7 +44,7 @@ bool mountInfoNames(std::string_view mountInfo, unsigned major, unsigned minor)
 
 bool isMounted(dev_t device, const SystemPaths& paths)
 {
-    const std::optional<std::string> mountInfo = contentsOf(paths.mountInfo);
+    const std::optional<std::string> mountInfo = readKernelFile(paths.mountInfo);
     return !mountInfo || mountInfoNames(*mountInfo, major(device), minor(device));
 }
 
@@ -61,7 +53,7 @@ bool backsLoopDevice(dev_t fileDevice, ino_t fileNumber, const SystemPaths& path
     std::error_code error;
     for (const auto& device : std::filesystem::directory_iterator(paths.blockDevices, error)) {
         // sysfs ends every value with a line feed; the path itself may hold one.
-        std::optional<std::string> file = contentsOf(device.path() / "loop/backing_file");
+        std::optional<std::string> file = readKernelFile(device.path() / "loop/backing_file");
         if (!file || file->empty())
             continue;
         if (file->back() == '\n')

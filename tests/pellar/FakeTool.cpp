@@ -2,9 +2,11 @@
 //
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
-//   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors
+//   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
+//   await-in-repair NAME: until there is such a file beside it, when it was called with -a
 
 #include <fcntl.h>
+#include <sys/ioctl.h>
 #include <unistd.h>
 
 #include <csignal>
@@ -51,6 +53,34 @@ void tellDescriptors()
             put(STDOUT_FILENO, "descriptor " + std::to_string(descriptor) + "\n");
 }
 
+/// Of the standard output, and whether the tool could be reached from a keyboard.
+void tellTerminal()
+{
+    winsize size{};
+    const bool isTerminal = ::isatty(STDOUT_FILENO) == 1;
+    ::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size);
+    put(STDOUT_FILENO, "terminal " + std::to_string(isTerminal) + " input " +
+                           std::to_string(::isatty(STDIN_FILENO)) + " columns " +
+                           std::to_string(size.ws_col) + "\n");
+}
+
+/// The option by which fsck.fat is told to write.
+bool isRepairing()
+{
+    std::ifstream commandLine("/proc/self/cmdline");
+    for (std::string word; std::getline(commandLine, word, '\0');)
+        if (word == "-a")
+            return true;
+    return false;
+}
+
+void awaitInRepair(const std::string& name)
+{
+    const auto self = std::filesystem::read_symlink("/proc/self/exe");
+    while (isRepairing() && !std::filesystem::exists(self.parent_path() / name))
+        ::usleep(5000);
+}
+
 void act(const std::string& action, const std::string& text)
 {
     const int number = std::atoi(text.c_str());
@@ -81,6 +111,10 @@ void act(const std::string& action, const std::string& text)
     else if (action == "environment")
         for (char** entry = environ; *entry != nullptr; ++entry)
             put(STDOUT_FILENO, std::string("environment ") + *entry + "\n");
+    else if (action == "await-in-repair")
+        awaitInRepair(text);
+    else if (action == "terminal")
+        tellTerminal();
     else if (action == "descriptors")
         tellDescriptors();
 }

@@ -4,7 +4,9 @@
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <cerrno>
+#include <utility>
 
 namespace {
 
@@ -152,8 +154,6 @@ TEST(Job, RefusesBeforeItStarts)
             std::make_shared<fixwell::DiskReference>(disk));
     };
     fixwell::DiskReference disk = *stage.disk;
-    disk.filesystem = "%@fs";
-    EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
     disk.isWhole = true;
     EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
     disk = *stage.disk;
@@ -161,13 +161,101 @@ TEST(Job, RefusesBeforeItStarts)
     EXPECT_EQ(begin(disk), fixwell::kPLErrorNoDiskReference);
     EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(nullptr),
               fixwell::kPLErrorNoDiskReference);
-    std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
-    EXPECT_EQ(begin(*stage.disk), fixwell::kPLErrorToolMissing);
-    EXPECT_FALSE(stage.bench.manager.canVerify("ext4"));
-    EXPECT_EQ(stage.bench.manager.reasonAgainst("ext4", Operation::Repair),
-              "e2fsck is not installed (package e2fsprogs)");
     stage.bench.loop.drain();
     EXPECT_EQ(stage.heard.started, 0) << "a refused begin calls nobody back";
+}
+
+// The log is the place where a reason can be read.
+TEST(Job, SaysWhyThereIsNoWay)
+{
+    Stage stage(soundRun);
+    std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
+    struct Case {
+        std::string_view filesystem;
+        fixwell::ErrorCode error;
+        std::string_view says;
+    };
+    for (const Case& c :
+         {Case{"%@fs", fixwell::kPLErrorUnsupported, "no tool for the file system “%@fs”"},
+          Case{"swap", fixwell::kPLErrorUnsupported, "it is swap space"},
+          Case{"crypto_LUKS", fixwell::kPLErrorUnsupported, "it is encrypted"},
+          Case{"ext4", fixwell::kPLErrorToolMissing,
+               "e2fsck is not installed (package e2fsprogs)"}}) {
+        fixwell::DiskReference disk = *stage.disk;
+        disk.filesystem = c.filesystem;
+        ASSERT_EQ(stage.bench.repair(std::make_shared<fixwell::DiskReference>(disk)), 0);
+        EXPECT_EQ(stage.heard.error, c.error) << c.filesystem;
+        EXPECT_NE(stage.heard.message.find(c.says), std::string::npos) << stage.heard.message;
+        EXPECT_FALSE(stage.bench.manager.canRepair(c.filesystem));
+        EXPECT_NE(stage.bench.manager.reasonAgainst(c.filesystem, Operation::Repair).find(c.says),
+                  std::string::npos);
+    }
+}
+
+/// A FAT16 volume that a fake fsck.fat treats: what it says depends on whether it may write.
+struct FatStage {
+    explicit FatStage(std::string_view script)
+    {
+        workshop.write("disk", {});
+        std::filesystem::resize_file(workshop.path("disk"), 20U << 20U);
+        workshop.write("disk", fatBootSector());
+        std::filesystem::resize_file(workshop.path("disk"), 20U << 20U);
+        options.toolPath = workshop.fakeTools(script, "fsck.fat");
+    }
+
+    static std::string fatBootSector()
+    {
+        std::string sector(512, '\0');
+        sector.replace(0, 24,
+                       std::string("\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24));
+        return sector.replace(510, 2, "\x55\xAA");
+    }
+
+    test::Workshop workshop;
+    ManagerOptions options;
+};
+
+const std::string fatDamage =
+    "say FATs differ but appear to be intact.\n"
+    "say /proc/self/fd/3: 2 files, 1/10211 clusters\n";
+
+TEST(Job, IsToldThatAWritingToolComesToItsEndBeforeItStops)
+{
+    FatStage stage(fatDamage + "await-in-repair pressed\nsay the end\nexit 1");
+    test::Bench bench(stage.options);
+    bool isPressed = false;
+    bench.listener.onMessage = [&] {
+        // The look has shown it as a problem; the repair tells it as a plain line.
+        if (!bench.listener.hasPlainLine("FATs differ") || std::exchange(isPressed, true))
+            return;
+        bench.tool->cancelCurrentOperation();
+        stage.workshop.write("tools/pressed", "");
+    };
+    ASSERT_EQ(bench.repair(test::reference(stage.workshop.path("disk"), "vfat")), 0);
+    EXPECT_EQ(bench.listener.verdict, "stopped");
+    EXPECT_EQ(
+        std::count(bench.listener.plainLines.begin(), bench.listener.plainLines.end(), "the end\n"),
+        2)
+        << "of the look, and of the repair";
+    EXPECT_EQ(
+        std::count_if(
+            bench.listener.dictionaries.begin(), bench.listener.dictionaries.end(),
+            [](const fixwell::Dictionary& message) {
+                return message.string(fixwell::kFsckMessageString).find("fsck.fat is writing") !=
+                       std::string::npos;
+            }),
+        1);
+}
+
+TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
+{
+    FatStage stage(fatDamage + "exit 1");
+    test::Bench bench(stage.options);
+    ASSERT_EQ(bench.repair(test::reference(stage.workshop.path("disk"), "vfat")), 0);
+    EXPECT_EQ(bench.listener.verdict, "damaged") << "it never says that it has changed anything";
+    EXPECT_EQ(bench.listener.textsOf(fixwell::kFsckError).size(), 2U)
+        << "once before the repair, and once for what is left";
+    EXPECT_EQ(bench.listener.textsOf(fixwell::kFsckRepair).size(), 1U) << "one pass is enough";
 }
 
 TEST(Job, ProgressOnlyGrows)

@@ -177,6 +177,64 @@ TEST(ProcessRunner, IsNotHeldUpByWhatTheToolLeftBehind)
     EXPECT_EQ(runner.lines.output, std::vector<std::string>{"a"});
 }
 
+TEST(ProcessRunner, GivesATerminalToAToolThatWantsOne)
+{
+    for (const bool wantsIt : {false, true}) {
+        Runner runner;
+        runner.request.wantsTerminal = wantsIt;
+        std::string script = "terminal\n";
+        for (int i = 0; i < 3000; ++i)
+            script += "say line " + std::to_string(i) + "\n";
+        const RunResult result = runner.run(script + "exit 3");
+        EXPECT_EQ(result.ending, Ending(Exited{3}));
+        ASSERT_EQ(runner.lines.output.size(), 3001U) << "what was written last is told as well";
+        EXPECT_EQ(runner.lines.output.front(),
+                  wantsIt ? "terminal 1 input 0 columns 1000" : "terminal 0 input 0 columns 0");
+        EXPECT_EQ(runner.lines.output.back(), "line 2999") << "and nothing is added to it";
+    }
+    expectNoChildren();
+}
+
+TEST(ProcessRunner, LetsAWriterComeToItsEndThatWouldBreakOff)
+{
+    Runner runner;
+    runner.request.access = Access::ReadWrite;
+    runner.request.ignoresStops = true;
+    runner.request.graceTimes = graceTimesOfUnstoppable();
+    runner.lines.onLine = [&runner] {
+        if (runner.lines.output.size() == 1)
+            for (int i = 0; i < 2; ++i)
+                runner.stop.press();
+    };
+    const RunResult result = runner.run("say begun\nsleep 200\nsay done\nexit 1");
+    EXPECT_EQ(result.ending, Ending(Exited{1}));
+    EXPECT_EQ(result.cause, StopCause::User);
+    EXPECT_EQ(runner.lines.output.back(), "done");
+
+    Runner insisting;
+    insisting.request = runner.request;
+    insisting.lines.onLine = [&insisting] {
+        for (int i = 0; i < 3; ++i)
+            insisting.stop.press();
+    };
+    EXPECT_EQ(insisting.run("say begun\nwait").ending, Ending(Killed{SIGKILL}))
+        << "who asks three times has his way";
+    expectNoChildren();
+}
+
+TEST(ProcessRunner, EndsAWriterThatIgnoresStopsAndPrintsWithoutEnd)
+{
+    Runner runner;
+    runner.request.access = Access::ReadWrite;
+    runner.request.ignoresStops = true;
+    runner.request.limits = {100, 10000};
+    runner.request.graceTimes = {24h, 24h, 50ms};
+    const RunResult result = runner.run("flood-lines");
+    EXPECT_EQ(result.ending, Ending(Killed{SIGKILL}));
+    EXPECT_EQ(result.cause, StopCause::TooMuchOutput);
+    EXPECT_EQ(runner.lines.limits, 1);
+}
+
 TEST(ProcessRunner, DoesNotStartWhatIsAlreadyStopped)
 {
     Runner runner;

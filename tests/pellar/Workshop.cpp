@@ -149,16 +149,24 @@ std::filesystem::path Workshop::makeExt(std::string_view name, std::uint64_t byt
     return path(name);
 }
 
+void Workshop::prepare(std::vector<std::string> command, const std::filesystem::path& image) const
+{
+    const std::string name = command.front();
+    command.erase(command.begin());
+    command.push_back(image);
+    runProgram(name, std::move(command));
+}
+
 void Workshop::damage(const std::filesystem::path& image, std::string command) const
 {
     runProgram("debugfs", {"-w", "-R", std::move(command), image});
 }
 
-std::string Workshop::fakeTools(std::string_view script) const
+std::string Workshop::fakeTools(std::string_view script, std::string_view tool) const
 {
     const std::filesystem::path tools = path("tools");
     std::filesystem::create_directories(tools);
-    std::filesystem::copy_file(PELLAR_FAKE_TOOL, tools / "e2fsck",
+    std::filesystem::copy_file(PELLAR_FAKE_TOOL, tools / tool,
                                std::filesystem::copy_options::overwrite_existing);
     std::ofstream(tools / "script") << script;
     return tools;

@@ -86,10 +86,12 @@ public:
     /// A sparse file with a file system of e2fsprogs' own making.
     std::filesystem::path makeExt(std::string_view name, std::uint64_t bytes,
                                   std::vector<std::string> options = {}) const;
+    /// Runs a program with the image as its last argument; a failure fails the test.
+    void prepare(std::vector<std::string> command, const std::filesystem::path& image) const;
     /// debugfs(8), writing.
     void damage(const std::filesystem::path& image, std::string command) const;
-    /// A directory to be searched for tools, in which every tool does what `script` says.
-    std::string fakeTools(std::string_view script) const;
+    /// A directory to be searched for tools, in which `tool` does what `script` says.
+    std::string fakeTools(std::string_view script, std::string_view tool = "e2fsck") const;
 
 private:
     std::filesystem::path directory_;

@@ -122,6 +122,16 @@ std::optional<PartitionTable> readPartitionTable(int descriptor)
 // ext4(5) and mke2fs(8): the first backup stands at the start of group 1, which is 8193 blocks of
 // 1 KiB, 16384 of 2 KiB or 32768 of 4 KiB from the start. The magic number 0xEF53 lies 56 bytes
 // into the superblock, its group's number (here 1) 90 bytes into it.
+bool isBootSector(int descriptor, const PartitionTable& table, const Superblock& superblock)
+{
+    if (table.type != "dos" || !table.partitions.empty())
+        return false;
+    // The maker's name of NTFS and exFAT, and where FAT has its own.
+    return superblock.isFilesystem() || hasBytes(descriptor, 3, "NTFS    ") ||
+           hasBytes(descriptor, 3, "EXFAT   ") || hasBytes(descriptor, 54, "FAT1") ||
+           hasBytes(descriptor, 82, "FAT32   ");
+}
+
 bool hasExtBackupSuperblock(int descriptor, ByteRange range)
 {
     constexpr std::array<std::uint64_t, 3> firstBackups{8193ULL << 10U, 16384ULL << 11U,

@@ -46,6 +46,11 @@ struct PartitionTable {
 [[nodiscard]] Superblock readSuperblock(int descriptor, ByteRange range);
 [[nodiscard]] std::optional<PartitionTable> readPartitionTable(int descriptor);
 
+/// What looks like an MBR without partitions is the boot sector of a file system: both end in the
+/// same two bytes, and libblkid knows them apart for sound FAT and NTFS volumes alone.
+[[nodiscard]] bool isBootSector(int descriptor, const PartitionTable& table,
+                                const Superblock& superblock);
+
 /// A backup superblock of ext2, ext3 or ext4 stands where mke2fs puts the first one: the volume
 /// was made by it even though its own superblock is gone.
 [[nodiscard]] bool hasExtBackupSuperblock(int descriptor, ByteRange range);

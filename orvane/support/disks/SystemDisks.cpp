@@ -82,6 +82,7 @@ struct Contents {
     std::optional<PartitionTable> table;
     bool hasExtBackup = false;
     bool hasTableTraces = false;
+    bool hasBootSector = false;  ///< and what looks like a table is nothing else
 };
 
 Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
@@ -89,11 +90,13 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
 {
     const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!device)
-        return {superblockFromUdev(number, sources), {}, false, false};
+        return {superblockFromUdev(number, sources), {}};
     const ByteRange all{0, size};
     Contents contents{readSuperblock(device.get(), all), readPartitionTable(device.get()),
                       hasExtBackupSuperblock(device.get(), all),
                       hasPartitionTableTraces(device.get())};
+    contents.hasBootSector =
+        contents.table && isBootSector(device.get(), *contents.table, contents.superblock);
     return contents;
 }
 
@@ -165,9 +168,10 @@ std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool 
     const std::string name = device.filename();
     if (name.starts_with("sr"))
         return diskType::opticalDisc;
-    const bool hasVolume =
-        !contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces);
-    const bool isBare = isMounted || (!hasPartitions && !contents.table && hasVolume);
+    const bool hasVolume = !contents.superblock.type.empty() || contents.hasBootSector ||
+                           (contents.hasExtBackup && !contents.hasTableTraces);
+    const bool hasTable = contents.table && !contents.hasBootSector;
+    const bool isBare = isMounted || (!hasPartitions && !hasTable && hasVolume);
     if (name.starts_with("dm-") || name.starts_with("md"))
         return hasPartitions ? diskType::whole : diskType::assembled;
     return isBare ? diskType::bareVolume : diskType::whole;

@@ -79,7 +79,8 @@ ImageContents readContents(const OpenImage& image)
     const auto table = readPartitionTable(image.descriptor.get());
     const bool isUnknown = contents.whole.filesystem().empty();
     contents.hasPartitionMap =
-        table || (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
+        (table && !isBootSector(image.descriptor.get(), *table, contents.whole.superblock)) ||
+        (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
     for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
         contents.partitions.push_back(readVolume(image, partition));
     return contents;

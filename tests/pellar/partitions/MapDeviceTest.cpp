@@ -5,7 +5,6 @@
 
 #include <gtest/gtest.h>
 #include <sys/mount.h>
-#include <unistd.h>
 
 namespace {
 
@@ -36,8 +35,8 @@ private:
 // The kernel here may know no partition tables, so partx(8) adds the partition.
 TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
 {
-    if (::geteuid() != 0)
-        GTEST_SKIP() << "loop devices need root";
+    if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
     const test::Workshop workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     const Bytes sound = [&] {

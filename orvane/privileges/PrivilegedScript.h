@@ -1,0 +1,45 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/privileges/HelperRequest.h"
+#include "pellar/Texts.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/Script.h"
+
+#include <string>
+#include <vector>
+
+namespace orvane {
+
+class HelperProcess;
+
+/// A job for which this user has no right to the disk: it runs in the helper, as root, when the
+/// user has shown that they may, and what it tells is told here. The references outlive it.
+class PrivilegedScript final : public pellar::Script {
+public:
+    /// `launcher` is what the helper's arguments are appended to: pkexec(1) and the helper's path.
+    PrivilegedScript(std::vector<std::string> launcher, HelperRequest request,
+                     const pellar::Texts& texts, pellar::StopSwitch& stop, pellar::EventRoad& road);
+
+    void run() override;
+
+private:
+    void follow(HelperProcess& helper);
+    void take(std::string_view lines);
+    void passStopOn(HelperProcess& helper);
+    void explain(std::optional<int> status);
+    void finish(fixwell::ErrorCode error, fixwell::Name verdict, pellar::Sentence reason);
+
+    const std::vector<std::string> launcher_;
+    const HelperRequest request_;
+    const pellar::Texts& texts_;
+    pellar::StopSwitch& stop_;
+    pellar::EventRoad& road_;
+    pellar::JobLog log_;
+    std::string unfinishedLine_;
+    unsigned pressesTold_ = 0;
+    bool hasStarted_ = false;
+    bool hasFinished_ = false;
+};
+
+}  // namespace orvane

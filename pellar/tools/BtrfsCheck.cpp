@@ -1,0 +1,132 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/BtrfsCheck.h"
+
+#include "pellar/tools/Judging.h"
+#include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Witness.h"
+#include "pellar/volumes/BtrfsSuperblock.h"
+
+#include <array>
+
+namespace pellar {
+namespace {
+
+// "[3/7] checking free space tree": what stands behind the number.
+constexpr std::array phases{
+    PhaseSign{"checking root items", "Checking the roots of the trees"},
+    PhaseSign{"checking extents", "Checking which places are in use"},
+    PhaseSign{"checking free space", "Checking the maps of free space"},
+    PhaseSign{"checking fs roots", "Checking files and directories"},
+    PhaseSign{"checking only csums items", "Checking the list of checksums"},
+    PhaseSign{"checking csums", "Checking the list of checksums"},
+    PhaseSign{"checking root refs", "Checking subvolumes"},
+    PhaseSign{"checking quota groups", "Checking quotas"},
+};
+
+// btrfs-progs 6.2, check/. What stands in a line's beginning.
+constexpr std::array signs{
+    DamageSign{"checksum verify failed", Damage::Structure},
+    DamageSign{"parent transid verify failed", Damage::Structure},
+    DamageSign{"Csum didn't match", Damage::Structure},
+    DamageSign{"No valid Btrfs found", Damage::Structure},
+    DamageSign{"bad tree block", Damage::Structure},
+    DamageSign{"bad key order", Damage::Structure},
+    DamageSign{"couldn't ", Damage::Structure},
+    DamageSign{"Couldn't ", Damage::Structure},
+    DamageSign{"hunk[", Damage::Structure},
+    DamageSign{"ref mismatch on", Damage::Bookkeeping},
+    DamageSign{"backpointer mismatch", Damage::Bookkeeping},
+    DamageSign{"incorrect global backref count", Damage::Bookkeeping},
+    DamageSign{"owner ref check failed", Damage::Bookkeeping},
+    DamageSign{"block group", Damage::Bookkeeping},
+    DamageSign{"cache and super generation don't match", Damage::Bookkeeping},
+    DamageSign{"free space", Damage::Bookkeeping},
+    DamageSign{"errors found in", Damage::Contents},
+    DamageSign{" errors ", Damage::Contents},
+    DamageSign{"unresolved ref", Damage::LostPlaces},
+    DamageSign{"There are no extents for csum range", Damage::Contents},
+    DamageSign{"csum exists for", Damage::Contents},
+};
+
+/// Without the "[3/7] " before it.
+std::string_view withoutNumber(std::string_view line)
+{
+    const std::size_t end = line.starts_with('[') ? line.find("] ") : std::string_view::npos;
+    return end == std::string_view::npos ? line : line.substr(end + 2);
+}
+
+/// Reads what btrfs check prints. A full run ends with "found N bytes used, no error found" or
+/// "found N bytes used, error(s) found", and a tally.
+class BtrfsOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        const PhaseSign* const step =
+            line.starts_with('[') ? phaseIn(phases, withoutNumber(line)) : nullptr;
+        if (step != nullptr)
+            return phase(line, step->key);
+        if (note(line))
+            return detail(line);
+        const DamageSign* const sign = damageIn(signs, line);
+        return sign == nullptr ? detail(line) : problem(line, sign->kind);
+    }
+
+    /// YES for a line that tells of the check and not of the volume.
+    bool note(std::string_view line)
+    {
+        const bool isTally =
+            line.starts_with("found ") && line.find(" bytes used, ") != std::string_view::npos;
+        const bool isMissing =
+            line.starts_with("warning, device ") && line.ends_with(" is missing");
+        findings_.isComplete = findings_.isComplete || isTally;
+        findings_.hasErrorsLeft =
+            findings_.hasErrorsLeft || (isTally && line.ends_with("error(s) found"));
+        findings_.lacksOtherDisk = findings_.lacksOtherDisk || isMissing;
+        findings_.foundDiskInUse =
+            findings_.foundDiskInUse || line.find("is currently mounted") != std::string_view::npos;
+        return isTally || isMissing;
+    }
+};
+
+constexpr std::array damagedStatuses{1};
+
+}  // namespace
+
+Sentence BtrfsCheck::reasonAgainstRepair() const
+{
+    return {
+        "to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
+        "volume and make this one anew",
+        {},
+        {}};
+}
+
+VolumeFacts BtrfsCheck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+{
+    const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);
+    VolumeFacts facts = factsFrom(superblock, "btrfs", disk, offset, availableBytes);
+    facts.volumeBytes = superblock ? superblock->diskBytes : 0;
+    facts.needsRecovery = facts.hasPrimary && superblock->hasLog;
+    return facts;
+}
+
+std::vector<std::string> BtrfsCheck::arguments(Access, const std::string& disk, std::uint64_t) const
+{
+    return {"check", "--readonly", disk};
+}
+
+std::unique_ptr<OutputReader> BtrfsCheck::makeReader() const
+{
+    return std::make_unique<BtrfsOutput>();
+}
+
+// It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
+// only its words tell.
+Judgement BtrfsCheck::judge(const RunEvidence& evidence) const
+{
+    if (auto judgement = judgementOfEnding(evidence, name()))
+        return *judgement;
+    const int status = std::get<Exited>(evidence.result.ending).status;
+    return judgeVerification(status, evidence, {name(), damagedStatuses});
+}
+
+}  // namespace pellar

@@ -1,0 +1,93 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/FsckExfat.h"
+
+#include "pellar/tools/Judging.h"
+#include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Witness.h"
+#include "pellar/volumes/ExfatBootSector.h"
+
+#include <array>
+
+namespace pellar {
+namespace {
+
+// exfatprogs 1.2.0, fsck.c, repair.c and libexfat.c.
+constexpr std::array signs{
+    DamageSign{"boot region", Damage::Structure},
+    DamageSign{"boot sector", Damage::Structure},
+    DamageSign{"failed to read bitmap", Damage::Structure},
+    DamageSign{"upcase table", Damage::Structure},
+    DamageSign{"failed to verify root directory", Damage::Structure},
+    DamageSign{"failed to read root directory", Damage::Structure},
+    DamageSign{"bitmap", Damage::Bookkeeping},
+    DamageSign{"lost cluster", Damage::LostPlaces},
+    DamageSign{"shared by", Damage::SharedBlocks},
+    DamageSign{"ERROR: ", Damage::Contents},
+    DamageSign{"(y/N)? ", Damage::Contents},
+};
+
+/// Reads what fsck.exfat prints. A run ends with one of
+///     /proc/self/fd/3: clean. directories 1, files 0
+///     /proc/self/fd/3: corrupted. directories 1, files 0
+/// and a problem with its question and answer:
+///     ERROR: /: the checksum of a file is wrong at 0x203060. Delete (y/N)? n
+class ExfatOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        if (line.starts_with("/proc/self/fd/"))
+            return tally(line);
+        const DamageSign* const sign = damageIn(signs, line);
+        if (sign == nullptr)
+            return detail(line);
+        findings_.corrections += line.ends_with("? y") ? 1 : 0;
+        return problem(line, sign->kind);
+    }
+
+    ToolLine tally(std::string_view line)
+    {
+        const bool isCorrupted = line.find(": corrupted. directories ") != std::string_view::npos;
+        const bool isClean = line.find(": clean. directories ") != std::string_view::npos;
+        findings_.hasErrorsLeft = findings_.hasErrorsLeft || isCorrupted;
+        findings_.isComplete = findings_.isComplete || isCorrupted || isClean;
+        return detail(line);
+    }
+};
+
+constexpr std::array damagedStatuses{1, 4};
+
+}  // namespace
+
+VolumeFacts FsckExfat::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+{
+    const auto sector = readExfatBootSector(disk, offset, availableBytes);
+    VolumeFacts facts = factsFrom(sector, "exfat", disk, offset, availableBytes);
+    facts.volumeBytes = sector ? sector->volumeBytes : 0;
+    facts.isMarkedDirty = sector && sector->isMarkedDirty;
+    return facts;
+}
+
+std::vector<std::string> FsckExfat::arguments(Access access, const std::string& disk,
+                                              std::uint64_t) const
+{
+    return {access == Access::ReadOnly ? "-n" : "-y", disk};
+}
+
+std::unique_ptr<OutputReader> FsckExfat::makeReader() const
+{
+    return std::make_unique<ExfatOutput>();
+}
+
+// It says "clean" and exits 4 where it could not read what the volume is built on, and takes no
+// notice of the mark of a volume that was not properly unmounted, which a repair takes off.
+Judgement FsckExfat::judge(const RunEvidence& evidence) const
+{
+    if (auto judgement = judgementOfEnding(evidence, name()))
+        return *judgement;
+    const int status = std::get<Exited>(evidence.result.ending).status;
+    Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
+    judgement.madeProgress = evidence.access == Access::ReadWrite &&
+                             (evidence.findings.corrections > 0 || status == 0 || status == 1);
+    return judgement;
+}
+
+}  // namespace pellar

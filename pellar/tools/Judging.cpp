@@ -1,0 +1,110 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/Judging.h"
+
+#include <algorithm>
+#include <cstring>
+#include <string>
+
+namespace pellar {
+namespace {
+
+/// Ended by us for printing without end, or for silence: what it had found by then stands.
+Judgement judgementOfEnded(const RunEvidence& evidence, std::string_view tool)
+{
+    const bool wasSilent = evidence.result.cause == StopCause::Silence;
+    const Sentence reason{wasSilent ? "%1$@ gave no sign of life and was ended"
+                                    : "%1$@ printed without end and was ended",
+                          std::string(tool),
+                          {}};
+    if (hasDamage(evidence))
+        return damaged(0, reason);
+    return failed(0, reason, fixwell::kPLErrorToolMisbehaved);
+}
+
+/// Why nothing that the tool says can decide; none when it can.
+std::optional<Sentence> obstacle(const RunEvidence& evidence)
+{
+    if (evidence.findings.lacksOtherDisk)
+        return Sentence{"a part of it is on another disk, which was not found", {}, {}};
+    if (evidence.findings.lacksExternalJournal)
+        return Sentence{"its journal is kept on another disk, which was not found", {}, {}};
+    if (evidence.findings.skippedJournal || evidence.volume.needsRecovery)
+        return Sentence{"its log has not been replayed, which mounting it does", {}, {}};
+    return std::nullopt;
+}
+
+}  // namespace
+
+Judgement sound(std::int32_t detail)
+{
+    return {Verdict::Sound, fixwell::kPLNoError, detail, {}};
+}
+
+Judgement damaged(std::int32_t detail, Sentence reason)
+{
+    return {Verdict::Damaged, fixwell::kPLErrorDamaged, detail, std::move(reason)};
+}
+
+Judgement inconclusive(std::int32_t detail, Sentence reason)
+{
+    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, detail, std::move(reason)};
+}
+
+Judgement stopped(std::int32_t detail)
+{
+    return {Verdict::Stopped, fixwell::kPLErrorCancelled, detail, {}};
+}
+
+Judgement failed(std::int32_t detail, Sentence reason, fixwell::ErrorCode code)
+{
+    return {Verdict::Failed, code, detail, std::move(reason)};
+}
+
+bool hasDamage(const RunEvidence& evidence)
+{
+    return evidence.findings.problems > 0 || evidence.findings.hasErrorsLeft ||
+           evidence.volume.isCutShort();
+}
+
+std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::string_view tool)
+{
+    const Ending& ending = evidence.result.ending;
+    if (evidence.result.cause == StopCause::User)
+        return stopped(0);
+    if (const auto* const notStarted = std::get_if<NotStarted>(&ending))
+        return failed(notStarted->error, {"%1$@ could not be started: %2$@", std::string(tool),
+                                          ::strerrordesc_np(notStarted->error)});
+    if (evidence.result.cause != StopCause::None)
+        return judgementOfEnded(evidence, tool);
+    if (const auto* const killed = std::get_if<Killed>(&ending))
+        return failed(killed->signal, {"%1$@ was killed (signal %2$@)", std::string(tool),
+                                       std::to_string(killed->signal)});
+    return std::nullopt;
+}
+
+Judgement judgeVerification(int status, const RunEvidence& evidence, const ExitMeanings& meanings)
+{
+    const std::string tool(meanings.tool);
+    const VolumeFacts& volume = evidence.volume;
+    const bool saysDamaged = std::ranges::find(meanings.damaged, status) != meanings.damaged.end();
+    if (evidence.findings.foundDiskInUse && status != 0)
+        return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
+    if (volume.isCutShort())  // no log can make up for what is not there
+        return damaged(status);
+    if (const auto reason = obstacle(evidence))
+        return inconclusive(status, *reason);
+    if (!volume.hasPrimary)
+        return damaged(status, {"its first superblock is lost; a copy of it was found", {}, {}});
+    if (hasDamage(evidence) || (saysDamaged && evidence.findings.isComplete))
+        return damaged(status);
+    if (status != 0)
+        return failed(status, {"%1$@ could not do its work (exit status %2$@)", tool,
+                               std::to_string(status)});
+    if (!evidence.findings.isComplete)
+        return inconclusive(status, {"%1$@ ended before it had checked everything", tool, {}});
+    if (volume.isMarkedDirty)
+        return damaged(status, {"it was not properly unmounted; nothing else was found", {}, {}});
+    return sound(status);
+}
+
+}  // namespace pellar

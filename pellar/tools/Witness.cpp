@@ -1,0 +1,17 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/Witness.h"
+
+#include "pellar/volumes/SignatureProbe.h"
+
+namespace pellar {
+
+bool isForeignTo(std::string_view filesystemType, bool isRecognized, int disk, std::uint64_t offset,
+                 std::uint64_t availableBytes)
+{
+    if (!isRecognized)
+        return true;
+    const Signature signature = probeSignature(disk, offset, availableBytes);
+    return signature.isAmbivalent || (!signature.type.empty() && signature.type != filesystemType);
+}
+
+}  // namespace pellar

@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/process/Access.h"
+#include "pellar/process/FileDescriptor.h"
+
+#include <cstdint>
+#include <filesystem>
+#include <optional>
+#include <string>
+#include <variant>
+
+namespace pellar {
+
+/// A region of a file, or of a disk, as a block device of its own, for tools that cannot be told
+/// where a volume begins (loop(4)). Needs the right to set up loop devices.
+///
+/// The kernel takes the device down when nobody has it open any more (LO_FLAGS_AUTOCLEAR), so none
+/// is left behind, however the process ends. Another program that looks at all disks may have it
+/// open for a moment: giving it back waits for that, a second at most.
+class LoopDevice {
+public:
+    /// An errno when the kernel refuses: EACCES without the right to, ENOENT where there is no
+    /// /dev/loop-control, EINVAL for a region that is not made of sectors of 512 bytes. The
+    /// device is read-only for Access::ReadOnly, whoever opens it.
+    [[nodiscard]] static std::variant<LoopDevice, int> attach(int file, std::uint64_t offset,
+                                                              std::uint64_t length, Access access);
+
+    LoopDevice(LoopDevice&&) = default;
+    LoopDevice& operator=(LoopDevice&&) = delete;
+    /// What was written through the device is in the file when it is gone.
+    ~LoopDevice();
+
+    int descriptor() const { return device_.get(); }
+
+private:
+    LoopDevice(FileDescriptor device, std::filesystem::path place);
+
+    FileDescriptor device_;
+    std::filesystem::path place_;  ///< where the kernel tells what is behind the device
+    std::optional<std::string> behind_;
+};
+
+}  // namespace pellar

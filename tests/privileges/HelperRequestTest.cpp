@@ -1,0 +1,116 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/host/foundation/Array.h"
+#include "fixwell/host/foundation/Dictionary.h"
+#include "fixwell/host/pellar/MessageKeys.h"
+#include "orvane/privileges/EventWire.h"
+#include "orvane/privileges/HelperRequest.h"
+
+#include <gtest/gtest.h>
+
+namespace orvane {
+namespace {
+
+using pellar::Operation;
+
+bool isKnownDevice(const std::filesystem::path& path)
+{
+    return path == "/dev/sdb1" || path == "/dev/mapper/a-b";
+}
+
+HelperRequest request(Operation operation, bool isWhole)
+{
+    HelperRequest made;
+    made.operation = operation;
+    made.disk.path = "/dev/sdb1";
+    made.disk.identifier = "/dev/sdb1";
+    made.disk.name = "Mein “Stick” \x1b[31m%n\xff";
+    made.disk.filesystem = "ext4";
+    made.disk.isWhole = isWhole;
+    made.languages = "de_DE:en";
+    return made;
+}
+
+TEST(HelperRequest, ArrivesAsItWasMade)
+{
+    for (const Operation operation : {Operation::Verify, Operation::Repair})
+        for (const bool isWhole : {false, true}) {
+            const HelperRequest made = request(operation, isWhole);
+            const auto read = readHelperArguments(argumentsOf(made), isKnownDevice);
+            ASSERT_TRUE(std::holds_alternative<HelperRequest>(read));
+            EXPECT_EQ(std::get<HelperRequest>(read), made);
+        }
+}
+
+// Whoever may start the helper may give it any arguments.
+TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
+{
+    const std::vector<std::string> good{"repair", "/dev/sdb1", "id", "name", "ext4", "de"};
+    ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
+    struct Case {
+        std::size_t place;
+        std::string value;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{0, "erase", "no such operation"},
+             Case{0, "", "no operation"},
+             Case{0, "verify --x", "not by its beginning"},
+             Case{1, "/etc/shadow", "a file of root's"},
+             Case{1, "sdb1", "not absolute"},
+             Case{1, "/dev/../etc/shadow", "out of /dev"},
+             Case{1, "/dev/./sdb1", "not its own name"},
+             Case{1, "/dev//sdb1", "not its own name"},
+             Case{1, "/dev/null", "no disk"},
+             Case{1, "/dev/", "a directory"},
+             Case{1, "", "nothing"},
+             Case{3, std::string(2000, 'x'), "too long to be a name"},
+             Case{4, "ext4;reboot", "no name of a file system"},
+             Case{4, std::string(100, 'x'), "too long"},
+             Case{5, "../../../tmp/x", "no language, but a way to somebody's texts"},
+         }) {
+        std::vector<std::string> arguments = good;
+        arguments[c.place] = c.value;
+        const auto read = readHelperArguments(arguments, [](const std::filesystem::path& path) {
+            return path != "/dev/null" && path != "/dev/";
+        });
+        EXPECT_TRUE(std::holds_alternative<std::string>(read)) << c.because;
+    }
+    for (const std::size_t count : {0U, 1U, 5U, 7U}) {
+        std::vector<std::string> arguments = good;
+        arguments.resize(count, "x");
+        EXPECT_TRUE(
+            std::holds_alternative<std::string>(readHelperArguments(arguments, isKnownDevice)))
+            << count;
+    }
+}
+
+TEST(EventWire, EventsComeBackAsTheyWere)
+{
+    const auto dictionary =
+        fixwell::Dictionary::of({{fixwell::kFsckMessageType, fixwell::kFsckError},
+                                 {fixwell::kFsckMessageString, "line\nend \"quoted\" \xff\x1b"},
+                                 {fixwell::kFsckVerbosity, -1},
+                                 {fixwell::kFsckParameters, fixwell::Array::of({"x", 42, 1.5})}});
+    for (const pellar::Event& event : std::initializer_list<pellar::Event>{
+             pellar::Started{}, pellar::Message{"plain \xc3\x28\n", {}},
+             pellar::Message{{}, dictionary}, pellar::Trace{"e2fsck -n"},
+             pellar::Finished{-69701, 4, dictionary}, pellar::Finished{}}) {
+        const std::string line = lineFromEvent(event);
+        EXPECT_EQ(line.find('\n'), std::string::npos);
+        const auto back = eventFromLine(line);
+        ASSERT_TRUE(back) << line;
+        EXPECT_EQ(back->index(), event.index());
+        EXPECT_EQ(lineFromEvent(*back), line);
+    }
+}
+
+TEST(EventWire, WhatIsNoEventIsNone)
+{
+    for (const std::string_view line :
+         {"", "x", "null", "[]", "{}", "[1]", "[\"message\"]", "[\"finished\",\"a\",0,null]",
+          "[\"unknown\"]", "[\"started\"", "\xff\xfe"})
+        EXPECT_FALSE(eventFromLine(line)) << line;
+}
+
+}  // namespace
+}  // namespace orvane

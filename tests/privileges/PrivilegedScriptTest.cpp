@@ -1,0 +1,113 @@
+// SPDX-License-Identifier: Apache-2.0
+// The asking side of the helper, with programs in the helper's place.
+
+#include "orvane/privileges/PrivilegedScript.h"
+#include "pellar/jobs/Job.h"
+#include "tests/pellar/Workshop.h"
+
+#include <gtest/gtest.h>
+
+#include <fstream>
+
+namespace orvane {
+namespace {
+
+class PrivilegedScriptTest : public testing::Test {
+protected:
+    /// What the launched program does, as a shell script, after the arguments were seen.
+    void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
+    {
+        const auto launcher = workshop_.path("launcher");
+        std::ofstream(launcher) << "#!/bin/sh\n" << script << "\n";
+        std::filesystem::permissions(launcher, std::filesystem::perms::owner_all);
+        HelperRequest request;
+        request.operation = operation;
+        request.disk = *pellar::test::reference("/dev/sdz9", "ext4", "Stick");
+        job_ = std::make_unique<pellar::Job>(
+            [this, launcher, request](pellar::StopSwitch& stop, pellar::EventRoad& road) {
+                return std::make_unique<PrivilegedScript>(
+                    std::vector<std::string>{launcher.native()}, request, texts_, stop, road);
+            },
+            pellar::EventReceiver{&listener_,
+                                  pellar::test::reference("/dev/sdz9"),
+                                  {},
+                                  [] {
+                                  }},
+            loop_);
+    }
+    [[nodiscard]] bool finishes()
+    {
+        return loop_.runUntil([this] { return listener_.finished == 1; });
+    }
+
+    pellar::test::Workshop workshop_;
+    pellar::test::TestLoop loop_;
+    pellar::test::EnglishTexts texts_;
+    pellar::test::Listener listener_;
+    std::unique_ptr<pellar::Job> job_;
+};
+
+TEST_F(PrivilegedScriptTest, HandsOnWhatTheHelperTells)
+{
+    launch(R"(printf '["started"]\n["mess'
+sleep 0.1
+printf 'age","The volume “Stick” appears to be OK.\\n",null]\nnot an event\n'
+printf '["finished",0,0,{"dictionary":[["kPLVerdict","sound"],["kPLMessage","'"$1 $2"'"]]}]\n')");
+    ASSERT_TRUE(finishes());
+    EXPECT_EQ(listener_.started, 1);
+    EXPECT_EQ(listener_.error, 0);
+    EXPECT_EQ(listener_.verdict, "sound");
+    EXPECT_EQ(listener_.message, "verify /dev/sdz9");
+    EXPECT_TRUE(listener_.hasPlainLine("The volume “Stick” appears to be OK.\n"));
+}
+
+TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)
+{
+    struct Case {
+        const char* script;
+        fixwell::ErrorCode error;
+        std::string_view message;
+    };
+    for (const Case& c : {
+             Case{"exit 126", fixwell::kPLErrorCancelled,
+                  "cannot repair “Stick”: the authorisation was not given; nothing was done"},
+             Case{"exit 127", fixwell::kPLErrorCannotOpen,
+                  "cannot repair “Stick”: you are not authorised to work on this disk; nothing was "
+                  "done"},
+             Case{"exit 2", fixwell::kPLErrorCannotOpen,
+                  "cannot repair “Stick”: it needs an administrator's rights, and they could not "
+                  "be asked for"},
+             Case{"printf '[\"started\"]\\n'; kill -9 $$", fixwell::kPLErrorToolFailed,
+                  "cannot repair “Stick”: the program that works on it as administrator ended "
+                  "unexpectedly"},
+         }) {
+        listener_ = {};
+        launch(c.script, pellar::Operation::Repair);
+        ASSERT_TRUE(finishes()) << c.script;
+        EXPECT_EQ(listener_.started, 1) << c.script;
+        EXPECT_EQ(listener_.error, c.error) << c.script;
+        EXPECT_EQ(listener_.message, c.message);
+        job_.reset();
+    }
+}
+
+TEST_F(PrivilegedScriptTest, StopIsPassedOnAndLeavingEndsTheHelper)
+{
+    const auto ended = workshop_.path("ended");
+    launch(
+        "printf '[\"started\"]\\n'\nread word\n"
+        "printf '[\"finished\",-69884,0,{\"dictionary\":[[\"kPLMessage\",\"'$word'\"]]}]\\n'");
+    ASSERT_TRUE(loop_.runUntil([this] { return listener_.started == 1; }));
+    job_->stop();
+    ASSERT_TRUE(finishes());
+    EXPECT_EQ(listener_.message, "stop");
+    job_.reset();
+
+    launch("printf '[\"started\"]\\n'\ncat >/dev/null\n: >'" + ended.native() + "'");
+    ASSERT_TRUE(loop_.runUntil([this] { return listener_.started == 2; }));
+    job_.reset();  // waits: nobody is left behind
+    EXPECT_TRUE(std::filesystem::exists(ended));
+}
+
+}  // namespace
+}  // namespace orvane
