@@ -201,7 +201,7 @@ ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operati
                             "database that is known here"));
         return fixwell::kPLErrorUnsupported;
     }
-    run(disk, [&, this](StopSwitch& stop, EventRoad& road) {
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
     });
     return fixwell::kPLNoError;
