@@ -209,6 +209,9 @@ void PermissionsScript::tell(const Tally& tally)
 {
     for (const Sentence& sentence : sentencesOf(tally))
         log_.remark(log_.text(sentence));
+    if (tally.missing > 0)
+        log_.detail(
+            log_.text(Sentence{"%1$@ files are not there.", std::to_string(tally.missing), {}}));
     if (restored_ > 0)
         log_.remark(
             log_.text(Sentence{"%1$@ files were set right.", std::to_string(restored_), {}}));
