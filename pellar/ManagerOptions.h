@@ -35,6 +35,9 @@ struct ManagerOptions {
     /// verification of permissions needs no archive; absolute, made when it is needed, of no use
     /// when others can write to it. Empty: nothing is kept.
     std::filesystem::path permissionReferences;
+    /// The user has agreed that the archives of packages of the running system are fetched over
+    /// the network, where nothing else says what permissions their files have.
+    bool fetchesMissingArchives = false;
     /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;

@@ -91,7 +91,8 @@ std::variant<References, Sentence> PermissionsScript::readReferences(const RootD
                                    options_.toolPath, options_.outputLimits,
                                    [this](std::string line) {
                                        log_.trace(std::move(line));
-                                   }};
+                                   },
+                                   options_.fetchesMissingArchives};
     return readInstalledReferences(root, accounts_, sources, stop_, [this](double percent) {
         log_.progress(percent);
         road_.flushIfDue();

@@ -2,6 +2,7 @@
 #include "pellar/permissions/InstalledReferences.h"
 
 #include "pellar/permissions/InstalledSystem.h"
+#include "pellar/permissions/dpkg/ArchiveFetch.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/permissions/pacman/PacmanReferences.h"
 #include "pellar/permissions/rpm/RPMReferences.h"
@@ -41,7 +42,14 @@ std::variant<References, Sentence> readInstalledReferences(const RootDirectory& 
     switch (installedSystemAt(root)) {
         case PackageDatabase::Dpkg: {
             ReferenceStore store(sources.store);
-            return orStopped(readDpkgReferences(root, accounts, store, progress));
+            ArchiveFetch fetch(sources.toolPath, stop, sources.trace);
+            const FetchArchive fetchArchive = [&fetch](const DpkgPackage& package,
+                                                       const std::filesystem::path& target) {
+                return fetch.fetch(package, target);
+            };
+            const bool mayFetch = sources.fetchesArchives && sources.root == "/";
+            return orStopped(readDpkgReferences(
+                root, accounts, store, mayFetch ? fetchArchive : FetchArchive(), progress));
         }
         case PackageDatabase::RPM: return askRPM(root, accounts, sources, stop);
         case PackageDatabase::Pacman: return orStopped(readPacmanReferences(root, progress));

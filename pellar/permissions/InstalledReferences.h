@@ -21,6 +21,9 @@ struct ReferenceSources {
     std::string toolPath;         ///< where rpm(8) is looked for
     OutputLimits outputLimits;
     std::function<void(std::string)> trace;
+    /// The user wants the archives that are missing to be fetched over the network; only done for
+    /// the running system, whose apt knows where from.
+    bool fetchesArchives = false;
 };
 
 /// What all packages of the system at `root` say about their files. Otherwise why that is not

@@ -9,6 +9,7 @@
 #include "pellar/permissions/dpkg/DpkgStatus.h"
 
 #include <fcntl.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <unordered_map>
@@ -24,10 +25,12 @@ constexpr std::size_t largestFile = 256U << 20U;
 /// One reading of a dpkg database.
 class DpkgReading {
 public:
-    DpkgReading(const RootDirectory& root, const Accounts& accounts, ReferenceStore& store)
+    DpkgReading(const RootDirectory& root, const Accounts& accounts, ReferenceStore& store,
+                const FetchArchive& fetch)
         : root_(root),
           accounts_(accounts),
           store_(store),
+          fetch_(fetch),
           diversions_(text("var/lib/dpkg/diversions"), root.aliases()),
           temporaryFiles_(temporaryFileRulesOf(root))
     {
@@ -93,13 +96,21 @@ private:
         const std::string name = package.fileName();
         if (auto kept = store_.find(name))
             return kept;
-        FileDescriptor archive = root_.openFile("var/cache/apt/archives/" + name + ".deb");
-        if (!archive && store_.isTrusted())
-            archive = FileDescriptor(::open((store_.archiveDirectory() / (name + ".deb")).c_str(),
-                                            O_RDONLY | O_CLOEXEC | O_NOFOLLOW));
-        auto files = archive ? readDebArchive(archive.get()) : std::nullopt;
+        const FileDescriptor archive = root_.openFile("var/cache/apt/archives/" + name + ".deb");
+        auto files = archive ? readDebArchive(archive.get()) : fetched(package);
         if (files)
             store_.keep(name, *files);
+        return files;
+    }
+
+    std::optional<std::vector<PackagedFile>> fetched(const DpkgPackage& package) const
+    {
+        const std::filesystem::path target = store_.pathOfFetched(package.fileName());
+        if (!fetch_ || target.empty() || !fetch_(package, target))
+            return std::nullopt;
+        const FileDescriptor archive(::open(target.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW));
+        auto files = archive ? readDebArchive(archive.get()) : std::nullopt;
+        ::unlink(target.c_str());
         return files;
     }
 
@@ -151,6 +162,7 @@ private:
     const RootDirectory& root_;
     const Accounts& accounts_;
     ReferenceStore& store_;
+    const FetchArchive& fetch_;
     Diversions diversions_;
     TemporaryFileRules temporaryFiles_;
     std::unordered_set<std::string> infoFiles_;
@@ -161,9 +173,10 @@ private:
 }  // namespace
 
 std::optional<References> readDpkgReferences(const RootDirectory& root, const Accounts& accounts,
-                                             ReferenceStore& store, const ReadingProgress& progress)
+                                             ReferenceStore& store, const FetchArchive& fetch,
+                                             const ReadingProgress& progress)
 {
-    return DpkgReading(root, accounts, store).read(progress);
+    return DpkgReading(root, accounts, store, fetch).read(progress);
 }
 
 }  // namespace pellar

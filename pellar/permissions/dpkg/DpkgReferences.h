@@ -4,17 +4,24 @@
 #include "pellar/permissions/Accounts.h"
 #include "pellar/permissions/Reference.h"
 #include "pellar/permissions/RootDirectory.h"
+#include "pellar/permissions/dpkg/DpkgStatus.h"
 #include "pellar/permissions/dpkg/ReferenceStore.h"
 
 namespace pellar {
 
+/// Gets a package's archive into a file; NO when it could not.
+using FetchArchive = std::function<bool(const DpkgPackage&, const std::filesystem::path& target)>;
+
 /// What the packages of a Debian system say about their files. dpkg's database names the files
 /// and no more (dpkg(1), --verify), so the rest comes from the archives in the system's own
 /// var/cache/apt/archives and from what the store has kept; packages with neither are counted.
-/// Reading the archives takes about a second for 1,500 files. None when it was stopped.
+/// Reading the archives takes about a second for 1,500 files. `fetch` gets the missing ones, which
+/// go again once they have been read; empty where nobody has asked for that. None when it was
+/// stopped.
 [[nodiscard]] std::optional<References> readDpkgReferences(const RootDirectory& root,
                                                            const Accounts& accounts,
                                                            ReferenceStore& store,
+                                                           const FetchArchive& fetch,
                                                            const ReadingProgress& progress);
 
 }  // namespace pellar

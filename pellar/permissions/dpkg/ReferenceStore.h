@@ -24,9 +24,11 @@ public:
     /// Not being able to keep it loses time at the next run, nothing else.
     void keep(const std::string& name, const std::vector<PackagedFile>& files);
 
-    /// Archives that were fetched for a comparison.
-    std::filesystem::path archiveDirectory() const { return directory_ / "archives"; }
-    bool isTrusted() const { return isTrusted_; }
+    /// Where an archive goes that is fetched to be read; empty where the store is of no use.
+    [[nodiscard]] std::filesystem::path pathOfFetched(const std::string& name) const
+    {
+        return isTrusted_ ? directory_ / (name + ".deb") : std::filesystem::path();
+    }
 
 private:
     std::filesystem::path pathOf(const std::string& name) const;

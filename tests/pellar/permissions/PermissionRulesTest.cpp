@@ -3,6 +3,7 @@
 #include "pellar/permissions/PackagedFile.h"
 #include "pellar/permissions/ScriptMentions.h"
 #include "pellar/permissions/TemporaryFileRules.h"
+#include "pellar/permissions/dpkg/ArchiveFetch.h"
 #include "pellar/permissions/dpkg/DpkgStatus.h"
 #include "pellar/permissions/rpm/RPMFiles.h"
 
@@ -134,6 +135,16 @@ TEST(DpkgStatus, TellsWhatIsThere)
     EXPECT_EQ(packages[0].fileName(), "a_1%3a2_amd64");
     EXPECT_FALSE(packages[1].isConfigured);
     EXPECT_TRUE(packages[2].isConfigured);
+}
+
+TEST(ArchiveAddress, IsOnlyTakenWithAHash)
+{
+    EXPECT_EQ(parseArchiveAddress("'http://a/h_1_all.deb' h_1_all.deb 53 SHA256:2e6e"),
+              (ArchiveAddress{"http://a/h_1_all.deb", "SHA256:2e6e"}));
+    for (const char* const line :
+         {"'http://a/h_1_all.deb' h_1_all.deb 53 ", "'http://a/h_1_all.deb' h_1_all.deb 53 MD5Sum:2",
+          "'file:/etc/shadow' a 53 SHA256:2e6e", "E: Can't find a source", ""})
+        EXPECT_FALSE(parseArchiveAddress(line)) << line;
 }
 
 TEST(RPMFiles, ALineIsOneFileOrNone)
