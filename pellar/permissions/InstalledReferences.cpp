@@ -5,6 +5,7 @@
 #include "pellar/permissions/dpkg/ArchiveFetch.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/permissions/pacman/PacmanReferences.h"
+#include "pellar/permissions/rpm/DatabaseCopy.h"
 #include "pellar/permissions/rpm/RPMReferences.h"
 #include "pellar/process/Command.h"
 
@@ -26,8 +27,10 @@ Answer askRPM(const RootDirectory& root, const Accounts& accounts, const Referen
     const std::filesystem::path program = findProgram("rpm", sources.toolPath);
     if (program.empty())
         return Sentence{"%1$@ is not installed (package %2$@)", "rpm", "rpm"};
-    const RPMQuery query{program, sources.root / rpmDatabaseOf(root), sources.outputLimits,
-                         sources.trace};
+    const auto database = DatabaseCopy::make(root, rpmDatabaseOf(root).native());
+    if (!database)
+        return Sentence{"the package database cannot be copied to be read", {}, {}};
+    const RPMQuery query{program, database->path(), sources.outputLimits, sources.trace};
     return readRPMReferences(root, accounts, query, stop);
 }
 

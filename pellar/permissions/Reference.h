@@ -18,6 +18,7 @@ enum class Doubt {
     TemporaryFiles,  ///< a line of tmpfiles.d(5) may have
     PackagesDiffer,  ///< two packages have the file and say different things
     UnknownAccount,  ///< the owner's name is not in the system's own etc/passwd or etc/group
+    State,           ///< a program may look after it itself: below var, and root's by default only
     NotVerified,     ///< the package itself says that they may differ
 };
 

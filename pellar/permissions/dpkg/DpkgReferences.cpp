@@ -22,6 +22,16 @@ namespace {
 const std::string infoDirectory = "var/lib/dpkg/info/";
 constexpr std::size_t largestFile = 256U << 20U;
 
+// What lies in var is a program's own, and many set its owner as they start (apt does with its
+// "partial" directories). An archive can only say "root" of it, because most accounts get their
+// numbers on the system; where it does name another owner, that is meant.
+bool isState(const Reference& reference)
+{
+    const std::string& path = reference.path;
+    const bool isDeep = path.starts_with("var/") && path.find('/', 4) != std::string::npos;
+    return isDeep && reference.user == 0 && reference.group == 0;
+}
+
 /// One reading of a dpkg database.
 class DpkgReading {
 public:
@@ -156,6 +166,8 @@ private:
             reference.doubt = Doubt::Script;
         else if (temporaryFiles_.concern(place))
             reference.doubt = Doubt::TemporaryFiles;
+        else if (isState(reference))
+            reference.doubt = Doubt::State;
         return reference;
     }
 
