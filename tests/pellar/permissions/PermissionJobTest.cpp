@@ -127,6 +127,7 @@ TEST_F(PermissionJob, RepairRestoresAllOfIt)
 TEST_F(PermissionJob, SetgidSurvivesAnOwnerThatIsSetRight)
 {
     ASSERT_EQ(::chown(path("usr/bin/score").c_str(), 4242, 0), 0);
+    ASSERT_EQ(::chmod(path("usr/bin/score").c_str(), 02755), 0);
     PermissionBench bench(*system_);
     EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
     EXPECT_EQ(rightsOf(path("usr/bin/score")), (Rights{02755, 0, 60}));
