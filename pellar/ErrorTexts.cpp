@@ -2,6 +2,7 @@
 #include "pellar/ErrorTexts.h"
 
 #include "fixwell/host/foundation/Format.h"
+#include "pellar/permissions/PermissionErrorCodes.h"
 #include "pellar/partitions/MapErrorCodes.h"
 
 #include <algorithm>
@@ -33,6 +34,11 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorToolMissing,
               "The checking tool for this file system is not installed."},
     ErrorText{fixwell::kPLErrorToolFailed, "The checking tool failed."},
+    ErrorText{kPLErrorNoReferences,
+              "It is not known here what permissions the installed files should have."},
+    ErrorText{kPLErrorPermissionsNotRepaired,
+              "Some permissions still differ from what they should be."},
+    ErrorText{kPLErrorNotAdministrator, "Only an administrator may repair permissions."},
     ErrorText{fixwell::kPLErrorCannotOpen, "The disk could not be opened."},
     ErrorText{fixwell::kPLErrorUnsupported, "There is no tool for this kind of disk."},
     ErrorText{fixwell::kPLErrorToolMisbehaved,

@@ -31,6 +31,10 @@ struct ManagerOptions {
     /// empty. Not called after the PLRepairDisk has been destroyed.
     std::function<void(std::string_view)> commandTrace;
     SystemPaths systemPaths;
+    /// Where it is kept what archives have said about their packages' files, so that the next
+    /// verification of permissions needs no archive; absolute, made when it is needed, of no use
+    /// when others can write to it. Empty: nothing is kept.
+    std::filesystem::path permissionReferences;
     /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;

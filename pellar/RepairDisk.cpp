@@ -4,7 +4,9 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "pellar/jobs/JobScript.h"
 #include "pellar/jobs/MapScript.h"
+#include "pellar/jobs/PermissionsScript.h"
 #include "pellar/partitions/MapDisk.h"
+#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -63,14 +65,14 @@ ErrorCode RepairDisk::beginStoragesystemFilesystemRepairForDisk(const DiskRefere
     return begin(disk, Operation::Repair);
 }
 
-ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPermissions(disk, Operation::Verify);
 }
 
-ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer&)
+ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer& disk)
 {
-    return fixwell::kPLErrorUnsupported;
+    return beginPermissions(disk, Operation::Repair);
 }
 
 ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
@@ -180,6 +182,27 @@ ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operat
         return fixwell::kPLNoError;
     start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
+    });
+    return fixwell::kPLNoError;
+}
+
+// The volume stays mounted, and need not be claimed: its files are what is looked at.
+ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operation operation)
+{
+    if (job_)
+        return fixwell::kPLErrorBusy;
+    if (!disk || disk->path.empty())
+        return fixwell::kPLErrorNoDiskReference;
+    if (disk->isWhole || disk->mountPoint.empty() ||
+        installedSystemAt(disk->mountPoint) == PackageDatabase::None) {
+        if (options_.commandTrace)
+            options_.commandTrace(
+                texts_.text("the volume is not mounted as the root of a system with a package "
+                            "database that is known here"));
+        return fixwell::kPLErrorUnsupported;
+    }
+    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
     });
     return fixwell::kPLNoError;
 }

@@ -47,6 +47,8 @@ private:
                                     fixwell::ErrorCode error);
     fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
                                          Operation operation);
+    fixwell::ErrorCode beginPermissions(const fixwell::DiskReferencePointer& disk,
+                                        Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
     bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);

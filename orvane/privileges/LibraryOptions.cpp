@@ -29,8 +29,10 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
     pellar::ManagerOptions options;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
-    if (!paths.state.empty())
+    if (!paths.state.empty()) {
         options.savedSectorsDirectory = paths.state / "partition-maps";
+        options.permissionReferences = paths.state / "permissions";
+    }
     const auto launcher = helperLauncher();
     if (!launcher.empty())
         options.privileged = [launcher, &texts](const fixwell::DiskReference& disk,

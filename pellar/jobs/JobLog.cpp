@@ -95,7 +95,7 @@ void JobLog::detail(std::string_view line)
     if (guard_.isSuspicious(text))
         add(untypedMessage(text, detailLevel));
     else
-        road_.add(Message{text + '\n', {}});
+        road_.add(Message{text + lineEnd_, {}});
 }
 
 void JobLog::problem(std::string_view line)

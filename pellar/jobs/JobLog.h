@@ -25,6 +25,8 @@ public:
     JobLog(const fixwell::DiskReference& disk, const Texts& texts, EventRoad& road);
 
     const std::string& diskName() const { return diskName_; }
+    /// The module ends a plain line itself in jobs that are not about a file system.
+    void leaveLinesOpen() { lineEnd_.clear(); }
 
     void started();
     void trace(std::string line);
@@ -59,6 +61,7 @@ private:
     EventRoad& road_;
     LineGuard guard_;
     std::string diskName_;
+    std::string lineEnd_ = "\n";
     ProblemLimiter problems_;
     ProgressMeter meter_;
 };

@@ -1,6 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/Disk.h"
 
+#include "orvane/support/disks/Ownership.h"
+#include "pellar/permissions/InstalledSystem.h"
+
 #include <algorithm>
 #include <utility>
 
@@ -82,6 +85,18 @@ std::vector<std::shared_ptr<fixwell::OVDisk>> Disk::children() const
 const fixwell::OVFilesystem* Disk::filesystem() const
 {
     return filesystem_ ? &*filesystem_ : nullptr;
+}
+
+bool Disk::permissionsEnabled() const
+{
+    return isMounted() && hasOwners(facts_.filesystem);
+}
+
+// Asked anew each time: a system may be installed, or its database moved, while the disk stays.
+bool Disk::canRepairPermissions() const
+{
+    return isMounted() &&
+           pellar::installedSystemAt(facts_.mountPoint) != pellar::PackageDatabase::None;
 }
 
 Array Disk::fsckHistoryNoChildren() const

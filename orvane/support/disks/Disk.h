@@ -61,8 +61,9 @@ public:
     bool hasBlankOpticalMedia() const override { return facts_.isBlankOptical; }
     bool isOfflineDiskImage() const override { return facts_.type == diskType::diskImage; }
     std::string diskImagePath() const override { return facts_.imagePath.native(); }
-    bool permissionsEnabled() const override { return false; }
-    bool canRepairPermissions() const override { return false; }
+    bool permissionsEnabled() const override;
+    /// It is the root of a system whose package database the library knows.
+    bool canRepairPermissions() const override;
     const fixwell::OVFilesystem* filesystem() const override;
     fixwell::DiskReferencePointer theKRDisk() const override { return reference_; }
 

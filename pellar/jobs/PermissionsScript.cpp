@@ -1,0 +1,235 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/PermissionsScript.h"
+
+#include "fixwell/host/foundation/Array.h"
+#include "fixwell/host/foundation/UTF8.h"
+#include "fixwell/host/pellar/MessageKeys.h"
+#include "pellar/permissions/InstalledReferences.h"
+#include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/permissions/PermissionsOutcome.h"
+#include "pellar/permissions/Restoring.h"
+
+#include <unistd.h>
+
+#include <system_error>
+#include <utility>
+
+namespace pellar {
+namespace {
+
+// The module takes a first report of exactly 20 per cent as the news that the database is being
+// read, and what follows as running from there to 100.
+constexpr double databaseIsRead = 20;
+constexpr double databaseWasRead = 60;
+constexpr double repairWasTried = 80;
+
+}  // namespace
+
+PermissionsScript::PermissionsScript(fixwell::DiskReferencePointer disk, Operation operation,
+                                     const ManagerOptions& options, const Texts& texts,
+                                     StopSwitch& stop, EventRoad& road)
+    : disk_(std::move(disk)),
+      operation_(operation),
+      options_(options),
+      texts_(texts),
+      stop_(stop),
+      road_(road),
+      log_(*disk_, texts, road)
+{
+    log_.leaveLinesOpen();
+}
+
+void PermissionsScript::run()
+{
+    log_.started();
+    report(carryOut());
+}
+
+Outcome PermissionsScript::carryOut()
+{
+    if (operation_ == Operation::Repair && ::geteuid() != 0)
+        return {Verdict::Failed,
+                kPLErrorNotAdministrator,
+                0,
+                {"only an administrator may set permissions", {}, {}}};
+    const auto root = RootDirectory::open(disk_->mountPoint);
+    if (!root)
+        return {Verdict::Failed,
+                fixwell::kPLErrorCannotOpen,
+                errno,
+                {"the root of the system cannot be opened", {}, {}}};
+    tellDatabaseIsRead();
+    accounts_ = accountsOf(*root);
+    const auto read = readReferences(*root);
+    if (const auto* const reason = std::get_if<Sentence>(&read))
+        return outcomeWithoutReferences(*reason);
+    return treat(*root, std::get<References>(read));
+}
+
+Outcome PermissionsScript::treat(const RootDirectory& root, const References& references)
+{
+    const bool isRepair = operation_ == Operation::Repair;
+    log_.meter().setRange(databaseWasRead, isRepair ? repairWasTried : 100);
+    step("Comparing the permissions of the installed files");
+    auto tally = look(root, references, isRepair ? Pass::Repair : Pass::Verify);
+    if (tally && isRepair && tally->differing > 0) {
+        log_.meter().setRange(repairWasTried, 100);
+        step("Comparing once more after the repair");
+        tally = look(root, references, Pass::Confirm);
+    }
+    if (!tally)
+        return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+    tell(*tally);
+    return isRepair ? outcomeOfPermissionsRepair(*tally, restored_)
+                    : outcomeOfPermissionsVerification(*tally);
+}
+
+std::variant<References, Sentence> PermissionsScript::readReferences(const RootDirectory& root)
+{
+    log_.meter().setRange(databaseIsRead, databaseWasRead);
+    const ReferenceSources sources{disk_->mountPoint, options_.permissionReferences,
+                                   options_.toolPath, options_.outputLimits,
+                                   [this](std::string line) {
+                                       log_.trace(std::move(line));
+                                   }};
+    return readInstalledReferences(root, accounts_, sources, stop_, [this](double percent) {
+        log_.progress(percent);
+        road_.flushIfDue();
+        return !stop_.isPressed();
+    });
+}
+
+/// None when it was stopped.
+std::optional<Tally> PermissionsScript::look(const RootDirectory& root,
+                                             const References& references, Pass pass)
+{
+    Tally tally;
+    tally.withoutSource = references.filesWithoutSource.size();
+    double done = 0;
+    for (const Reference& reference : references.files) {
+        if (stop_.isPressed())
+            return std::nullopt;
+        lookAt(root, reference, pass, tally);
+        log_.progress(100 * ++done / static_cast<double>(references.files.size()));
+        road_.flushIfDue();
+    }
+    log_.endOfRun();
+    return tally;
+}
+
+void PermissionsScript::lookAt(const RootDirectory& root, const Reference& reference, Pass pass,
+                               Tally& tally)
+{
+    const auto found = inspect(root, reference.path);
+    if (const auto* const unseen = std::get_if<Unseen>(&found)) {
+        tally.count(*unseen);
+        if (pass != Pass::Confirm)
+            tellUnseen(reference, *unseen);
+        return;
+    }
+    const auto& file = std::get<FoundFile>(found);
+    const Difference difference = compare(reference, file.permissions);
+    const bool isUndecided = reference.doubt != Doubt::None;
+    ++(isUndecided ? tally.undecided : tally.compared);
+    if (difference.isNone() || (isUndecided && pass == Pass::Confirm))
+        return;
+    tally.differing += isUndecided ? 0 : 1;
+    tell(reference, file, difference);
+    if (pass == Pass::Repair && !isUndecided)
+        repair(root, reference, file);
+}
+
+void PermissionsScript::tellUnseen(const Reference& reference, Unseen unseen)
+{
+    const std::string path = fixwell::printable(reference.path);
+    switch (unseen) {
+        case Unseen::Missing:
+            log_.detail(log_.text(Sentence{"“%1$@” is not there.", path, {}}));
+            break;
+        case Unseen::BehindLink:
+            log_.detail(log_.text(
+                Sentence{"“%1$@” is behind a symbolic link, which is not followed.", path, {}}));
+            break;
+        case Unseen::Unreadable:
+            log_.detail(log_.text(Sentence{"“%1$@” cannot be read.", path, {}}));
+            break;
+        case Unseen::ElsewhereMounted: break;
+    }
+}
+
+void PermissionsScript::tell(const Reference& reference, const FoundFile& file,
+                             const Difference& difference)
+{
+    for (const std::string& line :
+         linesOf(difference, reference, file.permissions, accounts_, texts_)) {
+        if (reference.doubt == Doubt::None)
+            log_.problem(line);
+        else
+            log_.detail(log_.text(Sentence{"Undecided, and never changed: %1$@", line, {}}));
+    }
+}
+
+void PermissionsScript::repair(const RootDirectory& root, const Reference& reference,
+                               const FoundFile& file)
+{
+    if (reference.kind && *reference.kind != file.permissions.kind)
+        return;
+    const std::string path = fixwell::printable(reference.path);
+    const Restoring restoring = restore(root, reference, file);
+    if (std::holds_alternative<Restored>(restoring)) {
+        ++restored_;
+        log_.detail(log_.text(Sentence{"“%1$@” was set right.", path, {}}));
+    } else if (const auto* const refusal = std::get_if<NotPermitted>(&restoring)) {
+        log_.problem(log_.text(Sentence{"“%1$@” cannot be set right: %2$@.", path,
+                                        std::generic_category().message(refusal->error)}));
+    } else if (std::holds_alternative<ChangedMeanwhile>(restoring)) {
+        log_.problem(log_.text(
+            Sentence{"“%1$@” changed while it was looked at, and was left alone.", path, {}}));
+    } else {
+        log_.problem(
+            log_.text(Sentence{"“%1$@” has other names too, and lies where others can "
+                               "write; it was left alone.",
+                               path,
+                               {}}));
+    }
+}
+
+// The meter keeps away from this very number, so that no other job says it by chance.
+void PermissionsScript::tellDatabaseIsRead()
+{
+    step("Reading what the packages say about their files");
+    road_.add(Message{{},
+                      fixwell::Dictionary::of(
+                          {{fixwell::kFsckMessageType, fixwell::kFsckProgress},
+                           {fixwell::kFsckParameters, fixwell::Array::of({databaseIsRead})}})});
+    road_.flush();
+}
+
+void PermissionsScript::tell(const Tally& tally)
+{
+    for (const Sentence& sentence : sentencesOf(tally))
+        log_.remark(log_.text(sentence));
+    if (tally.missing > 0)
+        log_.detail(
+            log_.text(Sentence{"%1$@ files are not there.", std::to_string(tally.missing), {}}));
+    if (restored_ > 0)
+        log_.remark(
+            log_.text(Sentence{"%1$@ files were set right.", std::to_string(restored_), {}}));
+}
+
+void PermissionsScript::step(std::string_view key)
+{
+    const bool isVerify = operation_ == Operation::Verify;
+    log_.step(isVerify ? fixwell::kFsckVerify : fixwell::kFsckRepair, texts_.text(key));
+}
+
+void PermissionsScript::report(const Outcome& outcome)
+{
+    const std::string message = permissionsMessageOf(outcome, operation_, log_.diskName(), texts_);
+    if (outcome.code != fixwell::kPLNoError && outcome.verdict != Verdict::Stopped)
+        log_.failure(message);
+    log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
+    log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
+}
+
+}  // namespace pellar

@@ -1,0 +1,57 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/Outcome.h"
+#include "pellar/jobs/Script.h"
+#include "pellar/permissions/Comparison.h"
+#include "pellar/permissions/Inspection.h"
+#include "pellar/permissions/Reference.h"
+#include "pellar/permissions/RootDirectory.h"
+#include "pellar/permissions/Tally.h"
+
+#include <optional>
+
+namespace pellar {
+
+/// Verifies or repairs the permissions of the files that packages installed on a mounted volume,
+/// which is the root of a system: reads what the packages say, compares, and to repair sets what
+/// differs and compares everything again. Files of which it is not known how they should be are
+/// counted and never changed. The references outlive it.
+class PermissionsScript final : public Script {
+public:
+    PermissionsScript(fixwell::DiskReferencePointer disk, Operation operation,
+                      const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
+                      EventRoad& road);
+
+    void run() override;
+
+private:
+    enum class Pass { Verify, Repair, Confirm };
+
+    Outcome carryOut();
+    Outcome treat(const RootDirectory& root, const References& references);
+    std::variant<References, Sentence> readReferences(const RootDirectory& root);
+    std::optional<Tally> look(const RootDirectory& root, const References& references, Pass pass);
+    void lookAt(const RootDirectory& root, const Reference& reference, Pass pass, Tally& tally);
+    void tellUnseen(const Reference& reference, Unseen unseen);
+    void tell(const Reference& reference, const FoundFile& file, const Difference& difference);
+    void repair(const RootDirectory& root, const Reference& reference, const FoundFile& file);
+    void tellDatabaseIsRead();
+    void tell(const Tally& tally);
+    void step(std::string_view key);
+    void report(const Outcome& outcome);
+
+    const fixwell::DiskReferencePointer disk_;
+    const Operation operation_;
+    const ManagerOptions& options_;
+    const Texts& texts_;
+    StopSwitch& stop_;
+    EventRoad& road_;
+    JobLog log_;
+    Accounts accounts_;
+    std::uint64_t restored_ = 0;
+};
+
+}  // namespace pellar

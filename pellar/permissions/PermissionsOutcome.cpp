@@ -1,0 +1,86 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/permissions/PermissionsOutcome.h"
+
+#include "pellar/permissions/PermissionErrorCodes.h"
+
+namespace pellar {
+namespace {
+
+const Sentence incomplete{"not all files could be compared; none of the others differs", {}, {}};
+
+std::string_view messageKey(const Outcome& outcome, Operation operation)
+{
+    const bool isRepair = operation == Operation::Repair;
+    const bool hasFailed = outcome.code != fixwell::kPLNoError;
+    if (outcome.verdict == Verdict::Stopped)
+        return isRepair ? "stopped while repairing the permissions on “%1$@”"
+                        : "stopped while verifying the permissions on “%1$@”";
+    if (hasFailed)
+        return isRepair ? "cannot repair the permissions on “%1$@”: %2$@"
+                        : "cannot verify the permissions on “%1$@”: %2$@";
+    if (outcome.verdict == Verdict::Repaired)
+        return "repaired the permissions on “%1$@”: %2$@";
+    return outcome.verdict == Verdict::Sound ? "verified the permissions on “%1$@”: none differ"
+                                             : "verified the permissions on “%1$@”: %2$@";
+}
+
+Outcome nothingCompared()
+{
+    return {Verdict::Inconclusive,
+            kPLErrorNoReferences,
+            0,
+            {"it is not known here what permissions the packages give their files", {}, {}}};
+}
+
+Outcome withoutDifferences(const Tally& tally)
+{
+    const Verdict verdict = verdictOf(tally);
+    return {verdict, fixwell::kPLNoError, 0,
+            verdict == Verdict::Inconclusive ? incomplete : Sentence{}};
+}
+
+}  // namespace
+
+Outcome outcomeOfPermissionsVerification(const Tally& tally)
+{
+    if (tally.compared == 0)
+        return nothingCompared();
+    if (tally.differing > 0)
+        return {Verdict::Damaged,
+                fixwell::kPLNoError,
+                0,
+                {"those of %1$@ files differ", std::to_string(tally.differing), {}}};
+    return withoutDifferences(tally);
+}
+
+Outcome outcomeOfPermissionsRepair(const Tally& afterwards, std::uint64_t restored)
+{
+    if (afterwards.compared == 0)
+        return nothingCompared();
+    if (afterwards.differing > 0)
+        return {Verdict::Damaged,
+                kPLErrorPermissionsNotRepaired,
+                0,
+                {"those of %1$@ files still differ", std::to_string(afterwards.differing), {}}};
+    if (restored > 0)
+        return {Verdict::Repaired,
+                fixwell::kPLNoError,
+                0,
+                {"%1$@ files were set right", std::to_string(restored), {}}};
+    return withoutDifferences(afterwards);
+}
+
+Outcome outcomeWithoutReferences(const Sentence& reason)
+{
+    if (reason.isEmpty())
+        return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+    return {Verdict::Failed, fixwell::kPLErrorToolFailed, 0, reason};
+}
+
+std::string permissionsMessageOf(const Outcome& outcome, Operation operation,
+                                 const std::string& diskName, const Texts& texts)
+{
+    return Sentence{messageKey(outcome, operation), diskName, outcome.reason.in(texts)}.in(texts);
+}
+
+}  // namespace pellar

@@ -1,0 +1,46 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/permissions/Permissions.h"
+
+#include <cstdint>
+#include <functional>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace pellar {
+
+/// Why it is not known what a file's permissions should be, although its package says something.
+enum class Doubt {
+    None,
+    Script,          ///< a script of a package may have set them
+    TemporaryFiles,  ///< a line of tmpfiles.d(5) may have
+    PackagesDiffer,  ///< two packages have the file and say different things
+    UnknownAccount,  ///< the owner's name is not in the system's own etc/passwd or etc/group
+    NotVerified,     ///< the package itself says that they may differ
+};
+
+/// What a package says about one of its files.
+struct Reference {
+    std::string path;              ///< from the root on, without a leading "/"
+    std::optional<FileKind> kind;  ///< none where the source does not tell
+    mode_t mode = 0;               ///< the lower twelve bits
+    uid_t user = 0;
+    gid_t group = 0;
+    /// None where the source does not tell.
+    std::optional<std::string> capabilities;
+    Doubt doubt = Doubt::None;
+};
+
+struct References {
+    std::vector<Reference> files;  ///< by path, a directory before what it holds
+    std::uint64_t packages = 0;
+    std::uint64_t packagesWithoutSource = 0;
+    std::vector<std::string> filesWithoutSource;  ///< installed, but nobody says how
+};
+
+/// How far the reading of a database is, in per cent; NO as soon as it is to be stopped.
+using ReadingProgress = std::function<bool(double percent)>;
+
+}  // namespace pellar

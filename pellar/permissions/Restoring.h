@@ -1,0 +1,32 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/permissions/Inspection.h"
+
+#include <variant>
+
+namespace pellar {
+
+struct Restored {};
+
+/// The file was no longer what had been looked at, so nothing was done.
+struct ChangedMeanwhile {};
+
+/// The file has further names, and its directory is open to somebody who is not root: it may be
+/// somebody else's file that was linked there. Nothing was done.
+struct SuspiciousLink {};
+
+struct NotPermitted {
+    int error;  ///< errno
+};
+
+using Restoring = std::variant<Restored, ChangedMeanwhile, SuspiciousLink, NotPermitted>;
+
+/// Gives the file what its reference says: the owner first, because chown(2) clears setuid and
+/// the capabilities, then the mode, then the capabilities, and looks whether it has them. All of
+/// it on the object that `seen` holds, under whatever name it may be by then. The kind must be
+/// right and the reference without doubt. Needs root.
+[[nodiscard]] Restoring restore(const RootDirectory& root, const Reference& reference,
+                                const FoundFile& seen);
+
+}  // namespace pellar

@@ -1,0 +1,123 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/permissions/RootDirectory.h"
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <linux/openat2.h>
+#include <sys/stat.h>
+#include <sys/syscall.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <cerrno>
+#include <memory>
+
+namespace pellar {
+namespace {
+
+FileDescriptor openWithin(int directory, const std::string& path, std::uint64_t flags,
+                          std::uint64_t resolve)
+{
+    open_how how = {};
+    how.flags = flags | O_CLOEXEC;
+    how.resolve = resolve | RESOLVE_NO_MAGICLINKS;
+    long descriptor = -1;
+    do  // EAGAIN: a rename was under way while a ".." was looked at (openat2(2))
+        descriptor =
+            ::syscall(SYS_openat2, directory, path.empty() ? "." : path.c_str(), &how, sizeof how);
+    while (descriptor < 0 && (errno == EAGAIN || errno == EINTR));
+    return FileDescriptor(static_cast<int>(descriptor));
+}
+
+struct CloseDirectory {
+    void operator()(DIR* directory) const { ::closedir(directory); }
+};
+
+bool isRegular(int descriptor)
+{
+    struct stat status = {};
+    return ::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode);
+}
+
+}  // namespace
+
+std::optional<RootDirectory> RootDirectory::open(const std::filesystem::path& path)
+{
+    FileDescriptor directory(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!directory)
+        return std::nullopt;
+    RootDirectory root(std::move(directory));
+    root.findAliases();
+    return root;
+}
+
+// Only root's own links: whoever owns the link decides where it leads.
+void RootDirectory::findAliases()
+{
+    for (const char* const link : {"bin", "sbin", "lib", "lib32", "lib64", "libx32", "usr/bin",
+                                   "usr/sbin", "usr/lib32", "usr/lib64", "usr/libx32"}) {
+        const FileDescriptor object = openObject(link);
+        struct stat status = {};
+        if (!object || ::fstat(object.get(), &status) != 0 || !S_ISLNK(status.st_mode) ||
+            status.st_uid != 0)
+            continue;
+        std::array<char, 256> target{};
+        const ssize_t length = ::readlinkat(object.get(), "", target.data(), target.size());
+        if (length > 0 && static_cast<std::size_t>(length) < target.size())
+            aliases_.add(link, std::string(target.data(), static_cast<std::size_t>(length)));
+    }
+}
+
+FileDescriptor RootDirectory::openObject(const std::string& path) const
+{
+    return openWithin(directory_.get(), path, O_PATH | O_NOFOLLOW,
+                      RESOLVE_BENEATH | RESOLVE_NO_SYMLINKS | RESOLVE_NO_XDEV);
+}
+
+// A pipe that lies where a file should be must not keep anybody waiting.
+FileDescriptor RootDirectory::openFile(const std::string& path) const
+{
+    FileDescriptor file =
+        openWithin(directory_.get(), path, O_RDONLY | O_NONBLOCK | O_NOCTTY, RESOLVE_IN_ROOT);
+    return file && isRegular(file.get()) ? std::move(file) : FileDescriptor();
+}
+
+std::optional<std::string> RootDirectory::read(const std::string& path, std::size_t largest) const
+{
+    const FileDescriptor file = openFile(path);
+    if (!file)
+        return std::nullopt;
+    std::string contents;
+    std::array<char, 65536> buffer{};
+    while (contents.size() <= largest) {
+        const ssize_t count = ::read(file.get(), buffer.data(), buffer.size());
+        if (count < 0 && errno != EINTR)
+            return std::nullopt;
+        if (count == 0)
+            return contents;
+        contents.append(buffer.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
+    }
+    return std::nullopt;
+}
+
+std::vector<std::string> RootDirectory::names(const std::string& directory) const
+{
+    const FileDescriptor opened =
+        openWithin(directory_.get(), directory, O_RDONLY | O_DIRECTORY, RESOLVE_IN_ROOT);
+    std::vector<std::string> names;
+    const std::unique_ptr<DIR, CloseDirectory> stream(
+        opened ? ::opendir(("/proc/self/fd/" + std::to_string(opened.get())).c_str()) : nullptr);
+    while (const dirent* const entry = stream ? ::readdir(stream.get()) : nullptr)
+        if (const std::string name = entry->d_name; name != "." && name != "..")
+            names.push_back(name);
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+bool RootDirectory::has(const std::string& path) const
+{
+    return bool(openWithin(directory_.get(), path, O_PATH, RESOLVE_IN_ROOT));
+}
+
+}  // namespace pellar

@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/Sentence.h"
+#include "pellar/permissions/Inspection.h"
+#include "pellar/tools/Judgement.h"
+
+#include <cstdint>
+#include <vector>
+
+namespace pellar {
+
+/// What became of all installed files in one look at them.
+struct Tally {
+    std::uint64_t compared = 0;
+    std::uint64_t differing = 0;  ///< of those
+    std::uint64_t undecided = 0;
+    std::uint64_t withoutSource = 0;
+    std::uint64_t missing = 0;
+    std::uint64_t elsewhere = 0;    ///< on another file system, which is another volume's
+    std::uint64_t unreachable = 0;  ///< behind a link, or not readable
+
+    void count(Unseen unseen);
+};
+
+/// A sentence for each number that is worth telling. None passes in silence what nobody compared.
+std::vector<Sentence> sentencesOf(const Tally& tally);
+
+/// Sound only when there was something to compare every file with. Undecided files do not make
+/// it less: that much is told.
+Verdict verdictOf(const Tally& tally);
+
+}  // namespace pellar

@@ -1,0 +1,171 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "tests/pellar/permissions/DebianSystem.h"
+
+#include "pellar/process/ChildProcess.h"
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <fstream>
+
+namespace pellar::test {
+namespace {
+
+namespace fs = std::filesystem;
+
+void writeFile(const fs::path& path, std::string_view bytes)
+{
+    fs::create_directories(path.parent_path());
+    std::ofstream(path, std::ios::binary) << bytes;
+}
+
+std::string nameOf(const PackageFile& file)
+{
+    const std::string name = file.path.substr(0, file.path.find(" -> "));
+    return name.back() == '/' ? name.substr(0, name.size() - 1) : name;
+}
+
+void make(const fs::path& tree, const PackageFile& file)
+{
+    const fs::path path = tree / nameOf(file);
+    const std::size_t arrow = file.path.find(" -> ");
+    if (file.path.back() == '/')
+        fs::create_directories(path);
+    else if (arrow != std::string::npos)
+        fs::create_symlink(file.path.substr(arrow + 4), path);
+    else
+        writeFile(path, "contents\n");
+    EXPECT_EQ(::lchown(path.c_str(), file.user, file.group), 0);
+    if (arrow == std::string::npos)
+        ::chmod(path.c_str(), file.mode);
+}
+
+}  // namespace
+
+int runProgram(const std::string& name, std::vector<std::string> arguments)
+{
+    const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
+    const fs::path program = findProgram(name, "/usr/sbin:/usr/bin:/sbin:/bin");
+    if (program.empty())
+        return -1;
+    auto child = ChildProcess::start({program, std::move(arguments)}, {sink.get()});
+    if (!std::holds_alternative<ChildProcess>(child))
+        return -1;
+    const Ending ending = std::get<ChildProcess>(child).reap();
+    const auto* const exited = std::get_if<Exited>(&ending);
+    return exited != nullptr ? exited->status : -1;
+}
+
+Rights rightsOf(const fs::path& path)
+{
+    struct stat status = {};
+    EXPECT_EQ(::lstat(path.c_str(), &status), 0) << path;
+    return {status.st_mode & 07777U, status.st_uid, status.st_gid};
+}
+
+DebianSystem::DebianSystem()
+{
+    for (const char* const directory :
+         {"usr/bin", "etc", "var/lib/dpkg/info", "var/cache/apt/archives", "usr/lib/tmpfiles.d"})
+        fs::create_directories(path(directory));
+    fs::create_symlink("usr/bin", path("bin"));
+    write("etc/passwd", "root:x:0:0::/root:/bin/sh\nplayer:x:4242:60::/:/bin/false\n");
+    write("etc/group", "root:x:0:\nplayers:x:60:\n");
+    write("var/lib/dpkg/status", "");
+}
+
+fs::path DebianSystem::path(std::string_view name) const
+{
+    const fs::path root = workshop_.path("root");
+    return name.empty() ? root : root / name;
+}
+
+void DebianSystem::write(std::string_view name, std::string_view bytes) const
+{
+    writeFile(path(name), bytes);
+}
+
+fs::path DebianSystem::archiveOf(const std::string& name) const
+{
+    return path("var/cache/apt/archives/" + name + "_1%3a2.0-1_all.deb");
+}
+
+void DebianSystem::install(const std::string& name, const std::vector<PackageFile>& files,
+                           std::string_view afterInstallation)
+{
+    const fs::path tree = workshop_.path("tree-" + name);
+    const std::string control = "Package: " + name +
+                                "\nVersion: 1:2.0-1\nArchitecture: all\n"
+                                "Maintainer: Nobody <nobody@example.org>\nDescription: test\n";
+    writeFile(tree / "DEBIAN/control", control);
+    std::string list = "/.\n";
+    for (const PackageFile& file : files) {
+        make(tree, file);
+        list += '/' + nameOf(file) + '\n';
+    }
+    ASSERT_EQ(runProgram("dpkg-deb", {"-b", tree, archiveOf(name)}), 0);
+    // dpkg unpacks "bin/x" behind the link; dpkg-deb would put a directory in its place.
+    for (const PackageFile& file : files)
+        make(path(), file);
+    write("var/lib/dpkg/info/" + name + ".list", list);
+    if (!afterInstallation.empty())
+        write("var/lib/dpkg/info/" + name + ".postinst", afterInstallation);
+    status_ += control + "Status: install ok installed\n\n";
+    write("var/lib/dpkg/status", status_);
+}
+
+fixwell::DiskReferencePointer DebianSystem::disk() const
+{
+    return mountedAt(path());
+}
+
+fixwell::DiskReferencePointer mountedAt(const fs::path& root)
+{
+    fixwell::DiskReference disk;
+    disk.path = "/dev/null";
+    disk.identifier = "disk";
+    disk.name = "Disk";
+    disk.filesystem = "ext4";
+    disk.mountPoint = root;
+    return std::make_shared<const fixwell::DiskReference>(std::move(disk));
+}
+
+PermissionBench::PermissionBench(const fs::path& store)
+    : Bench([&] {
+          ManagerOptions options;
+          options.permissionReferences = store;
+          return options;
+      }())
+{
+}
+
+fixwell::ErrorCode PermissionBench::verifyPermissions(const fixwell::DiskReferencePointer& disk)
+{
+    return finish(tool->beginPermissionsVerifyForDisk(disk));
+}
+
+fixwell::ErrorCode PermissionBench::repairPermissions(const fixwell::DiskReferencePointer& disk)
+{
+    return finish(tool->beginPermissionsRepairForDisk(disk));
+}
+
+std::string PermissionBench::problems() const
+{
+    std::string all;
+    for (const std::string& line : listener.textsOf(fixwell::kFsckError))
+        all += line + '\n';
+    return all;
+}
+
+std::string PermissionBench::remarks() const
+{
+    std::string all;
+    for (const fixwell::Dictionary& message : listener.dictionaries)
+        if (!message.has(fixwell::kFsckMessageType))
+            all += std::string(message.string(fixwell::kFsckMessageString)) + "\n";
+    return all;
+}
+
+}  // namespace pellar::test

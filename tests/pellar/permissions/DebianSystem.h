@@ -1,0 +1,70 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "tests/pellar/Workshop.h"
+
+#include <sys/types.h>
+
+#include <filesystem>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace pellar::test {
+
+/// The program's exit status; -1 when it is not there or was killed.
+int runProgram(const std::string& name, std::vector<std::string> arguments);
+
+/// Mode and owner of a file itself, not of what a link leads to.
+struct Rights {
+    mode_t mode = 0;
+    uid_t user = 0;
+    gid_t group = 0;
+
+    friend bool operator==(const Rights&, const Rights&) = default;
+};
+Rights rightsOf(const std::filesystem::path& path);
+
+struct PackageFile {
+    std::string path;  ///< "usr/bin/x"; with "/" behind it a directory, with " -> " in it a link
+    mode_t mode = 0755;
+    uid_t user = 0;
+    gid_t group = 0;
+};
+
+/// A small system with merged directories, whose packages are real .deb archives made and unpacked
+/// by dpkg-deb(1). Needs root, because the owners do.
+class DebianSystem {
+public:
+    DebianSystem();
+
+    void install(const std::string& name, const std::vector<PackageFile>& files,
+                 std::string_view afterInstallation = {});
+    void write(std::string_view path, std::string_view bytes) const;
+    std::filesystem::path path(std::string_view name = {}) const;
+    std::filesystem::path archiveOf(const std::string& name) const;
+    std::filesystem::path store() const { return workshop_.path("store"); }
+    fixwell::DiskReferencePointer disk() const;
+
+private:
+    Workshop workshop_;
+    std::string status_;
+};
+
+/// Runs permission jobs.
+struct PermissionBench : Bench {
+    explicit PermissionBench(const DebianSystem& installed) : PermissionBench(installed.store()) {}
+    explicit PermissionBench(const std::filesystem::path& store);
+
+    fixwell::ErrorCode verifyPermissions(const fixwell::DiskReferencePointer& disk);
+    fixwell::ErrorCode repairPermissions(const fixwell::DiskReferencePointer& disk);
+    /// The problems of all runs so far, with line ends.
+    std::string problems() const;
+    /// The numbers and other lines that are always shown.
+    std::string remarks() const;
+};
+
+/// A mounted volume, as the host would name it.
+fixwell::DiskReferencePointer mountedAt(const std::filesystem::path& root);
+
+}  // namespace pellar::test

@@ -1,0 +1,341 @@
+// SPDX-License-Identifier: Apache-2.0
+// Jobs on the permissions of installed files, on systems made for the purpose. Needs root: the
+// owners do.
+
+#include "pellar/permissions/InstalledSystem.h"
+#include "pellar/permissions/PackagedFile.h"
+#include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/process/Command.h"
+#include "tests/pellar/permissions/DebianSystem.h"
+
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <algorithm>
+
+namespace {
+
+using namespace pellar;
+using test::DebianSystem;
+using test::PermissionBench;
+using test::Rights;
+using test::rightsOf;
+
+namespace fs = std::filesystem;
+
+bool contains(std::string_view text, std::string_view part)
+{
+    return text.find(part) != std::string_view::npos;
+}
+
+std::size_t lineCount(std::string_view text)
+{
+    return static_cast<std::size_t>(std::count(text.begin(), text.end(), '\n'));
+}
+
+class PermissionJob : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (::geteuid() != 0)
+            GTEST_SKIP() << "giving files to others needs root";
+        if (findProgram("dpkg-deb", "/usr/bin:/bin").empty())
+            GTEST_SKIP() << "dpkg-deb is not installed";
+        system_ = std::make_unique<DebianSystem>();
+        system_->install("games", {{"bin/", 0755},
+                                   {"bin/play", 0755},
+                                   {"bin/score", 02755, 0, 60},
+                                   {"usr/share/", 0755},
+                                   {"usr/share/games/", 01777},
+                                   {"usr/share/games/levels", 0644},
+                                   {"usr/share/games/link -> levels"},
+                                   {"var/lib/games/", 0750, 4242, 60},
+                                   {"var/lib/games/list", 0640, 4242, 60}});
+    }
+
+    fs::path path(std::string_view name) const { return system_->path(name); }
+    void damage() const
+    {
+        ::chmod(path("usr/bin/play").c_str(), 04777);
+        ::chmod(path("usr/bin/score").c_str(), 0755);
+        ::chmod(path("usr/share/games").c_str(), 0777);
+        static_cast<void>(::lchown(path("usr/share/games/link").c_str(), 4242, 0));
+        static_cast<void>(::chown(path("var/lib/games/list").c_str(), 0, 0));
+    }
+
+    std::unique_ptr<DebianSystem> system_;
+};
+
+TEST_F(PermissionJob, AHealthySystemIsSound)
+{
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "sound") << bench.problems() << bench.remarks();
+    EXPECT_EQ(bench.listener.error, 0);
+    EXPECT_EQ(bench.problems(), "");
+    ASSERT_FALSE(bench.listener.progress.empty());
+    EXPECT_EQ(bench.listener.progress.front(), 20) << "the module's sign for the database";
+    EXPECT_EQ(std::count(bench.listener.progress.begin(), bench.listener.progress.end(), 20), 1);
+}
+
+TEST_F(PermissionJob, EveryDifferenceIsFoundAndNothingElse)
+{
+    damage();
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "damaged");
+    EXPECT_EQ(bench.listener.error, 0) << "a finding is no failure";
+    const std::string problems = bench.problems();
+    for (const char* const line :
+         {"Permissions differ on “usr/bin/play”: they are -rwsrwxrwx, should be -rwxr-xr-x.\n",
+          "Permissions differ on “usr/bin/score”: they are -rwxr-xr-x, should be -rwxr-sr-x.\n",
+          "Permissions differ on “usr/share/games”: they are drwxrwxrwx, should be drwxrwxrwt.\n",
+          "Owner differs on “usr/share/games/link”: it is 4242 (player), should be 0 (root).\n",
+          "Owner differs on “var/lib/games/list”: it is 0 (root), should be 4242 (player).\n",
+          "Group differs on “var/lib/games/list”: it is 0 (root), should be 60 (players).\n"})
+        EXPECT_TRUE(contains(problems, line)) << line << problems;
+    EXPECT_EQ(lineCount(problems), 6U) << problems;
+}
+
+TEST_F(PermissionJob, RepairRestoresAllOfIt)
+{
+    damage();
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.problems();
+    EXPECT_EQ(rightsOf(path("usr/bin/play")), (Rights{0755, 0, 0}));
+    EXPECT_EQ(rightsOf(path("usr/bin/score")), (Rights{02755, 0, 60}));
+    EXPECT_EQ(rightsOf(path("usr/share/games")), (Rights{01777, 0, 0}));
+    EXPECT_EQ(rightsOf(path("usr/share/games/link")).user, 0U);
+    EXPECT_EQ(rightsOf(path("var/lib/games/list")), (Rights{0640, 4242, 60}));
+    PermissionBench again(*system_);
+    EXPECT_EQ(again.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(again.listener.verdict, "sound") << again.problems();
+}
+
+// chown(2) clears setgid: in the wrong order it would be lost.
+TEST_F(PermissionJob, SetgidSurvivesAnOwnerThatIsSetRight)
+{
+    ASSERT_EQ(::chown(path("usr/bin/score").c_str(), 4242, 0), 0);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(rightsOf(path("usr/bin/score")), (Rights{02755, 0, 60}));
+}
+
+TEST_F(PermissionJob, WhatTheSystemMayHaveChangedItselfIsNeitherRightNorRepaired)
+{
+    system_->install("mount-help",
+                     {{"bin/mounter", 0755}, {"usr/bin/other", 0755}, {"usr/bin/looped", 0755}},
+                     "#!/bin/sh\nchmod 4755 /bin/mounter\nfor f in looped; do\n"
+                     "  chown root /usr/bin/$f\ndone\n");
+    system_->install("spool", {{"var/spool/", 0755}, {"var/spool/mail/", 0755}});
+    system_->write("usr/lib/tmpfiles.d/mail.conf", "d /var/spool/mail 02775 root players -\n");
+    for (const char* const name : {"usr/bin/mounter", "usr/bin/looped", "var/spool/mail"})
+        ::chmod(path(name).c_str(), 04755);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.problems(), "");
+    EXPECT_TRUE(contains(bench.remarks(), "3 files are undecided")) << bench.remarks();
+    EXPECT_EQ(rightsOf(path("usr/bin/mounter")).mode, 04755U);
+}
+
+TEST_F(PermissionJob, TheAdministratorsWordStandsAbove)
+{
+    system_->write("var/lib/dpkg/statoverride",
+                   "root players 2710 /bin/play\nroot #60 0600 /usr/share/games/levels\n");
+    ::chmod(path("usr/share/games/levels").c_str(), 0600);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(rightsOf(path("usr/bin/play")), (Rights{02710, 0, 60}));
+    EXPECT_EQ(rightsOf(path("usr/share/games/levels")), (Rights{0600, 0, 60}));
+}
+
+TEST_F(PermissionJob, ADivertedFileIsTheOneThatWasPutAside)
+{
+    system_->write("var/lib/dpkg/diversions", "/bin/play\n/bin/play.orig\nanother\n");
+    fs::rename(path("usr/bin/play"), path("usr/bin/play.orig"));
+    system_->write("usr/bin/play", "another's");
+    ::chmod(path("usr/bin/play").c_str(), 0700);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.problems(), "");
+    EXPECT_EQ(rightsOf(path("usr/bin/play")).mode, 0700U) << "nobody says anything of this one";
+}
+
+// Links that were planted by whoever could write there must not lead a repair out of the system,
+// nor to a file that it would open to others.
+TEST_F(PermissionJob, APlantedLinkIsNotFollowed)
+{
+    const test::Workshop outside;
+    outside.write("secret", "x");
+    ::chmod(outside.path("secret").c_str(), 0600);
+    fs::remove(path("var/lib/games/list"));
+    fs::create_symlink(outside.path("secret"), path("var/lib/games/list"));
+    fs::remove_all(path("usr/share/games"));
+    fs::create_directories(path("elsewhere"));
+    system_->write("elsewhere/levels", "x");
+    ::chmod(path("elsewhere/levels").c_str(), 0600);
+    fs::create_symlink("../../elsewhere", path("usr/share/games"));
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(rightsOf(outside.path("secret")), (Rights{0600, 0, 0}));
+    EXPECT_EQ(rightsOf(path("elsewhere/levels")).mode, 0600U);
+    EXPECT_TRUE(contains(bench.problems(), "“var/lib/games/list” is a symbolic link"))
+        << bench.problems();
+    EXPECT_TRUE(contains(bench.remarks(), "2 files could not be reached")) << bench.remarks();
+    EXPECT_EQ(bench.listener.error, kPLErrorPermissionsNotRepaired);
+}
+
+TEST_F(PermissionJob, AnotherNameOfSomebodyElsesFileIsLeftAlone)
+{
+    system_->write("etc/shadow", "secret");
+    ::chmod(path("etc/shadow").c_str(), 0600);
+    fs::remove(path("var/lib/games/list"));
+    fs::create_hard_link(path("etc/shadow"), path("var/lib/games/list"));
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(rightsOf(path("etc/shadow")), (Rights{0600, 0, 0}));
+    EXPECT_TRUE(contains(bench.problems(), "has other names too")) << bench.problems();
+}
+
+TEST_F(PermissionJob, WhatNobodyKnowsIsNotPassedAsRight)
+{
+    PermissionBench first(*system_);
+    EXPECT_EQ(first.verifyPermissions(system_->disk()), 0);
+    fs::remove(system_->archiveOf("games"));
+    PermissionBench second(*system_);
+    EXPECT_EQ(second.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(second.listener.verdict, "sound") << "kept from the first time";
+    PermissionBench third(system_->path("no-store"));
+    EXPECT_EQ(third.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(third.listener.verdict, "inconclusive");
+    EXPECT_EQ(third.listener.error, kPLErrorNoReferences);
+    EXPECT_TRUE(contains(third.remarks(), "9 files were not compared")) << third.remarks();
+}
+
+TEST_F(PermissionJob, AStoreThatOthersCanWriteToIsNotBelieved)
+{
+    PermissionBench first(*system_);
+    EXPECT_EQ(first.verifyPermissions(system_->disk()), 0);
+    fs::remove(system_->archiveOf("games"));
+    ::chmod(system_->store().c_str(), 0777);
+    PermissionBench second(*system_);
+    EXPECT_EQ(second.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(second.listener.verdict, "inconclusive");
+}
+
+TEST_F(PermissionJob, ADamagedArchiveIsNoSource)
+{
+    fs::resize_file(system_->archiveOf("games"), fs::file_size(system_->archiveOf("games")) - 60);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.error, kPLErrorNoReferences) << bench.remarks();
+}
+
+TEST_F(PermissionJob, StopsBetweenTwoFiles)
+{
+    damage();
+    PermissionBench bench(*system_);
+    ASSERT_EQ(bench.tool->beginPermissionsRepairForDisk(system_->disk()), 0);
+    bench.tool->cancelCurrentOperation();
+    ASSERT_TRUE(bench.loop.runUntil([&] { return bench.listener.finished == 1; }));
+    const bool wasStopped = bench.listener.verdict == "stopped";
+    EXPECT_TRUE(wasStopped ? bench.listener.error == fixwell::kPLErrorCancelled
+                           : bench.listener.verdict == "repaired");
+    EXPECT_EQ(bench.listener.started, 1);
+    EXPECT_EQ(bench.listener.callsAfterFinished, 0);
+}
+
+TEST_F(PermissionJob, AVolumeThatIsNoSystemIsRefused)
+{
+    const test::Workshop workshop;
+    PermissionBench bench(workshop.path("store"));
+    fs::create_directory(workshop.path("empty"));
+    EXPECT_EQ(bench.verifyPermissions(test::mountedAt(workshop.path("empty"))),
+              fixwell::kPLErrorUnsupported);
+    EXPECT_EQ(bench.verifyPermissions(test::mountedAt({})), fixwell::kPLErrorUnsupported);
+    EXPECT_EQ(installedSystemAt(system_->path()), PackageDatabase::Dpkg);
+    EXPECT_EQ(installedSystemAt("/nowhere"), PackageDatabase::None);
+}
+
+TEST_F(PermissionJob, NamesCannotForgeALine)
+{
+    system_->install("odd", {{"usr/bin/a\x1b[31m%1$@ appears to be OK.", 0755}});
+    ::chmod(path("usr/bin/a\x1b[31m%1$@ appears to be OK.").c_str(), 0700);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "damaged");
+    EXPECT_FALSE(contains(bench.problems(), "\x1b")) << bench.problems();
+}
+
+// The tree of a pacman system, with a mtree as its packages bring it.
+TEST(PacmanJob, TheLocalDatabaseSaysAll)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "giving files to others needs root";
+    const DebianSystem base;
+    fs::remove_all(base.path("var/lib/dpkg"));
+    const std::string local = "var/lib/pacman/local/";
+    base.write(local + "ALPM_DB_VERSION", "9\n");
+    base.write(local + "tool-1-1/desc", "%NAME%\ntool\n");
+    base.write(local + "tool-1-1/mtree",
+               "#mtree\n/set type=file uid=0 gid=0 mode=644\n./.PKGINFO time=1.0 size=9\n"
+               "./usr time=1.0 mode=755 type=dir\n./usr/bin time=1.0 mode=755 type=dir\n"
+               "./usr/bin/su\\040do time=1.0 mode=4755\n./usr/bin/tool time=1.0 mode=755 gid=60\n");
+    base.write("usr/bin/su do", "x");
+    base.write("usr/bin/tool", "x");
+    ::chmod(base.path("usr/bin/tool").c_str(), 0755);
+    EXPECT_EQ(installedSystemAt(base.path()), PackageDatabase::Pacman);
+    PermissionBench bench(base);
+    EXPECT_EQ(bench.repairPermissions(base.disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.problems();
+    EXPECT_EQ(rightsOf(base.path("usr/bin/su do")).mode, 04755U);
+    EXPECT_EQ(rightsOf(base.path("usr/bin/tool")), (Rights{0755, 0, 60}));
+}
+
+// A package made and registered by rpm itself, in a database of its own.
+TEST(RPMJob, TheDatabaseIsAskedWithCapabilities)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "giving files to others needs root";
+    if (findProgram("rpmbuild", "/usr/bin:/bin").empty())
+        GTEST_SKIP() << "rpmbuild is not installed";
+    const DebianSystem base;
+    fs::remove_all(base.path("var/lib/dpkg"));
+    const test::Workshop work;
+    work.write("one.spec",
+               "Name: one\nVersion: 1\nRelease: 1\nSummary: x\nLicense: x\nBuildArch: noarch\n"
+               "%description\nx\n%install\nmkdir -p %{buildroot}/usr/bin %{buildroot}/etc\n"
+               "for f in usr/bin/send usr/bin/su etc/loose etc/odd; do echo > %{buildroot}/$f; "
+               "done\n%files\n%attr(755,root,root) %caps(cap_net_raw=ep) /usr/bin/send\n"
+               "%attr(4750,root,players) /usr/bin/su\n"
+               "%verify(not mode) %attr(644,root,root) /etc/loose\n"
+               "%attr(644,unknown,root) /etc/odd\n");
+    ASSERT_EQ(
+        test::runProgram("rpmbuild", {"-bb", "--define", "_topdir " + work.path("top").native(),
+                                      work.path("one.spec")}),
+        0);
+    fs::create_directories(base.path("var/lib/rpm"));
+    ASSERT_EQ(test::runProgram("rpm",
+                               {"--dbpath", base.path("var/lib/rpm"), "-i", "--justdb", "--nodeps",
+                                "--force-debian", work.path("top/RPMS/noarch/one-1-1.noarch.rpm")}),
+              0);
+    for (const char* const name : {"usr/bin/send", "usr/bin/su", "etc/loose", "etc/odd"})
+        base.write(name, "x");
+    ::chmod(base.path("etc/loose").c_str(), 0600);
+    EXPECT_EQ(installedSystemAt(base.path()), PackageDatabase::RPM);
+    PermissionBench bench(base);
+    EXPECT_EQ(bench.repairPermissions(base.disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.listener.message << bench.problems();
+    EXPECT_TRUE(contains(bench.problems(), "they are none, should be cap_net_raw=ep"))
+        << bench.problems();
+    EXPECT_TRUE(contains(bench.remarks(), "2 files are undecided")) << bench.remarks();
+    EXPECT_EQ(rightsOf(base.path("usr/bin/su")), (Rights{04750, 0, 60}));
+    EXPECT_EQ(rightsOf(base.path("etc/loose")).mode, 0600U);
+    PermissionBench again(base);
+    EXPECT_EQ(again.verifyPermissions(base.disk()), 0);
+    EXPECT_EQ(again.listener.verdict, "sound") << again.problems();
+}
+
+}  // namespace
