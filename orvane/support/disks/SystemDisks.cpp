@@ -147,6 +147,12 @@ DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
     return facts;
 }
 
+// Linux, Documentation/ABI/stable/sysfs-block, "removable": the medium can leave the drive.
+bool isEjectable(const fs::path& device)
+{
+    return attribute(device, "removable") == "1" || !attribute(device, "loop/backing_file").empty();
+}
+
 std::string nameOfWhole(const fs::path& device)
 {
     const std::string backing = attribute(device, "loop/backing_file");
@@ -167,8 +173,7 @@ std::int32_t typeOfWhole(const fs::path& device, const Contents& contents, bool 
         return diskType::opticalDisc;
     const bool hasVolume =
         !contents.superblock.type.empty() || (contents.hasExtBackup && !contents.hasTableTraces);
-    const bool hasTable =
-        contents.table && !mayBeBootSector(*contents.table, contents.superblock);
+    const bool hasTable = contents.table && !mayBeBootSector(*contents.table, contents.superblock);
     const bool isBare = isMounted || (!hasPartitions && !hasTable && hasVolume);
     if (name.starts_with("dm-") || name.starts_with("md"))
         return hasPartitions ? diskType::whole : diskType::assembled;
@@ -206,6 +211,7 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
     const std::string number = attribute(device, "dev");
     DiskFacts facts = baseFacts(device, sources);
     facts.displayName = nameOfWhole(device);
+    facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
     DiskTree tree;
     for (const fs::path& part : sortedEntries(device))
