@@ -84,12 +84,14 @@ std::vector<DiskOperations::Result> DiskOperations::carryOutAll(
 
 void DiskOperations::start(std::vector<DiskRequest> requests, Finished finished)
 {
-    std::erase_if(requests, [this](const auto& request) { return isUnderWay(request.identifier); });
     const Number number = ++latest_;
     Running& running = running_[number];
     running.finished = std::move(finished);
-    for (const DiskRequest& request : requests)
+    std::erase_if(requests, [&](const auto& request) {
+        const bool isKnown = isUnderWay(request.identifier);
         running.identifiers.push_back(request.identifier);
+        return isKnown;
+    });
     try {
         running.thread = std::jthread(
             [&loop = loop_, alive = liveness_, number, requests](const std::stop_token& stop) {

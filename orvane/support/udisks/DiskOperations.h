@@ -33,8 +33,8 @@ public:
     /// this process does itself is brought to its end.
     ~DiskOperations();
 
-    /// Does them one after another and tells from the loop. A disk that is being worked on is left
-    /// out.
+    /// Does them one after another and tells from the loop. A disk that is being worked on, or
+    /// that was named before, is left out.
     void start(std::vector<DiskRequest> requests, Finished finished);
     /// Something is being done to the disk with this identifier.
     [[nodiscard]] bool isUnderWay(const std::string& identifier) const;

@@ -77,7 +77,7 @@ bool isPossible(DiskAction action, const Disk& disk)
     return false;
 }
 
-DiskRequest requestFor(DiskAction action, Disk& disk)
+DiskRequest requestFor(DiskAction action, const Disk& disk)
 {
     const auto whole = wholeOf(disk);
     if (action == DiskAction::Eject)

@@ -36,7 +36,7 @@ struct DiskRequest {
 [[nodiscard]] bool isPossible(DiskAction action, const Disk& disk);
 
 /// What is mounted of a drive is unmounted before it is ejected. Asked only where it is possible.
-[[nodiscard]] DiskRequest requestFor(DiskAction action, Disk& disk);
+[[nodiscard]] DiskRequest requestFor(DiskAction action, const Disk& disk);
 
 /// "cannot mount “NAME”: REASON", in the user's language.
 [[nodiscard]] std::string failureText(const DiskRequest& request, const Refusal& refusal,
