@@ -222,8 +222,13 @@ void DesktopSession::warn(const std::string& sentence)
 
 void DesktopSession::showWarnings()
 {
-    if (!warnings_.empty())
-        host_.alerts().simpleModuleAlert("", joined(std::exchange(warnings_, {})), 0);
+    showFailures(std::exchange(warnings_, {}));
+}
+
+void DesktopSession::showFailures(const std::vector<std::string>& sentences)
+{
+    if (!sentences.empty())
+        host_.alerts().simpleModuleAlert("", joined(sentences), 0);
 }
 
 }  // namespace orvane::desktop

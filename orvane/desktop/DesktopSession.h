@@ -77,8 +77,11 @@ private:
 
     std::vector<Menu> menus();
     void chooseImages();
-    void ejectSelection();
-    bool canEjectSelection();
+    std::vector<DiskRequest> requestsFor(DiskAction action);
+    bool canDo(DiskAction action);
+    void doToSelection(DiskAction action);
+    MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
+                            DiskAction action);
     fixwell::OutlineView* log();
     void reloadLog();
     void completeLog();
@@ -103,6 +106,7 @@ private:
 
     void warn(const std::string& sentence);
     void showWarnings();
+    void showFailures(const std::vector<std::string>& sentences);
     std::string text(std::string_view key) { return host_.translator().text(key); }
 
     const SessionOptions options_;

@@ -9,11 +9,11 @@
 namespace orvane::desktop {
 namespace {
 
-std::vector<DiskTree> readDisks()
+std::vector<DiskTree> readDisks(DiskReader& reader)
 {
     DiskSources sources;
     sources.homeDirectory = environmentValue("HOME").value_or("");
-    return readSystemDisks(sources);
+    return reader.read(sources);
 }
 
 }  // namespace
@@ -29,8 +29,8 @@ void DiskScan::start()
         mustScanAgain_ = true;
         return;
     }
-    const auto scan = [&loop = loop_, scan = liveness_] {
-        loop.post([scan, disks = readDisks()] {
+    const auto scan = [&loop = loop_, &reader = reader_, scan = liveness_] {
+        loop.post([scan, disks = readDisks(reader)] {
             if (*scan != nullptr)
                 (*scan)->finish(disks);
         });
@@ -38,7 +38,7 @@ void DiskScan::start()
     try {
         thread_ = std::jthread(scan);
     } catch (const std::system_error&) {
-        finish(readDisks());
+        finish(readDisks(reader_));
     }
 }
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/udisks/DiskReader.h"
 
 #include <functional>
 #include <memory>
@@ -39,6 +39,7 @@ private:
     bool mustScanAgain_ = false;
     /// Handed to the task that reports back, which finds it empty when this object has gone.
     Liveness liveness_ = std::make_shared<DiskScan*>(this);
+    DiskReader reader_;  ///< the thread's, while there is one
     std::jthread thread_;
 };
 

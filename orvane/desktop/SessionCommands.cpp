@@ -7,8 +7,6 @@
 #include <QFile>
 #include <QFileDialog>
 
-#include <algorithm>
-
 namespace orvane::desktop {
 
 std::vector<Menu> DesktopSession::menus()
@@ -21,13 +19,10 @@ std::vector<Menu> DesktopSession::menus()
         "&File",
         {{"openImage", "&Open Image…", QKeySequence::Open, [this] { chooseImages(); }, isUnlocked},
          {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { scan_.start(); }, isUnlocked},
-         {"eject",
-          "&Eject",
-          {},
-          [this] { ejectSelection(); },
-          [this] {
-              return canEjectSelection();
-          }},
+         diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
+         diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U),
+                     DiskAction::Unmount),
+         diskCommand("eject", "&Eject", QKeySequence(Qt::CTRL | Qt::Key_E), DiskAction::Eject),
          line,
          {"print", "&Print…", QKeySequence::Print,
           [this] {
@@ -87,20 +82,6 @@ void DesktopSession::chooseImages()
                          images_.open(names);
                      });
     dialog->open();
-}
-
-bool DesktopSession::canEjectSelection()
-{
-    const auto disks = window_.disks().selectedDisks();
-    return !controller_.interfaceLock() &&
-           std::any_of(disks.begin(), disks.end(),
-                       [](const auto& disk) { return ImageOpener::canEject(*disk); });
-}
-
-void DesktopSession::ejectSelection()
-{
-    for (const auto& disk : window_.disks().selectedDisks())
-        images_.eject(*disk);
 }
 
 fixwell::OutlineView* DesktopSession::log()

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/SupportHost.h"
 
-#include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/texts/DecimalNumbers.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/support/time/TimeEstimator.h"
@@ -51,19 +50,45 @@ SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
       histories_(store_),
       disks_(center_, {options_.capabilities, &histories_}),
       images_({options_.capabilities, &histories_}, translator_),
+      operations_(loop, translator_),
       threads_(loop)
 {
     if (options_.historyCompleted)
         histories_.loadGradually([this] { loadHistoriesLater(); });
-    disks_.hooks().warn = [this](const std::string& sentence) {
-        warn(sentence);
-    };
+    connectDisks();
 }
 
 SupportHost::~SupportHost()
 {
     *isThere_ = false;
     histories_.saveNew();
+}
+
+void SupportHost::connectDisks()
+{
+    DiskController::Hooks& hooks = disks_.hooks();
+    hooks.warn = [this](const std::string& sentence) {
+        warn(sentence);
+    };
+    hooks.mount = [this](const Disk& disk) {
+        return start(DiskAction::Mount, disk);
+    };
+    hooks.eject = [this](const Disk& disk) {
+        return start(DiskAction::Eject, disk);
+    };
+}
+
+// Nobody waits for it on the main thread, not even where a module wishes to: somewhere a user may
+// be looking for the password. What fails is told later.
+Outcome<> SupportHost::start(DiskAction action, const Disk& disk)
+{
+    if (isPossible(action, disk))
+        operations_.start({requestFor(action, disk)},
+                          [this](const std::vector<std::string>& failures) {
+                              for (const std::string& failure : failures)
+                                  warn(failure);
+                          });
+    return Done{};
 }
 
 void SupportHost::loadHistoriesLater()
@@ -111,7 +136,7 @@ void SupportHost::refreshDisks()
 {
     DiskSources sources;
     sources.homeDirectory = environmentValue("HOME").value_or("");
-    disks_.synchronize(readSystemDisks(sources));
+    disks_.synchronize(reader_.read(sources));
 }
 
 }  // namespace orvane

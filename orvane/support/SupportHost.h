@@ -15,6 +15,8 @@
 #include "orvane/support/settings/XDGPaths.h"
 #include "orvane/support/texts/ModuleBundle.h"
 #include "orvane/support/texts/Translator.h"
+#include "orvane/support/udisks/DiskOperations.h"
+#include "orvane/support/udisks/DiskReader.h"
 
 #include <filesystem>
 #include <functional>
@@ -74,11 +76,16 @@ public:
     HistoryStore& historyStore() { return store_; }
     DiskHistories& histories() { return histories_; }
 
+    /// Mounts, unmounts and ejects devices.
+    DiskOperations& diskOperations() { return operations_; }
+
     /// Reads the system's disks anew and tells what has changed.
     void refreshDisks();
 
 private:
     void warn(const std::string& sentence);
+    void connectDisks();
+    Outcome<> start(DiskAction action, const Disk& disk);
     void loadHistoriesLater();
     void loadHistories();
 
@@ -93,7 +100,9 @@ private:
     HistoryStore store_;
     DiskHistories histories_;
     DiskController disks_;
+    DiskReader reader_;
     ImageAttacher images_;
+    DiskOperations operations_;
     std::shared_ptr<bool> isThere_ = std::make_shared<bool>(true);  ///< for tasks that come later
     WorkerThreads threads_;  ///< last: no worker may be left when the others go
 };

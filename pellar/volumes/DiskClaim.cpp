@@ -10,10 +10,13 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <chrono>
+#include <thread>
 
 namespace pellar {
 namespace {
 
+using namespace std::chrono_literals;
 using fixwell::ErrorCode;
 
 // O_NONBLOCK: opening a FIFO in a disk's place must not wait for its other end. It has no effect
@@ -53,10 +56,26 @@ ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status
     return isHeldByKernel(disk) ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
 }
 
-ErrorCode lockError(int descriptor, Access access)
+/// The device manager locks a device while it looks at it, as it does after each unmounting
+/// (systemd, "Locking Block Device Access"): a moment that is waited for. A file is nobody's to
+/// look at.
+bool lock(int descriptor, int kind, bool isDevice)
 {
-    const int kind = access == Access::ReadOnly ? LOCK_SH : LOCK_EX;
-    if (::flock(descriptor, kind | LOCK_NB) == 0)
+    const int attempts = isDevice ? 50 : 1;
+    for (int i = 0; i < attempts; ++i) {
+        if (i > 0)
+            std::this_thread::sleep_for(20ms);
+        if (::flock(descriptor, kind | LOCK_NB) == 0)
+            return true;
+        if (errno != EWOULDBLOCK)
+            return false;
+    }
+    return false;
+}
+
+ErrorCode lockError(int descriptor, Access access, bool isDevice)
+{
+    if (lock(descriptor, access == Access::ReadOnly ? LOCK_SH : LOCK_EX, isDevice))
         return fixwell::kPLNoError;
     // Some network file systems know no locks; that is no reason to leave a disk unchecked.
     return errno == EWOULDBLOCK ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
@@ -82,7 +101,7 @@ std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference&
         return fixwell::kPLErrorCannotOpen;
     if (const ErrorCode error = useError(disk, status, paths))
         return error;
-    if (const ErrorCode error = lockError(opened.get(), access))
+    if (const ErrorCode error = lockError(opened.get(), access, S_ISBLK(status.st_mode)))
         return error;
     return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
 }

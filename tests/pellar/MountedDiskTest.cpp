@@ -84,7 +84,7 @@ TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
             options.toolPath = workshop_.fakeTools(c.script);
         test::Bench bench(options);
         EXPECT_EQ(c.repairs ? bench.repair(disk()) : bench.verify(disk()), 0) << c.because;
-        EXPECT_EQ(bench.listener.verdict, c.verdict) << c.because;
+        EXPECT_EQ(bench.listener.verdict, c.verdict) << c.because << ": " << bench.listener.message;
         EXPECT_EQ(mounts(), before_) << c.because;
         EXPECT_TRUE(fs::is_directory(workshop_.path("place") / "part"));
     }

@@ -51,6 +51,9 @@ public:
             number_ = -1;
     }
 
+    /// Somebody else has detached it, and may have given the device to another.
+    void forget() { number_ = -1; }
+
     /// Nothing happens when it is detached already.
     void detach()
     {

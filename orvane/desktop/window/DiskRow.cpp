@@ -92,6 +92,8 @@ QString rowDetails(const DiskRow& row, const Translator& texts)
         parts += sizeText(row.facts.length);
     if (!row.facts.mountPoint.empty())
         parts += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
+    if (row.facts.hasSMARTError)
+        parts += toQt(texts.text("its drive says that it is failing"));
     return parts.join(QStringLiteral(", "));
 }
 

@@ -55,8 +55,7 @@ public:
     bool isWritableVolume() const override { return facts_.isWritable; }
     bool isBootVolume() const override { return facts_.isBootVolume; }
     bool containUserHomeDirectory() const override { return facts_.containsUserHome; }
-    /// Nothing here reads the self-monitoring of drives yet, so no disk is left out for it.
-    bool hasSMARTError() const override { return false; }
+    bool hasSMARTError() const override { return facts_.hasSMARTError; }
     bool isDVDRAM() const override { return false; }
     bool hasBlankOpticalMedia() const override { return facts_.isBlankOptical; }
     bool isOfflineDiskImage() const override { return facts_.type == diskType::diskImage; }

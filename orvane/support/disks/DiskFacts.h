@@ -39,6 +39,10 @@ struct DiskFacts {
     bool isBootVolume = false;
     bool containsUserHome = false;
     bool isBlankOptical = false;
+    /// Of a whole disk: its drive can give the medium back, or it is a loop device.
+    bool isEjectable = false;
+    /// The drive says of itself that it is failing (SMART), or so does that of a part.
+    bool hasSMARTError = false;
 
     std::filesystem::path imagePath;  ///< of an image file that is not attached
 

@@ -150,6 +150,12 @@ DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
     return facts;
 }
 
+// Linux, Documentation/ABI/stable/sysfs-block, "removable": the medium can leave the drive.
+bool isEjectable(const fs::path& device)
+{
+    return attribute(device, "removable") == "1" || !attribute(device, "loop/backing_file").empty();
+}
+
 std::string nameOfWhole(const fs::path& device)
 {
     const std::string backing = attribute(device, "loop/backing_file");
@@ -208,6 +214,7 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
     const std::string number = attribute(device, "dev");
     DiskFacts facts = baseFacts(device, sources);
     facts.displayName = nameOfWhole(device);
+    facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
     DiskTree tree;
     for (const fs::path& part : sortedEntries(device))

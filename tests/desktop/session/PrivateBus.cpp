@@ -1,84 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/desktop/session/PrivateBus.h"
 
-#include "pellar/process/FileDescriptor.h"
-
-#include <fcntl.h>
-#include <poll.h>
-#include <signal.h>
-#include <spawn.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <array>
-
 namespace orvane::desktop::test {
-namespace {
-
-constexpr const char* program = "/usr/bin/dbus-daemon";
-constexpr int addressDescriptor = 3;
-
-std::string configuration(const std::string& directory)
-{
-    return "<busconfig><type>session</type><listen>unix:dir=" + directory +
-           "</listen><policy context=\"default\"><allow send_destination=\"*\" "
-           "eavesdrop=\"true\"/><allow eavesdrop=\"true\"/><allow own=\"*\"/></policy>"
-           "</busconfig>\n";
-}
-
-pid_t start(const std::string& file, int output)
-{
-    posix_spawn_file_actions_t actions;
-    ::posix_spawn_file_actions_init(&actions);
-    ::posix_spawn_file_actions_adddup2(&actions, output, addressDescriptor);
-    // It complains when it may not raise its own limits.
-    ::posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, "/dev/null", O_WRONLY, 0);
-    std::string name = program;
-    std::string configures = "--config-file=" + file;
-    std::string stays = "--nofork";
-    std::string prints = "--print-address=" + std::to_string(addressDescriptor);
-    char* words[] = {name.data(), configures.data(), stays.data(), prints.data(), nullptr};
-    pid_t child = 0;
-    const int error = ::posix_spawn(&child, program, &actions, nullptr, words, environ);
-    ::posix_spawn_file_actions_destroy(&actions);
-    return error == 0 ? child : 0;
-}
-
-std::string readLine(int descriptor)
-{
-    std::string line;
-    pollfd polled{descriptor, POLLIN, 0};
-    while (::poll(&polled, 1, 20'000) == 1) {
-        char c = 0;
-        if (::read(descriptor, &c, 1) != 1 || c == '\n')
-            break;
-        line += c;
-    }
-    return line;
-}
-
-}  // namespace
-
-PrivateBus::PrivateBus()
-{
-    const std::string file = directory_ / "bus.conf";
-    orvane::test::write(file, configuration(directory_.path));
-    auto pipe = pellar::makePipe();
-    daemon_ = pipe ? start(file, pipe->writeEnd.get()) : 0;
-    if (daemon_ == 0)
-        return;
-    pipe->writeEnd.reset();
-    address_ = readLine(pipe->readEnd.get());
-}
 
 PrivateBus::~PrivateBus()
 {
     for (const QString& name : connections_)
         QDBusConnection::disconnectFromBus(name);
-    if (daemon_ == 0)
-        return;
-    ::kill(daemon_, SIGTERM);
-    ::waitpid(daemon_, nullptr, 0);
 }
 
 QDBusConnection PrivateBus::connection(const char* name)
@@ -87,7 +15,7 @@ QDBusConnection PrivateBus::connection(const char* name)
     if (connections_.contains(known))
         return QDBusConnection(known);
     connections_ << known;
-    return QDBusConnection::connectToBus(QString::fromStdString(address_), known);
+    return QDBusConnection::connectToBus(QString::fromStdString(daemon_.address()), known);
 }
 
 BusLookup PrivateBus::lookup(const char* name)

@@ -2,34 +2,28 @@
 #pragma once
 
 #include "orvane/desktop/session/SessionBuses.h"
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/BusDaemon.h"
 
 #include <QDBusConnection>
-
-#include <sys/types.h>
-
-#include <string>
 
 namespace orvane::desktop::test {
 
 /// A bus of the test's own, on which nothing is started by itself; it ends with this object.
 class PrivateBus {
 public:
-    PrivateBus();
+    PrivateBus() = default;
     PrivateBus(const PrivateBus&) = delete;
     PrivateBus& operator=(const PrivateBus&) = delete;
     ~PrivateBus();
 
     /// NO where no bus can be started (no dbus-daemon).
-    bool isRunning() const { return !address_.empty(); }
+    bool isRunning() const { return daemon_.isRunning(); }
     /// A connection of its own for each name.
     QDBusConnection connection(const char* name);
     BusLookup lookup(const char* name);
 
 private:
-    const orvane::test::TemporaryDirectory directory_;
-    pid_t daemon_ = 0;
-    std::string address_;
+    orvane::test::BusDaemon daemon_;
     QStringList connections_;
 };
 

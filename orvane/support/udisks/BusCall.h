@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/udisks/Refusal.h"
+
+#include <sdbus-c++/sdbus-c++.h>
+
+#include <chrono>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <stop_token>
+
+namespace orvane {
+
+/// What is called: a method of UDisks2.
+struct BusMethod {
+    std::string object;
+    std::string interface;
+    std::string name;
+};
+
+/// One call of UDisks2 and the wait for its answer. One thread; the connection outlives it.
+class BusCall {
+public:
+    using Arguments = std::function<void(sdbus::MethodCall& call)>;
+
+    /// Sends the call at once. Throws sdbus::Error where that is not possible.
+    BusCall(sdbus::IConnection& connection, const BusMethod& method, const Arguments& arguments,
+            std::chrono::milliseconds timeout);
+    BusCall(const BusCall&) = delete;
+    BusCall& operator=(const BusCall&) = delete;
+    ~BusCall() { pending_.cancel(); }
+
+    /// Waits until UDisks2 has answered, the call's time is over, `longest` has passed, or the
+    /// thread is asked to stop: the last two are Abandoned, and what UDisks2 does goes on. The
+    /// answer borrows from the connection. Throws sdbus::Error when the bus goes away.
+    [[nodiscard]] Answer<sdbus::MethodReply> wait(
+        const std::stop_token& stop,
+        std::optional<std::chrono::milliseconds> longest = std::nullopt);
+
+private:
+    sdbus::IConnection& connection_;
+    std::unique_ptr<sdbus::IProxy> proxy_;
+    std::optional<Answer<sdbus::MethodReply>> answer_;
+    sdbus::PendingAsyncCall pending_;
+};
+
+}  // namespace orvane

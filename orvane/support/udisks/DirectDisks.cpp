@@ -1,0 +1,122 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/udisks/DirectDisks.h"
+
+#include "orvane/support/files/FileDescriptor.h"
+#include "orvane/support/udisks/MountedAt.h"
+
+#include <fcntl.h>
+#include <libmount/libmount.h>
+#include <linux/cdrom.h>
+#include <linux/loop.h>
+#include <sys/ioctl.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <memory>
+
+namespace orvane::direct {
+namespace {
+
+struct Free {
+    void operator()(libmnt_context* context) const { mnt_free_context(context); }
+    void operator()(libmnt_table* table) const { mnt_unref_table(table); }
+    void operator()(libmnt_cache* cache) const { mnt_unref_cache(cache); }
+};
+using Context = std::unique_ptr<libmnt_context, Free>;
+
+Answer<> answerOf(int error)
+{
+    switch (error) {
+        case 0: return Done{};
+        case EBUSY: return Refusal{Refusal::Kind::Busy, {}};
+        case EPERM:
+        case EACCES: return Refusal{Refusal::Kind::NotAllowed, {}};
+        default: return Refusal{Refusal::Kind::Other, errorText(error)};
+    }
+}
+
+// 0, or an errno value. The library answers its own failures negative, and a system call's with a
+// status of its own (libmount's documentation, "Mount context"). A helper, such as that of NTFS-3G,
+// has neither and told its own standard error.
+int errorOf(const Context& context, int answer)
+{
+    if (answer == 0)
+        return mnt_context_helper_executed(context.get()) == 1 &&
+                       mnt_context_get_helper_status(context.get()) != 0
+                   ? EIO
+                   : 0;
+    const int error = mnt_context_get_syscall_errno(context.get());
+    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
+}
+
+/// Where the table says that the device belongs; empty where it says nothing. The cache knows
+/// devices by their labels and UUIDs, too.
+std::string targetInTable(const std::string& node)
+{
+    const std::unique_ptr<libmnt_table, Free> table(mnt_new_table());
+    const std::unique_ptr<libmnt_cache, Free> cache(mnt_new_cache());
+    if (!table || !cache || mnt_table_set_cache(table.get(), cache.get()) != 0 ||
+        mnt_table_parse_fstab(table.get(), nullptr) != 0)
+        return {};
+    libmnt_fs* const entry = mnt_table_find_source(table.get(), node.c_str(), MNT_ITER_FORWARD);
+    const char* const target = entry != nullptr ? mnt_fs_get_target(entry) : nullptr;
+    return target != nullptr && *target == '/' ? target : "";
+}
+
+Answer<> control(const std::string& node, unsigned long request)
+{
+    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    return answerOf(!device || ::ioctl(device.get(), request, 0) != 0 ? errno : 0);
+}
+
+}  // namespace
+
+bool isAllowed()
+{
+    return ::geteuid() == 0;
+}
+
+Answer<> mount(const std::string& node)
+{
+    const std::string target = targetInTable(node);
+    if (target.empty())
+        return Refusal{Refusal::Kind::NoTable, {}};
+    const Context context(mnt_new_context());
+    if (!context)
+        return answerOf(ENOMEM);
+    // By its target alone, libmount takes the rest from the table.
+    mnt_context_set_target(context.get(), target.c_str());
+    return answerOf(errorOf(context, mnt_context_mount(context.get())));
+}
+
+Answer<> unmount(const std::string& node)
+{
+    auto places = placesOf(node);
+    if (places.empty())
+        return Refusal{Refusal::Kind::AlreadySo, {}};
+    // The last one first: it may lie over or below the others.
+    for (; !places.empty(); places.pop_back()) {
+        const Context context(mnt_new_context());
+        if (!context)
+            return answerOf(ENOMEM);
+        mnt_context_set_target(context.get(), places.back().target.c_str());
+        if (const int error = errorOf(context, mnt_context_umount(context.get())))
+            return answerOf(error);
+    }
+    return Done{};
+}
+
+Answer<> eject(const std::string& node)
+{
+    const auto answer = control(node, CDROMEJECT);
+    const auto* const refusal = std::get_if<Refusal>(&answer);
+    const bool isOther = refusal != nullptr && refusal->kind == Refusal::Kind::Other;
+    return isOther ? Refusal{Refusal::Kind::CannotEject, {}} : answer;
+}
+
+Answer<> detachLoop(const std::string& node)
+{
+    return control(node, LOOP_CLR_FD);
+}
+
+}  // namespace orvane::direct

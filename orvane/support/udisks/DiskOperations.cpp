@@ -1,0 +1,125 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/udisks/DiskOperations.h"
+
+#include "orvane/support/udisks/DirectDisks.h"
+#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/UDisks.h"
+
+#include <algorithm>
+#include <system_error>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+Answer<> throughUDisks(UDisks& udisks, const DiskStep& step)
+{
+    switch (step.kind) {
+        case DiskStep::Kind::Mount: return udisks.mount(step.node);
+        case DiskStep::Kind::Unmount: return udisks.unmount(step.node);
+        case DiskStep::Kind::Eject: return udisks.eject(step.node);
+        case DiskStep::Kind::DetachLoop: return udisks.detachLoop(step.node);
+    }
+    return Refusal{};
+}
+
+Answer<> directly(const DiskStep& step)
+{
+    switch (step.kind) {
+        case DiskStep::Kind::Mount: return direct::mount(step.node);
+        case DiskStep::Kind::Unmount: return direct::unmount(step.node);
+        case DiskStep::Kind::Eject: return direct::eject(step.node);
+        case DiskStep::Kind::DetachLoop: return direct::detachLoop(step.node);
+    }
+    return Refusal{};
+}
+
+Answer<> carryOut(UDisks& udisks, const DiskStep& step)
+{
+    Answer<> answer = throughUDisks(udisks, step);
+    const auto* refusal = std::get_if<Refusal>(&answer);
+    if (refusal != nullptr && isLeftToOthers(*refusal) && direct::isAllowed())
+        answer = directly(step);
+    refusal = std::get_if<Refusal>(&answer);
+    if (refusal != nullptr && refusal->kind == Refusal::Kind::Busy)
+        return Refusal{Refusal::Kind::Busy, holdersText(placesOf(step.node))};
+    return answer;
+}
+
+}  // namespace
+
+Answer<> carryOut(const DiskRequest& request, const std::stop_token& stop)
+{
+    UDisks udisks(stop);
+    for (const DiskStep& step : request.steps) {
+        const Answer<> answer = carryOut(udisks, step);
+        const auto* const refusal = std::get_if<Refusal>(&answer);
+        if (refusal != nullptr && refusal->kind != Refusal::Kind::AlreadySo)
+            return answer;
+    }
+    return Done{};
+}
+
+DiskOperations::~DiskOperations()
+{
+    *liveness_ = nullptr;
+}
+
+bool DiskOperations::isUnderWay(const std::string& identifier) const
+{
+    return std::any_of(running_.begin(), running_.end(), [&](const auto& running) {
+        const auto& identifiers = running.second.identifiers;
+        return std::find(identifiers.begin(), identifiers.end(), identifier) != identifiers.end();
+    });
+}
+
+std::vector<DiskOperations::Result> DiskOperations::carryOutAll(
+    const std::vector<DiskRequest>& requests, const std::stop_token& stop)
+{
+    std::vector<Result> results;
+    for (const DiskRequest& request : requests)
+        results.push_back({request, carryOut(request, stop)});
+    return results;
+}
+
+void DiskOperations::start(std::vector<DiskRequest> requests, Finished finished)
+{
+    const Number number = ++latest_;
+    Running& running = running_[number];
+    running.finished = std::move(finished);
+    std::erase_if(requests, [&](const auto& request) {
+        const bool isKnown = isUnderWay(request.identifier);
+        running.identifiers.push_back(request.identifier);
+        return isKnown;
+    });
+    try {
+        running.thread = std::jthread(
+            [&loop = loop_, alive = liveness_, number, requests](const std::stop_token& stop) {
+                loop.post([alive, number, results = carryOutAll(requests, stop)] {
+                    if (*alive != nullptr)
+                        (*alive)->finish(number, results);
+                });
+            });
+    } catch (const std::system_error& error) {
+        const Refusal refusal{Refusal::Kind::Other, errorText(error.code().value())};
+        std::vector<Result> results;
+        for (const DiskRequest& request : requests)
+            results.push_back({request, refusal});
+        finish(number, results);
+    }
+}
+
+// Taken off first: whoever is told may start the next.
+void DiskOperations::finish(Number number, const std::vector<Result>& results)
+{
+    const auto ended = running_.extract(number);
+    std::vector<std::string> failures;
+    for (const auto& [request, answer] : results)
+        if (const auto* const refusal = std::get_if<Refusal>(&answer);
+            refusal != nullptr && !isSilent(*refusal))
+            failures.push_back(failureText(request, *refusal, texts_));
+    if (ended.mapped().finished)
+        ended.mapped().finished(failures);
+}
+
+}  // namespace orvane

@@ -1,0 +1,45 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/disks/Disk.h"
+#include "orvane/support/udisks/Refusal.h"
+
+#include <string>
+#include <vector>
+
+namespace orvane {
+
+enum class DiskAction { Mount, Unmount, Eject };
+
+/// One thing that is done to a device by its node.
+struct DiskStep {
+    enum class Kind { Mount, Unmount, Eject, DetachLoop };
+
+    Kind kind;
+    std::string node;
+
+    friend bool operator==(const DiskStep&, const DiskStep&) = default;
+};
+
+/// What has to be done, in this order, until a step fails. Plain: may go to another thread.
+struct DiskRequest {
+    DiskAction action = DiskAction::Mount;
+    std::string identifier;  ///< of the disk; of a drive's whole disk when it is ejected
+    std::string name;        ///< printable
+    std::vector<DiskStep> steps;
+};
+
+// Main thread, as all of Disk.
+
+/// A volume of a device that is not mounted; one that is, but not as the system's root; a device
+/// that can be ejected and does not hold the system's root, or any part of one.
+[[nodiscard]] bool isPossible(DiskAction action, const Disk& disk);
+
+/// What is mounted of a drive is unmounted before it is ejected. Asked only where it is possible.
+[[nodiscard]] DiskRequest requestFor(DiskAction action, const Disk& disk);
+
+/// "cannot mount “NAME”: REASON", in the user's language.
+[[nodiscard]] std::string failureText(const DiskRequest& request, const Refusal& refusal,
+                                      const Translator& texts);
+
+}  // namespace orvane

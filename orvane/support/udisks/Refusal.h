@@ -1,0 +1,51 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/support/Failure.h"
+#include "orvane/support/texts/Translator.h"
+
+#include <string>
+#include <string_view>
+#include <variant>
+
+namespace orvane {
+
+/// Why a disk was not mounted, unmounted or ejected.
+struct Refusal {
+    enum class Kind {
+        NoService,      ///< there is no system bus, or no UDisks2 on it
+        UnknownDevice,  ///< UDisks2 has not heard of the device
+        NoFilesystem,
+        AlreadySo,  ///< mounted, or not mounted, as was wanted
+        Busy,       ///< `detail` names who holds it, where that can be seen
+        NotAllowed,
+        Dismissed,  ///< the user would not say the password
+        NoAnswer,   ///< within the time
+        Ended,      ///< UDisks2 went away while it worked
+        Abandoned,  ///< the program ends
+        NoTable,    ///< /etc/fstab does not say where
+        CannotEject,
+        Other,  ///< `detail` says what
+    };
+
+    Kind kind = Kind::Other;
+    std::string detail;  ///< printable
+
+    friend bool operator==(const Refusal&, const Refusal&) = default;
+};
+
+template <class T = Done>
+using Answer = std::variant<T, Refusal>;
+
+/// What an error that came over the bus means. Its name and text are from outside: any bytes.
+[[nodiscard]] Refusal refusalOf(std::string_view errorName, std::string_view errorText);
+
+/// Only the machine itself is left to ask: there is no UDisks2, or it does not know the device.
+[[nodiscard]] bool isLeftToOthers(const Refusal& refusal);
+/// Nothing that anybody needs to be told.
+[[nodiscard]] bool isSilent(const Refusal& refusal);
+
+/// The end of a sentence that begins with what was attempted.
+[[nodiscard]] std::string reasonText(const Refusal& refusal, const Translator& texts);
+
+}  // namespace orvane

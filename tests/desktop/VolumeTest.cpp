@@ -1,0 +1,94 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/UDisks.h"
+#include "tests/desktop/WindowFixture.h"
+#include "tests/support/LoopDevice.h"
+#include "tests/support/ToolRun.h"
+
+#include <QMenu>
+
+#include <unistd.h>
+
+#include <fstream>
+
+namespace orvane::desktop::test {
+namespace {
+
+using orvane::test::LoopDevice;
+
+/// The window with the machine's own disks and its UDisks2, and a loop device among them.
+class VolumeTest : public WindowFixture {
+protected:
+    ~VolumeTest() override
+    {
+        if (device_ && !placesOf(device_->name()).empty())
+            orvane::test::runTool({"umount", device_->name()});
+    }
+    void SetUp() override
+    {
+        if (const char* const obstacle = LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
+        device_ = std::make_unique<LoopDevice>(makeImage("volume"));
+        if (device_->name().empty())
+            GTEST_SKIP() << "no loop device can be set up here";
+        if (asked() == Refusal::Kind::NoService)
+            GTEST_SKIP() << "no UDisks2 runs here";
+        ASSERT_TRUE(waitUntil([&] { return asked() == Refusal::Kind::AlreadySo; }));
+        SessionOptions options;
+        options.paths = {directory_ / "config", directory_ / "state", directory_ / "cache",
+                         directory_ / "data"};
+        session_ = std::make_unique<DesktopSession>(std::move(options));
+        session_->show();
+        ASSERT_TRUE(waitUntil([&] { return cell(device_->name(), DiskColumn::Name) == "volume"; }));
+        select(device_->name());
+    }
+
+    /// What UDisks2 says to a device that is not mounted: known, or not yet.
+    Refusal::Kind asked() const
+    {
+        return std::get<Refusal>(UDisks().unmount(device_->name())).kind;
+    }
+    std::string mountPoint() { return cell(device_->name(), DiskColumn::MountPoint); }
+    /// The commands for volumes that the open menu offers, by their first letters.
+    std::string offered()
+    {
+        auto* const menu = qobject_cast<QMenu*>(command("mount").parent());
+        emit menu->aboutToShow();
+        std::string letters;
+        for (const char* const name : {"mount", "unmount", "eject"})
+            if (command(name).isEnabled())
+                letters += *name;
+        return letters;
+    }
+
+    std::unique_ptr<LoopDevice> device_;
+};
+
+TEST_F(VolumeTest, AVolumeIsMountedUnmountedAndEjectedFromTheMenu)
+{
+    EXPECT_EQ(offered(), "me");
+    command("mount").trigger();
+    EXPECT_EQ(offered(), "") << "it is under way";
+    ASSERT_TRUE(waitUntil([&] { return !mountPoint().empty(); }));
+    ASSERT_TRUE(waitUntil([&] { return offered() == "ue"; }));
+    {
+        const std::ofstream file(mountPoint() + "/file");
+        command("unmount").trigger();
+        ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; }));
+        const QString text = sheet()->text() + sheet()->informativeText();
+        EXPECT_TRUE(text.contains(toQt("cannot unmount “volume”: it is in use by ")));
+        EXPECT_TRUE(text.contains(QString::number(::getpid()))) << fromQt(text);
+        takePicture("unmount-busy");
+        press(*sheet(), QStringLiteral("OK"));
+    }
+    EXPECT_FALSE(mountPoint().empty());
+    command("eject").trigger();
+    EXPECT_TRUE(waitUntil([&] { return cell(device_->name(), DiskColumn::Name).empty(); }));
+    EXPECT_EQ(offered(), "");
+    EXPECT_EQ(sheet(), nullptr);
+    device_->forget();
+}
+
+}  // namespace
+}  // namespace orvane::desktop::test

@@ -1,0 +1,325 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "TemporaryDirectory.h"
+#include "ToolRun.h"
+#include "orvane/support/loop/MainLoop.h"
+#include "orvane/support/udisks/DiskOperations.h"
+#include "orvane/support/udisks/DiskReader.h"
+#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/UDisks.h"
+#include "tests/support/BusDaemon.h"
+#include "tests/support/LoopDevice.h"
+
+#include <gtest/gtest.h>
+#include <sdbus-c++/sdbus-c++.h>
+#include <unistd.h>
+
+#include <atomic>
+#include <fstream>
+#include <map>
+
+namespace orvane {
+namespace {
+
+using Kind = Refusal::Kind;
+using test::LoopDevice;
+using test::TemporaryDirectory;
+using namespace std::chrono_literals;
+
+/// A variable of the environment, put back at the end.
+class Setting {
+public:
+    Setting(const char* name, const std::string& value) : name_(name)
+    {
+        const char* const old = std::getenv(name);
+        if (old != nullptr)
+            old_ = old;
+        ::setenv(name, value.c_str(), 1);
+    }
+    Setting(const Setting&) = delete;
+    Setting& operator=(const Setting&) = delete;
+    ~Setting() { old_ ? ::setenv(name_, old_->c_str(), 1) : ::unsetenv(name_); }
+
+private:
+    const char* name_;
+    std::optional<std::string> old_;
+};
+
+Kind kindOf(const Answer<>& answer)
+{
+    return std::get<Refusal>(answer).kind;
+}
+
+DiskRequest request(DiskAction action, DiskStep::Kind kind, const std::string& node)
+{
+    return {action, node, node, {{kind, node}}};
+}
+
+/// A loop device with a file system, and a thread behind the loop's back that works on it.
+class DeviceTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (const char* const obstacle = LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
+        const std::string image = directory_ / "volume.img";
+        ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", image, "8M"}), 0);
+        device_ = std::make_unique<LoopDevice>(image);
+        if (device_->name().empty())
+            GTEST_SKIP() << "no loop device can be set up here";
+    }
+    void TearDown() override
+    {
+        if (device_ && isMounted())
+            test::runTool({"umount", device_->name()});
+    }
+
+    bool isMounted() const { return !placesOf(device_->name()).empty(); }
+    // The kernel waits for whoever has it open, as udevd does for a moment (loop(4)).
+    bool isDetached()
+    {
+        const auto name = std::filesystem::path(device_->name()).filename();
+        const auto image = "/sys/block" / name / "loop/backing_file";
+        for (int i = 0; i < 100 && std::filesystem::exists(image); ++i)
+            ::usleep(100'000);
+        if (std::filesystem::exists(image))
+            return false;
+        device_->forget();
+        return true;
+    }
+    std::vector<std::string> doIt(DiskAction action, DiskStep::Kind kind)
+    {
+        std::optional<std::vector<std::string>> told;
+        operations_.start({request(action, kind, device_->name())},
+                          [&](const std::vector<std::string>& failures) { told = failures; });
+        EXPECT_TRUE(operations_.isUnderWay(device_->name()));
+        loop_.runUntil([&] { return told.has_value(); });
+        EXPECT_FALSE(operations_.isUnderWay(device_->name()));
+        return *told;
+    }
+    std::vector<std::string> mount() { return doIt(DiskAction::Mount, DiskStep::Kind::Mount); }
+    std::vector<std::string> unmount()
+    {
+        return doIt(DiskAction::Unmount, DiskStep::Kind::Unmount);
+    }
+    std::vector<std::string> eject() { return doIt(DiskAction::Eject, DiskStep::Kind::DetachLoop); }
+
+    static std::vector<std::string> nothing() { return {}; }
+
+    const TemporaryDirectory directory_;
+    std::unique_ptr<LoopDevice> device_;
+    const Translator texts_;
+    MainLoop loop_;
+    DiskOperations operations_{loop_, texts_};
+};
+
+/// With the UDisks2 of this machine.
+class UDisksTest : public DeviceTest {
+protected:
+    void SetUp() override
+    {
+        DeviceTest::SetUp();
+        if (IsSkipped() || HasFatalFailure())
+            return;
+        // udevd has to tell it of the device first.
+        for (int i = 0; i < 100; ++i) {
+            const auto answer = UDisks().unmount(device_->name());
+            if (kindOf(answer) == Kind::AlreadySo)
+                return;
+            if (kindOf(answer) == Kind::NoService)
+                GTEST_SKIP() << "no UDisks2 runs here";
+            ::usleep(100'000);
+        }
+        FAIL() << "UDisks2 does not learn of new devices";
+    }
+};
+
+TEST_F(UDisksTest, ADeviceIsMountedUnmountedAndEjected)
+{
+    EXPECT_EQ(mount(), nothing());
+    EXPECT_TRUE(isMounted());
+    EXPECT_EQ(mount(), nothing()) << "what is so already is no failure";
+    const auto place = placesOf(device_->name());
+    ASSERT_FALSE(place.empty());
+    {
+        const std::ofstream file(place.front().target + "/file");
+        const auto failures = unmount();
+        ASSERT_EQ(failures.size(), 1U);
+        EXPECT_NE(failures.front().find("(" + std::to_string(::getpid()) + ")"), std::string::npos)
+            << "names who holds it: " << failures.front();
+    }
+    EXPECT_EQ(unmount(), nothing());
+    EXPECT_FALSE(isMounted());
+    EXPECT_EQ(eject(), nothing());
+    EXPECT_TRUE(isDetached());
+}
+
+TEST_F(UDisksTest, ALoopDeviceHasNoDriveToEject)
+{
+    EXPECT_EQ(kindOf(UDisks().eject(device_->name())), Kind::CannotEject);
+}
+
+/// Without any UDisks2, as root.
+class DirectTest : public DeviceTest {
+protected:
+    const Setting nowhere_{"DBUS_SYSTEM_BUS_ADDRESS", "unix:path=/nonexistent/bus"};
+    const Setting table_{"LIBMOUNT_FSTAB", directory_ / "fstab"};
+};
+
+TEST_F(DirectTest, RootMountsWhereTheTableSays)
+{
+    auto failures = mount();
+    ASSERT_EQ(failures.size(), 1U);
+    EXPECT_NE(failures.front().find("fstab"), std::string::npos) << failures.front();
+    EXPECT_FALSE(isMounted());
+
+    const std::string target = directory_ / "mnt";
+    std::filesystem::create_directory(target);
+    test::write(directory_ / "fstab", device_->name() + " " + target + " ext4 ro,noauto 0 0\n");
+    EXPECT_EQ(mount(), nothing());
+    ASSERT_EQ(placesOf(device_->name()).size(), 1U);
+    EXPECT_EQ(placesOf(device_->name()).front().target, target);
+    EXPECT_EQ(unmount(), nothing());
+    EXPECT_FALSE(isMounted());
+    EXPECT_EQ(eject(), nothing());
+    EXPECT_TRUE(isDetached());
+}
+
+using Options = std::map<std::string, sdbus::Variant>;
+
+/// A UDisks2 with one failing drive and one volume on it, which mounts when it is told to.
+class FakeUDisks {
+public:
+    explicit FakeUDisks(const std::string& address)
+        : connection_(sdbus::createSessionBusConnectionWithAddress(address))
+    {
+        root_ = add("");
+        root_->addObjectManager();
+        manager_ = add("/Manager");
+        manager_->registerMethod("ResolveDevice")
+            .onInterface("org.freedesktop.UDisks2.Manager")
+            .implementedAs([](const Options&, const Options&) {
+                return std::vector{sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
+            });
+        manager_->finishRegistration();
+        addVolume();
+        addDrive();
+        connection_->requestName("org.freedesktop.UDisks2");
+        connection_->enterEventLoopAsync();
+    }
+    ~FakeUDisks() { connection_->leaveEventLoop(); }
+
+    std::atomic<bool> isAsked = false;
+    std::atomic<bool> answers = false;
+
+private:
+    std::unique_ptr<sdbus::IObject> add(const std::string& path)
+    {
+        return sdbus::createObject(*connection_, "/org/freedesktop/UDisks2" + path);
+    }
+    void addVolume()
+    {
+        volume_ = add("/block_devices/x");
+        volume_->registerMethod("Mount")
+            .onInterface("org.freedesktop.UDisks2.Filesystem")
+            .implementedAs([this](sdbus::Result<std::string>&& result, const Options&) {
+                if (answers)
+                    result.returnResults("/mnt");
+                else
+                    unanswered_.push_back(std::move(result));
+                isAsked = true;
+            });
+        volume_->registerProperty("Device")
+            .onInterface("org.freedesktop.UDisks2.Block")
+            .withGetter([] { return std::vector<std::uint8_t>{'/', 'd', 'e', 'v', '/', 'x', 0}; });
+        volume_->registerProperty("Drive")
+            .onInterface("org.freedesktop.UDisks2.Block")
+            .withGetter([] { return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d"); });
+        volume_->finishRegistration();
+    }
+    void addDrive()
+    {
+        drive_ = add("/drives/d");
+        drive_->registerProperty("SmartUpdated")
+            .onInterface("org.freedesktop.UDisks2.Drive.Ata")
+            .withGetter([] { return std::uint64_t{1700000000}; });
+        drive_->registerProperty("SmartFailing")
+            .onInterface("org.freedesktop.UDisks2.Drive.Ata")
+            .withGetter([] { return true; });
+        drive_->finishRegistration();
+    }
+
+    std::unique_ptr<sdbus::IConnection> connection_;
+    std::vector<sdbus::Result<std::string>> unanswered_;
+    std::unique_ptr<sdbus::IObject> root_, manager_, volume_, drive_;
+};
+
+class FakeUDisksTest : public testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (!bus_.isRunning())
+            GTEST_SKIP() << "no bus can be started (package dbus-daemon)";
+    }
+    void start(DiskOperations& operations)
+    {
+        told_.reset();
+        operations.start({request(DiskAction::Mount, DiskStep::Kind::Mount, "/dev/x")},
+                         [this](const std::vector<std::string>& failures) { told_ = failures; });
+    }
+    void waitUntilAsked(const FakeUDisks& fake)
+    {
+        while (!fake.isAsked)
+            ::usleep(1000);
+    }
+
+    const test::BusDaemon bus_;
+    const Setting address_{"DBUS_SYSTEM_BUS_ADDRESS", bus_.address()};
+    const Translator texts_;
+    MainLoop loop_;
+    std::optional<std::vector<std::string>> told_;
+};
+
+TEST_F(FakeUDisksTest, ItMayEndInTheMiddleAndComeBack)
+{
+    DiskOperations operations(loop_, texts_);
+    auto first = std::make_unique<FakeUDisks>(bus_.address());
+    start(operations);
+    waitUntilAsked(*first);
+    first.reset();
+    loop_.runUntil([&] { return told_.has_value(); });
+    EXPECT_EQ(*told_,
+              std::vector<std::string>{"cannot mount “/dev/x”: UDisks2 ended in the middle of it"});
+
+    FakeUDisks second(bus_.address());
+    second.answers = true;
+    start(operations);
+    loop_.runUntil([&] { return told_.has_value(); });
+    EXPECT_EQ(*told_, std::vector<std::string>());
+}
+
+TEST_F(FakeUDisksTest, TheProgramEndsWithoutWaitingForAnAnswer)
+{
+    const FakeUDisks fake(bus_.address());
+    {
+        DiskOperations operations(loop_, texts_);
+        start(operations);
+        waitUntilAsked(fake);
+    }
+    loop_.runUntil([] { return true; });
+    EXPECT_FALSE(told_) << "who wanted to know may be gone";
+}
+
+TEST_F(FakeUDisksTest, TheHealthOfAllDrivesComesWithOneCall)
+{
+    const auto ask = [](std::chrono::milliseconds longest) {
+        UDisks udisks;
+        udisks.askForFailingDrives();
+        return udisks.failingDrives(longest);
+    };
+    EXPECT_EQ(std::get<Refusal>(ask(20s)).kind, Kind::NoService);
+    const FakeUDisks fake(bus_.address());
+    EXPECT_EQ(std::get<0>(ask(20s)), (std::set<std::string>{"/dev/x"}));
+}
+
+}  // namespace
+}  // namespace orvane
