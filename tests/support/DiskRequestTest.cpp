@@ -121,7 +121,7 @@ TEST(Refusal, OnlyWhatTheUserKnowsAlreadyIsSilent)
     const auto request = requestFor(DiskAction::Unmount, *make({facts("/d", 3, "/m"), {}}));
     for (const Kind kind :
          {Kind::NoService, Kind::UnknownDevice, Kind::NoFilesystem, Kind::Busy, Kind::NotAllowed,
-          Kind::NoAnswer, Kind::Ended, Kind::NoTable, Kind::CannotEject}) {
+          Kind::NoAnswer, Kind::Ended, Kind::NoTable, Kind::CannotEject, Kind::HoldsSystem}) {
         EXPECT_FALSE(isSilent({kind, {}}));
         EXPECT_GT(failureText(request, {kind, {}}, Translator()).size(),
                   std::string_view("cannot unmount “/d”: ").size())

@@ -184,6 +184,19 @@ TEST_F(DirectTest, RootMountsWhereTheTableSays)
     EXPECT_TRUE(isDetached());
 }
 
+// With the one step that could do no harm to it.
+TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
+{
+    const auto mounts = currentMounts();
+    const auto root = std::find_if(mounts.begin(), mounts.end(),
+                                   [](const Mount& mount) { return mount.mountPoint == "/"; });
+    if (root == mounts.end() || placesOf(root->source).empty())
+        GTEST_SKIP() << "the root of this system is on no device";
+    EXPECT_EQ(
+        kindOf(carryOut(request(DiskAction::Eject, DiskStep::Kind::DetachLoop, root->source))),
+        Kind::HoldsSystem);
+}
+
 using Options = std::map<std::string, sdbus::Variant>;
 
 /// A UDisks2 with one failing drive and one volume on it, which mounts when it is told to.

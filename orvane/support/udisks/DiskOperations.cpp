@@ -34,13 +34,33 @@ Answer<> directly(const DiskStep& step)
     return Refusal{};
 }
 
+// UDisks2 may be there and not know the device; then that is the reason, and not the missing table.
+Answer<> throughAny(UDisks& udisks, const DiskStep& step)
+{
+    const Answer<> answer = throughUDisks(udisks, step);
+    const auto* const refusal = std::get_if<Refusal>(&answer);
+    if (refusal == nullptr || !isLeftToOthers(*refusal) || !direct::isAllowed())
+        return answer;
+    const Answer<> other = directly(step);
+    const bool saysNothing = refusal->kind == Refusal::Kind::UnknownDevice && other.index() == 1 &&
+                             std::get<Refusal>(other).kind == Refusal::Kind::NoTable;
+    return saysNothing ? answer : other;
+}
+
+// Asked of the mounts as they are now: the list of disks may be out of date. Root's own attempt
+// would take away what else of the device is mounted before it came to "/".
+bool holdsSystem(const std::vector<pellar::MountPlace>& places)
+{
+    return std::any_of(places.begin(), places.end(),
+                       [](const auto& place) { return place.target == "/"; });
+}
+
 Answer<> carryOut(UDisks& udisks, const DiskStep& step)
 {
-    Answer<> answer = throughUDisks(udisks, step);
-    const auto* refusal = std::get_if<Refusal>(&answer);
-    if (refusal != nullptr && isLeftToOthers(*refusal) && direct::isAllowed())
-        answer = directly(step);
-    refusal = std::get_if<Refusal>(&answer);
+    if (step.kind != DiskStep::Kind::Mount && holdsSystem(placesOf(step.node)))
+        return Refusal{Refusal::Kind::HoldsSystem, {}};
+    const Answer<> answer = throughAny(udisks, step);
+    const auto* const refusal = std::get_if<Refusal>(&answer);
     if (refusal != nullptr && refusal->kind == Refusal::Kind::Busy)
         return Refusal{Refusal::Kind::Busy, holdersText(placesOf(step.node))};
     return answer;

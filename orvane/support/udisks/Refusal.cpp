@@ -90,6 +90,7 @@ std::string reasonText(const Refusal& refusal, const Translator& texts)
         case Kind::NoTable:
             return texts.text(
                 "UDisks2 cannot be reached, and /etc/fstab does not say where to mount it");
+        case Kind::HoldsSystem: return texts.text("the system runs from it");
         case Kind::CannotEject: return texts.text("its drive does not eject");
         case Kind::AlreadySo:
         case Kind::Dismissed:

@@ -25,7 +25,8 @@ struct Refusal {
         Abandoned,  ///< the program ends
         NoTable,    ///< /etc/fstab does not say where
         CannotEject,
-        Other,  ///< `detail` says what
+        HoldsSystem,  ///< the system runs from it
+        Other,        ///< `detail` says what
     };
 
     Kind kind = Kind::Other;

@@ -13,18 +13,21 @@ const ActionButton& actionButtonFor(Command command)
     return found == actionButtons.end() ? actionButtons.front() : *found;
 }
 
-std::string unavailableReason(Session& session, const TerminalButton& button)
+// The module leaves a failing drive out of its selection, so it has no reason of its own.
+std::string unavailableReason(Session& session, const TerminalButton& button, const Disk& disk)
 {
+    const Translator& texts = session.host().translator();
+    if (disk.hasSMARTError())
+        return texts.text("Not available because the drive says that it is failing.");
     const std::string reason = button.reason();
-    return reason.empty() ? session.host().translator().text("Not available for this disk.")
-                          : reason;
+    return reason.empty() ? texts.text("Not available for this disk.") : reason;
 }
 
 std::string unavailableSentence(Session& session, const TerminalButton& button,
                                 const NamedDisk& disk)
 {
-    return fixwell::format("%@: %@: %@",
-                           {disk.name, button.title(), unavailableReason(session, button)});
+    return fixwell::format(
+        "%@: %@: %@", {disk.name, button.title(), unavailableReason(session, button, *disk.disk)});
 }
 
 }  // namespace orvane

@@ -24,9 +24,9 @@ inline constexpr std::array<ActionButton, 4> actionButtons{{
 
 const ActionButton& actionButtonFor(Command command);
 
-/// Why the action cannot be used on the selected disk: the module's reason, or that there is none
-/// to be had.
-std::string unavailableReason(Session& session, const TerminalButton& button);
+/// Why the action cannot be used on the selected disk: that its drive is failing, the module's
+/// reason, or that there is none to be had.
+std::string unavailableReason(Session& session, const TerminalButton& button, const Disk& disk);
 
 /// The same as a sentence that names the action and the disk.
 std::string unavailableSentence(Session& session, const TerminalButton& button,

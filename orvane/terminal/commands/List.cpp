@@ -29,7 +29,7 @@ std::vector<ActionLine> actionsFor(const std::shared_ptr<Disk>& disk, Session& s
     for (const ActionButton& action : actionButtons) {
         const TerminalButton& button = session.button(action.outlet);
         lines.push_back({action.name, button.title(), button.isEnabled(),
-                         button.isEnabled() ? "" : unavailableReason(session, button)});
+                         button.isEnabled() ? "" : unavailableReason(session, button, *disk)});
     }
     return lines;
 }
