@@ -196,7 +196,6 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
             known = &partition;
     // The kernel gives the device of an extended partition two sectors, for its loader.
     const bool isContainer = known != nullptr ? known->isContainer : facts.length <= 1024;
-    const bool announces = known != nullptr && announcesFilesystem(*known);
     if (known != nullptr && !known->name.empty())
         facts.displayName = known->name;
     if (isContainer) {
@@ -205,7 +204,8 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
         addSuperblock(facts, contentsOf(facts.path, number, facts.length, sources));
         addMount(facts, number, sources);
     }
-    facts.isShown = !isContainer && (!facts.filesystem.empty() || facts.isBootVolume || announces);
+    // Also one without a file system: it may have lost it, and lsblk(8) shows it, too.
+    facts.isShown = !isContainer;
     return {facts, {}};
 }
 
