@@ -36,8 +36,7 @@ bool needsPrivileges(const fixwell::DiskReference& disk, Operation operation,
     if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return false;
     const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
-    return ::access(disk.path.c_str(), wanted) != 0 ||
-           !mountPlacesOf(status.st_rdev, paths).empty();
+    return ::access(disk.path.c_str(), wanted) != 0 || !mountPlacesOf(disk.path, paths).empty();
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -143,13 +142,9 @@ bool RepairDisk::beginPrivileged(const DiskReferencePointer& disk, Operation ope
 ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation operation,
                                    ErrorCode error)
 {
-    struct stat status = {};
-    const bool isDevice = ::stat(disk->path.c_str(), &status) == 0 && S_ISBLK(status.st_mode);
-    const bool mayBeMounted =
-        error == fixwell::kPLErrorCouldNotUnmount || error == fixwell::kPLErrorDiskInUse;
-    if (!isDevice || !mayBeMounted)
+    if (error != fixwell::kPLErrorCouldNotUnmount && error != fixwell::kPLErrorDiskInUse)
         return error;
-    auto mounts = mountPlacesOf(status.st_rdev, options_.systemPaths);
+    auto mounts = mountPlacesOf(disk->path, options_.systemPaths);
     const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
                                     [](const MountPlace& place) { return place.target == "/"; });
     if (mounts.empty() || isRoot)

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/mounts/Holders.h"
 
+#include "fixwell/host/foundation/UTF8.h"
+
 #include <algorithm>
 #include <fstream>
 #include <system_error>
@@ -83,6 +85,15 @@ std::vector<std::string> holdersOf(std::string_view mountPoint, const fs::path& 
         if (isIn(firstLineOf(device / "loop/backing_file"), mountPoint))
             holders.push_back(device.filename().native());
     return holders;
+}
+
+std::string shownNames(const std::vector<std::string>& names)
+{
+    constexpr std::size_t most = 4;
+    std::string text;
+    for (std::size_t i = 0; i < names.size() && i < most; ++i)
+        text += (text.empty() ? "" : ", ") + fixwell::printable(names[i]);
+    return names.size() > most ? text + ", …" : text;
 }
 
 }  // namespace pellar

@@ -16,4 +16,7 @@ namespace pellar {
     std::string_view mountPoint, const std::filesystem::path& processes = "/proc",
     const std::filesystem::path& blockDevices = "/sys/block");
 
+/// The first few of the names in one line, fit to be shown.
+[[nodiscard]] std::string shownNames(const std::vector<std::string>& names);
+
 }  // namespace pellar

@@ -61,6 +61,14 @@ std::vector<MountPlace> mountPlacesOf(dev_t device, const SystemPaths& paths)
     return places;
 }
 
+std::vector<MountPlace> mountPlacesOf(const std::filesystem::path& node, const SystemPaths& paths)
+{
+    struct stat status = {};
+    if (::stat(node.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
+        return {};
+    return mountPlacesOf(status.st_rdev, paths);
+}
+
 std::vector<std::string> mountsBelow(std::string_view directory, const SystemPaths& paths)
 {
     const std::string prefix = std::string(directory) + '/';

@@ -5,6 +5,7 @@
 
 #include <sys/types.h>
 
+#include <filesystem>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -28,6 +29,10 @@ struct MountPlace {
 /// system on several devices, which has a device number of its own and is found by its source.
 /// Empty as well when the table cannot be read.
 [[nodiscard]] std::vector<MountPlace> mountPlacesOf(dev_t device, const SystemPaths& paths);
+
+/// The same of the device with this node; empty when it is none.
+[[nodiscard]] std::vector<MountPlace> mountPlacesOf(const std::filesystem::path& node,
+                                                    const SystemPaths& paths);
 
 /// Where something else is mounted below the directory.
 [[nodiscard]] std::vector<std::string> mountsBelow(std::string_view directory,

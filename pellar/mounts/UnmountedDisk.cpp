@@ -79,17 +79,6 @@ int mount(const MountPlace& place, const std::string& source)
     return errorOf(context, mnt_context_mount(context.get()));
 }
 
-std::string joined(std::vector<std::string> names)
-{
-    constexpr std::size_t most = 4;
-    const bool areMore = names.size() > most;
-    names.resize(std::min(names.size(), most));
-    std::string text;
-    for (const std::string& name : names)
-        text += (text.empty() ? "" : ", ") + fixwell::printable(name);
-    return areMore ? text + ", …" : text;
-}
-
 Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
 {
     const std::string target = fixwell::printable(place.target);
@@ -99,9 +88,9 @@ Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
         return {"it cannot be unmounted from “%1$@”: %2$@", target, ::strerrordesc_np(error)};
     if (const auto below = mountsBelow(place.target, paths); !below.empty())
         return {"it is mounted at “%1$@”, and something else below, at %2$@", target,
-                joined(below)};
+                shownNames(below)};
     if (const auto holders = holdersOf(place.target); !holders.empty())
-        return {"it is mounted at “%1$@” and in use by %2$@", target, joined(holders)};
+        return {"it is mounted at “%1$@” and in use by %2$@", target, shownNames(holders)};
     return {"it is mounted at “%1$@” and in use", target, {}};
 }
 
