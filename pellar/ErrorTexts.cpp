@@ -2,8 +2,9 @@
 #include "pellar/ErrorTexts.h"
 
 #include "fixwell/host/foundation/Format.h"
-#include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/jobs/RightsErrorCodes.h"
 #include "pellar/partitions/MapErrorCodes.h"
+#include "pellar/permissions/PermissionErrorCodes.h"
 
 #include <algorithm>
 #include <array>
@@ -39,6 +40,7 @@ constexpr std::array texts{
     ErrorText{kPLErrorPermissionsNotRepaired,
               "Some permissions still differ from what they should be."},
     ErrorText{kPLErrorNotAdministrator, "Only an administrator may repair permissions."},
+    ErrorText{kPLErrorNotAuthorized, "It takes an administrator's rights, which were not given."},
     ErrorText{fixwell::kPLErrorCannotOpen, "The disk could not be opened."},
     ErrorText{fixwell::kPLErrorUnsupported, "There is no tool for this kind of disk."},
     ErrorText{fixwell::kPLErrorToolMisbehaved,

@@ -1,23 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "pellar/jobs/PrivilegedJob.h"
 #include "pellar/process/OutputBudget.h"
-#include "pellar/tools/Operation.h"
 #include "pellar/volumes/SystemPaths.h"
 
 #include <chrono>
 #include <filesystem>
 #include <functional>
-#include <memory>
 #include <string>
 #include <string_view>
 
 namespace pellar {
-
-class EventRoad;
-class Script;
-class StopSwitch;
 
 struct ManagerOptions {
     /// Where tools are looked for: absolute directories, the first that has the tool wins.
@@ -41,11 +35,7 @@ struct ManagerOptions {
     /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;
-    /// Makes the script of a job on a block device for which this user has no right; empty where
-    /// there is no way to get it. The disk's `isWhole` asks for its partition map. Main thread.
-    std::function<std::unique_ptr<Script>(const fixwell::DiskReference& disk, Operation operation,
-                                          StopSwitch& stop, EventRoad& road)>
-        privileged;
+    PrivilegedScripts privileged;
 };
 
 }  // namespace pellar

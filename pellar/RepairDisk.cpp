@@ -4,6 +4,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "pellar/jobs/JobScript.h"
 #include "pellar/jobs/MapScript.h"
+#include "pellar/jobs/PartOfImageScript.h"
 #include "pellar/jobs/PermissionsScript.h"
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/permissions/InstalledSystem.h"
@@ -28,13 +29,17 @@ bool isVolume(const DiskReferencePointer& disk)
     return disk && !disk->path.empty() && !disk->isWhole;
 }
 
-/// Whether a device may be neither opened as the operation must, nor unmounted, by this user.
-bool needsPrivileges(const fixwell::DiskReference& disk, Operation operation,
+/// Whether a device may be neither opened as the operation must, nor unmounted, by this user; and
+/// whether installed files are to be changed. Nobody is asked for a password merely to look at the
+/// files of a volume that is mounted: what this user may not see of it is counted and said.
+bool needsPrivileges(Subject subject, const fixwell::DiskReference& disk, Operation operation,
                      const SystemPaths& paths)
 {
     struct stat status = {};
     if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return false;
+    if (subject == Subject::Permissions)
+        return operation == Operation::Repair;
     const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
     return ::access(disk.path.c_str(), wanted) != 0 || !mountPlacesOf(disk.path, paths).empty();
 }
@@ -88,8 +93,9 @@ bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, 
 {
     const bool isDisk = disk && !disk->path.empty() && disk->isWhole;
     // What this user may not read is looked at when the job has the right to.
-    const bool isUnknown = isDisk && options_.privileged &&
-                           needsPrivileges(*disk, Operation::Verify, options_.systemPaths);
+    const bool isUnknown =
+        isDisk && options_.privileged &&
+        needsPrivileges(Subject::PartitionMap, *disk, Operation::Verify, options_.systemPaths);
     return answer(isUnknown || (isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None),
                   error);
 }
@@ -116,7 +122,7 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
 {
     if (const ErrorCode error = refusal(disk, operation))
         return error;
-    if (beginPrivileged(disk, operation))
+    if (beginPrivileged(Subject::Filesystem, disk, operation))
         return fixwell::kPLNoError;
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
@@ -128,12 +134,13 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
 }
 
 /// NO when the job needs nobody's help, or there is none.
-bool RepairDisk::beginPrivileged(const DiskReferencePointer& disk, Operation operation)
+bool RepairDisk::beginPrivileged(Subject subject, const DiskReferencePointer& disk,
+                                 Operation operation)
 {
-    if (!options_.privileged || !needsPrivileges(*disk, operation, options_.systemPaths))
+    if (!options_.privileged || !needsPrivileges(subject, *disk, operation, options_.systemPaths))
         return false;
-    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
-        return options_.privileged(*disk, operation, stop, road);
+    start(disk, [subject, disk, operation, this](StopSwitch& stop, EventRoad& road) {
+        return options_.privileged({subject, operation, *disk, nullptr}, stop, road);
     });
     return true;
 }
@@ -158,9 +165,19 @@ void RepairDisk::startVolume(JobRequest request)
 {
     const auto disk = request.disk;
     const auto shared = std::make_shared<JobRequest>(std::move(request));
-    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) {
+    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) -> std::unique_ptr<Script> {
+        if (isPartThatOthersAttach(*shared))
+            return std::make_unique<PartOfImageScript>(std::move(*shared), options_, texts_, stop,
+                                                       road);
         return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
     });
+}
+
+/// The user may not attach it, but others may.
+bool RepairDisk::isPartThatOthersAttach(const JobRequest& request) const
+{
+    return ::geteuid() != 0 && options_.privileged && request.claim &&
+           !request.claim->isBlockDevice() && !request.claim->isAllOfIt();
 }
 
 // The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
@@ -173,7 +190,7 @@ ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operat
         return fixwell::kPLErrorNoDiskReference;
     if (!disk->isWhole)
         return fixwell::kPLErrorUnsupported;
-    if (beginPrivileged(disk, operation))
+    if (beginPrivileged(Subject::PartitionMap, disk, operation))
         return fixwell::kPLNoError;
     start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
@@ -196,6 +213,8 @@ ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operati
                             "database that is known here"));
         return fixwell::kPLErrorUnsupported;
     }
+    if (beginPrivileged(Subject::Permissions, disk, operation))
+        return fixwell::kPLNoError;
     start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
     });

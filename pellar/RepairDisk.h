@@ -51,7 +51,9 @@ private:
                                         Operation operation);
     fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
                                Operation operation) const;
-    bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);
+    bool beginPrivileged(Subject subject, const fixwell::DiskReferencePointer& disk,
+                         Operation operation);
+    bool isPartThatOthersAttach(const JobRequest& request) const;
     void startVolume(JobRequest request);
     void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 

@@ -107,7 +107,7 @@ JobScript::State JobScript::examine()
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
     if (tool_ == nullptr && disk_->filesystem.empty())
-        tool_ = findTool();
+        tool_ = toolRecognizing(claim_->descriptor(), claim_->offset(), claim_->availableBytes());
     if (tool_ != nullptr) {
         program_ = findProgram(tool_->name(), options_.toolPath);
         repairProgram_ = findProgram(tool_->repairName(), options_.toolPath);
@@ -266,14 +266,6 @@ JobScript::State JobScript::end(Outcome outcome)
 {
     outcome_ = std::move(outcome);
     return State::Done;
-}
-
-const Tool* JobScript::findTool() const
-{
-    for (const Tool* const tool : allTools())
-        if (factsFor(*tool).isRecognized)
-            return tool;
-    return nullptr;
 }
 
 VolumeFacts JobScript::factsFor(const Tool& tool) const

@@ -56,7 +56,6 @@ private:
 
     std::optional<Outcome> takeDisk();
     void giveDiskBack();
-    const Tool* findTool() const;
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToSize();

@@ -60,4 +60,12 @@ const std::vector<const Tool*>& allTools()
     return tools;
 }
 
+const Tool* toolRecognizing(int disk, std::uint64_t offset, std::uint64_t availableBytes)
+{
+    for (const Tool* const tool : allTools())
+        if (tool->examine(disk, offset, availableBytes).isRecognized)
+            return tool;
+    return nullptr;
+}
+
 }  // namespace pellar

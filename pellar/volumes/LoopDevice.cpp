@@ -60,15 +60,18 @@ std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
             return errno;
         const loop_config configuration = configurationFor(file, offset, length, access);
         if (::ioctl(device.get(), LOOP_CONFIGURE, &configuration) == 0)
-            return LoopDevice(std::move(device), "/sys/block/" + name + "/loop/backing_file");
+            return LoopDevice(std::move(device), name);
         if (errno != EBUSY)
             return errno;
     }
     return EBUSY;
 }
 
-LoopDevice::LoopDevice(FileDescriptor device, std::filesystem::path place)
-    : device_(std::move(device)), place_(std::move(place)), behind_(readKernelFile(place_))
+LoopDevice::LoopDevice(FileDescriptor device, const std::string& name)
+    : device_(std::move(device)),
+      node_("/dev/" + name),
+      place_("/sys/block/" + name + "/loop/backing_file"),
+      behind_(readKernelFile(place_))
 {
 }
 

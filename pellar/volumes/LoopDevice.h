@@ -32,11 +32,13 @@ public:
     ~LoopDevice();
 
     int descriptor() const { return device_.get(); }
+    const std::filesystem::path& node() const { return node_; }
 
 private:
-    LoopDevice(FileDescriptor device, std::filesystem::path place);
+    LoopDevice(FileDescriptor device, const std::string& name);
 
     FileDescriptor device_;
+    std::filesystem::path node_;   ///< "/dev/loop0"
     std::filesystem::path place_;  ///< where the kernel tells what is behind the device
     std::optional<std::string> behind_;
 };

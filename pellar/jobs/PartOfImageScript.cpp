@@ -1,0 +1,47 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/PartOfImageScript.h"
+
+#include "pellar/process/Command.h"
+#include "pellar/tools/ToolTable.h"
+
+#include <utility>
+
+namespace pellar {
+
+PartOfImageScript::PartOfImageScript(JobRequest request, const ManagerOptions& options,
+                                     const Texts& texts, StopSwitch& stop, EventRoad& road)
+    : request_(std::move(request)), options_(options), texts_(texts), stop_(stop), road_(road)
+{
+}
+
+void PartOfImageScript::run()
+{
+    const DiskClaim& claim = *request_.claim;
+    if (request_.tool == nullptr && request_.disk->filesystem.empty())
+        request_.tool = toolRecognizing(claim.descriptor(), claim.offset(), claim.availableBytes());
+    if (needsDevice())
+        scriptOfOthers()->run();
+    else
+        JobScript(std::move(request_), options_, texts_, stop_, road_).run();
+}
+
+/// Nobody is asked for a password where the job would end with a reason anyway.
+bool PartOfImageScript::needsDevice() const
+{
+    const Tool* const tool = request_.tool;
+    if (tool == nullptr || tool->habits().takesOffset)
+        return false;
+    const bool isRepair = request_.operation == Operation::Repair;
+    return !findProgram(tool->name(), options_.toolPath).empty() &&
+           (!isRepair ||
+            (tool->canRepair() && !findProgram(tool->repairName(), options_.toolPath).empty()));
+}
+
+std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()
+{
+    PrivilegedJob job{Subject::Filesystem, request_.operation, *request_.disk, nullptr};
+    job.image = std::make_shared<const DiskClaim>(*std::exchange(request_.claim, std::nullopt));
+    return options_.privileged(job, stop_, road_);
+}
+
+}  // namespace pellar
