@@ -3,26 +3,51 @@
 
 #include <algorithm>
 #include <array>
+#include <charconv>
+#include <limits>
+#include <optional>
+#include <span>
 #include <string_view>
 
 namespace orvane {
 namespace {
 
 using pellar::Operation;
+using pellar::Subject;
+using Arguments = std::span<const std::string>;
+using Read = std::variant<HelperRequest, std::string>;
 
 struct Task {
     std::string_view word;
+    Subject subject;
     Operation operation;
-    bool isWhole;
 };
 
-constexpr std::array tasks{
-    Task{"verify", Operation::Verify, false}, Task{"repair", Operation::Repair, false},
-    Task{"verify-map", Operation::Verify, true}, Task{"repair-map", Operation::Repair, true}};
+// Permissions are verified without the helper.
+constexpr std::array tasks{Task{"verify", Subject::Filesystem, Operation::Verify},
+                           Task{"repair", Subject::Filesystem, Operation::Repair},
+                           Task{"verify-map", Subject::PartitionMap, Operation::Verify},
+                           Task{"repair-map", Subject::PartitionMap, Operation::Repair},
+                           Task{"repair-permissions", Subject::Permissions, Operation::Repair}};
 
-// The task, the device, and four texts.
-constexpr std::size_t argumentCount = 6;
+// attach OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
+constexpr std::string_view attaching = "attach";
+
 constexpr std::size_t longestName = 1024;
+
+const Task* taskNamed(std::string_view word)
+{
+    const auto* const found = std::find_if(
+        tasks.begin(), tasks.end(), [&](const Task& candidate) { return candidate.word == word; });
+    return found == tasks.end() ? nullptr : found;
+}
+
+const Task* taskOf(const HelperRequest& request)
+{
+    return std::find_if(tasks.begin(), tasks.end(), [&](const Task& candidate) {
+        return candidate.subject == request.subject && candidate.operation == request.operation;
+    });
+}
 
 bool consistsOf(std::string_view text, std::string_view allowed, std::size_t longest)
 {
@@ -43,45 +68,99 @@ bool isCanonicalDevice(const std::string& path)
            !path.ends_with('/') && !path.ends_with("/..") && !path.ends_with("/.");
 }
 
+/// Digits and nothing else, at most `largest`.
+std::optional<std::uint64_t> numberIn(const std::string& text, std::uint64_t largest)
+{
+    std::uint64_t number = 0;
+    const char* const end = text.data() + text.size();
+    const auto [rest, error] = std::from_chars(text.data(), end, number);
+    const bool isNumber = error == std::errc() && rest == end;
+    return isNumber && number <= largest ? std::optional(number) : std::nullopt;
+}
+
+/// IDENTIFIER NAME FILESYSTEM LANGUAGES
+Read withTexts(HelperRequest request, Arguments texts)
+{
+    if (texts.size() != 4)
+        return "wrong number of arguments";
+    if (texts[0].size() > longestName || texts[1].size() > longestName)
+        return "a name is too long";
+    if (!consistsOf(texts[2], "_-+.", 64) || !consistsOf(texts[3], "_-@.:", 64))
+        return "a name of a file system or language holds what none does";
+    request.disk.identifier = texts[0];
+    request.disk.name = texts[1];
+    request.disk.filesystem = texts[2];
+    request.languages = texts[3];
+    return request;
+}
+
+Read readRegion(Arguments arguments)
+{
+    constexpr std::uint64_t largest = std::numeric_limits<std::int64_t>::max();
+    if (arguments.size() < 5)
+        return "wrong number of arguments";
+    const Task* const task = taskNamed(arguments[1]);
+    if (task == nullptr || task->subject != Subject::Filesystem)
+        return "unknown operation";
+    const auto image = numberIn(arguments[2], std::numeric_limits<int>::max());
+    const auto offset = numberIn(arguments[3], largest);
+    const auto length = numberIn(arguments[4], largest);
+    if (!image || !offset || !length || *length == 0 || *length > largest - *offset)
+        return "no region of a file";
+    HelperRequest request{task->subject, task->operation, {}, static_cast<int>(*image), {}};
+    request.disk.storage = fixwell::DiskReference::Storage::FileRegion;
+    request.disk.offset = *offset;
+    request.disk.length = *length;
+    return withTexts(std::move(request), arguments.subspan(5));
+}
+
 }  // namespace
+
+HelperRequest requestFor(const pellar::PrivilegedJob& job, std::string languages)
+{
+    HelperRequest request{job.subject, job.operation, job.disk, -1, std::move(languages)};
+    if (!job.image)
+        return request;
+    request.image = job.image->descriptor();
+    request.disk.path.clear();
+    request.disk.offset = job.image->offset();
+    request.disk.length = job.image->availableBytes();
+    return request;
+}
 
 std::vector<std::string> argumentsOf(const HelperRequest& request)
 {
-    const auto task = std::find_if(tasks.begin(), tasks.end(), [&](const Task& candidate) {
-        return candidate.operation == request.operation &&
-               candidate.isWhole == request.disk.isWhole;
-    });
-    return {std::string(task->word), request.disk.path.native(),
-            request.disk.identifier, request.disk.name.substr(0, longestName),
-            request.disk.filesystem, request.languages};
+    const fixwell::DiskReference& disk = request.disk;
+    std::vector<std::string> arguments;
+    if (request.isOnImage())
+        arguments = {std::string(attaching), std::string(taskOf(request)->word),
+                     std::to_string(request.image), std::to_string(disk.offset),
+                     std::to_string(disk.length)};
+    else
+        arguments = {std::string(taskOf(request)->word), disk.path.native()};
+    for (const std::string& text :
+         {disk.identifier.substr(0, longestName), disk.name.substr(0, longestName), disk.filesystem,
+          request.languages})
+        arguments.push_back(text);
+    return arguments;
 }
 
-std::variant<HelperRequest, std::string> readHelperArguments(
-    const std::vector<std::string>& arguments,
-    const std::function<bool(const std::filesystem::path&)>& isBlockDevice)
+Read readHelperArguments(const std::vector<std::string>& arguments,
+                         const std::function<bool(const std::filesystem::path&)>& isBlockDevice)
 {
-    if (arguments.size() != argumentCount)
+    if (arguments.size() < 2)
         return "wrong number of arguments";
-    const auto task = std::find_if(tasks.begin(), tasks.end(), [&](const Task& candidate) {
-        return candidate.word == arguments[0];
-    });
-    if (task == tasks.end())
+    if (arguments[0] == attaching)
+        return readRegion(arguments);
+    const Task* const task = taskNamed(arguments[0]);
+    if (task == nullptr)
         return "unknown operation";
     if (!isCanonicalDevice(arguments[1]) || !isBlockDevice(arguments[1]))
         return "not a block device below /dev";
-    if (arguments[2].size() > longestName || arguments[3].size() > longestName)
-        return "a name is too long";
-    if (!consistsOf(arguments[4], "_-+.", 64) || !consistsOf(arguments[5], "_-@.:", 64))
-        return "a name of a file system or language holds what none does";
-    HelperRequest request;
-    request.operation = task->operation;
+    HelperRequest request{task->subject, task->operation, {}, -1, {}};
     request.disk.path = arguments[1];
-    request.disk.identifier = arguments[2];
-    request.disk.name = arguments[3];
-    request.disk.filesystem = arguments[4];
-    request.disk.isWhole = task->isWhole;
-    request.languages = arguments[5];
-    return request;
+    request.disk.isWhole = task->subject == Subject::PartitionMap;
+    return withTexts(std::move(request), Arguments(arguments).subspan(2));
 }
 
 }  // namespace orvane

@@ -35,11 +35,10 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
     }
     const auto launcher = helperLauncher();
     if (!launcher.empty())
-        options.privileged = [launcher, &texts](const fixwell::DiskReference& disk,
-                                                pellar::Operation operation,
+        options.privileged = [launcher, &texts](const pellar::PrivilegedJob& job,
                                                 pellar::StopSwitch& stop, pellar::EventRoad& road) {
-            return std::make_unique<PrivilegedScript>(
-                launcher, HelperRequest{operation, disk, currentLanguage()}, texts, stop, road);
+            return std::make_unique<PrivilegedScript>(launcher, job, currentLanguage(), texts, stop,
+                                                      road);
         };
     return options;
 }

@@ -5,6 +5,8 @@
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/privileges/EventWire.h"
 #include "orvane/privileges/HelperProcess.h"
+#include "pellar/jobs/RightsErrorCodes.h"
+#include "pellar/process/Command.h"
 
 #include <poll.h>
 #include <unistd.h>
@@ -15,17 +17,16 @@
 
 namespace orvane {
 
-using pellar::Sentence;
-
-PrivilegedScript::PrivilegedScript(std::vector<std::string> launcher, HelperRequest request,
-                                   const pellar::Texts& texts, pellar::StopSwitch& stop,
-                                   pellar::EventRoad& road)
+PrivilegedScript::PrivilegedScript(std::vector<std::string> launcher, pellar::PrivilegedJob job,
+                                   std::string languages, const pellar::Texts& texts,
+                                   pellar::StopSwitch& stop, pellar::EventRoad& road)
     : launcher_(std::move(launcher)),
-      request_(std::move(request)),
+      job_(std::move(job)),
+      request_(requestFor(job_, std::move(languages))),
       texts_(texts),
       stop_(stop),
       road_(road),
-      log_(request_.disk, texts, road)
+      log_(job_.disk, texts, road)
 {
 }
 
@@ -34,6 +35,7 @@ void PrivilegedScript::run()
     std::vector<std::string> command = launcher_;
     for (const std::string& argument : argumentsOf(request_))
         command.push_back(argument);
+    log_.trace("run: " + pellar::shown({command.front(), {command.begin() + 1, command.end()}}));
     std::optional<int> status;
     if (auto helper = HelperProcess::start(command)) {
         follow(*helper);
@@ -77,13 +79,32 @@ void PrivilegedScript::take(std::string_view lines)
             unfinishedLine_ += character;
             continue;
         }
-        if (auto event = eventFromLine(unfinishedLine_)) {
-            hasStarted_ = true;
-            hasFinished_ = hasFinished_ || std::holds_alternative<pellar::Finished>(*event);
-            road_.add(std::move(*event));
-        }
+        if (auto event = eventFromLine(unfinishedLine_))
+            take(std::move(*event));
         unfinishedLine_.clear();
     }
+}
+
+// Nothing is told after the end, whatever comes. What was found in a device on an image is true of
+// nothing when the image was cut off or replaced in the meantime, which the device does not show.
+void PrivilegedScript::take(pellar::Event event)
+{
+    if (hasFinished_)
+        return;
+    hasStarted_ = true;
+    const auto* const end = std::get_if<pellar::Finished>(&event);
+    hasFinished_ = end != nullptr;
+    const bool isStopped = end != nullptr && end->mainError == fixwell::kPLErrorCancelled;
+    if (end == nullptr || isStopped || !job_.image)
+        road_.add(std::move(event));
+    else if (!job_.image->isStillWhole())
+        finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+               "the disk became shorter or unreadable meanwhile");
+    else if (!job_.image->isStillInPlace())
+        finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+               "the disk was deleted, moved or replaced meanwhile");
+    else
+        road_.add(std::move(event));
 }
 
 void PrivilegedScript::passStopOn(HelperProcess& helper)
@@ -102,26 +123,24 @@ void PrivilegedScript::explain(std::optional<int> status)
     constexpr int notAuthorized = 127;
     if (status == dismissed)
         finish(fixwell::kPLErrorCancelled, fixwell::kPLVerdictStopped,
-               {"the authorisation was not given; nothing was done", {}, {}});
+               "the authorisation was not given; nothing was done");
     else if (status == notAuthorized && !hasStarted_)
-        finish(fixwell::kPLErrorCannotOpen, fixwell::kPLVerdictFailed,
-               {"you are not authorised to work on this disk; nothing was done", {}, {}});
+        finish(pellar::kPLErrorNotAuthorized, fixwell::kPLVerdictFailed,
+               job_.image ? "its tool needs it attached as a device of its own, for which you are "
+                            "not authorised; nothing was done"
+                          : "you are not authorised to work on this disk; nothing was done");
     else if (!hasStarted_)
-        finish(fixwell::kPLErrorCannotOpen, fixwell::kPLVerdictFailed,
-               {"it needs an administrator's rights, and they could not be asked for", {}, {}});
+        finish(pellar::kPLErrorNotAuthorized, fixwell::kPLVerdictFailed,
+               "it needs an administrator's rights, and they could not be asked for");
     else
         finish(fixwell::kPLErrorToolFailed, fixwell::kPLVerdictFailed,
-               {"the program that works on it as administrator ended unexpectedly", {}, {}});
+               "the program that works on it as administrator ended unexpectedly");
 }
 
-void PrivilegedScript::finish(fixwell::ErrorCode error, fixwell::Name verdict, Sentence reason)
+void PrivilegedScript::finish(fixwell::ErrorCode error, fixwell::Name verdict,
+                              std::string_view reason)
 {
-    const std::string_view key = request_.operation == pellar::Operation::Repair
-                                     ? "cannot repair “%1$@”: %2$@"
-                                     : "cannot verify “%1$@”: %2$@";
-    const std::string message = Sentence{key, log_.diskName(), reason.in(texts_)}.in(texts_);
-    log_.failure(message);
-    log_.finished(error, 0, verdict, message);
+    tellUndone({error, verdict, {reason, {}, {}}}, request_, texts_, log_);
 }
 
 }  // namespace orvane

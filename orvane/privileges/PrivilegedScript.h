@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/privileges/HelperRequest.h"
+#include "orvane/privileges/UndoneJob.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Script.h"
@@ -18,19 +19,22 @@ class HelperProcess;
 class PrivilegedScript final : public pellar::Script {
 public:
     /// `launcher` is what the helper's arguments are appended to: pkexec(1) and the helper's path.
-    PrivilegedScript(std::vector<std::string> launcher, HelperRequest request,
-                     const pellar::Texts& texts, pellar::StopSwitch& stop, pellar::EventRoad& road);
+    PrivilegedScript(std::vector<std::string> launcher, pellar::PrivilegedJob job,
+                     std::string languages, const pellar::Texts& texts, pellar::StopSwitch& stop,
+                     pellar::EventRoad& road);
 
     void run() override;
 
 private:
     void follow(HelperProcess& helper);
     void take(std::string_view lines);
+    void take(pellar::Event event);
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);
-    void finish(fixwell::ErrorCode error, fixwell::Name verdict, pellar::Sentence reason);
+    void finish(fixwell::ErrorCode error, fixwell::Name verdict, std::string_view reason);
 
     const std::vector<std::string> launcher_;
+    const pellar::PrivilegedJob job_;  ///< its image stays open for the helper
     const HelperRequest request_;
     const pellar::Texts& texts_;
     pellar::StopSwitch& stop_;

@@ -11,34 +11,45 @@ namespace orvane {
 namespace {
 
 using pellar::Operation;
+using pellar::Subject;
 
 bool isKnownDevice(const std::filesystem::path& path)
 {
     return path == "/dev/sdb1" || path == "/dev/mapper/a-b";
 }
 
-HelperRequest request(Operation operation, bool isWhole)
+HelperRequest request(Subject subject, Operation operation)
 {
     HelperRequest made;
+    made.subject = subject;
     made.operation = operation;
     made.disk.path = "/dev/sdb1";
     made.disk.identifier = "/dev/sdb1";
     made.disk.name = "Mein “Stick” \x1b[31m%n\xff";
     made.disk.filesystem = "ext4";
-    made.disk.isWhole = isWhole;
+    made.disk.isWhole = subject == Subject::PartitionMap;
     made.languages = "de_DE:en";
     return made;
 }
 
 TEST(HelperRequest, ArrivesAsItWasMade)
 {
-    for (const Operation operation : {Operation::Verify, Operation::Repair})
-        for (const bool isWhole : {false, true}) {
-            const HelperRequest made = request(operation, isWhole);
-            const auto read = readHelperArguments(argumentsOf(made), isKnownDevice);
-            ASSERT_TRUE(std::holds_alternative<HelperRequest>(read));
-            EXPECT_EQ(std::get<HelperRequest>(read), made);
-        }
+    std::vector<HelperRequest> requests{request(Subject::Permissions, Operation::Repair)};
+    for (const Operation operation : {Operation::Verify, Operation::Repair}) {
+        requests.push_back(request(Subject::Filesystem, operation));
+        requests.push_back(request(Subject::PartitionMap, operation));
+        HelperRequest onImage = request(Subject::Filesystem, operation);
+        onImage.disk.path.clear();
+        onImage.disk.offset = 1U << 20U;
+        onImage.disk.length = std::uint64_t(1) << 40U;
+        onImage.image = 17;
+        requests.push_back(onImage);
+    }
+    for (const HelperRequest& made : requests) {
+        const auto read = readHelperArguments(argumentsOf(made), isKnownDevice);
+        ASSERT_TRUE(std::holds_alternative<HelperRequest>(read));
+        EXPECT_EQ(std::get<HelperRequest>(read), made);
+    }
 }
 
 // Whoever may start the helper may give it any arguments.
@@ -81,6 +92,38 @@ TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
         EXPECT_TRUE(
             std::holds_alternative<std::string>(readHelperArguments(arguments, isKnownDevice)))
             << count;
+    }
+}
+
+TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
+{
+    const std::vector<std::string> good{"attach", "verify", "7",    "512", "1024",
+                                        "id",     "name",   "vfat", "de"};
+    ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
+    struct Case {
+        std::size_t place;
+        std::string value;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{1, "verify-map", "a part has no map"},
+             Case{1, "repair-permissions", "nor is it mounted"},
+             Case{1, "attach", "no operation"},
+             Case{2, "/etc/shadow", "a path is never opened"},
+             Case{2, "-1", "no descriptor"},
+             Case{2, "7x", "no number"},
+             Case{2, "4294967303", "7, when it is cut to 32 bits"},
+             Case{3, " 512", "no number"},
+             Case{3, "18446744073709551615", "its end is beyond all numbers"},
+             Case{4, "9223372036854775807", "and so is this"},
+             Case{4, "0", "to the end, whatever that is"},
+             Case{7, "vfat -o x", "no name of a file system"},
+         }) {
+        std::vector<std::string> arguments = good;
+        arguments[c.place] = c.value;
+        EXPECT_TRUE(
+            std::holds_alternative<std::string>(readHelperArguments(arguments, isKnownDevice)))
+            << c.because;
     }
 }
 

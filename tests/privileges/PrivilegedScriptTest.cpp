@@ -3,6 +3,7 @@
 
 #include "orvane/privileges/PrivilegedScript.h"
 #include "pellar/jobs/Job.h"
+#include "pellar/jobs/RightsErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -17,16 +18,18 @@ protected:
     /// What the launched program does, as a shell script, after the arguments were seen.
     void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
     {
+        launch(script, {pellar::Subject::Filesystem, operation,
+                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr});
+    }
+    void launch(const std::string& script, const pellar::PrivilegedJob& job)
+    {
         const auto launcher = workshop_.path("launcher");
         std::ofstream(launcher) << "#!/bin/sh\n" << script << "\n";
         std::filesystem::permissions(launcher, std::filesystem::perms::owner_all);
-        HelperRequest request;
-        request.operation = operation;
-        request.disk = *pellar::test::reference("/dev/sdz9", "ext4", "Stick");
         job_ = std::make_unique<pellar::Job>(
-            [this, launcher, request](pellar::StopSwitch& stop, pellar::EventRoad& road) {
+            [this, launcher, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
                 return std::make_unique<PrivilegedScript>(
-                    std::vector<std::string>{launcher.native()}, request, texts_, stop, road);
+                    std::vector<std::string>{launcher.native()}, job, "", texts_, stop, road);
             },
             pellar::EventReceiver{&listener_,
                                   pellar::test::reference("/dev/sdz9"),
@@ -71,10 +74,10 @@ TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)
     for (const Case& c : {
              Case{"exit 126", fixwell::kPLErrorCancelled,
                   "cannot repair “Stick”: the authorisation was not given; nothing was done"},
-             Case{"exit 127", fixwell::kPLErrorCannotOpen,
+             Case{"exit 127", pellar::kPLErrorNotAuthorized,
                   "cannot repair “Stick”: you are not authorised to work on this disk; nothing was "
                   "done"},
-             Case{"exit 2", fixwell::kPLErrorCannotOpen,
+             Case{"exit 2", pellar::kPLErrorNotAuthorized,
                   "cannot repair “Stick”: it needs an administrator's rights, and they could not "
                   "be asked for"},
              Case{"printf '[\"started\"]\\n'; kill -9 $$", fixwell::kPLErrorToolFailed,
@@ -107,6 +110,41 @@ TEST_F(PrivilegedScriptTest, StopIsPassedOnAndLeavingEndsTheHelper)
     ASSERT_TRUE(loop_.runUntil([this] { return listener_.started == 2; }));
     job_.reset();  // waits: nobody is left behind
     EXPECT_TRUE(std::filesystem::exists(ended));
+}
+
+/// A part of an image, as whoever makes the job has it.
+pellar::PrivilegedJob jobOnImage(const std::filesystem::path& image)
+{
+    pellar::PrivilegedJob job;
+    job.disk = *pellar::test::reference(image, "vfat", "Stick");
+    job.disk.offset = 4096;
+    job.disk.length = 8192;
+    auto claim = pellar::DiskClaim::take(job.disk, pellar::Access::ReadOnly, {});
+    job.image =
+        std::make_shared<const pellar::DiskClaim>(std::get<pellar::DiskClaim>(std::move(claim)));
+    return job;
+}
+
+TEST_F(PrivilegedScriptTest, AnImageIsHandedOverAsAnOpenFile)
+{
+    const auto image = workshop_.path("image");
+    workshop_.write("image", std::string(16384, 'x'));
+    // What the helper's parent has open under the number is the image.
+    const std::string script =
+        "printf '[\"started\"]\\n'\nfile=$(readlink /proc/$PPID/fd/$3)\n"
+        "printf '[\"finished\",0,0,{\"dictionary\":[[\"kPLMessage\",\"%s %s %s %s %s\"]]}]\\n' "
+        "$1 $2 \"$file\" $4 $5\n";
+    launch(script, jobOnImage(image));
+    ASSERT_TRUE(finishes());
+    EXPECT_EQ(listener_.message, "attach verify " + image.native() + " 4096 8192");
+    job_.reset();
+
+    listener_ = {};
+    launch(script, jobOnImage(image));
+    std::filesystem::remove(image);
+    ASSERT_TRUE(finishes());
+    EXPECT_EQ(listener_.error, fixwell::kPLErrorDiskChanged)
+        << "a device on it does not show that it was deleted";
 }
 
 }  // namespace

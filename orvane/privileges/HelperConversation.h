@@ -1,0 +1,49 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "orvane/support/loop/MainLoop.h"
+#include "pellar/jobs/Event.h"
+
+#include <functional>
+
+namespace orvane {
+
+/// Tells whoever asked what happens in the job: a line for each event on standard output.
+class Teller final : public fixwell::PLAsyncDelegate {
+public:
+    void plAsyncStartedForDisk(const fixwell::DiskReferencePointer& disk) override;
+    void plAsyncMessageForDisk(const fixwell::DiskReferencePointer& disk, std::string_view string,
+                               const fixwell::Dictionary& dictionary) override;
+    void plAsyncProgressForDisk(const fixwell::DiskReferencePointer&, bool, float) override {}
+    void plAsyncFinishedForDisk(const fixwell::DiskReferencePointer& disk,
+                                fixwell::ErrorCode mainError, fixwell::ErrorCode detailError,
+                                const fixwell::Dictionary& result) override;
+
+    void trace(std::string_view line);
+    bool isOver() const { return isOver_; }
+
+private:
+    void tell(const pellar::Event& event);
+
+    bool isOver_ = false;
+    bool isHeard_ = true;
+};
+
+/// Hears on standard input what is wanted: each "stop" presses once, and so does the end of the
+/// input, when nobody is there any more. The loop outlives it.
+class StopLine {
+public:
+    StopLine(MainLoop& loop, std::function<void()> pressed);
+    StopLine(const StopLine&) = delete;
+    StopLine& operator=(const StopLine&) = delete;
+    ~StopLine();
+
+private:
+    void read();
+
+    MainLoop& loop_;
+    const std::function<void()> pressed_;
+};
+
+}  // namespace orvane

@@ -1,0 +1,140 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/privileges/HelperJob.h"
+
+#include "fixwell/host/pellar/MessageKeys.h"
+#include "orvane/privileges/AskingProgram.h"
+#include "orvane/privileges/AttachedRegion.h"
+#include "orvane/privileges/HelperConversation.h"
+#include "orvane/privileges/MountedSystem.h"
+#include "orvane/privileges/UndoneJob.h"
+#include "pellar/Manager.h"
+
+#include <memory>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+using fixwell::DiskReference;
+using fixwell::ErrorCode;
+using pellar::Subject;
+
+// Where sectors are kept that the repair of a partition map overwrites, and what archives have
+// said about their packages' files.
+constexpr const char* savedSectors = "/var/lib/orvane/partition-maps";
+constexpr const char* permissionReferences = "/var/lib/orvane/permissions";
+
+std::variant<AttachedRegion, Undone> attachedRegion(const HelperRequest& request,
+                                                    std::optional<uid_t> user)
+{
+    const auto program = user ? AskingProgram::of(*user) : std::nullopt;
+    if (!program)
+        return Undone{fixwell::kPLErrorCannotOpen,
+                      fixwell::kPLVerdictFailed,
+                      {"the program that asked for it has gone, or is not yours", {}, {}}};
+    return AttachedRegion::attach(program->take(request.image), request);
+}
+
+/// One job, with what it stands on.
+class HelperJob {
+public:
+    HelperJob(const HelperRequest& request, const pellar::Texts& texts)
+        : request_(request), texts_(texts)
+    {
+    }
+
+    void run(std::optional<uid_t> user)
+    {
+        const auto undone = prepare(user);
+        if (!undone)
+            work();
+        else
+            refuse(*undone);
+    }
+
+private:
+    std::optional<Undone> prepare(std::optional<uid_t> user)
+    {
+        disk_ = request_.disk;
+        if (request_.subject == Subject::Permissions) {
+            const auto place = mountedSystemOn(disk_.path);
+            if (const auto* const reason = std::get_if<pellar::Sentence>(&place))
+                return Undone{fixwell::kPLErrorUnsupported, fixwell::kPLVerdictFailed, *reason};
+            disk_.mountPoint = std::get<std::string>(place);
+            return std::nullopt;
+        }
+        if (!request_.isOnImage())
+            return std::nullopt;
+        auto region = attachedRegion(request_, user);
+        if (auto* const undone = std::get_if<Undone>(&region))
+            return std::move(*undone);
+        region_.emplace(std::get<AttachedRegion>(std::move(region)));
+        disk_ = region_->disk(request_);
+        return std::nullopt;
+    }
+
+    void work()
+    {
+        pellar::ManagerOptions options;
+        options.savedSectorsDirectory = savedSectors;
+        options.permissionReferences = permissionReferences;
+        options.commandTrace = [this](std::string_view line) {
+            teller_.trace(line);
+        };
+        pellar::Manager manager(loop_, texts_, options);
+        manager.setDelegate(&teller_);
+        const auto tool = manager.makeRepairDisk();
+        // A refusal to begin has no events of its own; its number tells whoever asked.
+        if (const ErrorCode error = begin(*tool)) {
+            teller_.plAsyncStartedForDisk(nullptr);
+            teller_.plAsyncFinishedForDisk(nullptr, error, 0, {});
+            return;
+        }
+        const StopLine stop(loop_, [&tool] { tool->cancelCurrentOperation(); });
+        loop_.runUntil([this] { return teller_.isOver(); });
+    }
+
+    ErrorCode begin(fixwell::PLRepairDisk& tool) const
+    {
+        const auto disk = std::make_shared<const DiskReference>(disk_);
+        const bool isRepair = request_.operation == pellar::Operation::Repair;
+        switch (request_.subject) {
+            case Subject::PartitionMap:
+                return isRepair ? tool.beginPartitionMapRepairForDisk(disk)
+                                : tool.beginPartitionMapVerifyForDisk(disk);
+            case Subject::Permissions:
+                return isRepair ? tool.beginPermissionsRepairForDisk(disk)
+                                : tool.beginPermissionsVerifyForDisk(disk);
+            case Subject::Filesystem: break;
+        }
+        return isRepair ? tool.beginStoragesystemFilesystemRepairForDisk(disk)
+                        : tool.beginStoragesystemFilesystemVerifyForDisk(disk);
+    }
+
+    void refuse(const Undone& undone)
+    {
+        pellar::EventRoad road(loop_, {&teller_, nullptr, {}, [] {
+                                       }});
+        pellar::JobLog log(request_.disk, texts_, road);
+        log.started();
+        tellUndone(undone, request_, texts_, log);
+        loop_.runUntil([this] { return teller_.isOver(); });
+    }
+
+    const HelperRequest& request_;
+    const pellar::Texts& texts_;
+    MainLoop loop_;
+    Teller teller_;
+    DiskReference disk_;
+    std::optional<AttachedRegion> region_;  ///< given back last
+};
+
+}  // namespace
+
+void runHelperJob(const HelperRequest& request, std::optional<uid_t> user,
+                  const pellar::Texts& texts)
+{
+    HelperJob(request, texts).run(user);
+}
+
+}  // namespace orvane

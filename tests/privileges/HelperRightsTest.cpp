@@ -1,0 +1,146 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the helper takes from the program that asks, and from the mount table.
+
+#include "orvane/privileges/AskingProgram.h"
+#include "orvane/privileges/AttachedRegion.h"
+#include "orvane/privileges/MountedSystem.h"
+#include "tests/pellar/Workshop.h"
+
+#include <gtest/gtest.h>
+
+#include <fcntl.h>
+#include <sys/prctl.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace orvane {
+namespace {
+
+constexpr uid_t somebody = 65534;
+
+/// Runs in a child, whose parent is this program; what it answers.
+bool inChild(const std::function<bool()>& question)
+{
+    const pid_t child = ::fork();
+    if (child == 0)
+        ::_exit(question() ? 0 : 1);
+    int status = -1;
+    ::waitpid(child, &status, 0);
+    return status == 0;
+}
+
+TEST(AskingProgram, GivesWhatItHasOpenItself)
+{
+    const pellar::test::Workshop workshop;
+    workshop.write("file", "here");
+    const FileDescriptor file(::open(workshop.path("file").c_str(), O_RDONLY | O_CLOEXEC));
+    const auto reads = [&file](uid_t user) {
+        const auto program = AskingProgram::of(user);
+        const FileDescriptor taken = program ? program->take(file.get()) : FileDescriptor();
+        char text[5] = {};
+        return taken && ::pread(taken.get(), text, 4, 0) == 4 && std::string(text) == "here";
+    };
+    EXPECT_TRUE(inChild([&] { return reads(::getuid()); }));
+    EXPECT_FALSE(inChild([&] { return reads(::getuid() + 1); })) << "another user's program";
+    EXPECT_FALSE(inChild([] {
+        const auto program = AskingProgram::of(::getuid());
+        return program && program->take(1000);
+    })) << "nothing is open there";
+}
+
+// su(1) has the user's number again when it starts their shell, and may have root's files open.
+TEST(AskingProgram, OneThatHadOtherRightsIsNotTrusted)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root can give rights up";
+    struct Case {
+        uid_t real, effective, saved;
+        bool isDumpable;
+        bool isTrusted;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{somebody, somebody, somebody, true, true, "the user's own"},
+             Case{somebody, somebody, somebody, false, false, "it had root's rights"},
+             Case{somebody, somebody, 0, true, false, "it can have them back"},
+             Case{somebody, 0, 0, true, false, "a setuid program"},
+         })
+        EXPECT_EQ(inChild([&c] {
+                      int ready[2];
+                      if (::pipe(ready) != 0)
+                          return false;
+                      const pid_t helper = ::fork();
+                      if (helper == 0) {
+                          char byte = 0;
+                          const bool isReady = ::read(ready[0], &byte, 1) == 1;
+                          ::_exit(isReady && AskingProgram::of(somebody) ? 0 : 1);
+                      }
+                      static_cast<void>(::setresuid(c.real, c.effective, c.saved));
+                      ::prctl(PR_SET_DUMPABLE, c.isDumpable ? 1 : 0);
+                      static_cast<void>(!::write(ready[1], "x", 1));
+                      int status = -1;
+                      ::waitpid(helper, &status, 0);
+                      return status == 0;
+                  }),
+                  c.isTrusted)
+            << c.because;
+}
+
+TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
+{
+    const pellar::test::Workshop workshop;
+    workshop.write("image", std::string(8192, 'x'));
+    const std::string image = workshop.path("image");
+    HelperRequest request;
+    request.disk.offset = 4096;
+    request.disk.length = 4096;
+    struct Case {
+        std::string file;
+        int mode;
+        pellar::Operation operation;
+        std::uint64_t length;
+        std::string_view reason;
+    };
+    constexpr auto verify = pellar::Operation::Verify;
+    constexpr auto repair = pellar::Operation::Repair;
+    constexpr std::string_view noPart = "it is not a part of an image that you have opened";
+    for (const Case& c : {
+             Case{image, O_RDONLY, repair, 4096, "you may not write to the image"},
+             Case{image, O_WRONLY, repair, 4096, noPart},
+             Case{image, O_PATH, verify, 4096, noPart},
+             Case{image, O_RDONLY, verify, 4097, noPart},
+             Case{image, O_RDONLY, verify, ~std::uint64_t(0), noPart},
+             Case{"/dev/null", O_RDWR, verify, 4096, noPart},
+             Case{"/", O_RDONLY, verify, 4096, noPart},
+             Case{"/nonexistent", O_RDONLY, verify, 4096, noPart},
+         }) {
+        request.operation = c.operation;
+        request.disk.length = c.length;
+        const FileDescriptor file(::open(c.file.c_str(), c.mode | O_CLOEXEC));
+        const auto attached = AttachedRegion::attach(file, request);
+        ASSERT_TRUE(std::holds_alternative<Undone>(attached)) << c.file;
+        EXPECT_EQ(std::get<Undone>(attached).reason.key, c.reason) << c.file << c.mode;
+    }
+}
+
+TEST(MountedSystem, NobodyElseCanChangeTheWay)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root can give directories away";
+    const auto base = std::filesystem::path("/run/orvane-way-test");
+    std::filesystem::create_directories(base / "a/b");
+    EXPECT_TRUE(isWayOfRootsAlone("/"));
+    EXPECT_TRUE(isWayOfRootsAlone(base / "a/b"));
+    std::filesystem::permissions(base / "a", std::filesystem::perms(0775));
+    EXPECT_FALSE(isWayOfRootsAlone(base / "a/b")) << "the group can";
+    std::filesystem::permissions(base / "a", std::filesystem::perms(0755));
+    EXPECT_EQ(::chown((base / "a").c_str(), somebody, 0), 0);
+    EXPECT_FALSE(isWayOfRootsAlone(base / "a/b")) << "its owner can";
+    std::filesystem::create_directory_symlink(base, base / "link");
+    EXPECT_FALSE(isWayOfRootsAlone(base / "link/x")) << "a link leads somewhere else tomorrow";
+    std::filesystem::remove_all(base);
+}
+
+}  // namespace
+}  // namespace orvane
