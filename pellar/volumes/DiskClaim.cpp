@@ -47,8 +47,9 @@ ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status
                    const SystemPaths& paths)
 {
     if (S_ISREG(status.st_mode))
-        return backsLoopDevice(status.st_dev, status.st_ino, paths) ? fixwell::kPLErrorDiskInUse
-                                                                    : fixwell::kPLNoError;
+        return loopDeviceOn(status.st_dev, status.st_ino, paths).empty()
+                   ? fixwell::kPLNoError
+                   : fixwell::kPLErrorDiskInUse;
     if (!S_ISBLK(status.st_mode))
         return fixwell::kPLErrorCannotOpen;
     if (isMounted(status.st_rdev, paths))
@@ -102,6 +103,9 @@ std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference&
     if (const ErrorCode error = useError(disk, status, paths))
         return error;
     if (const ErrorCode error = lockError(opened.get(), access, S_ISBLK(status.st_mode)))
+        return error;
+    // Whoever attaches an image holds the lock until it is attached, which may just have been.
+    if (const ErrorCode error = useError(disk, status, paths))
         return error;
     return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
 }

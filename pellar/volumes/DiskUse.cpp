@@ -48,7 +48,7 @@ bool isMounted(dev_t device, const SystemPaths& paths)
     return !mountInfo || mountInfoNames(*mountInfo, major(device), minor(device));
 }
 
-bool backsLoopDevice(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths)
+std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths)
 {
     std::error_code error;
     for (const auto& device : std::filesystem::directory_iterator(paths.blockDevices, error)) {
@@ -59,9 +59,9 @@ bool backsLoopDevice(dev_t fileDevice, ino_t fileNumber, const SystemPaths& path
         if (file->back() == '\n')
             file->pop_back();
         if (isSameFile(*file, fileDevice, fileNumber))
-            return true;
+            return "/dev/" + device.path().filename().native();
     }
-    return false;
+    return {};
 }
 
 }  // namespace pellar

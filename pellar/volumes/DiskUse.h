@@ -5,6 +5,7 @@
 
 #include <sys/types.h>
 
+#include <string>
 #include <string_view>
 
 namespace pellar {
@@ -17,7 +18,7 @@ bool mountInfoNames(std::string_view mountInfo, unsigned major, unsigned minor);
 /// what is not known to be free is not touched.
 bool isMounted(dev_t device, const SystemPaths& paths);
 
-/// Whether a loop device is set up on this file, wherever in it.
-bool backsLoopDevice(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths);
+/// The node of a loop device that is set up on this file, wherever in it; empty when there is none.
+std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths);
 
 }  // namespace pellar

@@ -20,13 +20,15 @@ namespace {
 
 constexpr std::uint64_t sectorBytes = 512;
 
-loop_config configurationFor(int file, std::uint64_t offset, std::uint64_t length, Access access)
+loop_config configurationFor(int file, std::uint64_t offset, std::uint64_t length, Access access,
+                             LoopLife life)
 {
     loop_config configuration = {};
     configuration.fd = static_cast<std::uint32_t>(file);
     configuration.info.lo_offset = offset;
     configuration.info.lo_sizelimit = length;
-    configuration.info.lo_flags = LO_FLAGS_AUTOCLEAR;
+    configuration.info.lo_flags =
+        life == LoopLife::UntilClosed ? LO_FLAGS_AUTOCLEAR : LO_FLAGS_PARTSCAN;
     if (access == Access::ReadOnly)
         configuration.info.lo_flags |= LO_FLAGS_READ_ONLY;
     return configuration;
@@ -40,10 +42,10 @@ FileDescriptor openDevice(const std::string& name, Access access)
 
 }  // namespace
 
-std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
-                                                 std::uint64_t length, Access access)
+std::variant<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset, std::uint64_t length,
+                                           Access access, LoopLife life)
 {
-    if (offset % sectorBytes != 0 || length < sectorBytes)
+    if (offset % sectorBytes != 0)
         return EINVAL;
     const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
     if (!control)
@@ -58,13 +60,25 @@ std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
         FileDescriptor device = openDevice(name, access);
         if (!device)
             return errno;
-        const loop_config configuration = configurationFor(file, offset, length, access);
+        const loop_config configuration = configurationFor(file, offset, length, access, life);
         if (::ioctl(device.get(), LOOP_CONFIGURE, &configuration) == 0)
-            return LoopDevice(std::move(device), name);
+            return NewLoopDevice{std::move(device), name};
         if (errno != EBUSY)
             return errno;
     }
     return EBUSY;
+}
+
+std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
+                                                 std::uint64_t length, Access access)
+{
+    if (length < sectorBytes)
+        return EINVAL;
+    auto made = setUpLoop(file, offset, length, access, LoopLife::UntilClosed);
+    if (const int* const error = std::get_if<int>(&made))
+        return *error;
+    auto& [device, name] = std::get<NewLoopDevice>(made);
+    return LoopDevice(std::move(device), name);
 }
 
 LoopDevice::LoopDevice(FileDescriptor device, const std::string& name)

@@ -12,6 +12,24 @@
 
 namespace pellar {
 
+/// A loop device as it was just set up, still open, and its name ("loop0").
+struct NewLoopDevice {
+    FileDescriptor device;
+    std::string name;
+};
+
+/// When the kernel takes a loop device down by itself: when nobody has it open any more
+/// (LO_FLAGS_AUTOCLEAR), or never; its partitions are looked for then (LO_FLAGS_PARTSCAN).
+enum class LoopLife { UntilClosed, UntilDetached };
+
+/// A region of a file as a block device, where a `length` of 0 reaches to the end. An errno when
+/// the kernel refuses: EACCES without the right to, ENOENT where there is no /dev/loop-control,
+/// EINVAL for a region that does not begin at a sector of 512 bytes. The device is read-only for
+/// Access::ReadOnly, whoever opens it.
+[[nodiscard]] std::variant<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset,
+                                                         std::uint64_t length, Access access,
+                                                         LoopLife life);
+
 /// A region of a file, or of a disk, as a block device of its own, for tools that cannot be told
 /// where a volume begins (loop(4)). Needs the right to set up loop devices.
 ///
@@ -20,9 +38,7 @@ namespace pellar {
 /// open for a moment: giving it back waits for that, a second at most.
 class LoopDevice {
 public:
-    /// An errno when the kernel refuses: EACCES without the right to, ENOENT where there is no
-    /// /dev/loop-control, EINVAL for a region that is not made of sectors of 512 bytes. The
-    /// device is read-only for Access::ReadOnly, whoever opens it.
+    /// An errno as setUpLoop; EINVAL as well for a region of less than a sector.
     [[nodiscard]] static std::variant<LoopDevice, int> attach(int file, std::uint64_t offset,
                                                               std::uint64_t length, Access access);
 

@@ -167,7 +167,7 @@ bool isOnALoopDevice(const std::filesystem::path& image)
 {
     struct stat status = {};
     return ::stat(image.c_str(), &status) != 0 ||
-           backsLoopDevice(status.st_dev, status.st_ino, SystemPaths());
+           !loopDeviceOn(status.st_dev, status.st_ino, SystemPaths()).empty();
 }
 
 /// The volume, moved into the middle of a larger file.
