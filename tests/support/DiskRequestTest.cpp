@@ -57,17 +57,50 @@ TEST(DiskRequest, WhatIsPossibleFollowsFromTheDisk)
           Case{image, "", "an image file is no device"},
           Case{ejectable("/dev/sdb", {free, mounted}), "E", "a stick"},
           Case{ejectable("/dev/sda", {free, root}), "", "a stick that the system runs from"},
+          Case{ejectable("/dev/loop7", {free, mounted}), "ED", "an attached image"},
+          Case{ejectable("/dev/loop7", {root}), "", "one that the system runs from"},
           Case{DiskTree{facts("/dev/sdb", diskType::whole), {free}}, "", "a built-in disk"}}) {
         const auto disk = make(c.tree);
         std::string possible;
         for (const auto& [action, letter] :
              {std::pair(DiskAction::Mount, 'M'), std::pair(DiskAction::Unmount, 'U'),
-              std::pair(DiskAction::Eject, 'E')})
+              std::pair(DiskAction::Eject, 'E'), std::pair(DiskAction::Detach, 'D')})
             if (isPossible(action, *disk))
                 possible += letter;
         EXPECT_EQ(possible, c.possible) << c.because;
         disk->setGone();
         EXPECT_FALSE(isPossible(DiskAction::Mount, *disk) || isPossible(DiskAction::Eject, *disk));
+    }
+}
+
+TEST(DiskRequest, WhatMakesNoSenseIsSaid)
+{
+    DiskTree image{facts("/d.img", diskType::diskImage), {}};
+    image.facts.storage = DiskReference::Storage::FileRegion;
+    DiskTree blank{facts("/dev/sdc", diskType::whole), {}};
+    const DiskTree free{facts("/dev/sdb1", diskType::volume), {}};
+    const DiskTree whole{facts("/dev/sdb", diskType::whole), {free}};
+    const DiskTree mounted{facts("/dev/sdb2", diskType::volume, "/mnt"), {}};
+    struct Case {
+        DiskAction action;
+        DiskTree tree;
+        Kind kind;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{DiskAction::Mount, mounted, Kind::AlreadySo, "no failure"},
+             Case{DiskAction::Unmount, free, Kind::AlreadySo, "no failure"},
+             Case{DiskAction::Mount, whole, Kind::IsWhole, "which of its volumes?"},
+             Case{DiskAction::Unmount, whole, Kind::IsWhole, "which of its volumes?"},
+             Case{DiskAction::Mount, blank, Kind::NoFilesystem, "it has no volumes"},
+             Case{DiskAction::Mount, image, Kind::IsImage, "the way out is said"},
+             Case{DiskAction::Detach, image, Kind::IsNoLoop, "nor is it attached"},
+             Case{DiskAction::Detach, whole, Kind::IsNoLoop, "a real disk"},
+             Case{DiskAction::Eject, whole, Kind::CannotEject, "a built-in disk"},
+         }) {
+        const auto objection = objectionTo(c.action, *make(c.tree));
+        ASSERT_TRUE(objection) << c.because;
+        EXPECT_EQ(objection->kind, c.kind) << c.because;
     }
 }
 
@@ -121,7 +154,9 @@ TEST(Refusal, OnlyWhatTheUserKnowsAlreadyIsSilent)
     const auto request = requestFor(DiskAction::Unmount, *make({facts("/d", 3, "/m"), {}}));
     for (const Kind kind :
          {Kind::NoService, Kind::UnknownDevice, Kind::NoFilesystem, Kind::Busy, Kind::NotAllowed,
-          Kind::NoAnswer, Kind::Ended, Kind::NoTable, Kind::CannotEject, Kind::HoldsSystem}) {
+          Kind::NoAnswer, Kind::Ended, Kind::NoTable, Kind::CannotEject, Kind::HoldsSystem,
+          Kind::IsImage, Kind::IsNoImage, Kind::IsWhole, Kind::IsNoLoop, Kind::HasGone,
+          Kind::Lingers, Kind::Attached, Kind::BeingUsed, Kind::IsReadOnly}) {
         EXPECT_FALSE(isSilent({kind, {}}));
         EXPECT_GT(failureText(request, {kind, {}}, Translator()).size(),
                   std::string_view("cannot unmount “/d”: ").size())

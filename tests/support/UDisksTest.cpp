@@ -4,8 +4,10 @@
 #include "orvane/support/loop/MainLoop.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
+#include "orvane/support/udisks/ImageDevices.h"
 #include "orvane/support/udisks/MountedAt.h"
 #include "orvane/support/udisks/UDisks.h"
+#include "pellar/volumes/DiskClaim.h"
 #include "tests/support/BusDaemon.h"
 #include "tests/support/LoopDevice.h"
 
@@ -21,6 +23,7 @@ namespace orvane {
 namespace {
 
 using Kind = Refusal::Kind;
+using pellar::Access;
 using test::LoopDevice;
 using test::TemporaryDirectory;
 using namespace std::chrono_literals;
@@ -44,7 +47,8 @@ private:
     std::optional<std::string> old_;
 };
 
-Kind kindOf(const Answer<>& answer)
+template <class T>
+Kind kindOf(const Answer<T>& answer)
 {
     return std::get<Refusal>(answer).kind;
 }
@@ -105,6 +109,37 @@ protected:
 
     static std::vector<std::string> nothing() { return {}; }
 
+    /// An image that nobody uses is attached, and no job gets at the file until it is detached.
+    void expectImageIsAttachedUntilItIsDetached() const
+    {
+        const std::string image = directory_ / "other.img";
+        test::write(image, std::string(1 << 20, 'x'));
+        fixwell::DiskReference disk;
+        disk.path = image;
+        {
+            const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
+            ASSERT_EQ(job.index(), 0U);
+            EXPECT_EQ(kindOf(attachImage(image, Access::ReadWrite)), Kind::BeingUsed);
+        }
+        for (const Access access : {Access::ReadWrite, Access::ReadOnly}) {
+            const auto answer = attachImage(image, access);
+            ASSERT_EQ(answer.index(), 0U) << reasonText(std::get<Refusal>(answer), texts_);
+            const std::filesystem::path node = std::get<std::string>(answer);
+            std::ifstream isReadOnly("/sys/block" / node.filename() / "ro");
+            EXPECT_EQ(isReadOnly.get(), access == Access::ReadOnly ? '1' : '0');
+            const auto again = attachImage(image, Access::ReadOnly);
+            ASSERT_EQ(again.index(), 1U);
+            EXPECT_EQ(std::get<Refusal>(again), (Refusal{Kind::Attached, node}));
+            const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
+            EXPECT_EQ(job.index(), 1U) << "a job on the file, too";
+            const auto request =
+                orvane::request(DiskAction::Detach, DiskStep::Kind::DetachLoop, node);
+            EXPECT_EQ(carryOut(request).index(), 0U);
+        }
+        EXPECT_EQ(pellar::DiskClaim::take(disk, Access::ReadWrite, {}).index(), 0U)
+            << "no lock is left";
+    }
+
     const TemporaryDirectory directory_;
     std::unique_ptr<LoopDevice> device_;
     const Translator texts_;
@@ -153,6 +188,11 @@ TEST_F(UDisksTest, ADeviceIsMountedUnmountedAndEjected)
     EXPECT_TRUE(isDetached());
 }
 
+TEST_F(UDisksTest, AnImageIsAttachedUntilItIsDetached)
+{
+    expectImageIsAttachedUntilItIsDetached();
+}
+
 TEST_F(UDisksTest, ALoopDeviceHasNoDriveToEject)
 {
     EXPECT_EQ(kindOf(UDisks().eject(device_->name())), Kind::CannotEject);
@@ -182,6 +222,19 @@ TEST_F(DirectTest, RootMountsWhereTheTableSays)
     EXPECT_FALSE(isMounted());
     EXPECT_EQ(eject(), nothing());
     EXPECT_TRUE(isDetached());
+}
+
+TEST_F(DirectTest, RootAttachesAnImageUntilItIsDetached)
+{
+    expectImageIsAttachedUntilItIsDetached();
+}
+
+TEST_F(DirectTest, AnImageInUseComesOffLater)
+{
+    const FileDescriptor user(::open(device_->name().c_str(), O_RDONLY | O_CLOEXEC));
+    EXPECT_EQ(
+        kindOf(carryOut(request(DiskAction::Detach, DiskStep::Kind::DetachLoop, device_->name()))),
+        Kind::Lingers);
 }
 
 // With the one step that could do no harm to it.

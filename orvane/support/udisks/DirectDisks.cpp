@@ -3,6 +3,7 @@
 
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/MountedAt.h"
+#include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
 #include <libmount/libmount.h>
@@ -117,6 +118,14 @@ Answer<> eject(const std::string& node)
 Answer<> detachLoop(const std::string& node)
 {
     return control(node, LOOP_CLR_FD);
+}
+
+Answer<std::string> setUpLoop(int file, pellar::Access access)
+{
+    const auto made = pellar::setUpLoop(file, 0, 0, access, pellar::LoopLife::UntilDetached);
+    if (const int* const error = std::get_if<int>(&made))
+        return std::get<Refusal>(answerOf(*error));
+    return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
 }
 
 }  // namespace orvane::direct

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/support/udisks/Refusal.h"
+#include "pellar/process/Access.h"
 
 #include <string>
 
@@ -18,5 +19,7 @@ namespace orvane::direct {
 [[nodiscard]] Answer<> unmount(const std::string& node);
 [[nodiscard]] Answer<> eject(const std::string& node);
 [[nodiscard]] Answer<> detachLoop(const std::string& node);
+/// A loop device on an open file that stays; its node.
+[[nodiscard]] Answer<std::string> setUpLoop(int file, pellar::Access access);
 
 }  // namespace orvane::direct

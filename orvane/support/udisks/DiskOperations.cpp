@@ -2,6 +2,7 @@
 #include "orvane/support/udisks/DiskOperations.h"
 
 #include "orvane/support/udisks/DirectDisks.h"
+#include "orvane/support/udisks/ImageDevices.h"
 #include "orvane/support/udisks/MountedAt.h"
 #include "orvane/support/udisks/UDisks.h"
 
@@ -19,6 +20,7 @@ Answer<> throughUDisks(UDisks& udisks, const DiskStep& step)
         case DiskStep::Kind::Unmount: return udisks.unmount(step.node);
         case DiskStep::Kind::Eject: return udisks.eject(step.node);
         case DiskStep::Kind::DetachLoop: return udisks.detachLoop(step.node);
+        case DiskStep::Kind::Attach: break;
     }
     return Refusal{};
 }
@@ -30,6 +32,7 @@ Answer<> directly(const DiskStep& step)
         case DiskStep::Kind::Unmount: return direct::unmount(step.node);
         case DiskStep::Kind::Eject: return direct::eject(step.node);
         case DiskStep::Kind::DetachLoop: return direct::detachLoop(step.node);
+        case DiskStep::Kind::Attach: break;
     }
     return Refusal{};
 }
@@ -55,11 +58,33 @@ bool holdsSystem(const std::vector<pellar::MountPlace>& places)
                        [](const auto& place) { return place.target == "/"; });
 }
 
+// The kernel takes an image off when nobody has its device open any more (loop(4), LOOP_CLR_FD);
+// the device manager may have, for a moment.
+bool hasComeOff(const std::string& node)
+{
+    const auto image =
+        std::filesystem::path("/sys/block") / std::filesystem::path(node).filename() / "loop";
+    std::error_code error;
+    for (int i = 0; i < 100 && std::filesystem::exists(image, error); ++i)
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    return !std::filesystem::exists(image, error);
+}
+
+Answer<> attach(const std::filesystem::path& image, const std::stop_token& stop)
+{
+    const auto answer = attachImage(image, accessTo(image), stop);
+    if (const auto* const refusal = std::get_if<Refusal>(&answer))
+        return *refusal;
+    return Done{};
+}
+
 Answer<> carryOut(UDisks& udisks, const DiskStep& step)
 {
     if (step.kind != DiskStep::Kind::Mount && holdsSystem(placesOf(step.node)))
         return Refusal{Refusal::Kind::HoldsSystem, {}};
-    const Answer<> answer = throughAny(udisks, step);
+    Answer<> answer = throughAny(udisks, step);
+    if (step.kind == DiskStep::Kind::DetachLoop && answer.index() == 0 && !hasComeOff(step.node))
+        return Refusal{Refusal::Kind::Lingers, {}};
     const auto* const refusal = std::get_if<Refusal>(&answer);
     if (refusal != nullptr && refusal->kind == Refusal::Kind::Busy)
         return Refusal{Refusal::Kind::Busy, holdersText(placesOf(step.node))};
@@ -72,7 +97,8 @@ Answer<> carryOut(const DiskRequest& request, const std::stop_token& stop)
 {
     UDisks udisks(stop);
     for (const DiskStep& step : request.steps) {
-        const Answer<> answer = carryOut(udisks, step);
+        const Answer<> answer =
+            step.kind == DiskStep::Kind::Attach ? attach(step.node, stop) : carryOut(udisks, step);
         const auto* const refusal = std::get_if<Refusal>(&answer);
         if (refusal != nullptr && refusal->kind != Refusal::Kind::AlreadySo)
             return answer;

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DiskRequest.h"
 
+#include "fixwell/host/foundation/UTF8.h"
+
 #include <algorithm>
 
 namespace orvane {
@@ -28,16 +30,34 @@ bool holdsSystem(const Disk& disk)
                                               [](const auto& part) { return holdsSystem(*part); });
 }
 
-bool canMount(const Disk& disk)
+std::optional<Refusal> because(Refusal::Kind kind)
 {
-    return isVolume(disk) && !disk.facts().filesystem.empty() && !disk.isMounted();
+    return Refusal{kind, {}};
 }
 
-bool canEject(const Disk& disk)
+std::optional<Refusal> objectionToMounting(const Disk& disk)
 {
-    const auto whole = wholeOf(disk);
-    const Disk& top = whole ? *whole : disk;
-    return top.facts().isEjectable && !holdsSystem(top);
+    if (disk.isMounted())
+        return because(Refusal::Kind::AlreadySo);
+    if (!isVolume(disk) && !disk.parts().empty())
+        return because(Refusal::Kind::IsWhole);
+    return disk.facts().filesystem.empty() ? because(Refusal::Kind::NoFilesystem) : std::nullopt;
+}
+
+std::optional<Refusal> objectionToUnmounting(const Disk& disk)
+{
+    if (disk.isBootVolume())
+        return because(Refusal::Kind::HoldsSystem);
+    if (disk.isMounted())
+        return std::nullopt;
+    return because(disk.parts().empty() ? Refusal::Kind::AlreadySo : Refusal::Kind::IsWhole);
+}
+
+std::optional<Refusal> objectionToEjection(const Disk& top)
+{
+    if (holdsSystem(top))
+        return because(Refusal::Kind::HoldsSystem);
+    return top.facts().isEjectable ? std::nullopt : because(Refusal::Kind::CannotEject);
 }
 
 void unmountParts(const Disk& disk, std::vector<DiskStep>& steps)
@@ -53,9 +73,9 @@ bool isLoop(const DiskFacts& facts)
     return facts.path.filename().native().starts_with("loop");
 }
 
-DiskRequest ejectionOf(const Disk& whole)
+DiskRequest ejectionOf(DiskAction action, const Disk& whole)
 {
-    DiskRequest request{DiskAction::Eject, whole.diskIdentifier(), whole.displayName(), {}};
+    DiskRequest request{action, whole.diskIdentifier(), whole.displayName(), {}};
     unmountParts(whole, request.steps);
     request.steps.push_back(
         {isLoop(whole.facts()) ? DiskStep::Kind::DetachLoop : DiskStep::Kind::Eject,
@@ -65,38 +85,63 @@ DiskRequest ejectionOf(const Disk& whole)
 
 }  // namespace
 
-bool isPossible(DiskAction action, const Disk& disk)
+std::optional<Refusal> objectionTo(DiskAction action, const Disk& disk)
 {
-    if (disk.hasGone() || disk.facts().storage != fixwell::DiskReference::Storage::BlockDevice)
-        return false;
+    if (disk.hasGone())
+        return because(Refusal::Kind::HasGone);
+    if (disk.facts().storage != fixwell::DiskReference::Storage::BlockDevice)
+        return because(action == DiskAction::Detach ? Refusal::Kind::IsNoLoop
+                                                    : Refusal::Kind::IsImage);
+    const auto whole = wholeOf(disk);
+    const Disk& top = whole ? *whole : disk;
     switch (action) {
-        case DiskAction::Mount: return canMount(disk);
-        case DiskAction::Unmount: return disk.isMounted() && !disk.isBootVolume();
-        case DiskAction::Eject: return canEject(disk);
+        case DiskAction::Mount: return objectionToMounting(disk);
+        case DiskAction::Unmount: return objectionToUnmounting(disk);
+        case DiskAction::Eject: return objectionToEjection(top);
+        case DiskAction::Attach: break;
+        case DiskAction::Detach:
+            return isLoop(top.facts()) ? objectionToEjection(top)
+                                       : because(Refusal::Kind::IsNoLoop);
     }
-    return false;
+    return because(Refusal::Kind::AlreadySo);
 }
 
 DiskRequest requestFor(DiskAction action, const Disk& disk)
 {
     const auto whole = wholeOf(disk);
-    if (action == DiskAction::Eject)
-        return ejectionOf(whole ? *whole : disk);
+    if (action == DiskAction::Eject || action == DiskAction::Detach)
+        return ejectionOf(action, whole ? *whole : disk);
     const auto kind = action == DiskAction::Mount ? DiskStep::Kind::Mount : DiskStep::Kind::Unmount;
     return {action, disk.diskIdentifier(), disk.displayName(), {{kind, disk.facts().path}}};
 }
 
+DiskRequest requestToAttach(const std::filesystem::path& image)
+{
+    return {DiskAction::Attach,
+            image.native(),
+            fixwell::printable(image.filename().native()),
+            {{DiskStep::Kind::Attach, image.native()}}};
+}
+
+namespace {
+
+std::string_view attemptOf(DiskAction action)
+{
+    switch (action) {
+        case DiskAction::Mount: return "cannot mount “%@”: %@";
+        case DiskAction::Unmount: return "cannot unmount “%@”: %@";
+        case DiskAction::Eject: return "cannot eject “%@”: %@";
+        case DiskAction::Attach: return "cannot attach “%@” as a device: %@";
+        case DiskAction::Detach: break;
+    }
+    return "cannot detach “%@”: %@";
+}
+
+}  // namespace
+
 std::string failureText(const DiskRequest& request, const Refusal& refusal, const Translator& texts)
 {
-    const std::string reason = reasonText(refusal, texts);
-    switch (request.action) {
-        case DiskAction::Mount:
-            return texts.sentence("cannot mount “%@”: %@", {request.name, reason});
-        case DiskAction::Unmount:
-            return texts.sentence("cannot unmount “%@”: %@", {request.name, reason});
-        case DiskAction::Eject: break;
-    }
-    return texts.sentence("cannot eject “%@”: %@", {request.name, reason});
+    return texts.sentence(attemptOf(request.action), {request.name, reasonText(refusal, texts)});
 }
 
 }  // namespace orvane

@@ -92,8 +92,21 @@ std::string reasonText(const Refusal& refusal, const Translator& texts)
                 "UDisks2 cannot be reached, and /etc/fstab does not say where to mount it");
         case Kind::HoldsSystem: return texts.text("the system runs from it");
         case Kind::CannotEject: return texts.text("its drive does not eject");
-        case Kind::AlreadySo:
-        case Kind::Dismissed:
+        case Kind::IsImage:
+            return texts.text("it is an image file, which has to be attached as a device first");
+        case Kind::IsNoImage: return texts.text("it is no regular file, or an empty one");
+        case Kind::IsWhole: return texts.text("it is a disk with volumes; name one of them");
+        case Kind::IsNoLoop: return texts.text("it is not an attached image");
+        case Kind::HasGone: return texts.text("it is no longer there");
+        case Kind::Lingers:
+            return texts.text("it is still in use, and comes off when it no longer is");
+        case Kind::Attached:
+            return texts.sentence("it is attached already, as %@", {refusal.detail});
+        case Kind::BeingUsed: return texts.text("it is being verified or repaired");
+        case Kind::IsReadOnly:
+            return texts.text("you may not write to it; it can be attached to be read only");
+        case Kind::Dismissed: return texts.text("the authorisation was not given");
+        case Kind::AlreadySo: return texts.text("it is so already");
         case Kind::Abandoned:
         case Kind::Other: break;
     }

@@ -10,7 +10,7 @@
 
 namespace orvane {
 
-/// Why a disk was not mounted, unmounted or ejected.
+/// Why a disk was not mounted, unmounted or ejected, or an image not attached or detached.
 struct Refusal {
     enum class Kind {
         NoService,      ///< there is no system bus, or no UDisks2 on it
@@ -26,7 +26,16 @@ struct Refusal {
         NoTable,    ///< /etc/fstab does not say where
         CannotEject,
         HoldsSystem,  ///< the system runs from it
-        Other,        ///< `detail` says what
+        IsImage,      ///< a file, and no device
+        IsNoImage,    ///< an empty file, or no regular one
+        IsWhole,      ///< it has volumes, and is none
+        IsNoLoop,     ///< a device that no image is behind
+        HasGone,
+        Lingers,     ///< it goes when nobody has it open any more
+        Attached,    ///< an image that is attached already; `detail` names the device
+        BeingUsed,   ///< an image that is being verified or repaired
+        IsReadOnly,  ///< an image that this user may not write to
+        Other,       ///< `detail` says what
     };
 
     Kind kind = Kind::Other;

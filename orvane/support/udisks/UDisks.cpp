@@ -54,9 +54,8 @@ T valueOf(const Properties& properties, const char* name, T otherwise)
 }
 
 // "ay" with a zero at the end, as all file names of UDisks2 are.
-std::string fileName(const Properties& properties, const char* name)
+std::string fileName(const std::vector<std::uint8_t>& bytes)
 {
-    const auto bytes = valueOf(properties, name, std::vector<std::uint8_t>());
     std::string text(bytes.begin(), bytes.end());
     text.resize(std::min(text.find('\0'), text.size()));
     return text;
@@ -88,8 +87,8 @@ std::set<std::string> failingNodes(const Objects& objects)
     for (const auto& [path, object] : objects) {
         drives.push_back(driveFacts(path, object));
         if (const auto* const block = interfaceOf(object, "Block"))
-            devices.push_back(
-                {fileName(*block, "Device"), valueOf(*block, "Drive", sdbus::ObjectPath("/"))});
+            devices.push_back({fileName(valueOf(*block, "Device", std::vector<std::uint8_t>())),
+                               valueOf(*block, "Drive", sdbus::ObjectPath("/"))});
     }
     return failingDevices(drives, devices);
 }
@@ -126,6 +125,26 @@ Answer<std::string> UDisks::objectOf(const std::string& node)
         if (objects.empty())
             return Refusal{Refusal::Kind::UnknownDevice, {}};
         return std::string(objects.front());
+    });
+}
+
+Answer<sdbus::Variant> UDisks::property(const std::string& object, const char* interface,
+                                        const char* name)
+{
+    return answered([&]() -> Answer<sdbus::Variant> {
+        BusCall question(
+            *connection_, {object, "org.freedesktop.DBus.Properties", "Get"},
+            [&](sdbus::MethodCall& arguments) {
+                arguments << std::string("org.freedesktop.UDisks2.") +
+                                 interface << std::string(name);
+            },
+            questionTime);
+        auto reply = question.wait(stop_);
+        if (const auto* const refusal = std::get_if<Refusal>(&reply))
+            return *refusal;
+        sdbus::Variant value;
+        std::get<sdbus::MethodReply>(reply) >> value;
+        return value;
     });
 }
 
@@ -169,31 +188,52 @@ Answer<> UDisks::detachLoop(const std::string& node)
     return call(node, "Loop", "Delete");
 }
 
+Answer<std::string> UDisks::setUpLoop(int file, pellar::Access access)
+{
+    if (!connection_)
+        return noService();
+    sdbus::ObjectPath object;
+    const auto made = answered([&]() -> Answer<> {
+        BusCall call(
+            *connection_, {manager, "org.freedesktop.UDisks2.Manager", "LoopSetup"},
+            [&](sdbus::MethodCall& arguments) {
+                Options options = interactive();
+                options["read-only"] = sdbus::Variant(access == pellar::Access::ReadOnly);
+                arguments << sdbus::UnixFd(file) << options;
+            },
+            operationTime);
+        auto reply = call.wait(stop_);
+        if (const auto* const refusal = std::get_if<Refusal>(&reply))
+            return *refusal;
+        std::get<sdbus::MethodReply>(reply) >> object;
+        return Done{};
+    });
+    if (const auto* const refusal = std::get_if<Refusal>(&made))
+        return *refusal;
+    const auto device = property(object, "Block", "Device");
+    if (const auto* const refusal = std::get_if<Refusal>(&device))
+        return *refusal;
+    return answered([&]() -> Answer<std::string> {
+        return fileName(std::get<sdbus::Variant>(device).get<std::vector<std::uint8_t>>());
+    });
+}
+
 Answer<> UDisks::eject(const std::string& node)
 {
     const auto object = objectOf(node);
     if (const auto* const refusal = std::get_if<Refusal>(&object))
         return *refusal;
-    sdbus::ObjectPath drive("/");
-    const auto found = answered([&]() -> Answer<> {
-        BusCall question(
-            *connection_, {std::get<std::string>(object), "org.freedesktop.DBus.Properties", "Get"},
-            [](sdbus::MethodCall& arguments) {
-                arguments << std::string("org.freedesktop.UDisks2.Block") << std::string("Drive");
-            },
-            questionTime);
-        auto reply = question.wait(stop_);
-        if (const auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
-        sdbus::Variant value;
-        std::get<sdbus::MethodReply>(reply) >> value;
-        drive = value.get<sdbus::ObjectPath>();
-        return Done{};
+    const auto value = property(std::get<std::string>(object), "Block", "Drive");
+    if (const auto* const refusal = std::get_if<Refusal>(&value))
+        return *refusal;
+    const auto drive = answered([&]() -> Answer<std::string> {
+        return std::string(std::get<sdbus::Variant>(value).get<sdbus::ObjectPath>());
     });
-    if (found.index() != 0)
-        return found;
-    return drive == "/" ? Refusal{Refusal::Kind::CannotEject, {}}
-                        : callObject(drive, "Drive", "Eject");
+    if (const auto* const refusal = std::get_if<Refusal>(&drive))
+        return *refusal;
+    const auto& path = std::get<std::string>(drive);
+    return path == "/" ? Refusal{Refusal::Kind::CannotEject, {}}
+                       : callObject(path, "Drive", "Eject");
 }
 
 void UDisks::askForFailingDrives()

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/support/udisks/Refusal.h"
+#include "pellar/process/Access.h"
 
 #include <chrono>
 #include <memory>
@@ -12,7 +13,8 @@
 
 namespace sdbus {
 class IConnection;
-}
+class Variant;
+}  // namespace sdbus
 
 namespace orvane {
 
@@ -38,6 +40,8 @@ public:
     [[nodiscard]] Answer<> eject(const std::string& node);
     /// Takes the image from a loop device.
     [[nodiscard]] Answer<> detachLoop(const std::string& node);
+    /// Makes a loop device of an open file, which is read only where the file is; its node.
+    [[nodiscard]] Answer<std::string> setUpLoop(int file, pellar::Access access);
 
     /// Asks for the self-monitoring of all drives; the answer is taken later.
     void askForFailingDrives();
@@ -46,6 +50,8 @@ public:
 
 private:
     Answer<std::string> objectOf(const std::string& node);
+    Answer<sdbus::Variant> property(const std::string& object, const char* interface,
+                                    const char* name);
     Answer<> call(const std::string& node, const char* interface, const char* method);
     Answer<> callObject(const std::string& object, const char* interface, const char* method);
 
