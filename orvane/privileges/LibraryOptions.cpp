@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/LibraryOptions.h"
 
-#include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Language.h"
 
@@ -24,7 +23,8 @@ std::vector<std::string> helperLauncher()
 
 }  // namespace
 
-pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts)
+pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
+                                      const Asking& asking)
 {
     pellar::ManagerOptions options;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
@@ -35,10 +35,11 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
     }
     const auto launcher = helperLauncher();
     if (!launcher.empty())
-        options.privileged = [launcher, &texts](const pellar::PrivilegedJob& job,
-                                                pellar::StopSwitch& stop, pellar::EventRoad& road) {
-            return std::make_unique<PrivilegedScript>(launcher, job, currentLanguage(), texts, stop,
-                                                      road);
+        options.privileged = [launcher, asking, &texts](const pellar::PrivilegedJob& job,
+                                                        pellar::StopSwitch& stop,
+                                                        pellar::EventRoad& road) {
+            return std::make_unique<PrivilegedScript>(
+                HelperLaunch{launcher, currentLanguage(), asking}, job, texts, stop, road);
         };
     return options;
 }

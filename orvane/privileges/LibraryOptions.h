@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
@@ -11,6 +12,7 @@ namespace orvane {
 /// what a repair overwrites, and how it gets at disks for which the user has no right. `texts`
 /// outlives the options.
 [[nodiscard]] pellar::ManagerOptions libraryOptions(const XDGPaths& paths,
-                                                    const pellar::Texts& texts);
+                                                    const pellar::Texts& texts,
+                                                    const Asking& asking = {});
 
 }  // namespace orvane

@@ -17,12 +17,12 @@
 
 namespace orvane {
 
-PrivilegedScript::PrivilegedScript(std::vector<std::string> launcher, pellar::PrivilegedJob job,
-                                   std::string languages, const pellar::Texts& texts,
-                                   pellar::StopSwitch& stop, pellar::EventRoad& road)
-    : launcher_(std::move(launcher)),
+PrivilegedScript::PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob job,
+                                   const pellar::Texts& texts, pellar::StopSwitch& stop,
+                                   pellar::EventRoad& road)
+    : launch_(std::move(launch)),
       job_(std::move(job)),
-      request_(requestFor(job_, std::move(languages))),
+      request_(requestFor(job_, launch_.languages)),
       texts_(texts),
       stop_(stop),
       road_(road),
@@ -32,16 +32,21 @@ PrivilegedScript::PrivilegedScript(std::vector<std::string> launcher, pellar::Pr
 
 void PrivilegedScript::run()
 {
-    std::vector<std::string> command = launcher_;
+    std::vector<std::string> command = launch_.launcher;
     for (const std::string& argument : argumentsOf(request_))
         command.push_back(argument);
     log_.trace("run: " + pellar::shown({command.front(), {command.begin() + 1, command.end()}}));
+    road_.flush();
+    isAsking_ = true;
+    if (launch_.asking.begins)
+        launch_.asking.begins();
     std::optional<int> status;
     if (auto helper = HelperProcess::start(command)) {
         follow(*helper);
         helper->closeInput();
         status = helper->reap();
     }
+    asked();
     if (!hasStarted_)
         log_.started();
     if (!hasFinished_)
@@ -91,6 +96,7 @@ void PrivilegedScript::take(pellar::Event event)
 {
     if (hasFinished_)
         return;
+    asked();
     hasStarted_ = true;
     const auto* const end = std::get_if<pellar::Finished>(&event);
     hasFinished_ = end != nullptr;
@@ -116,12 +122,19 @@ void PrivilegedScript::passStopOn(HelperProcess& helper)
         helper.closeInput();
 }
 
-// What pkexec answers for itself is told by pkexec(1), "RETURN VALUE".
+void PrivilegedScript::asked()
+{
+    if (std::exchange(isAsking_, false) && launch_.asking.ends)
+        launch_.asking.ends();
+}
+
+// A Ctrl-C at the prompt ends pkexec. What it answers for itself is told by pkexec(1), "RETURN
+// VALUE".
 void PrivilegedScript::explain(std::optional<int> status)
 {
     constexpr int dismissed = 126;
     constexpr int notAuthorized = 127;
-    if (status == dismissed)
+    if (status == dismissed || (!hasStarted_ && stop_.isPressed()))
         finish(fixwell::kPLErrorCancelled, fixwell::kPLVerdictStopped,
                "the authorisation was not given; nothing was done");
     else if (status == notAuthorized && !hasStarted_)

@@ -7,6 +7,7 @@
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Script.h"
 
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -14,14 +15,27 @@ namespace orvane {
 
 class HelperProcess;
 
+/// Told in a job's thread that the user may be asked for a password from now on, and that this is
+/// over. Either may be empty.
+struct Asking {
+    std::function<void()> begins;
+    std::function<void()> ends;
+};
+
+/// How the helper is started.
+struct HelperLaunch {
+    /// What the helper's arguments are appended to: pkexec(1) and the helper's path.
+    std::vector<std::string> launcher;
+    std::string languages;
+    Asking asking;
+};
+
 /// A job for which this user has no right to the disk: it runs in the helper, as root, when the
 /// user has shown that they may, and what it tells is told here. The references outlive it.
 class PrivilegedScript final : public pellar::Script {
 public:
-    /// `launcher` is what the helper's arguments are appended to: pkexec(1) and the helper's path.
-    PrivilegedScript(std::vector<std::string> launcher, pellar::PrivilegedJob job,
-                     std::string languages, const pellar::Texts& texts, pellar::StopSwitch& stop,
-                     pellar::EventRoad& road);
+    PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob job, const pellar::Texts& texts,
+                     pellar::StopSwitch& stop, pellar::EventRoad& road);
 
     void run() override;
 
@@ -31,9 +45,10 @@ private:
     void take(pellar::Event event);
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);
+    void asked();
     void finish(fixwell::ErrorCode error, fixwell::Name verdict, std::string_view reason);
 
-    const std::vector<std::string> launcher_;
+    const HelperLaunch launch_;
     const pellar::PrivilegedJob job_;  ///< its image stays open for the helper
     const HelperRequest request_;
     const pellar::Texts& texts_;
@@ -42,6 +57,7 @@ private:
     pellar::JobLog log_;
     std::string unfinishedLine_;
     unsigned pressesTold_ = 0;
+    bool isAsking_ = false;
     bool hasStarted_ = false;
     bool hasFinished_ = false;
 };

@@ -17,7 +17,7 @@ struct CommandText {
     const char* text;
 };
 
-constexpr std::array<CommandText, 6> commandTexts{{
+constexpr std::array<CommandText, 11> commandTexts{{
     {Command::Verify, "verify", "Look for damage; write nothing"},
     {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
     {Command::VerifyPermissions, "verify-permissions",
@@ -25,8 +25,14 @@ constexpr std::array<CommandText, 6> commandTexts{{
     {Command::RepairPermissions, "repair-permissions", "Set them right"},
     {Command::List, "list", "Show disks, their last verdict and what can be done with them"},
     {Command::History, "history", "Show what earlier checks found"},
+    {Command::Mount, "mount", "Mount volumes, where the system chooses to"},
+    {Command::Unmount, "unmount", "Unmount volumes"},
+    {Command::Eject, "eject", "Unmount all of a drive, and give the medium back"},
+    {Command::Attach, "attach", "Make image files devices of the system, and print their names"},
+    {Command::Detach, "detach", "Unmount all of an attached image, and take it off its device"},
 }};
 
+constexpr const char* imageHelp = "An image file";
 constexpr const char* diskHelp = "A device, an image file, a mount point, LABEL=… or UUID=…";
 
 constexpr const char* footer =
@@ -61,7 +67,13 @@ void addSharedOptions(CLI::App& app, Request& request)
 void addCommand(CLI::App& app, const CommandText& text, Request& request)
 {
     CLI::App& command = *app.add_subcommand(text.name, text.text);
-    CLI::Option& disks = *command.add_option("DISK", request.disks, diskHelp)->type_name("");
+    const bool takesImages = text.command == Command::Attach;
+    CLI::Option& disks = *command
+                              .add_option(takesImages ? "IMAGE" : "DISK", request.disks,
+                                          takesImages ? imageHelp : diskHelp)
+                              ->type_name("");
+    if (takesImages)
+        command.add_flag("--read-only", request.attachesReadOnly, "Let nobody write to it");
     if (text.command != Command::List)
         disks.required();
     if (text.command == Command::History)

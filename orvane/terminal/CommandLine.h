@@ -8,7 +8,19 @@
 
 namespace orvane {
 
-enum class Command { Verify, Repair, VerifyPermissions, RepairPermissions, List, History };
+enum class Command {
+    Verify,
+    Repair,
+    VerifyPermissions,
+    RepairPermissions,
+    List,
+    History,
+    Mount,
+    Unmount,
+    Eject,
+    Attach,
+    Detach
+};
 
 enum class Coloring { Auto, Always, Never };
 
@@ -16,6 +28,7 @@ enum class Coloring { Auto, Always, Never };
 struct Request {
     Command command = Command::List;
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
+    bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences

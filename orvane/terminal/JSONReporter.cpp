@@ -142,6 +142,17 @@ void JSONReporter::listed(const DiskLine& disk)
            {"actions", actions}});
 }
 
+void JSONReporter::done(const std::string& disk, std::string_view action, const std::string& place,
+                        const std::string& sentence)
+{
+    write({{"event", "done"},
+           {"disk", disk},
+           {"action", action},
+           {"place", textOrNull(place)},
+           {"message", sentence}});
+    flush();
+}
+
 void JSONReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
 {
     for (const RunLine& run : runs)

@@ -27,6 +27,8 @@ public:
     void failure(const std::string& disk, const std::string& sentence) override;
     void warning(const std::string& sentence) override;
     void listed(const DiskLine& disk) override;
+    void done(const std::string& disk, std::string_view action, const std::string& place,
+              const std::string& sentence) override;
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override;
 
 private:

@@ -61,12 +61,20 @@ public:
     virtual void finished(const std::string& disk, std::string_view verdict,
                           fixwell::ErrorCode error, std::string_view message) = 0;
     virtual void report(const std::string& disk, const fixwell::Dictionary& report) = 0;
+    /// Somebody else asks for a password on the terminal: nothing is drawn meanwhile. `Left`: it
+    /// was left with Ctrl-C, in the middle of its line.
+    enum class Prompt { Open, Left, Over };
+    virtual void prompt(Prompt /*state*/) {}
     virtual void alert(const std::string& title, const std::string& message) = 0;
     /// Something that went wrong outside of a job: one sentence.
     virtual void failure(const std::string& disk, const std::string& sentence) = 0;
     /// Something that the program goes on without, or tells about its own doing.
     virtual void warning(const std::string& sentence) = 0;
     virtual void listed(const DiskLine& disk) = 0;
+    /// Something that is no job was done: one sentence. `place` is the device or the mount point
+    /// that came of it, or empty.
+    virtual void done(const std::string& disk, std::string_view action, const std::string& place,
+                      const std::string& sentence) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
     /// The last thing that is said. NO, with a word on standard error, when some of what was said

@@ -10,6 +10,7 @@
 #include <unistd.h>
 
 #include <array>
+#include <future>
 
 namespace orvane {
 namespace {
@@ -82,12 +83,39 @@ SupportOptions Session::supportOptions(const Request& request)
 
 pellar::ManagerOptions Session::libraryOptions(const Request& request)
 {
-    pellar::ManagerOptions options = orvane::libraryOptions(userXDGPaths(), libraryTexts_);
+    pellar::ManagerOptions options =
+        orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking());
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));
         };
     return options;
+}
+
+// The job's thread waits until nothing is drawn any more, but not for long: the main thread may be
+// waiting for it.
+Asking Session::asking()
+{
+    static constexpr std::chrono::seconds longestWait{3};
+    const auto begins = [this] {
+        const auto isReady = std::make_shared<std::promise<void>>();
+        loop_.post([this, isReady] {
+            expectPassword();
+            isReady->set_value();
+        });
+        isReady->get_future().wait_for(longestWait);
+    };
+    return {begins, [this] {
+                loop_.post([this] { asked(); });
+            }};
+}
+
+void Session::expectPassword()
+{
+    logView_.flush();
+    reporter_.prompt(Reporter::Prompt::Open);
+    if (::geteuid() != 0 && (!agent_ || !agent_->isRunning()))
+        agent_ = PasswordAgent::start();
 }
 
 JobReporter::Hooks Session::jobHooks()
@@ -209,6 +237,7 @@ void Session::writeAllRowsOf(const std::string& name)
 // be stopped yet; it is as soon as it begins. Every further one presses the tool harder.
 void Session::interrupt()
 {
+    reporter_.prompt(Reporter::Prompt::Left);
     const bool isFirst = !isStopping_;
     isStopping_ = true;
     if (!isFirst)

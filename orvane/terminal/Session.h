@@ -3,11 +3,13 @@
 
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/jobs/ObservedManager.h"
+#include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/DiskNames.h"
 #include "orvane/terminal/Interrupts.h"
 #include "orvane/terminal/JobReporter.h"
+#include "orvane/terminal/PasswordAgent.h"
 #include "orvane/terminal/TerminalHost.h"
 #include "orvane/terminal/TerminalWindow.h"
 #include "pellar/Manager.h"
@@ -39,6 +41,10 @@ public:
     /// given back with `detach`.
     DiskPointer attach(const DiskPointer& image);
     void detach(const DiskPointer& topLevelDisk);
+    /// Somebody else may ask for a password from now on: nothing is drawn, and there is an agent
+    /// that can, until `asked`.
+    void expectPassword();
+    void asked() { reporter_.prompt(Reporter::Prompt::Over); }
     /// Why the library cannot treat the disk's partition map; empty when it can.
     std::string reasonAgainstPartitionMap(const DiskPointer& disk) const;
 
@@ -66,12 +72,14 @@ private:
 
     SupportOptions supportOptions(const Request& request);
     pellar::ManagerOptions libraryOptions(const Request& request);
+    Asking asking();
     JobReporter::Hooks jobHooks();
     void follow(const fixwell::DiskReferencePointer& disk);
     void interrupt();
     bool pressStop();
 
     Reporter& reporter_;
+    std::unique_ptr<PasswordAgent> agent_;
     MainLoop loop_;
     DiskNames names_;
     TerminalWindow window_;

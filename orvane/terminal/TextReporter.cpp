@@ -103,7 +103,8 @@ void TextReporter::drawProgress()
 {
     const Clock::time_point now = Clock::now();
     const bool isDue = !isProgressShown_ || now - drawn_ >= redrawInterval;
-    if (!options_.showsProgress || !isAtLineStart_ || progress_.status.empty() || !isDue)
+    if (!options_.showsProgress || isHeldBack_ || !isAtLineStart_ || progress_.status.empty() ||
+        !isDue)
         return;
     progress_.elapsed = std::chrono::duration_cast<std::chrono::seconds>(now - began_);
     const std::string line = "\r\x1b[K" + progressLine(progress_, terminalColumns());
@@ -132,6 +133,16 @@ void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verd
 }
 
 void TextReporter::report(const std::string& /*disk*/, const fixwell::Dictionary& /*report*/) {}
+
+void TextReporter::prompt(Prompt state)
+{
+    if (state == Prompt::Left && isHeldBack_ && options_.showsProgress)
+        write("\n");
+    isHeldBack_ = state == Prompt::Open;
+    hideProgress();
+    endLine();
+    flush();
+}
 
 void TextReporter::alert(const std::string& title, const std::string& message)
 {
@@ -173,6 +184,13 @@ void TextReporter::listed(const DiskLine& disk)
         write(fmt::format(
             "{}    {:<24} {}\n", indent, action.title,
             action.isAvailable ? sentence("available", {}) : fixwell::printable(action.reason)));
+}
+
+void TextReporter::done(const std::string& /*disk*/, std::string_view /*action*/,
+                        const std::string& /*place*/, const std::string& sentence)
+{
+    write(fixwell::printable(sentence) + "\n");
+    flush();
 }
 
 void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)

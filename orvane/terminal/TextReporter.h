@@ -36,10 +36,13 @@ public:
     void finished(const std::string& disk, std::string_view verdict, fixwell::ErrorCode error,
                   std::string_view message) override;
     void report(const std::string& disk, const fixwell::Dictionary& report) override;
+    void prompt(Prompt state) override;
     void alert(const std::string& title, const std::string& message) override;
     void failure(const std::string& disk, const std::string& sentence) override;
     void warning(const std::string& sentence) override;
     void listed(const DiskLine& disk) override;
+    void done(const std::string& disk, std::string_view action, const std::string& place,
+              const std::string& sentence) override;
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override;
     bool end() override;
 
@@ -60,6 +63,7 @@ private:
     Clock::time_point began_ = Clock::now();
     Clock::time_point drawn_{};
     bool isProgressShown_ = false;
+    bool isHeldBack_ = false;
     bool isAtLineStart_ = true;
     bool hasWrittenRows_ = false;
 };

@@ -16,6 +16,7 @@
 #include <cstdlib>
 #include <exception>
 #include <memory>
+#include <optional>
 
 namespace orvane {
 namespace {
@@ -50,8 +51,23 @@ std::unique_ptr<Reporter> makeReporter(const Request& request)
     return std::make_unique<TextReporter>(options);
 }
 
+/// What needs no module.
+std::optional<int> carryOutAlone(const Request& request, Session& session, Reporter& reporter)
+{
+    switch (request.command) {
+        case Command::Mount:
+        case Command::Unmount:
+        case Command::Eject:
+        case Command::Detach: return runDiskAction(request, session, reporter);
+        case Command::Attach: return runAttach(request, session, reporter);
+        default: return std::nullopt;
+    }
+}
+
 int carryOut(const Request& request, Session& session, Reporter& reporter)
 {
+    if (const auto status = carryOutAlone(request, session, reporter))
+        return *status;
     if (const auto loaded = session.loadModule(); failed(loaded)) {
         reporter.warning(failureMessage(loaded));
         return exitUnchecked;

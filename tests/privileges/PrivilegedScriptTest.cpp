@@ -29,7 +29,13 @@ protected:
         job_ = std::make_unique<pellar::Job>(
             [this, launcher, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
                 return std::make_unique<PrivilegedScript>(
-                    std::vector<std::string>{launcher.native()}, job, "", texts_, stop, road);
+                    HelperLaunch{{launcher.native()},
+                                 "",
+                                 {[this] { asking_ += "begins "; },
+                                  [this] {
+                                      asking_ += "ends ";
+                                  }}},
+                    job, texts_, stop, road);
             },
             pellar::EventReceiver{&listener_,
                                   pellar::test::reference("/dev/sdz9"),
@@ -47,6 +53,7 @@ protected:
     pellar::test::TestLoop loop_;
     pellar::test::EnglishTexts texts_;
     pellar::test::Listener listener_;
+    std::string asking_;  ///< written by the job's thread before its end is heard of
     std::unique_ptr<pellar::Job> job_;
 };
 
@@ -61,6 +68,7 @@ printf '["finished",0,0,{"dictionary":[["kPLVerdict","sound"],["kPLMessage","'"$
     EXPECT_EQ(listener_.error, 0);
     EXPECT_EQ(listener_.verdict, "sound");
     EXPECT_EQ(listener_.message, "verify /dev/sdz9");
+    EXPECT_EQ(asking_, "begins ends ");
     EXPECT_TRUE(listener_.hasPlainLine("The volume “Stick” appears to be OK.\n"));
 }
 
@@ -85,11 +93,13 @@ TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)
                   "unexpectedly"},
          }) {
         listener_ = {};
+        asking_.clear();
         launch(c.script, pellar::Operation::Repair);
         ASSERT_TRUE(finishes()) << c.script;
         EXPECT_EQ(listener_.started, 1) << c.script;
         EXPECT_EQ(listener_.error, c.error) << c.script;
         EXPECT_EQ(listener_.message, c.message);
+        EXPECT_EQ(asking_, "begins ends ");
         job_.reset();
     }
 }

@@ -27,5 +27,8 @@ std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session&
 int runAction(const Request& request, Session& session, Reporter& reporter);
 int runList(const Request& request, Session& session, Reporter& reporter);
 int runHistory(const Request& request, Session& session, Reporter& reporter);
+/// Mount, unmount, eject or detach: one disk after the other.
+int runDiskAction(const Request& request, Session& session, Reporter& reporter);
+int runAttach(const Request& request, Session& session, Reporter& reporter);
 
 }  // namespace orvane

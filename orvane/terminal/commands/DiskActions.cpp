@@ -1,0 +1,120 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "fixwell/host/foundation/UTF8.h"
+#include "orvane/support/udisks/DiskOperations.h"
+#include "orvane/support/udisks/ImageDevices.h"
+#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/terminal/ExitStatus.h"
+#include "orvane/terminal/commands/Commands.h"
+#include "pellar/volumes/DiskUse.h"
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <array>
+
+namespace orvane {
+namespace {
+
+struct ActionText {
+    Command command;
+    DiskAction action;
+    const char* name;
+    const char* done;  ///< with the disk's name and, when it was mounted, the place
+};
+
+constexpr std::array actionTexts{
+    ActionText{Command::Mount, DiskAction::Mount, "mount", "“%@” is mounted at %@."},
+    ActionText{Command::Unmount, DiskAction::Unmount, "unmount", "“%@” is not mounted any more."},
+    ActionText{Command::Eject, DiskAction::Eject, "eject", "“%@” was ejected."},
+    ActionText{Command::Detach, DiskAction::Detach, "detach", "“%@” was detached."}};
+
+const ActionText& textsOf(Command command)
+{
+    return *std::find_if(actionTexts.begin(), actionTexts.end(),
+                         [command](const ActionText& text) { return text.command == command; });
+}
+
+/// The device on which an image file is attached; any other name as it is.
+std::string deviceBehind(const std::string& name)
+{
+    struct stat status = {};
+    if (::stat(name.c_str(), &status) != 0 || !S_ISREG(status.st_mode))
+        return name;
+    const auto device = pellar::loopDeviceOn(status.st_dev, status.st_ino, pellar::SystemPaths());
+    return device.empty() ? name : device;
+}
+
+std::string placeOf(const Disk& disk)
+{
+    const auto places = placesOf(disk.facts().path);
+    return places.empty() ? std::string() : places.front().target;
+}
+
+/// What may want a password, with somebody there to ask for it.
+template <class Function>
+auto askingFor(const Function& function, Session& session)
+{
+    session.expectPassword();
+    auto answer = function();
+    session.asked();
+    return answer;
+}
+
+bool isAsWanted(const Answer<>& answer)
+{
+    const auto* const refusal = std::get_if<Refusal>(&answer);
+    return refusal == nullptr || refusal->kind == Refusal::Kind::AlreadySo;
+}
+
+int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Reporter& reporter)
+{
+    const Translator& translator = session.host().translator();
+    const DiskRequest request = requestFor(texts.action, *named.disk);
+    const auto objection = objectionTo(texts.action, *named.disk);
+    const Answer<> answer =
+        objection ? Answer<>(*objection) : askingFor([&] { return carryOut(request); }, session);
+    if (!isAsWanted(answer)) {
+        reporter.failure(named.name, failureText(request, std::get<Refusal>(answer), translator));
+        return exitUnchecked;
+    }
+    const std::string place =
+        texts.action == DiskAction::Mount ? placeOf(*named.disk) : std::string();
+    reporter.done(named.name, texts.name, place,
+                  translator.sentence(texts.done, {request.name, place}));
+    return exitSound;
+}
+
+}  // namespace
+
+int runDiskAction(const Request& request, Session& session, Reporter& reporter)
+{
+    int status = exitSound;
+    std::vector<std::string> names = request.disks;
+    if (request.command == Command::Detach)
+        std::transform(names.begin(), names.end(), names.begin(), deviceBehind);
+    for (const NamedDisk& named : findDisks(names, session, reporter, status))
+        status |= doTo(named, textsOf(request.command), session, reporter);
+    return status;
+}
+
+int runAttach(const Request& request, Session& session, Reporter& reporter)
+{
+    const auto access =
+        request.attachesReadOnly ? pellar::Access::ReadOnly : pellar::Access::ReadWrite;
+    int status = exitSound;
+    for (const std::string& name : request.disks) {
+        const auto answer = askingFor([&] { return attachImage(name, access); }, session);
+        if (const auto* const refusal = std::get_if<Refusal>(&answer)) {
+            reporter.failure(
+                name, failureText(requestToAttach(name), *refusal, session.host().translator()));
+            status |= exitUnchecked;
+            continue;
+        }
+        // The device alone, for scripts.
+        const auto& node = std::get<std::string>(answer);
+        reporter.done(name, "attach", node, node);
+    }
+    return status;
+}
+
+}  // namespace orvane
