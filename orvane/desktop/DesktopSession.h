@@ -76,7 +76,10 @@ private:
     void windowAppeared();
 
     std::vector<Menu> menus();
-    void chooseImages();
+    void chooseImages(std::string_view title,
+                      const std::function<void(const std::vector<std::string>&)>& chosen);
+    void attachAsDevices(const std::vector<std::string>& images);
+    void carryOut(std::vector<DiskRequest> requests);
     std::vector<DiskRequest> requestsFor(DiskAction action);
     bool canDo(DiskAction action);
     void doToSelection(DiskAction action);

@@ -17,7 +17,19 @@ std::vector<Menu> DesktopSession::menus()
     const MenuCommand line{};
     Menu file{
         "&File",
-        {{"openImage", "&Open Image…", QKeySequence::Open, [this] { chooseImages(); }, isUnlocked},
+        {{"openImage", "&Open Image…", QKeySequence::Open,
+          [this] {
+              chooseImages("Open Image", [this](const auto& names) { images_.open(names); });
+          },
+          isUnlocked},
+         {"attachImage",
+          "&Attach Image as Device…",
+          {},
+          [this] {
+              chooseImages("Attach Image as Device",
+                           [this](const auto& names) { attachAsDevices(names); });
+          },
+          isUnlocked},
          {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { scan_.start(); }, isUnlocked},
          diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
          diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U),
@@ -66,20 +78,21 @@ std::vector<Menu> DesktopSession::menus()
     return {file, edit, view, help};
 }
 
-void DesktopSession::chooseImages()
+void DesktopSession::chooseImages(
+    std::string_view title, const std::function<void(const std::vector<std::string>&)>& chosen)
 {
-    auto* const dialog = new QFileDialog(&window_, toQt(text("Open Image")));
+    auto* const dialog = new QFileDialog(&window_, toQt(text(title)));
     dialog->setAttribute(Qt::WA_DeleteOnClose);
     dialog->setFileMode(QFileDialog::ExistingFiles);
     dialog->setNameFilters(
         {toQt(text("Disk images")) + QStringLiteral(" (*.img *.raw *.iso *.bin)"),
          toQt(text("All files")) + QStringLiteral(" (*)")});
     QObject::connect(dialog, &QFileDialog::filesSelected, &window_,
-                     [this](const QStringList& files) {
+                     [chosen](const QStringList& files) {
                          std::vector<std::string> names;
                          for (const QString& file : files)
                              names.push_back(QFile::encodeName(file).toStdString());
-                         images_.open(names);
+                         chosen(names);
                      });
     dialog->open();
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// How the selected disks are mounted, unmounted and ejected.
+// How the selected disks are mounted, unmounted and ejected, and images attached.
 
 #include "orvane/desktop/DesktopSession.h"
 
@@ -31,15 +31,28 @@ bool DesktopSession::canDo(DiskAction action)
 }
 
 // The list follows by itself; read anew all the same, for where the system cannot be watched.
+void DesktopSession::carryOut(std::vector<DiskRequest> requests)
+{
+    host_.diskOperations().start(std::move(requests),
+                                 [this](const std::vector<std::string>& failures) {
+                                     showFailures(failures);
+                                     if (options_.scansSystemDisks)
+                                         scan_.start();
+                                 });
+}
+
+void DesktopSession::attachAsDevices(const std::vector<std::string>& images)
+{
+    std::vector<DiskRequest> requests;
+    for (const std::string& image : images)
+        requests.push_back(requestToAttach(image));
+    carryOut(std::move(requests));
+}
+
 void DesktopSession::doToSelection(DiskAction action)
 {
     if (auto requests = requestsFor(action); !requests.empty())
-        host_.diskOperations().start(std::move(requests),
-                                     [this](const std::vector<std::string>& failures) {
-                                         showFailures(failures);
-                                         if (options_.scansSystemDisks)
-                                             scan_.start();
-                                     });
+        carryOut(std::move(requests));
     if (action == DiskAction::Eject)
         for (const auto& disk : window_.disks().selectedDisks())
             images_.eject(*disk);
