@@ -31,6 +31,7 @@ struct Request {
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
+    bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;
     bool confirms = false;  ///< answers the startup-disk warning
