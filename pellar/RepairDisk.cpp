@@ -139,8 +139,11 @@ bool RepairDisk::beginPrivileged(Subject subject, const DiskReferencePointer& di
 {
     if (!options_.privileged || !needsPrivileges(subject, *disk, operation, options_.systemPaths))
         return false;
-    start(disk, [subject, disk, operation, this](StopSwitch& stop, EventRoad& road) {
-        return options_.privileged({subject, operation, *disk, nullptr}, stop, road);
+    const auto& isAllowed = options_.archiveFetching.isAllowed;
+    const bool fetches = subject == Subject::Permissions && isAllowed && isAllowed();
+    const PrivilegedJob job{subject, operation, *disk, nullptr, fetches};
+    start(disk, [job, this](StopSwitch& stop, EventRoad& road) {
+        return options_.privileged(job, stop, road);
     });
     return true;
 }

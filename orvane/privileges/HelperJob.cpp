@@ -78,6 +78,9 @@ private:
         pellar::ManagerOptions options;
         options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
+        options.archiveFetching.isAllowed = [this] {
+            return request_.fetchesArchives;
+        };
         options.commandTrace = [this](std::string_view line) {
             teller_.trace(line);
         };

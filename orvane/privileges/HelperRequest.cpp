@@ -33,6 +33,9 @@ constexpr std::array tasks{Task{"verify", Subject::Filesystem, Operation::Verify
 // attach OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
 constexpr std::string_view attaching = "attach";
 
+// Comes last, for permissions.
+constexpr std::string_view fetching = "--fetch-archives";
+
 constexpr std::size_t longestName = 1024;
 
 const Task* taskNamed(std::string_view word)
@@ -107,7 +110,7 @@ Read readRegion(Arguments arguments)
     const auto length = numberIn(arguments[4], largest);
     if (!image || !offset || !length || *length == 0 || *length > largest - *offset)
         return "no region of a file";
-    HelperRequest request{task->subject, task->operation, {}, static_cast<int>(*image), {}};
+    HelperRequest request{task->subject, task->operation, {}, static_cast<int>(*image), {}, false};
     request.disk.storage = fixwell::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
@@ -118,7 +121,8 @@ Read readRegion(Arguments arguments)
 
 HelperRequest requestFor(const pellar::PrivilegedJob& job, std::string languages)
 {
-    HelperRequest request{job.subject, job.operation, job.disk, -1, std::move(languages)};
+    HelperRequest request{job.subject, job.operation,        job.disk,
+                          -1,          std::move(languages), job.fetchesArchives};
     if (!job.image)
         return request;
     request.image = job.image->descriptor();
@@ -142,6 +146,8 @@ std::vector<std::string> argumentsOf(const HelperRequest& request)
          {disk.identifier.substr(0, longestName), disk.name.substr(0, longestName), disk.filesystem,
           request.languages})
         arguments.push_back(text);
+    if (request.fetchesArchives)
+        arguments.emplace_back(fetching);
     return arguments;
 }
 
@@ -157,10 +163,14 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
         return "unknown operation";
     if (!isCanonicalDevice(arguments[1]) || !isBlockDevice(arguments[1]))
         return "not a block device below /dev";
-    HelperRequest request{task->subject, task->operation, {}, -1, {}};
+    HelperRequest request{task->subject, task->operation, {}, -1, {}, false};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
-    return withTexts(std::move(request), Arguments(arguments).subspan(2));
+    Arguments texts = Arguments(arguments).subspan(2);
+    request.fetchesArchives =
+        task->subject == Subject::Permissions && !texts.empty() && texts.back() == fetching;
+    return withTexts(std::move(request),
+                     texts.first(texts.size() - (request.fetchesArchives ? 1 : 0)));
 }
 
 }  // namespace orvane

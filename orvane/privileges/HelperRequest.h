@@ -19,6 +19,8 @@ struct HelperRequest {
     fixwell::DiskReference disk;
     int image = -1;         ///< the image's descriptor in the program that asks; -1 for a device
     std::string languages;  ///< for the texts; empty for English
+    /// Archives of packages may be fetched over the network; for permissions alone.
+    bool fetchesArchives = false;
 
     bool isOnImage() const { return image >= 0; }
 
@@ -28,7 +30,8 @@ struct HelperRequest {
                a.disk.path == b.disk.path && a.disk.offset == b.disk.offset &&
                a.disk.length == b.disk.length && a.disk.identifier == b.disk.identifier &&
                a.disk.name == b.disk.name && a.disk.filesystem == b.disk.filesystem &&
-               a.disk.isWhole == b.disk.isWhole && a.languages == b.languages;
+               a.disk.isWhole == b.disk.isWhole && a.languages == b.languages &&
+               a.fetchesArchives == b.fetchesArchives;
     }
 };
 

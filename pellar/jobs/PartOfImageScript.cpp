@@ -39,7 +39,7 @@ bool PartOfImageScript::needsDevice() const
 
 std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()
 {
-    PrivilegedJob job{Subject::Filesystem, request_.operation, *request_.disk, nullptr};
+    PrivilegedJob job{Subject::Filesystem, request_.operation, *request_.disk, nullptr, false};
     job.image = std::make_shared<const DiskClaim>(*std::exchange(request_.claim, std::nullopt));
     return options_.privileged(job, stop_, road_);
 }

@@ -23,6 +23,8 @@ struct PrivilegedJob {
     /// The image file of which the disk is a part, as this user has opened it: whoever does the
     /// job may do no more with it. None for a block device.
     std::shared_ptr<const DiskClaim> image;
+    /// The user agrees that archives of packages are fetched (ManagerOptions::archiveFetching).
+    bool fetchesArchives = false;
 };
 
 /// Makes the script of such a job; empty where there is no way to get the right. Any thread.

@@ -35,6 +35,8 @@ HelperRequest request(Subject subject, Operation operation)
 TEST(HelperRequest, ArrivesAsItWasMade)
 {
     std::vector<HelperRequest> requests{request(Subject::Permissions, Operation::Repair)};
+    requests.push_back(requests.back());
+    requests.back().fetchesArchives = true;
     for (const Operation operation : {Operation::Verify, Operation::Repair}) {
         requests.push_back(request(Subject::Filesystem, operation));
         requests.push_back(request(Subject::PartitionMap, operation));

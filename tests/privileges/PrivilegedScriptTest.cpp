@@ -19,7 +19,7 @@ protected:
     void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
     {
         launch(script, {pellar::Subject::Filesystem, operation,
-                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr});
+                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr, false});
     }
     void launch(const std::string& script, const pellar::PrivilegedJob& job)
     {
