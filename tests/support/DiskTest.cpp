@@ -116,6 +116,25 @@ TEST(DiskController, APartitionThatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
     EXPECT_NE(host.controller.diskNamed("sda2"), nullptr);
 }
 
+TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)
+{
+    Host host;
+    std::string mounted;
+    host.controller.hooks().mount = [&mounted](const Disk& disk) -> Outcome<> {
+        mounted += disk.diskIdentifier() + " ";
+        return Done{};
+    };
+    DiskTree busy = tree("sda2");
+    busy.facts.mountPoint = "/mnt";
+    host.controller.synchronize({tree("sda", {tree("sda1"), busy})});
+    const auto whole = host.controller.diskNamed("sda");
+    host.controller.hold({whole});
+    host.controller.synchronize({tree("sda", {tree("sda1"), tree("sda2")})});
+    host.controller.release();
+    host.controller.mountDisk(whole, true, false);
+    EXPECT_EQ(mounted, "sda2 ");
+}
+
 TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
 {
     const auto record = [](int number) {

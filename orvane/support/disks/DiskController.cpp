@@ -156,6 +156,16 @@ void DiskController::forget(const std::shared_ptr<Disk>& root)
     tellGone(root);
 }
 
+void DiskController::hold(std::vector<std::shared_ptr<Disk>> disks)
+{
+    held_ = std::move(disks);
+    mountedWhenHeld_.clear();
+    for (const auto& disk : held_)
+        for (const auto& part : withParts(disk))
+            if (part->isMounted())
+                mountedWhenHeld_.insert(part->facts().identifier);
+}
+
 bool DiskController::release()
 {
     held_.clear();
@@ -310,7 +320,7 @@ void DiskController::mountDisk(const OVDiskPointer& disk, bool includeChildren,
     if (!top || !hooks_.mount)
         return;
     for (const auto& part : includeChildren ? withParts(top) : std::vector{top})
-        if (isVolume(*part) && !isOfImage(*part) && !part->isMounted())
+        if (mountedWhenHeld_.contains(part->facts().identifier) && !part->isMounted())
             warn(hooks_.mount(*part));
 }
 

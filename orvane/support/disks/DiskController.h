@@ -7,6 +7,8 @@
 
 #include <functional>
 #include <memory>
+#include <set>
+#include <string>
 #include <string_view>
 #include <vector>
 
@@ -48,7 +50,7 @@ public:
 
     /// A job works on these disks. Should one of them go, that is told, but it keeps its place
     /// until `release`, and no other disk gets its name.
-    void hold(std::vector<std::shared_ptr<Disk>> disks) { held_ = std::move(disks); }
+    void hold(std::vector<std::shared_ptr<Disk>> disks);
     /// Forgets, without a further word, what has gone while it was held; NO when nothing has.
     bool release();
 
@@ -58,6 +60,8 @@ public:
     /// The main thread sees an attached image here first, so an unknown disk is adopted.
     std::vector<fixwell::OVDiskPointer> viewablePartitions(
         const fixwell::OVDiskPointer& disk) override;
+    /// A module asks for this after every job that failed. Only what was mounted when the disks
+    /// were last held is: a volume that was at rest, and is perhaps damaged, stays so.
     void mountDisk(const fixwell::OVDiskPointer& disk, bool includeChildren,
                    bool synchronous) override;
     void ejectDisk(const fixwell::OVDiskPointer& disk, bool synchronous) override;
@@ -84,6 +88,7 @@ private:
     Hooks hooks_;
     std::vector<std::shared_ptr<Disk>> roots_;
     std::vector<std::shared_ptr<Disk>> held_;
+    std::set<std::string> mountedWhenHeld_;  ///< their identifiers
 
     // The disk of the job at hand: the library asks for it with every line of output.
     std::shared_ptr<Disk> asked_;

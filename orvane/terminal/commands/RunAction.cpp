@@ -70,8 +70,11 @@ int treat(const std::vector<NamedDisk>& wanted, const ActionButton& action, Sess
     const std::vector<NamedDisk> disks = usableDisks(wanted, action, session, reporter, status);
     if (disks.empty())
         return status;
-    session.select(selectionOf(disks));
+    const auto selection = selectionOf(disks);
+    session.select(selection);
+    session.host().sharedDiskController().hold(selection);
     session.pressAndWait(session.button(action.outlet));
+    session.host().sharedDiskController().release();
     for (const NamedDisk& named : disks)
         status |= settle(named, session, reporter);
     return status;
