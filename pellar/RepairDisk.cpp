@@ -125,11 +125,14 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     if (beginPrivileged(Subject::Filesystem, disk, operation))
         return fixwell::kPLNoError;
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
-    auto claim = DiskClaim::take(*disk, access, options_.systemPaths);
+    auto claim = DiskClaim::attempt(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
-    startVolume(
-        {disk, operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(disk->filesystem)});
+    JobRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
+    // Nobody waits on the main thread: a device that is locked is claimed by the job.
+    if (auto* const taken = std::get_if<DiskClaim>(&claim))
+        request.claim.emplace(std::move(*taken));
+    startVolume(std::move(request));
     return fixwell::kPLNoError;
 }
 

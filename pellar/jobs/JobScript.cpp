@@ -73,17 +73,28 @@ std::optional<Outcome> JobScript::takeDisk()
 {
     if (claim_)
         return std::nullopt;
+    if (!mounts_.empty())
+        if (const auto refusal = unmount())
+            return refusal;
+    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    auto claim = DiskClaim::take(*disk_, access, options_.systemPaths);
+    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
+        return failure(*error, {unmounted_ ? "it was unmounted, but could not be opened"
+                                           : "another program has it to itself",
+                                {},
+                                {}});
+    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
+    return std::nullopt;
+}
+
+std::optional<Outcome> JobScript::unmount()
+{
     log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
     road_.flush();  // what is still to be written may take long
     auto unmounted = UnmountedDisk::take(std::move(mounts_), options_.systemPaths);
     if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
         return failure(fixwell::kPLErrorCouldNotUnmount, *refusal);
     unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
-    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
-    auto claim = DiskClaim::take(*disk_, access, options_.systemPaths);
-    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
-        return failure(*error, {"it was unmounted, but could not be opened", {}, {}});
-    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
     return std::nullopt;
 }
 

@@ -19,7 +19,7 @@ namespace pellar {
 struct JobRequest {
     fixwell::DiskReferencePointer disk;
     Operation operation = Operation::Verify;
-    std::optional<DiskClaim> claim;  ///< none: the job unmounts the disk and claims it itself
+    std::optional<DiskClaim> claim;  ///< none: the job claims the disk itself, unmounted before
     std::vector<MountPlace> mounts;  ///< where it is mounted, when there is no claim
     const Tool* tool = nullptr;      ///< null: the kind of the volume is still to be found out
 };
@@ -55,6 +55,7 @@ private:
     State end(Outcome outcome);
 
     std::optional<Outcome> takeDisk();
+    std::optional<Outcome> unmount();
     void giveDiskBack();
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;

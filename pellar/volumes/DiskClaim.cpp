@@ -57,29 +57,12 @@ ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status
     return isHeldByKernel(disk) ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
 }
 
-/// The device manager locks a device while it looks at it, as it does after each unmounting
-/// (systemd, "Locking Block Device Access"): a moment that is waited for. A file is nobody's to
-/// look at.
-bool lock(int descriptor, int kind, bool isDevice)
+/// NO when somebody else has it. Some network file systems know no locks; that is no reason to
+/// leave a disk unchecked.
+bool lock(int descriptor, Access access)
 {
-    const int attempts = isDevice ? 50 : 1;
-    for (int i = 0; i < attempts; ++i) {
-        if (i > 0)
-            std::this_thread::sleep_for(20ms);
-        if (::flock(descriptor, kind | LOCK_NB) == 0)
-            return true;
-        if (errno != EWOULDBLOCK)
-            return false;
-    }
-    return false;
-}
-
-ErrorCode lockError(int descriptor, Access access, bool isDevice)
-{
-    if (lock(descriptor, access == Access::ReadOnly ? LOCK_SH : LOCK_EX, isDevice))
-        return fixwell::kPLNoError;
-    // Some network file systems know no locks; that is no reason to leave a disk unchecked.
-    return errno == EWOULDBLOCK ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
+    const int kind = access == Access::ReadOnly ? LOCK_SH : LOCK_EX;
+    return ::flock(descriptor, kind | LOCK_NB) == 0 || errno != EWOULDBLOCK;
 }
 
 /// Bytes, of a device as well: its end can be sought, its st_size is 0.
@@ -91,8 +74,8 @@ std::uint64_t sizeOf(int descriptor)
 
 }  // namespace
 
-std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference& disk,
-                                                   Access access, const SystemPaths& paths)
+std::variant<DiskClaim, ErrorCode, DiskClaim::Locked> DiskClaim::attempt(
+    const fixwell::DiskReference& disk, Access access, const SystemPaths& paths)
 {
     FileDescriptor opened = openDisk(disk, access == Access::ReadOnly ? O_RDONLY : O_RDWR);
     if (!opened)
@@ -102,12 +85,30 @@ std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference&
         return fixwell::kPLErrorCannotOpen;
     if (const ErrorCode error = useError(disk, status, paths))
         return error;
-    if (const ErrorCode error = lockError(opened.get(), access, S_ISBLK(status.st_mode)))
-        return error;
+    if (!lock(opened.get(), access)) {
+        if (S_ISBLK(status.st_mode))
+            return Locked{};
+        return fixwell::kPLErrorDiskInUse;
+    }
     // Whoever attaches an image holds the lock until it is attached, which may just have been.
     if (const ErrorCode error = useError(disk, status, paths))
         return error;
     return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
+}
+
+std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference& disk,
+                                                   Access access, const SystemPaths& paths)
+{
+    constexpr int attempts = 50;
+    for (int i = 0; i < attempts; ++i) {
+        auto claim = attempt(disk, access, paths);
+        if (auto* const taken = std::get_if<DiskClaim>(&claim))
+            return std::move(*taken);
+        if (const auto* const error = std::get_if<ErrorCode>(&claim))
+            return *error;
+        std::this_thread::sleep_for(20ms);
+    }
+    return fixwell::kPLErrorDiskInUse;
 }
 
 DiskClaim::DiskClaim(FileDescriptor disk, std::filesystem::path path, std::uint64_t offset,

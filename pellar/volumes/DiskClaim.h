@@ -18,9 +18,16 @@ namespace pellar {
 /// descriptor, so it is the same disk to the end whatever happens to its name.
 class DiskClaim {
 public:
+    /// A device that somebody has locked, perhaps only for a moment: the device manager does while
+    /// it looks at one, as it does after each unmounting (systemd, "Locking Block Device Access").
+    struct Locked {};
+
     /// An error code when the disk is in use (kPLErrorCouldNotUnmount: mounted;
-    /// kPLErrorDiskInUse: locked, held by the kernel, or attached as a loop device), when it
-    /// cannot be opened, or is no disk at all.
+    /// kPLErrorDiskInUse: held by the kernel, or an image that is locked or attached as a loop
+    /// device), when it cannot be opened, or is no disk at all. Does not wait.
+    [[nodiscard]] static std::variant<DiskClaim, fixwell::ErrorCode, Locked> attempt(
+        const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
+    /// The same; a locked device is waited for, a second at most, and is then in use.
     [[nodiscard]] static std::variant<DiskClaim, fixwell::ErrorCode> take(
         const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
 

@@ -3,8 +3,10 @@
 
 #include "pellar/volumes/DiskUse.h"
 #include "tests/pellar/Workshop.h"
+#include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/sysmacros.h>
 
@@ -58,6 +60,30 @@ TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
     EXPECT_EQ(claimError(workshop.path("disk"), Access::ReadOnly, paths),
               fixwell::kPLErrorDiskInUse);
     EXPECT_EQ(claimError(workshop.path("other"), Access::ReadOnly, paths), fixwell::kPLNoError);
+}
+
+// The device manager locks a device while it looks at it, and the main thread waits for nobody.
+TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
+{
+    if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const test::Workshop workshop;
+    const orvane::test::LoopDevice device(workshop.makeExt("disk", 16U << 20U));
+    if (device.name().empty())
+        GTEST_SKIP() << "the system gives no loop device";
+    const auto disk = test::reference(device.name());
+    const FileDescriptor other(::open(device.name().c_str(), O_RDONLY | O_CLOEXEC));
+    for (const bool isLetGo : {true, false}) {
+        ASSERT_EQ(::flock(other.get(), LOCK_EX), 0);
+        test::Bench bench;
+        const auto begun = bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
+        EXPECT_EQ(begun, fixwell::kPLNoError);
+        EXPECT_EQ(DiskClaim::attempt(*disk, Access::ReadOnly, {}).index(), 2U) << "locked still";
+        if (isLetGo)
+            ::flock(other.get(), LOCK_UN);
+        bench.finish(begun);
+        EXPECT_EQ(bench.listener.error, isLetGo ? fixwell::kPLNoError : fixwell::kPLErrorDiskInUse);
+    }
 }
 
 TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
