@@ -56,15 +56,22 @@ private:
     std::optional<Undone> prepare(std::optional<uid_t> user)
     {
         disk_ = request_.disk;
-        if (request_.subject == Subject::Permissions) {
-            const auto place = mountedSystemOn(disk_.path);
-            if (const auto* const reason = std::get_if<pellar::Sentence>(&place))
-                return Undone{fixwell::kPLErrorUnsupported, fixwell::kPLVerdictFailed, *reason};
-            disk_.mountPoint = std::get<std::string>(place);
-            return std::nullopt;
-        }
-        if (!request_.isOnImage())
-            return std::nullopt;
+        if (request_.subject == Subject::Permissions)
+            return findSystem();
+        return request_.isOnImage() ? attach(user) : std::nullopt;
+    }
+
+    std::optional<Undone> findSystem()
+    {
+        const auto place = mountedSystemOn(disk_.path);
+        if (const auto* const reason = std::get_if<pellar::Sentence>(&place))
+            return Undone{fixwell::kPLErrorUnsupported, fixwell::kPLVerdictFailed, *reason};
+        disk_.mountPoint = std::get<std::string>(place);
+        return std::nullopt;
+    }
+
+    std::optional<Undone> attach(std::optional<uid_t> user)
+    {
         auto region = attachedRegion(request_, user);
         if (auto* const undone = std::get_if<Undone>(&region))
             return std::move(*undone);
