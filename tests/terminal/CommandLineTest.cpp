@@ -37,14 +37,18 @@ TEST(CommandLine, EachCommandIsItself)
         Command command;
         std::size_t disks;
     };
-    for (const Case& c : {Case{{"verify", "a"}, Command::Verify, 1},
-                          Case{{"verify", "a", "b", "c"}, Command::Verify, 3},
-                          Case{{"verify", "--", "--json"}, Command::Verify, 1},
-                          Case{{"repair", "a"}, Command::Repair, 1},
-                          Case{{"verify-permissions", "/"}, Command::VerifyPermissions, 1},
-                          Case{{"repair-permissions", "/"}, Command::RepairPermissions, 1},
-                          Case{{"list"}, Command::List, 0}, Case{{"list", "a"}, Command::List, 1},
-                          Case{{"history", "a"}, Command::History, 1}}) {
+    for (const Case& c :
+         {Case{{"verify", "a"}, Command::Verify, 1},
+          Case{{"verify", "a", "b", "c"}, Command::Verify, 3},
+          Case{{"verify", "--", "--json"}, Command::Verify, 1},
+          Case{{"repair", "a"}, Command::Repair, 1},
+          Case{{"verify-permissions", "/"}, Command::VerifyPermissions, 1},
+          Case{{"repair-permissions", "/"}, Command::RepairPermissions, 1},
+          Case{{"list"}, Command::List, 0}, Case{{"list", "a"}, Command::List, 1},
+          Case{{"history", "a"}, Command::History, 1}, Case{{"mount", "a", "b"}, Command::Mount, 2},
+          Case{{"unmount", "a"}, Command::Unmount, 1}, Case{{"eject", "a"}, Command::Eject, 1},
+          Case{{"attach", "--read-only", "a"}, Command::Attach, 1},
+          Case{{"detach", "a"}, Command::Detach, 1}}) {
         const auto read = readWords(c.words);
         ASSERT_TRUE(std::holds_alternative<Request>(read)) << c.words.front();
         EXPECT_EQ(std::get<Request>(read).command, c.command) << c.words.front();
@@ -59,12 +63,14 @@ TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsage)
         std::vector<const char*> words;
         std::string_view because;
     };
-    for (const Case& c : {Case{{}, "no command"}, Case{{"check", "a"}, "no such command"},
-                          Case{{"verify"}, "what?"}, Case{{"history", "--clear"}, "whose?"},
-                          Case{{"verify", "--clear", "a"}, "only a history is cleared"},
-                          Case{{"verify", "--colour=never", "a"}, "no such option"},
-                          Case{{"verify", "--log-level=loud", "a"}, "no number"},
-                          Case{{"verify", "--log-level=-1", "a"}, "out of range"}}) {
+    for (const Case& c :
+         {Case{{}, "no command"}, Case{{"check", "a"}, "no such command"},
+          Case{{"verify"}, "what?"}, Case{{"history", "--clear"}, "whose?"},
+          Case{{"verify", "--clear", "a"}, "only a history is cleared"}, Case{{"attach"}, "what?"},
+          Case{{"mount", "--read-only", "a"}, "only an image is attached so"},
+          Case{{"verify", "--colour=never", "a"}, "no such option"},
+          Case{{"verify", "--log-level=loud", "a"}, "no number"},
+          Case{{"verify", "--log-level=-1", "a"}, "out of range"}}) {
         const auto read = readWords(c.words);
         ASSERT_TRUE(std::holds_alternative<Ending>(read)) << c.because;
         EXPECT_EQ(std::get<Ending>(read).status, 16) << c.because;
