@@ -136,7 +136,9 @@ void LiveScript::tellFindings(const Judgement& judgement)
 {
     for (const Sentence& finding : scrubFindings(report_))
         log_.error(finding);
-    if (report_.withoutChecksum > 0)
+    const bool hasReadAll =
+        judgement.verdict == Verdict::Sound || judgement.verdict == Verdict::Damaged;
+    if (hasReadAll && report_.withoutChecksum > 0)
         log_.remark(log_.text({"Blocks of files that have no checksum to be compared with: %1$@",
                                std::to_string(report_.withoutChecksum),
                                {}}));
