@@ -19,6 +19,16 @@ class EventRoad;
 class Script;
 class StopSwitch;
 
+/// Whether the archives of packages of the running system are fetched over the network, where
+/// nothing else says what permissions their files have.
+struct ArchiveFetching {
+    /// The user agrees. Asked as a job on permissions begins, on the main thread; never when empty.
+    std::function<bool()> isAllowed;
+    /// A sentence that says how to allow it, in the user's language; told where archives were
+    /// missing.
+    std::string howToAllow;
+};
+
 struct ManagerOptions {
     /// Where tools are looked for: absolute directories, the first that has the tool wins.
     std::string toolPath = "/usr/sbin:/usr/bin:/sbin:/bin";
@@ -38,9 +48,7 @@ struct ManagerOptions {
     /// verification of permissions needs no archive; absolute, made when it is needed, of no use
     /// when others can write to it. Empty: nothing is kept.
     std::filesystem::path permissionReferences;
-    /// The user has agreed that the archives of packages of the running system are fetched over
-    /// the network, where nothing else says what permissions their files have.
-    bool fetchesMissingArchives = false;
+    ArchiveFetching archiveFetching;
     /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;

@@ -91,10 +91,14 @@ SupportOptions DesktopSession::supportOptions()
     return options;
 }
 
-pellar::ManagerOptions DesktopSession::libraryOptions() const
+pellar::ManagerOptions DesktopSession::libraryOptions()
 {
     pellar::ManagerOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
     options.outputLimits = options_.outputLimits;
+    options.archiveFetching = {[this] { return fetchesArchives(); },
+                               libraryTexts_.text("The archives of these packages are downloaded "
+                                                  "when “Download Package Archives” is switched "
+                                                  "on in the Edit menu.")};
     return options;
 }
 

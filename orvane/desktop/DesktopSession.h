@@ -59,7 +59,7 @@ public:
 
 private:
     SupportOptions supportOptions();
-    pellar::ManagerOptions libraryOptions() const;
+    pellar::ManagerOptions libraryOptions();
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
     void observeDisks();
     void watchSystemDisks();
@@ -87,6 +87,8 @@ private:
     void completeLog();
     std::string selectionHTML();
     bool canEdit(fixwell::Selector action);
+    bool fetchesArchives();
+    void switchArchiveFetching();
     bool isInDiskList() const;
     void selectAll();
     QtButton* detailsButton();

@@ -8,6 +8,11 @@
 #include <QFileDialog>
 
 namespace orvane::desktop {
+namespace {
+
+constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
+
+}  // namespace
 
 std::vector<Menu> DesktopSession::menus()
 {
@@ -52,6 +57,15 @@ std::vector<Menu> DesktopSession::menus()
                 [this] { log()->delete_(&window_); },
                 [this] {
                     return canEdit("delete:");
+                }},
+               line,
+               {"fetchArchives",
+                "Download &Package Archives",
+                {},
+                [this] { switchArchiveFetching(); },
+                {},
+                [this] {
+                    return fetchesArchives();
                 }}}};
     Menu view{"&View",
               {{"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
@@ -113,6 +127,16 @@ std::string DesktopSession::selectionHTML()
 bool DesktopSession::canEdit(fixwell::Selector action)
 {
     return log() != nullptr && log()->validateMenuItem({action});
+}
+
+bool DesktopSession::fetchesArchives()
+{
+    return host_.standardUserDefaults().objectForKey(fetchesArchivesKey).boolean();
+}
+
+void DesktopSession::switchArchiveFetching()
+{
+    host_.standardUserDefaults().setObjectForKey(!fetchesArchives(), fetchesArchivesKey);
 }
 
 // The list and the log both have rows; the one that the user is in is meant. Asked of the window,

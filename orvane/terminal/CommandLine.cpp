@@ -69,6 +69,10 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
     if (text.command == Command::Verify || text.command == Command::Repair)
         command.add_flag("--partition-map", request.treatsPartitionMap,
                          "Treat the disk's partition map (GPT or MBR) instead of its volumes");
+    if (text.command == Command::VerifyPermissions || text.command == Command::RepairPermissions)
+        command.add_flag("--fetch-archives", request.fetchesArchives,
+                         "Fetch package archives over the network (with apt) where nothing here "
+                         "says what permissions their files have");
     command.callback([&request, chosen = text.command] { request.command = chosen; });
     command.fallthrough();
 }

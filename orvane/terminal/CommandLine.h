@@ -18,6 +18,7 @@ struct Request {
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
     bool clearsHistory = false;
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
+    bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;
     bool confirms = false;  ///< answers the startup-disk warning

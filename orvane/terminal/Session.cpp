@@ -84,6 +84,9 @@ SupportOptions Session::supportOptions(const Request& request)
 pellar::ManagerOptions Session::libraryOptions(const Request& request)
 {
     pellar::ManagerOptions options = orvane::libraryOptions(userXDGPaths(), libraryTexts_);
+    options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },
+                               libraryTexts_.text("With --fetch-archives the archives of these "
+                                                  "packages are fetched over the network.")};
     if (request.tracesCommands)
         options.commandTrace = [this](std::string_view line) {
             reporter_.warning(std::string(line));

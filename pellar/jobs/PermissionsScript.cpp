@@ -5,6 +5,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/permissions/InstalledReferences.h"
+#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PermissionErrorCodes.h"
 #include "pellar/permissions/PermissionsOutcome.h"
 #include "pellar/permissions/Restoring.h"
@@ -31,6 +32,7 @@ PermissionsScript::PermissionsScript(fixwell::DiskReferencePointer disk, Operati
     : disk_(std::move(disk)),
       operation_(operation),
       options_(options),
+      fetchesArchives_(options.archiveFetching.isAllowed && options.archiveFetching.isAllowed()),
       texts_(texts),
       stop_(stop),
       road_(road),
@@ -87,12 +89,12 @@ Outcome PermissionsScript::treat(const RootDirectory& root, const References& re
 std::variant<References, Sentence> PermissionsScript::readReferences(const RootDirectory& root)
 {
     log_.meter().setRange(databaseIsRead, databaseWasRead);
-    const ReferenceSources sources{disk_->mountPoint, options_.permissionReferences,
-                                   options_.toolPath, options_.outputLimits,
-                                   [this](std::string line) {
-                                       log_.trace(std::move(line));
-                                   },
-                                   options_.fetchesMissingArchives};
+    const ReferenceSources sources{disk_->mountPoint,
+                                   options_.permissionReferences,
+                                   options_.toolPath,
+                                   options_.outputLimits,
+                                   [this](std::string line) { log_.trace(std::move(line)); },
+                                   fetchesArchives_};
     return readInstalledReferences(root, accounts_, sources, stop_, [this](double percent) {
         log_.progress(percent);
         road_.flushIfDue();
@@ -210,12 +212,23 @@ void PermissionsScript::tell(const Tally& tally)
 {
     for (const Sentence& sentence : sentencesOf(tally))
         log_.remark(log_.text(sentence));
+    tellWhatIsMissing(tally);
     if (tally.missing > 0)
         log_.detail(
             log_.text(Sentence{"%1$@ files are not there.", std::to_string(tally.missing), {}}));
     if (restored_ > 0)
         log_.remark(
             log_.text(Sentence{"%1$@ files were set right.", std::to_string(restored_), {}}));
+}
+
+// Only the running system's apt knows where archives come from.
+void PermissionsScript::tellWhatIsMissing(const Tally& tally)
+{
+    const bool canBeFetched =
+        disk_->mountPoint == "/" && installedSystemAt("/") == PackageDatabase::Dpkg;
+    if (tally.withoutSource > 0 && canBeFetched && !fetchesArchives_ &&
+        !options_.archiveFetching.howToAllow.empty())
+        log_.remark(options_.archiveFetching.howToAllow);
 }
 
 void PermissionsScript::step(std::string_view key)

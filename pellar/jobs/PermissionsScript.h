@@ -21,6 +21,7 @@ namespace pellar {
 /// counted and never changed. The references outlive it.
 class PermissionsScript final : public Script {
 public:
+    /// Main thread.
     PermissionsScript(fixwell::DiskReferencePointer disk, Operation operation,
                       const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                       EventRoad& road);
@@ -40,12 +41,14 @@ private:
     void repair(const RootDirectory& root, const Reference& reference, const FoundFile& file);
     void tellDatabaseIsRead();
     void tell(const Tally& tally);
+    void tellWhatIsMissing(const Tally& tally);
     void step(std::string_view key);
     void report(const Outcome& outcome);
 
     const fixwell::DiskReferencePointer disk_;
     const Operation operation_;
     const ManagerOptions& options_;
+    const bool fetchesArchives_;
     const Texts& texts_;
     StopSwitch& stop_;
     EventRoad& road_;

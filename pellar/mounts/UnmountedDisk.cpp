@@ -61,24 +61,6 @@ int unmount(const MountPlace& place)
     return error;
 }
 
-int mount(const MountPlace& place, const std::string& source)
-{
-    // Whoever had made the directory may have taken it away with the mount.
-    std::error_code ignored;
-    std::filesystem::create_directories(place.target, ignored);
-    Context context = makeContext(place);
-    if (!context)
-        return ENOMEM;
-    mnt_context_set_source(context.get(), source.c_str());
-    std::string options = place.options;
-    if (place.isBind())
-        options += ",bind";
-    else
-        mnt_context_set_fstype(context.get(), place.filesystem.c_str());
-    mnt_context_set_options(context.get(), options.c_str());
-    return errorOf(context, mnt_context_mount(context.get()));
-}
-
 Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
 {
     const std::string target = fixwell::printable(place.target);
@@ -120,13 +102,22 @@ std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<MountPlace
 {
     if (const Sentence objection = objectionTo(places); !objection.isEmpty())
         return objection;
-    UnmountedDisk disk(wholeTargetOf(places));
-    while (!places.empty()) {
+    std::vector<MountCall> calls;
+    for (const MountPlace& place : places)
+        calls.push_back(mountCallFor(place, wholeTargetOf(places)));
+    auto keeper = MountKeeper::start(calls);
+    if (const int* const error = std::get_if<int>(&keeper))
+        return Sentence{
+            "nobody could be found to mount it again, should this program be killed: "
+            "%1$@",
+            ::strerrordesc_np(*error),
+            {}};
+    UnmountedDisk disk(std::get<MountKeeper>(std::move(keeper)));
+    for (; !places.empty(); places.pop_back(), calls.pop_back()) {
         // The last one first: it may lie over or below the others.
         if (const int error = unmount(places.back()))
             return refusal(places.back(), error, paths);
-        disk.places_.insert(disk.places_.begin(), std::move(places.back()));
-        places.pop_back();
+        disk.unmounted_.insert(disk.unmounted_.begin(), std::move(calls.back()));
     }
     return disk;
 }
@@ -134,12 +125,11 @@ std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<MountPlace
 std::vector<Sentence> UnmountedDisk::mountAgain()
 {
     std::vector<Sentence> failures;
-    for (const MountPlace& place : std::exchange(places_, {})) {
-        const std::string source = place.isBind() ? wholeTarget_ + place.root : place.source;
-        if (const int error = mount(place, source))
+    for (const MountCall& call : std::exchange(unmounted_, {}))
+        if (const int error = perform(call))
             failures.push_back({"It could not be mounted again at “%1$@”: %2$@.",
-                                fixwell::printable(place.target), ::strerrordesc_np(error)});
-    }
+                                fixwell::printable(call.target), ::strerrordesc_np(error)});
+    keeper_.reset();
     return failures;
 }
 

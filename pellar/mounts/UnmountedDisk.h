@@ -2,8 +2,10 @@
 #pragma once
 
 #include "pellar/Sentence.h"
+#include "pellar/mounts/MountKeeper.h"
 #include "pellar/mounts/MountPlace.h"
 
+#include <optional>
 #include <utility>
 #include <variant>
 #include <vector>
@@ -11,17 +13,14 @@
 namespace pellar {
 
 /// A disk that was unmounted for a job, and is mounted again where and as it was: at the latest
-/// when this object goes, however the job ends. Any thread; unmounting writes back what is still
-/// to be written, which may take long.
+/// when this object goes, however the job ends, and also when this process is killed. Any thread;
+/// unmounting writes back what is still to be written, which may take long.
 class UnmountedDisk {
 public:
     /// Unmounts all the places, or none: why not, naming who holds it.
     [[nodiscard]] static std::variant<UnmountedDisk, Sentence> take(std::vector<MountPlace> places,
                                                                     const SystemPaths& paths);
-    UnmountedDisk(UnmountedDisk&& other) noexcept
-        : places_(std::exchange(other.places_, {})), wholeTarget_(std::move(other.wholeTarget_))
-    {
-    }
+    UnmountedDisk(UnmountedDisk&&) noexcept = default;
     UnmountedDisk& operator=(UnmountedDisk&&) = delete;
     ~UnmountedDisk() { static_cast<void>(mountAgain()); }
 
@@ -29,10 +28,10 @@ public:
     [[nodiscard]] std::vector<Sentence> mountAgain();
 
 private:
-    explicit UnmountedDisk(std::string wholeTarget) : wholeTarget_(std::move(wholeTarget)) {}
+    explicit UnmountedDisk(MountKeeper keeper) : keeper_(std::move(keeper)) {}
 
-    std::vector<MountPlace> places_;  ///< to be mounted again, in this order
-    std::string wholeTarget_;         ///< where all of it is mounted, and not only a part
+    std::vector<MountCall> unmounted_;  ///< to be mounted again, in this order
+    std::optional<MountKeeper> keeper_;
 };
 
 }  // namespace pellar

@@ -45,14 +45,13 @@ std::variant<References, Sentence> readInstalledReferences(const RootDirectory& 
     switch (installedSystemAt(root)) {
         case PackageDatabase::Dpkg: {
             ReferenceStore store(sources.store);
-            ArchiveFetch fetch(sources.toolPath, stop, sources.trace);
-            const FetchArchive fetchArchive = [&fetch](const DpkgPackage& package,
-                                                       const std::filesystem::path& target) {
-                return fetch.fetch(package, target);
-            };
-            const bool mayFetch = sources.fetchesArchives && sources.root == "/";
-            return orStopped(readDpkgReferences(
-                root, accounts, store, mayFetch ? fetchArchive : FetchArchive(), progress));
+            const ArchiveFetch archives(sources.toolPath, stop, sources.trace);
+            FetchArchives fetch;
+            if (sources.fetchesArchives && sources.root == "/")
+                fetch = [&archives](const auto& packages, const auto& directory) {
+                    archives.fetch(packages, directory);
+                };
+            return orStopped(readDpkgReferences(root, accounts, store, fetch, progress));
         }
         case PackageDatabase::RPM: return askRPM(root, accounts, sources, stop);
         case PackageDatabase::Pacman: return orStopped(readPacmanReferences(root, progress));

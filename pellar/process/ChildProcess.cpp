@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ChildProcess.h"
 
+#include "pellar/process/SignalsBlocked.h"
+
 #include <fcntl.h>
 #include <linux/close_range.h>
 #include <pthread.h>
@@ -119,23 +121,6 @@ bool place(const FileDescriptor& source, int number)
     [[maybe_unused]] const auto written = ::write(ready.failure.get(), &error, sizeof error);
     ::_exit(127);
 }
-
-/// No handler of ours runs in the child between the fork and the exec.
-class SignalsBlocked {
-public:
-    SignalsBlocked()
-    {
-        sigset_t all;
-        ::sigfillset(&all);
-        ::pthread_sigmask(SIG_SETMASK, &all, &before_);
-    }
-    SignalsBlocked(const SignalsBlocked&) = delete;
-    SignalsBlocked& operator=(const SignalsBlocked&) = delete;
-    ~SignalsBlocked() { ::pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
-
-private:
-    sigset_t before_;
-};
 
 pid_t forkTool(const Preparation& ready)
 {

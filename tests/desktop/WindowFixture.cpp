@@ -106,6 +106,14 @@ QModelIndex WindowFixture::row(const std::string& image)
     return found.isEmpty() ? QModelIndex() : found.front();
 }
 
+std::string WindowFixture::openImage(const std::string& name)
+{
+    const std::string image = makeImage(name);
+    open({image});
+    select(image);
+    return image;
+}
+
 void WindowFixture::select(const std::string& image)
 {
     const QModelIndex index = row(image);

@@ -29,6 +29,8 @@ protected:
 
     /// Opens the window, and waits until the images are in the list.
     void open(const std::vector<std::string>& images);
+    /// Makes an image, opens the window with it and selects it; its file name.
+    std::string openImage(const std::string& name);
     void close() { session_.reset(); }
 
     /// Lets the event loop run until `isDone`; NO when that takes too long.

@@ -62,9 +62,7 @@ TEST_F(WindowTest, ARepairedDiskIsShownAsRepairedAndThenAsSound)
 
 TEST_F(WindowTest, HistoryIsThereAgainAfterARestart)
 {
-    const std::string image = makeImage("sound");
-    open({image});
-    select(image);
+    const std::string image = openImage("sound");
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitForJob());
     const std::vector<std::string> rows = logRows();
@@ -89,9 +87,7 @@ TEST_F(WindowTest, WhatIsSelectedTogetherIsCheckedTogether)
 
 TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
 {
-    const std::string image = makeImage("a <b>");
-    open({image});
-    select(image);
+    const std::string image = openImage("a <b>");
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitForJob());
     ASSERT_FALSE(logRows().empty());
@@ -113,9 +109,7 @@ TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
 TEST_F(WindowTest, AJobCanBeStopped)
 {
     useEndlessTool();
-    const std::string image = makeImage("sound");
-    open({image});
-    select(image);
+    const std::string image = openImage("sound");
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
     button("verifyDiskButton").press();
@@ -127,9 +121,7 @@ TEST_F(WindowTest, AJobCanBeStopped)
 TEST_F(WindowTest, ClosingDuringAJobAsks)
 {
     useEndlessTool();
-    const std::string image = makeImage("sound");
-    open({image});
-    select(image);
+    const std::string image = openImage("sound");
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
 
@@ -151,9 +143,7 @@ TEST_F(WindowTest, ClosingDuringAJobAsks)
 TEST_F(WindowTest, AProgramThatIsToldToEndStopsItsJobUnasked)
 {
     useEndlessTool();
-    const std::string image = makeImage("sound");
-    open({image});
-    select(image);
+    const std::string image = openImage("sound");
     button("verifyDiskButton").press();
     session().end();  // before the image was even read
     EXPECT_TRUE(waitUntil([&] { return wasClosed_; }));

@@ -3,7 +3,8 @@
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
-//   await-in-repair NAME: until there is such a file beside it, when it was called with -a
+//   await NAME: until there is such a file beside it
+//   await-in-repair NAME: the same, when it was called with -a
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
@@ -74,10 +75,10 @@ bool isRepairing()
     return false;
 }
 
-void awaitInRepair(const std::string& name)
+void await(const std::string& name)
 {
     const auto self = std::filesystem::read_symlink("/proc/self/exe");
-    while (isRepairing() && !std::filesystem::exists(self.parent_path() / name))
+    while (!std::filesystem::exists(self.parent_path() / name))
         ::usleep(5000);
 }
 
@@ -111,8 +112,8 @@ void act(const std::string& action, const std::string& text)
     else if (action == "environment")
         for (char** entry = environ; *entry != nullptr; ++entry)
             put(STDOUT_FILENO, std::string("environment ") + *entry + "\n");
-    else if (action == "await-in-repair")
-        awaitInRepair(text);
+    else if (action == "await" || (action == "await-in-repair" && isRepairing()))
+        await(text);
     else if (action == "terminal")
         tellTerminal();
     else if (action == "descriptors")

@@ -103,6 +103,64 @@ TEST_F(MountedDisk, IsMountedAgainAfterAStop)
     EXPECT_EQ(mounts(), before_);
 }
 
+/// A job in a process of its own, to be killed.
+class OtherProgram {
+public:
+    OtherProgram(const ManagerOptions& options, const fixwell::DiskReferencePointer& disk,
+                 bool repairs)
+        : id_(::fork())
+    {
+        if (id_ != 0)
+            return;
+        test::Bench bench(options);
+        static_cast<void>(repairs ? bench.repair(disk) : bench.verify(disk));
+        ::_exit(0);
+    }
+    void kill()
+    {
+        ::kill(id_, SIGKILL);
+        ::waitpid(id_, nullptr, 0);
+    }
+
+private:
+    pid_t id_;
+};
+
+[[nodiscard]] bool comesTrue(const std::function<bool()>& condition)
+{
+    for (int tries = 0; tries < 1000 && !condition(); ++tries)
+        ::usleep(10'000);
+    return condition();
+}
+
+TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
+{
+    ManagerOptions options;
+    options.toolPath = workshop_.fakeTools("wait");
+    OtherProgram verification(options, disk(), false);
+    ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
+    verification.kill();
+    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; })) << "the tool went with it";
+
+    options.toolPath = workshop_.fakeTools("ignore 15\nsay writing\nawait end");
+    OtherProgram repair(options, disk(), true);
+    ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
+    ::usleep(300'000);  // the tool has begun
+    repair.kill();
+    ::usleep(500'000);
+    EXPECT_TRUE(mounts().empty()) << "a tool that writes is waited for";
+    std::ofstream(fs::path(options.toolPath) / "end");
+    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
+}
+
+TEST_F(MountedDisk, NobodyIsLeftWatchingAfterTheJob)
+{
+    test::Bench bench;
+    EXPECT_EQ(bench.verify(disk()), 0);
+    EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
+    EXPECT_EQ(errno, ECHILD);
+}
+
 TEST_F(MountedDisk, WhoHoldsItIsNamedAndNothingIsChanged)
 {
     const auto refusal = [this] {

@@ -2,8 +2,10 @@
 #include "pellar/permissions/dpkg/ArchiveFetch.h"
 
 #include "pellar/permissions/Lines.h"
-#include "pellar/process/ProcessRunner.h"
 
+#include <unistd.h>
+
+#include <unordered_set>
 #include <utility>
 
 namespace pellar {
@@ -12,20 +14,21 @@ namespace {
 /// apt-helper(8) is no command for users and lies in no search path.
 constexpr const char* aptHelper = "/usr/lib/apt/apt-helper";
 
-/// Keeps the address among what apt-get says.
+/// Keeps the addresses among what apt-get says. For a package that it has no source for, it says
+/// that on its standard error, goes on with the others and exits with 100 (apt 2.6.1).
 class AddressReader final : public RunListener {
 public:
     void line(std::string_view line, bool isCut) override
     {
         if (auto found = isCut ? std::nullopt : parseArchiveAddress(line))
-            address = std::move(found);
+            addresses.push_back(*std::move(found));
     }
     void progressLine(std::string_view) override {}
     void lineLimitReached() override {}
     void pause() override {}
     void tick() override {}
 
-    std::optional<ArchiveAddress> address;
+    std::vector<ArchiveAddress> addresses;
 };
 
 }  // namespace
@@ -39,13 +42,13 @@ std::optional<ArchiveAddress> parseArchiveAddress(std::string_view line)
         return std::nullopt;
     line.remove_prefix(1);
     const std::string_view address = takeField(line, '\'');
-    takeWord(line);
+    const std::string_view name = takeWord(line);
     takeWord(line);
     const std::string_view hash = takeWord(line);
     const bool isWeb = address.starts_with("http://") || address.starts_with("https://");
     if (!isWeb || !hash.starts_with("SHA256:"))
         return std::nullopt;
-    return ArchiveAddress{std::string(address), std::string(hash)};
+    return ArchiveAddress{std::string(address), std::string(name), std::string(hash)};
 }
 
 ArchiveFetch::ArchiveFetch(const std::string& toolPath, StopSwitch& stop,
@@ -54,23 +57,57 @@ ArchiveFetch::ArchiveFetch(const std::string& toolPath, StopSwitch& stop,
 {
 }
 
-bool ArchiveFetch::fetch(const DpkgPackage& package, const std::filesystem::path& target)
+void ArchiveFetch::fetch(std::span<const DpkgPackage> packages,
+                         const std::filesystem::path& directory) const
 {
-    if (aptGet_.empty())
-        return false;
+    const std::vector<Download> downloads = downloadsOf(packages, directory);
+    if (downloads.empty() || download(downloads))
+        return;
+    // One of them went wrong, and which is not told.
+    for (const Download& single : downloads)
+        if (!download({&single, 1}))
+            ::unlink(single.target.c_str());
+}
+
+std::vector<ArchiveFetch::Download> ArchiveFetch::downloadsOf(
+    std::span<const DpkgPackage> packages, const std::filesystem::path& directory) const
+{
+    std::unordered_set<std::string> names;
+    Command command{aptGet_, {"--print-uris", "download"}};
+    for (const DpkgPackage& package : packages) {
+        names.insert(package.fileName() + ".deb");
+        command.arguments.push_back(package.name + ':' + package.architecture + '=' +
+                                    package.version);
+    }
     AddressReader reader;
-    const auto run = [&](Command command) {
-        RunRequest request;
-        request.command = std::move(command);
-        request.graceTimes = graceTimesFor(Access::ReadOnly);
-        if (trace_)
-            trace_(shown(request.command));
-        return runTool(request, stop_, reader).ending == Ending(Exited{0});
-    };
-    const std::string wanted = package.name + ':' + package.architecture + '=' + package.version;
-    return run({aptGet_, {"--print-uris", "download", wanted}}) && reader.address &&
-           run({aptHelper,
-                {"download-file", reader.address->address, target.native(), reader.address->hash}});
+    static_cast<void>(!aptGet_.empty() && run(std::move(command), reader));
+    std::vector<Download> downloads;
+    for (ArchiveAddress& archive : reader.addresses)
+        if (names.erase(archive.name) > 0)
+            downloads.push_back({archive, directory / archive.name});
+    return downloads;
+}
+
+bool ArchiveFetch::download(std::span<const Download> downloads) const
+{
+    Command command{aptHelper, {"download-file"}};
+    for (const Download& one : downloads)
+        command.arguments.insert(command.arguments.end(),
+                                 {one.archive.address, one.target.native(), one.archive.hash});
+    AddressReader nothing;
+    return run(std::move(command), nothing);
+}
+
+bool ArchiveFetch::run(Command command, RunListener& listener) const
+{
+    if (stop_.isPressed())
+        return false;
+    RunRequest request;
+    request.command = std::move(command);
+    request.graceTimes = graceTimesFor(Access::ReadOnly);
+    if (trace_)
+        trace_(shown(request.command));
+    return runTool(request, stop_, listener).ending == Ending(Exited{0});
 }
 
 }  // namespace pellar

@@ -2,19 +2,24 @@
 #pragma once
 
 #include "pellar/permissions/dpkg/DpkgStatus.h"
+#include "pellar/process/Command.h"
+#include "pellar/process/ProcessRunner.h"
 #include "pellar/process/StopSwitch.h"
 
 #include <filesystem>
 #include <functional>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace pellar {
 
 /// Where apt would fetch an archive from, and what it must be.
 struct ArchiveAddress {
     std::string address;
+    std::string name;  ///< of the file
     std::string hash;  ///< "SHA256:…"
 
     friend bool operator==(const ArchiveAddress&, const ArchiveAddress&) = default;
@@ -32,11 +37,21 @@ public:
     ArchiveFetch(const std::string& toolPath, StopSwitch& stop,
                  std::function<void(std::string)> trace);
 
-    /// Into this file; YES when it is there and is what it should be. Takes as long as the network
-    /// does; stopping ends it.
-    [[nodiscard]] bool fetch(const DpkgPackage& package, const std::filesystem::path& target);
+    /// Into this directory, as the packages' file names say. What cannot be had, or is not what it
+    /// should be, is not there. Takes as long as the network does; stopping ends it.
+    void fetch(std::span<const DpkgPackage> packages, const std::filesystem::path& directory) const;
 
 private:
+    struct Download {
+        ArchiveAddress archive;
+        std::filesystem::path target;
+    };
+
+    std::vector<Download> downloadsOf(std::span<const DpkgPackage> packages,
+                                      const std::filesystem::path& directory) const;
+    bool download(std::span<const Download> downloads) const;
+    bool run(Command command, RunListener& listener) const;
+
     std::filesystem::path aptGet_;
     StopSwitch& stop_;
     std::function<void(std::string)> trace_;

@@ -36,7 +36,7 @@ bool isState(const Reference& reference)
 class DpkgReading {
 public:
     DpkgReading(const RootDirectory& root, const Accounts& accounts, ReferenceStore& store,
-                const FetchArchive& fetch)
+                const FetchArchives& fetch)
         : root_(root),
           accounts_(accounts),
           store_(store),
@@ -50,14 +50,13 @@ public:
 
     std::optional<References> read(const ReadingProgress& progress)
     {
-        const std::vector<DpkgPackage> packages = parseDpkgStatus(text("var/lib/dpkg/status"));
-        for (const DpkgPackage& package : packages)
+        packages_ = parseDpkgStatus(text("var/lib/dpkg/status"));
+        for (const DpkgPackage& package : packages_)
             foreign_.addForeign(scriptsOf(package));
-        double done = 0;
-        for (const DpkgPackage& package : packages) {
-            if (!progress(100 * done++ / static_cast<double>(packages.size())))
+        for (std::size_t i = 0; i < packages_.size(); ++i) {
+            if (!progress(100 * static_cast<double>(i) / static_cast<double>(packages_.size())))
                 return std::nullopt;
-            add(package);
+            add(i);
         }
         for (Reference& override :
              parseStatOverrides(text("var/lib/dpkg/statoverride"), accounts_, root_.aliases()))
@@ -101,33 +100,55 @@ private:
         return files;
     }
 
-    std::optional<std::vector<PackagedFile>> archived(const DpkgPackage& package)
+    FileDescriptor ownArchiveOf(const DpkgPackage& package) const
     {
-        const std::string name = package.fileName();
+        return root_.openFile("var/cache/apt/archives/" + package.fileName() + ".deb");
+    }
+
+    std::optional<std::vector<PackagedFile>> archived(std::size_t index)
+    {
+        const std::string name = packages_[index].fileName();
         if (auto kept = store_.find(name))
             return kept;
-        const FileDescriptor archive = root_.openFile("var/cache/apt/archives/" + name + ".deb");
-        auto files = archive ? readDebArchive(archive.get()) : fetched(package);
+        const FileDescriptor archive = ownArchiveOf(packages_[index]);
+        auto files = archive ? readDebArchive(archive.get()) : fetched(index);
         if (files)
             store_.keep(name, *files);
         return files;
     }
 
-    std::optional<std::vector<PackagedFile>> fetched(const DpkgPackage& package) const
+    std::optional<std::vector<PackagedFile>> fetched(std::size_t index)
     {
-        const std::filesystem::path target = store_.pathOfFetched(package.fileName());
-        if (!fetch_ || target.empty() || !fetch_(package, target))
+        if (!fetch_ || store_.directory().empty())
             return std::nullopt;
+        if (index >= fetchedBefore_)
+            fetchFrom(index);
+        const auto target = store_.directory() / (packages_[index].fileName() + ".deb");
         const FileDescriptor archive(::open(target.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW));
         auto files = archive ? readDebArchive(archive.get()) : std::nullopt;
         ::unlink(target.c_str());
         return files;
     }
 
-    // A package says what its archive says, for the files that dpkg knows to be its own.
-    void add(const DpkgPackage& package)
+    // Asking apt takes a second, whether for one or for many; what has been fetched takes room.
+    void fetchFrom(std::size_t index)
     {
-        auto said = package.isConfigured ? archived(package) : std::nullopt;
+        constexpr std::size_t mostAtATime = 50;
+        std::vector<DpkgPackage> wanted;
+        for (; index < packages_.size() && wanted.size() < mostAtATime; ++index) {
+            const DpkgPackage& package = packages_[index];
+            if (package.isConfigured && !store_.has(package.fileName()) && !ownArchiveOf(package))
+                wanted.push_back(package);
+        }
+        fetchedBefore_ = index;
+        fetch_(wanted, store_.directory());
+    }
+
+    // A package says what its archive says, for the files that dpkg knows to be its own.
+    void add(std::size_t index)
+    {
+        const DpkgPackage& package = packages_[index];
+        auto said = package.isConfigured ? archived(index) : std::nullopt;
         collector_.countPackage(said.has_value());
         std::unordered_map<std::string, PackagedFile> byPath;
         for (PackagedFile& file : said.value_or(std::vector<PackagedFile>()))
@@ -174,10 +195,12 @@ private:
     const RootDirectory& root_;
     const Accounts& accounts_;
     ReferenceStore& store_;
-    const FetchArchive& fetch_;
+    const FetchArchives& fetch_;
     Diversions diversions_;
     TemporaryFileRules temporaryFiles_;
     std::unordered_set<std::string> infoFiles_;
+    std::vector<DpkgPackage> packages_;
+    std::size_t fetchedBefore_ = 0;  ///< the packages before this one have been asked for
     ScriptMentions foreign_;
     ReferenceCollector collector_;
 };
@@ -185,7 +208,7 @@ private:
 }  // namespace
 
 std::optional<References> readDpkgReferences(const RootDirectory& root, const Accounts& accounts,
-                                             ReferenceStore& store, const FetchArchive& fetch,
+                                             ReferenceStore& store, const FetchArchives& fetch,
                                              const ReadingProgress& progress)
 {
     return DpkgReading(root, accounts, store, fetch).read(progress);

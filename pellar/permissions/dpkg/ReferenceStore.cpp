@@ -59,6 +59,11 @@ std::optional<std::vector<PackagedFile>> ReferenceStore::find(const std::string&
     return readMtree(std::string(std::istreambuf_iterator<char>(file), {}));
 }
 
+bool ReferenceStore::has(const std::string& name) const
+{
+    return isTrusted_ && ::access(pathOf(name).c_str(), R_OK) == 0;
+}
+
 // Whole or not at all: half a reference would leave files without one, unseen.
 void ReferenceStore::keep(const std::string& name, const std::vector<PackagedFile>& files)
 {

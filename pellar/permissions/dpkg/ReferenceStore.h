@@ -24,10 +24,13 @@ public:
     /// Not being able to keep it loses time at the next run, nothing else.
     void keep(const std::string& name, const std::vector<PackagedFile>& files);
 
-    /// Where an archive goes that is fetched to be read; empty where the store is of no use.
-    [[nodiscard]] std::filesystem::path pathOfFetched(const std::string& name) const
+    [[nodiscard]] bool has(const std::string& name) const;
+
+    /// Where it keeps them, and where archives go that are fetched to be read; empty where the
+    /// store is of no use.
+    [[nodiscard]] std::filesystem::path directory() const
     {
-        return isTrusted_ ? directory_ / (name + ".deb") : std::filesystem::path();
+        return isTrusted_ ? directory_ : std::filesystem::path();
     }
 
 private:

@@ -5,6 +5,7 @@
 #include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PackagedFile.h"
 #include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/permissions/DebianSystem.h"
 
@@ -75,6 +76,37 @@ protected:
 
     std::unique_ptr<DebianSystem> system_;
 };
+
+TEST_F(PermissionJob, MissingArchivesAreFetchedAFewAtATimeAndGoAgain)
+{
+    system_->install("second", {{"usr/share/second", 0600}});
+    system_->install("lost", {{"usr/share/lost", 0600}, {"usr/share/lost2", 0600}});
+    const fs::path mirror = path("mirror");
+    fs::create_directory(mirror);
+    for (const char* const name : {"games", "second", "lost"})
+        fs::rename(system_->archiveOf(name), mirror / system_->archiveOf(name).filename());
+    std::vector<std::size_t> asked;
+    const FetchArchives fetch = [&](std::span<const DpkgPackage> packages,
+                                    const fs::path& directory) {
+        asked.push_back(packages.size());
+        for (const DpkgPackage& package : packages)
+            if (const std::string name = package.fileName() + ".deb"; package.name != "lost")
+                fs::copy_file(mirror / name, directory / name);
+    };
+    const auto root = RootDirectory::open(path("").native());
+    ASSERT_TRUE(root);
+    for (const std::vector<std::size_t>& expected : {std::vector<std::size_t>{3}, {1}}) {
+        asked.clear();
+        ReferenceStore store(system_->store());
+        const auto read =
+            readDpkgReferences(*root, accountsOf(*root), store, fetch, [](double) { return true; });
+        ASSERT_TRUE(read);
+        EXPECT_EQ(asked, expected) << "what is known is not fetched twice";
+        EXPECT_EQ(read->filesWithoutSource.size(), 2U) << "what could not be had is said";
+    }
+    for (const std::string& name : namesIn(system_->store()))
+        EXPECT_TRUE(name.ends_with(".mtree")) << name;
+}
 
 TEST_F(PermissionJob, AHealthySystemIsSound)
 {

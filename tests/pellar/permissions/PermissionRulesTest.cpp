@@ -140,7 +140,7 @@ TEST(DpkgStatus, TellsWhatIsThere)
 TEST(ArchiveAddress, IsOnlyTakenWithAHash)
 {
     EXPECT_EQ(parseArchiveAddress("'http://a/h_1_all.deb' h_1_all.deb 53 SHA256:2e6e"),
-              (ArchiveAddress{"http://a/h_1_all.deb", "SHA256:2e6e"}));
+              (ArchiveAddress{"http://a/h_1_all.deb", "h_1_all.deb", "SHA256:2e6e"}));
     for (const char* const line :
          {"'http://a/h_1_all.deb' h_1_all.deb 53 ",
           "'http://a/h_1_all.deb' h_1_all.deb 53 MD5Sum:2", "'file:/etc/shadow' a 53 SHA256:2e6e",

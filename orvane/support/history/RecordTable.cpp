@@ -1,0 +1,184 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/history/RecordTable.h"
+
+#include <algorithm>
+
+namespace orvane {
+namespace {
+
+// A volume's records have the numbers from `volume << recordBits` on.
+constexpr int recordBits = 36;
+constexpr std::int64_t noRecord = -1;
+
+std::int64_t firstOf(std::int64_t volume)
+{
+    return volume << recordBits;
+}
+
+void bindText(Statement& statement, int parameter, std::string_view text)
+{
+    if (text.empty())
+        statement.bindNothing(parameter);
+    else
+        statement.bind(parameter, text);
+}
+
+/// The one number that a statement over a range of records answers; none when it gives no row.
+std::int64_t numberIn(Statement& statement, std::int64_t first, std::int64_t end)
+{
+    statement.bind(1, first);
+    statement.bind(2, end);
+    const std::int64_t number =
+        statement.step() == Statement::Step::Row ? statement.integer(0) : noRecord;
+    statement.reset();
+    return number;
+}
+
+}  // namespace
+
+RecordTable::RecordTable(Database& database, std::int64_t mostOfVolume)
+    : mostOfVolume_(mostOfVolume),
+      vocabulary_(database),
+      add_(database.prepare("INSERT INTO records (id, shape, type, verbosity, message, text, "
+                            "style, time, extra) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)")),
+      read_(database.prepare("SELECT shape, type, verbosity, message, text, style, extra FROM "
+                             "records WHERE id >= ? AND id < ? ORDER BY id")),
+      oldest_(
+          database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id LIMIT 1")),
+      newest_(database.prepare(
+          "SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id DESC LIMIT 1")),
+      // A summary record, of verbosity -2, closes a run.
+      endOfRun_(database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? AND "
+                                 "verbosity = -2 ORDER BY id LIMIT 1")),
+      remove_(database.prepare("DELETE FROM records WHERE id >= ? AND id < ?"))
+{
+}
+
+void RecordTable::dropAllSurplus()
+{
+    const auto surplus = surplus_;
+    for (const auto& [volume, end] : surplus)
+        static_cast<void>(dropSurplus(volume, end));
+}
+
+RecordRange RecordTable::recordsOf(std::int64_t volume)
+{
+    const std::int64_t first = oldest(volume);
+    return first != noRecord ? RecordRange{first, behindNewest(volume)} : RecordRange();
+}
+
+bool RecordTable::read(RecordRange records, const fixwell::Array& history)
+{
+    read_.bind(1, records.next);
+    read_.bind(2, records.end);
+    Statement::Step step = Statement::Step::Done;
+    while ((step = read_.step()) == Statement::Step::Row) {
+        const RecordShape& shape = vocabulary_.shape(read_.integer(0));
+        RecordColumns columns{read_.text(1), read_.integer(2), read_.text(3),
+                              read_.text(4), nullptr,          read_.text(6)};
+        if (!read_.isNothing(5))
+            columns.style = vocabulary_.style(read_.integer(5));
+        history.append(recordFrom(columns, shape));
+    }
+    return step == Statement::Step::Done;
+}
+
+bool RecordTable::append(std::int64_t volume, const fixwell::Array& history, std::size_t firstNew,
+                         Time now)
+{
+    if (!makeRoom(volume, static_cast<std::int64_t>(history.size() - firstNew)))
+        return false;
+    // The newest ones, when there are more at once than a volume may have.
+    const auto limit = static_cast<std::size_t>(mostOfVolume_);
+    firstNew = std::max(firstNew, history.size() - std::min(limit, history.size()));
+    const std::int64_t time =
+        std::chrono::duration_cast<std::chrono::milliseconds>(now.time_since_epoch()).count();
+    std::int64_t id = behindNewest(volume);
+    for (std::size_t i = firstNew; i < history.size(); ++i)
+        if (!insert(id++, history.values()[i].dictionary(), time))
+            return false;
+    return true;
+}
+
+bool RecordTable::insert(std::int64_t id, const fixwell::Dictionary& record, std::int64_t time)
+{
+    const auto* const shape = vocabulary_.shapeOf(record);
+    if (shape == nullptr)
+        return false;
+    const RecordColumns columns = columnsOf(record, shape->shape, extraRoom_);
+    const std::int64_t style = columns.style != nullptr ? vocabulary_.numberOf(columns.style) : 0;
+    if (columns.style != nullptr && style == 0)
+        return false;
+    add_.bind(1, id);
+    add_.bind(2, shape->number);
+    bindText(add_, 3, columns.type);
+    add_.bind(4, columns.verbosity);
+    bindText(add_, 5, columns.message);
+    bindText(add_, 6, columns.text);
+    if (style != 0)
+        add_.bind(7, style);
+    else
+        add_.bindNothing(7);
+    add_.bind(8, time);
+    bindText(add_, 9, columns.extra);
+    return add_.run();
+}
+
+bool RecordTable::removeAll(std::int64_t volume)
+{
+    surplus_.erase(volume);
+    return remove(firstOf(volume), firstOf(volume + 1));
+}
+
+bool RecordTable::remove(std::int64_t first, std::int64_t end)
+{
+    remove_.bind(1, first);
+    remove_.bind(2, end);
+    return remove_.run();
+}
+
+std::int64_t RecordTable::oldest(std::int64_t volume)
+{
+    return numberIn(oldest_, firstOf(volume), firstOf(volume + 1));
+}
+
+std::int64_t RecordTable::behindNewest(std::int64_t volume)
+{
+    const std::int64_t newest = numberIn(newest_, firstOf(volume), firstOf(volume + 1));
+    return newest != noRecord ? newest + 1 : firstOf(volume);
+}
+
+// Where the run that holds the record before `record` ends; `record` when that run goes on to
+// the newest record.
+std::int64_t RecordTable::endOfRunAt(std::int64_t record, std::int64_t next)
+{
+    const std::int64_t end = numberIn(endOfRun_, record - 1, next);
+    return end != noRecord ? end + 1 : record;
+}
+
+// Drops a quarter more than it must, so that a volume at its limit is not trimmed at every save.
+bool RecordTable::makeRoom(std::int64_t volume, std::int64_t added)
+{
+    const std::int64_t first = oldest(volume);
+    const std::int64_t next = behindNewest(volume);
+    const std::int64_t surplus = next - first + added - mostOfVolume_;
+    if (first != noRecord && surplus > 0 && !surplus_.contains(volume))
+        surplus_[volume] = endOfRunAt(std::min(next, first + surplus + mostOfVolume_ / 4), next);
+    // A million records at once would keep the user waiting.
+    constexpr std::int64_t fewestRemoved = 1000;
+    return dropSurplus(volume, added + added / 4 + fewestRemoved);
+}
+
+bool RecordTable::dropSurplus(std::int64_t volume, std::int64_t most)
+{
+    const auto surplus = surplus_.find(volume);
+    if (surplus == surplus_.end())
+        return true;
+    const std::int64_t first = oldest(volume);
+    const std::int64_t end = std::min(surplus->second, first + most);
+    if (end >= surplus->second)
+        surplus_.erase(surplus);
+    return first == noRecord || remove(first, end);
+}
+
+}  // namespace orvane

@@ -1,0 +1,63 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/foundation/Array.h"
+#include "orvane/support/history/Database.h"
+#include "orvane/support/history/RecordVocabulary.h"
+
+#include <chrono>
+#include <cstdint>
+#include <map>
+#include <string>
+
+namespace orvane {
+
+/// The numbers of some records of a volume. They follow each other closely, and newer records have
+/// higher ones.
+struct RecordRange {
+    std::int64_t next = 0;
+    std::int64_t end = 0;  ///< behind the newest
+
+    std::int64_t size() const { return end - next; }
+};
+
+/// The records of all volumes, a limited number of each: when there are more, older runs are
+/// dropped whole, and of a run that alone exceeds the limit, the oldest records. They are dropped
+/// little by little while others are appended, and the rest at the end. Volumes go by their
+/// numbers. The database outlives this object.
+class RecordTable {
+public:
+    using Time = std::chrono::system_clock::time_point;
+
+    RecordTable(Database& database, std::int64_t mostOfVolume);
+
+    [[nodiscard]] RecordRange recordsOf(std::int64_t volume);
+    /// Appends those of the records that are still there to the history, oldest first.
+    [[nodiscard]] bool read(RecordRange records, const fixwell::Array& history);
+    /// Appends the history's records from `firstNew` on to the volume's. Within a transaction.
+    [[nodiscard]] bool append(std::int64_t volume, const fixwell::Array& history,
+                              std::size_t firstNew, Time now);
+    [[nodiscard]] bool removeAll(std::int64_t volume);
+    /// At the end: what cannot be dropped now will be when the volume is appended to again.
+    void dropAllSurplus();
+    /// A transaction has failed: what was written in it is not there.
+    void forgetWritten() { vocabulary_.forget(); }
+
+private:
+    std::int64_t oldest(std::int64_t volume);
+    std::int64_t behindNewest(std::int64_t volume);
+    std::int64_t endOfRunAt(std::int64_t record, std::int64_t next);
+    bool insert(std::int64_t id, const fixwell::Dictionary& record, std::int64_t time);
+    bool makeRoom(std::int64_t volume, std::int64_t added);
+    bool dropSurplus(std::int64_t volume, std::int64_t most);
+    bool remove(std::int64_t first, std::int64_t end);
+
+    const std::int64_t mostOfVolume_;
+    RecordVocabulary vocabulary_;
+    Statement add_, read_, oldest_, newest_, endOfRun_, remove_;
+    /// Volumes with more records than they may have: up to where theirs are to be dropped.
+    std::map<std::int64_t, std::int64_t> surplus_;
+    std::string extraRoom_;
+};
+
+}  // namespace orvane

@@ -1,0 +1,94 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/mounts/MountCall.h"
+
+#include <fcntl.h>
+#include <libmount/libmount.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+
+#include <array>
+#include <cerrno>
+#include <climits>
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+#include <utility>
+
+namespace pellar {
+namespace {
+
+struct Free {
+    void operator()(char* text) const { std::free(text); }
+};
+using OwnedText = std::unique_ptr<char, Free>;
+
+/// What is the kernel's in general becomes flags, what is the file system's stays text, and what
+/// only programs understand (x-…, user, _netdev) is left out.
+void setOptions(MountCall& call, const std::string& options)
+{
+    char* general = nullptr;
+    char* own = nullptr;
+    if (mnt_split_optstr(options.c_str(), nullptr, &general, &own, 0, 0) != 0)
+        return;
+    const OwnedText generalOwner(general);
+    const OwnedText ownOwner(own);
+    call.data = own != nullptr ? own : "";
+    if (general != nullptr)
+        mnt_optstr_get_flags(general, &call.flags, mnt_get_builtin_optmap(MNT_LINUX_MAP));
+}
+
+void makeDirectories(const std::string& target) noexcept
+{
+    std::array<char, PATH_MAX> path;
+    if (target.size() >= path.size())
+        return;
+    std::memcpy(path.data(), target.c_str(), target.size() + 1);
+    for (std::size_t i = 1; i <= target.size(); ++i) {
+        if (path[i] != '/' && path[i] != '\0')
+            continue;
+        const char end = std::exchange(path[i], '\0');
+        ::mkdir(path.data(), 0755);
+        path[i] = end;
+    }
+}
+
+int call(const char* source, const MountCall& call, unsigned long flags, const char* data) noexcept
+{
+    return ::mount(source, call.target.c_str(), call.isBind ? nullptr : call.filesystem.c_str(),
+                   flags, data) == 0
+               ? 0
+               : errno;
+}
+
+}  // namespace
+
+MountCall mountCallFor(const MountPlace& place, const std::string& wholeTarget)
+{
+    MountCall call{place.source, place.target, place.filesystem, {}, 0, place.isBind()};
+    if (call.isBind)
+        call.source = wholeTarget + place.root;
+    setOptions(call, place.options);
+    return call;
+}
+
+int perform(const MountCall& mountCall) noexcept
+{
+    struct stat status = {};
+    if (::stat(mountCall.target.c_str(), &status) != 0)
+        makeDirectories(mountCall.target);
+    if (!mountCall.isBind)
+        return call(mountCall.source.c_str(), mountCall, mountCall.flags, mountCall.data.c_str());
+    // A bind mount takes its own flags only in a second call (mount(2), "Creating a bind mount").
+    if (const int error = call(mountCall.source.c_str(), mountCall, MS_BIND, nullptr))
+        return error;
+    return call(nullptr, mountCall, MS_BIND | MS_REMOUNT | mountCall.flags, nullptr);
+}
+
+bool isMountRoot(const char* path) noexcept
+{
+    struct statx status = {};
+    return ::statx(AT_FDCWD, path, AT_NO_AUTOMOUNT, 0, &status) == 0 &&
+           (status.stx_attributes & STATX_ATTR_MOUNT_ROOT) != 0;
+}
+
+}  // namespace pellar
