@@ -151,16 +151,20 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
                                     [](const MountPlace& place) { return place.target == "/"; });
     const bool staysMounted =
         isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
-    if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs") {
-        start(disk, [disk, mounts, this](StopSwitch& stop, EventRoad& road) {
-            return std::make_unique<LiveScript>(disk, mounts, options_, texts_, stop, road);
-        });
-        return fixwell::kPLNoError;
-    }
-    if (mounts.empty() || isRoot)
+    if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
+        startLive(disk, mounts);
+    else if (mounts.empty() || isRoot)
         return error;
-    startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    else
+        startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
+}
+
+void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<MountPlace>& mounts)
+{
+    start(disk, [disk, mounts, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<LiveScript>(disk, mounts, options_, texts_, stop, road);
+    });
 }
 
 // A script maker can be copied, a claim cannot.

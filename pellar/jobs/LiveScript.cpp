@@ -61,24 +61,9 @@ Outcome LiveScript::verify()
     return outcomeOfVerification(judgement);
 }
 
-// Something else may be mounted over a place, so what is found there is compared with the disk.
 std::optional<Outcome> LiveScript::findVolume()
 {
-    device_ = FileDescriptor(::open(disk_->path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
-    const auto superblock =
-        device_ ? readBtrfsSuperblock(device_.get(), 0, anyBytes) : std::nullopt;
-    int error = errno;
-    for (const MountPlace& place : mounts_) {
-        auto opened = MountedBtrfs::open(place.target);
-        if (const int* const openError = std::get_if<int>(&opened)) {
-            error = *openError;
-        } else if (superblock && std::get<MountedBtrfs>(opened).id() == superblock->id) {
-            volume_.emplace(std::get<MountedBtrfs>(std::move(opened)));
-            log_.trace("it is verified through " + fixwell::printable(place.target));
-            break;
-        }
-    }
-    if (!volume_)
+    if (const int error = reachVolume())
         return failure(
             fixwell::kPLErrorCannotOpen,
             {"it is mounted, but could not be reached there: %1$@", ::strerrordesc_np(error), {}});
@@ -86,6 +71,28 @@ std::optional<Outcome> LiveScript::findVolume()
         return failure(fixwell::kPLErrorToolFailed,
                        {"another program is checking it just now", {}, {}});
     return std::nullopt;
+}
+
+// An errno. Something else may be mounted over a place, so what is found there is compared with the
+// disk.
+int LiveScript::reachVolume()
+{
+    device_ = FileDescriptor(::open(disk_->path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    if (!device_)
+        return errno;
+    const auto superblock = readBtrfsSuperblock(device_.get(), 0, anyBytes);
+    int error = ENODEV;
+    for (const MountPlace& place : mounts_) {
+        auto opened = MountedBtrfs::open(place.target);
+        if (const int* const openError = std::get_if<int>(&opened)) {
+            error = *openError;
+        } else if (superblock && std::get<MountedBtrfs>(opened).id() == superblock->id) {
+            volume_.emplace(std::get<MountedBtrfs>(std::move(opened)));
+            log_.trace("it is verified through " + fixwell::printable(place.target));
+            return 0;
+        }
+    }
+    return error;
 }
 
 Judgement LiveScript::scrub()

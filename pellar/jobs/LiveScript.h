@@ -32,6 +32,7 @@ public:
 private:
     Outcome verify();
     std::optional<Outcome> findVolume();
+    int reachVolume();
     bool isStillThere() const;
     RunRequest request() const;
     Judgement scrub();
