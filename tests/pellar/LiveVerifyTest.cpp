@@ -6,6 +6,7 @@
 #include "pellar/volumes/MountedBtrfs.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
+#include "tests/support/ScrubRecords.h"
 
 #include <gtest/gtest.h>
 #include <sys/mount.h>
@@ -13,7 +14,6 @@
 #include <unistd.h>
 
 #include <fstream>
-#include <sstream>
 
 namespace {
 
@@ -23,9 +23,9 @@ namespace fs = std::filesystem;
 
 std::string bytesOf(const fs::path& file)
 {
-    std::ostringstream bytes;
-    bytes << std::ifstream(file, std::ios::binary).rdbuf();
-    return std::move(bytes).str();
+    std::string bytes(fs::file_size(file), '\0');
+    std::ifstream(file, std::ios::binary).read(bytes.data(), std::ssize(bytes));
+    return bytes;
 }
 
 /// A btrfs volume with one copy of its files and two of everything else, mounted as the place of
@@ -40,7 +40,7 @@ protected:
         if (::geteuid() != 0)
             GTEST_SKIP() << "mounting needs root";
         workshop_.write("image", {});
-        fs::resize_file(image(), 256U << 20U);
+        fs::resize_file(image(), 128U << 20U);
         if (findProgram("mkfs.btrfs", ManagerOptions().toolPath).empty())
             GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
         workshop_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
@@ -56,28 +56,8 @@ protected:
     }
     void TearDown() override
     {
-        if (!device_)
-            return;
-        const auto volume = MountedBtrfs::open(place());
-        if (const auto* const opened = std::get_if<MountedBtrfs>(&volume))
-            forgetScrubsOf(opened->id());
         unmount();
-    }
-
-    /// The tool keeps what it has found, by the number of the volume.
-    static void forgetScrubsOf(const BtrfsId& id)
-    {
-        std::string number;
-        for (const std::uint8_t byte : id) {
-            constexpr std::string_view digits = "0123456789abcdef";
-            number += {digits[byte / 16U], digits[byte % 16U]};
-            if (const auto length = number.size();
-                length == 8 || length == 13 || length == 18 || length == 23)
-                number += '-';
-        }
-        fs::remove("/var/lib/btrfs/scrub.status." + number);
-        std::error_code ignored;
-        fs::remove("/var/lib/btrfs", ignored);  // if nobody else's are there
+        orvane::test::forgetScrubsOf(image());
     }
 
     bool mount()
