@@ -166,8 +166,16 @@ void LiveScript::line(std::string_view line, bool)
         log_.detail(text);
 }
 
+void LiveScript::stopAsked()
+{
+    isStopping_ = true;
+    volume_->cancelScrub();
+}
+
 void LiveScript::tick()
 {
+    if (isStopping_)  // the tool may have begun only after it was asked to end
+        volume_->cancelScrub();
     const auto scrubbed = volume_->scrubbedBytes();
     if (scrubbed && storedBytes_ > 0)
         log_.progress(100.0 * static_cast<double>(*scrubbed) / static_cast<double>(storedBytes_));

@@ -41,7 +41,7 @@ private:
     void line(std::string_view line, bool isCut) override;
     void progressLine(std::string_view) override {}
     void lineLimitReached() override {}
-    void stopAsked() override { volume_->cancelScrub(); }
+    void stopAsked() override;
     void pause() override { road_.flush(); }
     void tick() override;
 
@@ -58,6 +58,7 @@ private:
     std::filesystem::path program_;
     std::uint64_t storedBytes_ = 0;
     ScrubReport report_;
+    bool isStopping_ = false;
 };
 
 }  // namespace pellar
