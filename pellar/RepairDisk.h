@@ -10,6 +10,7 @@
 #include "pellar/tools/Operation.h"
 
 #include <memory>
+#include <vector>
 
 namespace pellar {
 
@@ -55,6 +56,8 @@ private:
                          Operation operation);
     bool isPartThatOthersAttach(const JobRequest& request) const;
     void startVolume(JobRequest request);
+    void startLive(const fixwell::DiskReferencePointer& disk,
+                   const std::vector<MountPlace>& mounts);
     void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;

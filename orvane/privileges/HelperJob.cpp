@@ -5,6 +5,7 @@
 #include "orvane/privileges/AskingProgram.h"
 #include "orvane/privileges/AttachedRegion.h"
 #include "orvane/privileges/HelperConversation.h"
+#include "orvane/privileges/HomeDirectory.h"
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/privileges/UndoneJob.h"
 #include "pellar/Manager.h"
@@ -38,14 +39,14 @@ std::variant<AttachedRegion, Undone> attachedRegion(const HelperRequest& request
 /// One job, with what it stands on.
 class HelperJob {
 public:
-    HelperJob(const HelperRequest& request, const pellar::Texts& texts)
-        : request_(request), texts_(texts)
+    HelperJob(const HelperRequest& request, std::optional<uid_t> user, const pellar::Texts& texts)
+        : request_(request), user_(user), texts_(texts)
     {
     }
 
-    void run(std::optional<uid_t> user)
+    void run()
     {
-        const auto undone = prepare(user);
+        const auto undone = prepare();
         if (!undone)
             work();
         else
@@ -53,12 +54,12 @@ public:
     }
 
 private:
-    std::optional<Undone> prepare(std::optional<uid_t> user)
+    std::optional<Undone> prepare()
     {
         disk_ = request_.disk;
         if (request_.subject == Subject::Permissions)
             return findSystem();
-        return request_.isOnImage() ? attach(user) : std::nullopt;
+        return request_.isOnImage() ? attach() : std::nullopt;
     }
 
     std::optional<Undone> findSystem()
@@ -70,9 +71,9 @@ private:
         return std::nullopt;
     }
 
-    std::optional<Undone> attach(std::optional<uid_t> user)
+    std::optional<Undone> attach()
     {
-        auto region = attachedRegion(request_, user);
+        auto region = attachedRegion(request_, user_);
         if (auto* const undone = std::get_if<Undone>(&region))
             return std::move(*undone);
         region_.emplace(std::get<AttachedRegion>(std::move(region)));
@@ -85,6 +86,8 @@ private:
         pellar::ManagerOptions options;
         options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
+        if (user_)
+            options.homeDirectory = homeDirectoryOf(*user_);
         options.archiveFetching.isAllowed = [this] {
             return request_.fetchesArchives;
         };
@@ -132,6 +135,7 @@ private:
     }
 
     const HelperRequest& request_;
+    const std::optional<uid_t> user_;
     const pellar::Texts& texts_;
     MainLoop loop_;
     Teller teller_;
@@ -144,7 +148,7 @@ private:
 void runHelperJob(const HelperRequest& request, std::optional<uid_t> user,
                   const pellar::Texts& texts)
 {
-    HelperJob(request, texts).run(user);
+    HelperJob(request, user, texts).run();
 }
 
 }  // namespace orvane
