@@ -256,7 +256,7 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
         const Translator translator;
         const auto found = DiskLookup(host.controller, translator).find(c.name);
         ASSERT_TRUE(failed(found)) << c.name;
-        EXPECT_EQ(failureMessage(found), "cannot check ‘" + c.name + "’: " + c.reason);
+        EXPECT_EQ(failureMessage(found), "cannot use ‘" + c.name + "’: " + c.reason);
         EXPECT_EQ(host.takeHeard(), "") << "nothing became known";
     }
 }

@@ -17,7 +17,7 @@ namespace fs = std::filesystem;
 Outcome<std::shared_ptr<Disk>> DiskLookup::find(std::string_view name)
 {
     if (name.empty())
-        return cannotCheck(name, translator_.text("it has no name"));
+        return cannotUse(name, translator_.text("it has no name"));
     if (auto known = controller_.diskNamed(name))
         return known;
     for (const std::string_view tag : {"LABEL=", "UUID="})
@@ -26,9 +26,9 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::find(std::string_view name)
     return findFile(fs::path(name));
 }
 
-Failure DiskLookup::cannotCheck(std::string_view object, std::string_view reason) const
+Failure DiskLookup::cannotUse(std::string_view object, std::string_view reason) const
 {
-    return {translator_.sentence("cannot check ‘%@’: %@", {fixwell::printable(object), reason})};
+    return {translator_.sentence("cannot use ‘%@’: %@", {fixwell::printable(object), reason})};
 }
 
 Outcome<std::shared_ptr<Disk>> DiskLookup::findByTag(std::string_view tag, std::string_view value)
@@ -41,10 +41,10 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findByTag(std::string_view tag, std::
                 meant.push_back(disk);
     const std::string name = std::string(tag) + std::string(value);
     if (meant.empty())
-        return cannotCheck(
+        return cannotUse(
             name, translator_.text(isLabel ? "no disk has this label" : "no disk has this UUID"));
     if (meant.size() > 1)
-        return cannotCheck(
+        return cannotUse(
             name, translator_.sentence("%@ and %@ both have it", {meant[0]->facts().identifier,
                                                                   meant[1]->facts().identifier}));
     return meant.front();
@@ -54,14 +54,14 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findFile(const fs::path& path)
 {
     struct stat status = {};
     if (::stat(path.c_str(), &status) != 0)
-        return cannotCheck(path.native(), errorText(errno));
+        return cannotUse(path.native(), errorText(errno));
     switch (status.st_mode & S_IFMT) {
         case S_IFREG: return findImage(path);
         case S_IFBLK: return findDevice(path);
         case S_IFDIR: return findMountPoint(path);
         default:
-            return cannotCheck(path.native(),
-                               translator_.text("it is neither a disk nor a disk image"));
+            return cannotUse(path.native(),
+                             translator_.text("it is neither a disk nor a disk image"));
     }
 }
 
@@ -70,12 +70,12 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findDevice(const fs::path& path)
     std::error_code error;
     const fs::path node = fs::canonical(path, error);
     if (error)
-        return cannotCheck(path.native(), error.message());
+        return cannotUse(path.native(), error.message());
     if (auto known = controller_.diskNamed(node.native()))
         return known;
     const auto facts = readBlockDevice(node, DiskSources());
     if (!facts || facts->length == 0)
-        return cannotCheck(path.native(), translator_.text("there is no medium in it"));
+        return cannotUse(path.native(), translator_.text("there is no medium in it"));
     return controller_.addDevice(*facts);
 }
 
@@ -84,23 +84,23 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findMountPoint(const fs::path& path)
     std::error_code error;
     const fs::path directory = fs::canonical(path, error);
     if (error)
-        return cannotCheck(path.native(), error.message());
+        return cannotUse(path.native(), error.message());
     const auto volume = controller_.find(
         [&](const Disk& disk) { return disk.facts().mountPoint == directory.native(); });
     if (volume)
         return volume;
     const auto mount = mountHolding(currentMounts(), directory);
     const bool isMountPoint = mount && mount->mountPoint == directory.native();
-    return cannotCheck(path.native(),
-                       translator_.text(isMountPoint ? "no disk is mounted on this directory"
-                                                     : "this directory is no mount point"));
+    return cannotUse(path.native(),
+                     translator_.text(isMountPoint ? "no disk is mounted on this directory"
+                                                   : "this directory is no mount point"));
 }
 
 Outcome<std::shared_ptr<Disk>> DiskLookup::findImage(const fs::path& path)
 {
     auto opened = openImage(path, translator_);
     if (failed(opened))
-        return cannotCheck(path.native(), failureMessage(opened));
+        return cannotUse(path.native(), failureMessage(opened));
     return controller_.addImage(factsOfImage(std::get<OpenImage>(opened)));
 }
 

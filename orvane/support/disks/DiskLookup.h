@@ -31,7 +31,7 @@ private:
     Found findDevice(const std::filesystem::path& path);
     Found findMountPoint(const std::filesystem::path& path);
     Found findImage(const std::filesystem::path& path);
-    Failure cannotCheck(std::string_view object, std::string_view reason) const;
+    Failure cannotUse(std::string_view object, std::string_view reason) const;
 
     DiskController& controller_;
     const Translator& translator_;
