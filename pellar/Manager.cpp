@@ -5,6 +5,9 @@
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapOutcome.h"
 #include "pellar/tools/Capability.h"
+#include "pellar/tools/LiveVerification.h"
+
+#include <unistd.h>
 
 #include <utility>
 
@@ -35,6 +38,21 @@ bool Manager::canRepair(std::string_view filesystemType) const
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
 {
     return capabilityFor(filesystemType, operation, options_.toolPath).reason.in(texts_);
+}
+
+bool Manager::canVerifyLive(std::string_view filesystemType) const
+{
+    return reasonAgainstLive(filesystemType).empty();
+}
+
+std::string Manager::reasonAgainstLive(std::string_view filesystemType) const
+{
+    const Capability capability = liveCapabilityFor(filesystemType, options_.toolPath);
+    if (!capability.isGiven())
+        return capability.reason.in(texts_);
+    const bool hasRights = ::geteuid() == 0 || options_.privileged;
+    return hasRights ? std::string()
+                     : texts_.text("only an administrator may verify it while it is in use");
 }
 
 std::string Manager::reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const

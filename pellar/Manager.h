@@ -30,6 +30,11 @@ public:
     /// Why not, in the user's language; empty when it can.
     std::string reasonAgainst(std::string_view filesystemType, Operation operation) const;
 
+    /// Such a volume can be verified while it stays mounted, by this user or an administrator who
+    /// is asked; and why it cannot. Looks in a few directories.
+    bool canVerifyLive(std::string_view filesystemType) const;
+    std::string reasonAgainstLive(std::string_view filesystemType) const;
+
     /// Why the disk's partition map cannot be verified, in the user's language: it has none, or
     /// cannot be read; empty when it can. Reads a few sectors.
     std::string reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const;

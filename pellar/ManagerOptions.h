@@ -41,6 +41,9 @@ struct ManagerOptions {
     /// empty. Not called after the PLRepairDisk has been destroyed.
     std::function<void(std::string_view)> commandTrace;
     SystemPaths systemPaths;
+    /// The user's. The volume that holds it is verified where it is mounted, in the way in which
+    /// that is possible, and not unmounted for it. Empty when there is none.
+    std::filesystem::path homeDirectory;
     /// Where it is kept what archives have said about their packages' files, so that the next
     /// verification of permissions needs no archive; absolute, made when it is needed, of no use
     /// when others can write to it. Empty: nothing is kept.

@@ -3,6 +3,7 @@
 
 #include "fixwell/host/foundation/UTF8.h"
 #include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/LiveScript.h"
 #include "pellar/jobs/MapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
 #include "pellar/partitions/MapDisk.h"
@@ -138,7 +139,8 @@ bool RepairDisk::beginPrivileged(const DiskReferencePointer& disk, Operation ope
     return true;
 }
 
-// Unmounting may take long, so it is the job's. What the system itself runs from is not tried.
+// Unmounting may take long, so it is the job's. What the system itself runs from, and the user's
+// home, is not tried where it can be verified as it is.
 ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation operation,
                                    ErrorCode error)
 {
@@ -147,10 +149,22 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     auto mounts = mountPlacesOf(disk->path, options_.systemPaths);
     const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
                                     [](const MountPlace& place) { return place.target == "/"; });
-    if (mounts.empty() || isRoot)
+    const bool staysMounted =
+        isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
+    if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
+        startLive(disk, mounts);
+    else if (mounts.empty() || isRoot)
         return error;
-    startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
+    else
+        startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
     return fixwell::kPLNoError;
+}
+
+void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<MountPlace>& mounts)
+{
+    start(disk, [disk, mounts, this](StopSwitch& stop, EventRoad& road) {
+        return std::make_unique<LiveScript>(disk, mounts, options_, texts_, stop, road);
+    });
 }
 
 // A script maker can be copied, a claim cannot.

@@ -10,6 +10,7 @@
 #include "pellar/tools/Operation.h"
 
 #include <memory>
+#include <vector>
 
 namespace pellar {
 
@@ -53,6 +54,8 @@ private:
                                Operation operation) const;
     bool beginPrivileged(const fixwell::DiskReferencePointer& disk, Operation operation);
     void startVolume(JobRequest request);
+    void startLive(const fixwell::DiskReferencePointer& disk,
+                   const std::vector<MountPlace>& mounts);
     void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     fixwell::RunLoop& loop_;

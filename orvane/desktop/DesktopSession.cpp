@@ -76,7 +76,8 @@ SupportOptions DesktopSession::supportOptions()
     options.paths = options_.paths;
     options.hostBundle = hostBundleDirectory(runningExecutable());
     options.capabilities = [this](std::string_view type) {
-        return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type), false};
+        return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type),
+                                      library_.canVerifyLive(type)};
     };
     options.errorText = [this](fixwell::ErrorCode code) {
         return pellar::errorText(code, libraryTexts_);

@@ -4,7 +4,8 @@
 #include "orvane/support/texts/Catalogue.h"
 #include "pellar/Texts.h"
 
-#include <memory>
+#include <algorithm>
+#include <limits>
 
 namespace orvane {
 
@@ -21,6 +22,13 @@ public:
     std::string text(std::string_view englishKey) const override
     {
         return hostTexts_.translate("Pellar", englishKey);
+    }
+    std::string pluralText(std::string_view englishOne, std::string_view englishMany,
+                           std::uint64_t count) const override
+    {
+        constexpr std::uint64_t greatest = std::numeric_limits<long>::max();
+        return hostTexts_.translatePlural("Pellar", englishOne, englishMany,
+                                          static_cast<long>(std::min(count, greatest)));
     }
     std::string resultText(std::string_view englishKey) const override
     {

@@ -9,6 +9,7 @@
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/privileges/EventWire.h"
 #include "orvane/privileges/HelperRequest.h"
+#include "orvane/privileges/HomeDirectory.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Language.h"
@@ -20,6 +21,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <charconv>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
@@ -141,8 +143,20 @@ void settle()
     ::umask(077);
 }
 
+/// Of the user who asked, as pkexec(1) tells who that is.
+std::filesystem::path homeOfAskingUser()
+{
+    const char* const variable = std::getenv("PKEXEC_UID");
+    const std::string_view text = variable != nullptr ? variable : "";
+    uid_t user = 0;
+    const auto [rest, error] = std::from_chars(text.data(), text.data() + text.size(), user);
+    const bool isNumber = error == std::errc() && rest == text.data() + text.size();
+    return isNumber ? homeDirectoryOf(user) : std::filesystem::path();
+}
+
 int run(const std::vector<std::string>& arguments)
 {
+    const std::filesystem::path home = homeOfAskingUser();
     settle();
     const auto read = readHelperArguments(arguments, isBlockDevice);
     if (const auto* const refusal = std::get_if<std::string>(&read)) {
@@ -170,6 +184,7 @@ int run(const std::vector<std::string>& arguments)
     Teller teller;
     pellar::ManagerOptions options;
     options.savedSectorsDirectory = stateDirectory;
+    options.homeDirectory = home;
     pellar::Manager manager(loop, texts, options);
     manager.setDelegate(&teller);
     const auto tool = manager.makeRepairDisk();

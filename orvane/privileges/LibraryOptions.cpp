@@ -29,6 +29,7 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
     pellar::ManagerOptions options;
     if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
         options.toolPath = *path;
+    options.homeDirectory = environmentValue("HOME").value_or("");
     if (!paths.state.empty()) {
         options.savedSectorsDirectory = paths.state / "partition-maps";
         options.permissionReferences = paths.state / "permissions";

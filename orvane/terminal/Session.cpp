@@ -69,7 +69,8 @@ SupportOptions Session::supportOptions(const Request& request)
     options.keptLogLevel = std::max(request.logLevel, fixwell::OVLog::error);
     options.shownLogLevel = request.logLevel;
     options.capabilities = [this](std::string_view type) {
-        return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type), false};
+        return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type),
+                                      library_.canVerifyLive(type)};
     };
     options.errorText = [this](fixwell::ErrorCode code) {
         return pellar::errorText(code, libraryTexts_);
@@ -158,6 +159,11 @@ void Session::detach(const DiskPointer& topLevelDisk)
 {
     if (topLevelDisk)
         host_.sharedDiskController().ejectDisk(topLevelDisk, true);
+}
+
+std::string Session::reasonAgainstLive(const Disk& disk) const
+{
+    return library_.reasonAgainstLive(disk.facts().filesystem);
 }
 
 std::string Session::reasonAgainstPartitionMap(const DiskPointer& disk) const

@@ -41,6 +41,8 @@ public:
     void detach(const DiskPointer& topLevelDisk);
     /// Why the library cannot treat the disk's partition map; empty when it can.
     std::string reasonAgainstPartitionMap(const DiskPointer& disk) const;
+    /// Why the library cannot verify the disk while it is in use; empty when it can.
+    std::string reasonAgainstLive(const Disk& disk) const;
 
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);

@@ -133,7 +133,7 @@ void JobLog::endOfRun()
     for (const ProblemLimiter::Remainder& rest : problems_.takeRemainders()) {
         const bool isVarious = rest.kind.empty();
         Dictionary line = message(fixwell::kFsckError,
-                                  texts_.text(isVarious ? "… and %1$@ more problems of other kinds"
+                                  texts_.text(isVarious ? "… and more problems of other kinds: %1$@"
                                                         : "… and %1$@ more like “%2$@”"),
                                   errorLevel);
         line.set(fixwell::kFsckParameters,

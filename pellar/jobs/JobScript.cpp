@@ -5,6 +5,7 @@
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/Obstacles.h"
+#include "pellar/jobs/OutcomeReport.h"
 #include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
@@ -51,7 +52,7 @@ void JobScript::run()
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
     giveDiskBack();
-    report();
+    tellOutcome(outcome_, operation_, texts_, log_);
 }
 
 JobScript::State JobScript::next(State state)
@@ -314,21 +315,6 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
     if (!claim_->isStillInPlace())
         return lost("the disk was deleted, moved or replaced meanwhile");
     return judgement;
-}
-
-void JobScript::report()
-{
-    const std::string message = messageOf(outcome_, operation_, log_.diskName(), texts_);
-    const bool isUnanswered =
-        outcome_.verdict == Verdict::Failed || outcome_.verdict == Verdict::Inconclusive;
-    if (isUnanswered)
-        log_.failure(message);
-    else if (!outcome_.reason.isEmpty())
-        log_.remark(message);
-    log_.verdict(outcome_.verdict,
-                 operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite);
-    log_.trace("result: " + std::string(nameOf(outcome_.verdict).text()) + ": " + message);
-    log_.finished(outcome_.code, outcome_.detail, nameOf(outcome_.verdict), message);
 }
 
 }  // namespace pellar

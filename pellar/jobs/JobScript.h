@@ -64,7 +64,6 @@ private:
     Outcome withoutTool() const;
     RunEvidence runOnce(Access access);
     Judgement judge(const RunEvidence& evidence) const;
-    void report();
 
     std::optional<DiskClaim> claim_;  ///< none once the disk has been given back
     std::vector<MountPlace> mounts_;

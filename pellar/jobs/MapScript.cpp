@@ -188,9 +188,12 @@ void MapScript::tellMap(const PartitionMap& map)
                               : valid != nullptr
                                   ? usedEntries(valid->entries, valid->header.header).size()
                                   : 0;
-    step({isGPT ? "GUID partition table, %1$@ partitions, sectors of %2$@ bytes"
-                : "MBR partition table, %1$@ partitions, sectors of %2$@ bytes",
-          std::to_string(count), std::to_string(map.sectorBytes)},
+    const std::string sector = std::to_string(map.sectorBytes);
+    step(isGPT
+             ? sentenceAbout(count, "GUID partition table, %1$@ partition, sectors of %2$@ bytes",
+                             "GUID partition table, %1$@ partitions, sectors of %2$@ bytes", sector)
+             : sentenceAbout(count, "MBR partition table, %1$@ partition, sectors of %2$@ bytes",
+                             "MBR partition table, %1$@ partitions, sectors of %2$@ bytes", sector),
          30);
 }
 

@@ -214,11 +214,11 @@ void PermissionsScript::tell(const Tally& tally)
         log_.remark(log_.text(sentence));
     tellWhatIsMissing(tally);
     if (tally.missing > 0)
-        log_.detail(
-            log_.text(Sentence{"%1$@ files are not there.", std::to_string(tally.missing), {}}));
+        log_.detail(log_.text(
+            sentenceAbout(tally.missing, "%1$@ file is not there.", "%1$@ files are not there.")));
     if (restored_ > 0)
-        log_.remark(
-            log_.text(Sentence{"%1$@ files were set right.", std::to_string(restored_), {}}));
+        log_.remark(log_.text(
+            sentenceAbout(restored_, "%1$@ file was set right.", "%1$@ files were set right.")));
 }
 
 // Only the running system's apt knows where archives come from.

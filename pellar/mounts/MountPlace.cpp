@@ -37,6 +37,12 @@ void forEachMount(const SystemPaths& paths, const std::function<void(libmnt_fs&)
         visit(*mount);
 }
 
+bool isIn(std::string_view path, std::string_view directory)
+{
+    return path.starts_with(directory) &&
+           (directory == "/" || path.size() == directory.size() || path[directory.size()] == '/');
+}
+
 bool isOn(libmnt_fs& mount, dev_t device)
 {
     if (mnt_fs_get_devno(&mount) == device)
@@ -67,6 +73,22 @@ std::vector<MountPlace> mountPlacesOf(const std::filesystem::path& node, const S
     if (::stat(node.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return {};
     return mountPlacesOf(status.st_rdev, paths);
+}
+
+bool holdsDirectory(const std::vector<MountPlace>& places, const std::filesystem::path& directory,
+                    const SystemPaths& paths)
+{
+    std::error_code ignored;
+    const std::string path = std::filesystem::weakly_canonical(directory, ignored);
+    std::string holder;  // of several the deepest, and of these the last, which lies on top
+    forEachMount(paths, [&](libmnt_fs& mount) {
+        const std::string target = textOf(mnt_fs_get_target(&mount));
+        if (isIn(path, target) && target.size() >= holder.size())
+            holder = target;
+    });
+    return !holder.empty() &&
+           std::any_of(places.begin(), places.end(),
+                       [&](const MountPlace& place) { return place.target == holder; });
 }
 
 std::vector<std::string> mountsBelow(std::string_view directory, const SystemPaths& paths)

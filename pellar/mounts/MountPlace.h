@@ -34,6 +34,10 @@ struct MountPlace {
 [[nodiscard]] std::vector<MountPlace> mountPlacesOf(const std::filesystem::path& node,
                                                     const SystemPaths& paths);
 
+/// Whether the directory lies on what is mounted at one of the places.
+[[nodiscard]] bool holdsDirectory(const std::vector<MountPlace>& places,
+                                  const std::filesystem::path& directory, const SystemPaths& paths);
+
 /// Where something else is mounted below the directory.
 [[nodiscard]] std::vector<std::string> mountsBelow(std::string_view directory,
                                                    const SystemPaths& paths);

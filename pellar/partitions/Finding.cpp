@@ -40,7 +40,7 @@ constexpr std::array findings{
                  "The list of partitions in the backup copy is damaged: its checksum is wrong."},
     KnownFinding{BackupNotAtEnd, Repairable,
                  "The backup copy of the partition map is not at the end of the disk: the disk has "
-                 "grown by %1$@ sectors."},
+                 "grown. Sectors behind it: %1$@."},
     KnownFinding{CopiesDiffer, Repairable, "The two copies of the partition map differ."},
     KnownFinding{NoValidCopy, NeedsPerson, "Neither copy of the partition map is valid."},
     KnownFinding{DiskCut, NeedsPerson,
@@ -83,7 +83,7 @@ constexpr std::array findings{
     KnownFinding{ChainLoop, NeedsPerson, "The chain of logical partitions runs in a circle."},
     KnownFinding{ChainTooLong, NeedsPerson,
                  "The chain of logical partitions is too long to be true."},
-    KnownFinding{More, Note, "… and %1$@ more problems of the partition map"},
+    KnownFinding{More, Note, "… and more problems of the partition map: %1$@"},
 };
 
 const KnownFinding& known(FindingKind kind)

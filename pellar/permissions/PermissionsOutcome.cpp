@@ -46,10 +46,9 @@ Outcome outcomeOfPermissionsVerification(const Tally& tally)
     if (tally.compared == 0)
         return nothingCompared();
     if (tally.differing > 0)
-        return {Verdict::Damaged,
-                fixwell::kPLNoError,
-                0,
-                {"those of %1$@ files differ", std::to_string(tally.differing), {}}};
+        return {Verdict::Damaged, fixwell::kPLNoError, 0,
+                sentenceAbout(tally.differing, "those of %1$@ file differ",
+                              "those of %1$@ files differ")};
     return withoutDifferences(tally);
 }
 
@@ -58,15 +57,12 @@ Outcome outcomeOfPermissionsRepair(const Tally& afterwards, std::uint64_t restor
     if (afterwards.compared == 0)
         return nothingCompared();
     if (afterwards.differing > 0)
-        return {Verdict::Damaged,
-                kPLErrorPermissionsNotRepaired,
-                0,
-                {"those of %1$@ files still differ", std::to_string(afterwards.differing), {}}};
+        return {Verdict::Damaged, kPLErrorPermissionsNotRepaired, 0,
+                sentenceAbout(afterwards.differing, "those of %1$@ file still differ",
+                              "those of %1$@ files still differ")};
     if (restored > 0)
-        return {Verdict::Repaired,
-                fixwell::kPLNoError,
-                0,
-                {"%1$@ files were set right", std::to_string(restored), {}}};
+        return {Verdict::Repaired, fixwell::kPLNoError, 0,
+                sentenceAbout(restored, "%1$@ file was set right", "%1$@ files were set right")};
     return withoutDifferences(afterwards);
 }
 

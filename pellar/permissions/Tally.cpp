@@ -15,22 +15,25 @@ void Tally::count(Unseen unseen)
 
 std::vector<Sentence> sentencesOf(const Tally& tally)
 {
-    std::vector<Sentence> sentences{
-        {"%1$@ files were compared with what their packages say; %2$@ "
-         "differ.",
-         std::to_string(tally.compared), std::to_string(tally.differing)}};
-    const auto add = [&sentences](std::uint64_t count, std::string_view key) {
+    std::vector<Sentence> sentences{sentenceAbout(
+        tally.compared, "%1$@ file was compared with what its package says. Different: %2$@.",
+        "%1$@ files were compared with what their packages say. Different: %2$@.",
+        std::to_string(tally.differing))};
+    const auto add = [&sentences](std::uint64_t count, std::string_view one,
+                                  std::string_view many) {
         if (count > 0)
-            sentences.push_back({key, std::to_string(count), {}});
+            sentences.push_back(sentenceAbout(count, one, many));
     };
     add(tally.withoutSource,
+        "%1$@ file was not compared: it is not known here what permissions its package gives it.",
         "%1$@ files were not compared: it is not known here what permissions their packages give "
         "them.");
     add(tally.undecided,
+        "%1$@ file is undecided: the system may rightly have changed it after its installation.",
         "%1$@ files are undecided: the system may rightly have changed them after their "
         "installation.");
-    add(tally.unreachable, "%1$@ files could not be reached.");
-    add(tally.elsewhere, "%1$@ files are on another volume.");
+    add(tally.unreachable, "%1$@ file could not be reached.", "%1$@ files could not be reached.");
+    add(tally.elsewhere, "%1$@ file is on another volume.", "%1$@ files are on another volume.");
     return sentences;
 }
 

@@ -94,6 +94,9 @@ private:
         if (request_.silenceLimit > 0ms && !ladder_.isStopping())
             due = std::min(due.value_or(Clock::time_point::max()),
                            lastHeard_ + request_.silenceLimit);
+        if (request_.longestTick > 0ms)
+            due = std::min(due.value_or(Clock::time_point::max()),
+                           Clock::now() + request_.longestTick);
         if (!due)
             return -1;
         const auto left = std::chrono::ceil<std::chrono::milliseconds>(*due - Clock::now());

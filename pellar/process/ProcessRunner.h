@@ -48,6 +48,8 @@ struct RunRequest {
     OutputLimits limits;
     std::chrono::milliseconds silenceLimit{0};  ///< none when 0
     GraceTimes graceTimes;
+    /// The listener's `tick` comes at least so often; 0 for only when something happens.
+    std::chrono::milliseconds longestTick{0};
     /// It holds its output back unless that is a terminal. A pipe where there are none.
     bool wantsTerminal = false;
     /// It would leave the disk half written if it were asked to end.

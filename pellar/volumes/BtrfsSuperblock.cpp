@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/volumes/BtrfsSuperblock.h"
 
+#include <algorithm>
+
 namespace pellar {
 
 std::optional<BtrfsSuperblock> parseBtrfsSuperblock(Bytes bytes, std::uint64_t place)
@@ -9,6 +11,7 @@ std::optional<BtrfsSuperblock> parseBtrfsSuperblock(Bytes bytes, std::uint64_t p
         littleEndian(bytes, 48, 8) != place)
         return std::nullopt;
     BtrfsSuperblock block;
+    std::copy_n(bytes.begin() + 32, block.id.size(), block.id.begin());
     block.hasLog = littleEndian(bytes, 96, 8) != 0;
     block.disks = littleEndian(bytes, 136, 8);
     block.diskBytes = littleEndian(bytes, 209, 8);

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/volumes/BtrfsId.h"
 #include "pellar/volumes/DiskBytes.h"
 
 namespace pellar {
@@ -10,6 +11,7 @@ namespace pellar {
 struct BtrfsSuperblock {
     static constexpr std::size_t size = 4096;
 
+    BtrfsId id{};
     std::uint64_t diskBytes = 0;  ///< of this one disk
     std::uint64_t disks = 0;      ///< that the volume is made of
     bool hasLog = false;          ///< changes that only a mount brings to their place

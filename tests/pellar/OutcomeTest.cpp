@@ -86,6 +86,17 @@ TEST(Outcome, SaysSoWhenOnlyTheJournalWasReplayed)
     EXPECT_EQ(message(true), "repaired “%2$@”: no damage is left");
 }
 
+TEST(Sentence, HasAFormOfItsOwnForOne)
+{
+    const test::EnglishTexts texts;
+    const auto said = [&texts](std::uint64_t count) {
+        return sentenceAbout(count, "%1$@ file of %2$@", "%1$@ files of %2$@", "1").in(texts);
+    };
+    EXPECT_EQ(said(0), "0 files of 1");
+    EXPECT_EQ(said(1), "1 file of 1");
+    EXPECT_EQ(said(11), "11 files of 1");
+}
+
 TEST(ErrorTexts, EveryCodeHasItsOwn)
 {
     const test::EnglishTexts texts;

@@ -30,6 +30,19 @@ std::string zeros(std::size_t count)
     return std::string(count, '\0');
 }
 
+TEST_F(PartitionMapTest, IsNamedWhereNothingElseInAnImageCanBeChecked)
+{
+    const auto disk = makeDisk("disk.img");
+    const auto pointer = [this] {
+        const RunResult result = run({"verify", "disk.img"});
+        return result.errors.find("“disk.img” has a partition map; --partition-map checks it");
+    };
+    EXPECT_EQ(pointer(), std::string::npos) << "its volume is checked";
+    patch(disk, 512, zeros(512));
+    patch(disk, 16 * mebibyte - 512, zeros(512));
+    EXPECT_NE(pointer(), std::string::npos) << "neither copy says where its volume is";
+}
+
 TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)
 {
     const auto disk = makeDisk("disk.img");

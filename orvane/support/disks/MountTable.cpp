@@ -55,6 +55,15 @@ std::optional<Mount> parseLine(const std::string& line)
         filesystem, unescaped(source), hasOption(options, "ro") || hasOption(superOptions, "ro")};
 }
 
+/// A device mapper's volume is mounted by its name, which is a link to its node.
+std::string nodeOf(const std::string& source)
+{
+    std::error_code error;
+    const auto node = source.starts_with("/dev/") ? std::filesystem::canonical(source, error)
+                                                  : std::filesystem::path();
+    return node.empty() || error ? source : node.native();
+}
+
 bool isWithin(std::string_view path, std::string_view directory)
 {
     return directory == "/" || path == directory ||
@@ -77,7 +86,10 @@ std::vector<Mount> currentMounts()
 {
     const auto contents = readWholeFile("/proc/self/mountinfo", 16U << 20U);
     const auto* const text = std::get_if<std::string>(&contents);
-    return text != nullptr ? parseMountInfo(*text) : std::vector<Mount>();
+    auto mounts = text != nullptr ? parseMountInfo(*text) : std::vector<Mount>();
+    for (Mount& mount : mounts)
+        mount.source = nodeOf(mount.source);
+    return mounts;
 }
 
 std::optional<Mount> mountOfDevice(const std::vector<Mount>& mounts, std::string_view device,

@@ -24,7 +24,8 @@ struct Mount {
 /// Lines that are no mounts are left out.
 [[nodiscard]] std::vector<Mount> parseMountInfo(std::string_view text);
 
-/// The mounts of this process now; none when they cannot be read.
+/// The mounts of this process now, with their devices' own nodes for sources, where the table names
+/// a link; none when they cannot be read.
 [[nodiscard]] std::vector<Mount> currentMounts();
 
 /// The mount that a device is known by: "/" when it is mounted there, else its first mount of the

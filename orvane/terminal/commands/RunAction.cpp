@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "fixwell/host/pellar/ErrorCodes.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
@@ -63,6 +64,26 @@ int settle(const NamedDisk& named, Session& session, Reporter& reporter)
     return exitUnchecked;
 }
 
+/// The disk, or something inside it, was of a kind that can be checked.
+bool wasUnderstood(const NamedDisk& named, Session& session)
+{
+    const auto& outcomes = session.jobs().outcomes();
+    return std::any_of(outcomes.begin(), outcomes.end(), [&named](const auto& outcome) {
+        return DiskNames::isWithin(outcome.first, named.disk->facts().identifier) &&
+               outcome.second.errorCode != fixwell::kPLErrorUnsupported;
+    });
+}
+
+/// Where nothing in an image could be checked, its partition map still can.
+void pointToMap(const NamedDisk& named, Session& session, Reporter& reporter)
+{
+    const bool wasTried = !session.wasStopped() && !session.wasDeclined();
+    if (wasTried && named.disk->isOfflineDiskImage() && !wasUnderstood(named, session) &&
+        session.reasonAgainstPartitionMap(named.disk).empty())
+        reporter.warning(session.host().translator().sentence(
+            "“%@” has a partition map; --partition-map checks it", {named.name}));
+}
+
 int treat(const std::vector<NamedDisk>& wanted, const ActionButton& action, Session& session,
           Reporter& reporter)
 {
@@ -72,8 +93,10 @@ int treat(const std::vector<NamedDisk>& wanted, const ActionButton& action, Sess
         return status;
     session.select(selectionOf(disks));
     session.pressAndWait(session.button(action.outlet));
-    for (const NamedDisk& named : disks)
+    for (const NamedDisk& named : disks) {
         status |= settle(named, session, reporter);
+        pointToMap(named, session, reporter);
+    }
     return status;
 }
 

@@ -1,0 +1,185 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/LiveScript.h"
+
+#include "fixwell/host/foundation/UTF8.h"
+#include "fixwell/host/pellar/MessageKeys.h"
+#include "pellar/jobs/DiskNaming.h"
+#include "pellar/jobs/OutcomeReport.h"
+#include "pellar/tools/LiveVerification.h"
+#include "pellar/volumes/BtrfsSuperblock.h"
+
+#include <fcntl.h>
+#include <sys/stat.h>
+
+#include <cerrno>
+#include <cstring>
+#include <utility>
+
+namespace pellar {
+namespace {
+
+using namespace std::chrono_literals;
+
+constexpr std::uint64_t anyBytes = ~std::uint64_t{0};
+
+Outcome failure(fixwell::ErrorCode code, Sentence reason)
+{
+    return {Verdict::Failed, code, 0, std::move(reason)};
+}
+
+}  // namespace
+
+LiveScript::LiveScript(fixwell::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+                       const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
+                       EventRoad& road)
+    : disk_(std::move(disk)),
+      mounts_(std::move(mounts)),
+      options_(options),
+      texts_(texts),
+      stop_(stop),
+      road_(road),
+      log_(*disk_, texts, road)
+{
+}
+
+void LiveScript::run()
+{
+    log_.started();
+    tellOutcome(verify(), Operation::Verify, texts_, log_);
+}
+
+Outcome LiveScript::verify()
+{
+    const Capability capability = liveCapabilityFor(mounts_.front().filesystem, options_.toolPath);
+    if (!capability.isGiven())
+        return failure(capability.error, capability.reason);
+    program_ = capability.program;
+    if (auto obstacle = findVolume())
+        return *std::move(obstacle);
+    const Judgement judgement = scrub();
+    tellFindings(judgement);
+    return outcomeOfVerification(judgement);
+}
+
+std::optional<Outcome> LiveScript::findVolume()
+{
+    if (const int error = reachVolume())
+        return failure(
+            fixwell::kPLErrorCannotOpen,
+            {"it is mounted, but could not be reached there: %1$@", ::strerrordesc_np(error), {}});
+    if (volume_->scrubbedBytes())
+        return failure(fixwell::kPLErrorToolFailed,
+                       {"another program is checking it just now", {}, {}});
+    return std::nullopt;
+}
+
+// An errno. Something else may be mounted over a place, so what is found there is compared with the
+// disk.
+int LiveScript::reachVolume()
+{
+    device_ = FileDescriptor(::open(disk_->path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    if (!device_)
+        return errno;
+    const auto superblock = readBtrfsSuperblock(device_.get(), 0, anyBytes);
+    int error = ENODEV;
+    for (const MountPlace& place : mounts_) {
+        auto opened = MountedBtrfs::open(place.target);
+        if (const int* const openError = std::get_if<int>(&opened)) {
+            error = *openError;
+        } else if (superblock && std::get<MountedBtrfs>(opened).id() == superblock->id) {
+            volume_.emplace(std::get<MountedBtrfs>(std::move(opened)));
+            log_.trace("it is verified through " + fixwell::printable(place.target));
+            return 0;
+        }
+    }
+    return error;
+}
+
+Judgement LiveScript::scrub()
+{
+    const RunRequest run = request();
+    log_.trace("run: " + shown(run.command));
+    log_.step(fixwell::kFsckVerify,
+              log_.text({"Verifying “%1$@” while it stays mounted", log_.diskName(), {}}));
+    road_.flush();
+    storedBytes_ = volume_->storedBytes();
+    const RunResult result = runTool(run, stop_, *this);
+    Judgement judgement = judgeScrub(result, report_, volume_->disks());
+    if (judgement.verdict != Verdict::Stopped && !isStillThere())
+        judgement = {Verdict::Failed,
+                     fixwell::kPLErrorDiskChanged,
+                     judgement.detail,
+                     {"the disk became shorter or unreadable meanwhile", {}, {}},
+                     false};
+    return judgement;
+}
+
+// It gets time when the program is leaving, too: killed, an older kernel's scrub would go on, and
+// its process with it.
+RunRequest LiveScript::request() const
+{
+    RunRequest request;
+    request.command = {program_, scrubArguments(diskArgumentOfTool())};
+    request.disk = volume_->descriptor();
+    request.limits = options_.outputLimits;
+    request.graceTimes = graceTimesFor(Access::ReadWrite);
+    request.longestTick = 500ms;
+    return request;
+}
+
+/// NO when the device's name leads to no disk, or another one, or its beginning cannot be read.
+bool LiveScript::isStillThere() const
+{
+    struct stat before = {};
+    struct stat now = {};
+    if (::fstat(device_.get(), &before) != 0 || ::stat(disk_->path.c_str(), &now) != 0 ||
+        before.st_rdev != now.st_rdev)
+        return false;
+    const auto superblock = readBtrfsSuperblock(device_.get(), 0, anyBytes);
+    return superblock && superblock->id == volume_->id();
+}
+
+void LiveScript::tellFindings(const Judgement& judgement)
+{
+    for (const Sentence& finding : scrubFindings(report_))
+        log_.error(finding);
+    const bool hasReadAll =
+        judgement.verdict == Verdict::Sound || judgement.verdict == Verdict::Damaged;
+    if (hasReadAll && report_.withoutChecksum > 0)
+        log_.remark(log_.text({"Blocks of files that have no checksum to be compared with: %1$@",
+                               std::to_string(report_.withoutChecksum),
+                               {}}));
+    if (judgement.verdict == Verdict::Sound)
+        log_.remark(log_.text(
+            "Everything that has a checksum agrees with it, in every copy. Whether the "
+            "parts of the file system agree with each other shows only when it is verified "
+            "unmounted, from a rescue system."));
+}
+
+void LiveScript::line(std::string_view line, bool)
+{
+    readScrubLine(line, report_);
+    const std::string text = withDiskName(line, log_.diskName());
+    if (line.starts_with("ERROR: "))
+        log_.problem(text);
+    else if (!line.empty())
+        log_.detail(text);
+}
+
+void LiveScript::stopAsked()
+{
+    isStopping_ = true;
+    volume_->cancelScrub();
+}
+
+void LiveScript::tick()
+{
+    if (isStopping_)  // the tool may have begun only after it was asked to end
+        volume_->cancelScrub();
+    const auto scrubbed = volume_->scrubbedBytes();
+    if (scrubbed && storedBytes_ > 0)
+        log_.progress(100.0 * static_cast<double>(*scrubbed) / static_cast<double>(storedBytes_));
+    road_.flushIfDue();
+}
+
+}  // namespace pellar

@@ -1,0 +1,64 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "fixwell/host/pellar/DiskReference.h"
+#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/Outcome.h"
+#include "pellar/jobs/Script.h"
+#include "pellar/mounts/MountPlace.h"
+#include "pellar/process/ProcessRunner.h"
+#include "pellar/tools/BtrfsScrub.h"
+#include "pellar/volumes/MountedBtrfs.h"
+
+#include <filesystem>
+#include <optional>
+#include <vector>
+
+namespace pellar {
+
+/// Verifies a btrfs volume that stays mounted, because the system or the user works on it: the
+/// kernel reads all of it and compares it with its checksums. Nothing is written to it. Needs
+/// root. The references outlive it.
+class LiveScript final : public Script, private RunListener {
+public:
+    /// `mounts` is where the disk is mounted, not empty.
+    LiveScript(fixwell::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+               const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
+               EventRoad& road);
+
+    void run() override;
+
+private:
+    Outcome verify();
+    std::optional<Outcome> findVolume();
+    int reachVolume();
+    bool isStillThere() const;
+    RunRequest request() const;
+    Judgement scrub();
+    void tellFindings(const Judgement& judgement);
+
+    void line(std::string_view line, bool isCut) override;
+    void progressLine(std::string_view) override {}
+    void lineLimitReached() override {}
+    void stopAsked() override;
+    void pause() override { road_.flush(); }
+    void tick() override;
+
+    const fixwell::DiskReferencePointer disk_;
+    const std::vector<MountPlace> mounts_;
+    const ManagerOptions& options_;
+    const Texts& texts_;
+    StopSwitch& stop_;
+    EventRoad& road_;
+    JobLog log_;
+
+    FileDescriptor device_;
+    std::optional<MountedBtrfs> volume_;
+    std::filesystem::path program_;
+    std::uint64_t storedBytes_ = 0;
+    ScrubReport report_;
+    bool isStopping_ = false;
+};
+
+}  // namespace pellar

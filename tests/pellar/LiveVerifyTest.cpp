@@ -1,0 +1,190 @@
+// SPDX-License-Identifier: Apache-2.0
+// Volumes that are verified while they stay mounted, on real loop devices. Needs root.
+
+#include "pellar/mounts/MountPlace.h"
+#include "pellar/process/Command.h"
+#include "pellar/volumes/MountedBtrfs.h"
+#include "tests/pellar/Workshop.h"
+#include "tests/support/LoopDevice.h"
+#include "tests/support/ScrubRecords.h"
+
+#include <gtest/gtest.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <fstream>
+
+namespace {
+
+using namespace pellar;
+
+namespace fs = std::filesystem;
+
+std::string bytesOf(const fs::path& file)
+{
+    std::string bytes(fs::file_size(file), '\0');
+    std::ifstream(file, std::ios::binary).read(bytes.data(), std::ssize(bytes));
+    return bytes;
+}
+
+/// A btrfs volume with one copy of its files and two of everything else, mounted as the place of
+/// the user's home.
+class LiveVerify : public testing::Test {
+protected:
+    static constexpr std::string_view fileText = "what stands in a file of its own";
+    static constexpr std::string_view leafText = "what stands between the names of files";
+
+    void SetUp() override
+    {
+        if (::geteuid() != 0)
+            GTEST_SKIP() << "mounting needs root";
+        workshop_.write("image", {});
+        fs::resize_file(image(), 128U << 20U);
+        if (findProgram("mkfs.btrfs", ManagerOptions().toolPath).empty())
+            GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
+        workshop_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
+        fs::create_directory(place());
+        if (!mount())
+            GTEST_SKIP() << "the system gives no loop device, or mounts no btrfs";
+        std::string contents(16U << 20U, 'x');
+        contents.replace(contents.size() / 2, fileText.size(), fileText);
+        std::ofstream(place() / "large") << contents;
+        std::ofstream(place() / "small") << leafText;  // so small that it stands in the tree
+        unmount();
+        ASSERT_TRUE(mount());
+    }
+    void TearDown() override
+    {
+        unmount();
+        orvane::test::forgetScrubsOf(image());
+    }
+
+    bool mount()
+    {
+        device_ = std::make_unique<orvane::test::LoopDevice>(image());
+        return !device_->name().empty() &&
+               ::mount(device_->name().c_str(), place().c_str(), "btrfs", MS_NOATIME, nullptr) == 0;
+    }
+    void unmount()
+    {
+        ::umount2(place().c_str(), MNT_DETACH);
+        device_.reset();
+    }
+
+    /// Where the text stands in the image; of two copies the second.
+    std::size_t placeOf(std::string_view text) const { return bytesOf(image()).rfind(text); }
+    /// Also the first of two copies when there are to be none left.
+    void damage(std::string_view text, bool everywhere)
+    {
+        unmount();
+        const std::string bytes = bytesOf(image());
+        std::fstream file(image(), std::ios::in | std::ios::out | std::ios::binary);
+        std::size_t at = bytes.rfind(text);
+        ASSERT_NE(at, std::string::npos);
+        for (; at != std::string::npos;
+             at = everywhere && at > 0 ? bytes.rfind(text, at - 1) : std::string::npos)
+            file.seekp(static_cast<std::streamoff>(at)) << '#';
+        file.close();
+        ASSERT_TRUE(mount());
+    }
+
+    /// The kernel then takes many seconds to read it.
+    bool slowDown() const
+    {
+        for (const auto& volume : fs::directory_iterator("/sys/fs/btrfs")) {
+            const fs::path disk = volume.path() / "devinfo/1";
+            std::error_code error;
+            if (fs::exists(volume.path() / "devices" / fs::path(device_->name()).filename(), error))
+                return static_cast<bool>(std::ofstream(disk / "scrub_speed_max") << "1m\n"
+                                                                                 << std::flush);
+        }
+        return false;
+    }
+
+    bool isScrubbed() const
+    {
+        const auto volume = MountedBtrfs::open(place());
+        return std::get<MountedBtrfs>(volume).scrubbedBytes().has_value();
+    }
+
+    fs::path image() const { return workshop_.path("image"); }
+    fs::path place() const { return workshop_.path("home"); }
+    fixwell::DiskReferencePointer disk() const { return test::reference(device_->name(), "btrfs"); }
+    std::unique_ptr<test::Bench> bench() const
+    {
+        ManagerOptions options;
+        options.homeDirectory = place();
+        return std::make_unique<test::Bench>(options);
+    }
+
+    test::Workshop workshop_;
+    std::unique_ptr<orvane::test::LoopDevice> device_;
+};
+
+TEST_F(LiveVerify, FindsDamageAndWritesNothing)
+{
+    struct Case {
+        std::string_view text;
+        bool everywhere;
+        const char* verdict;
+        const char* says;
+    };
+    for (const Case& c : {
+             Case{"", false, "sound", "no damage was found"},
+             Case{leafText, false, "damaged", "has another, good copy"},
+             Case{fileText, false, "damaged", "blocks without any good copy: 1;"},
+         }) {
+        if (!c.text.empty())
+            damage(c.text, c.everywhere);
+        const std::string before = bytesOf(image());
+        const auto bench = this->bench();
+        EXPECT_EQ(bench->verify(disk()), 0);
+        EXPECT_EQ(bench->listener.verdict, c.verdict) << bench->listener.message;
+        EXPECT_NE(bench->listener.message.find(c.says), std::string::npos)
+            << bench->listener.message;
+        EXPECT_TRUE(bytesOf(image()) == before) << c.says;
+        EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
+    }
+}
+
+TEST_F(LiveVerify, IsStoppedInTheKernelToo)
+{
+    if (!slowDown())
+        GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
+    const auto bench = this->bench();
+    ASSERT_EQ(bench->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+    ASSERT_TRUE(bench->loop.runUntil([&] { return !bench->listener.progress.empty(); }));
+    EXPECT_TRUE(isScrubbed());
+    bench->tool->cancelCurrentOperation();
+    ASSERT_TRUE(bench->loop.runUntil([&] { return bench->listener.finished == 1; }));
+    EXPECT_EQ(bench->listener.verdict, "stopped");
+    EXPECT_FALSE(isScrubbed());
+}
+
+TEST_F(LiveVerify, LeavesTheScrubOfOthersAlone)
+{
+    if (!slowDown())
+        GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
+    const auto other = bench();
+    ASSERT_EQ(other->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+    ASSERT_TRUE(other->loop.runUntil([&] { return !other->listener.progress.empty(); }));
+    const auto bench = this->bench();
+    bench->verify(disk());
+    EXPECT_EQ(bench->listener.verdict, "failed");
+    EXPECT_NE(bench->listener.message.find("another program is checking"), std::string::npos);
+    EXPECT_TRUE(isScrubbed());
+    other->tool->cancelCurrentOperation();
+    ASSERT_TRUE(other->loop.runUntil([&] { return other->listener.finished == 1; }));
+}
+
+TEST_F(LiveVerify, IsNotForAVolumeThatCanBeUnmounted)
+{
+    test::Bench bench;
+    bench.verify(disk());
+    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
+    EXPECT_TRUE(bench.listener.hasPlainLine("no error found")) << "as btrfs check ends";
+    EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty());
+}
+
+}  // namespace
