@@ -17,7 +17,7 @@ std::size_t leadingDigits(std::string_view text)
 
 std::string diskArgumentOfTool()
 {
-    return "/proc/self/fd/" + std::to_string(diskDescriptorOfTool);
+    return pathOfDescriptor(diskDescriptorOfTool);
 }
 
 std::string withDiskName(std::string_view line, std::string_view diskName)

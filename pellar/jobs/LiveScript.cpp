@@ -149,11 +149,11 @@ void LiveScript::tellFindings(const Judgement& judgement)
         log_.remark(log_.text({"Blocks of files that have no checksum to be compared with: %1$@",
                                std::to_string(report_.withoutChecksum),
                                {}}));
-    if (judgement.verdict == Verdict::Sound)
-        log_.remark(log_.text(
-            "Everything that has a checksum agrees with it, in every copy. Whether the "
-            "parts of the file system agree with each other shows only when it is verified "
-            "unmounted, from a rescue system."));
+    if (judgement.verdict != Verdict::Sound)
+        return;
+    log_.remark(log_.text("Everything that has a checksum agrees with it, in every copy."));
+    log_.remark(log_.text(
+        "Whether the parts of the file system agree with each other shows only unmounted."));
 }
 
 void LiveScript::line(std::string_view line, bool)

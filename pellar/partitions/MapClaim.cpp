@@ -24,7 +24,7 @@ bool isBlockDevice(int descriptor)
 /// held exclusively: the kernel refuses that while a part of it is mounted or otherwise in use.
 FileDescriptor openClaimed(const DiskClaim& claim)
 {
-    const std::string name = "/proc/self/fd/" + std::to_string(claim.descriptor());
+    const std::string name = pathOfDescriptor(claim.descriptor());
     const int exclusive = isBlockDevice(claim.descriptor()) ? O_EXCL : 0;
     return FileDescriptor(::open(name.c_str(), O_RDWR | O_CLOEXEC | exclusive));
 }

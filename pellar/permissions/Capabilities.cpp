@@ -30,11 +30,6 @@ std::optional<std::string> textOf(cap_t capabilities)
 
 }  // namespace
 
-std::string pathOfDescriptor(int descriptor)
-{
-    return "/proc/self/fd/" + std::to_string(descriptor);
-}
-
 std::optional<std::string> canonicalCapabilities(const std::string& text)
 {
     if (text.empty())

@@ -16,8 +16,4 @@ namespace pellar {
 /// Sets them, or takes them away when `text` is empty. Answers 0 or errno.
 [[nodiscard]] int setCapabilities(int object, const std::string& text);
 
-/// The name by which a call that takes no O_PATH descriptor reaches the object itself
-/// (proc(5), /proc/pid/fd).
-std::string pathOfDescriptor(int descriptor);
-
 }  // namespace pellar

@@ -3,6 +3,7 @@
 
 #include "pellar/permissions/Capabilities.h"
 #include "pellar/permissions/Comparison.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <unistd.h>

@@ -75,12 +75,13 @@ FileDescriptor RootDirectory::openObject(const std::string& path) const
                       RESOLVE_BENEATH | RESOLVE_NO_SYMLINKS | RESOLVE_NO_XDEV);
 }
 
-// A pipe that lies where a file should be must not keep anybody waiting.
+// A pipe or a device that lies where a file should be is not opened: that alone may have effects.
 FileDescriptor RootDirectory::openFile(const std::string& path) const
 {
-    FileDescriptor file =
-        openWithin(directory_.get(), path, O_RDONLY | O_NONBLOCK | O_NOCTTY, RESOLVE_IN_ROOT);
-    return file && isRegular(file.get()) ? std::move(file) : FileDescriptor();
+    const FileDescriptor object = openWithin(directory_.get(), path, O_PATH, RESOLVE_IN_ROOT);
+    if (!object || !isRegular(object.get()))
+        return {};
+    return FileDescriptor(::open(pathOfDescriptor(object.get()).c_str(), O_RDONLY | O_CLOEXEC));
 }
 
 std::optional<std::string> RootDirectory::read(const std::string& path, std::size_t largest) const
@@ -107,7 +108,7 @@ std::vector<std::string> RootDirectory::names(const std::string& directory) cons
         openWithin(directory_.get(), directory, O_RDONLY | O_DIRECTORY, RESOLVE_IN_ROOT);
     std::vector<std::string> names;
     const std::unique_ptr<DIR, CloseDirectory> stream(
-        opened ? ::opendir(("/proc/self/fd/" + std::to_string(opened.get())).c_str()) : nullptr);
+        opened ? ::opendir(pathOfDescriptor(opened.get()).c_str()) : nullptr);
     while (const dirent* const entry = stream ? ::readdir(stream.get()) : nullptr)
         if (const std::string name = entry->d_name; name != "." && name != "..")
             names.push_back(name);

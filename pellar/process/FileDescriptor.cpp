@@ -12,6 +12,11 @@ void FileDescriptor::reset() noexcept
         ::close(std::exchange(descriptor_, -1));
 }
 
+std::string pathOfDescriptor(int descriptor)
+{
+    return "/proc/self/fd/" + std::to_string(descriptor);
+}
+
 std::optional<Pipe> makePipe()
 {
     int ends[2];

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <optional>
+#include <string>
 #include <utility>
 
 namespace pellar {
@@ -29,6 +30,10 @@ public:
 private:
     int descriptor_ = -1;
 };
+
+/// The name by which a call that takes no O_PATH descriptor reaches the object itself
+/// (proc(5), /proc/pid/fd).
+[[nodiscard]] std::string pathOfDescriptor(int descriptor);
 
 /// Both ends are closed on exec; the read end does not block.
 struct Pipe {

@@ -14,7 +14,7 @@ int replayLog(const std::string& filesystem, int device)
     const FileDescriptor context(::fsopen(filesystem.c_str(), FSOPEN_CLOEXEC));
     if (!context)
         return errno;
-    const std::string source = "/proc/self/fd/" + std::to_string(device);
+    const std::string source = pathOfDescriptor(device);
     if (::fsconfig(context.get(), FSCONFIG_SET_STRING, "source", source.c_str(), 0) != 0)
         return errno;
     // A copy of a volume has its UUID, and the volume itself may be mounted (xfs(5)).

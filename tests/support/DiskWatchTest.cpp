@@ -13,6 +13,9 @@
 #include <sys/mount.h>
 #include <unistd.h>
 
+#include <chrono>
+#include <thread>
+
 namespace orvane {
 namespace {
 
@@ -138,6 +141,9 @@ TEST_F(DiskWatchTest, ADeviceThatIsGivenAnotherImageIsAnotherDisk)
     if (before->facts().sequence == 0)
         GTEST_SKIP() << "this kernel does not number its disks";
     device.detach();
+    // Whoever looks at new disks may have it open for a moment longer.
+    for (int tries = 0; device.isAttached() && tries < 500; ++tries)
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
     device.attach(image_);
     read();
     ASSERT_NE(found(), nullptr);

@@ -54,6 +54,13 @@ public:
     /// Somebody else has detached it, and may have given the device to another.
     void forget() { number_ = -1; }
 
+    bool isAttached() const
+    {
+        const FileDescriptor device(::open(name().c_str(), O_RDONLY | O_CLOEXEC));
+        loop_info64 info = {};
+        return device && ::ioctl(device.get(), LOOP_GET_STATUS64, &info) == 0;
+    }
+
     /// Nothing happens when it is detached already.
     void detach()
     {
