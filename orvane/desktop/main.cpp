@@ -3,6 +3,7 @@
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/desktop/TerminationSignals.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
+#include "orvane/support/ProgramStart.h"
 #include "orvane/support/texts/Language.h"
 
 #include <QApplication>
@@ -69,6 +70,7 @@ bool asksForText(int argc, char** argv)
 
 int run(int argc, char** argv)
 {
+    setInheritanceRight();
     adoptUserLocale();
     // Where there is no display, the application object would end the program.
     if (asksForText(argc, argv))

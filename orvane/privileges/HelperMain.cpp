@@ -8,6 +8,7 @@
 
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/privileges/HelperJob.h"
+#include "orvane/support/ProgramStart.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Language.h"
 
@@ -48,6 +49,7 @@ std::optional<uid_t> userWhoAsked()
 // that asked. Nothing is inherited that a tool could trip over.
 void settle()
 {
+    setInheritanceRight();
     for (const int signal : {SIGINT, SIGHUP, SIGPIPE, SIGQUIT, SIGTSTP})
         std::signal(signal, SIG_IGN);
     ::clearenv();

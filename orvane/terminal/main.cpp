@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/ProgramStart.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
@@ -9,7 +10,6 @@
 #include "orvane/terminal/TextReporter.h"
 #include "orvane/terminal/commands/Commands.h"
 
-#include <fcntl.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -79,18 +79,9 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     }
 }
 
-/// A standard stream that was closed leaves its number to the next file that is opened, and what
-/// is printed would go there: into a disk image, say. What takes the place cannot be written.
-void keepStandardDescriptorsTaken()
-{
-    for (int number = STDIN_FILENO; number <= STDERR_FILENO; ++number)
-        if (::fcntl(number, F_GETFD) < 0)
-            static_cast<void>(::open("/dev/null", O_RDONLY));
-}
-
 int run(int argc, const char* const* argv)
 {
-    keepStandardDescriptorsTaken();
+    setInheritanceRight();
     adoptUserLocale();
     const auto read = readCommandLine(argc, argv);
     if (const auto* const ending = std::get_if<Ending>(&read)) {

@@ -4,6 +4,7 @@
 #include "orvane/privileges/AskingProgram.h"
 #include "orvane/privileges/AttachedRegion.h"
 #include "orvane/privileges/MountedSystem.h"
+#include "orvane/support/ProgramStart.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -13,6 +14,8 @@
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include <csignal>
 
 namespace orvane {
 namespace {
@@ -124,6 +127,30 @@ TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
         ASSERT_TRUE(std::holds_alternative<Undone>(attached)) << c.file;
         EXPECT_EQ(std::get<Undone>(attached).reason.key, c.reason) << c.file << c.mode;
     }
+}
+
+// What a library prints as root would otherwise go into the disk that is being repaired.
+TEST(ProgramStart, NoFileThatIsOpenedLaterTakesTheirPlace)
+{
+    for (const int closed : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+        EXPECT_TRUE(inChild([closed] {
+            for (int number = closed; number <= STDERR_FILENO; ++number)
+                ::close(number);
+            setInheritanceRight();
+            const FileDescriptor disk(::open("/dev/null", O_RDWR | O_CLOEXEC));
+            char byte = 0;
+            const bool isAtEnd = closed != STDIN_FILENO || ::read(STDIN_FILENO, &byte, 1) == 0;
+            return isAtEnd && disk.get() > STDERR_FILENO && ::write(STDERR_FILENO, "x", 1) < 0;
+        })) << closed;
+}
+
+TEST(ProgramStart, TheEndOfAChildIsLearntWhateverWasIgnored)
+{
+    EXPECT_TRUE(inChild([] {
+        ::signal(SIGCHLD, SIG_IGN);
+        setInheritanceRight();
+        return inChild([] { return true; });
+    }));
 }
 
 TEST(MountedSystem, NobodyElseCanChangeTheWay)
