@@ -53,9 +53,12 @@ TEST_F(DiskActionTest, AnImageIsAttachedMountedAndDetached)
               std::string::npos)
         << mounted.output;
 
-    const RunResult detached = run({"detach", image});
+    const RunResult detached = run({"detach", "--json", image});
     EXPECT_EQ(detached.status, 0) << detached.errors;
-    EXPECT_EQ(detached.output, "“Fotos” was detached.\n");
+    const auto done = Events(detached.output).named("done");
+    ASSERT_EQ(done.size(), 1U) << detached.output;
+    EXPECT_EQ(done.front()["disk"], image.native()) << "as the user named it";
+    EXPECT_EQ(done.front()["message"], "“Fotos” was detached.");
     device_.clear();
     EXPECT_EQ(run({"verify", image}).status, 0);
 }
@@ -63,6 +66,7 @@ TEST_F(DiskActionTest, AnImageIsAttachedMountedAndDetached)
 TEST_F(DiskActionTest, WhatCannotBeDoneIsSaidWithItsReason)
 {
     const auto image = makeVolume("volume.img");
+    write(path("short"), std::string(511, '\0'));
     struct Case {
         std::vector<std::string> words;
         std::string_view said;
@@ -72,6 +76,8 @@ TEST_F(DiskActionTest, WhatCannotBeDoneIsSaidWithItsReason)
              Case{{"eject", image}, "which has to be attached as a device first"},
              Case{{"detach", image}, "it is not an attached image"},
              Case{{"attach", "/dev/null"}, "it is no regular file"},
+             Case{{"attach", "/"}, "“/” as a device: it is no regular file"},
+             Case{{"attach", path("short")}, "too small to hold a disk"},
              Case{{"attach", path("missing")}, "No such file or directory"},
          }) {
         const RunResult result = run(c.words);

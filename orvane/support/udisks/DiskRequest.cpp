@@ -119,7 +119,7 @@ DiskRequest requestToAttach(const std::filesystem::path& image)
 {
     return {DiskAction::Attach,
             image.native(),
-            fixwell::printable(image.filename().native()),
+            fixwell::printable((image.has_filename() ? image.filename() : image).native()),
             {{DiskStep::Kind::Attach, image.native()}}};
 }
 

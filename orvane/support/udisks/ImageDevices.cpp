@@ -51,12 +51,29 @@ Refusal refusalToOpen(const std::filesystem::path& image, Access access, int err
     return {Refusal::Kind::Other, errorText(error)};
 }
 
+// Of less than a sector the system makes a device without any, which nobody finds again.
+bool canBeDisk(const struct stat& status)
+{
+    constexpr off_t sectorBytes = 512;
+    return S_ISREG(status.st_mode) && status.st_size >= sectorBytes;
+}
+
+/// Asked before it is opened, which some devices take for an order; and why it is refused is what
+/// it is, not how it may be opened.
+std::optional<Refusal> objectionTo(const std::filesystem::path& image)
+{
+    struct stat status = {};
+    if (::stat(image.c_str(), &status) != 0)
+        return Refusal{Refusal::Kind::Other, errorText(errno)};
+    return canBeDisk(status) ? std::nullopt : std::optional(Refusal{Refusal::Kind::IsNoImage, {}});
+}
+
 std::optional<Refusal> objectionTo(int file)
 {
     struct stat status = {};
     if (::fstat(file, &status) != 0)
         return Refusal{Refusal::Kind::Other, errorText(errno)};
-    if (!S_ISREG(status.st_mode) || status.st_size == 0)
+    if (!canBeDisk(status))
         return Refusal{Refusal::Kind::IsNoImage, {}};
     const auto device = pellar::loopDeviceOn(status.st_dev, status.st_ino, pellar::SystemPaths());
     return device.empty() ? std::nullopt : std::optional(Refusal{Refusal::Kind::Attached, device});
@@ -75,6 +92,8 @@ Answer<std::string> setUp(int file, Access access, const std::stop_token& stop)
 Answer<std::string> attachImage(const std::filesystem::path& image, Access access,
                                 const std::stop_token& stop)
 {
+    if (const auto objection = objectionTo(image))
+        return *objection;
     const int mode = access == Access::ReadOnly ? O_RDONLY : O_RDWR;
     const FileDescriptor file(::open(image.c_str(), mode | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
     if (!file)

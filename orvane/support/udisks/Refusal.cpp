@@ -94,7 +94,8 @@ std::string reasonText(const Refusal& refusal, const Translator& texts)
         case Kind::CannotEject: return texts.text("its drive does not eject");
         case Kind::IsImage:
             return texts.text("it is an image file, which has to be attached as a device first");
-        case Kind::IsNoImage: return texts.text("it is no regular file, or an empty one");
+        case Kind::IsNoImage:
+            return texts.text("it is no regular file, or too small to hold a disk");
         case Kind::IsWhole: return texts.text("it is a disk with volumes; name one of them");
         case Kind::IsNoLoop: return texts.text("it is not an attached image");
         case Kind::HasGone: return texts.text("it is no longer there");

@@ -27,7 +27,7 @@ struct Refusal {
         CannotEject,
         HoldsSystem,  ///< the system runs from it
         IsImage,      ///< a file, and no device
-        IsNoImage,    ///< an empty file, or no regular one
+        IsNoImage,    ///< less than a sector, or no regular file
         IsWhole,      ///< it has volumes, and is none
         IsNoLoop,     ///< a device that no image is behind
         HasGone,

@@ -18,8 +18,10 @@ struct NamedDisk {
 };
 
 /// Finds each disk; one that cannot be found is reported, and adds exitUnchecked to `status`.
+/// `meant` is asked what a name stands for here, if not for itself.
 std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session& session,
-                                 Reporter& reporter, int& status);
+                                 Reporter& reporter, int& status,
+                                 std::string (*meant)(const std::string& name) = nullptr);
 
 // Each answers the exit status.
 

@@ -89,10 +89,8 @@ int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Repo
 int runDiskAction(const Request& request, Session& session, Reporter& reporter)
 {
     int status = exitSound;
-    std::vector<std::string> names = request.disks;
-    if (request.command == Command::Detach)
-        std::transform(names.begin(), names.end(), names.begin(), deviceBehind);
-    for (const NamedDisk& named : findDisks(names, session, reporter, status))
+    const auto meant = request.command == Command::Detach ? deviceBehind : nullptr;
+    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status, meant))
         status |= doTo(named, textsOf(request.command), session, reporter);
     return status;
 }

@@ -117,11 +117,12 @@ int runAction(const Request& request, Session& session, Reporter& reporter)
 }
 
 std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session& session,
-                                 Reporter& reporter, int& status)
+                                 Reporter& reporter, int& status,
+                                 std::string (*meant)(const std::string& name))
 {
     std::vector<NamedDisk> disks;
     for (const std::string& name : names) {
-        auto found = session.findDisk(name);
+        auto found = session.findDisk(meant != nullptr ? meant(name) : name);
         if (failed(found)) {
             reporter.failure(name, failureMessage(found));
             status |= exitUnchecked;
