@@ -60,11 +60,27 @@ int call(const char* source, const MountCall& call, unsigned long flags, const c
                : errno;
 }
 
+/// All zero when there is nothing.
+struct statx statusOf(const std::string& path) noexcept
+{
+    struct statx status = {};
+    if (::statx(AT_FDCWD, path.c_str(), AT_NO_AUTOMOUNT, STATX_MNT_ID, &status) != 0)
+        status = {};
+    return status;
+}
+
+/// Its number, as in /proc/self/mountinfo; 0 from a kernel before 5.8 (statx(2)).
+std::uint64_t mountOf(const struct statx& status) noexcept
+{
+    return (status.stx_mask & STATX_MNT_ID) != 0 ? status.stx_mnt_id : 0;
+}
+
 }  // namespace
 
 MountCall mountCallFor(const MountPlace& place, const std::string& wholeTarget)
 {
-    MountCall call{place.source, place.target, place.filesystem, {}, 0, place.isBind()};
+    MountCall call{place.source,   place.target, place.filesystem, {}, 0,
+                   place.isBind(), place.parent};
     if (call.isBind)
         call.source = wholeTarget + place.root;
     setOptions(call, place.options);
@@ -84,11 +100,16 @@ int perform(const MountCall& mountCall) noexcept
     return call(nullptr, mountCall, MS_BIND | MS_REMOUNT | mountCall.flags, nullptr);
 }
 
-bool isMountRoot(const char* path) noexcept
+bool isMounted(const MountCall& call) noexcept
 {
-    struct statx status = {};
-    return ::statx(AT_FDCWD, path, AT_NO_AUTOMOUNT, 0, &status) == 0 &&
-           (status.stx_attributes & STATX_ATTR_MOUNT_ROOT) != 0;
+    const struct statx status = statusOf(call.target);
+    return (status.stx_attributes & STATX_ATTR_MOUNT_ROOT) != 0 &&
+           (call.below == 0 || mountOf(status) != call.below);
+}
+
+std::uint64_t mountShownAt(const std::string& path) noexcept
+{
+    return mountOf(statusOf(path));
 }
 
 }  // namespace pellar

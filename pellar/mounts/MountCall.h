@@ -3,6 +3,7 @@
 
 #include "pellar/mounts/MountPlace.h"
 
+#include <cstdint>
 #include <string>
 
 namespace pellar {
@@ -16,6 +17,7 @@ struct MountCall {
     std::string data;         ///< the file system's own options
     unsigned long flags = 0;  ///< of mount(2)
     bool isBind = false;
+    std::uint64_t below = 0;  ///< the mount that shows at the target when this one is gone
 
     friend bool operator==(const MountCall&, const MountCall&) = default;
 };
@@ -29,7 +31,11 @@ struct MountCall {
 /// (signal-safety(7)).
 [[nodiscard]] int perform(const MountCall& call) noexcept;
 
-/// Whether something is mounted right at this path (statx(2), STATX_ATTR_MOUNT_ROOT). As `perform`.
-[[nodiscard]] bool isMountRoot(const char* path) noexcept;
+/// Whether it is mounted (still, or again): something is, and it is not what lay below. As
+/// `perform`.
+[[nodiscard]] bool isMounted(const MountCall& call) noexcept;
+
+/// Which mount shows at the path, by the kernel's number; 0 when it is not known.
+[[nodiscard]] std::uint64_t mountShownAt(const std::string& path) noexcept;
 
 }  // namespace pellar

@@ -51,7 +51,7 @@ void mountWhenFree(const MountCall& call) noexcept
 {
     constexpr int attempts = 24 * 60 * 60 * 5;
     constexpr timespec pause{0, 200'000'000};
-    for (int attempt = 0; attempt < attempts && !isMountRoot(call.target.c_str()); ++attempt) {
+    for (int attempt = 0; attempt < attempts && !isMounted(call); ++attempt) {
         if (isFree(call) && perform(call) != EBUSY)
             return;
         ::nanosleep(&pause, nullptr);

@@ -21,6 +21,12 @@ std::string textOf(const char* text)
     return text != nullptr ? text : "";
 }
 
+/// 0 where the library answers a failure.
+std::uint64_t numberOf(int id)
+{
+    return id > 0 ? static_cast<std::uint64_t>(id) : 0;
+}
+
 /// Every entry, in the kernel's order, with libmount's notes about the options that are no
 /// kernel's (/run/mount/utab).
 void forEachMount(const SystemPaths& paths, const std::function<void(libmnt_fs&)>& visit)
@@ -62,7 +68,9 @@ std::vector<MountPlace> mountPlacesOf(dev_t device, const SystemPaths& paths)
         if (isOn(mount, device))
             places.push_back({textOf(mnt_fs_get_source(&mount)), textOf(mnt_fs_get_target(&mount)),
                               textOf(mnt_fs_get_root(&mount)), textOf(mnt_fs_get_fstype(&mount)),
-                              mountableOptions(textOf(mnt_fs_get_options(&mount)))});
+                              mountableOptions(textOf(mnt_fs_get_options(&mount))),
+                              numberOf(mnt_fs_get_id(&mount)),
+                              numberOf(mnt_fs_get_parent_id(&mount))});
     });
     return places;
 }

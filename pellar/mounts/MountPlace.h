@@ -5,9 +5,11 @@
 
 #include <sys/types.h>
 
+#include <cstdint>
 #include <filesystem>
 #include <string>
 #include <string_view>
+#include <tuple>
 #include <vector>
 
 namespace pellar {
@@ -18,11 +20,18 @@ struct MountPlace {
     std::string target;
     std::string root;  ///< what of the file system is mounted; "/" unless it is a bind mount
     std::string filesystem;
-    std::string options;  ///< as mount(8) takes them
+    std::string options;       ///< as mount(8) takes them
+    std::uint64_t id = 0;      ///< the kernel's number of this mount; 0 when it is not known
+    std::uint64_t parent = 0;  ///< of the one that it lies on
 
     bool isBind() const { return root != "/" && filesystem != "btrfs"; }
 
-    friend bool operator==(const MountPlace&, const MountPlace&) = default;
+    /// Mounted in the same way; the numbers are new each time.
+    friend bool operator==(const MountPlace& left, const MountPlace& right)
+    {
+        return std::tie(left.source, left.target, left.root, left.filesystem, left.options) ==
+               std::tie(right.source, right.target, right.root, right.filesystem, right.options);
+    }
 };
 
 /// Where a block device's file system is mounted, in the order in which it was. Also of a file

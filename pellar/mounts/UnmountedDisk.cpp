@@ -84,7 +84,16 @@ std::string wholeTargetOf(const std::vector<MountPlace>& places)
     return whole != places.end() ? whole->target : std::string();
 }
 
-/// Why it could not be mounted again as it is; nothing when it could.
+/// Who unmounts such a place by its path unmounts the other.
+bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places)
+{
+    const std::uint64_t shown = mountShownAt(place.target);
+    return shown != 0 && std::none_of(places.begin(), places.end(), [shown](const auto& ours) {
+               return ours.id == 0 || ours.id == shown;
+           });
+}
+
+/// Why it could not be unmounted, or mounted again as it is; nothing when it could.
 Sentence objectionTo(const std::vector<MountPlace>& places)
 {
     const bool isWhole = !wholeTargetOf(places).empty();
@@ -92,6 +101,11 @@ Sentence objectionTo(const std::vector<MountPlace>& places)
         if (place.filesystem.starts_with("fuse") || !isWhole)
             return {"it is mounted at “%1$@” in a way that could not be put back (%2$@)",
                     fixwell::printable(place.target), fixwell::printable(place.filesystem)};
+    for (const MountPlace& place : places)
+        if (isCovered(place, places))
+            return {"it is mounted at “%1$@”, and something else over it",
+                    fixwell::printable(place.target),
+                    {}};
     return {};
 }
 

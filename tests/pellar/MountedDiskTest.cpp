@@ -153,6 +153,39 @@ TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
     EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
 }
 
+// By its path, one would unmount the other disk.
+TEST_F(MountedDisk, WhatLiesOverItIsLeftAlone)
+{
+    ASSERT_EQ(::mount("tmpfs", place().c_str(), "tmpfs", 0, nullptr), 0);
+    std::ofstream(place() / "kept") << "x";
+    test::Bench bench;
+    EXPECT_EQ(bench.verify(disk()), 0);
+    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorCouldNotUnmount);
+    EXPECT_NE(bench.listener.message.find("something else over it"), std::string::npos)
+        << bench.listener.message;
+    EXPECT_TRUE(fs::exists(place() / "kept"));
+    EXPECT_EQ(mounts(), before_);
+    ::umount(place().c_str());
+}
+
+TEST_F(MountedDisk, IsMountedAgainOverWhatLiesBelowWhenTheProgramIsKilled)
+{
+    const fs::path covered = workshop_.path("covered");
+    fs::create_directory(covered);
+    ASSERT_EQ(::mount("tmpfs", covered.c_str(), "tmpfs", 0, nullptr), 0);
+    ASSERT_EQ(::mount(device_->name().c_str(), covered.c_str(), "ext4", 0, nullptr), 0);
+    before_ = mounts();
+    ManagerOptions options;
+    options.toolPath = workshop_.fakeTools("wait");
+    OtherProgram verification(options, disk(), false);
+    EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
+    verification.kill();
+    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
+    for (const MountPlace& place : mounts())
+        ::umount2(place.target.c_str(), MNT_DETACH);
+    ::umount(covered.c_str());
+}
+
 TEST_F(MountedDisk, NobodyIsLeftWatchingAfterTheJob)
 {
     test::Bench bench;

@@ -3,6 +3,7 @@
 
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/MountedAt.h"
+#include "pellar/mounts/MountCall.h"
 #include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
@@ -48,6 +49,13 @@ int errorOf(const Context& context, int answer)
                    : 0;
     const int error = mnt_context_get_syscall_errno(context.get());
     return error != 0 ? error : answer < 0 ? -answer : EINVAL;
+}
+
+/// Whether another mount lies over it, which would be unmounted in its stead.
+bool isCovered(const pellar::MountPlace& place)
+{
+    const std::uint64_t shown = pellar::mountShownAt(place.target);
+    return shown != 0 && place.id != 0 && shown != place.id;
 }
 
 /// Where the table says that the device belongs; empty where it says nothing. The cache knows
@@ -100,6 +108,8 @@ Answer<> unmount(const std::string& node)
         const Context context(mnt_new_context());
         if (!context)
             return answerOf(ENOMEM);
+        if (isCovered(places.back()))
+            return answerOf(EBUSY);
         mnt_context_set_target(context.get(), places.back().target.c_str());
         if (const int error = errorOf(context, mnt_context_umount(context.get())))
             return answerOf(error);
