@@ -81,15 +81,15 @@ protected:
     {
         if (const char* const obstacle = test::LoopDevice::obstacle())
             GTEST_SKIP() << obstacle;
-        ASSERT_EQ(
-            test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "watched", image_, "8M"}), 0);
+        ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label_, image_, "8M"}),
+                  0);
         ASSERT_FALSE(failed(watch_.start()));
     }
 
     void read() { disks_.synchronize(readSystemDisks(DiskSources())); }
     std::shared_ptr<Disk> found()
     {
-        return disks_.find([](const Disk& disk) { return disk.facts().label == "watched"; });
+        return disks_.find([this](const Disk& disk) { return disk.facts().label == label_; });
     }
     bool waitUntil(const std::function<bool()>& isDone)
     {
@@ -101,6 +101,8 @@ protected:
 
     const TemporaryDirectory directory_;
     const std::string image_ = directory_ / "watched.img";
+    /// Another test of these may run at the same time.
+    const std::string label_ = "watched" + std::to_string(::getpid());
     MainLoop loop_;
     Notifications center_;
     DiskController disks_{center_, {[](std::string_view) {
