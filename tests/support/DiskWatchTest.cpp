@@ -147,6 +147,8 @@ TEST_F(DiskWatchTest, ADeviceThatIsGivenAnotherImageIsAnotherDisk)
     for (int tries = 0; device.isAttached() && tries < 500; ++tries)
         std::this_thread::sleep_for(std::chrono::milliseconds(10));
     device.attach(image_);
+    if (device.name().empty())
+        GTEST_SKIP() << "another program has taken the device";
     read();
     ASSERT_NE(found(), nullptr);
     EXPECT_NE(found(), before) << "though all that can be read of it is the same";

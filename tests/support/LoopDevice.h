@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <string>
+#include <utility>
 
 namespace orvane::test {
 
@@ -47,12 +48,17 @@ public:
     {
         const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
         const FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
-        if (!device || !file || ::ioctl(device.get(), LOOP_SET_FD, file.get()) != 0)
+        isOurs_ = device && file && ::ioctl(device.get(), LOOP_SET_FD, file.get()) == 0;
+        if (!isOurs_)
             number_ = -1;
     }
 
     /// Somebody else has detached it, and may have given the device to another.
-    void forget() { number_ = -1; }
+    void forget()
+    {
+        number_ = -1;
+        isOurs_ = false;
+    }
 
     bool isAttached() const
     {
@@ -61,9 +67,11 @@ public:
         return device && ::ioctl(device.get(), LOOP_GET_STATUS64, &info) == 0;
     }
 
-    /// Nothing happens when it is detached already.
+    /// Nothing happens when it is detached already: it may be another test's by now.
     void detach()
     {
+        if (!std::exchange(isOurs_, false))
+            return;
         const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
         if (device)
             ::ioctl(device.get(), LOOP_CLR_FD);
@@ -71,6 +79,7 @@ public:
 
 private:
     int number_ = -1;
+    bool isOurs_ = false;
 };
 
 }  // namespace orvane::test
