@@ -2,9 +2,7 @@
 #include "pellar/ErrorTexts.h"
 
 #include "fixwell/host/foundation/Format.h"
-#include "pellar/jobs/RightsErrorCodes.h"
-#include "pellar/partitions/MapErrorCodes.h"
-#include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/ErrorCodes.h"
 
 #include <algorithm>
 #include <array>
@@ -29,6 +27,9 @@ constexpr std::array texts{
               "The disk is in use by the running system and cannot be checked now."},
     ErrorText{fixwell::kOVErrorDiskInUse, "The disk is in use and cannot be checked now."},
     ErrorText{fixwell::kPLErrorDamaged, "The volume is damaged; use Repair Disk."},
+    ErrorText{kPLErrorDamagedForGood,
+              "The volume is damaged, and this kind of volume is not repaired here; copy what "
+              "matters to another disk."},
     ErrorText{fixwell::kPLErrorNotRepaired, "The volume is still damaged after the repair."},
     ErrorText{fixwell::kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},

@@ -3,6 +3,7 @@
 
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/WindowState.h"
+#include "orvane/jobs/HostReasons.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "pellar/ErrorTexts.h"
 
@@ -200,6 +201,20 @@ void DesktopSession::selectionChanged()
     for (std::size_t i = 0; i < tabs_.size(); ++i)
         window_.tabs().setTabEnabled(static_cast<int>(i), tabs_[i]->isOffered());
     updateTabs();
+    tellWhyNot();
+}
+
+// A button that is grey has no words for a disk that the module knows nothing about.
+void DesktopSession::tellWhyNot()
+{
+    ModuleTab* const tab = activeTab();
+    EmptyNote* const note =
+        tab != nullptr && tab->interface() != nullptr ? tab->interface()->emptyNote() : nullptr;
+    if (note == nullptr)
+        return;
+    const auto disks = window_.disks().selectedDisks();
+    note->tell(disks.size() == 1 ? toQt(reasonOfHost(*disks.front(), library_, host_.translator()))
+                                 : QString());
 }
 
 void DesktopSession::show()

@@ -73,6 +73,7 @@ private:
     void addTab(std::unique_ptr<ModuleTab> tab);
     void updateTabs();
     void selectionChanged();
+    void tellWhyNot();
     void windowAppeared();
 
     std::vector<Menu> menus();

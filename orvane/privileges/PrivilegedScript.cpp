@@ -5,7 +5,7 @@
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/privileges/EventWire.h"
 #include "orvane/privileges/HelperProcess.h"
-#include "pellar/jobs/RightsErrorCodes.h"
+#include "pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 
 #include <poll.h>

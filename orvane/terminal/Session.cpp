@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
+#include "orvane/jobs/HostReasons.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -189,9 +190,9 @@ void Session::detach(const DiskPointer& topLevelDisk)
         host_.sharedDiskController().ejectDisk(topLevelDisk, true);
 }
 
-std::string Session::reasonAgainstLive(const Disk& disk) const
+std::string Session::reasonOfHost(const Disk& disk)
 {
-    return library_.reasonAgainstLive(disk.facts().filesystem);
+    return orvane::reasonOfHost(disk, library_, host_.translator());
 }
 
 std::string Session::reasonAgainstPartitionMap(const DiskPointer& disk) const

@@ -47,8 +47,8 @@ public:
     void asked() { reporter_.prompt(Reporter::Prompt::Over); }
     /// Why the library cannot treat the disk's partition map; empty when it can.
     std::string reasonAgainstPartitionMap(const DiskPointer& disk) const;
-    /// Why the library cannot verify the disk while it is in use; empty when it can.
-    std::string reasonAgainstLive(const Disk& disk) const;
+    /// Why the host has nothing to offer for the disk; empty when that is not its to say.
+    std::string reasonOfHost(const Disk& disk);
 
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);

@@ -50,6 +50,9 @@ public:
     void finished(fixwell::ErrorCode mainError, std::int32_t detailError, fixwell::Name verdict,
                   const std::string& message);
 
+    /// Shows now what was written so far.
+    void flush() { road_.flush(); }
+
     ProgressMeter& meter() { return meter_; }
     std::string text(const Sentence& sentence) const { return sentence.in(texts_); }
     std::string text(std::string_view key) const { return texts_.text(key); }

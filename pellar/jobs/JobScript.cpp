@@ -23,25 +23,19 @@ constexpr double repairShare = 60;
 /// And that of the verification before it.
 constexpr double lookShare = 30;
 
-Outcome failure(fixwell::ErrorCode code, Sentence reason)
-{
-    return {Verdict::Failed, code, 0, std::move(reason)};
-}
-
 }  // namespace
 
 JobScript::JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
                      StopSwitch& stop, EventRoad& road)
-    : claim_(std::move(request.claim)),
-      mounts_(std::move(request.mounts)),
-      operation_(request.operation),
+    : operation_(request.operation),
       tool_(request.tool),
       options_(options),
       texts_(texts),
       stop_(stop),
       road_(road),
-      disk_(std::move(request.disk)),
-      log_(*disk_, texts, road)
+      log_(*request.disk, texts, road),
+      disk_(request.disk, std::move(request.claim), std::move(request.mounts), options.systemPaths,
+            log_)
 {
 }
 
@@ -51,7 +45,7 @@ void JobScript::run()
     for (State state = State::Examining; state != State::Done;)
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
-    giveDiskBack();
+    disk_.giveBack();
     tellOutcome(outcome_, operation_, texts_, log_);
 }
 
@@ -69,57 +63,17 @@ JobScript::State JobScript::next(State state)
     return State::Done;
 }
 
-/// Why the disk cannot be had; none when it is ours.
-std::optional<Outcome> JobScript::takeDisk()
-{
-    if (claim_)
-        return std::nullopt;
-    if (!mounts_.empty())
-        if (const auto refusal = unmount())
-            return refusal;
-    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
-    auto claim = DiskClaim::take(*disk_, access, options_.systemPaths);
-    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
-        return failure(*error, {unmounted_ ? "it was unmounted, but could not be opened"
-                                           : "another program has it to itself",
-                                {},
-                                {}});
-    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
-    return std::nullopt;
-}
-
-std::optional<Outcome> JobScript::unmount()
-{
-    log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
-    road_.flush();  // what is still to be written may take long
-    auto unmounted = UnmountedDisk::take(std::move(mounts_), options_.systemPaths);
-    if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
-        return failure(fixwell::kPLErrorCouldNotUnmount, *refusal);
-    unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
-    return std::nullopt;
-}
-
-void JobScript::giveDiskBack()
-{
-    claim_.reset();
-    if (!unmounted_)
-        return;
-    log_.step(fixwell::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
-    for (const Sentence& failure : unmounted_->mountAgain())
-        log_.error(failure);
-    unmounted_.reset();
-}
-
 JobScript::State JobScript::examine()
 {
     if (const auto objection = objectionToJob())
         return end(*objection);
-    if (const auto refusal = takeDisk())
+    if (const auto refusal = disk_.take(wantedAccess()))
         return end(*refusal);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
-    if (tool_ == nullptr && disk_->filesystem.empty())
-        tool_ = toolRecognizing(claim_->descriptor(), claim_->offset(), claim_->availableBytes());
+    if (tool_ == nullptr && disk_.reference().filesystem.empty())
+        tool_ = toolRecognizing(disk_.claim().descriptor(), disk_.claim().offset(),
+                                disk_.claim().availableBytes());
     if (tool_ != nullptr) {
         program_ = findProgram(tool_->name(), options_.toolPath);
         repairProgram_ = findProgram(tool_->repairName(), options_.toolPath);
@@ -137,53 +91,57 @@ JobScript::State JobScript::examine()
 /// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
 std::optional<Outcome> JobScript::objectionToJob() const
 {
-    if (disk_->filesystem.empty())
+    if (disk_.reference().filesystem.empty())
         return std::nullopt;
-    const Capability capability = capabilityFor(disk_->filesystem, operation_, options_.toolPath);
+    const Capability capability =
+        capabilityFor(disk_.reference().filesystem, operation_, options_.toolPath);
     return capability.isGiven() ? std::nullopt
-                                : std::optional(failure(capability.error, capability.reason));
+                                : std::optional(failedOutcome(capability.error, capability.reason));
 }
 
 /// Why no tool may run; none when one may.
 std::optional<Outcome> JobScript::objection() const
 {
     constexpr std::uint64_t smallestVolume = 2048;
-    const std::uint64_t available = claim_->availableBytes();
+    const std::uint64_t available = disk_.claim().availableBytes();
     if (available <= smallestVolume)
-        return failure(fixwell::kPLErrorUnsupported,
-                       {"only %1$@ bytes are there, too few for a file system",
-                        std::to_string(available),
-                        {}});
+        return failedOutcome(fixwell::kPLErrorUnsupported,
+                             {"only %1$@ bytes are there, too few for a file system",
+                              std::to_string(available),
+                              {}});
     if (tool_ == nullptr)
         return withoutTool();
     if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failure(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair());
+        return failedOutcome(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair());
     if (volume_.isForeign)
-        return failure(fixwell::kPLErrorUnsupported,
-                       {"it holds something other than the file system it is listed with", {}, {}});
+        return failedOutcome(
+            fixwell::kPLErrorUnsupported,
+            {"it holds something other than the file system it is listed with", {}, {}});
     if (program_.empty() || (operation_ == Operation::Repair && repairProgram_.empty()))
-        return failure(fixwell::kPLErrorToolMissing,
-                       {"%1$@ is not installed (package %2$@)",
-                        std::string(program_.empty() ? tool_->name() : tool_->repairName()),
-                        std::string(tool_->package())});
+        return failedOutcome(fixwell::kPLErrorToolMissing,
+                             {"%1$@ is not installed (package %2$@)",
+                              std::string(program_.empty() ? tool_->name() : tool_->repairName()),
+                              std::string(tool_->package())});
     return std::nullopt;
 }
 
 /// What is there is named, where it is something.
 Outcome JobScript::withoutTool() const
 {
-    const std::string type =
-        probeSignature(claim_->descriptor(), claim_->offset(), claim_->availableBytes()).type;
+    const std::string type = probeSignature(disk_.claim().descriptor(), disk_.claim().offset(),
+                                            disk_.claim().availableBytes())
+                                 .type;
     if (type.empty())
-        return failure(fixwell::kPLErrorUnsupported,
-                       {"no file system was found that can be checked", {}, {}});
+        return failedOutcome(fixwell::kPLErrorUnsupported,
+                             {"no file system was found that can be checked", {}, {}});
     const Capability capability = capabilityFor(type, operation_, options_.toolPath);
-    return failure(fixwell::kPLErrorUnsupported,
-                   capability.isGiven()
-                       ? Sentence{"its file system looks like “%1$@”, but too little of it is left",
-                                  fixwell::printable(type),
-                                  {}}
-                       : capability.reason);
+    return failedOutcome(
+        fixwell::kPLErrorUnsupported,
+        capability.isGiven()
+            ? Sentence{"its file system looks like “%1$@”, but too little of it is left",
+                       fixwell::printable(type),
+                       {}}
+            : capability.reason);
 }
 
 /// A tool that repairs a volume whose end is missing throws away what it cannot reach.
@@ -208,7 +166,8 @@ JobScript::State JobScript::verify()
     if (judgement.verdict == Verdict::Damaged && !volume_.isCutShort())
         for (const std::string_view meaning : meaningOf(evidence.findings.damage))
             log_.remark(texts_.text(meaning));
-    return end(outcomeOfVerification(judgement));
+    return end(tool_->canRepair() ? outcomeOfVerification(judgement)
+                                  : outcomeWithoutRepair(judgement));
 }
 
 /// A sound volume is not written to, and what is not known to be damaged is not repaired.
@@ -233,7 +192,7 @@ JobScript::State JobScript::replay()
     log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
     road_.flush();
     const auto disk =
-        DiskForTool::prepare(*claim_, DiskForTool::Form::BlockDevice, Access::ReadWrite);
+        DiskForTool::prepare(disk_.claim(), DiskForTool::Form::BlockDevice, Access::ReadWrite);
     const int* const prepareError = std::get_if<int>(&disk);
     const int error = prepareError != nullptr
                           ? *prepareError
@@ -282,7 +241,8 @@ JobScript::State JobScript::end(Outcome outcome)
 
 VolumeFacts JobScript::factsFor(const Tool& tool) const
 {
-    return tool.examine(claim_->descriptor(), claim_->offset(), claim_->availableBytes());
+    return tool.examine(disk_.claim().descriptor(), disk_.claim().offset(),
+                        disk_.claim().availableBytes());
 }
 
 RunEvidence JobScript::runOnce(Access access)
@@ -290,7 +250,7 @@ RunEvidence JobScript::runOnce(Access access)
     volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
     const auto form =
         tool_->habits().takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
-    const auto disk = DiskForTool::prepare(*claim_, form, access);
+    const auto disk = DiskForTool::prepare(disk_.claim(), form, access);
     if (const int* const error = std::get_if<int>(&disk)) {
         obstacle_ = notAttached(*tool_, *error);
         return {access, {NotStarted{*error}}, {}, volume_};
@@ -313,9 +273,9 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
                          {reason, {}, {}},
                          false};
     };
-    if (!claim_->isStillWhole())
+    if (!disk_.claim().isStillWhole())
         return lost("the disk became shorter or unreadable meanwhile");
-    if (!claim_->isStillInPlace())
+    if (!disk_.claim().isStillInPlace())
         return lost("the disk was deleted, moved or replaced meanwhile");
     return judgement;
 }

@@ -3,12 +3,11 @@
 
 #include "fixwell/host/pellar/DiskReference.h"
 #include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobDisk.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Outcome.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/mounts/UnmountedDisk.h"
 #include "pellar/tools/Tool.h"
-#include "pellar/volumes/DiskClaim.h"
 
 #include <filesystem>
 #include <optional>
@@ -54,9 +53,10 @@ private:
     State confirm();
     State end(Outcome outcome);
 
-    std::optional<Outcome> takeDisk();
-    std::optional<Outcome> unmount();
-    void giveDiskBack();
+    Access wantedAccess() const
+    {
+        return operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    }
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToSize();
@@ -65,17 +65,14 @@ private:
     RunEvidence runOnce(Access access);
     Judgement judge(const RunEvidence& evidence) const;
 
-    std::optional<DiskClaim> claim_;  ///< none once the disk has been given back
-    std::vector<MountPlace> mounts_;
-    std::optional<UnmountedDisk> unmounted_;
     const Operation operation_;
     const Tool* tool_;
     const ManagerOptions& options_;
     const Texts& texts_;
     StopSwitch& stop_;
     EventRoad& road_;
-    const fixwell::DiskReferencePointer disk_;
     JobLog log_;
+    JobDisk disk_;
 
     std::filesystem::path program_;
     std::filesystem::path repairProgram_;

@@ -22,11 +22,6 @@ using namespace std::chrono_literals;
 
 constexpr std::uint64_t anyBytes = ~std::uint64_t{0};
 
-Outcome failure(fixwell::ErrorCode code, Sentence reason)
-{
-    return {Verdict::Failed, code, 0, std::move(reason)};
-}
-
 }  // namespace
 
 LiveScript::LiveScript(fixwell::DiskReferencePointer disk, std::vector<MountPlace> mounts,
@@ -52,24 +47,24 @@ Outcome LiveScript::verify()
 {
     const Capability capability = liveCapabilityFor(mounts_.front().filesystem, options_.toolPath);
     if (!capability.isGiven())
-        return failure(capability.error, capability.reason);
+        return failedOutcome(capability.error, capability.reason);
     program_ = capability.program;
     if (auto obstacle = findVolume())
         return *std::move(obstacle);
     const Judgement judgement = scrub();
     tellFindings(judgement);
-    return outcomeOfVerification(judgement);
+    return outcomeWithoutRepair(judgement);
 }
 
 std::optional<Outcome> LiveScript::findVolume()
 {
     if (const int error = reachVolume())
-        return failure(
+        return failedOutcome(
             fixwell::kPLErrorCannotOpen,
             {"it is mounted, but could not be reached there: %1$@", ::strerrordesc_np(error), {}});
     if (volume_->scrubbedBytes())
-        return failure(fixwell::kPLErrorToolFailed,
-                       {"another program is checking it just now", {}, {}});
+        return failedOutcome(fixwell::kPLErrorToolFailed,
+                             {"another program is checking it just now", {}, {}});
     return std::nullopt;
 }
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/Outcome.h"
 
+#include "pellar/ErrorCodes.h"
+
 #include "fixwell/host/pellar/MessageKeys.h"
 
 #include <algorithm>
@@ -46,6 +48,19 @@ std::string_view messageKey(const Outcome& outcome, Operation operation)
 }
 
 }  // namespace
+
+Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason)
+{
+    return {Verdict::Failed, code, 0, std::move(reason)};
+}
+
+Outcome outcomeWithoutRepair(const Judgement& judgement)
+{
+    Outcome outcome = outcomeOfVerification(judgement);
+    if (outcome.code == fixwell::kPLErrorDamaged)
+        outcome.code = kPLErrorDamagedForGood;
+    return outcome;
+}
 
 Outcome outcomeOfVerification(const Judgement& judgement)
 {

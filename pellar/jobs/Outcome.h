@@ -31,7 +31,10 @@ struct RepairPass {
 
 inline constexpr std::size_t mostRepairPasses = 5;
 
+Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason);
 Outcome outcomeOfVerification(const Judgement& judgement);
+/// The same for a kind of volume that is not repaired here: nobody is sent to a repair.
+Outcome outcomeWithoutRepair(const Judgement& judgement);
 
 /// Whether to repair once more: damage is left, and the last pass got somewhere.
 bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& confirmation);

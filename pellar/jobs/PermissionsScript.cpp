@@ -4,9 +4,9 @@
 #include "fixwell/host/foundation/Array.h"
 #include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/pellar/MessageKeys.h"
+#include "pellar/ErrorCodes.h"
 #include "pellar/permissions/InstalledReferences.h"
 #include "pellar/permissions/InstalledSystem.h"
-#include "pellar/permissions/PermissionErrorCodes.h"
 #include "pellar/permissions/PermissionsOutcome.h"
 #include "pellar/permissions/Restoring.h"
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapOutcome.h"
 
-#include "pellar/partitions/MapErrorCodes.h"
+#include "pellar/ErrorCodes.h"
 
 namespace pellar {
 namespace {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/PermissionsOutcome.h"
 
-#include "pellar/permissions/PermissionErrorCodes.h"
+#include "pellar/ErrorCodes.h"
 
 namespace pellar {
 namespace {

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/BtrfsCheck.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/BtrfsSuperblock.h"
 
@@ -89,6 +88,21 @@ class BtrfsOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
+class BtrfsCheck final : public Tool {
+public:
+    std::string_view name() const override { return "btrfs"; }
+    std::string_view package() const override { return "btrfs-progs"; }
+    bool canRepair() const override { return false; }
+    Sentence reasonAgainstRepair() const override;
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 Sentence BtrfsCheck::reasonAgainstRepair() const
@@ -127,6 +141,12 @@ Judgement BtrfsCheck::judge(const RunEvidence& evidence) const
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
     return judgeVerification(status, evidence, {name(), damagedStatuses});
+}
+
+const Tool& btrfsCheck()
+{
+    static const BtrfsCheck tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/E2fsck.h"
-
 #include "pellar/process/ChildProcess.h"
 #include "pellar/tools/E2fsckOutput.h"
 #include "pellar/tools/Judging.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/volumes/ExtSuperblock.h"
 #include "pellar/volumes/SignatureProbe.h"
 
@@ -77,6 +76,29 @@ Judgement judgeRepair(int status, const RunEvidence& evidence)
     return judgement;
 }
 
+class E2fsck final : public Tool {
+public:
+    std::string_view name() const override { return "e2fsck"; }
+    std::string_view package() const override { return "e2fsprogs"; }
+    bool canRepair() const override { return true; }
+    ToolHabits habits() const override
+    {
+        return {.takesOffset = true,
+                .wantsTerminal = false,
+                .isLookedAtBeforeRepair = false,
+                .endsInOrder = true,
+                .logReplayedAs = {}};
+    }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    std::optional<double> percentOf(std::string_view progressLine) const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts E2fsck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -121,6 +143,12 @@ Judgement E2fsck::judge(const RunEvidence& evidence) const
     const int status = std::get<Exited>(evidence.result.ending).status;
     return evidence.access == Access::ReadOnly ? judgeVerification(status, evidence)
                                                : judgeRepair(status, evidence);
+}
+
+const Tool& e2fsck()
+{
+    static const E2fsck tool;
+    return tool;
 }
 
 }  // namespace pellar

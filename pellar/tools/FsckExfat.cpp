@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/FsckExfat.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/ExfatBootSector.h"
 
@@ -55,6 +54,20 @@ class ExfatOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1, 4};
 
+class FsckExfat final : public Tool {
+public:
+    std::string_view name() const override { return "fsck.exfat"; }
+    std::string_view package() const override { return "exfatprogs"; }
+    bool canRepair() const override { return true; }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts FsckExfat::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -88,6 +101,12 @@ Judgement FsckExfat::judge(const RunEvidence& evidence) const
     judgement.madeProgress = evidence.access == Access::ReadWrite &&
                              (evidence.findings.corrections > 0 || status == 0 || status == 1);
     return judgement;
+}
+
+const Tool& fsckExfat()
+{
+    static const FsckExfat tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/FsckF2fs.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/F2fsSuperblock.h"
 
@@ -53,6 +52,21 @@ class F2fsOutput final : public LineOutput {
 // It gives up with 255, after having said why.
 constexpr std::array damagedStatuses{1, 4, 255};
 
+class FsckF2fs final : public Tool {
+public:
+    std::string_view name() const override { return "fsck.f2fs"; }
+    std::string_view package() const override { return "f2fs-tools"; }
+    bool canRepair() const override { return true; }
+    ToolHabits habits() const override { return {.logReplayedAs = "f2fs"}; }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts FsckF2fs::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -84,6 +98,12 @@ Judgement FsckF2fs::judge(const RunEvidence& evidence) const
     Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.isComplete;
     return judgement;
+}
+
+const Tool& fsckF2fs()
+{
+    static const FsckF2fs tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/FsckFat.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/FatBootSector.h"
 
@@ -88,6 +87,20 @@ class FatOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
+class FsckFat final : public Tool {
+public:
+    std::string_view name() const override { return "fsck.fat"; }
+    std::string_view package() const override { return "dosfstools"; }
+    bool canRepair() const override { return true; }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts FsckFat::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -121,6 +134,12 @@ Judgement FsckFat::judge(const RunEvidence& evidence) const
     Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.wasModified;
     return judgement;
+}
+
+const Tool& fsckFat()
+{
+    static const FsckFat tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/Ntfs.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/NtfsBootSector.h"
 #include "pellar/volumes/NtfsState.h"
@@ -115,6 +114,21 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
     return judgement;
 }
 
+class Ntfs final : public Tool {
+public:
+    std::string_view name() const override { return "ntfsresize"; }
+    std::string_view repairName() const override { return "ntfsfix"; }
+    std::string_view package() const override { return "ntfs-3g"; }
+    bool canRepair() const override { return true; }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts Ntfs::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -153,6 +167,12 @@ Judgement Ntfs::judge(const RunEvidence& evidence) const
     Judgement judgement = damaged(status, ownSystem);
     judgement.madeProgress = evidence.findings.corrections > 0;
     return judgement;
+}
+
+const Tool& ntfs()
+{
+    static const Ntfs tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -1,13 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/ToolTable.h"
 
-#include "pellar/tools/BtrfsCheck.h"
-#include "pellar/tools/E2fsck.h"
-#include "pellar/tools/FsckExfat.h"
-#include "pellar/tools/FsckF2fs.h"
-#include "pellar/tools/FsckFat.h"
-#include "pellar/tools/Ntfs.h"
-#include "pellar/tools/XfsRepair.h"
+#include "pellar/tools/Tools.h"
 
 #include <algorithm>
 #include <array>
@@ -22,18 +16,11 @@ struct Row {
 
 const auto& rows()
 {
-    static const E2fsck e2fsck;
-    static const XfsRepair xfsRepair;
-    static const BtrfsCheck btrfsCheck;
-    static const FsckF2fs fsckF2fs;
-    static const Ntfs ntfs;
-    static const FsckExfat fsckExfat;
-    static const FsckFat fsckFat;
     // The surest signs first; a FAT volume has no magic number of its own.
     static const std::array table{
-        Row{"ext2", &e2fsck},   Row{"ext3", &e2fsck},      Row{"ext4", &e2fsck},
-        Row{"xfs", &xfsRepair}, Row{"btrfs", &btrfsCheck}, Row{"f2fs", &fsckF2fs},
-        Row{"ntfs", &ntfs},     Row{"exfat", &fsckExfat},  Row{"vfat", &fsckFat},
+        Row{"ext2", &e2fsck()},   Row{"ext3", &e2fsck()},      Row{"ext4", &e2fsck()},
+        Row{"xfs", &xfsRepair()}, Row{"btrfs", &btrfsCheck()}, Row{"f2fs", &fsckF2fs()},
+        Row{"ntfs", &ntfs()},     Row{"exfat", &fsckExfat()},  Row{"vfat", &fsckFat()},
     };
     return table;
 }

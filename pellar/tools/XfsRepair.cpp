@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/XfsRepair.h"
-
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
 #include "pellar/tools/Witness.h"
 #include "pellar/volumes/XfsSuperblock.h"
 
@@ -118,6 +117,21 @@ class XfsOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
+class XfsRepair final : public Tool {
+public:
+    std::string_view name() const override { return "xfs_repair"; }
+    std::string_view package() const override { return "xfsprogs"; }
+    bool canRepair() const override { return true; }
+    ToolHabits habits() const override { return {.logReplayedAs = "xfs"}; }
+
+    VolumeFacts examine(int disk, std::uint64_t offset,
+                        std::uint64_t availableBytes) const override;
+    std::vector<std::string> arguments(Access access, const std::string& disk,
+                                       std::uint64_t offset) const override;
+    std::unique_ptr<OutputReader> makeReader() const override;
+    Judgement judge(const RunEvidence& evidence) const override;
+};
+
 }  // namespace
 
 VolumeFacts XfsRepair::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
@@ -151,6 +165,12 @@ Judgement XfsRepair::judge(const RunEvidence& evidence) const
     Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && status == 0;
     return judgement;
+}
+
+const Tool& xfsRepair()
+{
+    static const XfsRepair tool;
+    return tool;
 }
 
 }  // namespace pellar

@@ -79,6 +79,31 @@ TEST_F(HotPlugTest, ADeviceCanBeNamedByItsNodeAndByItsLabel)
     }
 }
 
+TEST_F(HotPlugTest, TheEmptyLogSaysWhyNothingCanBeDone)
+{
+    open({});
+    DiskTree disk;
+    disk.facts.identifier = "/dev/none";
+    disk.facts.type = diskType::bareVolume;
+    disk.facts.storage = fixwell::DiskReference::Storage::BlockDevice;
+    disk.facts.filesystem = "ext4";
+    const EmptyNote* const note = session().activeTab()->interface()->emptyNote();
+    ASSERT_NE(note, nullptr);
+    const std::string hint = fromQt(note->text());
+    struct Case {
+        bool isBootVolume;
+        std::string_view said;
+    };
+    for (const Case& c : {Case{true, "rescue system"}, Case{false, hint}}) {
+        disk.facts.isBootVolume = c.isBootVolume;
+        session().host().sharedDiskController().synchronize({});
+        session().host().sharedDiskController().synchronize({disk});
+        select(disk.facts.identifier);
+        EXPECT_NE(fromQt(note->text()).find(c.said), std::string::npos) << fromQt(note->text());
+        EXPECT_NE(button("verifyDiskButton").isEnabled(), c.isBootVolume);
+    }
+}
+
 // A device that a job has open cannot be detached, so this one only seems to go.
 TEST_F(HotPlugTest, ADiskThatGoesDuringItsJobIsListedUntilTheEnd)
 {

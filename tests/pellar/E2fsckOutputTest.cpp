@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/E2fsckOutput.h"
 
-#include "pellar/tools/E2fsck.h"
+#include "pellar/tools/Tools.h"
 #include "tests/pellar/Recorded.h"
 
 #include <gtest/gtest.h>

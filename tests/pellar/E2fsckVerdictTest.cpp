@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/E2fsck.h"
+#include "pellar/tools/Tools.h"
 #include "tests/pellar/Recorded.h"
 
 #include <gtest/gtest.h>
@@ -15,7 +15,7 @@ using test::recordedLines;
 
 Judgement judge(const RunEvidence& evidence)
 {
-    return E2fsck().judge(evidence);
+    return e2fsck().judge(evidence);
 }
 
 VolumeFacts plainVolume()
@@ -133,11 +133,11 @@ TEST(E2fsckArguments, OnlyARepairMayWrite)
     // Every option of e2fsck(8) that lets it write.
     const std::vector<std::string> writing{"-y", "-p", "-a", "-D", "-c", "-l", "-L", "-z"};
     for (const std::uint64_t offset : {0U, 4096U}) {
-        const auto verify = E2fsck().arguments(Access::ReadOnly, "/proc/self/fd/3", offset);
+        const auto verify = e2fsck().arguments(Access::ReadOnly, "/proc/self/fd/3", offset);
         for (const std::string& option : writing)
             EXPECT_EQ(std::count(verify.begin(), verify.end(), option), 0) << option;
         EXPECT_EQ(std::count(verify.begin(), verify.end(), "-n"), 1);
-        const auto repair = E2fsck().arguments(Access::ReadWrite, "/proc/self/fd/3", offset);
+        const auto repair = e2fsck().arguments(Access::ReadWrite, "/proc/self/fd/3", offset);
         EXPECT_EQ(std::count(repair.begin(), repair.end(), "-n"), 0);
     }
 }

@@ -3,6 +3,7 @@
 // The real tools on real volumes, damaged on purpose; e2fsck has a file of its own. A tool that is
 // not installed is named, and its cases are skipped.
 
+#include "pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 #include "pellar/volumes/DiskUse.h"
 #include "pellar/volumes/LoopDevice.h"
@@ -108,6 +109,9 @@ TEST_P(RealTools, SayWhatIsTrue)
     ASSERT_EQ(bench.verify(disk), 0);
     EXPECT_EQ(bench.listener.verdict, state.verified) << bench.listener.message;
     EXPECT_TRUE(isSame(lastWriteOf(image), before)) << "a verification wrote";
+    EXPECT_EQ(bench.listener.error == kPLErrorDamagedForGood,
+              state.verified == "damaged" && state.filesystem == "btrfs")
+        << "nobody is sent to a repair that there is not";
     ASSERT_EQ(bench.repair(disk), 0);
     EXPECT_EQ(bench.listener.verdict, state.repaired)
         << state.because << ": " << bench.listener.message;

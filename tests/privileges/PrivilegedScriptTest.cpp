@@ -2,8 +2,8 @@
 // The asking side of the helper, with programs in the helper's place.
 
 #include "orvane/privileges/PrivilegedScript.h"
+#include "pellar/ErrorCodes.h"
 #include "pellar/jobs/Job.h"
-#include "pellar/jobs/RightsErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>

@@ -31,7 +31,8 @@ public:
         const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
         for (int i = 0; control && number_ < 0 && i < mostTries; ++i) {
             number_ = ::ioctl(control.get(), LOOP_CTL_GET_FREE);
-            attach(image);
+            if (!attach(image))
+                number_ = -1;
         }
     }
     LoopDevice(const LoopDevice&) = delete;
@@ -44,13 +45,13 @@ public:
         return number_ < 0 ? std::string() : "/dev/loop" + std::to_string(number_);
     }
 
-    void attach(const std::string& image)
+    /// NO while somebody else still has the device open from before.
+    [[nodiscard]] bool attach(const std::string& image)
     {
         const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
         const FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
         isOurs_ = device && file && ::ioctl(device.get(), LOOP_SET_FD, file.get()) == 0;
-        if (!isOurs_)
-            number_ = -1;
+        return isOurs_;
     }
 
     /// Somebody else has detached it, and may have given the device to another.
@@ -58,13 +59,6 @@ public:
     {
         number_ = -1;
         isOurs_ = false;
-    }
-
-    bool isAttached() const
-    {
-        const FileDescriptor device(::open(name().c_str(), O_RDONLY | O_CLOEXEC));
-        loop_info64 info = {};
-        return device && ::ioctl(device.get(), LOOP_GET_STATUS64, &info) == 0;
     }
 
     /// Nothing happens when it is detached already: it may be another test's by now.

@@ -10,8 +10,8 @@ constexpr int noteMargin = 24;  // pixels
 
 }  // namespace
 
-EmptyNote::EmptyNote(QAbstractItemView& view, const QString& text)
-    : QLabel(text, view.viewport()), view_(view)
+EmptyNote::EmptyNote(QAbstractItemView& view, const QString& hint)
+    : QLabel(hint, view.viewport()), view_(view), hint_(hint)
 {
     setTextFormat(Qt::PlainText);
     setWordWrap(true);

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtInterface.h"
 
-#include "orvane/desktop/toolkit/EmptyNote.h"
 #include "orvane/desktop/toolkit/FittingPane.h"
 #include "orvane/desktop/toolkit/InterfaceFile.h"
 #include "orvane/desktop/toolkit/Text.h"
@@ -88,7 +87,7 @@ void LoadedInterface::makeOutlineView(fixwell::OutlineView** place, LogTable& ta
     static_cast<LogModel*>(table.model())
         ->setSpokenTypes({word(problemProperty), word(successProperty)});
     if (const QString note = word(emptyNoteProperty); !note.isEmpty())
-        new EmptyNote(table, note);
+        emptyNote_ = new EmptyNote(table, note);
 }
 
 // The divider stands below the first pane: its limits are the pane's.

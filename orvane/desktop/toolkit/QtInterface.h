@@ -3,6 +3,7 @@
 
 #include "fixwell/host/foundation/Bundle.h"
 #include "fixwell/host/toolkit/Interface.h"
+#include "orvane/desktop/toolkit/EmptyNote.h"
 #include "orvane/desktop/toolkit/OutlinePeer.h"
 #include "orvane/desktop/toolkit/QtButton.h"
 #include "orvane/desktop/toolkit/QtText.h"
@@ -39,6 +40,8 @@ public:
     /// when the file has none, and after the module has gone.
     fixwell::OutlineView* outlineView() { return outlineView_.get(); }
     OutlinePeer* outlinePeer() { return peer_.get(); }
+    /// What the log says while it is empty; none when it says nothing.
+    EmptyNote* emptyNote() { return emptyNote_; }
 
     /// The module goes away: nothing is sent to it any more, and its view is destroyed.
     void disconnect();
@@ -58,6 +61,7 @@ private:
     std::map<std::string, std::unique_ptr<QtButton>, std::less<>> buttons_;
     std::vector<std::unique_ptr<fixwell::View>> texts_;
     std::unique_ptr<OutlinePeer> peer_;
+    QPointer<EmptyNote> emptyNote_;
     std::unique_ptr<fixwell::OutlineView> outlineView_;
 };
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/partitions/MapErrorCodes.h"
+#include "pellar/ErrorCodes.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 #include "tests/support/LoopDevice.h"
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "pellar/ErrorCodes.h"
 #include "pellar/partitions/MapDisk.h"
-#include "pellar/partitions/MapErrorCodes.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/process/FileDescriptor.h"
 #include "tests/pellar/partitions/DiskMaker.h"

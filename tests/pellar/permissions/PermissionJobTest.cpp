@@ -2,9 +2,9 @@
 // Jobs on the permissions of installed files, on systems made for the purpose. Needs root: the
 // owners do.
 
+#include "pellar/ErrorCodes.h"
 #include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PackagedFile.h"
-#include "pellar/permissions/PermissionErrorCodes.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/permissions/DebianSystem.h"

@@ -1,0 +1,59 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/jobs/JobDisk.h"
+
+#include "fixwell/host/pellar/MessageKeys.h"
+
+#include <utility>
+
+namespace pellar {
+
+JobDisk::JobDisk(fixwell::DiskReferencePointer disk, std::optional<DiskClaim> claim,
+                 std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log)
+    : disk_(std::move(disk)),
+      claim_(std::move(claim)),
+      mounts_(std::move(mounts)),
+      paths_(paths),
+      log_(log)
+{
+}
+
+std::optional<Outcome> JobDisk::take(Access access)
+{
+    if (claim_)
+        return std::nullopt;
+    if (!mounts_.empty())
+        if (auto refusal = unmount())
+            return refusal;
+    auto claim = DiskClaim::take(*disk_, access, paths_);
+    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
+        return failedOutcome(*error, {unmounted_ ? "it was unmounted, but could not be opened"
+                                                 : "another program has it to itself",
+                                      {},
+                                      {}});
+    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
+    return std::nullopt;
+}
+
+std::optional<Outcome> JobDisk::unmount()
+{
+    log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
+    log_.flush();  // what is still to be written may take long
+    auto unmounted = UnmountedDisk::take(std::move(mounts_), paths_);
+    if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
+        return failedOutcome(fixwell::kPLErrorCouldNotUnmount, *refusal);
+    unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
+    return std::nullopt;
+}
+
+void JobDisk::giveBack()
+{
+    claim_.reset();
+    if (!unmounted_)
+        return;
+    log_.step(fixwell::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
+    for (const Sentence& failure : unmounted_->mountAgain())
+        log_.error(failure);
+    unmounted_.reset();
+}
+
+}  // namespace pellar
