@@ -66,8 +66,12 @@ protected:
         return !device_->name().empty() &&
                ::mount(device_->name().c_str(), place().c_str(), "btrfs", MS_NOATIME, nullptr) == 0;
     }
+    // Not only detached: the image is at rest when it is read or damaged.
     void unmount()
     {
+        for (int tries = 0; tries < 250 && ::umount(place().c_str()) != 0 && errno == EBUSY;
+             ++tries)
+            ::usleep(20'000);
         ::umount2(place().c_str(), MNT_DETACH);
         device_.reset();
     }
