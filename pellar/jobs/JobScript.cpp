@@ -75,8 +75,8 @@ JobScript::State JobScript::examine()
         tool_ = toolRecognizing(disk_.claim().descriptor(), disk_.claim().offset(),
                                 disk_.claim().availableBytes());
     if (tool_ != nullptr) {
-        program_ = findProgram(tool_->name(), options_.toolPath);
-        repairProgram_ = findProgram(tool_->repairName(), options_.toolPath);
+        program_ = findProgram(tool_->name, options_.toolPath);
+        repairProgram_ = findProgram(tool_->repairName, options_.toolPath);
         volume_ = factsFor(*tool_);
     }
     if (const auto objection = this->objection())
@@ -85,7 +85,7 @@ JobScript::State JobScript::examine()
         return end(*objection);
     if (operation_ == Operation::Verify)
         return State::Verifying;
-    return tool_->habits().isLookedAtBeforeRepair ? State::Looking : State::Repairing;
+    return tool_->habits.isLookedAtBeforeRepair ? State::Looking : State::Repairing;
 }
 
 /// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
@@ -112,7 +112,7 @@ std::optional<Outcome> JobScript::objection() const
     if (tool_ == nullptr)
         return withoutTool();
     if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failedOutcome(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair());
+        return failedOutcome(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair);
     if (volume_.isForeign)
         return failedOutcome(
             fixwell::kPLErrorUnsupported,
@@ -120,8 +120,8 @@ std::optional<Outcome> JobScript::objection() const
     if (program_.empty() || (operation_ == Operation::Repair && repairProgram_.empty()))
         return failedOutcome(fixwell::kPLErrorToolMissing,
                              {"%1$@ is not installed (package %2$@)",
-                              std::string(program_.empty() ? tool_->name() : tool_->repairName()),
-                              std::string(tool_->package())});
+                              std::string(program_.empty() ? tool_->name : tool_->repairName),
+                              std::string(tool_->package)});
     return std::nullopt;
 }
 
@@ -178,7 +178,7 @@ JobScript::State JobScript::look()
     const Judgement judgement = judge(evidence);
     const bool waitsForReplay = judgement.verdict == Verdict::Inconclusive &&
                                 evidence.findings.skippedJournal &&
-                                !tool_->habits().logReplayedAs.empty();
+                                !tool_->habits.logReplayedAs.empty();
     if (waitsForReplay)
         return State::Replaying;
     return judgement.verdict == Verdict::Damaged ? State::Repairing
@@ -188,7 +188,7 @@ JobScript::State JobScript::look()
 JobScript::State JobScript::replay()
 {
     log_.step(fixwell::kFsckRepair, texts_.text("Replaying the log by mounting the volume"));
-    const std::string filesystem(tool_->habits().logReplayedAs);
+    const std::string filesystem(tool_->habits.logReplayedAs);
     log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
     road_.flush();
     const auto disk =
@@ -205,12 +205,12 @@ JobScript::State JobScript::replay()
 
 JobScript::State JobScript::repair()
 {
-    log_.meter().setRange(passes_.empty() && tool_->habits().isLookedAtBeforeRepair ? lookShare : 0,
+    log_.meter().setRange(passes_.empty() && tool_->habits.isLookedAtBeforeRepair ? lookShare : 0,
                           repairShare);
     const RunEvidence evidence = runOnce(Access::ReadWrite);
     const Judgement judgement = judge(evidence);
     passes_.push_back({judgement, evidence.findings.replayedJournal,
-                       evidence.findings.problems > 0 || tool_->habits().isLookedAtBeforeRepair});
+                       evidence.findings.problems > 0 || tool_->habits.isLookedAtBeforeRepair});
     // The disk went away, or the user did not want more: nothing is left to be confirmed.
     const bool isOver = judgement.verdict == Verdict::Stopped ||
                         judgement.code == fixwell::kPLErrorDiskChanged ||
@@ -249,7 +249,7 @@ RunEvidence JobScript::runOnce(Access access)
 {
     volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
     const auto form =
-        tool_->habits().takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
+        tool_->habits.takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
     const auto disk = DiskForTool::prepare(disk_.claim(), form, access);
     if (const int* const error = std::get_if<int>(&disk)) {
         obstacle_ = notAttached(*tool_, *error);

@@ -21,7 +21,7 @@ std::string textOf(int error)
 
 Judgement notAttached(const Tool& tool, int error)
 {
-    const std::string name(tool.name());
+    const std::string name(tool.name);
     const Sentence reason =
         isMissingRight(error)
             ? Sentence{"%1$@ needs the volume as a disk of its own, which only an administrator "

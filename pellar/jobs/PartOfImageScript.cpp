@@ -29,12 +29,12 @@ void PartOfImageScript::run()
 bool PartOfImageScript::needsDevice() const
 {
     const Tool* const tool = request_.tool;
-    if (tool == nullptr || tool->habits().takesOffset)
+    if (tool == nullptr || tool->habits.takesOffset)
         return false;
     const bool isRepair = request_.operation == Operation::Repair;
-    return !findProgram(tool->name(), options_.toolPath).empty() &&
+    return !findProgram(tool->name, options_.toolPath).empty() &&
            (!isRepair ||
-            (tool->canRepair() && !findProgram(tool->repairName(), options_.toolPath).empty()));
+            (tool->canRepair() && !findProgram(tool->repairName, options_.toolPath).empty()));
 }
 
 std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()

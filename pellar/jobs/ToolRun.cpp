@@ -37,7 +37,7 @@ RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 RunRequest ToolRun::requestFor(const DiskForTool& disk) const
 {
     RunRequest request;
-    request.wantsTerminal = tool_.habits().wantsTerminal;
+    request.wantsTerminal = tool_.habits.wantsTerminal;
     request.ignoresStops = isUnstoppable();
     request.command = {program_, tool_.arguments(access_, diskArgumentOfTool(), disk.offset())};
     request.access = access_;
@@ -86,13 +86,13 @@ void ToolRun::lineLimitReached()
 
 bool ToolRun::isUnstoppable() const
 {
-    return access_ == Access::ReadWrite && !tool_.habits().endsInOrder;
+    return access_ == Access::ReadWrite && !tool_.habits.endsInOrder;
 }
 
 /// The verification before the repair has shown them.
 bool ToolRun::areProblemsKnown() const
 {
-    return access_ == Access::ReadWrite && tool_.habits().isLookedAtBeforeRepair;
+    return access_ == Access::ReadWrite && tool_.habits.isLookedAtBeforeRepair;
 }
 
 void ToolRun::stopAsked()

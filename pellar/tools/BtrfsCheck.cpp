@@ -10,6 +10,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "btrfs";
+
 // "[3/7] checking free space tree": what stands behind the number.
 constexpr std::array phases{
     PhaseSign{"checking root items", "Checking the roots of the trees"},
@@ -88,33 +90,7 @@ class BtrfsOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
-class BtrfsCheck final : public Tool {
-public:
-    std::string_view name() const override { return "btrfs"; }
-    std::string_view package() const override { return "btrfs-progs"; }
-    bool canRepair() const override { return false; }
-    Sentence reasonAgainstRepair() const override;
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-Sentence BtrfsCheck::reasonAgainstRepair() const
-{
-    return {
-        "to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
-        "volume and make this one anew",
-        {},
-        {}};
-}
-
-VolumeFacts BtrfsCheck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(superblock, "btrfs", disk, offset, availableBytes);
@@ -123,29 +99,44 @@ VolumeFacts BtrfsCheck::examine(int disk, std::uint64_t offset, std::uint64_t av
     return facts;
 }
 
-std::vector<std::string> BtrfsCheck::arguments(Access, const std::string& disk, std::uint64_t) const
+std::vector<std::string> arguments(Access, const std::string& disk, std::uint64_t)
 {
     return {"check", "--readonly", disk};
 }
 
-std::unique_ptr<OutputReader> BtrfsCheck::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<BtrfsOutput>();
 }
 
 // It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
 // only its words tell.
-Judgement BtrfsCheck::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name()))
+    if (auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
-    return judgeVerification(status, evidence, {name(), damagedStatuses});
+    return judgeVerification(status, evidence, {name, damagedStatuses});
 }
+
+}  // namespace
 
 const Tool& btrfsCheck()
 {
-    static const BtrfsCheck tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "btrfs-progs",
+        .reasonAgainstRepair =
+            {"to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
+             "volume and make this one anew",
+             {},
+             {}},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

@@ -10,10 +10,9 @@ namespace {
 
 Capability missing(const Tool& tool, std::string_view name)
 {
-    return {
-        fixwell::kPLErrorToolMissing,
-        {"%1$@ is not installed (package %2$@)", std::string(name), std::string(tool.package())},
-        {}};
+    return {fixwell::kPLErrorToolMissing,
+            {"%1$@ is not installed (package %2$@)", std::string(name), std::string(tool.package)},
+            {}};
 }
 
 /// Some things on a disk are no file system and need no check.
@@ -39,15 +38,15 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
                 {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
                 {}};
     if (operation == Operation::Repair && !tool->canRepair())
-        return {fixwell::kPLErrorUnsupported, tool->reasonAgainstRepair(), {}};
+        return {fixwell::kPLErrorUnsupported, tool->reasonAgainstRepair, {}};
     // A repair is confirmed by verifying, so it needs both.
-    std::filesystem::path program = findProgram(tool->name(), toolPath);
+    std::filesystem::path program = findProgram(tool->name, toolPath);
     if (program.empty())
-        return missing(*tool, tool->name());
+        return missing(*tool, tool->name);
     if (operation == Operation::Repair)
-        program = findProgram(tool->repairName(), toolPath);
+        program = findProgram(tool->repairName, toolPath);
     if (program.empty())
-        return missing(*tool, tool->repairName());
+        return missing(*tool, tool->repairName);
     return {fixwell::kPLNoError, {}, std::move(program)};
 }
 

@@ -9,6 +9,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "e2fsck";
+
 // The exit status is a sum of these (e2fsck(8), EXIT CODE).
 constexpr int leftErrors = 4;
 constexpr int operationalError = 8;
@@ -76,32 +78,7 @@ Judgement judgeRepair(int status, const RunEvidence& evidence)
     return judgement;
 }
 
-class E2fsck final : public Tool {
-public:
-    std::string_view name() const override { return "e2fsck"; }
-    std::string_view package() const override { return "e2fsprogs"; }
-    bool canRepair() const override { return true; }
-    ToolHabits habits() const override
-    {
-        return {.takesOffset = true,
-                .wantsTerminal = false,
-                .isLookedAtBeforeRepair = false,
-                .endsInOrder = true,
-                .logReplayedAs = {}};
-    }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    std::optional<double> percentOf(std::string_view progressLine) const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts E2fsck::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     VolumeFacts facts;
     facts.availableBytes = availableBytes;
@@ -118,36 +95,51 @@ VolumeFacts E2fsck::examine(int disk, std::uint64_t offset, std::uint64_t availa
     return facts;
 }
 
-std::vector<std::string> E2fsck::arguments(Access access, const std::string& disk,
-                                           std::uint64_t offset) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t offset)
 {
     return {"-f", access == Access::ReadOnly ? "-n" : "-y", "-C",
             std::to_string(progressDescriptorOfTool),
             offset == 0 ? disk : disk + "?offset=" + std::to_string(offset)};
 }
 
-std::unique_ptr<OutputReader> E2fsck::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<E2fsckOutput>();
 }
 
-std::optional<double> E2fsck::percentOf(std::string_view progressLine) const
+std::optional<double> percentOf(std::string_view progressLine)
 {
     return e2fsckPercent(progressLine);
 }
 
-Judgement E2fsck::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (const auto judgement = judgementOfEnding(evidence, "e2fsck"))
+    if (const auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
     return evidence.access == Access::ReadOnly ? judgeVerification(status, evidence)
                                                : judgeRepair(status, evidence);
 }
 
+}  // namespace
+
 const Tool& e2fsck()
 {
-    static const E2fsck tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "e2fsprogs",
+        .habits = {.takesOffset = true,
+                   .wantsTerminal = false,
+                   .isLookedAtBeforeRepair = false,
+                   .endsInOrder = true,
+                   .logReplayedAs = {}},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .percentOf = percentOf,
+        .judge = judge,
+    };
     return tool;
 }
 

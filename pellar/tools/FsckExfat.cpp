@@ -10,6 +10,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "fsck.exfat";
+
 // exfatprogs 1.2.0, fsck.c, repair.c and libexfat.c.
 constexpr std::array signs{
     DamageSign{"boot region", Damage::Structure},
@@ -54,23 +56,7 @@ class ExfatOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1, 4};
 
-class FsckExfat final : public Tool {
-public:
-    std::string_view name() const override { return "fsck.exfat"; }
-    std::string_view package() const override { return "exfatprogs"; }
-    bool canRepair() const override { return true; }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts FsckExfat::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto sector = readExfatBootSector(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(sector, "exfat", disk, offset, availableBytes);
@@ -79,33 +65,42 @@ VolumeFacts FsckExfat::examine(int disk, std::uint64_t offset, std::uint64_t ava
     return facts;
 }
 
-std::vector<std::string> FsckExfat::arguments(Access access, const std::string& disk,
-                                              std::uint64_t) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
     return {access == Access::ReadOnly ? "-n" : "-y", disk};
 }
 
-std::unique_ptr<OutputReader> FsckExfat::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<ExfatOutput>();
 }
 
 // It says "clean" and exits 4 where it could not read what the volume is built on, and takes no
 // notice of the mark of a volume that was not properly unmounted, which a repair takes off.
-Judgement FsckExfat::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name()))
+    if (auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
+    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite &&
                              (evidence.findings.corrections > 0 || status == 0 || status == 1);
     return judgement;
 }
 
+}  // namespace
+
 const Tool& fsckExfat()
 {
-    static const FsckExfat tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "exfatprogs",
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

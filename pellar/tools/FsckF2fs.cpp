@@ -10,6 +10,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "fsck.f2fs";
+
 // f2fs-tools 1.15, fsck/fsck.c and fsck/mount.c.
 constexpr std::array signs{
     DamageSign{"a valid F2FS superblock", Damage::Structure},
@@ -52,24 +54,7 @@ class F2fsOutput final : public LineOutput {
 // It gives up with 255, after having said why.
 constexpr std::array damagedStatuses{1, 4, 255};
 
-class FsckF2fs final : public Tool {
-public:
-    std::string_view name() const override { return "fsck.f2fs"; }
-    std::string_view package() const override { return "f2fs-tools"; }
-    bool canRepair() const override { return true; }
-    ToolHabits habits() const override { return {.logReplayedAs = "f2fs"}; }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts FsckF2fs::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto superblock = readF2fsSuperblock(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(superblock, "f2fs", disk, offset, availableBytes);
@@ -78,31 +63,41 @@ VolumeFacts FsckF2fs::examine(int disk, std::uint64_t offset, std::uint64_t avai
 }
 
 // Without -f a volume that says of itself that all is well is believed.
-std::vector<std::string> FsckF2fs::arguments(Access access, const std::string& disk,
-                                             std::uint64_t) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
     return {access == Access::ReadOnly ? "--dry-run" : "-y", "-f", disk};
 }
 
-std::unique_ptr<OutputReader> FsckF2fs::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<F2fsOutput>();
 }
 
 // It ends with 0 where the first superblock was lost and the second was taken.
-Judgement FsckF2fs::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name()))
+    if (auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
+    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.isComplete;
     return judgement;
 }
 
+}  // namespace
+
 const Tool& fsckF2fs()
 {
-    static const FsckF2fs tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "f2fs-tools",
+        .habits = {.logReplayedAs = "f2fs"},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

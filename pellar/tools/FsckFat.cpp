@@ -10,6 +10,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "fsck.fat";
+
 constexpr std::array phases{
     PhaseSign{"Checking we can access the last sector", "Checking the end of the volume"},
     PhaseSign{"Starting check/repair pass.", "Checking files and directories"},
@@ -87,23 +89,7 @@ class FatOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
-class FsckFat final : public Tool {
-public:
-    std::string_view name() const override { return "fsck.fat"; }
-    std::string_view package() const override { return "dosfstools"; }
-    bool canRepair() const override { return true; }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts FsckFat::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto sector = readFatBootSector(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(sector, "vfat", disk, offset, availableBytes);
@@ -113,32 +99,41 @@ VolumeFacts FsckFat::examine(int disk, std::uint64_t offset, std::uint64_t avail
 }
 
 // Without -w: what is to be changed is written at the end, all at once.
-std::vector<std::string> FsckFat::arguments(Access access, const std::string& disk,
-                                            std::uint64_t) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
     return {access == Access::ReadOnly ? "-n" : "-a", "-v", disk};
 }
 
-std::unique_ptr<OutputReader> FsckFat::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<FatOutput>();
 }
 
 // 1 is the answer to every sort of damage, but also to what is no FAT volume at all, where there is
 // no last line (fsck.fat(8), EXIT STATUS).
-Judgement FsckFat::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name()))
+    if (auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
+    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.wasModified;
     return judgement;
 }
 
+}  // namespace
+
 const Tool& fsckFat()
 {
-    static const FsckFat tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "dosfstools",
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

@@ -12,6 +12,9 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "ntfsresize";
+constexpr std::string_view repairName = "ntfsfix";
+
 constexpr std::array phases{
     PhaseSign{"Checking filesystem consistency ...", "Checking files and directories"},
     PhaseSign{"Accounting clusters ...", "Checking which places are in use"},
@@ -94,7 +97,7 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
     RunEvidence checked = evidence;
     checked.volume.isMarkedDirty = checked.volume.needsRecovery = false;
     Judgement judgement = judgeVerification(statusWithoutResizing(status, evidence.findings),
-                                            checked, {"ntfsresize", damagedStatuses});
+                                            checked, {name, damagedStatuses});
     if (judgement.verdict == Verdict::Damaged)
         judgement.reason = ownSystem;
     // The mark, and a journal that goes with it, are for its own system to deal with: nothing here
@@ -114,24 +117,7 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
     return judgement;
 }
 
-class Ntfs final : public Tool {
-public:
-    std::string_view name() const override { return "ntfsresize"; }
-    std::string_view repairName() const override { return "ntfsfix"; }
-    std::string_view package() const override { return "ntfs-3g"; }
-    bool canRepair() const override { return true; }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts Ntfs::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto sector = readNtfsBootSector(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(sector, "ntfs", disk, offset, availableBytes);
@@ -142,24 +128,23 @@ VolumeFacts Ntfs::examine(int disk, std::uint64_t offset, std::uint64_t availabl
 }
 
 // -f, so that a volume that is marked to be checked is looked at all the same; -i never writes.
-std::vector<std::string> Ntfs::arguments(Access access, const std::string& disk,
-                                         std::uint64_t) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
     if (access == Access::ReadWrite)
         return {disk};
     return {"-i", "-f", disk};
 }
 
-std::unique_ptr<OutputReader> Ntfs::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<NtfsOutput>();
 }
 
 // ntfsfix answers 0 whatever it has found, so only what it says it has done counts for anything.
-Judgement Ntfs::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
     const bool isRepair = evidence.access == Access::ReadWrite;
-    if (auto judgement = judgementOfEnding(evidence, isRepair ? repairName() : name()))
+    if (auto judgement = judgementOfEnding(evidence, isRepair ? repairName : name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
     if (!isRepair)
@@ -169,9 +154,19 @@ Judgement Ntfs::judge(const RunEvidence& evidence) const
     return judgement;
 }
 
+}  // namespace
+
 const Tool& ntfs()
 {
-    static const Ntfs tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = repairName,
+        .package = "ntfs-3g",
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

@@ -100,37 +100,30 @@ struct ToolHabits {
     std::string_view logReplayedAs;
 };
 
-/// A checking tool: what it can do, how it is called, how it answers. Without state; lives as
-/// long as the process; any thread.
-class Tool {
-public:
-    virtual ~Tool() = default;
-
-    /// Of the executable that verifies.
-    virtual std::string_view name() const = 0;
-    /// Of the executable that repairs.
-    virtual std::string_view repairName() const { return name(); }
-    /// The Debian package that brings it.
-    virtual std::string_view package() const = 0;
-    virtual bool canRepair() const = 0;
-    /// Why not, where it cannot.
-    virtual Sentence reasonAgainstRepair() const
-    {
-        return {"%1$@ can verify this file system, but not repair it", std::string(name()), {}};
-    }
-    virtual ToolHabits habits() const { return {}; }
+/// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
+/// any thread.
+struct Tool {
+    std::string_view name;        ///< of the executable that verifies
+    std::string_view repairName;  ///< of the executable that repairs
+    std::string_view package;     ///< the Debian package that brings them
+    /// Why it does not repair; empty where it does.
+    Sentence reasonAgainstRepair = {};
+    ToolHabits habits = {};
 
     /// Reads the disk a little; never writes.
-    virtual VolumeFacts examine(int disk, std::uint64_t offset,
-                                std::uint64_t availableBytes) const = 0;
+    VolumeFacts (*examine)(int disk, std::uint64_t offset, std::uint64_t availableBytes);
     /// `disk` is a name that the tool can open; `offset` is where in it the volume starts, bytes.
-    virtual std::vector<std::string> arguments(Access access, const std::string& disk,
-                                               std::uint64_t offset) const = 0;
-    virtual std::unique_ptr<OutputReader> makeReader() const = 0;
+    std::vector<std::string> (*arguments)(Access access, const std::string& disk,
+                                          std::uint64_t offset);
+    std::unique_ptr<OutputReader> (*makeReader)();
     /// Of a line from the progress descriptor. From 0 to 100, of one run; none when the line is no
     /// progress report.
-    virtual std::optional<double> percentOf(std::string_view) const { return std::nullopt; }
-    virtual Judgement judge(const RunEvidence& evidence) const = 0;
+    std::optional<double> (*percentOf)(std::string_view line) = [](std::string_view) {
+        return std::optional<double>();
+    };
+    Judgement (*judge)(const RunEvidence& evidence);
+
+    bool canRepair() const { return reasonAgainstRepair.isEmpty(); }
 };
 
 }  // namespace pellar

@@ -10,6 +10,8 @@
 namespace pellar {
 namespace {
 
+constexpr std::string_view name = "xfs_repair";
+
 constexpr std::array phases{
     PhaseSign{"Phase 1 - ", "Checking the superblock"},
     PhaseSign{"Phase 2 - ", "Checking the log and the maps of free space"},
@@ -117,24 +119,7 @@ class XfsOutput final : public LineOutput {
 
 constexpr std::array damagedStatuses{1};
 
-class XfsRepair final : public Tool {
-public:
-    std::string_view name() const override { return "xfs_repair"; }
-    std::string_view package() const override { return "xfsprogs"; }
-    bool canRepair() const override { return true; }
-    ToolHabits habits() const override { return {.logReplayedAs = "xfs"}; }
-
-    VolumeFacts examine(int disk, std::uint64_t offset,
-                        std::uint64_t availableBytes) const override;
-    std::vector<std::string> arguments(Access access, const std::string& disk,
-                                       std::uint64_t offset) const override;
-    std::unique_ptr<OutputReader> makeReader() const override;
-    Judgement judge(const RunEvidence& evidence) const override;
-};
-
-}  // namespace
-
-VolumeFacts XfsRepair::examine(int disk, std::uint64_t offset, std::uint64_t availableBytes) const
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
 {
     const auto superblock = readXfsSuperblock(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(superblock, "xfs", disk, offset, availableBytes);
@@ -142,34 +127,44 @@ VolumeFacts XfsRepair::examine(int disk, std::uint64_t offset, std::uint64_t ava
     return facts;
 }
 
-std::vector<std::string> XfsRepair::arguments(Access access, const std::string& disk,
-                                              std::uint64_t) const
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
     if (access == Access::ReadWrite)
         return {disk};
     return {"-n", disk};
 }
 
-std::unique_ptr<OutputReader> XfsRepair::makeReader() const
+std::unique_ptr<OutputReader> makeReader()
 {
     return std::make_unique<XfsOutput>();
 }
 
 // A repair ends with 0 whatever it has done, with 1 when it could not go on, and with 2 when the
 // log has to be replayed first (xfs_repair(8), EXIT STATUS).
-Judgement XfsRepair::judge(const RunEvidence& evidence) const
+Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name()))
+    if (auto judgement = judgementOfEnding(evidence, name))
         return *judgement;
     const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name(), damagedStatuses});
+    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
     judgement.madeProgress = evidence.access == Access::ReadWrite && status == 0;
     return judgement;
 }
 
+}  // namespace
+
 const Tool& xfsRepair()
 {
-    static const XfsRepair tool;
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "xfsprogs",
+        .habits = {.logReplayedAs = "xfs"},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = makeReader,
+        .judge = judge,
+    };
     return tool;
 }
 

@@ -226,7 +226,7 @@ TEST(ToolVerdict, StoppedIsStopped)
 {
     for (const Tool* const tool : allTools()) {
         RunEvidence evidence{Access::ReadOnly, {Exited{0}, StopCause::User}, {}, plainVolume()};
-        EXPECT_EQ(tool->judge(evidence).verdict, Verdict::Stopped) << tool->name();
+        EXPECT_EQ(tool->judge(evidence).verdict, Verdict::Stopped) << tool->name;
     }
 }
 
@@ -239,14 +239,14 @@ TEST(ToolArguments, OnlyARepairMayWrite)
         {"fsck.f2fs", "--dry-run"}};
     for (const Tool* const tool : allTools()) {
         const auto verify = tool->arguments(Access::ReadOnly, "/proc/self/fd/3", 0);
-        EXPECT_EQ(std::count(verify.begin(), verify.end(), readOnly.at(tool->name())), 1)
-            << tool->name();
+        EXPECT_EQ(std::count(verify.begin(), verify.end(), readOnly.at(tool->name)), 1)
+            << tool->name;
         EXPECT_EQ(verify.back(), "/proc/self/fd/3");
         const auto repair = tool->arguments(Access::ReadWrite, "/proc/self/fd/3", 0);
-        const bool isSameProgram = tool->canRepair() && tool->repairName() == tool->name();
+        const bool isSameProgram = tool->canRepair() && tool->repairName == tool->name;
         EXPECT_TRUE(!isSameProgram ||
-                    std::count(repair.begin(), repair.end(), readOnly.at(tool->name())) == 0)
-            << tool->name();
+                    std::count(repair.begin(), repair.end(), readOnly.at(tool->name)) == 0)
+            << tool->name;
     }
 }
 
@@ -271,7 +271,7 @@ TEST(ToolOutput, AnyBytesAreRead)
                 c = static_cast<char>(random());
             lines.push_back(line);
         }
-        EXPECT_NE(judge(*tool, lines, Exited{0}).verdict, Verdict::Sound) << tool->name();
+        EXPECT_NE(judge(*tool, lines, Exited{0}).verdict, Verdict::Sound) << tool->name;
     }
 }
 
