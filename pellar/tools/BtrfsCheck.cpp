@@ -104,19 +104,11 @@ std::vector<std::string> arguments(Access, const std::string& disk, std::uint64_
     return {"check", "--readonly", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<BtrfsOutput>();
-}
-
 // It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
 // only its words tell.
 Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name))
-        return *judgement;
-    const int status = std::get<Exited>(evidence.result.ending).status;
-    return judgeVerification(status, evidence, {name, damagedStatuses});
+    return judgeRun(evidence, {name, damagedStatuses});
 }
 
 }  // namespace
@@ -134,7 +126,7 @@ const Tool& btrfsCheck()
              {}},
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<BtrfsOutput>,
         .judge = judge,
     };
     return tool;

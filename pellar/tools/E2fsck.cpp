@@ -102,11 +102,6 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
             offset == 0 ? disk : disk + "?offset=" + std::to_string(offset)};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<E2fsckOutput>();
-}
-
 std::optional<double> percentOf(std::string_view progressLine)
 {
     return e2fsckPercent(progressLine);
@@ -136,7 +131,7 @@ const Tool& e2fsck()
                    .logReplayedAs = {}},
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<E2fsckOutput>,
         .percentOf = percentOf,
         .judge = judge,
     };

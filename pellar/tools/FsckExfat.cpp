@@ -70,22 +70,13 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     return {access == Access::ReadOnly ? "-n" : "-y", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<ExfatOutput>();
-}
-
 // It says "clean" and exits 4 where it could not read what the volume is built on, and takes no
 // notice of the mark of a volume that was not properly unmounted, which a repair takes off.
 Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name))
-        return *judgement;
-    const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
-    judgement.madeProgress = evidence.access == Access::ReadWrite &&
-                             (evidence.findings.corrections > 0 || status == 0 || status == 1);
-    return judgement;
+    return judgeRun(evidence, {name, damagedStatuses, [](int status, const Findings& findings) {
+                                   return findings.corrections > 0 || status == 0 || status == 1;
+                               }});
 }
 
 }  // namespace
@@ -98,7 +89,7 @@ const Tool& fsckExfat()
         .package = "exfatprogs",
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<ExfatOutput>,
         .judge = judge,
     };
     return tool;

@@ -68,20 +68,12 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     return {access == Access::ReadOnly ? "--dry-run" : "-y", "-f", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<F2fsOutput>();
-}
-
 // It ends with 0 where the first superblock was lost and the second was taken.
 Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name))
-        return *judgement;
-    const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
-    judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.isComplete;
-    return judgement;
+    return judgeRun(evidence, {name, damagedStatuses, [](int, const Findings& findings) {
+                                   return findings.isComplete;
+                               }});
 }
 
 }  // namespace
@@ -95,7 +87,7 @@ const Tool& fsckF2fs()
         .habits = {.logReplayedAs = "f2fs"},
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<F2fsOutput>,
         .judge = judge,
     };
     return tool;

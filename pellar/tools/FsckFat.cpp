@@ -104,21 +104,13 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     return {access == Access::ReadOnly ? "-n" : "-a", "-v", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<FatOutput>();
-}
-
 // 1 is the answer to every sort of damage, but also to what is no FAT volume at all, where there is
 // no last line (fsck.fat(8), EXIT STATUS).
 Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name))
-        return *judgement;
-    const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
-    judgement.madeProgress = evidence.access == Access::ReadWrite && evidence.findings.wasModified;
-    return judgement;
+    return judgeRun(evidence, {name, damagedStatuses, [](int, const Findings& findings) {
+                                   return findings.wasModified;
+                               }});
 }
 
 }  // namespace
@@ -131,7 +123,7 @@ const Tool& fsckFat()
         .package = "dosfstools",
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<FatOutput>,
         .judge = judge,
     };
     return tool;

@@ -82,6 +82,18 @@ std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::str
     return std::nullopt;
 }
 
+Judgement judgeRun(const RunEvidence& evidence, const ExitMeanings& meanings)
+{
+    if (auto judgement = judgementOfEnding(evidence, meanings.tool))
+        return *judgement;
+    const int status = std::get<Exited>(evidence.result.ending).status;
+    Judgement judgement = judgeVerification(status, evidence, meanings);
+    judgement.madeProgress = evidence.access == Access::ReadWrite &&
+                             meanings.madeProgress != nullptr &&
+                             meanings.madeProgress(status, evidence.findings);
+    return judgement;
+}
+
 Judgement judgeVerification(int status, const RunEvidence& evidence, const ExitMeanings& meanings)
 {
     const std::string tool(meanings.tool);

@@ -28,7 +28,12 @@ std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::str
 struct ExitMeanings {
     std::string_view tool;
     std::span<const int> damaged;  ///< damage was found, or the tool gave up
+    /// Whether a repair got somewhere, so that another may get further; never when null.
+    bool (*madeProgress)(int status, const Findings& findings) = nullptr;
 };
+
+/// How the run ended, and where it came to an exit status, what that means.
+Judgement judgeRun(const RunEvidence& evidence, const ExitMeanings& meanings);
 
 /// A verification by a tool whose exit status is one number. A volume is sound only with 0, a run
 /// that came to its end, and nothing that speaks against it; what could not be checked is

@@ -135,11 +135,6 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     return {"-i", "-f", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<NtfsOutput>();
-}
-
 // ntfsfix answers 0 whatever it has found, so only what it says it has done counts for anything.
 Judgement judge(const RunEvidence& evidence)
 {
@@ -164,7 +159,7 @@ const Tool& ntfs()
         .package = "ntfs-3g",
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<NtfsOutput>,
         .judge = judge,
     };
     return tool;

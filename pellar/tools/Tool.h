@@ -100,6 +100,13 @@ struct ToolHabits {
     std::string_view logReplayedAs;
 };
 
+/// For `Tool::makeReader`.
+template <class Output>
+std::unique_ptr<OutputReader> readerFor()
+{
+    return std::make_unique<Output>();
+}
+
 /// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
 /// any thread.
 struct Tool {

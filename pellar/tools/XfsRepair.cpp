@@ -134,21 +134,13 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     return {"-n", disk};
 }
 
-std::unique_ptr<OutputReader> makeReader()
-{
-    return std::make_unique<XfsOutput>();
-}
-
 // A repair ends with 0 whatever it has done, with 1 when it could not go on, and with 2 when the
 // log has to be replayed first (xfs_repair(8), EXIT STATUS).
 Judgement judge(const RunEvidence& evidence)
 {
-    if (auto judgement = judgementOfEnding(evidence, name))
-        return *judgement;
-    const int status = std::get<Exited>(evidence.result.ending).status;
-    Judgement judgement = judgeVerification(status, evidence, {name, damagedStatuses});
-    judgement.madeProgress = evidence.access == Access::ReadWrite && status == 0;
-    return judgement;
+    return judgeRun(evidence, {name, damagedStatuses, [](int status, const Findings&) {
+                                   return status == 0;
+                               }});
 }
 
 }  // namespace
@@ -162,7 +154,7 @@ const Tool& xfsRepair()
         .habits = {.logReplayedAs = "xfs"},
         .examine = examine,
         .arguments = arguments,
-        .makeReader = makeReader,
+        .makeReader = readerFor<XfsOutput>,
         .judge = judge,
     };
     return tool;
