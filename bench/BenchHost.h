@@ -27,6 +27,9 @@ class SilentReporter final : public Reporter {
     void failure(const std::string&, const std::string&) override {}
     void warning(const std::string&) override {}
     void listed(const DiskLine&) override {}
+    void done(const std::string&, std::string_view, const std::string&, const std::string&) override
+    {
+    }
     void runs(const std::string&, const std::vector<RunLine>&) override {}
 };
 
