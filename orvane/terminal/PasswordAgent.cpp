@@ -2,6 +2,7 @@
 #include "orvane/terminal/PasswordAgent.h"
 
 #include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/ForkedSignals.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>
@@ -43,13 +44,7 @@ bool isOnDesktop()
                               pid_t parent)
 {
     ::prctl(PR_SET_PDEATHSIG, SIGTERM);
-    struct sigaction standard = {};
-    standard.sa_handler = SIG_DFL;
-    for (int signal = 1; signal < NSIG; ++signal)
-        ::sigaction(signal, &standard, nullptr);
-    sigset_t none;
-    ::sigemptyset(&none);
-    ::sigprocmask(SIG_SETMASK, &none, nullptr);
+    pellar::resetSignals();
     for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
         ::dup2(nothing, stream);
     ::dup2(ready, readyDescriptor);

@@ -6,6 +6,7 @@
 #include <sys/mount.h>
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <climits>
@@ -107,9 +108,12 @@ bool isMounted(const MountCall& call) noexcept
            (call.below == 0 || mountOf(status) != call.below);
 }
 
-std::uint64_t mountShownAt(const std::string& path) noexcept
+bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places)
 {
-    return mountOf(statusOf(path));
+    const std::uint64_t shown = mountOf(statusOf(place.target));
+    return shown != 0 && std::none_of(places.begin(), places.end(), [shown](const auto& ours) {
+               return ours.id == 0 || ours.id == shown;
+           });
 }
 
 }  // namespace pellar

@@ -5,6 +5,7 @@
 
 #include <cstdint>
 #include <string>
+#include <vector>
 
 namespace pellar {
 
@@ -35,7 +36,8 @@ struct MountCall {
 /// `perform`.
 [[nodiscard]] bool isMounted(const MountCall& call) noexcept;
 
-/// Which mount shows at the path, by the kernel's number; 0 when it is not known.
-[[nodiscard]] std::uint64_t mountShownAt(const std::string& path) noexcept;
+/// Whether what shows at the place is none of these, the places of one disk: who unmounts it by its
+/// path unmounts another. NO when it is not known.
+[[nodiscard]] bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places);
 
 }  // namespace pellar

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/mounts/MountKeeper.h"
 
-#include "pellar/process/SignalsBlocked.h"
+#include "pellar/process/ForkedSignals.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

@@ -3,8 +3,7 @@
 
 #include "fixwell/host/foundation/UTF8.h"
 #include "pellar/mounts/Holders.h"
-
-#include <libmount/libmount.h>
+#include "pellar/mounts/MountContext.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -18,31 +17,16 @@
 namespace pellar {
 namespace {
 
-struct FreeContext {
-    void operator()(libmnt_context* context) const { mnt_free_context(context); }
-};
-using Context = std::unique_ptr<libmnt_context, FreeContext>;
-
 // No other program is run, and no table but the kernel's is asked.
-Context makeContext(const MountPlace& place)
+MountContext makeContext(const MountPlace& place)
 {
-    Context context(mnt_new_context());
+    MountContext context(mnt_new_context());
     if (context) {
         mnt_context_disable_helpers(context.get(), 1);
         mnt_context_set_optsmode(context.get(), MNT_OMODE_NOTAB);
         mnt_context_set_target(context.get(), place.target.c_str());
     }
     return context;
-}
-
-// 0, or an errno value. The library answers its own failures negative, and a system call's with a
-// status of its own (libmount's documentation, "Mount context").
-int errorOf(Context& context, int answer)
-{
-    if (answer == 0)
-        return 0;
-    const int error = mnt_context_get_syscall_errno(context.get());
-    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
 }
 
 int unmount(const MountPlace& place)
@@ -53,7 +37,7 @@ int unmount(const MountPlace& place)
     for (int attempt = 0; attempt < attempts; ++attempt) {
         if (attempt > 0)
             std::this_thread::sleep_for(std::chrono::milliseconds(150));
-        Context context = makeContext(place);
+        MountContext context = makeContext(place);
         error = context ? errorOf(context, mnt_context_umount(context.get())) : ENOMEM;
         if (error != EBUSY)
             break;
@@ -82,15 +66,6 @@ std::string wholeTargetOf(const std::vector<MountPlace>& places)
     const auto whole = std::find_if(places.begin(), places.end(),
                                     [](const MountPlace& place) { return !place.isBind(); });
     return whole != places.end() ? whole->target : std::string();
-}
-
-/// Who unmounts such a place by its path unmounts the other.
-bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places)
-{
-    const std::uint64_t shown = mountShownAt(place.target);
-    return shown != 0 && std::none_of(places.begin(), places.end(), [shown](const auto& ours) {
-               return ours.id == 0 || ours.id == shown;
-           });
 }
 
 /// Why it could not be unmounted, or mounted again as it is; nothing when it could.

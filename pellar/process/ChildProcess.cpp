@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ChildProcess.h"
 
-#include "pellar/process/SignalsBlocked.h"
+#include "pellar/process/ForkedSignals.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>
@@ -73,17 +73,6 @@ bool isComplete(const Preparation& ready, const ChildStreams& streams)
 {
     return ready.input && ready.output && ready.failure && (streams.disk < 0 || ready.disk) &&
            (streams.progress < 0 || ready.progress);
-}
-
-void resetSignals()
-{
-    struct sigaction standard = {};
-    standard.sa_handler = SIG_DFL;
-    for (int signal = 1; signal < NSIG; ++signal)
-        ::sigaction(signal, &standard, nullptr);
-    sigset_t none;
-    ::sigemptyset(&none);
-    ::pthread_sigmask(SIG_SETMASK, &none, nullptr);
 }
 
 bool place(const FileDescriptor& source, int number)

@@ -54,16 +54,26 @@ TEST(HelperRequest, ArrivesAsItWasMade)
     }
 }
 
+/// What is changed in arguments that are taken, so that they are not.
+struct Case {
+    std::size_t place;
+    std::string value;
+    std::string_view because;
+};
+
+void expectRefused(std::vector<std::string> arguments, const Case& c,
+                   const std::function<bool(const std::filesystem::path&)>& isDevice)
+{
+    arguments[c.place] = c.value;
+    EXPECT_TRUE(std::holds_alternative<std::string>(readHelperArguments(arguments, isDevice)))
+        << c.because;
+}
+
 // Whoever may start the helper may give it any arguments.
 TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
 {
     const std::vector<std::string> good{"repair", "/dev/sdb1", "id", "name", "ext4", "de"};
     ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
-    struct Case {
-        std::size_t place;
-        std::string value;
-        std::string_view because;
-    };
     for (const Case& c : {
              Case{0, "erase", "no such operation"},
              Case{0, "", "no operation"},
@@ -80,14 +90,10 @@ TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
              Case{4, "ext4;reboot", "no name of a file system"},
              Case{4, std::string(100, 'x'), "too long"},
              Case{5, "../../../tmp/x", "no language, but a way to somebody's texts"},
-         }) {
-        std::vector<std::string> arguments = good;
-        arguments[c.place] = c.value;
-        const auto read = readHelperArguments(arguments, [](const std::filesystem::path& path) {
+         })
+        expectRefused(good, c, [](const std::filesystem::path& path) {
             return path != "/dev/null" && path != "/dev/";
         });
-        EXPECT_TRUE(std::holds_alternative<std::string>(read)) << c.because;
-    }
     for (const std::size_t count : {0U, 1U, 5U, 7U}) {
         std::vector<std::string> arguments = good;
         arguments.resize(count, "x");
@@ -102,11 +108,6 @@ TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
     const std::vector<std::string> good{"attach", "verify", "7",    "512", "1024",
                                         "id",     "name",   "vfat", "de"};
     ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
-    struct Case {
-        std::size_t place;
-        std::string value;
-        std::string_view because;
-    };
     for (const Case& c : {
              Case{1, "verify-map", "a part has no map"},
              Case{1, "repair-permissions", "nor is it mounted"},
@@ -120,13 +121,8 @@ TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
              Case{4, "9223372036854775807", "and so is this"},
              Case{4, "0", "to the end, whatever that is"},
              Case{7, "vfat -o x", "no name of a file system"},
-         }) {
-        std::vector<std::string> arguments = good;
-        arguments[c.place] = c.value;
-        EXPECT_TRUE(
-            std::holds_alternative<std::string>(readHelperArguments(arguments, isKnownDevice)))
-            << c.because;
-    }
+         })
+        expectRefused(good, c, isKnownDevice);
 }
 
 TEST(EventWire, EventsComeBackAsTheyWere)

@@ -4,10 +4,10 @@
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/MountedAt.h"
 #include "pellar/mounts/MountCall.h"
+#include "pellar/mounts/MountContext.h"
 #include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
-#include <libmount/libmount.h>
 #include <linux/cdrom.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
@@ -20,11 +20,9 @@ namespace orvane::direct {
 namespace {
 
 struct Free {
-    void operator()(libmnt_context* context) const { mnt_free_context(context); }
     void operator()(libmnt_table* table) const { mnt_unref_table(table); }
     void operator()(libmnt_cache* cache) const { mnt_unref_cache(cache); }
 };
-using Context = std::unique_ptr<libmnt_context, Free>;
 
 Answer<> answerOf(int error)
 {
@@ -35,27 +33,6 @@ Answer<> answerOf(int error)
         case EACCES: return Refusal{Refusal::Kind::NotAllowed, {}};
         default: return Refusal{Refusal::Kind::Other, errorText(error)};
     }
-}
-
-// 0, or an errno value. The library answers its own failures negative, and a system call's with a
-// status of its own (libmount's documentation, "Mount context"). A helper, such as that of NTFS-3G,
-// has neither and told its own standard error.
-int errorOf(const Context& context, int answer)
-{
-    if (answer == 0)
-        return mnt_context_helper_executed(context.get()) == 1 &&
-                       mnt_context_get_helper_status(context.get()) != 0
-                   ? EIO
-                   : 0;
-    const int error = mnt_context_get_syscall_errno(context.get());
-    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
-}
-
-/// Whether another mount lies over it, which would be unmounted in its stead.
-bool isCovered(const pellar::MountPlace& place)
-{
-    const std::uint64_t shown = pellar::mountShownAt(place.target);
-    return shown != 0 && place.id != 0 && shown != place.id;
 }
 
 /// Where the table says that the device belongs; empty where it says nothing. The cache knows
@@ -90,7 +67,7 @@ Answer<> mount(const std::string& node)
     const std::string target = targetInTable(node);
     if (target.empty())
         return Refusal{Refusal::Kind::NoTable, {}};
-    const Context context(mnt_new_context());
+    const pellar::MountContext context(mnt_new_context());
     if (!context)
         return answerOf(ENOMEM);
     // By its target alone, libmount takes the rest from the table.
@@ -105,10 +82,10 @@ Answer<> unmount(const std::string& node)
         return Refusal{Refusal::Kind::AlreadySo, {}};
     // The last one first: it may lie over or below the others.
     for (; !places.empty(); places.pop_back()) {
-        const Context context(mnt_new_context());
+        const pellar::MountContext context(mnt_new_context());
         if (!context)
             return answerOf(ENOMEM);
-        if (isCovered(places.back()))
+        if (isCovered(places.back(), places))
             return answerOf(EBUSY);
         mnt_context_set_target(context.get(), places.back().target.c_str());
         if (const int error = errorOf(context, mnt_context_umount(context.get())))

@@ -24,4 +24,17 @@ private:
     sigset_t before_;
 };
 
+/// In a forked child, before its exec: nothing of ours is handled, ignored or blocked there. Safe
+/// after a fork (signal-safety(7)).
+inline void resetSignals()
+{
+    struct sigaction standard = {};
+    standard.sa_handler = SIG_DFL;
+    for (int signal = 1; signal < NSIG; ++signal)
+        ::sigaction(signal, &standard, nullptr);
+    sigset_t none;
+    ::sigemptyset(&none);
+    ::pthread_sigmask(SIG_SETMASK, &none, nullptr);
+}
+
 }  // namespace pellar
