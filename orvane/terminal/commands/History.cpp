@@ -24,6 +24,15 @@ std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Ses
     return lines;
 }
 
+// The module leaves out the disks of a failing drive, on which nothing is to be done. Their history is
+// wanted most of all, and looking at it does nothing to them.
+void forgetFailure(const std::shared_ptr<Disk>& disk)
+{
+    DiskFacts facts = disk->facts();
+    facts.hasSMARTError = false;
+    disk->setFacts(facts);
+}
+
 }  // namespace
 
 int runHistory(const Request& request, Session& session, Reporter& reporter)
@@ -32,7 +41,8 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
     for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
         const std::shared_ptr<Disk> top = session.attach(named.disk);
         const std::shared_ptr<Disk> shown = top ? top : named.disk;
-        std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
+        const std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
+        std::for_each(selection.begin(), selection.end(), forgetFailure);
         session.select({shown});
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
