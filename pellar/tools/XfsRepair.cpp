@@ -99,9 +99,21 @@ class XfsOutput final : public LineOutput {
         return problem(line, sign == nullptr ? Damage::Contents : sign->kind);
     }
 
+    /// "superblock read failed, offset 0, size 32768, ag 0, rval -1", "fatal error -- Input/output
+    /// error", "xfs_repair: read failed: Input/output error"
+    void noteReading(std::string_view line)
+    {
+        if (line.ends_with("Input/output error"))
+            noteReadFault({});
+        else if (line.starts_with("superblock read failed, ") || line.starts_with("can't read ") ||
+                 line.starts_with("cannot read "))
+            noteReadFault({std::nullopt, std::nullopt, true});
+    }
+
     /// YES for a line that tells of the check and not of the volume.
     bool note(std::string_view line)
     {
+        noteReading(line);
         const bool isEnd =
             line.starts_with("No modify flag set, skipping filesystem flush") || line == "done";
         const bool isLog =
