@@ -198,6 +198,8 @@ JobScript::State JobScript::look()
     const RunEvidence evidence =
         runOnce(Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = judge(evidence);
+    counts_.collectedOne = tool_->habits.collectedOne;
+    counts_.collectedMany = tool_->habits.collectedMany;
     counts_.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
     foundDamage_ = judgement.verdict == Verdict::Damaged;
     const bool waitsForReplay = judgement.verdict == Verdict::Inconclusive &&

@@ -76,7 +76,8 @@ bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& 
 std::vector<Sentence> lossesOf(const FileCounts& counts)
 {
     std::vector<Sentence> losses;
-    if (counts.before && counts.after && *counts.after < *counts.before)
+    const bool areCounted = counts.before && counts.after;
+    if (areCounted && *counts.after < *counts.before)
         losses.push_back(sentenceAbout(*counts.before - *counts.after,
                                        "no damage is left, but %1$@ of %2$@ files is gone",
                                        "no damage is left, but %1$@ of %2$@ files are gone",
@@ -84,7 +85,7 @@ std::vector<Sentence> lossesOf(const FileCounts& counts)
     if (counts.reconnected > 0)
         losses.push_back(
             sentenceAbout(counts.reconnected, counts.collectedOne, counts.collectedMany));
-    if (counts.cleared > 0)
+    if (counts.cleared > 0 && !areCounted)
         losses.push_back(sentenceAbout(
             counts.cleared,
             "no damage is left, but %1$@ file or name that made no sense had to be cleared",

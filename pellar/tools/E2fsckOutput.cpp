@@ -218,7 +218,9 @@ bool E2fsckOutput::readRemark(std::string_view line)
     const std::string_view named = behindVolumeName(line);
     if (isTally(named)) {
         findings_.isComplete = true;
-        findings_.files = filesIn(named);
+        // It repeats what the volume's books say, which are wrong where anything is.
+        if (findings_.problems == findings_.corrections)
+            findings_.files = filesIn(named);
     } else if (named == "***** FILE SYSTEM WAS MODIFIED *****")
         findings_.wasModified = true;
     else if (line == "Clearing fields beyond the V1 journal superblock...")

@@ -84,11 +84,13 @@ class NtfsOutput final : public LineOutput {
             findings_.skippedJournal = true;
     }
 
-    // The size of a file it finds out by reading, and takes a bad place for the end.
+    // "Input/output error" by itself it also says of records that make no sense. The size of a file
+    // it finds out by reading, and takes a bad place for the end.
     void noteReading(const std::string& line)
     {
         std::sscanf(line.c_str(), "Current device size: %" SCNu64 " bytes", &readableBytes_);
-        if (line.ends_with(": Input/output error"))
+        if (line.ends_with("pread failed: Input/output error") ||
+            line == "Error reading bootsector: Input/output error")
             noteReadFault({});
         else if (line.find("volume size is bigger than the device size") != std::string::npos)
             noteReadFault({readableBytes_, std::nullopt, true});

@@ -4,7 +4,7 @@
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
 //   await NAME: until there is such a file beside it
-//   await-in-repair NAME: the same, when it was called with -a
+//   await-in-repair NAME: the same, when it was called with -a or -y
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
@@ -65,12 +65,12 @@ void tellTerminal()
                            std::to_string(size.ws_col) + "\n");
 }
 
-/// The option by which fsck.fat is told to write.
+/// The option by which fsck.fat or e2fsck is told to write.
 bool isRepairing()
 {
     std::ifstream commandLine("/proc/self/cmdline");
     for (std::string word; std::getline(commandLine, word, '\0');)
-        if (word == "-a")
+        if (word == "-a" || word == "-y")
             return true;
     return false;
 }
