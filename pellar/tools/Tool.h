@@ -57,6 +57,7 @@ struct Findings {
     bool lacksExternalJournal = false;
     bool lacksOtherDisk = false;  ///< a part of the volume is on a disk that was not found
     bool foundDiskInUse = false;
+    bool expectsDifference = false;  ///< in what is no damage, and so no matter of its exit status
     int crashSignal = 0;  ///< caught by the tool itself; 0 for none
     std::optional<ReadFault> readFault;   ///< the first
     std::optional<std::uint64_t> files;   ///< that it counted, where it says so at its end
