@@ -6,7 +6,7 @@
 
 #include "pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/partitions/DiskMaker.h"
 #include "tests/support/VolumeStates.h"
 
 #include <gtest/gtest.h>
@@ -119,6 +119,25 @@ TEST_F(FailingDiskTest, IsNoEmptyDisk)
     test::Bench bench;
     ASSERT_EQ(bench.verify(test::reference(failing.path(), "")), 0);
     expectAdviceToCopy(bench.listener, "all of it is bad");
+}
+
+// Nothing is restored over a copy that was only not to be read.
+TEST_F(FailingDiskTest, IsNoDamagedPartitionMap)
+{
+    const auto backing = test::DiskImage::gpt(workshop_, "backing").path();
+    for (const FailingDisk::Bad bad :
+         {FailingDisk::Bad{0, 512}, FailingDisk::Bad{32735 * 512, 32768 * 512}})
+        for (const bool repairs : {false, true}) {
+            const FailingDisk failing(workshop_.path("mounted"), backing, {bad});
+            const auto whole = test::wholeDisk(failing.path());
+            test::Bench bench;
+            ASSERT_EQ(bench.finish(repairs
+                                       ? bench.tool->beginPartitionMapRepairForDisk(whole)
+                                       : bench.tool->beginPartitionMapVerifyForDisk(whole)),
+                      0);
+            expectAdviceToCopy(bench.listener, "a copy of the partition map");
+            EXPECT_FALSE(failing.wasWritten());
+        }
 }
 
 // e2fsck -n never reads them, e2fsck -y would answer each question of theirs with yes.
