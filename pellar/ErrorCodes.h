@@ -8,7 +8,7 @@ namespace pellar {
 // How jobs end, beside the codes that a module knows.
 
 /// Verified: damaged, and this kind of volume is not repaired here.
-inline constexpr fixwell::ErrorCode kPLErrorDamagedForGood = -69710;
+inline constexpr fixwell::ErrorCode kPLErrorDamagedForGood = -69712;
 
 /// A repair of what is not repaired here, though it can be verified.
 inline constexpr fixwell::ErrorCode kPLErrorNoRepairHere = -69740;
