@@ -3,6 +3,7 @@
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
+//   say-in-repair TEXT: when it was called with -a or -y
 //   await NAME: until there is such a file beside it
 //   await-in-repair NAME: the same, when it was called with -a or -y
 
@@ -85,7 +86,7 @@ void await(const std::string& name)
 void act(const std::string& action, const std::string& text)
 {
     const int number = std::atoi(text.c_str());
-    if (action == "say")
+    if (action == "say" || (action == "say-in-repair" && isRepairing()))
         put(STDOUT_FILENO, text + "\n");
     else if (action == "progress")
         put(4, text + "\n");
