@@ -63,7 +63,8 @@ constexpr std::array texts{
     ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},
 };
 
-// Codes are given out in two headers. A number that stood in both would give one error the other's text.
+// Codes are given out in two headers. A number that stood in both would give one error the other's
+// text.
 consteval bool everyCodeAndTextIsThereOnce()
 {
     for (auto text = texts.begin(); text != texts.end(); ++text)

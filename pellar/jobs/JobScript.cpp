@@ -8,8 +8,8 @@
 #include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
-#include "pellar/tools/Judging.h"
 #include "pellar/tools/Capability.h"
+#include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
 #include "pellar/volumes/DiskBytes.h"
 #include "pellar/volumes/DiskForTool.h"
@@ -202,8 +202,8 @@ JobScript::State JobScript::look()
     counts_.collectedMany = tool_->habits.collectedMany;
     counts_.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
     foundDamage_ = judgement.verdict == Verdict::Damaged;
-    const bool waitsForReplay = judgement.verdict == Verdict::Inconclusive &&
-                                evidence.findings.skippedJournal;
+    const bool waitsForReplay =
+        judgement.verdict == Verdict::Inconclusive && evidence.findings.skippedJournal;
     if (waitsForReplay && !tool_->habits.logReplayedAs.empty())
         return State::Replaying;
     if (!foundDamage_ && !(waitsForReplay && tool_->habits.replaysInRepair))
@@ -317,11 +317,10 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
 /// What a tool takes for damage may be a disk that cannot be read, which not every tool says.
 Judgement JobScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
 {
-    const bool isAnswer = judgement.code == kPLErrorUnreadable ||
-                          judgement.code == fixwell::kPLErrorDamaged ||
-                          judgement.code == kPLErrorCutShort ||
-                          judgement.code == fixwell::kPLErrorInconclusive ||
-                          judgement.code == fixwell::kPLErrorToolFailed;
+    const bool isAnswer =
+        judgement.code == kPLErrorUnreadable || judgement.code == fixwell::kPLErrorDamaged ||
+        judgement.code == kPLErrorCutShort || judgement.code == fixwell::kPLErrorInconclusive ||
+        judgement.code == fixwell::kPLErrorToolFailed;
     if (obstacle_ || !isAnswer || stop_.isPressed() ||
         std::holds_alternative<NotStarted>(evidence.result.ending))
         return judgement;
@@ -336,7 +335,8 @@ std::optional<std::uint64_t> JobScript::unreadableByte(const ReadFault& fault) c
     constexpr std::uint64_t around = 1U << 20U;
     const std::uint64_t available = disk_.claim().availableBytes();
     std::vector<DiskPiece> pieces = endsOfVolume(available);
-    const auto byte = fault.block ? productOrGreatest(*fault.block, volume_.blockBytes) : fault.byte;
+    const auto byte =
+        fault.block ? productOrGreatest(*fault.block, volume_.blockBytes) : fault.byte;
     if (byte && *byte < available)
         pieces.insert(pieces.begin(), {*byte, std::min(around, available - *byte)});
     else if (fault.isUnproven)
@@ -347,9 +347,8 @@ std::optional<std::uint64_t> JobScript::unreadableByte(const ReadFault& fault) c
 std::optional<std::uint64_t> JobScript::firstUnreadable(const std::vector<DiskPiece>& pieces) const
 {
     const auto deadline = Clock::now() + std::chrono::seconds(30);
-    return pellar::firstUnreadable(
-        disk_.claim().descriptor(), disk_.claim().offset(), pieces,
-        [&] { return stop_.isPressed() || Clock::now() > deadline; });
+    return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces,
+                                   [&] { return stop_.isPressed() || Clock::now() > deadline; });
 }
 
 }  // namespace pellar

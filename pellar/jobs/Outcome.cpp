@@ -78,10 +78,9 @@ std::vector<Sentence> lossesOf(const FileCounts& counts)
     std::vector<Sentence> losses;
     const bool areCounted = counts.before && counts.after;
     if (areCounted && *counts.after < *counts.before)
-        losses.push_back(sentenceAbout(*counts.before - *counts.after,
-                                       "no damage is left, but %1$@ of %2$@ files is gone",
-                                       "no damage is left, but %1$@ of %2$@ files are gone",
-                                       std::to_string(*counts.before)));
+        losses.push_back(sentenceAbout(
+            *counts.before - *counts.after, "no damage is left, but %1$@ of %2$@ files is gone",
+            "no damage is left, but %1$@ of %2$@ files are gone", std::to_string(*counts.before)));
     if (counts.reconnected > 0)
         losses.push_back(
             sentenceAbout(counts.reconnected, counts.collectedOne, counts.collectedMany));
@@ -106,8 +105,8 @@ Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& 
         if (!outcome.warnings.empty())
             outcome.reason = outcome.warnings.front();
     } else if (confirmation.verdict == Verdict::Damaged) {
-        outcome.code = outcome.code == kPLErrorCutShort ? kPLErrorCutShort
-                                                        : fixwell::kPLErrorNotRepaired;
+        outcome.code =
+            outcome.code == kPLErrorCutShort ? kPLErrorCutShort : fixwell::kPLErrorNotRepaired;
         if (!passes.empty() && passes.back().judgement.verdict == Verdict::Failed)
             outcome.reason = passes.back().judgement.reason;
     }

@@ -209,8 +209,8 @@ bool E2fsckOutput::readTrouble(std::string_view line)
         ++findings_.problems;
         findings_.damage.add(Damage::Structure);
     }
-    return signal != 0 || isClearedJournal || isInUse || lacksJournal || line.starts_with("e2fsck: ") ||
-           line.starts_with("ext2fs_");
+    return signal != 0 || isClearedJournal || isInUse || lacksJournal ||
+           line.starts_with("e2fsck: ") || line.starts_with("ext2fs_");
 }
 
 bool E2fsckOutput::readRemark(std::string_view line)

@@ -49,8 +49,8 @@ constexpr std::array signs{
 
 constexpr std::array bootDetails{"Root directory start", "Data area starts", "First FAT starts"};
 
-/// "Read 512 bytes at 16384:Input/output error", or less of it came: "Got 1024 bytes instead of 4096
-/// at 16384".
+/// "Read 512 bytes at 16384:Input/output error", or less of it came: "Got 1024 bytes instead of
+/// 4096 at 16384".
 std::optional<ReadFault> readFaultIn(const std::string& line)
 {
     std::uint64_t count = 0;

@@ -119,7 +119,8 @@ Judgement brokenOff(const RunEvidence& evidence, std::int32_t detail, Sentence r
 
 bool hasDamage(const RunEvidence& evidence)
 {
-    return hasFindings(evidence) || evidence.volume.isCutShort() || evidence.volume.differsFromBackup;
+    return hasFindings(evidence) || evidence.volume.isCutShort() ||
+           evidence.volume.differsFromBackup;
 }
 
 std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::string_view tool)
@@ -138,9 +139,9 @@ std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::str
     if (evidence.result.cause != StopCause::None)
         return judgementOfEnded(evidence, tool);
     if (const auto* const killed = std::get_if<Killed>(&ending))
-        return brokenOff(evidence, killed->signal,
-                         {"%1$@ was killed (signal %2$@)", std::string(tool),
-                          std::to_string(killed->signal)});
+        return brokenOff(
+            evidence, killed->signal,
+            {"%1$@ was killed (signal %2$@)", std::string(tool), std::to_string(killed->signal)});
     return std::nullopt;
 }
 

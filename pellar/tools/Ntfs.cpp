@@ -142,8 +142,8 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     const auto sector = readNtfsBootSector(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(sector, "ntfs", disk, offset, availableBytes);
     facts.volumeBytes = sector ? sector->volumeBytes : 0;
-    facts.differsFromBackup = facts.hasPrimary && !facts.isCutShort() &&
-                              differsFromNtfsBackup(disk, offset, *sector);
+    facts.differsFromBackup =
+        facts.hasPrimary && !facts.isCutShort() && differsFromNtfsBackup(disk, offset, *sector);
     facts.isMarkedDirty = sector && isNtfsMarkedDirty(disk, offset, *sector).value_or(false);
     facts.needsRecovery = sector && hasNtfsJournalWaiting(disk, offset, *sector).value_or(false);
     return facts;

@@ -58,11 +58,11 @@ struct Findings {
     bool lacksOtherDisk = false;  ///< a part of the volume is on a disk that was not found
     bool foundDiskInUse = false;
     bool expectsDifference = false;  ///< in what is no damage, and so no matter of its exit status
-    int crashSignal = 0;  ///< caught by the tool itself; 0 for none
-    std::optional<ReadFault> readFault;   ///< the first
-    std::optional<std::uint64_t> files;   ///< that it counted, where it says so at its end
-    std::uint64_t reconnected = 0;        ///< files that it gave a new name, as they had none
-    std::uint64_t cleared = 0;            ///< files and names that it did away with
+    int crashSignal = 0;             ///< caught by the tool itself; 0 for none
+    std::optional<ReadFault> readFault;  ///< the first
+    std::optional<std::uint64_t> files;  ///< that it counted, where it says so at its end
+    std::uint64_t reconnected = 0;       ///< files that it gave a new name, as they had none
+    std::uint64_t cleared = 0;           ///< files and names that it did away with
 
     friend bool operator==(const Findings&, const Findings&) = default;
 };
@@ -89,9 +89,10 @@ struct VolumeFacts {
     std::uint64_t volumeBytes = 0;  ///< 0 when not known
     std::uint64_t availableBytes = 0;
     std::uint64_t blockBytes = 0;  ///< of the blocks that its tool counts in; 0 when it does not
-    bool differsFromBackup = false;  ///< the two copies of the main superblock contradict each other
+    bool differsFromBackup =
+        false;  ///< the two copies of the main superblock contradict each other
     std::optional<std::uint64_t> files;  ///< by its own books, where these agree with each other
-    std::vector<DiskPiece> backups;         ///< what a repair uses and a verification does not read
+    std::vector<DiskPiece> backups;      ///< what a repair uses and a verification does not read
 
     bool isCutShort() const { return volumeBytes > availableBytes; }
 };

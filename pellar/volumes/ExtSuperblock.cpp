@@ -166,8 +166,8 @@ std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
 {
     constexpr std::uint32_t smallestWithHighHalf = 64;
     const std::uint64_t bytes = superblock.descriptorTableBytes();
-    if (superblock.hasMetaGroups || bytes == 0 ||
-        superblock.descriptorBytes < 32 || superblock.freeInodes > superblock.inodeCount)
+    if (superblock.hasMetaGroups || bytes == 0 || superblock.descriptorBytes < 32 ||
+        superblock.freeInodes > superblock.inodeCount)
         return std::nullopt;
     const std::uint64_t place =
         (std::uint64_t{superblock.firstDataBlock} + 1) * superblock.blockBytes;
@@ -176,8 +176,8 @@ std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
         return std::nullopt;
     std::uint64_t free = 0;
     for (std::uint64_t group = 0; group < superblock.groups(); ++group) {
-        const Bytes entry = Bytes(*table).subspan(group * superblock.descriptorBytes,
-                                                  superblock.descriptorBytes);
+        const Bytes entry =
+            Bytes(*table).subspan(group * superblock.descriptorBytes, superblock.descriptorBytes);
         free += number(entry, 0x0E, 2);
         if (superblock.descriptorBytes >= smallestWithHighHalf)
             free += std::uint64_t{number(entry, 0x2E, 2)} << 16U;

@@ -131,9 +131,8 @@ TEST_F(FailingDiskTest, IsNoDamagedPartitionMap)
             const FailingDisk failing(workshop_.path("mounted"), backing, {bad});
             const auto whole = test::wholeDisk(failing.path());
             test::Bench bench;
-            ASSERT_EQ(bench.finish(repairs
-                                       ? bench.tool->beginPartitionMapRepairForDisk(whole)
-                                       : bench.tool->beginPartitionMapVerifyForDisk(whole)),
+            ASSERT_EQ(bench.finish(repairs ? bench.tool->beginPartitionMapRepairForDisk(whole)
+                                           : bench.tool->beginPartitionMapVerifyForDisk(whole)),
                       0);
             expectAdviceToCopy(bench.listener, "a copy of the partition map");
             EXPECT_FALSE(failing.wasWritten());

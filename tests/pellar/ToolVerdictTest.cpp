@@ -211,28 +211,42 @@ TEST(ToolVerdict, WhatCannotBeReadIsNotDamaged)
     const ReadFault somewhere;
     const ReadFault perhaps{std::nullopt, std::nullopt, true};
     for (const Fault& c :
-         {Fault{"ext4", {"Error reading block 357 (Input/output error).  Ignore error? no"},
-                Verdict::Failed, ReadFault{std::nullopt, 357, false}},
+         {Fault{"ext4",
+                {"Error reading block 357 (Input/output error).  Ignore error? no"},
+                Verdict::Failed,
+                ReadFault{std::nullopt, 357, false}},
           Fault{"ext4",
                 {"Error reading block 9 (Attempt to read block from filesystem resulted in short "
                  "read) while reading inode and block bitmaps.  Ignore error? no"},
-                Verdict::Damaged, ReadFault{std::nullopt, 9, true}},
-          Fault{"ext4", {"DISK: Input/output error reading journal superblock"}, Verdict::Failed,
+                Verdict::Damaged,
+                ReadFault{std::nullopt, 9, true}},
+          Fault{"ext4",
+                {"DISK: Input/output error reading journal superblock"},
+                Verdict::Failed,
                 somewhere},
-          Fault{"ext4", {"Entry 'Input/output error' in / (2) is a link to '.'  Clear? no"},
-                Verdict::Damaged, std::nullopt},
-          Fault{"vfat", {"Read 512 bytes at 16384:Input/output error"}, Verdict::Failed,
+          Fault{"ext4",
+                {"Entry 'Input/output error' in / (2) is a link to '.'  Clear? no"},
+                Verdict::Damaged,
+                std::nullopt},
+          Fault{"vfat",
+                {"Read 512 bytes at 16384:Input/output error"},
+                Verdict::Failed,
                 ReadFault{16384, std::nullopt, false}},
-          Fault{"vfat", {"Got 100 bytes instead of 512 at 16384"}, Verdict::Failed,
+          Fault{"vfat",
+                {"Got 100 bytes instead of 512 at 16384"},
+                Verdict::Failed,
                 ReadFault{16484, std::nullopt, true}},
           Fault{"exfat", {"failed to read bitmap"}, Verdict::Damaged, perhaps},
-          Fault{"ntfs", {"ntfs_attr_pread_i: ntfs_pread failed: Input/output error"},
-                Verdict::Failed, somewhere},
+          Fault{"ntfs",
+                {"ntfs_attr_pread_i: ntfs_pread failed: Input/output error"},
+                Verdict::Failed,
+                somewhere},
           Fault{"xfs", {"xfs_repair: read failed: Input/output error"}, Verdict::Failed, somewhere},
           Fault{"btrfs", {"Error reading 22036480, -1"}, Verdict::Failed, somewhere},
           Fault{"f2fs",
                 {"[ASSERT] (get_current_sit_page:2054) dev_read_block(sit_blk, blk_addr) >= 0"},
-                Verdict::Damaged, perhaps}}) {
+                Verdict::Damaged,
+                perhaps}}) {
         const Tool& tool = *toolFor(c.filesystem);
         EXPECT_EQ(readAll(tool, c.lines).findings.readFault, c.fault) << c.lines.front();
         EXPECT_EQ(judge(tool, c.lines, Exited{1}).verdict, c.verdict) << c.lines.front();
@@ -244,8 +258,7 @@ TEST(ToolVerdict, ACrashDoesNotUndoWhatWasFound)
 {
     VolumeFacts waiting = plainVolume();
     waiting.needsRecovery = true;
-    for (const auto& [filesystem, line] :
-         std::map<std::string_view, std::string>{
+    for (const auto& [filesystem, line] : std::map<std::string_view, std::string>{
              {"ext4", "Free blocks count wrong (1, counted=40914).  Fix? no"},
              {"vfat", "Dirty bit is set. Fs was not properly unmounted"},
              {"xfs", "agi unlinked bucket 3 is 131 in ag 0"}}) {

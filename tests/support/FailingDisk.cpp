@@ -59,8 +59,8 @@ FailingDisk::FailingDisk(std::filesystem::path directory, const std::filesystem:
       bad_(std::move(bad)),
       since_(since)
 {
-    const std::string options = "fd=" + std::to_string(fuse_.get()) +
-                                ",rootmode=40000,user_id=0,group_id=0,allow_other";
+    const std::string options =
+        "fd=" + std::to_string(fuse_.get()) + ",rootmode=40000,user_id=0,group_id=0,allow_other";
     if (!backing_ || !fuse_ ||
         ::mount("failing-disk", directory_.c_str(), "fuse", 0, options.c_str()) != 0)
         throw std::runtime_error("cannot prepare the test: no FUSE file system can be mounted");
