@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/OutcomeReport.h"
 
+#include "pellar/ErrorCodes.h"
+
 namespace pellar {
 
 void tellOutcome(const Outcome& outcome, Operation operation, const Texts& texts, JobLog& log)
@@ -8,12 +10,17 @@ void tellOutcome(const Outcome& outcome, Operation operation, const Texts& texts
     const std::string message = messageOf(outcome, operation, log.diskName(), texts);
     const bool isUnanswered =
         outcome.verdict == Verdict::Failed || outcome.verdict == Verdict::Inconclusive;
-    if (isUnanswered)
+    if (isUnanswered || !outcome.warnings.empty())
         log.failure(message);
     else if (!outcome.reason.isEmpty())
         log.remark(message);
+    for (std::size_t i = 1; i < outcome.warnings.size(); ++i)
+        log.failure(messageOf({outcome.verdict, outcome.code, 0, outcome.warnings[i], {}},
+                              operation, log.diskName(), texts));
+    const bool isForGood =
+        outcome.code == kPLErrorDamagedForGood || outcome.code == kPLErrorCutShort;
     log.verdict(outcome.verdict,
-                operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite);
+                operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite, isForGood);
     log.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
     log.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
 }
