@@ -9,6 +9,8 @@ namespace orvane {
 
 void RunKeeper::begin(const fixwell::DiskReferencePointer& reference, Operation operation)
 {
+    // What was said until now has its time before this run's.
+    host_.histories().saveNew();
     const auto disk =
         std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
     run_ = disk ? host_.historyStore().beginRun(host_.histories().keyOf(disk->facts()),

@@ -46,6 +46,22 @@ void LogTable::scrollToPixelsBeforeEnd(int pixels)
     verticalScrollBar()->setValue(verticalScrollBar()->maximum() - pixels);
 }
 
+void LogTable::putRowAt(int row, int top)
+{
+    executeDelayedItemsLayout();
+    updateGeometries();
+    verticalScrollBar()->setValue(verticalScrollBar()->value() + rowViewportPosition(row) - top);
+}
+
+// The end stays in sight when the pane above takes room.
+void LogTable::resizeEvent(QResizeEvent* event)
+{
+    const bool wasAtEnd = pixelsToEnd() == 0;
+    QTableView::resizeEvent(event);
+    if (wasAtEnd)
+        scrollToPixelsBeforeEnd(0);
+}
+
 void LogTable::keyPressEvent(QKeyEvent* event)
 {
     if (handlers_.keyDown)

@@ -22,10 +22,13 @@ public:
     void setHandlers(Handlers handlers) { handlers_ = std::move(handlers); }
     /// Selected rows can be dragged out of the log.
     void setDraggable(bool isDraggable) { isDraggable_ = isDraggable; }
-    /// What a table does with a key that nobody else wants.
     /// What is hidden below the last visible row.
     int pixelsToEnd() const;
     void scrollToPixelsBeforeEnd(int pixels);
+    /// Scrolls until the row's top is so many pixels below that of the viewport, or as near as the
+    /// ends allow.
+    void putRowAt(int row, int top);
+    /// What a table does with a key that nobody else wants.
     void handleKey(QKeyEvent& event) { QTableView::keyPressEvent(&event); }
 
 protected:
@@ -33,6 +36,7 @@ protected:
     void mousePressEvent(QMouseEvent* event) override;
     void startDrag(Qt::DropActions supported) override;
     void changeEvent(QEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
 
 private:
     void adoptFont();

@@ -36,6 +36,7 @@ public:
     bool loadAll();
 
     fixwell::Array historyOf(const DiskFacts& disk) override;
+    const RecordTimes& timesOf(const DiskFacts& disk) override;
     void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) override;
     bool clearHistoryOf(const DiskFacts& disk) override;
     std::uint64_t revision() const override { return revision_; }
@@ -52,11 +53,13 @@ private:
     /// The records before those that are in the list already.
     struct Older {
         fixwell::Array records;
+        RecordTimes times;
         HistoryStore::Range left;
     };
 
     struct History {
         fixwell::Array records;
+        RecordTimes times;
         std::size_t savedCount = 0;
         fixwell::Value lastSaved;
         std::optional<Older> older = std::nullopt;
@@ -65,7 +68,7 @@ private:
     History& find(const DiskFacts& disk);
     History load(const std::string& key);
     static void complete(History& history);
-    void save(const std::string& key, History& history);
+    void save(const std::string& key, History& history, RecordTimes::Time now);
     static bool hasOnlyGrown(const History& history);
 
     HistoryStore& store_;
