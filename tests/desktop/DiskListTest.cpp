@@ -43,7 +43,18 @@ protected:
     Notifications center_;
     DiskController controller_{
         center_, {[](std::string_view) { return FilesystemCapabilities(); }, nullptr}};
-    DiskTreeModel model_{controller_, [](const Disk&) { return std::optional<LastCheck>(); },
+    std::map<std::string, LastCheck> checks_;
+    std::string busy_;
+    DiskTreeModel model_{controller_,
+                         {[this](const Disk& disk) {
+                              const auto found = checks_.find(disk.facts().identifier);
+                              return found != checks_.end() ? std::optional(found->second)
+                                                            : std::nullopt;
+                          },
+                          [this](const Disk& disk) {
+                              return disk.facts().identifier == busy_ ? "verifying…" : "";
+                          },
+                          [](const Disk&) { return std::string(); }},
                          texts_};
     DiskList list_{texts_};
 };

@@ -38,6 +38,8 @@ public:
     bool hasGone() const { return hasGone_; }
     /// An image file shows the histories of what was found in it, also after it was detached.
     void setContents(std::shared_ptr<Disk> contents);
+    /// None for what is no image file, or was never attached.
+    const std::shared_ptr<Disk>& contents() const { return contents_; }
 
     std::string diskIdentifier() const override { return facts_.identifier; }
     /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.

@@ -105,16 +105,64 @@ void DiskHistories::replaceHistoryOf(const DiskFacts& disk, const Array& history
 
 bool DiskHistories::clearHistoryOf(const DiskFacts& disk)
 {
+    const std::string key = keyOf(disk);
     History& history = find(disk);
-    const bool hadRecords = !history.records.isEmpty();
+    auto runs = store_.runs(key);
+    const bool hadAny = !history.records.isEmpty() || !runs.empty();
+    if (remembersCleared_ && hadAny)
+        remember(key, history, std::move(runs));
     history.records.removeAll();
     history.times = {};
     history.older.reset();
-    if (store_.clear(keyOf(disk))) {
+    if (store_.clear(key)) {
         history.savedCount = 0;
         history.lastSaved = {};
     }
-    return hadRecords;
+    return hadAny;
+}
+
+void DiskHistories::remember(const std::string& key, History& history, std::vector<Run> runs)
+{
+    history.times.add(history.records.size(), RecordTimes::Time::clock::now());
+    Cleared cleared{key, Array::make(), history.times, std::move(runs), clearing_};
+    if (history.older) {
+        store_.load(history.older->left, history.older->records, history.older->times);
+        cleared.records.append(history.older->records);
+        cleared.times.insertInFront(history.older->times);
+    }
+    cleared.records.append(history.records);
+    cleared_.push_back(std::move(cleared));
+}
+
+void DiskHistories::restoreCleared()
+{
+    saveNew();
+    const std::uint64_t last = cleared_.empty() ? 0 : cleared_.back().clearing;
+    for (; !cleared_.empty() && cleared_.back().clearing == last; cleared_.pop_back())
+        restore(cleared_.back());
+    ++revision_;
+}
+
+void DiskHistories::restore(const Cleared& cleared)
+{
+    History& history = histories_[cleared.key];
+    const Array all = Array::make();
+    all.append(cleared.records);
+    if (history.records)
+        all.append(history.records);
+    history.times.insertInFront(cleared.times);
+    history.records = all;
+    const auto newer = store_.runs(cleared.key);
+    if (!store_.clear(cleared.key))
+        return;
+    history.savedCount = 0;
+    for (const auto* const runs : {&cleared.runs, &newer})
+        for (const Run& run : *runs) {
+            const std::int64_t number = store_.beginRun(cleared.key, run.action, run.started);
+            if (run.end)
+                store_.endRun(number, *run.end, run.finished.value_or(run.started));
+        }
+    save(cleared.key, history, RecordTimes::Time::clock::now());
 }
 
 void DiskHistories::saveNew()
