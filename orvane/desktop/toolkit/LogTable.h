@@ -7,8 +7,9 @@
 
 namespace orvane::desktop {
 
-/// The widget of the log: one column, equal rows, no header. A table rather than a tree, because
-/// a tree lays all its rows out anew whenever one is added.
+/// The widget of the log: one column, no header. Rows have one line until they come into sight;
+/// then they are as high as the delegate wants them. A table rather than a tree, because a tree
+/// lays all its rows out anew whenever one is added.
 class LogTable final : public QTableView {
 public:
     struct Handlers {
@@ -37,9 +38,11 @@ protected:
     void startDrag(Qt::DropActions supported) override;
     void changeEvent(QEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
 
 private:
     void adoptFont();
+    bool fitRowsInSight();
 
     Handlers handlers_;
     bool isDraggable_ = true;
