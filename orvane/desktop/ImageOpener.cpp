@@ -46,8 +46,10 @@ void ImageOpener::open(const std::vector<std::string>& names)
 // whose own image was read long ago.
 void ImageOpener::read(const std::filesystem::path& image)
 {
-    if (!inReading_.insert(image).second)
+    if (const auto [underWay, isNew] = inReading_.emplace(image, false); !isNew) {
+        underWay->second = true;
         return;
+    }
     const auto reading = std::make_shared<std::shared_ptr<ImageReading>>();
     const auto told = [lifeline = lifeline_, reading, image] {
         if (lifeline->opener != nullptr)
@@ -62,10 +64,12 @@ void ImageOpener::read(const std::filesystem::path& image)
 
 void ImageOpener::finish(const std::filesystem::path& image, const ImageReading& reading)
 {
-    inReading_.erase(image);
+    const bool mustReadAgain = inReading_.extract(image).mapped();
     const auto result = reading.result();
     if (!isOpen(image) || !result)
         return;
+    if (mustReadAgain)
+        read(image);
     Known known;
     if (failed(*result)) {
         known = known_[image];

@@ -8,7 +8,6 @@
 #include <map>
 #include <memory>
 #include <mutex>
-#include <set>
 #include <string>
 #include <vector>
 
@@ -75,7 +74,8 @@ private:
     SupportHost& host_;
     Events events_;
     std::map<std::filesystem::path, Known> known_;
-    std::set<std::filesystem::path> inReading_;
+    /// YES: it must be read once more, because what is being read may be out of date.
+    std::map<std::filesystem::path, bool> inReading_;
     std::shared_ptr<Lifeline> lifeline_ = std::make_shared<Lifeline>();
 };
 

@@ -110,6 +110,31 @@ TEST_F(DiskListTest, SelectedDisksComeInTheListsOrder)
     EXPECT_EQ(order, "a a1 a2 b b1 ");
 }
 
+TEST_F(DiskListTest, AParentSaysWhatItsWorstPartIs)
+{
+    list_.show(model_, [] {});
+    struct Case {
+        std::string verdictOfDisk;
+        std::string verdictOfPart;
+        std::string busy;
+        std::string state;
+    };
+    for (const Case& c : {Case{"sound", "damaged", "", "damaged"}, Case{"damaged", "sound", "", "damaged"},
+                          Case{"sound", "failed", "", "failed"}, Case{"sound", "sound", "", "sound"},
+                          Case{"sound", "", "", "partly checked"}, Case{"", "", "", ""},
+                          Case{"damaged", "sound", "a1", "verifying…"}}) {
+        checks_.clear();
+        if (!c.verdictOfDisk.empty())
+            checks_["a"].told.verdict = c.verdictOfDisk;
+        if (!c.verdictOfPart.empty())
+            checks_["a1"].told.verdict = c.verdictOfPart;
+        busy_ = c.busy;
+        synchronize({disk("a", {disk("a1")})});
+        const QModelIndex row = model_.index(0, static_cast<int>(DiskColumn::Verdict));
+        EXPECT_EQ(fromQt(row.data().toString()), c.state) << c.verdictOfDisk << c.verdictOfPart;
+    }
+}
+
 TEST_F(DiskListTest, ALabelIsNeverMoreThanText)
 {
     list_.show(model_, [] {});

@@ -95,6 +95,71 @@ TEST_F(JobFaultTest, AnImageThatIsLostDuringItsCheckIsNeverTakenForAnother)
     }
 }
 
+// A check that did not take place must not look like one that had nothing to say.
+TEST_F(JobFaultTest, AnImageThatNoToolGotToSeeIsSaid)
+{
+    struct Case {
+        std::string name;
+        std::function<void(const std::string& image)> lose;
+        std::string why;
+        std::string note;
+    };
+    for (const Case& c :
+         {Case{"gone", [](const std::string& image) { fs::remove(image); },
+               "No such file or directory", "cannot be read: No such file or directory"},
+          Case{"emptied", [](const std::string& image) { fs::resize_file(image, 0); },
+               "the file is empty", "cannot be read: the file is empty"},
+          Case{"swap",
+               [](const std::string& image) {
+                   EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", image},
+                                                   "label: gpt\ntype=swap\n"),
+                             0);
+               },
+               "there is no volume on it that can be checked", ""}}) {
+        const std::string image = makeImage(c.name);
+        const std::string other = makeImage("other");
+        open({image, other});
+        window().disks().setFocus();
+        command("selectAll").trigger();
+        c.lose(image);
+        button("verifyDiskButton").press();
+        ASSERT_TRUE(waitForJob());
+        ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; })) << c.name;
+        takePicture("unreached-" + c.name);
+        const std::string alert = takeAlert();
+        EXPECT_NE(alert.find(c.why), std::string::npos) << alert;
+        EXPECT_NE(alert.find(c.name + ".img"), std::string::npos) << alert;
+        EXPECT_EQ(cell(image, DiskColumn::Verdict), "failed") << c.name;
+        EXPECT_EQ(cell(other, DiskColumn::Verdict), "sound") << c.name;
+        select(image);
+        EXPECT_TRUE(logHolds(c.why)) << testing::PrintToString(logRows());
+        EXPECT_TRUE(waitUntil([&] {
+            return details(image).find(c.note) != std::string::npos;
+        })) << details(image);
+        close();
+    }
+}
+
+TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
+{
+    const std::string image = makeImage("first");
+    start("verifyDiskButton", image);
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(image, DiskColumn::Name), "first (first.img)");
+    fs::rename(makeDamagedImage("second"), image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_NE(takeAlert().find("“second”"), std::string::npos);
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "damaged");
+    EXPECT_EQ(cell(image, DiskColumn::Name), "second (first.img)");
+    EXPECT_TRUE(logHolds("needs to be repaired")) << testing::PrintToString(logRows());
+    EXPECT_FALSE(logHolds("appears to be OK")) << "that was another volume";
+
+    fs::rename(makePartitionedImage("parts"), image);
+    command("rescan").trigger();
+    EXPECT_TRUE(waitUntil([&] { return cell(image + "#1", DiskColumn::Format) == "ext4"; }));
+}
+
 TEST_F(JobFaultTest, AToolThatIsKilledHasFoundNothing)
 {
     struct Case {

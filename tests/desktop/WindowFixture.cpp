@@ -86,7 +86,7 @@ void WindowFixture::open(const std::vector<std::string>& images)
 
 bool WindowFixture::waitUntil(const std::function<bool()>& isDone)
 {
-    constexpr int longestWait = 30'000;  // milliseconds
+    constexpr int longestWait = 3000;  // milliseconds
     return QTest::qWaitFor(isDone, longestWait);
 }
 
@@ -125,6 +125,11 @@ void WindowFixture::select(const std::string& image)
 std::string WindowFixture::cell(const std::string& image, DiskColumn column)
 {
     return fromQt(row(image).siblingAtColumn(static_cast<int>(column)).data().toString());
+}
+
+std::string WindowFixture::details(const std::string& image)
+{
+    return fromQt(row(image).data(DiskTreeModel::DetailsRole).toString());
 }
 
 QtButton& WindowFixture::button(const char* name)

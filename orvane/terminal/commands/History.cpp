@@ -33,7 +33,10 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
         const std::shared_ptr<Disk> top = session.attach(named.disk);
         const std::shared_ptr<Disk> shown = top ? top : named.disk;
         std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
-        session.select({shown});
+        // What was said of the image as a file is its history, too.
+        if (top)
+            selection.push_back(named.disk);
+        session.select({named.disk});
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
             session.select(selection);
