@@ -112,11 +112,10 @@ pellar::ManagerOptions DesktopSession::libraryOptions()
 void DesktopSession::observeDisks()
 {
     for (const fixwell::Name* const name : diskNotifications)
-        host_.defaultCenter().addObserver(
-            this, *name, [this](const fixwell::Notification&) {
-                window_.disks().synchronize();
-                refreshHints();
-            });
+        host_.defaultCenter().addObserver(this, *name, [this](const fixwell::Notification&) {
+            window_.disks().synchronize();
+            refreshHints();
+        });
     host_.sharedDiskController().hooks().notifyFrontmost =
         [this](fixwell::Name, const fixwell::Notification& notification) {
             if (ModuleTab* const tab = activeTab())
@@ -194,9 +193,8 @@ void DesktopSession::addTab(std::unique_ptr<ModuleTab> tab)
     window_.tabs().insertTab(static_cast<int>(place - tabs_.begin()), page,
                              toQtTitle(tab->module().displayName()));
     if (tab->interface() != nullptr)
-        tab->interface()->setBeforeAction([this](std::string_view action) {
-            lastAction_ = action;
-        });
+        tab->interface()->setBeforeAction(
+            [this](std::string_view action) { lastAction_ = action; });
     tabs_.insert(place, std::move(tab));
 }
 

@@ -55,11 +55,12 @@ void ImageOpener::read(const std::filesystem::path& image)
         if (lifeline->opener != nullptr)
             lifeline->opener->finish(image, **reading);
     };
-    *reading = ImageReading::start(image, [lifeline = lifeline_, told] {
+    const auto done = [lifeline = lifeline_, told] {
         const std::lock_guard guard(lifeline->lock);
         if (lifeline->loop != nullptr)
             lifeline->loop->post(told);
-    });
+    };
+    *reading = ImageReading::start(image, done, host_.imageAttachment().reader());
 }
 
 void ImageOpener::finish(const std::filesystem::path& image, const ImageReading& reading)
@@ -105,7 +106,8 @@ void ImageOpener::refreshAll()
 
 std::string ImageOpener::noteOn(const Disk& disk) const
 {
-    const auto found = disk.isOfflineDiskImage() ? known_.find(disk.facts().imagePath) : known_.end();
+    const auto found =
+        disk.isOfflineDiskImage() ? known_.find(disk.facts().imagePath) : known_.end();
     if (found == known_.end())
         return {};
     const Translator& texts = host_.translator();
@@ -114,9 +116,8 @@ std::string ImageOpener::noteOn(const Disk& disk) const
         return texts.sentence("cannot be read: %@", {known.problem});
     if (known.hasDamagedMap)
         return texts.text("its partition map is damaged");
-    return known.loopDevice.empty()
-               ? std::string()
-               : texts.sentence("it is attached as %@", {known.loopDevice});
+    return known.loopDevice.empty() ? std::string()
+                                    : texts.sentence("it is attached as %@", {known.loopDevice});
 }
 
 bool ImageOpener::canEject(const Disk& disk)

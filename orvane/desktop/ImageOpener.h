@@ -56,8 +56,8 @@ private:
     /// What reaches this object from a reader's thread, as long as it is there.
     struct Lifeline {
         std::mutex lock;
-        HostLoop* loop = nullptr;        ///< guarded; none when the opener has gone
-        ImageOpener* opener = nullptr;   ///< main thread
+        HostLoop* loop = nullptr;       ///< guarded; none when the opener has gone
+        ImageOpener* opener = nullptr;  ///< main thread
     };
     struct Known {
         std::string problem;  ///< why it could not be read

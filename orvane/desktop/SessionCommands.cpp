@@ -37,9 +37,7 @@ std::vector<Menu> DesktopSession::menus()
                            [this](const auto& names) { attachAsDevices(names); });
           },
           isUnlocked},
-         {"rescan",
-          "&Rescan Disks",
-          QKeySequence::Refresh,
+         {"rescan", "&Rescan Disks", QKeySequence::Refresh,
           [this] {
               images_.refreshAll();
               scan_.start();
@@ -222,7 +220,11 @@ MenuCommand DesktopSession::buttonCommand(const char* objectName, std::string_vi
 MenuCommand DesktopSession::mapCommand(const char* objectName, std::string_view title,
                                        const char* button)
 {
-    return {objectName, title, {}, [this, button] { treatMap(button); }, [this] {
+    return {objectName,
+            title,
+            {},
+            [this, button] { treatMap(button); },
+            [this] {
                 return diskWithMap() != nullptr;
             }};
 }

@@ -15,9 +15,7 @@ namespace orvane::desktop {
 JobLedger::Events DesktopSession::ledgerEvents()
 {
     return {[this](const StartedRun& run) { runBegan(run); },
-            [this](const StartedRun& run, const RunEnd& end) {
-                runEnded(run, end);
-            },
+            [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
             [this] {
                 stopAsked();
             }};
@@ -76,6 +74,7 @@ void DesktopSession::jobBegan()
 void DesktopSession::jobEnded()
 {
     wakefulness_.release();
+    host_.imageAttachment().resumeAttachments();
     const auto length = std::chrono::steady_clock::now() - jobStart_;
     const auto runs = std::exchange(finishedRuns_, {});
     const bool isActive = QApplication::activeWindow() != nullptr;
@@ -91,8 +90,8 @@ void DesktopSession::lookBackAtJob()
     if (controller_.interfaceLock())
         return;  // the next job has begun
     controller_.setSelection({});
-    auto sentences = job_.isStopAsked || isEnding_ ? std::vector<std::string>()
-                                                   : keepUnreachedImages();
+    auto sentences =
+        job_.isStopAsked || isEnding_ ? std::vector<std::string>() : keepUnreachedImages();
     if (job_.hasFailed && !job_.isStopAsked && sentences.empty() && job_.reached.empty())
         sentences.push_back(text("Nothing that is selected could be checked."));
     for (const auto& disk : job_.disks)
@@ -111,8 +110,8 @@ std::vector<std::string> DesktopSession::keepUnreachedImages()
     for (const auto& disk : job_.disks) {
         const std::string& name = disk->facts().identifier;
         const auto inside = job_.reached.lower_bound(name);
-        const bool isReached = inside != job_.reached.end() &&
-                               (*inside == name || inside->starts_with(name + "#"));
+        const bool isReached =
+            inside != job_.reached.end() && (*inside == name || inside->starts_with(name + "#"));
         if (!disk->isOfflineDiskImage() || isReached)
             continue;
         sentences.push_back(whyUnreached(host_, *disk, disk->displayName()));

@@ -55,8 +55,7 @@ std::string RunKeeper::withDevice(fixwell::ErrorCode error, std::string text) co
         pellar::loopDeviceOn(status.st_dev, status.st_ino, pellar::SystemPaths());
     return device.empty()
                ? text
-               : text + " " +
-                     host_.translator().sentence("The image is attached as %@.", {device});
+               : text + " " + host_.translator().sentence("The image is attached as %@.", {device});
 }
 
 void RunKeeper::keep(const RunEnd& end)

@@ -28,7 +28,7 @@ private:
 
     SupportHost& host_;
     std::filesystem::path image_;  ///< that the last run was about; empty for a device
-    std::int64_t run_ = 0;  ///< the one that is under way; 0 when it could not be written
+    std::int64_t run_ = 0;         ///< the one that is under way; 0 when it could not be written
 };
 
 }  // namespace orvane

@@ -30,10 +30,10 @@ fixwell::Dictionary headingOfError(const std::string& sentence)
 std::string whyUnreached(SupportHost& host, const Disk& image, const std::string& name)
 {
     const std::string why = host.imageAttachment().lastError(image.diskImagePath());
-    return why.empty() ? host.translator().sentence(
-                             "cannot check “%@”: there is no volume on it that can be checked",
-                             {name})
-                       : why;
+    return why.empty()
+               ? host.translator().sentence(
+                     "cannot check “%@”: there is no volume on it that can be checked", {name})
+               : why;
 }
 
 void keepUnreached(SupportHost& host, Disk& image, Operation operation, const std::string& sentence)
@@ -42,10 +42,9 @@ void keepUnreached(SupportHost& host, Disk& image, Operation operation, const st
     HistoryStore& store = host.historyStore();
     const std::int64_t run =
         store.beginRun(host.histories().keyOf(image.facts()), nameOf(operation), now);
-    store.endRun(run,
-                 {std::string(fixwell::kPLVerdictFailed.text()), fixwell::kPLErrorCannotOpen,
-                  sentence},
-                 now);
+    store.endRun(
+        run, {std::string(fixwell::kPLVerdictFailed.text()), fixwell::kPLErrorCannotOpen, sentence},
+        now);
     image.fsckHistoryNoChildren().append(headingOfError(sentence));
     host.histories().saveNew();
 }

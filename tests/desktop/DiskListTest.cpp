@@ -45,17 +45,17 @@ protected:
         center_, {[](std::string_view) { return FilesystemCapabilities(); }, nullptr}};
     std::map<std::string, LastCheck> checks_;
     std::string busy_;
-    DiskTreeModel model_{controller_,
-                         {[this](const Disk& disk) {
-                              const auto found = checks_.find(disk.facts().identifier);
-                              return found != checks_.end() ? std::optional(found->second)
-                                                            : std::nullopt;
-                          },
-                          [this](const Disk& disk) {
-                              return disk.facts().identifier == busy_ ? "verifying…" : "";
-                          },
-                          [](const Disk&) { return std::string(); }},
-                         texts_};
+    DiskTreeModel model_{
+        controller_,
+        {[this](const Disk& disk) {
+             const auto found = checks_.find(disk.facts().identifier);
+             return found != checks_.end() ? std::optional(found->second) : std::nullopt;
+         },
+         [this](const Disk& disk) { return disk.facts().identifier == busy_ ? "verifying…" : ""; },
+         [](const Disk&) {
+             return std::string();
+         }},
+        texts_};
     DiskList list_{texts_};
 };
 
@@ -119,10 +119,11 @@ TEST_F(DiskListTest, AParentSaysWhatItsWorstPartIs)
         std::string busy;
         std::string state;
     };
-    for (const Case& c : {Case{"sound", "damaged", "", "damaged"}, Case{"damaged", "sound", "", "damaged"},
-                          Case{"sound", "failed", "", "failed"}, Case{"sound", "sound", "", "sound"},
-                          Case{"sound", "", "", "partly checked"}, Case{"", "", "", ""},
-                          Case{"damaged", "sound", "a1", "verifying…"}}) {
+    for (const Case& c :
+         {Case{"sound", "damaged", "", "damaged"}, Case{"damaged", "sound", "", "damaged"},
+          Case{"sound", "failed", "", "failed"}, Case{"sound", "sound", "", "sound"},
+          Case{"sound", "", "", "partly checked"}, Case{"", "", "", ""},
+          Case{"damaged", "sound", "a1", "verifying…"}}) {
         checks_.clear();
         if (!c.verdictOfDisk.empty())
             checks_["a"].told.verdict = c.verdictOfDisk;

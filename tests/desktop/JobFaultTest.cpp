@@ -6,7 +6,11 @@
 
 #include <signal.h>
 
+#include <QTest>
+
 #include <cstdlib>
+#include <future>
+#include <memory>
 
 namespace orvane::desktop::test {
 namespace {
@@ -111,9 +115,9 @@ TEST_F(JobFaultTest, AnImageThatNoToolGotToSeeIsSaid)
                "the file is empty", "cannot be read: the file is empty"},
           Case{"swap",
                [](const std::string& image) {
-                   EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", image},
-                                                   "label: gpt\ntype=swap\n"),
-                             0);
+                   EXPECT_EQ(
+                       orvane::test::runTool({"sfdisk", "-q", image}, "label: gpt\ntype=swap\n"),
+                       0);
                },
                "there is no volume on it that can be checked", ""}}) {
         const std::string image = makeImage(c.name);
@@ -133,9 +137,8 @@ TEST_F(JobFaultTest, AnImageThatNoToolGotToSeeIsSaid)
         EXPECT_EQ(cell(other, DiskColumn::Verdict), "sound") << c.name;
         select(image);
         EXPECT_TRUE(logHolds(c.why)) << testing::PrintToString(logRows());
-        EXPECT_TRUE(waitUntil([&] {
-            return details(image).find(c.note) != std::string::npos;
-        })) << details(image);
+        EXPECT_TRUE(waitUntil([&] { return details(image).find(c.note) != std::string::npos; }))
+            << details(image);
         close();
     }
 }
@@ -158,6 +161,37 @@ TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
     fs::rename(makePartitionedImage("parts"), image);
     command("rescan").trigger();
     EXPECT_TRUE(waitUntil([&] { return cell(image + "#1", DiskColumn::Format) == "ext4"; }));
+}
+
+// As on a network that has gone: nobody knows when the file will answer.
+TEST_F(JobFaultTest, ASlowImageHoldsNoOtherJobUpAndItsOwnCanBeStopped)
+{
+    const std::string quick = makeImage("quick");
+    const std::string slow = makeImage("slow");
+    open({quick, slow});
+    const auto answers = std::make_shared<std::promise<void>>();
+    session().host().imageAttachment().setReader(
+        [slow, answered = answers->get_future().share()](const fs::path& image) {
+            if (image == slow)
+                answered.wait();
+            return ImageReading::readNow(image);
+        });
+    select(slow);  // has it read again
+    select(quick);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(quick, DiskColumn::Verdict), "sound");
+
+    window().disks().selectAll();
+    button("verifyDiskButton").press();
+    EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    QTest::qWait(100);
+    EXPECT_EQ(sheet(), nullptr) << takeAlert();
+    EXPECT_EQ(cell(slow, DiskColumn::Verdict), "");
+    EXPECT_TRUE(button("verifyDiskButton").isEnabled());
+    answers->set_value();
 }
 
 TEST_F(JobFaultTest, AToolThatIsKilledHasFoundNothing)

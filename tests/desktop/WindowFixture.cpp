@@ -86,7 +86,7 @@ void WindowFixture::open(const std::vector<std::string>& images)
 
 bool WindowFixture::waitUntil(const std::function<bool()>& isDone)
 {
-    constexpr int longestWait = 3000;  // milliseconds
+    constexpr int longestWait = 30'000;  // milliseconds
     return QTest::qWaitFor(isDone, longestWait);
 }
 

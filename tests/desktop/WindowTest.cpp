@@ -231,9 +231,9 @@ TEST_F(WindowTest, TheMapOfAnImageIsVerifiedAndRepaired)
         box->close();
     command("repairMap").trigger();
     ASSERT_TRUE(waitForJob());
-    EXPECT_TRUE(waitUntil(
-        [&] { return details(image).find("partition map is damaged") == std::string::npos; }))
-        << testing::PrintToString(logRows());
+    EXPECT_TRUE(waitUntil([&] {
+        return details(image).find("partition map is damaged") == std::string::npos;
+    })) << testing::PrintToString(logRows());
     EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}), 0);
 }
 
@@ -266,7 +266,8 @@ TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)
     select(image);
     EXPECT_TRUE(says("clearHistoryButton", "There is no history to clear."));
     window().disks().selectAll();
-    EXPECT_TRUE(says("verifyPermissionsButton", "“locked.img”: ")) << toolTip("verifyPermissionsButton");
+    EXPECT_TRUE(says("verifyPermissionsButton", "“locked.img”: "))
+        << toolTip("verifyPermissionsButton");
     button("verifyDiskButton").press();
     EXPECT_TRUE(says("repairDiskButton", "Not available while a job runs."));
     button("verifyDiskButton").press();

@@ -182,8 +182,9 @@ TEST(ImageAttacher, FailuresAreCodesWithASentence)
     for (const Case& c : {Case{"x\x1b.img", "cannot attach ‘x\uFFFD.img’: the file is empty"},
                           Case{"none", "cannot attach ‘none’: No such file or directory"},
                           Case{"fifo", "cannot attach ‘fifo’: it is not a regular file"},
-                          Case{"notes.txt", "cannot attach ‘notes.txt’: it is a text file, not a "
-                                            "disk image"}}) {
+                          Case{"notes.txt",
+                               "cannot attach ‘notes.txt’: it is a text file, not a "
+                               "disk image"}}) {
         fixwell::Dictionary result;
         EXPECT_EQ(attacher.AttachImageWithURL(directory / c.name, result),
                   fixwell::kPLErrorCannotOpen);

@@ -35,8 +35,9 @@ TEST_F(PartitionMapTest, ADamagedMapOfAnImageIsNamedWhateverElseIsChecked)
     const auto disk = makeDisk("disk.img");
     const auto names = [this](const char* command) {
         const RunResult result = run({command, "disk.img"});
-        return result.errors.find("the partition map of “disk.img” is damaged; --partition-map "
-                                  "checks and repairs it") != std::string::npos;
+        return result.errors.find(
+                   "the partition map of “disk.img” is damaged; --partition-map "
+                   "checks and repairs it") != std::string::npos;
     };
     EXPECT_FALSE(names("verify")) << "both copies are sound";
     patch(disk, 512, zeros(512));

@@ -44,10 +44,9 @@ LogPlace::LogPlace(const LogTable& table, const LogModel& model)
         return;
     current_ = rowAt(table.currentIndex().row());
     // It is the one that is read.
-    const auto current =
-        std::find_if(inSight_.begin(), inSight_.end(), [this](const SightedRow& sighted) {
-            return sighted.row.number == current_->number;
-        });
+    const auto current = std::find_if(
+        inSight_.begin(), inSight_.end(),
+        [this](const SightedRow& sighted) { return sighted.row.number == current_->number; });
     if (current != inSight_.end())
         std::rotate(inSight_.begin(), current, current + 1);
 }

@@ -43,7 +43,7 @@ public:
     bool isChecked() const { return widget_.isChecked(); }
     /// Return presses it.
     bool isDefault() const { return isDefault_; }
-    QAbstractButton& widget() { return widget_; }
+    QAbstractButton& widget() const { return widget_; }
 
     /// As a click does; nothing when the button is disabled.
     void press() { widget_.click(); }

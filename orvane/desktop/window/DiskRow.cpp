@@ -64,9 +64,10 @@ QString verdictText(const Check& check, const Translator& texts)
 QString lastCheckText(const LastCheck& check, const Translator& texts)
 {
     const QString time = timeText(check.told.started);
-    return check.later ? toQt(texts.sentence("%@, then %@", {fromQt(time),
-                                                             fromQt(verdictText(*check.later, texts))}))
-                       : time;
+    return check.later
+               ? toQt(texts.sentence("%@, then %@",
+                                     {fromQt(time), fromQt(verdictText(*check.later, texts))}))
+               : time;
 }
 
 QStringList toolTipOfCheck(const LastCheck& check, const Translator& texts)
@@ -76,16 +77,14 @@ QStringList toolTipOfCheck(const LastCheck& check, const Translator& texts)
         lines += toQt(texts.text("not all of its volumes have been checked"));
     if (!check.part.empty())
         lines += toQt(texts.sentence("on it: “%@”", {fixwell::printable(check.part)}));
-    lines += toQt(texts.sentence(
-        "last checked %@: %@",
-        {fromQt(timeText(check.told.started)), fromQt(verdictText(check.told, texts))}));
+    lines += toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(check.told.started)),
+                                                         fromQt(verdictText(check.told, texts))}));
     if (!check.told.message.empty())
         lines += shown(check.told.message);
     if (!check.later)
         return lines;
-    lines += toQt(texts.sentence(
-        "after that, %@: %@",
-        {fromQt(timeText(check.later->started)), fromQt(verdictText(*check.later, texts))}));
+    lines += toQt(texts.sentence("after that, %@: %@", {fromQt(timeText(check.later->started)),
+                                                        fromQt(verdictText(*check.later, texts))}));
     if (!check.later->message.empty())
         lines += shown(check.later->message);
     return lines;
@@ -135,10 +134,10 @@ QString columnTitle(DiskColumn column, const Translator& texts)
 
 QString rowDetails(const DiskRow& row, const Translator& texts)
 {
-    QStringList parts;
+    // There is room for a few words.
     if (!row.note.empty())
-        parts += shown(row.note);
-    parts += QStringList{row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
+        return shown(row.note);
+    QStringList parts{row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
                                              : shown(row.filesystem)};
     if (row.facts.length != 0)
         parts += sizeText(row.facts.length);
@@ -156,8 +155,8 @@ QString rowSummary(const DiskRow& row, const Translator& texts)
         parts += state;
     parts += rowDetails(row, texts);
     if (row.lastCheck)
-        parts += toQt(
-            texts.sentence("last checked %@", {fromQt(lastCheckText(*row.lastCheck, texts))}));
+        parts +=
+            toQt(texts.sentence("last checked %@", {fromQt(lastCheckText(*row.lastCheck, texts))}));
     return parts.join(QStringLiteral(", "));
 }
 

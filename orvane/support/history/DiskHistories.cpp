@@ -175,8 +175,8 @@ void DiskHistories::saveNew()
         }
     }
     // One time for all: what came together stays together.
-    const auto now = std::chrono::time_point_cast<std::chrono::milliseconds>(
-        RecordTimes::Time::clock::now());
+    const auto now =
+        std::chrono::time_point_cast<std::chrono::milliseconds>(RecordTimes::Time::clock::now());
     for (auto& [key, history] : histories_)
         save(key, history, now);
 }

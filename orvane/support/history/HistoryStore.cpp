@@ -97,8 +97,7 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
         Transaction transaction(database_);
         const std::int64_t volume = transaction.hasBegun() ? tables_->volumes.intern(key) : 0;
         if (volume != 0 &&
-            tables_->records.append(volume, history, firstNew, times,
-                                    Run::Time::clock::now()) &&
+            tables_->records.append(volume, history, firstNew, times, Run::Time::clock::now()) &&
             transaction.commit()) {
             countAdded(static_cast<std::int64_t>(history.size() - firstNew));
             return true;

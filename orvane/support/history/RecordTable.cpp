@@ -46,8 +46,9 @@ RecordTable::RecordTable(Database& database, std::int64_t mostOfVolume)
       vocabulary_(database),
       add_(database.prepare("INSERT INTO records (id, shape, type, verbosity, message, text, "
                             "style, time, extra) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)")),
-      read_(database.prepare("SELECT shape, type, verbosity, message, text, style, extra, time FROM "
-                             "records WHERE id >= ? AND id < ? ORDER BY id")),
+      read_(
+          database.prepare("SELECT shape, type, verbosity, message, text, style, extra, time FROM "
+                           "records WHERE id >= ? AND id < ? ORDER BY id")),
       oldest_(
           database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id LIMIT 1")),
       newest_(database.prepare(

@@ -20,10 +20,12 @@ ImageAttacher::ImageAttacher(Disk::Surroundings surroundings, Translator transla
 fixwell::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path& image,
                                                      fixwell::Dictionary& result)
 {
-    const auto reading = ImageReading::start(image);
+    const auto reading = ImageReading::start(image, {}, reader_);
     {
         const std::lock_guard guard(lock_);
         readings_.insert(reading);
+        if (isStopped_)
+            reading->giveUp();
     }
     const ImageReading::State state = reading->waitFor(longestWait_);
     const std::lock_guard guard(lock_);
@@ -54,8 +56,15 @@ fixwell::ErrorCode ImageAttacher::note(const std::filesystem::path& image, std::
 void ImageAttacher::stopAttachments()
 {
     const std::lock_guard guard(lock_);
+    isStopped_ = true;
     for (const auto& reading : readings_)
         reading->giveUp();
+}
+
+void ImageAttacher::resumeAttachments()
+{
+    const std::lock_guard guard(lock_);
+    isStopped_ = false;
 }
 
 fixwell::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(const fixwell::Dictionary& result)

@@ -33,8 +33,13 @@ public:
                                                         fixwell::Dictionary& result) override;
     fixwell::OVDiskPointer TopLevelPLDiskForImageDict(const fixwell::Dictionary& result) override;
 
-    /// Attachments that are under way end at once.
+    /// Attachments that are under way end at once, and no others begin before
+    /// `resumeAttachments`.
     void stopAttachments();
+    void resumeAttachments();
+    /// Before anything is attached: how an image is read, and how long that may take.
+    void setReader(ImageReading::Reader reader) { reader_ = std::move(reader); }
+    const ImageReading::Reader& reader() const { return reader_; }
     void setLongestWait(std::chrono::milliseconds longest) { longestWait_ = longest; }
 
     /// Why the last attachment of this image failed, as a sentence to show ("cannot attach
@@ -48,13 +53,15 @@ private:
     const Disk::Surroundings surroundings_;
     const Translator translator_;
 
+    ImageReading::Reader reader_ = ImageReading::readNow;
     std::chrono::milliseconds longestWait_ = std::chrono::seconds(30);
 
     mutable std::mutex lock_;
     std::set<std::shared_ptr<ImageReading>> readings_;  ///< that are waited for; guarded
-    std::map<std::int64_t, DiskTree> attached_;      ///< by attachment, until asked for; guarded
-    std::int64_t attachments_ = 0;                   ///< guarded
-    std::map<std::string, std::string> lastErrors_;  ///< by the path as given; guarded
+    std::map<std::int64_t, DiskTree> attached_;         ///< by attachment, until asked for; guarded
+    std::int64_t attachments_ = 0;                      ///< guarded
+    bool isStopped_ = false;                            ///< guarded
+    std::map<std::string, std::string> lastErrors_;     ///< by the path as given; guarded
 };
 
 }  // namespace orvane

@@ -34,8 +34,8 @@ bool isText(int descriptor, off_t length)
 {
     constexpr off_t sampleBytes = 4096;
     std::array<unsigned char, sampleBytes> sample{};
-    for (const off_t place : {off_t{0}, length / 3, length / 3 * 2,
-                              std::max(off_t{0}, length - sampleBytes)}) {
+    for (const off_t place :
+         {off_t{0}, length / 3, length / 3 * 2, std::max(off_t{0}, length - sampleBytes)}) {
         const ssize_t got = ::pread(descriptor, sample.data(), sample.size(), place);
         if (got <= 0 || !std::all_of(sample.begin(), sample.begin() + got, isTextByte))
             return false;

@@ -24,11 +24,11 @@ std::string loopDeviceOf(const OpenImage& image)
 }  // namespace
 
 std::shared_ptr<ImageReading> ImageReading::start(const std::filesystem::path& image,
-                                                  std::function<void()> done)
+                                                  std::function<void()> done, const Reader& reader)
 {
     auto reading = std::make_shared<ImageReading>();
-    const auto task = [reading, image, done = std::move(done)] {
-        reading->read(image);
+    const auto task = [reading, image, reader, done = std::move(done)] {
+        reading->finish(reader(image));
         if (done)
             done();
     };
@@ -41,16 +41,17 @@ std::shared_ptr<ImageReading> ImageReading::start(const std::filesystem::path& i
 }
 
 // The host's texts may be gone when a file answers at last, so none are looked up here.
-void ImageReading::read(const std::filesystem::path& image)
+ImageReading::Result ImageReading::readNow(const std::filesystem::path& image)
 {
-    Result result = Failure{};
     auto opened = openImage(image, Translator());
-    if (failed(opened)) {
-        result = Failure{failureMessage(opened)};
-    } else {
-        const auto& open = std::get<OpenImage>(opened);
-        result = ReadImage{disksOfImage(open, readContents(open)), loopDeviceOf(open)};
-    }
+    if (failed(opened))
+        return Failure{failureMessage(opened)};
+    const auto& open = std::get<OpenImage>(opened);
+    return ReadImage{disksOfImage(open, readContents(open)), loopDeviceOf(open)};
+}
+
+void ImageReading::finish(Result result)
+{
     const std::lock_guard guard(lock_);
     result_ = std::move(result);
     changed_.notify_all();

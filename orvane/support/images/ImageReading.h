@@ -28,10 +28,15 @@ public:
     /// A failure is the bare reason, in English where it is one of the host's own.
     using Result = Outcome<ReadImage>;
 
+    using Reader = std::function<Result(const std::filesystem::path& image)>;
+
+    /// Reads it on the calling thread.
+    static Result readNow(const std::filesystem::path& image);
     /// `done` is called on the reader's thread, also after it was given up; none when empty. Where
     /// the system gives no thread, the image is read before this returns.
     static std::shared_ptr<ImageReading> start(const std::filesystem::path& image,
-                                               std::function<void()> done = {});
+                                               std::function<void()> done = {},
+                                               const Reader& reader = readNow);
 
     enum class State { Reading, Done, GivenUp };
     /// Returns when it is done or given up, or that time is over.
@@ -42,7 +47,7 @@ public:
     std::optional<Result> result() const;
 
 private:
-    void read(const std::filesystem::path& image);
+    void finish(Result result);
 
     mutable std::mutex lock_;
     std::condition_variable changed_;

@@ -45,8 +45,8 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     line.filesystem = facts.filesystem;
     line.bytes = facts.length;
     line.mountPoint = facts.mountPoint;
-    const auto runs = lastRunsOf(session.host().historyStore(),
-                                 session.host().histories().keyOf(facts));
+    const auto runs =
+        lastRunsOf(session.host().historyStore(), session.host().histories().keyOf(facts));
     if (!runs)
         return line;
     line.lastChecked = localTime(runs->told.started);

@@ -58,10 +58,9 @@ int settle(const NamedDisk& named, const ActionButton& action, Session& session,
         why = session.host().translator().sentence(
             "“%@” was not checked: the question was not answered with yes", {named.name});
     else if (named.disk->isOfflineDiskImage())
-        keepUnreached(session.host(), *named.disk,
-                      action.command == Command::Repair ? Operation::RepairDisk
-                                                        : Operation::VerifyDisk,
-                      why);
+        keepUnreached(
+            session.host(), *named.disk,
+            action.command == Command::Repair ? Operation::RepairDisk : Operation::VerifyDisk, why);
     reporter.failure(named.name, why);
     return exitUnchecked;
 }
@@ -85,7 +84,7 @@ void pointToMap(const NamedDisk& named, Session& session, Reporter& reporter)
     if (wasTried && contents && contents->facts().hasDamagedMap)
         reporter.warning(damagedMapSentence(session, named));
     else if (wasTried && named.disk->isOfflineDiskImage() && !wasUnderstood(named, session) &&
-        session.reasonAgainstPartitionMap(named.disk).empty())
+             session.reasonAgainstPartitionMap(named.disk).empty())
         reporter.warning(session.host().translator().sentence(
             "“%@” has a partition map; --partition-map checks it", {named.name}));
 }

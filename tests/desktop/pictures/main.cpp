@@ -106,9 +106,14 @@ TEST_F(Pictures, OfWhatIsOutOfTheOrdinary)
     button("clearHistoryButton").press();
     command("undoClear").trigger();
     button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return session().host().historyStore().runs(
-        session().host().histories().keyOf(
-            session().host().sharedDiskController().diskNamed(sound + "#0")->facts())).size() == 2; }));
+    ASSERT_TRUE(waitUntil([&] {
+        return session()
+                   .host()
+                   .historyStore()
+                   .runs(session().host().histories().keyOf(
+                       session().host().sharedDiskController().diskNamed(sound + "#0")->facts()))
+                   .size() == 2;
+    }));
     QTest::qWait(300);
     takePicture(look() + "-working");
     button("verifyDiskButton").press();
@@ -121,8 +126,8 @@ TEST_F(Pictures, OfARepairWhoseLogIsLong)
 {
     const std::string image = makeImage("Archive");
     for (int inode = 11; inode < 200; ++inode)
-        EXPECT_EQ(orvane::test::runTool({"debugfs", "-w", "-R",
-                                         "setb " + std::to_string(200 + inode), image}),
+        EXPECT_EQ(orvane::test::runTool(
+                      {"debugfs", "-w", "-R", "setb " + std::to_string(200 + inode), image}),
                   0);
     EXPECT_EQ(orvane::test::runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
     open({image});

@@ -143,8 +143,8 @@ TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
             EXPECT_EQ(view->selectedRowIndexes(),
                       std::vector{static_cast<std::size_t>(rowOf(line))})
                 << c.because;
-            EXPECT_EQ(table().rowViewportPosition(rowOf(line)), top) << line.toStdString()
-                                                                     << c.because;
+            EXPECT_EQ(table().rowViewportPosition(rowOf(line)), top)
+                << line.toStdString() << c.because;
         }
     }
 }
