@@ -8,7 +8,7 @@ namespace pellar {
 // How jobs end, beside the codes that a module knows.
 
 /// Verified: damaged, and this kind of volume is not repaired here.
-inline constexpr fixwell::ErrorCode kPLErrorDamagedForGood = -69710;
+inline constexpr fixwell::ErrorCode kPLErrorDamagedForGood = -69712;
 
 inline constexpr fixwell::ErrorCode kPLErrorNoPartitionMap = -69720;
 inline constexpr fixwell::ErrorCode kPLErrorMapDamaged = -69721;      ///< a repair can restore it

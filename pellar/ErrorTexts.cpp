@@ -56,6 +56,17 @@ constexpr std::array texts{
     ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},
 };
 
+// Codes are given out in two headers. A number that stood in both would give one error the other's text.
+consteval bool everyCodeAndTextIsThereOnce()
+{
+    for (auto text = texts.begin(); text != texts.end(); ++text)
+        for (auto other = text + 1; other != texts.end(); ++other)
+            if (text->code == other->code || text->key == other->key)
+                return false;
+    return true;
+}
+static_assert(everyCodeAndTextIsThereOnce());
+
 }  // namespace
 
 std::string_view errorTextKey(fixwell::ErrorCode code)

@@ -177,7 +177,7 @@ void OVFXW::noteSuccess()
 {
     const std::int64_t type = inflightItem.integer(kFXW_OperationType);
     if (type == FXWOperationVerifyDisk || type == FXWOperationRepairDisk)
-        host().log().log("Repair tool completed: ");
+        host().log().log(localized(localizable("Repair tool completed: ")));
     createDiskSummaryRecord();
     if (inflightItem && (_stoppedByUser || inflightItem.boolean(kEntryStoppedByUser)))
         host().mainRunLoop().scheduleTimer(remountDelay, [module = liveness_] {

@@ -6,8 +6,8 @@
 namespace fixwell {
 namespace {
 
-constexpr std::string_view startingVerification = "Starting verification tool: ";
-constexpr std::string_view startingRepair = "Starting repair tool: ";
+constexpr std::string_view startingVerification = localizable("Starting verification tool: ");
+constexpr std::string_view startingRepair = localizable("Starting repair tool: ");
 constexpr std::string_view verifyFailed = localizable("Verify failed.");
 constexpr std::string_view repairFailed = localizable("Repair failed.");
 

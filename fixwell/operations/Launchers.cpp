@@ -56,7 +56,7 @@ ErrorCode OVFXW::launchOperation(const Launch& launch, const OVDiskPointer& disk
     if (!reference)
         return kPLErrorNoDiskReference;
     if (!launch.startLogLine.empty())
-        host().log().log(launch.startLogLine);
+        host().log().log(localized(launch.startLogLine));
     const ErrorCode code = (repairDiskTool().*launch.begin)(reference);
     return code == kPLNoError ? code : reportFailedLaunch(launch, disk, code, wasMounted);
 }

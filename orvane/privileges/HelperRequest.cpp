@@ -37,6 +37,8 @@ constexpr std::string_view attaching = "attach";
 constexpr std::string_view fetching = "--fetch-archives";
 
 constexpr std::size_t longestName = 1024;
+constexpr std::size_t longestLanguages = 64;
+constexpr std::string_view languageSigns = "_-@.";
 
 const Task* taskNamed(std::string_view word)
 {
@@ -88,7 +90,7 @@ Read withTexts(HelperRequest request, Arguments texts)
         return "wrong number of arguments";
     if (texts[0].size() > longestName || texts[1].size() > longestName)
         return "a name is too long";
-    if (!consistsOf(texts[2], "_-+.", 64) || !consistsOf(texts[3], "_-@.:", 64))
+    if (!consistsOf(texts[2], "_-+.", 64) || !consistsOf(texts[3], std::string(languageSigns) + ':', longestLanguages))
         return "a name of a file system or language holds what none does";
     request.disk.identifier = texts[0];
     request.disk.name = texts[1];
@@ -117,12 +119,32 @@ Read readRegion(Arguments arguments)
     return withTexts(std::move(request), arguments.subspan(5));
 }
 
+/// Those of a list that the helper takes, as many as it takes. The rest is left out: a user's LANGUAGE
+/// can hold anything.
+std::string acceptedLanguages(std::string_view list)
+{
+    std::string accepted;
+    while (!list.empty()) {
+        const std::string_view language = list.substr(0, list.find(':'));
+        list.remove_prefix(std::min(language.size() + 1, list.size()));
+        const std::size_t room = longestLanguages - accepted.size();
+        if (language.empty() || language.size() + 1 > room ||
+            !consistsOf(language, languageSigns, longestLanguages))
+            continue;
+        if (!accepted.empty())
+            accepted += ':';
+        accepted += language;
+    }
+    return accepted;
+}
+
 }  // namespace
 
-HelperRequest requestFor(const pellar::PrivilegedJob& job, std::string languages)
+HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
-    HelperRequest request{job.subject, job.operation,        job.disk,
-                          -1,          std::move(languages), job.fetchesArchives};
+    HelperRequest request{
+        job.subject, job.operation,      job.disk, -1, acceptedLanguages(languages),
+        job.fetchesArchives};
     if (!job.image)
         return request;
     request.image = job.image->descriptor();

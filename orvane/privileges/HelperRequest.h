@@ -36,7 +36,8 @@ struct HelperRequest {
 };
 
 /// What has to be asked for a job.
-[[nodiscard]] HelperRequest requestFor(const pellar::PrivilegedJob& job, std::string languages);
+[[nodiscard]] HelperRequest requestFor(const pellar::PrivilegedJob& job,
+                                       const std::string& languages);
 
 /// The command line of the helper: what is done comes first, because the system's policy tells the
 /// actions apart by it (pkexec(1), org.freedesktop.policykit.exec.argv1).

@@ -40,7 +40,7 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
                                                         pellar::StopSwitch& stop,
                                                         pellar::EventRoad& road) {
             return std::make_unique<PrivilegedScript>(
-                HelperLaunch{launcher, currentLanguage(), asking}, job, texts, stop, road);
+                HelperLaunch{launcher, currentLanguages(), asking}, job, texts, stop, road);
         };
     return options;
 }

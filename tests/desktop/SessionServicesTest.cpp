@@ -66,7 +66,12 @@ TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWi
 {
     openWithServices(makeDamagedImage("a <b>"));
     const auto verify = [this](bool isWatched) {
-        QApplication::setActiveWindow(isWatched ? &window() : nullptr);
+        if (isWatched)
+            window().activateWindow();
+        else
+            window().hide();
+        ASSERT_TRUE(waitUntil(
+            [&] { return (QApplication::activeWindow() != nullptr) == isWatched; }));
         button("verifyDiskButton").press();
         ASSERT_TRUE(waitForJob());
         if (QMessageBox* const box = sheet())

@@ -184,7 +184,7 @@ TEST_F(OVFXWTest, RecordsAreStyledByTypeAndLevel)
         say(disk, Dictionary::of({{kFsckMessageType, c.type},
                                   {kFsckMessageString, "x"},
                                   {kFsckVerbosity, c.level}}));
-        const TextStyle& style = finalText(disk->history.back().dictionary()).style();
+        const TextStyle style = finalText(disk->history.back().dictionary()).style();
         EXPECT_EQ(style.font, (Font{c.isBold, 11})) << c.type;
         EXPECT_EQ(style.color, c.color) << c.type;
     }

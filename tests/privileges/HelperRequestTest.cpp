@@ -54,6 +54,21 @@ TEST(HelperRequest, ArrivesAsItWasMade)
     }
 }
 
+// A wish for a language must not keep anybody from checking a disk.
+TEST(HelperRequest, TheLanguagesOfAnyUserAreTaken)
+{
+    for (const auto& [wanted, taken] :
+         {std::pair<std::string, std::string>{"lb:de", "lb:de"}, {"de/../x:%n:fr", "fr"},
+          {std::string(100, 'a') + ":de", "de"}, {"::de::", "de"}}) {
+        pellar::PrivilegedJob job{};
+        job.disk = request(Subject::Filesystem, Operation::Verify).disk;
+        const auto read =
+            readHelperArguments(argumentsOf(requestFor(job, wanted)), isKnownDevice);
+        ASSERT_TRUE(std::holds_alternative<HelperRequest>(read)) << wanted;
+        EXPECT_EQ(std::get<HelperRequest>(read).languages, taken);
+    }
+}
+
 /// What is changed in arguments that are taken, so that they are not.
 struct Case {
     std::size_t place;

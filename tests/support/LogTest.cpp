@@ -40,12 +40,18 @@ TEST(ActivityLog, EntriesWithAndWithoutLineEnds)
         log.logPriorityWithEOL("two ", 0, false);
         log.logPriorityWithEOL("halves", 0, true);
         log.log("\n");
+        log.log("Starting: ");
+        log.logPriorityWithEOL("unfinished", 0, false);
+        log.log("failed");
+        log.log("ended\n");
     }
     const std::string text = contentsOf(directory / "activity.log");
     const std::size_t stamp = std::string_view("2024-05-06 07:08:09 ").size();
     ASSERT_GT(text.size(), stamp);
     EXPECT_EQ(text.substr(stamp, 4), "one\n");
     EXPECT_NE(text.find(" two halves\n\n"), std::string::npos) << "one stamp for one line";
+    for (const char* const line : {" Starting:\n", " unfinished\n", " failed\n", " ended\n"})
+        EXPECT_NE(text.find(line), std::string::npos) << "a line of its own:" << line << text;
 }
 
 TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
@@ -57,7 +63,7 @@ TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
     log.ov_log(fixwell::OVLog::error, 0, "bad \x1b[31mthing %s\n");
     const std::string text = contentsOf(directory / "fixwell.log");
     EXPECT_EQ(text.find("unheard"), std::string::npos);
-    EXPECT_NE(text.find("error bad \uFFFD[31mthing %s\n"), std::string::npos) << "there at once";
+    EXPECT_NE(text.find("notice bad \uFFFD[31mthing %s\n"), std::string::npos) << "there at once";
 }
 
 TEST(ActivityLog, NeverGrowsWithoutBound)

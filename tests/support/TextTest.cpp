@@ -3,11 +3,14 @@
 #include "orvane/support/texts/Language.h"
 #include "orvane/support/texts/ModuleBundle.h"
 #include "orvane/support/time/TimeEstimator.h"
+#include "tests/support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>
 
 #include <clocale>
+#include <fstream>
 #include <map>
+#include <tuple>
 
 namespace orvane {
 namespace {
@@ -52,11 +55,51 @@ TEST(ModuleBundle, TextsComeFromTheCatalogueOfTheLanguage)
                                                  "about %ld minutes", 3),
               "few %ld");
 
-    const std::uint64_t revision = bundle.stringRevision();
+    for (const auto& [languages, text, because] :
+         {std::tuple{"", "Verify Disk", "English again, at once"},
+          {"lb:tlh_QS.UTF-8@pIqaD:de", "yIwaH – Qap’a’", "the first of the list that is there"},
+          {"en_GB:tlh", "Verify Disk", "English is what the programs are written in"},
+          {"../share:tlh/..", "Verify Disk", "a way out of the folder is no language"}}) {
+        const std::uint64_t revision = bundle.stringRevision();
+        setLanguage(languages);
+        EXPECT_NE(bundle.stringRevision(), revision) << languages;
+        EXPECT_EQ(bundle.localizedString("Verify Disk"), text) << because;
+    }
     setLanguage("");
-    EXPECT_NE(bundle.stringRevision(), revision);
-    EXPECT_EQ(bundle.localizedString("Verify Disk"), "Verify Disk") << "English again, at once";
     ::unsetenv("LC_ALL");
+}
+
+TEST(MessageFile, PluralRulesAreReadAsCReadsThem)
+{
+    constexpr std::string_view slavic =
+        "n%10==1 && n%100!=11 ? 0 : n%10>=2 && n%10<=4 && (n%100<10 || n%100>=20) ? 1 : 2";
+    struct Case {
+        std::string_view rule;
+        unsigned long n;
+        std::optional<unsigned long> form;
+    };
+    for (const Case& c :
+         {Case{"n != 1", 1, 0}, Case{"n != 1", 0, 1}, Case{"n>1", 1, 0}, Case{"0", 7, 0},
+          Case{slavic, 21, 0}, Case{slavic, 11, 2}, Case{slavic, 22, 1}, Case{slavic, 112, 2},
+          Case{"(n-1)*2+10/2", 3, 9}, Case{"!n", 0, 1}, Case{"n%0", 5, 0}, Case{"n==", 1, {}},
+          Case{"n n", 1, {}}, Case{"(n", 1, {}}, Case{"99999999999", 1, {}}, Case{"", 1, {}}})
+        EXPECT_EQ(pluralForm(c.rule, c.n), c.form) << c.rule << ", " << c.n;
+    EXPECT_EQ(pluralForm(std::string(100000, '('), 1), std::nullopt) << "not to the stack's end";
+}
+
+// A catalogue that was cut anywhere has fewer texts, and no wrong ones.
+TEST(MessageFile, ACutFileIsReadAsFarAsItGoes)
+{
+    const std::string whole = test::contentsOf(std::filesystem::path(TEST_BUILD_DIRECTORY) /
+                                               "locale/tlh/LC_MESSAGES/SupportTest.mo");
+    ASSERT_GT(whole.size(), 28U);
+    const test::TemporaryDirectory directory;
+    for (std::size_t length = 0; length < whole.size(); ++length) {
+        std::ofstream(directory / "cut.mo", std::ios::binary) << whole.substr(0, length);
+        const auto file = MessageFile::read(directory / "cut.mo");
+        const auto text = file ? file->find("Verify Disk") : std::nullopt;
+        EXPECT_TRUE(!text || *text == "yIwaH – Qap’a’") << length;
+    }
 }
 
 TEST(ModuleBundle, ResourcesStayInsideTheBundle)
@@ -118,6 +161,18 @@ TEST(TimeEstimator, ABurstMovesTheEstimateSlowlyAndANewReferenceAtOnce)
     EXPECT_EQ(estimator.timeEstimateString(50), "about 2 minutes") << "believed by now";
     estimator.setStartTimeWithPercentComplete(now - 60s, 40);
     EXPECT_EQ(estimator.timeEstimateString(50), "about 5 minutes");
+}
+
+TEST(TimeEstimator, AStartBeforeTheJobIsNotBelieved)
+{
+    using namespace std::chrono_literals;
+    TimeEstimator::Date now;
+    TimeEstimator estimator([&] { return now; }, Translator());
+    now += 1s;
+    estimator.setStartTimeWithPercentComplete(now - 60s, 0);
+    EXPECT_EQ(estimator.timeEstimateString(10), "") << "nothing is known after a second";
+    now += 4s;
+    EXPECT_EQ(estimator.timeEstimateString(50), "less than a minute");
 }
 
 }  // namespace

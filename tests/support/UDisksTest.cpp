@@ -2,6 +2,7 @@
 #include "TemporaryDirectory.h"
 #include "ToolRun.h"
 #include "orvane/support/loop/MainLoop.h"
+#include "orvane/support/udisks/BusCall.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
 #include "orvane/support/udisks/ImageDevices.h"
@@ -12,7 +13,6 @@
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
-#include <sdbus-c++/sdbus-c++.h>
 #include <unistd.h>
 
 #include <atomic>
@@ -252,6 +252,33 @@ TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
 
 using Options = std::map<std::string, sdbus::Variant>;
 
+template <class Function>
+void addMethod(sdbus::IObject& object, const char* interface, const char* name, Function function)
+{
+#if ORVANE_SDBUS == 2
+    object.addVTable(sdbus::registerMethod(name).implementedAs(std::move(function)))
+        .forInterface(std::string(interface));
+#else
+    object.registerMethod(name).onInterface(interface).implementedAs(std::move(function));
+    object.finishRegistration();
+#endif
+}
+
+/// Adds properties of one interface, each with what gives its value.
+template <class... Getter>
+void addProperties(sdbus::IObject& object, const char* interface,
+                   std::pair<const char*, Getter>... properties)
+{
+#if ORVANE_SDBUS == 2
+    object.addVTable(sdbus::registerProperty(properties.first).withGetter(properties.second)...)
+        .forInterface(std::string(interface));
+#else
+    (object.registerProperty(properties.first).onInterface(interface).withGetter(properties.second),
+     ...);
+    object.finishRegistration();
+#endif
+}
+
 /// A UDisks2 with one failing drive and one volume on it, which mounts when it is told to.
 class FakeUDisks {
 public:
@@ -261,15 +288,14 @@ public:
         root_ = add("");
         root_->addObjectManager();
         manager_ = add("/Manager");
-        manager_->registerMethod("ResolveDevice")
-            .onInterface("org.freedesktop.UDisks2.Manager")
-            .implementedAs([](const Options&, const Options&) {
-                return std::vector{sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
-            });
-        manager_->finishRegistration();
+        addMethod(*manager_, "org.freedesktop.UDisks2.Manager", "ResolveDevice",
+                  [](const Options&, const Options&) {
+                      return std::vector{
+                          sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
+                  });
         addVolume();
         addDrive();
-        connection_->requestName("org.freedesktop.UDisks2");
+        connection_->requestName(BusServiceName("org.freedesktop.UDisks2"));
         connection_->enterEventLoopAsync();
     }
     ~FakeUDisks() { connection_->leaveEventLoop(); }
@@ -280,38 +306,33 @@ public:
 private:
     std::unique_ptr<sdbus::IObject> add(const std::string& path)
     {
-        return sdbus::createObject(*connection_, "/org/freedesktop/UDisks2" + path);
+        return sdbus::createObject(*connection_,
+                                   sdbus::ObjectPath("/org/freedesktop/UDisks2" + path));
     }
     void addVolume()
     {
         volume_ = add("/block_devices/x");
-        volume_->registerMethod("Mount")
-            .onInterface("org.freedesktop.UDisks2.Filesystem")
-            .implementedAs([this](sdbus::Result<std::string>&& result, const Options&) {
-                if (answers)
-                    result.returnResults("/mnt");
-                else
-                    unanswered_.push_back(std::move(result));
-                isAsked = true;
-            });
-        volume_->registerProperty("Device")
-            .onInterface("org.freedesktop.UDisks2.Block")
-            .withGetter([] { return std::vector<std::uint8_t>{'/', 'd', 'e', 'v', '/', 'x', 0}; });
-        volume_->registerProperty("Drive")
-            .onInterface("org.freedesktop.UDisks2.Block")
-            .withGetter([] { return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d"); });
-        volume_->finishRegistration();
+        addMethod(*volume_, "org.freedesktop.UDisks2.Filesystem", "Mount",
+                  [this](sdbus::Result<std::string>&& result, const Options&) {
+                      if (answers)
+                          result.returnResults("/mnt");
+                      else
+                          unanswered_.push_back(std::move(result));
+                      isAsked = true;
+                  });
+        addProperties(
+            *volume_, "org.freedesktop.UDisks2.Block",
+            std::pair{"Device",
+                      [] { return std::vector<std::uint8_t>{'/', 'd', 'e', 'v', '/', 'x', 0}; }},
+            std::pair{"Drive",
+                      [] { return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d"); }});
     }
     void addDrive()
     {
         drive_ = add("/drives/d");
-        drive_->registerProperty("SmartUpdated")
-            .onInterface("org.freedesktop.UDisks2.Drive.Ata")
-            .withGetter([] { return std::uint64_t{1700000000}; });
-        drive_->registerProperty("SmartFailing")
-            .onInterface("org.freedesktop.UDisks2.Drive.Ata")
-            .withGetter([] { return true; });
-        drive_->finishRegistration();
+        addProperties(*drive_, "org.freedesktop.UDisks2.Drive.Ata",
+                      std::pair{"SmartUpdated", [] { return std::uint64_t{1700000000}; }},
+                      std::pair{"SmartFailing", [] { return true; }});
     }
 
     std::unique_ptr<sdbus::IConnection> connection_;

@@ -143,21 +143,24 @@ TEST_F(BadInputTest, WhatCannotBeReadIsNamedWithTheReason)
     EXPECT_NE(result.errors.find("‘image’: Permission denied"), std::string::npos) << result.errors;
 }
 
-TEST_F(BadInputTest, WhatCannotBeWrittenIsVerifiedButNeverRepaired)
+TEST_F(BadInputTest, WhatCannotBeWrittenIsVerifiedButNotRepairedForThatReason)
 {
     if (::geteuid() == 0 && !isReachableByAll(TERMINAL_PROGRAM))
         GTEST_SKIP() << "an ordinary user cannot reach " << TERMINAL_PROGRAM;
-    const auto image = makeDamagedVolume("image");
-    ASSERT_EQ(::chmod(image.c_str(), 0444), 0);
-    Launch started = launchAsOrdinaryUser({"verify", "image"});
-    EXPECT_EQ(Program(started).finish().status, 4);
-    const std::string before = contentsOf(image);
-    started.arguments = {"repair", "image"};
-    const RunResult result = Program(started).finish();
-    EXPECT_EQ(result.status, 8) << result.output << result.errors;
-    EXPECT_NE((result.output + result.errors).find("image"), std::string::npos);
-    EXPECT_EQ(result.output.find("successfully"), std::string::npos) << result.output;
-    EXPECT_TRUE(contentsOf(image) == before);
+    makeDamagedVolume("damaged");
+    makeVolume("sound");
+    for (const auto& [image, verified] : {std::pair{"damaged", 4}, {"sound", 0}}) {
+        ASSERT_EQ(::chmod(path(image).c_str(), 0444), 0);
+        Launch started = launchAsOrdinaryUser({"verify", image});
+        EXPECT_EQ(Program(started).finish().status, verified);
+        const std::string before = contentsOf(path(image));
+        started.arguments = {"repair", image};
+        const RunResult result = Program(started).finish();
+        EXPECT_EQ(result.status, 8) << result.output << result.errors;
+        EXPECT_EQ(countOf("The disk cannot be written, so it cannot be repaired.", result.output), 1U)
+            << result.output;
+        EXPECT_TRUE(contentsOf(path(image)) == before);
+    }
 }
 
 TEST_F(BadInputTest, WrongUsageIsSaidWithoutObeyingIt)
@@ -170,7 +173,7 @@ TEST_F(BadInputTest, WrongUsageIsSaidWithoutObeyingIt)
          {Usage{{}, "no command"}, Usage{{"verify"}, "no disk"}, Usage{{"mend", "a"}, "unknown"},
           Usage{{"verify", "--color=pink", "a"}, "no such choice"},
           Usage{{"verify", "--log-level=9", "a"}, "out of range"},
-          Usage{{"verify", "--\x1b[2Jfast", "a"}, "an option with escapes"},
+          Usage{{"verify", "--f\x1b[2Jast", "a"}, "an option with escapes"},
           Usage{{"\x1b]0;title\x07"}, "a command with escapes"}}) {
         const RunResult result = run(c.arguments);
         EXPECT_EQ(result.status, 16) << c.because;

@@ -21,9 +21,9 @@ public:
     /// One line for the developers. `flags` is always 0.
     virtual void ov_log(int level, int flags, std::string_view line) = 0;
 
-    /// One entry of the user's activity log.
+    /// One entry of the user's activity log, in lines of its own.
     virtual void log(std::string_view text) = 0;
-    /// The same with the host's priority, and with or without an end of line added.
+    /// Text that is part of an entry: with the host's priority, with or without an end of line added.
     virtual void logPriorityWithEOL(std::string_view text, int priority, bool addsEndOfLine) = 0;
 };
 

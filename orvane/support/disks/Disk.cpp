@@ -55,7 +55,7 @@ void Disk::setFacts(const DiskFacts& facts)
     reference_ = referenceTo(facts_);
     filesystem_.reset();
     if (!facts_.filesystem.empty())
-        filesystem_.emplace(facts_.filesystem, surroundings_.capabilities);
+        filesystem_ = std::make_unique<DiskFilesystem>(facts_.filesystem, surroundings_.capabilities);
 }
 
 // Without a path, so that an operation on it is refused with a reason. The node may be another
@@ -98,7 +98,7 @@ std::vector<std::shared_ptr<fixwell::OVDisk>> Disk::children() const
 
 const fixwell::OVFilesystem* Disk::filesystem() const
 {
-    return filesystem_ ? &*filesystem_ : nullptr;
+    return filesystem_.get();
 }
 
 bool Disk::permissionsEnabled() const

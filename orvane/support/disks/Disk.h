@@ -81,7 +81,7 @@ private:
     DiskFacts facts_;
     bool hasGone_ = false;
     Surroundings surroundings_;
-    std::optional<DiskFilesystem> filesystem_;
+    std::unique_ptr<DiskFilesystem> filesystem_;  ///< none where there is no file system
     fixwell::DiskReferencePointer reference_;
     std::weak_ptr<Disk> parent_;
     std::vector<std::shared_ptr<Disk>> children_;

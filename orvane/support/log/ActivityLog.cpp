@@ -9,11 +9,12 @@
 namespace orvane {
 namespace {
 
+// The second level has errors, and what is worth a note besides, as that a module was loaded.
 std::string_view nameOf(int level)
 {
     switch (level) {
         case fixwell::OVLog::mismatch: return "mismatch ";
-        case fixwell::OVLog::error: return "error ";
+        case fixwell::OVLog::error: return "notice ";
         default: return "trace ";
     }
 }
@@ -58,7 +59,11 @@ void ActivityLog::ov_log(int level, int /*flags*/, std::string_view line)
 
 void ActivityLog::log(std::string_view text)
 {
-    logPriorityWithEOL(text, 0, false);
+    if (!isAtLineStart_)
+        logPriorityWithEOL({}, 0, true);
+    while (text.ends_with(' '))
+        text.remove_suffix(1);
+    logPriorityWithEOL(text, 0, !text.ends_with('\n'));
 }
 
 void ActivityLog::logPriorityWithEOL(std::string_view text, int /*priority*/, bool addsEndOfLine)

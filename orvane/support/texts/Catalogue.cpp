@@ -1,39 +1,64 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/texts/Catalogue.h"
 
-#include <libintl.h>
+#include "orvane/support/texts/Language.h"
 
+#include <algorithm>
 #include <utility>
 
 namespace orvane {
+namespace {
+
+/// Also those that a language falls back to: "de_AT@euro" is read as "de_AT" and as "de".
+std::vector<std::string> folderNames(std::string_view languages)
+{
+    std::vector<std::string> names;
+    while (!languages.empty()) {
+        std::string_view language = languages.substr(0, languages.find(':'));
+        languages.remove_prefix(std::min(language.size() + 1, languages.size()));
+        language = language.substr(0, language.find('.'));
+        // The texts in the programs are English.
+        if (language == "C" || language == "POSIX" || language == "en" ||
+            language.starts_with("en_"))
+            break;
+        for (const char* const end : {"", "@", "_"}) {
+            const std::string_view name =
+                *end == '\0' ? language : language.substr(0, language.find(*end));
+            if (!name.empty() && name.find('/') == std::string_view::npos &&
+                (names.empty() || names.back() != name))
+                names.emplace_back(name);
+        }
+    }
+    return names;
+}
+
+}  // namespace
 
 Catalogue::Catalogue(std::filesystem::path directory) : directory_(std::move(directory)) {}
 
-const char* Catalogue::bound(std::string_view table) const
+const Catalogue::Files& Catalogue::filesOf(std::string_view table) const
 {
-    if (table.empty() || table.find('/') != std::string_view::npos)
-        return nullptr;
-    const std::lock_guard guard(lock_);
-    if (const auto found = bound_.find(table); found != bound_.end())
-        return found->c_str();
-    const std::string& name = *bound_.emplace(table).first;
-    ::bindtextdomain(name.c_str(), directory_.c_str());
-    ::bind_textdomain_codeset(name.c_str(), "UTF-8");
-    return name.c_str();
+    const std::uint64_t revision = languageRevision();
+    if (std::exchange(revision_, revision) != revision)
+        files_.clear();
+    if (const auto found = files_.find(table); found != files_.end())
+        return found->second;
+    Files files;
+    if (!table.empty() && table.find('/') == std::string_view::npos)
+        for (const std::string& language : folderNames(currentLanguages()))
+            if (auto file = MessageFile::read(directory_ / language / "LC_MESSAGES" /
+                                              (std::string(table) + ".mo")))
+                files.push_back(std::move(*file));
+    return files_.emplace(table, std::move(files)).first->second;
 }
 
 std::optional<std::string> Catalogue::find(std::string_view table, std::string_view key) const
 {
-    // The entry under the empty key is the catalogue's own header.
-    const char* const domain = key.empty() ? nullptr : bound(table);
-    if (domain == nullptr)
-        return std::nullopt;
-    const std::string identifier(key);
-    const char* const text = ::dgettext(domain, identifier.c_str());
-    // gettext answers its own argument when it has no entry.
-    if (text == identifier.c_str())
-        return std::nullopt;
-    return text;
+    const std::lock_guard guard(lock_);
+    for (const MessageFile& file : filesOf(table))
+        if (const auto text = file.find(key))
+            return std::string(*text);
+    return std::nullopt;
 }
 
 std::string Catalogue::translate(std::string_view table, std::string_view key) const
@@ -44,13 +69,12 @@ std::string Catalogue::translate(std::string_view table, std::string_view key) c
 std::string Catalogue::translatePlural(std::string_view table, std::string_view one,
                                        std::string_view many, long count) const
 {
-    const char* const domain = bound(table);
-    if (domain == nullptr)
-        return std::string(count == 1 ? one : many);
-    const std::string singular(one);
-    const std::string plural(many);
     const auto magnitude = static_cast<unsigned long>(count < 0 ? -count : count);
-    return ::dngettext(domain, singular.c_str(), plural.c_str(), magnitude);
+    const std::lock_guard guard(lock_);
+    for (const MessageFile& file : filesOf(table))
+        if (const auto text = file.findPlural(one, magnitude))
+            return std::string(*text);
+    return std::string(magnitude == 1 ? one : many);
 }
 
 }  // namespace orvane

@@ -1,23 +1,27 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/support/texts/MessageFile.h"
+
+#include <cstdint>
 #include <filesystem>
+#include <map>
 #include <mutex>
 #include <optional>
-#include <set>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace orvane {
 
 /// The gettext catalogues below one directory, `LANGUAGE/LC_MESSAGES/TABLE.mo`; a string table is
-/// a catalogue. The tables of a process are told apart by their names, so two directories must
-/// not hold one of the same name. Any thread.
+/// a catalogue. Texts come in the first of the languages in force (Language.h) that has them. Any
+/// thread.
 class Catalogue {
 public:
     explicit Catalogue(std::filesystem::path directory);
 
-    /// None when the table has no such entry, or there is no table for the language.
+    /// None when the table has no such entry, or there is no table for the languages.
     [[nodiscard]] std::optional<std::string> find(std::string_view table,
                                                   std::string_view key) const;
     /// The entry, or the key itself.
@@ -26,13 +30,15 @@ public:
                                               std::string_view many, long count) const;
 
 private:
-    /// The table's name as gettext wants it, bound to the directory; none for a name that would
-    /// lead out of it.
-    const char* bound(std::string_view table) const;
+    using Files = std::vector<MessageFile>;
+
+    /// The table's files in the order of the languages. The lock is held.
+    const Files& filesOf(std::string_view table) const;
 
     std::filesystem::path directory_;
     mutable std::mutex lock_;
-    mutable std::set<std::string, std::less<>> bound_;  ///< guarded by the lock; never shrinks
+    mutable std::uint64_t revision_ = 0;                            ///< guarded by the lock
+    mutable std::map<std::string, Files, std::less<>> files_;  ///< guarded; for that revision
 };
 
 }  // namespace orvane

@@ -5,16 +5,14 @@
 
 #include <atomic>
 #include <clocale>
-#include <cstdlib>
+#include <mutex>
 #include <string_view>
-
-// Catalogues are looked for anew when this has changed (gettext manual, 11.5 "Being a gettext
-// grok"); no header declares it.
-extern "C" int _nl_msg_cat_cntr;
 
 namespace orvane {
 namespace {
 
+std::mutex lock;
+std::string inForce;  // guarded by the lock
 std::atomic<std::uint64_t> revision = 1;
 
 std::string firstSet(const EnvironmentLookup& environment)
@@ -57,15 +55,20 @@ void adoptUserLocale()
 
 void setLanguage(const std::string& languages)
 {
-    // An empty LANGUAGE would leave the choice to the locale.
-    ::setenv("LANGUAGE", languages.empty() ? "C" : languages.c_str(), 1);
-    ++_nl_msg_cat_cntr;
+    const std::lock_guard guard(lock);
+    inForce = languages;
     ++revision;
+}
+
+std::string currentLanguages()
+{
+    const std::lock_guard guard(lock);
+    return inForce;
 }
 
 std::string currentLanguage()
 {
-    const std::string languages = environmentValue("LANGUAGE").value_or("");
+    const std::string languages = currentLanguages();
     const std::string first = languages.substr(0, languages.find(':'));
     return first == "C" ? std::string() : first.substr(0, first.find_first_of(".@"));
 }

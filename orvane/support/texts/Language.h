@@ -8,23 +8,24 @@
 
 namespace orvane {
 
-/// The languages that the locale variables ask for, as gettext's LANGUAGE variable wants them
+/// The languages that the locale variables ask for, as gettext's LANGUAGE variable has them
 /// ("de_DE", "pt_BR:pt"): LANGUAGE itself when it is set, else from LC_ALL, LC_MESSAGES or LANG,
 /// the first that is not empty. Empty for the C locale, which is English.
 [[nodiscard]] std::string wantedLanguages(const EnvironmentLookup& environment);
 
 /// Start-up, before any other thread. Adopts the user's locale. Where the system has it not, or
-/// it is not in UTF-8 (a rescue system has no locales), C.UTF-8 takes its place and LANGUAGE
-/// keeps the wish, so translated texts still come. Numbers keep the C locale's form: what the
-/// program writes for machines must not change with the user; people's numbers come from
-/// decimalText.
+/// it is not in UTF-8 (a rescue system has no locales), C.UTF-8 takes its place; translated texts
+/// still come. Numbers keep the C locale's form: what the program writes for machines must not
+/// change with the user; people's numbers come from decimalText.
 void adoptUserLocale();
 
-/// Switches the language of every catalogue ("" for English). Main thread, while no other thread
-/// asks for texts: it changes the environment.
+/// Switches the languages of every catalogue, a list as LANGUAGE has it ("" for English). Any thread.
 void setLanguage(const std::string& languages);
 
-/// The first of the languages in force ("de_DE"); empty for English.
+/// The languages in force ("lb:de"); empty for English. Any thread.
+[[nodiscard]] std::string currentLanguages();
+
+/// The first of them, without its character set ("de_DE"); empty for English.
 [[nodiscard]] std::string currentLanguage();
 
 /// Another number after every setLanguage. Any thread.

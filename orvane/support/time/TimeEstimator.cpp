@@ -40,13 +40,13 @@ std::string durationText(double seconds, const Translator& translator)
 }
 
 TimeEstimator::TimeEstimator(std::function<Date()> now, Translator translator)
-    : now_(std::move(now)), translator_(std::move(translator)), start_(now_())
+    : now_(std::move(now)), translator_(std::move(translator)), made_(now_()), start_(made_)
 {
 }
 
 void TimeEstimator::setStartTimeWithPercentComplete(Date start, double percent)
 {
-    start_ = start;
+    start_ = std::max(start, made_);
     startPercent_ = percent;
     last_.reset();
 }

@@ -32,6 +32,7 @@ private:
 
     std::function<Date()> now_;
     Translator translator_;
+    Date made_;  ///< the job has not run for longer, whatever start it is given
     Date start_;
     double startPercent_ = 0;
 

@@ -51,18 +51,61 @@ int shorter(int timeout, std::optional<Clock::time_point> end)
     return timeout < 0 ? most : std::min(timeout, most);
 }
 
+#if ORVANE_SDBUS == 2
+
+sdbus::MethodCall callOf(sdbus::IProxy& proxy, const BusMethod& method)
+{
+    return proxy.createMethodCall(sdbus::InterfaceName(method.interface),
+                                  sdbus::MethodName(method.name));
+}
+
+template <class Handler>
+sdbus::PendingAsyncCall send(sdbus::IProxy& proxy, const sdbus::MethodCall& call, Handler handler,
+                             milliseconds timeout)
+{
+    return proxy.callMethodAsync(call, std::move(handler), timeout);
+}
+
+bool processNext(sdbus::IConnection& connection)
+{
+    return connection.processPendingEvent();
+}
+
+#else
+
+sdbus::MethodCall callOf(sdbus::IProxy& proxy, const BusMethod& method)
+{
+    return proxy.createMethodCall(method.interface, method.name);
+}
+
+template <class Handler>
+sdbus::PendingAsyncCall send(sdbus::IProxy& proxy, const sdbus::MethodCall& call, Handler handler,
+                             milliseconds timeout)
+{
+    return proxy.callMethod(call, std::move(handler), timeout);
+}
+
+bool processNext(sdbus::IConnection& connection)
+{
+    return connection.processPendingRequest();
+}
+
+#endif
+
 }  // namespace
 
 BusCall::BusCall(sdbus::IConnection& connection, const BusMethod& method,
                  const Arguments& arguments, milliseconds timeout)
-    : connection_(connection), proxy_(sdbus::createProxy(connection, service, method.object))
+    : connection_(connection),
+      proxy_(sdbus::createProxy(connection, BusServiceName(service),
+                                sdbus::ObjectPath(method.object)))
 {
-    auto call = proxy_->createMethodCall(method.interface, method.name);
+    sdbus::MethodCall call = callOf(*proxy_, method);
     arguments(call);
-    pending_ = proxy_->callMethod(
-        call,
-        [this](sdbus::MethodReply& reply, const sdbus::Error* error) {
-            if (error != nullptr)
+    pending_ = send(
+        *proxy_, call,
+        [this](const sdbus::MethodReply& reply, const auto& error) {
+            if (error)
                 answer_ = refusalOf(error->getName(), error->getMessage());
             else
                 answer_ = reply;
@@ -76,7 +119,7 @@ Answer<sdbus::MethodReply> BusCall::wait(const std::stop_token& stop,
     const StopDescriptor stopped(stop);
     const auto end = longest ? std::optional(Clock::now() + *longest) : std::nullopt;
     while (true) {
-        while (!answer_ && connection_.processPendingRequest()) {
+        while (!answer_ && processNext(connection_)) {
         }
         if (answer_)
             return *std::exchange(answer_, std::nullopt);

@@ -13,6 +13,16 @@
 
 namespace orvane {
 
+// Version 2 of sdbus-c++ (Debian 13) has types of its own for what are strings in version 1
+// (Debian 12), and other names for some functions.
+#if __has_include(<sdbus-c++/VTableItems.h>)
+#define ORVANE_SDBUS 2
+using BusServiceName = sdbus::ServiceName;
+#else
+#define ORVANE_SDBUS 1
+using BusServiceName = std::string;
+#endif
+
 /// What is called: a method of UDisks2.
 struct BusMethod {
     std::string object;
