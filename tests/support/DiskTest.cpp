@@ -265,7 +265,7 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
 TEST(DiskLookup, FindsByEveryKindOfName)
 {
     const TemporaryDirectory directory;
-    test::write(directory / "a.img", "contents");
+    test::write(directory / "a.img", std::string(512, '\0'));
     fs::create_symlink("a.img", directory / "link");
     Host host;
     DiskTree volume = tree("/dev/x1");

@@ -2,6 +2,7 @@
 #include "TemporaryDirectory.h"
 #include "fixwell/host/foundation/StyledText.h"
 #include "fixwell/host/pellar/MessageKeys.h"
+#include "orvane/support/disks/Disk.h"
 #include "orvane/support/history/DiskHistories.h"
 #include "orvane/support/history/HistoryKey.h"
 #include "orvane/support/history/HistoryStore.h"
@@ -391,6 +392,51 @@ TEST(DiskHistories, SaveWhatIsNewAndSeeAListThatWasEmptiedBehindTheirBack)
     EXPECT_TRUE(histories.clearHistoryOf(disk));
     EXPECT_FALSE(histories.clearHistoryOf(disk));
     EXPECT_TRUE(loaded(mine, histories.keyOf(disk)).isEmpty());
+}
+
+// Volumes are checked in any order, and the programs end in between.
+TEST(DiskHistories, AWholeDiskShowsItsRecordsInTheOrderOfTime)
+{
+    const TemporaryDirectory directory;
+    DiskTree tree;
+    tree.facts.identifier = "sda";
+    for (const char* const name : {"sda1", "sda2", "sda3"}) {
+        tree.children.push_back({});
+        tree.children.back().facts.identifier = name;
+    }
+    const auto later = [] {
+        ::usleep(3000);
+    };
+    std::string all;
+    for (const bool isWatched : {true, false}) {
+        HistoryStore store(directory / "history.sqlite3", {}, [](const std::string&) {});
+        DiskHistories histories(store);
+        const auto disk = Disk::make(tree, {{}, &histories});
+        const auto shown = [&] {
+            std::string text;
+            for (const Value& record : disk->fsckHistory().values())
+                text += std::to_string(record.dictionary().integer(fixwell::kFsckVerbosity)) + " ";
+            return text;
+        };
+        const auto say = [&](int part, int number) {
+            disk->parts()[static_cast<std::size_t>(part)]->fsckHistoryNoChildren().append(
+                Dictionary::of({{fixwell::kFsckVerbosity, number}}));
+            all += std::to_string(number) + " ";
+            if (isWatched) {
+                EXPECT_EQ(shown(), all);
+            }
+        };
+        EXPECT_EQ(static_cast<bool>(disk->fsckHistory()), !all.empty()) << "none was ever checked";
+        for (const int part : {2, 0, 1, 0, 2}) {
+            say(part, 1 + 10 * part);
+            histories.saveNew();
+            later();
+            say(part, 2 + 10 * part);
+        }
+        histories.saveNew();
+        later();
+        EXPECT_EQ(shown(), all);
+    }
 }
 
 }  // namespace

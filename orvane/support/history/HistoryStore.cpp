@@ -74,13 +74,20 @@ HistoryStore::Range HistoryStore::recordsOf(std::string_view key)
     return {};
 }
 
-void HistoryStore::load(Range records, const Array& history)
+void HistoryStore::load(Range records, const Array& history, RecordTimes& times)
 {
-    if (records.size() > 0 && !tables_->records.read(records, history))
+    if (records.size() > 0 && !tables_->records.read(records, history, times))
         failedTo("read the history", lastMishap());
 }
 
-bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew)
+void HistoryStore::load(Range records, const Array& history)
+{
+    RecordTimes ignored;
+    load(records, history, ignored);
+}
+
+bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew,
+                          const RecordTimes& times)
 {
     // In memory the lists themselves are all there is to keep.
     if (!isKept_ || firstNew >= history.size())
@@ -90,7 +97,7 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
         Transaction transaction(database_);
         const std::int64_t volume = transaction.hasBegun() ? tables_->volumes.intern(key) : 0;
         if (volume != 0 &&
-            tables_->records.append(volume, history, firstNew, Run::Time::clock::now()) &&
+            tables_->records.append(volume, history, firstNew, times, Run::Time::clock::now()) &&
             transaction.commit()) {
             countAdded(static_cast<std::int64_t>(history.size() - firstNew));
             return true;

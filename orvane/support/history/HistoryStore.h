@@ -39,12 +39,13 @@ public:
 
     /// All that the volume has.
     [[nodiscard]] Range recordsOf(std::string_view key);
-    /// Appends those of the records that are still there, oldest first.
+    /// Appends those of the records that are still there, oldest first, and their times.
+    void load(Range records, const fixwell::Array& history, RecordTimes& times);
     void load(Range records, const fixwell::Array& history);
-    /// Appends the records from `firstNew` on to the volume's. All of them or, when it answers
-    /// NO, none: try again later.
+    /// Appends the records from `firstNew` on to the volume's, with their times; where none are
+    /// given, with the present one. All of them or, when it answers NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const fixwell::Array& history,
-                              std::size_t firstNew);
+                              std::size_t firstNew, const RecordTimes& times = {});
     /// The volume's records and its runs.
     [[nodiscard]] bool clear(std::string_view key);
 

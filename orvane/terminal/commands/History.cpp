@@ -41,9 +41,12 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
     for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
         const std::shared_ptr<Disk> top = session.attach(named.disk);
         const std::shared_ptr<Disk> shown = top ? top : named.disk;
-        const std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
+        std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
+        // What was said of the image as a file is its history, too.
+        if (top)
+            selection.push_back(named.disk);
         std::for_each(selection.begin(), selection.end(), forgetFailure);
-        session.select({shown});
+        session.select({named.disk});
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
             session.select(selection);
