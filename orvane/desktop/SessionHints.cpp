@@ -19,7 +19,7 @@ Check checkOf(const Run& run)
 {
     const auto started =
         std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
-    return {run.end ? run.end->verdict : "", run.end ? run.end->message : "",
+    return {run.verdict(), run.end ? run.end->message : "",
             QDateTime::fromMSecsSinceEpoch(started.count())};
 }
 

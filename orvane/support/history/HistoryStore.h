@@ -76,7 +76,20 @@ private:
     };
 
     void open();
-    Mishap lastMishap() const;
+    /// What could not be written while another program held the database. It is as soon as that is
+    /// possible, and at the end.
+    struct LateRun {
+        std::int64_t run = 0;  ///< its number in the database, once it has one
+        std::string key;
+        std::string action;
+        Run::Time started;
+        std::optional<RunEnd> end;  ///< none as long as the run goes on, and when it is written
+        Run::Time finished;
+    };
+
+    Mishap lastMishap();
+    std::int64_t noteBegin(std::string_view key, std::string_view action, Run::Time started);
+    void writeLate();
     bool failedTo(std::string_view attempt, const Mishap& mishap);
     std::int64_t knownVolume(std::string_view key);
     void countAdded(std::int64_t records);
@@ -92,6 +105,7 @@ private:
     bool isKept_ = false;
     bool hasWarned_ = false;
     std::uint64_t generation_ = 0;
+    std::vector<LateRun> late_;
 };
 
 }  // namespace orvane

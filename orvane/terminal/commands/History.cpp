@@ -3,23 +3,28 @@
 #include "orvane/terminal/commands/LocalTime.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace orvane {
 namespace {
 
 std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Session& session)
 {
-    std::vector<Run> runs;
+    std::vector<std::pair<Run::Time, Run>> runs;
     for (const std::shared_ptr<Disk>& disk : disks) {
-        const std::vector<Run> more =
-            session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()));
-        runs.insert(runs.end(), more.begin(), more.end());
+        // Of one disk they stand in the order in which they were, though a clock was put back.
+        Run::Time newest{};
+        for (Run& run :
+             session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()))) {
+            newest = std::max(newest, run.started);
+            runs.emplace_back(newest, std::move(run));
+        }
     }
     std::stable_sort(runs.begin(), runs.end(),
-                     [](const Run& a, const Run& b) { return a.started < b.started; });
+                     [](const auto& a, const auto& b) { return a.first < b.first; });
     std::vector<RunLine> lines;
-    for (const Run& run : runs)
-        lines.push_back({localTime(run.started), run.action, run.end ? run.end->verdict : "",
+    for (const auto& [time, run] : runs)
+        lines.push_back({localTime(run.started), run.action, run.verdict(),
                          run.end ? run.end->message : ""});
     return lines;
 }

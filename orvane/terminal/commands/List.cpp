@@ -50,9 +50,9 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     if (!runs)
         return line;
     line.lastChecked = localTime(runs->told.started);
-    line.verdict = runs->told.end ? runs->told.end->verdict : "";
+    line.verdict = runs->told.verdict();
     if (const auto& later = runs->later)
-        line.later = {localTime(later->started), later->end ? later->end->verdict : ""};
+        line.later = {localTime(later->started), later->verdict()};
     return line;
 }
 
