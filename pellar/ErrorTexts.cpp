@@ -57,7 +57,7 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorReadOnly, "The disk cannot be written, so it cannot be repaired."},
     ErrorText{fixwell::kPLErrorBusy, "Another operation is still running."},
     ErrorText{kPLErrorNoPartitionMap, "There is no partition map on the disk."},
-    ErrorText{kPLErrorMapDamaged, "The partition map is damaged; use Repair Disk."},
+    ErrorText{kPLErrorMapDamaged, "The partition map is damaged, and a repair can restore it."},
     ErrorText{kPLErrorMapNeedsPerson,
               "The partition map is damaged in a way that only a person can put right."},
     ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},

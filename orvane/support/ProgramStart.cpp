@@ -40,8 +40,13 @@ void giveStacksRoom()
     constexpr rlim_t least = 512U << 10U;
     rlimit limit = {};
     if (::getrlimit(RLIMIT_STACK, &limit) == 0 && limit.rlim_cur < usual) {
+        // Root may raise the upper limit as well.
+        const rlimit wanted{usual, std::max(usual, limit.rlim_max)};
         limit.rlim_cur = std::min(usual, limit.rlim_max);
-        ::setrlimit(RLIMIT_STACK, &limit);
+        if (::setrlimit(RLIMIT_STACK, &wanted) == 0)
+            limit = wanted;
+        else
+            ::setrlimit(RLIMIT_STACK, &limit);
         if (limit.rlim_cur < least) {
             constexpr std::string_view sentence =
                 "Orvane cannot work with a stack of less than 512 KiB; see “ulimit -s”.\n";
