@@ -10,17 +10,18 @@ void tellOutcome(const Outcome& outcome, Operation operation, const Texts& texts
     const std::string message = messageOf(outcome, operation, log.diskName(), texts);
     const bool isUnanswered =
         outcome.verdict == Verdict::Failed || outcome.verdict == Verdict::Inconclusive;
-    if (isUnanswered || !outcome.warnings.empty())
+    if (isUnanswered)
         log.failure(message);
-    else if (!outcome.reason.isEmpty())
+    else if (!outcome.reason.isEmpty() && outcome.warnings.empty())
         log.remark(message);
-    for (std::size_t i = 1; i < outcome.warnings.size(); ++i)
-        log.failure(messageOf({outcome.verdict, outcome.code, 0, outcome.warnings[i], {}},
-                              operation, log.diskName(), texts));
     const bool isForGood =
         outcome.code == kPLErrorDamagedForGood || outcome.code == kPLErrorCutShort;
     log.verdict(outcome.verdict,
                 operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite, isForGood);
+    // What a repair cost is the last word, not the success.
+    for (const Sentence& warning : outcome.warnings)
+        log.failure(messageOf({outcome.verdict, outcome.code, 0, warning, {}}, operation,
+                              log.diskName(), texts));
     log.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
     log.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
 }
