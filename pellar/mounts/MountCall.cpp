@@ -7,11 +7,8 @@
 #include <sys/stat.h>
 
 #include <algorithm>
-#include <array>
 #include <cerrno>
-#include <climits>
 #include <cstdlib>
-#include <cstring>
 #include <memory>
 #include <utility>
 
@@ -38,79 +35,96 @@ void setOptions(MountCall& call, const std::string& options)
         mnt_optstr_get_flags(general, &call.flags, mnt_get_builtin_optmap(MNT_LINUX_MAP));
 }
 
-void makeDirectories(const std::string& target) noexcept
+int mountDevice(const MountCall& call, const FileDescriptor& place) noexcept
 {
-    std::array<char, PATH_MAX> path;
-    if (target.size() >= path.size())
-        return;
-    std::memcpy(path.data(), target.c_str(), target.size() + 1);
-    for (std::size_t i = 1; i <= target.size(); ++i) {
-        if (path[i] != '/' && path[i] != '\0')
-            continue;
-        const char end = std::exchange(path[i], '\0');
-        ::mkdir(path.data(), 0755);
-        path[i] = end;
-    }
-}
-
-int call(const char* source, const MountCall& call, unsigned long flags, const char* data) noexcept
-{
-    return ::mount(source, call.target.c_str(), call.isBind ? nullptr : call.filesystem.c_str(),
-                   flags, data) == 0
+    return ::mount(call.source.c_str(), DescriptorPath(place.get()).get(), call.filesystem.c_str(),
+                   call.flags, call.data.c_str()) == 0
                ? 0
                : errno;
 }
 
-/// All zero when there is nothing.
-struct statx statusOf(const std::string& path) noexcept
+/// What a mount has of its own, whatever the file system's are.
+mount_attr attributesFrom(unsigned long flags) noexcept
 {
-    struct statx status = {};
-    if (::statx(AT_FDCWD, path.c_str(), AT_NO_AUTOMOUNT, STATX_MNT_ID, &status) != 0)
-        status = {};
-    return status;
+    struct Attribute {
+        unsigned long flag;
+        std::uint64_t attribute;
+    };
+    mount_attr attributes = {};
+    for (const Attribute& known : {Attribute{MS_RDONLY, MOUNT_ATTR_RDONLY},
+                                   {MS_NOSUID, MOUNT_ATTR_NOSUID},
+                                   {MS_NODEV, MOUNT_ATTR_NODEV},
+                                   {MS_NOEXEC, MOUNT_ATTR_NOEXEC},
+                                   {MS_NODIRATIME, MOUNT_ATTR_NODIRATIME},
+                                   {MS_NOSYMFOLLOW, MOUNT_ATTR_NOSYMFOLLOW}}) {
+        attributes.attr_clr |= known.attribute;
+        attributes.attr_set |= (flags & known.flag) != 0 ? known.attribute : 0;
+    }
+    attributes.attr_clr |= MOUNT_ATTR__ATIME;
+    attributes.attr_set |= (flags & MS_NOATIME) != 0       ? MOUNT_ATTR_NOATIME
+                           : (flags & MS_STRICTATIME) != 0 ? MOUNT_ATTR_STRICTATIME
+                                                           : MOUNT_ATTR_RELATIME;
+    return attributes;
 }
 
-/// Its number, as in /proc/self/mountinfo; 0 from a kernel before 5.8 (statx(2)).
-std::uint64_t mountOf(const struct statx& status) noexcept
+// Made ready before it can be seen: at no moment has it fewer restrictions than it had.
+int bindPart(const MountCalls& calls, const MountCall& call, const FileDescriptor& place) noexcept
 {
-    return (status.stx_mask & STATX_MNT_ID) != 0 ? status.stx_mnt_id : 0;
+    if (!isMounted(calls.points, calls.whole))
+        return ENOENT;
+    const FileDescriptor whole = openShown(calls.points, calls.whole);
+    const FileDescriptor part =
+        whole ? openBelow(whole.get(), call.source.c_str()) : FileDescriptor();
+    if (!part)
+        return errno;
+    const FileDescriptor copy(
+        ::open_tree(part.get(), "", OPEN_TREE_CLONE | OPEN_TREE_CLOEXEC | AT_EMPTY_PATH));
+    mount_attr attributes = attributesFrom(call.flags);
+    const bool isDone =
+        copy &&
+        ::mount_setattr(copy.get(), "", AT_EMPTY_PATH, &attributes, sizeof attributes) == 0 &&
+        ::move_mount(copy.get(), "", place.get(), "",
+                     MOVE_MOUNT_F_EMPTY_PATH | MOVE_MOUNT_T_EMPTY_PATH) == 0;
+    return isDone ? 0 : errno;
 }
 
 }  // namespace
 
-MountCall mountCallFor(const MountPlace& place, const std::string& wholeTarget)
+std::variant<MountCalls, NotHeld> mountCallsFor(const std::vector<MountPlace>& places)
 {
-    MountCall call{place.source,   place.target, place.filesystem, {}, 0,
-                   place.isBind(), place.parent};
-    if (call.isBind)
-        call.source = wholeTarget + place.root;
-    setOptions(call, place.options);
-    return call;
+    auto points = holdMountPoints(places);
+    if (const auto* const notHeld = std::get_if<NotHeld>(&points))
+        return *notHeld;
+    MountCalls all;
+    all.points = std::get<std::vector<MountPoint>>(std::move(points));
+    for (const MountPlace& place : places) {
+        if (!place.isBind() && all.whole == MountPoint::none)
+            all.whole = all.calls.size();
+        MountCall call{place.source, place.target, place.filesystem, {}, 0, place.isBind()};
+        if (call.isBind)
+            call.source = place.root.substr(place.root.find_first_not_of('/'));
+        setOptions(call, place.options);
+        all.calls.push_back(std::move(call));
+    }
+    return all;
 }
 
-int perform(const MountCall& mountCall) noexcept
+int perform(const MountCalls& calls, std::size_t index) noexcept
 {
-    struct stat status = {};
-    if (::stat(mountCall.target.c_str(), &status) != 0)
-        makeDirectories(mountCall.target);
-    if (!mountCall.isBind)
-        return call(mountCall.source.c_str(), mountCall, mountCall.flags, mountCall.data.c_str());
-    // A bind mount takes its own flags only in a second call (mount(2), "Creating a bind mount").
-    if (const int error = call(mountCall.source.c_str(), mountCall, MS_BIND, nullptr))
-        return error;
-    return call(nullptr, mountCall, MS_BIND | MS_REMOUNT | mountCall.flags, nullptr);
-}
-
-bool isMounted(const MountCall& call) noexcept
-{
-    const struct statx status = statusOf(call.target);
-    return (status.stx_attributes & STATX_ATTR_MOUNT_ROOT) != 0 &&
-           (call.below == 0 || mountOf(status) != call.below);
+    const FileDescriptor place = openToMountOn(calls.points, index);
+    if (!place)
+        return errno;
+    const MountCall& call = calls.calls[index];
+    return call.isBind ? bindPart(calls, call, place) : mountDevice(call, place);
 }
 
 bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places)
 {
-    const std::uint64_t shown = mountOf(statusOf(place.target));
+    struct statx status = {};
+    if (::statx(AT_FDCWD, place.target.c_str(), AT_NO_AUTOMOUNT, STATX_MNT_ID, &status) != 0 ||
+        (status.stx_mask & STATX_MNT_ID) == 0)
+        return false;
+    const std::uint64_t shown = status.stx_mnt_id;
     return shown != 0 && std::none_of(places.begin(), places.end(), [shown](const auto& ours) {
                return ours.id == 0 || ours.id == shown;
            });

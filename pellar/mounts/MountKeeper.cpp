@@ -11,9 +11,11 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <csignal>
 #include <ctime>
+#include <vector>
 
 namespace pellar {
 namespace {
@@ -47,34 +49,58 @@ bool isFree(const MountCall& call) noexcept
     return !isLocked;
 }
 
-void mountWhenFree(const MountCall& call) noexcept
+void mountWhenFree(const MountCalls& calls, std::size_t index) noexcept
 {
     constexpr int attempts = 24 * 60 * 60 * 5;
     constexpr timespec pause{0, 200'000'000};
-    for (int attempt = 0; attempt < attempts && !isMounted(call); ++attempt) {
-        if (isFree(call) && perform(call) != EBUSY)
+    for (int attempt = 0; attempt < attempts && !isMounted(calls.points, index); ++attempt) {
+        if (isFree(calls.calls[index]) && perform(calls, index) != EBUSY)
             return;
         ::nanosleep(&pause, nullptr);
     }
 }
 
-[[noreturn]] void keep(const std::vector<MountCall>& calls, int lifeline) noexcept
+/// `kept` in ascending order.
+void closeAllBut(const std::vector<int>& kept) noexcept
+{
+    unsigned first = lifelineOfKeeper + 1;
+    for (const int descriptor : kept) {
+        const auto next = static_cast<unsigned>(descriptor);
+        if (next > first)
+            ::syscall(SYS_close_range, first, next - 1, 0U);
+        first = next + 1;
+    }
+    ::syscall(SYS_close_range, first, ~0U, 0U);
+}
+
+[[noreturn]] void keep(const MountCalls& calls, const std::vector<int>& kept, int lifeline) noexcept
 {
     ::setsid();
     ::prctl(PR_SET_NAME, "pellar-keeper");
     if (::dup2(lifeline, lifelineOfKeeper) != lifelineOfKeeper || ::chdir("/") != 0)
         ::_exit(1);
-    ::syscall(SYS_close_range, lifelineOfKeeper + 1, ~0U, 0U);
+    closeAllBut(kept);
     if (!isDismissed())
-        for (const MountCall& call : calls)
-            mountWhenFree(call);
+        for (std::size_t i = 0; i < calls.calls.size(); ++i)
+            mountWhenFree(calls, i);
     ::_exit(0);
+}
+
+std::vector<int> descriptorsOf(const MountCalls& calls)
+{
+    std::vector<int> descriptors;
+    for (const MountPoint& point : calls.points)
+        if (point.holder)
+            descriptors.push_back(point.holder.get());
+    std::sort(descriptors.begin(), descriptors.end());
+    return descriptors;
 }
 
 }  // namespace
 
-std::variant<MountKeeper, int> MountKeeper::start(const std::vector<MountCall>& calls)
+std::variant<MountKeeper, int> MountKeeper::start(const MountCalls& calls)
 {
+    const std::vector<int> kept = descriptorsOf(calls);
     int ends[2];
     if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends) != 0)
         return errno;
@@ -83,7 +109,7 @@ std::variant<MountKeeper, int> MountKeeper::start(const std::vector<MountCall>& 
     const SignalsBlocked blocked;
     const pid_t id = ::fork();
     if (id == 0)
-        keep(calls, theirs.get());
+        keep(calls, kept, theirs.get());
     if (id < 0)
         return errno;
     return MountKeeper(id, std::move(ours));

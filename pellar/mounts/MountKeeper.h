@@ -8,7 +8,6 @@
 
 #include <utility>
 #include <variant>
-#include <vector>
 
 namespace pellar {
 
@@ -16,12 +15,13 @@ namespace pellar {
 /// disk again should this process end before it has done so itself, killed (SIGKILL) or crashed. A
 /// tool that is still at work on the disk is waited for, for a day at most.
 ///
-/// It outlives signals to this process and its group, keeps nothing open and works in "/". What is
-/// killed together with it, as by a shutdown, stays unmounted. Any thread.
+/// It outlives signals to this process and its group, keeps nothing open but the directories in
+/// which the places are, and works in "/". What is killed together with it, as by a shutdown, stays
+/// unmounted. Any thread.
 class MountKeeper {
 public:
     /// An errno value where the system gives no process.
-    [[nodiscard]] static std::variant<MountKeeper, int> start(const std::vector<MountCall>& calls);
+    [[nodiscard]] static std::variant<MountKeeper, int> start(const MountCalls& calls);
 
     MountKeeper(MountKeeper&& other) noexcept
         : id_(std::exchange(other.id_, 0)), lifeline_(std::move(other.lifeline_))

@@ -3,7 +3,6 @@
 
 #include "fixwell/host/foundation/UTF8.h"
 #include "pellar/mounts/Holders.h"
-#include "pellar/mounts/MountContext.h"
 
 #include <algorithm>
 #include <cerrno>
@@ -17,19 +16,7 @@
 namespace pellar {
 namespace {
 
-// No other program is run, and no table but the kernel's is asked.
-MountContext makeContext(const MountPlace& place)
-{
-    MountContext context(mnt_new_context());
-    if (context) {
-        mnt_context_disable_helpers(context.get(), 1);
-        mnt_context_set_optsmode(context.get(), MNT_OMODE_NOTAB);
-        mnt_context_set_target(context.get(), place.target.c_str());
-    }
-    return context;
-}
-
-int unmount(const MountPlace& place)
+int unmountPatiently(const MountCalls& calls, std::size_t index)
 {
     // A file manager or an indexer that has just looked is gone in a moment.
     constexpr int attempts = 4;
@@ -37,8 +24,7 @@ int unmount(const MountPlace& place)
     for (int attempt = 0; attempt < attempts; ++attempt) {
         if (attempt > 0)
             std::this_thread::sleep_for(std::chrono::milliseconds(150));
-        MountContext context = makeContext(place);
-        error = context ? errorOf(context, mnt_context_umount(context.get())) : ENOMEM;
+        error = unmount(calls.points, index);
         if (error != EBUSY)
             break;
     }
@@ -60,28 +46,37 @@ Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
     return {"it is mounted at “%1$@” and in use", target, {}};
 }
 
-/// Where all of the file system is mounted; empty when only parts are.
-std::string wholeTargetOf(const std::vector<MountPlace>& places)
-{
-    const auto whole = std::find_if(places.begin(), places.end(),
-                                    [](const MountPlace& place) { return !place.isBind(); });
-    return whole != places.end() ? whole->target : std::string();
-}
-
 /// Why it could not be unmounted, or mounted again as it is; nothing when it could.
 Sentence objectionTo(const std::vector<MountPlace>& places)
 {
-    const bool isWhole = !wholeTargetOf(places).empty();
+    const bool isWhole = !std::all_of(places.begin(), places.end(),
+                                      [](const MountPlace& place) { return place.isBind(); });
     for (const MountPlace& place : places)
         if (place.filesystem.starts_with("fuse") || !isWhole)
             return {"it is mounted at “%1$@” in a way that could not be put back (%2$@)",
                     fixwell::printable(place.target), fixwell::printable(place.filesystem)};
-    for (const MountPlace& place : places)
-        if (isCovered(place, places))
-            return {"it is mounted at “%1$@”, and something else over it",
-                    fixwell::printable(place.target),
-                    {}};
     return {};
+}
+
+Sentence whyNotHeld(const MountPlace& place, int error, const SystemPaths& paths)
+{
+    const std::string target = fixwell::printable(place.target);
+    if (error == EBUSY)
+        return {"it is mounted at “%1$@”, and something else over it", target, {}};
+    if (error == EPERM || error == EACCES)
+        return refusal(place, error, paths);
+    return {"it is mounted at “%1$@” in a way that could not be put back (%2$@)", target,
+            ::strerrordesc_np(error)};
+}
+
+Sentence whyNotMountedAgain(const MountCall& call, int error)
+{
+    const std::string target = fixwell::printable(call.target);
+    if (error == ESTALE)
+        return {"It stays unmounted: “%1$@” is no longer the directory at which it was mounted.",
+                target,
+                {}};
+    return {"It could not be mounted again at “%1$@”: %2$@.", target, ::strerrordesc_np(error)};
 }
 
 }  // namespace
@@ -91,22 +86,25 @@ std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<MountPlace
 {
     if (const Sentence objection = objectionTo(places); !objection.isEmpty())
         return objection;
-    std::vector<MountCall> calls;
-    for (const MountPlace& place : places)
-        calls.push_back(mountCallFor(place, wholeTargetOf(places)));
-    auto keeper = MountKeeper::start(calls);
+    auto calls = mountCallsFor(places);
+    if (const auto* const notHeld = std::get_if<NotHeld>(&calls))
+        return whyNotHeld(places[notHeld->place], notHeld->error, paths);
+    auto keeper = MountKeeper::start(std::get<MountCalls>(calls));
     if (const int* const error = std::get_if<int>(&keeper))
         return Sentence{
             "nobody could be found to mount it again, should this program be killed: "
             "%1$@",
             ::strerrordesc_np(*error),
             {}};
-    UnmountedDisk disk(std::get<MountKeeper>(std::move(keeper)));
-    for (; !places.empty(); places.pop_back(), calls.pop_back()) {
-        // The last one first: it may lie over or below the others.
-        if (const int error = unmount(places.back()))
-            return refusal(places.back(), error, paths);
-        disk.unmounted_.insert(disk.unmounted_.begin(), std::move(calls.back()));
+    UnmountedDisk disk(std::get<MountCalls>(std::move(calls)),
+                       std::get<MountKeeper>(std::move(keeper)));
+    // The last one first: it may lie over or below the others.
+    for (; disk.mounted_ > 0; --disk.mounted_) {
+        const std::size_t last = disk.mounted_ - 1;
+        if (const int error = unmountPatiently(disk.calls_, last))
+            return refusal(places[last], error, paths);
+        if (disk.calls_.points[last].holder)
+            disk.uncovered_.push_back(openShown(disk.calls_.points, last));
     }
     return disk;
 }
@@ -114,10 +112,10 @@ std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<MountPlace
 std::vector<Sentence> UnmountedDisk::mountAgain()
 {
     std::vector<Sentence> failures;
-    for (const MountCall& call : std::exchange(unmounted_, {}))
-        if (const int error = perform(call))
-            failures.push_back({"It could not be mounted again at “%1$@”: %2$@.",
-                                fixwell::printable(call.target), ::strerrordesc_np(error)});
+    for (; mounted_ < calls_.calls.size(); ++mounted_)
+        if (const int error = perform(calls_, mounted_))
+            failures.push_back(whyNotMountedAgain(calls_.calls[mounted_], error));
+    uncovered_.clear();
     keeper_.reset();
     return failures;
 }

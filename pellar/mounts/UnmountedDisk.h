@@ -13,8 +13,9 @@
 namespace pellar {
 
 /// A disk that was unmounted for a job, and is mounted again where and as it was: at the latest
-/// when this object goes, however the job ends, and also when this process is killed. Any thread;
-/// unmounting writes back what is still to be written, which may take long.
+/// when this object goes, however the job ends, and also when this process is killed. It stays
+/// unmounted where others have changed the place meanwhile. Any thread; unmounting writes back what
+/// is still to be written, which may take long.
 class UnmountedDisk {
 public:
     /// Unmounts all the places, or none: why not, naming who holds it.
@@ -28,9 +29,15 @@ public:
     [[nodiscard]] std::vector<Sentence> mountAgain();
 
 private:
-    explicit UnmountedDisk(MountKeeper keeper) : keeper_(std::move(keeper)) {}
+    UnmountedDisk(MountCalls calls, MountKeeper keeper)
+        : calls_(std::move(calls)), mounted_(calls_.calls.size()), keeper_(std::move(keeper))
+    {
+    }
 
-    std::vector<MountCall> unmounted_;  ///< to be mounted again, in this order
+    MountCalls calls_;
+    std::size_t mounted_;  ///< so many of them still are, the first ones
+    /// Keeps the directories' numbers from going to others.
+    std::vector<FileDescriptor> uncovered_;
     std::optional<MountKeeper> keeper_;
 };
 

@@ -14,6 +14,7 @@
 #include <unistd.h>
 
 #include <fstream>
+#include <functional>
 
 namespace {
 
@@ -152,6 +153,103 @@ TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
     ::usleep(500'000);
     EXPECT_TRUE(mounts().empty()) << "a tool that writes is waited for";
     std::ofstream(fs::path(options.toolPath) / "end");
+    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
+}
+
+// What the owner of a directory on the way does while nothing is mounted. Aimed at /etc, a link
+// would make its files theirs.
+TEST_F(MountedDisk, NobodyLeadsItElsewhereMeanwhile)
+{
+    struct Case {
+        std::function<void(const fs::path& mnt)> meanwhile;
+        std::string found;  ///< where it is mounted again; empty: nowhere
+        std::string_view because;
+        uid_t owner = 65534;
+    };
+    const auto replaceByLink = [this](const fs::path& mnt) {
+        fs::rename(mnt / "stick", mnt / "away");
+        fs::create_directory_symlink(workshop_.path("victim"), mnt / "stick");
+    };
+    const std::vector<Case> cases{
+        {replaceByLink, "", "a link to a directory of root's"},
+        {[this](const fs::path& mnt) {
+             fs::rename(mnt / "stick", mnt / "away");
+             fs::create_directory(mnt / "stick");
+         },
+         "", "another directory"},
+        {[this](const fs::path& mnt) {
+             fs::rename(mnt, mnt.parent_path() / "moved");
+             fs::create_directory_symlink(workshop_.path("victim"), mnt);
+         },
+         "alice/moved/stick", "the same directory, wherever it is"},
+        {[](const fs::path& mnt) { fs::remove(mnt / "stick"); }, "", "gone"},
+        {[](const fs::path& mnt) { fs::remove(mnt / "stick"); }, "alice/mnt/stick",
+         "taken away by what had made it, and nobody else could have put something there", 0},
+    };
+    for (const auto& place : {workshop_.path("other"), place()})
+        ASSERT_EQ(::umount(place.c_str()), 0);
+    fs::create_directories(workshop_.path("victim/stick"));
+    for (const Case& c : cases)
+        for (const bool isKilled : {false, true}) {
+            const fs::path alice = workshop_.path("alice");
+            fs::remove_all(alice);
+            fs::create_directories(alice / "mnt/stick");
+            ASSERT_EQ(::chown((alice / "mnt").c_str(), c.owner, 0), 0);
+            ASSERT_EQ(::mount(device_->name().c_str(), (alice / "mnt/stick").c_str(), "ext4",
+                              MS_NOSUID, nullptr),
+                      0);
+            const auto places = [this] {
+                std::string found;
+                for (const MountPlace& place : mounts())
+                    found += place.target;
+                return found;
+            };
+            const std::string expected = c.found.empty() ? "" : workshop_.path(c.found).native();
+            ManagerOptions options;
+            options.toolPath = workshop_.fakeTools("wait");
+            if (isKilled) {
+                OtherProgram verification(options, disk(), false);
+                ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
+                c.meanwhile(alice / "mnt");
+                verification.kill();
+                ::usleep(expected.empty() ? 700'000 : 0);
+                EXPECT_TRUE(comesTrue([&] { return places() == expected; }))
+                    << c.because << ": " << places();
+            } else {
+                test::Bench bench(options);
+                ASSERT_EQ(bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+                ASSERT_TRUE(bench.loop.runUntil([&] { return mounts().empty(); }));
+                c.meanwhile(alice / "mnt");
+                bench.tool->cancelCurrentOperation();
+                ASSERT_TRUE(bench.loop.runUntil([&] { return bench.listener.finished == 1; }));
+                EXPECT_EQ(places(), expected) << c.because;
+                const bool isTold = bench.listener.hasErrorWith("It stays unmounted") ||
+                                    bench.listener.hasErrorWith("could not be mounted again");
+                EXPECT_EQ(isTold, expected.empty()) << c.because;
+            }
+            for (const MountPlace& place : mounts())
+                ::umount(place.target.c_str());
+        }
+}
+
+// The directory that holds the second place is on the disk itself.
+TEST_F(MountedDisk, IsMountedAgainWhereItLiesOnItself)
+{
+    fs::create_directories(place() / "in/self");
+    ASSERT_EQ(::mount((place() / "part").c_str(), (place() / "in/self").c_str(), nullptr, MS_BIND,
+                      nullptr),
+              0);
+    before_ = mounts();
+    ASSERT_EQ(before_.size(), 3U);
+    test::Bench bench;
+    EXPECT_EQ(bench.verify(disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
+    EXPECT_EQ(mounts(), before_);
+    ManagerOptions options;
+    options.toolPath = workshop_.fakeTools("wait");
+    OtherProgram verification(options, disk(), false);
+    EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
+    verification.kill();
     EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
 }
 
