@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/LibraryOptions.h"
 
+#include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Language.h"
 
+#include <sys/stat.h>
 #include <unistd.h>
 
 namespace orvane {
@@ -11,24 +13,44 @@ namespace {
 
 constexpr const char* authority = "/usr/bin/pkexec";
 
-/// How the helper is started; empty for root, who needs none, and where it is not installed.
+bool isRootsAlone(const std::filesystem::path& program)
+{
+    struct stat status = {};
+    return ::lstat(program.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
+           status.st_uid == 0 && (status.st_mode & (S_IWGRP | S_IWOTH)) == 0 &&
+           isWayOfRootsAlone(program);
+}
+
+/// How the helper is started; empty for root, who needs none, and where it is not installed. One
+/// that a user has built is not offered: an administrator's password would run what that user may
+/// change.
 std::vector<std::string> helperLauncher()
 {
     const auto helper =
         runningExecutable().parent_path().parent_path() / "libexec/orvane/pellar-helper";
-    if (::geteuid() == 0 || ::access(authority, X_OK) != 0 || ::access(helper.c_str(), X_OK) != 0)
+    if (::geteuid() == 0 || ::access(authority, X_OK) != 0 || ::access(helper.c_str(), X_OK) != 0 ||
+        !isRootsAlone(helper))
         return {};
     return {authority, helper.native()};
+}
+
+/// Empty where the variable names nothing that may be used.
+std::string toolPathFromEnvironment(const WarningSink& refused)
+{
+    std::string path;
+    for (const auto& directory : directoriesNamedBy("FIXWELL_TOOL_PATH", environmentValue, refused))
+        path += (path.empty() ? "" : ":") + directory.native();
+    return path;
 }
 
 }  // namespace
 
 pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
-                                      const Asking& asking)
+                                      const Asking& asking, const WarningSink& refused)
 {
     pellar::ManagerOptions options;
-    if (const auto path = environmentValue("FIXWELL_TOOL_PATH"))
-        options.toolPath = *path;
+    if (const std::string path = toolPathFromEnvironment(refused); !path.empty())
+        options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
     if (!paths.state.empty()) {
         options.savedSectorsDirectory = paths.state / "partition-maps";

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/privileges/PrivilegedScript.h"
+#include "orvane/support/Failure.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/Texts.h"
@@ -10,9 +11,11 @@ namespace orvane {
 
 /// How the disk-management library is set up for a user: where it looks for tools, where it keeps
 /// what a repair overwrites, and how it gets at disks for which the user has no right. `texts`
-/// outlives the options.
+/// outlives the options. `refused` (may be empty) is told of directories of FIXWELL_TOOL_PATH that
+/// do not count, because others could change what root would run from there.
 [[nodiscard]] pellar::ManagerOptions libraryOptions(const XDGPaths& paths,
                                                     const pellar::Texts& texts,
-                                                    const Asking& asking = {});
+                                                    const Asking& asking = {},
+                                                    const WarningSink& refused = {});
 
 }  // namespace orvane

@@ -29,6 +29,7 @@ TerminalAlerts::Answer answerFor(const Request& request)
 
 Session::Session(const Request& request, Reporter& reporter)
     : reporter_(reporter),
+      tracesCommands_(request.tracesCommands),
       logView_(
           loop_,
           [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
@@ -86,15 +87,22 @@ SupportOptions Session::supportOptions(const Request& request)
 pellar::ManagerOptions Session::libraryOptions(const Request& request)
 {
     pellar::ManagerOptions options =
-        orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking());
+        orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking(),
+                               [this](const std::string& sentence) { trace(sentence); });
     options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },
                                libraryTexts_.text("With --fetch-archives the archives of these "
                                                   "packages are fetched over the network.")};
-    if (request.tracesCommands)
+    if (tracesCommands_)
         options.commandTrace = [this](std::string_view line) {
-            reporter_.warning(std::string(line));
+            trace(line);
         };
     return options;
+}
+
+void Session::trace(std::string_view line)
+{
+    if (tracesCommands_)
+        reporter_.warning(std::string(line));
 }
 
 // The job's thread waits until nothing is drawn any more, but not for long: the main thread may be
@@ -137,8 +145,9 @@ JobReporter::Hooks Session::jobHooks()
 
 Outcome<> Session::loadModule()
 {
-    const auto bundles =
-        findModuleBundles(moduleDirectories(environmentValue, runningExecutable()));
+    const auto bundles = findModuleBundles(
+        moduleDirectories(environmentValue, runningExecutable(),
+                          [this](const std::string& sentence) { trace(sentence); }));
     if (bundles.empty())
         return cannot("find", "Fixwell.ovmodule", "no module directory holds it");
     auto loaded = orvane::loadModule(bundles.front());

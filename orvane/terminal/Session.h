@@ -74,6 +74,7 @@ private:
 
     SupportOptions supportOptions(const Request& request);
     pellar::ManagerOptions libraryOptions(const Request& request);
+    void trace(std::string_view line);
     Asking asking();
     JobReporter::Hooks jobHooks();
     void follow(const fixwell::DiskReferencePointer& disk);
@@ -81,6 +82,7 @@ private:
     bool pressStop();
 
     Reporter& reporter_;
+    const bool tracesCommands_;
     std::unique_ptr<PasswordAgent> agent_;
     MainLoop loop_;
     DiskNames names_;

@@ -2,6 +2,7 @@
 #include "pellar/process/Command.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/process/TrustedWay.h"
 
 #include <unistd.h>
 
@@ -17,6 +18,19 @@ std::string shown(const Command& command)
     return fixwell::printable(line);
 }
 
+namespace {
+
+// Asked again for each job: what root runs must not be another user's.
+bool isRunnable(const std::filesystem::path& program)
+{
+    std::error_code error;
+    return std::filesystem::is_regular_file(program, error) &&
+           ::access(program.c_str(), X_OK) == 0 &&
+           (::geteuid() != 0 || std::holds_alternative<FileDescriptor>(openTrusted(program)));
+}
+
+}  // namespace
+
 std::filesystem::path findProgram(std::string_view name, std::string_view searchPath)
 {
     while (!searchPath.empty()) {
@@ -26,9 +40,7 @@ std::filesystem::path findProgram(std::string_view name, std::string_view search
         if (!directory.is_absolute())
             continue;
         std::filesystem::path program = directory / name;
-        std::error_code error;
-        if (std::filesystem::is_regular_file(program, error) &&
-            ::access(program.c_str(), X_OK) == 0)
+        if (isRunnable(program))
             return program;
     }
     return {};

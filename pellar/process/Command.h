@@ -19,7 +19,8 @@ std::string shown(const Command& command);
 
 /// The program `name` in the first directory of `searchPath` ("/usr/sbin:/usr/bin") that has it as
 /// an executable regular file; empty when none has. Directories that are not absolute are
-/// skipped: what lies in the current directory is nobody's tool.
+/// skipped: what lies in the current directory is nobody's tool. So is, for root, what others could
+/// change.
 std::filesystem::path findProgram(std::string_view name, std::string_view searchPath);
 
 }  // namespace pellar

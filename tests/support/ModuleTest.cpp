@@ -5,6 +5,8 @@
 
 #include <gtest/gtest.h>
 
+#include <unistd.h>
+
 namespace orvane {
 namespace {
 
@@ -59,8 +61,20 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
                    fs::permissions(b, fs::perms::others_write, fs::perm_options::add);
                },
                "other users may change it"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) {
+                   fs::permissions(b / "module.json", fs::perms::others_write,
+                                   fs::perm_options::add);
+               },
+               "other users may change it"},
+          Case{TEST_MODULE_RIGHT,
+               [](const fs::path& b) {
+                   fs::rename(b / "test.so", b / "real.so");
+                   fs::create_symlink("real.so", b / "test.so");
+               },
+               "symbolic links"},
           Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::remove(b / "module.json"); },
-               "module.json: No such file"},
+               "module.json’: No such file"},
           Case{TEST_MODULE_RIGHT,
                [](const fs::path& b) {
                    test::write(b / "module.json", R"({"name":"T","library":"../../evil.so"})");
@@ -79,6 +93,31 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
         EXPECT_NE(failureMessage(loaded).find("Test.ovmodule"), std::string::npos)
             << "names the object";
     }
+}
+
+// Whoever owns a directory on the way can exchange what lies below it between two looks.
+TEST(ModuleLoader, ForRootTheWayIsLookedAtAsWell)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root can give directories away";
+    const TemporaryDirectory directory;
+    const fs::path bundle = makeBundle(directory, TEST_MODULE_RIGHT);
+    constexpr uid_t somebody = 65534;
+    const fs::path others = directory / "others";
+    fs::create_directory(others);
+    fs::rename(bundle, others / "Test.ovmodule");
+    ASSERT_EQ(::chown(others.c_str(), somebody, 0), 0);
+    const auto loaded = loadModule(others / "Test.ovmodule");
+    ASSERT_TRUE(failed(loaded));
+    EXPECT_NE(failureMessage(loaded).find("on the way there: it belongs to another user"),
+              std::string::npos)
+        << failureMessage(loaded);
+    std::string told;
+    const auto directories =
+        moduleDirectories([&](const char*) { return std::optional<std::string>(others.native()); },
+                          {}, [&](const std::string& sentence) { told = sentence; });
+    EXPECT_EQ(directories, std::vector<fs::path>{"/usr/lib/orvane/modules"});
+    EXPECT_NE(told.find("ORVANE_MODULE_PATH"), std::string::npos) << told;
 }
 
 TEST(ModuleSearch, WhereModulesAreLookedFor)

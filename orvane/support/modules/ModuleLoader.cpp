@@ -2,17 +2,30 @@
 #include "orvane/support/modules/ModuleLoader.h"
 
 #include "fixwell/host/foundation/UTF8.h"
-#include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/files/FileDescriptor.h"
+#include "orvane/support/files/WholeFile.h"
+#include "orvane/support/settings/ValueJSON.h"
+#include "pellar/process/TrustedWay.h"
 
 #include <dlfcn.h>
+#include <fcntl.h>
+#include <sys/stat.h>
 
 #include <fmt/format.h>
+#include <cerrno>
 #include <utility>
+#include <vector>
 
 namespace orvane {
 namespace {
 
 constexpr const char* attempt = "load the module";
+
+struct Description {
+    std::string name;
+    std::string library;  ///< the name of a file in the bundle
+    std::string defaultTable;
+};
 
 Failure linkerFailure(const std::filesystem::path& library)
 {
@@ -21,20 +34,70 @@ Failure linkerFailure(const std::filesystem::path& library)
                   fixwell::printable(reason != nullptr ? reason : "unknown reason"));
 }
 
-Outcome<const fixwell::ModuleEntry*> openLibrary(const std::filesystem::path& library)
+/// A file in the open directory, which others cannot change. `shown`: its path, for messages.
+Outcome<FileDescriptor> openFile(const FileDescriptor& directory, const std::string& name,
+                                 const std::filesystem::path& shown)
 {
-    void* const code = ::dlopen(library.c_str(), RTLD_NOW | RTLD_LOCAL);
+    FileDescriptor file(::openat(directory.get(), name.c_str(),
+                                 O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    struct stat status = {};
+    if (!file || ::fstat(file.get(), &status) != 0)
+        return cannot(attempt, shown.native(), errno);
+    if (!S_ISREG(status.st_mode))
+        return cannot(attempt, shown.native(), "it is no file");
+    if (const std::string reason = pellar::whyOthersCanChange(status); !reason.empty())
+        return cannot(attempt, shown.native(), reason);
+    return file;
+}
+
+/// Where it really is; the path to the bundle may be led elsewhere by a link.
+std::filesystem::path pathOf(const FileDescriptor& directory)
+{
+    return std::filesystem::read_symlink(pellar::pathOfDescriptor(directory.get()));
+}
+
+bool isPlainFileName(const std::filesystem::path& name)
+{
+    return !name.empty() && name == name.filename() && name != "." && name != "..";
+}
+
+Outcome<Description> readDescription(const FileDescriptor& file, const std::filesystem::path& shown)
+{
+    const auto contents = readWholeFile(pellar::pathOfDescriptor(file.get()), 64U << 10U);
+    if (const int* const error = std::get_if<int>(&contents))
+        return cannot(attempt, shown.native(), *error);
+    const auto json = parsedJSON(std::get<std::string>(contents));
+    const auto text = [&json](const char* key, const char* otherwise) -> std::string {
+        const auto found = json.find(key);
+        return found != json.end() && found->is_string() ? found->get<std::string>() : otherwise;
+    };
+    if (!json.is_object() || text("name", "").empty())
+        return cannot(attempt, shown.native(), "it does not name the module");
+    if (!isPlainFileName(text("library", "")))
+        return cannot(attempt, shown.native(), "it names no library inside the bundle");
+    return Description{text("name", ""), text("library", ""), text("table", "FXW")};
+}
+
+Outcome<const fixwell::ModuleEntry*> openLibrary(FileDescriptor file,
+                                                 const std::filesystem::path& shown)
+{
+    void* const code =
+        ::dlopen(pellar::pathOfDescriptor(file.get()).c_str(), RTLD_NOW | RTLD_LOCAL);
     if (code == nullptr)
-        return linkerFailure(library);
+        return linkerFailure(shown);
+    // The linker knows a library by its name. With this one given back, the next to be loaded could
+    // have it, and would be taken for the one that is there.
+    static std::vector<FileDescriptor> loaded;
+    loaded.push_back(std::move(file));
     const auto entryFunction =
         reinterpret_cast<fixwell::ModuleEntryFunction>(::dlsym(code, fixwell::moduleEntryName));
     if (entryFunction == nullptr)
-        return linkerFailure(library);
+        return linkerFailure(shown);
     const fixwell::ModuleEntry* const entry = entryFunction();
     if (entry == nullptr)
-        return cannot(attempt, library.native(), "it gives no module entry");
+        return cannot(attempt, shown.native(), "it gives no module entry");
     if (entry->contractVersion != fixwell::moduleContractVersion)
-        return cannot(attempt, library.native(),
+        return cannot(attempt, shown.native(),
                       fmt::format("it was built for version {} of the module contract, and this "
                                   "program has version {}",
                                   entry->contractVersion, fixwell::moduleContractVersion));
@@ -45,19 +108,26 @@ Outcome<const fixwell::ModuleEntry*> openLibrary(const std::filesystem::path& li
 
 Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle)
 {
-    if (const auto checked = checkIsTrustworthy(bundle); failed(checked))
-        return std::get<Failure>(checked);
-    auto described = readModuleDescription(bundle);
+    const auto opened = pellar::openTrusted(bundle);
+    if (const auto* const reason = std::get_if<std::string>(&opened))
+        return cannot(attempt, bundle.native(), *reason);
+    const auto& directory = std::get<FileDescriptor>(opened);
+    const auto json = openFile(directory, "module.json", bundle / "module.json");
+    if (failed(json))
+        return std::get<Failure>(json);
+    const auto described = readDescription(std::get<FileDescriptor>(json), bundle / "module.json");
     if (failed(described))
         return std::get<Failure>(described);
-    const auto& description = std::get<ModuleDescription>(described);
-    if (const auto checked = checkIsTrustworthy(description.library); failed(checked))
-        return std::get<Failure>(checked);
-    const auto entry = openLibrary(description.library);
+    const auto& description = std::get<Description>(described);
+    const auto shown = bundle / description.library;
+    auto library = openFile(directory, description.library, shown);
+    if (failed(library))
+        return std::get<Failure>(library);
+    const auto entry = openLibrary(std::get<FileDescriptor>(std::move(library)), shown);
     if (failed(entry))
         return std::get<Failure>(entry);
     return LoadedModule{description.name,
-                        std::make_unique<ModuleBundle>(bundle, description.defaultTable),
+                        std::make_unique<ModuleBundle>(pathOf(directory), description.defaultTable),
                         std::get<const fixwell::ModuleEntry*>(entry)};
 }
 

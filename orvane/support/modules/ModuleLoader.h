@@ -19,9 +19,12 @@ struct LoadedModule {
     const fixwell::ModuleEntry* entry = nullptr;
 };
 
-/// Loads the bundle's library. Refuses what other users could have changed, and a module that was
-/// built for another version of the contract, of which nothing but the version is looked at.
-/// Loading runs the library's initializers. Main thread.
+/// Loads the bundle's library: {"name": "Fixwell", "library": "fixwell.so"} in its `module.json`
+/// names it, and "table" the default string table, where it is another one than "FXW". Refuses what
+/// other users could change (for root, on the way there as well), and a module that was built for
+/// another version of the contract, of which nothing but the version is looked at. All that is
+/// looked at is opened once, and that is what is loaded. Loading runs the library's initializers.
+/// Main thread.
 [[nodiscard]] Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle);
 
 /// Whether the module may run here; it says NO where its own switch in the settings is off.

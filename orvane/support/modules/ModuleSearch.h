@@ -10,10 +10,16 @@
 
 namespace orvane {
 
-/// Where modules are looked for, the first place first: the directories of ORVANE_MODULE_PATH
-/// (separated by colons, absolute ones only), beside the program, and the system's.
+/// The directories that a variable names: absolute ones, separated by colons. For root, those that
+/// others could change are left out; `refused` (may be empty) is told of each and why.
+[[nodiscard]] std::vector<std::filesystem::path> directoriesNamedBy(
+    const char* variable, const EnvironmentLookup& environment, const WarningSink& refused);
+
+/// Where modules are looked for, the first place first: the directories of ORVANE_MODULE_PATH,
+/// beside the program, and the system's. `refused` as above.
 [[nodiscard]] std::vector<std::filesystem::path> moduleDirectories(
-    const EnvironmentLookup& environment, const std::filesystem::path& executable);
+    const EnvironmentLookup& environment, const std::filesystem::path& executable,
+    const WarningSink& refused = {});
 
 /// The host's own bundle, beside the program: the directory with its `locale`.
 [[nodiscard]] std::filesystem::path hostBundleDirectory(const std::filesystem::path& executable);
@@ -25,19 +31,5 @@ namespace orvane {
 /// first hides others of its name.
 [[nodiscard]] std::vector<std::filesystem::path> findModuleBundles(
     const std::vector<std::filesystem::path>& directories);
-
-/// What a bundle's `module.json` says: {"name": "Fixwell", "library": "fixwell.so"}, and "table",
-/// the default string table, where it is another one than "FXW".
-struct ModuleDescription {
-    std::string name;
-    std::filesystem::path library;  ///< with the bundle's path
-    std::string defaultTable;
-};
-
-[[nodiscard]] Outcome<ModuleDescription> readModuleDescription(const std::filesystem::path& bundle);
-
-/// Done when nobody but root and the user can change the file or directory; code from anywhere
-/// else would run with the user's rights, often with root's.
-[[nodiscard]] Outcome<> checkIsTrustworthy(const std::filesystem::path& path);
 
 }  // namespace orvane
