@@ -12,9 +12,11 @@
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Language.h"
 
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <charconv>
 #include <csignal>
 #include <cstdio>
@@ -45,11 +47,36 @@ std::optional<uid_t> userWhoAsked()
     return isNumber ? std::optional(user) : std::nullopt;
 }
 
+// A limit that the user has set would end the work in the middle of a write.
+void setOwnLimits()
+{
+    struct Limit {
+        __rlimit_resource resource;
+        rlim_t soft, hard;
+    };
+    constexpr rlim_t most = RLIM_INFINITY;
+    for (const Limit& limit :
+         {Limit{RLIMIT_FSIZE, most, most}, Limit{RLIMIT_CPU, most, most},
+          Limit{RLIMIT_AS, most, most}, Limit{RLIMIT_DATA, most, most},
+          Limit{RLIMIT_NPROC, most, most}, Limit{RLIMIT_CORE, 0, 0},
+          Limit{RLIMIT_STACK, 8U << 20U, most}, Limit{RLIMIT_NOFILE, 1024, 4096}}) {
+        const rlimit wanted{limit.soft, limit.hard};
+        rlimit given = {};
+        if (::setrlimit(limit.resource, &wanted) == 0 || ::getrlimit(limit.resource, &given) != 0)
+            continue;
+        // In a container root may not raise what was set for it.
+        given.rlim_cur = std::min(limit.soft, given.rlim_max);
+        ::setrlimit(limit.resource, &given);
+    }
+    ::setpriority(PRIO_PROCESS, 0, 0);
+}
+
 // From the user's own terminal a Ctrl-C comes here as well; what it means is told by the program
 // that asked. Nothing is inherited that a tool could trip over.
 void settle()
 {
     setInheritanceRight();
+    setOwnLimits();
     for (const int signal : {SIGINT, SIGHUP, SIGPIPE, SIGQUIT, SIGTSTP})
         std::signal(signal, SIG_IGN);
     ::clearenv();

@@ -32,6 +32,13 @@ void hearOfChildren()
     std::signal(SIGCHLD, SIG_DFL);
 }
 
+// A write beyond the limit (ulimit -f) would end the program without a word; ignored, it fails with
+// EFBIG, and who writes says so. What the program starts has the standard handling again.
+void surviveFileSizeLimit()
+{
+    std::signal(SIGXFSZ, SIG_IGN);
+}
+
 // A main thread grows up to the limit of the moment; other threads are made as large as the limit
 // was when the program began (pthread_create(3)).
 void giveStacksRoom()
@@ -70,6 +77,7 @@ void setInheritanceRight()
 {
     keepStandardStreamsTaken();
     hearOfChildren();
+    surviveFileSizeLimit();
     giveStacksRoom();
 }
 
