@@ -10,6 +10,10 @@
 #include "orvane/privileges/UndoneJob.h"
 #include "pellar/Manager.h"
 
+#include <fcntl.h>
+
+#include <cerrno>
+#include <cstring>
 #include <memory>
 #include <utility>
 
@@ -57,9 +61,29 @@ private:
     std::optional<Undone> prepare()
     {
         disk_ = request_.disk;
-        if (request_.subject == Subject::Permissions)
-            return findSystem();
-        return request_.isOnImage() ? attach() : std::nullopt;
+        if (request_.isOnImage())
+            return attach();
+        if (auto undone = holdDevice())
+            return undone;
+        return request_.subject == Subject::Permissions ? findSystem() : std::nullopt;
+    }
+
+    // While it is open its number goes to no other disk, so that what the job opens by the name is
+    // this one.
+    std::optional<Undone> holdDevice()
+    {
+        device_ = FileDescriptor(
+            ::open(disk_.path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_NOFOLLOW | O_CLOEXEC));
+        if (!device_)
+            return Undone{fixwell::kPLErrorCannotOpen,
+                          fixwell::kPLVerdictFailed,
+                          {"it cannot be opened: %1$@", ::strerrordesc_np(errno), {}}};
+        if (!request_.identity.isStill(identityOf(device_)))
+            return Undone{
+                fixwell::kPLErrorDiskChanged,
+                fixwell::kPLVerdictFailed,
+                {"the disk changed: another one has its name now; nothing was done", {}, {}}};
+        return std::nullopt;
     }
 
     std::optional<Undone> findSystem()
@@ -140,6 +164,7 @@ private:
     MainLoop loop_;
     Teller teller_;
     DiskReference disk_;
+    FileDescriptor device_;
     std::optional<AttachedRegion> region_;  ///< given back last
 };
 

@@ -30,8 +30,8 @@ constexpr std::array tasks{Task{"verify", Subject::Filesystem, Operation::Verify
                            Task{"repair-map", Subject::PartitionMap, Operation::Repair},
                            Task{"repair-permissions", Subject::Permissions, Operation::Repair}};
 
-// attach OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
-constexpr std::string_view attaching = "attach";
+// attach-OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
+constexpr std::string_view attaching = "attach-";
 
 // Comes last, for permissions.
 constexpr std::string_view fetching = "--fetch-archives";
@@ -90,7 +90,8 @@ Read withTexts(HelperRequest request, Arguments texts)
         return "wrong number of arguments";
     if (texts[0].size() > longestName || texts[1].size() > longestName)
         return "a name is too long";
-    if (!consistsOf(texts[2], "_-+.", 64) || !consistsOf(texts[3], std::string(languageSigns) + ':', longestLanguages))
+    if (!consistsOf(texts[2], "_-+.", 64) ||
+        !consistsOf(texts[3], std::string(languageSigns) + ':', longestLanguages))
         return "a name of a file system or language holds what none does";
     request.disk.identifier = texts[0];
     request.disk.name = texts[1];
@@ -102,25 +103,26 @@ Read withTexts(HelperRequest request, Arguments texts)
 Read readRegion(Arguments arguments)
 {
     constexpr std::uint64_t largest = std::numeric_limits<std::int64_t>::max();
-    if (arguments.size() < 5)
+    if (arguments.size() < 4)
         return "wrong number of arguments";
-    const Task* const task = taskNamed(arguments[1]);
+    const Task* const task = taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
     if (task == nullptr || task->subject != Subject::Filesystem)
         return "unknown operation";
-    const auto image = numberIn(arguments[2], std::numeric_limits<int>::max());
-    const auto offset = numberIn(arguments[3], largest);
-    const auto length = numberIn(arguments[4], largest);
+    const auto image = numberIn(arguments[1], std::numeric_limits<int>::max());
+    const auto offset = numberIn(arguments[2], largest);
+    const auto length = numberIn(arguments[3], largest);
     if (!image || !offset || !length || *length == 0 || *length > largest - *offset)
         return "no region of a file";
-    HelperRequest request{task->subject, task->operation, {}, static_cast<int>(*image), {}, false};
+    HelperRequest request{task->subject, task->operation, {}, {}, static_cast<int>(*image), {},
+                          false};
     request.disk.storage = fixwell::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
-    return withTexts(std::move(request), arguments.subspan(5));
+    return withTexts(std::move(request), arguments.subspan(4));
 }
 
-/// Those of a list that the helper takes, as many as it takes. The rest is left out: a user's LANGUAGE
-/// can hold anything.
+/// Those of a list that the helper takes, as many as it takes. The rest is left out: a user's
+/// LANGUAGE can hold anything.
 std::string acceptedLanguages(std::string_view list)
 {
     std::string accepted;
@@ -143,10 +145,12 @@ std::string acceptedLanguages(std::string_view list)
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
     HelperRequest request{
-        job.subject, job.operation,      job.disk, -1, acceptedLanguages(languages),
+        job.subject,        job.operation, job.disk, {}, -1, acceptedLanguages(languages),
         job.fetchesArchives};
-    if (!job.image)
+    if (!job.image) {
+        request.identity = identityOf(job.disk.path);
         return request;
+    }
     request.image = job.image->descriptor();
     request.disk.path.clear();
     request.disk.offset = job.image->offset();
@@ -159,11 +163,12 @@ std::vector<std::string> argumentsOf(const HelperRequest& request)
     const fixwell::DiskReference& disk = request.disk;
     std::vector<std::string> arguments;
     if (request.isOnImage())
-        arguments = {std::string(attaching), std::string(taskOf(request)->word),
+        arguments = {std::string(attaching) + std::string(taskOf(request)->word),
                      std::to_string(request.image), std::to_string(disk.offset),
                      std::to_string(disk.length)};
     else
-        arguments = {std::string(taskOf(request)->word), disk.path.native()};
+        arguments = {std::string(taskOf(request)->word), disk.path.native(),
+                     request.identity.text()};
     for (const std::string& text :
          {disk.identifier.substr(0, longestName), disk.name.substr(0, longestName), disk.filesystem,
           request.languages})
@@ -176,19 +181,22 @@ std::vector<std::string> argumentsOf(const HelperRequest& request)
 Read readHelperArguments(const std::vector<std::string>& arguments,
                          const std::function<bool(const std::filesystem::path&)>& isBlockDevice)
 {
-    if (arguments.size() < 2)
+    if (arguments.size() < 3)
         return "wrong number of arguments";
-    if (arguments[0] == attaching)
+    if (arguments[0].starts_with(attaching))
         return readRegion(arguments);
     const Task* const task = taskNamed(arguments[0]);
     if (task == nullptr)
         return "unknown operation";
     if (!isCanonicalDevice(arguments[1]) || !isBlockDevice(arguments[1]))
         return "not a block device below /dev";
-    HelperRequest request{task->subject, task->operation, {}, -1, {}, false};
+    const auto identity = DiskIdentity::fromText(arguments[2]);
+    if (!identity)
+        return "it is not said which disk is meant";
+    HelperRequest request{task->subject, task->operation, {}, *identity, -1, {}, false};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
-    Arguments texts = Arguments(arguments).subspan(2);
+    Arguments texts = Arguments(arguments).subspan(3);
     request.fetchesArchives =
         task->subject == Subject::Permissions && !texts.empty() && texts.back() == fetching;
     return withTexts(std::move(request),

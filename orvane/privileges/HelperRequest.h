@@ -2,6 +2,7 @@
 #pragma once
 
 #include "fixwell/host/pellar/DiskReference.h"
+#include "orvane/privileges/DiskIdentity.h"
 #include "pellar/jobs/PrivilegedJob.h"
 
 #include <functional>
@@ -17,6 +18,7 @@ struct HelperRequest {
     pellar::Operation operation = pellar::Operation::Verify;
     /// A block device; or, without a path, a region of an image file.
     fixwell::DiskReference disk;
+    DiskIdentity identity;  ///< of the block device
     int image = -1;         ///< the image's descriptor in the program that asks; -1 for a device
     std::string languages;  ///< for the texts; empty for English
     /// Archives of packages may be fetched over the network; for permissions alone.
@@ -30,17 +32,18 @@ struct HelperRequest {
                a.disk.path == b.disk.path && a.disk.offset == b.disk.offset &&
                a.disk.length == b.disk.length && a.disk.identifier == b.disk.identifier &&
                a.disk.name == b.disk.name && a.disk.filesystem == b.disk.filesystem &&
-               a.disk.isWhole == b.disk.isWhole && a.languages == b.languages &&
-               a.fetchesArchives == b.fetchesArchives;
+               a.disk.isWhole == b.disk.isWhole && a.identity == b.identity &&
+               a.languages == b.languages && a.fetchesArchives == b.fetchesArchives;
     }
 };
 
-/// What has to be asked for a job.
+/// What has to be asked for a job, on the disk that has its name now.
 [[nodiscard]] HelperRequest requestFor(const pellar::PrivilegedJob& job,
                                        const std::string& languages);
 
 /// The command line of the helper: what is done comes first, because the system's policy tells the
-/// actions apart by it (pkexec(1), org.freedesktop.policykit.exec.argv1).
+/// actions apart by it (pkexec(1), org.freedesktop.policykit.exec.argv1); then the disk, which an
+/// administrator is shown.
 [[nodiscard]] std::vector<std::string> argumentsOf(const HelperRequest& request);
 
 /// What the arguments ask for, or why they are refused. They come from a program that may be

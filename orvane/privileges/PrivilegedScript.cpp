@@ -26,7 +26,8 @@ PrivilegedScript::PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob jo
       texts_(texts),
       stop_(stop),
       road_(road),
-      log_(job_.disk, texts, road)
+      log_(job_.disk, texts, road),
+      guard_(texts)
 {
 }
 
@@ -90,27 +91,50 @@ void PrivilegedScript::take(std::string_view lines)
     }
 }
 
-// Nothing is told after the end, whatever comes. What was found in a device on an image is true of
-// nothing when the image was cut off or replaced in the meantime, which the device does not show.
+// Nothing is told after the end, whatever comes. A result on an image waits for the end, when the
+// image is looked at.
 void PrivilegedScript::take(pellar::Event event)
 {
     if (hasFinished_)
         return;
     asked();
     hasStarted_ = true;
-    const auto* const end = std::get_if<pellar::Finished>(&event);
-    hasFinished_ = end != nullptr;
-    const bool isStopped = end != nullptr && end->mainError == fixwell::kPLErrorCancelled;
-    if (end == nullptr || isStopped || !job_.image)
-        road_.add(std::move(event));
-    else if (!job_.image->isStillWhole())
-        finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
-               "the disk became shorter or unreadable meanwhile");
-    else if (!job_.image->isStillInPlace())
-        finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
-               "the disk was deleted, moved or replaced meanwhile");
+    if (auto* const end = std::get_if<pellar::Finished>(&event))
+        takeEnd(std::move(*end));
+    else if (!held_.empty() || (job_.image && isResult(event)))
+        held_.push_back(std::move(event));
     else
         road_.add(std::move(event));
+}
+
+// What was found in a device on an image is true of nothing when the image was cut off or replaced
+// in the meantime, which the device does not show.
+void PrivilegedScript::takeEnd(pellar::Finished end)
+{
+    hasFinished_ = true;
+    const bool isAnswer = job_.image && end.mainError != fixwell::kPLErrorCancelled;
+    if (isAnswer && !job_.image->isStillWhole())
+        return finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+                      "the disk became shorter or unreadable meanwhile");
+    if (isAnswer && !job_.image->isStillInPlace())
+        return finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+                      "the disk was deleted, moved or replaced meanwhile");
+    for (pellar::Event& event : held_)
+        road_.add(std::move(event));
+    road_.add(std::move(end));
+}
+
+/// A line by which the module knows that the disk is in order, or that it is not.
+bool PrivilegedScript::isResult(const pellar::Event& event) const
+{
+    const auto* const message = std::get_if<pellar::Message>(&event);
+    if (message == nullptr)
+        return false;
+    if (message->dictionary)
+        return message->dictionary.string(fixwell::kFsckMessageType) ==
+               fixwell::kFsckSuccess.text();
+    const auto meaning = guard_.meaningOf(message->text);
+    return meaning == fixwell::LinePhrase::Success || meaning == fixwell::LinePhrase::Failure;
 }
 
 void PrivilegedScript::passStopOn(HelperProcess& helper)

@@ -5,6 +5,7 @@
 #include "orvane/privileges/UndoneJob.h"
 #include "pellar/Texts.h"
 #include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/LineGuard.h"
 #include "pellar/jobs/Script.h"
 
 #include <functional>
@@ -43,6 +44,8 @@ private:
     void follow(HelperProcess& helper);
     void take(std::string_view lines);
     void take(pellar::Event event);
+    void takeEnd(pellar::Finished end);
+    bool isResult(const pellar::Event& event) const;
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);
     void asked();
@@ -55,6 +58,8 @@ private:
     pellar::StopSwitch& stop_;
     pellar::EventRoad& road_;
     pellar::JobLog log_;
+    const pellar::LineGuard guard_;
+    std::vector<pellar::Event> held_;  ///< the result, and what follows it
     std::string unfinishedLine_;
     unsigned pressesTold_ = 0;
     bool isAsking_ = false;

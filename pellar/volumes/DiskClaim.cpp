@@ -46,6 +46,9 @@ bool isHeldByKernel(const fixwell::DiskReference& disk)
 ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status,
                    const SystemPaths& paths)
 {
+    // A file that took a device's name is no disk that was meant.
+    if (S_ISREG(status.st_mode) && disk.storage == fixwell::DiskReference::Storage::BlockDevice)
+        return fixwell::kPLErrorCannotOpen;
     if (S_ISREG(status.st_mode))
         return loopDeviceOn(status.st_dev, status.st_ino, paths).empty()
                    ? fixwell::kPLNoError

@@ -7,6 +7,8 @@
 
 #include <gtest/gtest.h>
 
+#include <sys/sysmacros.h>
+
 namespace orvane {
 namespace {
 
@@ -29,6 +31,7 @@ HelperRequest request(Subject subject, Operation operation)
     made.disk.filesystem = "ext4";
     made.disk.isWhole = subject == Subject::PartitionMap;
     made.languages = "de_DE:en";
+    made.identity = {makedev(8, 17), 5, "6bd0-A1"};
     return made;
 }
 
@@ -45,6 +48,7 @@ TEST(HelperRequest, ArrivesAsItWasMade)
         onImage.disk.offset = 1U << 20U;
         onImage.disk.length = std::uint64_t(1) << 40U;
         onImage.image = 17;
+        onImage.identity = {};
         requests.push_back(onImage);
     }
     for (const HelperRequest& made : requests) {
@@ -57,16 +61,36 @@ TEST(HelperRequest, ArrivesAsItWasMade)
 // A wish for a language must not keep anybody from checking a disk.
 TEST(HelperRequest, TheLanguagesOfAnyUserAreTaken)
 {
-    for (const auto& [wanted, taken] :
-         {std::pair<std::string, std::string>{"lb:de", "lb:de"}, {"de/../x:%n:fr", "fr"},
-          {std::string(100, 'a') + ":de", "de"}, {"::de::", "de"}}) {
+    for (const auto& [wanted, taken] : {std::pair<std::string, std::string>{"lb:de", "lb:de"},
+                                        {"de/../x:%n:fr", "fr"},
+                                        {std::string(100, 'a') + ":de", "de"},
+                                        {"::de::", "de"}}) {
         pellar::PrivilegedJob job{};
         job.disk = request(Subject::Filesystem, Operation::Verify).disk;
-        const auto read =
-            readHelperArguments(argumentsOf(requestFor(job, wanted)), isKnownDevice);
+        const auto read = readHelperArguments(argumentsOf(requestFor(job, wanted)), isKnownDevice);
         ASSERT_TRUE(std::holds_alternative<HelperRequest>(read)) << wanted;
         EXPECT_EQ(std::get<HelperRequest>(read).languages, taken);
     }
+}
+
+TEST(DiskIdentity, AnotherDiskUnderTheSameNameIsNoticed)
+{
+    const DiskIdentity asked{makedev(8, 17), 5, "6bd0"};
+    struct Case {
+        DiskIdentity now;
+        bool isStill;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{asked, true, "the same"},
+             Case{{makedev(8, 18), 5, "6bd0"}, false, "another device"},
+             Case{{makedev(8, 17), 6, "6bd0"}, false, "taken out and put in, perhaps a copy"},
+             Case{{makedev(8, 17), 5, "6bd1"}, false, "another file system"},
+             Case{{makedev(8, 17), 0, "6bd0"}, true, "the kernel does not number disks"},
+             Case{{makedev(8, 17), 5, ""}, true, "the superblock is what is to be repaired"},
+         })
+        EXPECT_EQ(asked.isStill(c.now), c.isStill) << c.because;
+    EXPECT_FALSE(DiskIdentity().isStill({})) << "no disk at all";
 }
 
 /// What is changed in arguments that are taken, so that they are not.
@@ -87,7 +111,8 @@ void expectRefused(std::vector<std::string> arguments, const Case& c,
 // Whoever may start the helper may give it any arguments.
 TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
 {
-    const std::vector<std::string> good{"repair", "/dev/sdb1", "id", "name", "ext4", "de"};
+    const std::vector<std::string> good{"repair", "/dev/sdb1", "8:17:5:6bd0", "id",
+                                        "name",   "ext4",      "de"};
     ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
     for (const Case& c : {
              Case{0, "erase", "no such operation"},
@@ -101,15 +126,19 @@ TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
              Case{1, "/dev/null", "no disk"},
              Case{1, "/dev/", "a directory"},
              Case{1, "", "nothing"},
-             Case{3, std::string(2000, 'x'), "too long to be a name"},
-             Case{4, "ext4;reboot", "no name of a file system"},
-             Case{4, std::string(100, 'x'), "too long"},
-             Case{5, "../../../tmp/x", "no language, but a way to somebody's texts"},
+             Case{2, "", "not said which disk"},
+             Case{2, "8:17:5", "half of it"},
+             Case{2, "8:-17:5:", "no number"},
+             Case{2, "8:17:5:x\n", "no UUID"},
+             Case{4, std::string(2000, 'x'), "too long to be a name"},
+             Case{5, "ext4;reboot", "no name of a file system"},
+             Case{5, std::string(100, 'x'), "too long"},
+             Case{6, "../../../tmp/x", "no language, but a way to somebody's texts"},
          })
         expectRefused(good, c, [](const std::filesystem::path& path) {
             return path != "/dev/null" && path != "/dev/";
         });
-    for (const std::size_t count : {0U, 1U, 5U, 7U}) {
+    for (const std::size_t count : {0U, 1U, 2U, 6U, 8U}) {
         std::vector<std::string> arguments = good;
         arguments.resize(count, "x");
         EXPECT_TRUE(
@@ -120,22 +149,23 @@ TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
 
 TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
 {
-    const std::vector<std::string> good{"attach", "verify", "7",    "512", "1024",
-                                        "id",     "name",   "vfat", "de"};
+    const std::vector<std::string> good{"attach-verify", "7",    "512", "1024", "id",
+                                        "name",          "vfat", "de"};
     ASSERT_TRUE(std::holds_alternative<HelperRequest>(readHelperArguments(good, isKnownDevice)));
     for (const Case& c : {
-             Case{1, "verify-map", "a part has no map"},
-             Case{1, "repair-permissions", "nor is it mounted"},
-             Case{1, "attach", "no operation"},
-             Case{2, "/etc/shadow", "a path is never opened"},
-             Case{2, "-1", "no descriptor"},
-             Case{2, "7x", "no number"},
-             Case{2, "4294967303", "7, when it is cut to 32 bits"},
-             Case{3, " 512", "no number"},
-             Case{3, "18446744073709551615", "its end is beyond all numbers"},
-             Case{4, "9223372036854775807", "and so is this"},
-             Case{4, "0", "to the end, whatever that is"},
-             Case{7, "vfat -o x", "no name of a file system"},
+             Case{0, "attach-verify-map", "a part has no map"},
+             Case{0, "attach-repair-permissions", "nor is it mounted"},
+             Case{0, "attach-", "no operation"},
+             Case{0, "attach", "an authorisation to look is kept, and does not cover repairs"},
+             Case{1, "/etc/shadow", "a path is never opened"},
+             Case{1, "-1", "no descriptor"},
+             Case{1, "7x", "no number"},
+             Case{1, "4294967303", "7, when it is cut to 32 bits"},
+             Case{2, " 512", "no number"},
+             Case{2, "18446744073709551615", "its end is beyond all numbers"},
+             Case{3, "9223372036854775807", "and so is this"},
+             Case{3, "0", "to the end, whatever that is"},
+             Case{6, "vfat -o x", "no name of a file system"},
          })
         expectRefused(good, c, isKnownDevice);
 }

@@ -5,17 +5,21 @@
 #include "orvane/privileges/AttachedRegion.h"
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/ProgramStart.h"
+#include "pellar/process/Command.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
 
 #include <fcntl.h>
 #include <sys/prctl.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <csignal>
+#include <fstream>
 
 namespace orvane {
 namespace {
@@ -151,6 +155,55 @@ TEST(ProgramStart, TheEndOfAChildIsLearntWhateverWasIgnored)
         setInheritanceRight();
         return inChild([] { return true; });
     }));
+}
+
+TEST(ProgramStart, AFileSizeLimitMakesWritingFailAndNothingElse)
+{
+    const pellar::test::Workshop workshop;
+    EXPECT_TRUE(inChild([&workshop] {
+        const rlimit limit{4096, 4096};
+        ::setrlimit(RLIMIT_FSIZE, &limit);
+        setInheritanceRight();
+        const std::string bytes(8192, 'x');
+        const FileDescriptor file(
+            ::open(workshop.path("file").c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0600));
+        return ::write(file.get(), bytes.data(), bytes.size()) == 4096 &&
+               ::write(file.get(), bytes.data(), bytes.size()) < 0 && errno == EFBIG;
+    }));
+}
+
+TEST(TrustedWay, RootRunsNoToolThatOthersCouldChange)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "only root can give files away";
+    const pellar::test::Workshop workshop;
+    const auto directory = workshop.path("tools/more");
+    const auto program = directory / "e2fsck";
+    struct Case {
+        std::filesystem::path changed;
+        uid_t owner;
+        mode_t mode;
+        bool isFound;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{program, 0, 0755, true, "root's"},
+             Case{program, somebody, 0755, false, "another user's"},
+             Case{program, 0, 0757, false, "written by anybody"},
+             Case{directory, somebody, 0755, false, "its owner can exchange it"},
+             Case{directory.parent_path(), somebody, 0755, false, "and so can the owner of this"},
+             Case{directory.parent_path(), 0, 0777, false, "and anybody"},
+             Case{directory.parent_path(), 0, 01777, true, "not what is another's, as in /tmp"},
+         }) {
+        std::filesystem::remove_all(workshop.path("tools"));
+        std::filesystem::create_directories(directory);
+        std::ofstream(program) << "#!/bin/sh\n";
+        ASSERT_EQ(::chmod(program.c_str(), 0755), 0);
+        ASSERT_EQ(::chmod(c.changed.c_str(), c.mode), 0);
+        ASSERT_EQ(::chown(c.changed.c_str(), c.owner, 0), 0);
+        EXPECT_EQ(!pellar::findProgram("e2fsck", directory.native()).empty(), c.isFound)
+            << c.because;
+    }
 }
 
 TEST(MountedSystem, NobodyElseCanChangeTheWay)

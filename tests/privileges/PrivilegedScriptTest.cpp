@@ -5,6 +5,7 @@
 #include "pellar/ErrorCodes.h"
 #include "pellar/jobs/Job.h"
 #include "tests/pellar/Workshop.h"
+#include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
 
@@ -141,20 +142,68 @@ TEST_F(PrivilegedScriptTest, AnImageIsHandedOverAsAnOpenFile)
     workshop_.write("image", std::string(16384, 'x'));
     // What the helper's parent has open under the number is the image.
     const std::string script =
-        "printf '[\"started\"]\\n'\nfile=$(readlink /proc/$PPID/fd/$3)\n"
-        "printf '[\"finished\",0,0,{\"dictionary\":[[\"kPLMessage\",\"%s %s %s %s %s\"]]}]\\n' "
-        "$1 $2 \"$file\" $4 $5\n";
+        "printf '[\"started\"]\\n'\nfile=$(readlink /proc/$PPID/fd/$2)\n"
+        "printf '[\"finished\",0,0,{\"dictionary\":[[\"kPLMessage\",\"%s %s %s %s\"]]}]\\n' "
+        "$1 \"$file\" $3 $4\n";
     launch(script, jobOnImage(image));
     ASSERT_TRUE(finishes());
-    EXPECT_EQ(listener_.message, "attach verify " + image.native() + " 4096 8192");
+    EXPECT_EQ(listener_.message, "attach-verify " + image.native() + " 4096 8192");
     job_.reset();
+}
 
-    listener_ = {};
-    launch(script, jobOnImage(image));
-    std::filesystem::remove(image);
-    ASSERT_TRUE(finishes());
-    EXPECT_EQ(listener_.error, fixwell::kPLErrorDiskChanged)
-        << "a device on it does not show that it was deleted";
+// A device on it does not show that it was deleted.
+TEST_F(PrivilegedScriptTest, AnImageThatWasDeletedGetsNoResult)
+{
+    const std::string script =
+        "printf '[\"started\"]\\n[\"message\",\"Pass 1\\\\n\",null]\\n'\n"
+        "printf '[\"message\",\"The volume “Stick” appears to be OK.\\\\n\",null]\\n'\n"
+        "printf '[\"trace\",\"result\"]\\n'\nwhile ! [ -e '" +
+        workshop_.path("end").native() +
+        "' ]; do sleep 0.02; done\nprintf '[\"finished\",0,0,null]\\n'";
+    for (const bool isDeleted : {false, true}) {
+        listener_ = {};
+        const auto image = workshop_.path("image");
+        workshop_.write("image", std::string(16384, 'x'));
+        launch(script, jobOnImage(image));
+        ASSERT_TRUE(loop_.runUntil([this] { return listener_.hasPlainLine("Pass 1"); }));
+        if (isDeleted)
+            std::filesystem::remove(image);
+        workshop_.write("end", "");
+        ASSERT_TRUE(finishes());
+        EXPECT_EQ(listener_.error, isDeleted ? fixwell::kPLErrorDiskChanged : 0);
+        EXPECT_EQ(listener_.hasPlainLine("appears to be OK."), !isDeleted);
+        job_.reset();
+        std::filesystem::remove(workshop_.path("end"));
+    }
+}
+
+// Between the question for a password and the answer there is time.
+TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
+{
+    if (const char* const obstacle = test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    test::LoopDevice device(workshop_.makeExt("disk", 4U << 20U));
+    if (device.name().empty())
+        GTEST_SKIP() << "the system gives no loop device";
+    const std::string other = workshop_.makeExt("other", 4U << 20U);
+    struct Case {
+        std::string meanwhile;
+        fixwell::ErrorCode error;
+        std::string_view verdict;
+    };
+    for (const Case& c :
+         {Case{"ulimit -S -n 16", 0, "sound"},
+          Case{"losetup -d " + device.name() + "\nlosetup " + device.name() + " '" + other + "'",
+               fixwell::kPLErrorDiskChanged, "failed"}}) {
+        listener_ = {};
+        launch(c.meanwhile + "\nexec " PELLAR_HELPER " \"$@\"",
+               {pellar::Subject::Filesystem, pellar::Operation::Verify,
+                *pellar::test::reference(device.name(), "ext4", "Stick"), nullptr, false});
+        ASSERT_TRUE(finishes());
+        EXPECT_EQ(listener_.error, c.error) << listener_.message;
+        EXPECT_EQ(listener_.verdict, c.verdict) << listener_.message;
+        job_.reset();
+    }
 }
 
 }  // namespace
