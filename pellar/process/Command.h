@@ -12,6 +12,8 @@ namespace pellar {
 struct Command {
     std::filesystem::path executable;  ///< absolute
     std::vector<std::string> arguments;
+    /// It reads what strangers wrote and needs no rights for it: see reduceRights.
+    bool isReduced = false;
 };
 
 /// One line for a log: the words, separated by blanks, fit to be shown.
