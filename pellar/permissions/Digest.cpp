@@ -46,9 +46,9 @@ struct Digester::State {
 };
 
 Digester::Digester(DigestKind kind)
-    : state_(std::make_unique<State>(
-          State{hashOf(kind), std::vector<std::max_align_t>(
-                                  hashOf(kind).context_size / sizeof(std::max_align_t) + 1)}))
+    : state_(std::make_unique<State>(State{
+          hashOf(kind),
+          std::vector<std::max_align_t>(hashOf(kind).context_size / sizeof(std::max_align_t) + 1)}))
 {
     state_->hash.init(state_->context.data());
 }

@@ -33,8 +33,8 @@ Answer askRPM(const RootDirectory& root, const Accounts& accounts, const Referen
 
 // The running system's own package lists are root's, and so are its archives. What another system
 // says of its own goes nowhere but into the answer.
-Answer askDpkg(const RootDirectory& root, const Accounts& accounts,
-               const ReferenceSources& sources, StopSwitch& stop, const ReadingProgress& progress)
+Answer askDpkg(const RootDirectory& root, const Accounts& accounts, const ReferenceSources& sources,
+               StopSwitch& stop, const ReadingProgress& progress)
 {
     const bool isRunning = sources.root == "/";
     std::optional<ReferenceStore> store;
@@ -43,7 +43,9 @@ Answer askDpkg(const RootDirectory& root, const Accounts& accounts,
     if (isRunning)
         own.kept = &store.emplace(sources.store);
     if (isRunning && sources.fetchesArchives)
-        own.fetch = [&archives](const auto& packages) { return archives.fetch(packages); };
+        own.fetch = [&archives](const auto& packages) {
+            return archives.fetch(packages);
+        };
     return readApart({root, own, progress}, stop,
                      [&accounts](const auto& files, const auto& from, const auto& told) {
                          return readDpkgReferences(files, accounts, from, told);

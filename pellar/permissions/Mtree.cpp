@@ -29,9 +29,10 @@ std::string unescaped(std::string_view word)
     std::string text;
     while (!word.empty()) {
         const bool isEscape = word.front() == '\\' && isOctal(word.substr(1));
-        text += isEscape ? static_cast<char>((word[1] - '0') * 64 + (word[2] - '0') * 8 +
-                                             (word[3] - '0'))
-                         : word.front();
+        text +=
+            isEscape
+                ? static_cast<char>((word[1] - '0') * 64 + (word[2] - '0') * 8 + (word[3] - '0'))
+                : word.front();
         word.remove_prefix(isEscape ? 4 : 1);
     }
     return text;

@@ -43,7 +43,7 @@ struct References {
     std::vector<Reference> files;  ///< by path, a directory before what it holds
     std::uint64_t packages = 0;
     std::uint64_t packagesWithoutSource = 0;
-    std::uint64_t packagesBeyondBounds = 0;  ///< of those: larger than a package may be
+    std::uint64_t packagesBeyondBounds = 0;       ///< of those: larger than a package may be
     std::vector<std::string> filesWithoutSource;  ///< installed, but nobody says how
 };
 

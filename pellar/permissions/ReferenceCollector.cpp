@@ -24,7 +24,8 @@ bool lendsRights(const Reference& reference)
 {
     const bool mayBeRegular = !reference.kind || *reference.kind == FileKind::Regular;
     const bool hasBits = (reference.mode & (S_ISUID | S_ISGID)) != 0;
-    return mayBeRegular && (hasBits || (reference.capabilities && !reference.capabilities->empty()));
+    return mayBeRegular &&
+           (hasBits || (reference.capabilities && !reference.capabilities->empty()));
 }
 
 bool ReferenceCollector::isFull() const

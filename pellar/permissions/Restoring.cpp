@@ -82,7 +82,8 @@ std::optional<Restoring> objectionToLending(const Reference& reference, const Fo
     int error = setOwner(reference, object);
     constexpr mode_t harmless = 0755;
     if (error == 0)
-        error = ::chmod(pathOfDescriptor(object).c_str(), reference.mode & harmless) == 0 ? 0 : errno;
+        error =
+            ::chmod(pathOfDescriptor(object).c_str(), reference.mode & harmless) == 0 ? 0 : errno;
     if (error != 0)
         return NotPermitted{error};
     if (isOpenForWriting(object))
@@ -103,8 +104,7 @@ Restoring restore(const RootDirectory& root, const Reference& reference, const F
         seen.permissions.kind == FileKind::Regular && seen.status.st_nlink > 1;
     if (hasFurtherNames && !isClosedToOthers(root, reference.path))
         return SuspiciousLink{};
-    const bool lends =
-        seen.permissions.kind == FileKind::Regular && lendsRights(reference);
+    const bool lends = seen.permissions.kind == FileKind::Regular && lendsRights(reference);
     if (const auto objection = lends ? objectionToLending(reference, seen) : std::nullopt)
         return *objection;
     struct stat status = {};

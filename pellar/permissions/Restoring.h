@@ -24,7 +24,7 @@ struct NotPermitted {
     int error;  ///< errno
 };
 
-using Restoring = 
+using Restoring =
     std::variant<Restored, ChangedMeanwhile, SuspiciousLink, ForeignContents, NotPermitted>;
 
 /// Gives the file what its reference says: the owner first, because chown(2) clears setuid and

@@ -33,9 +33,9 @@ private:
 
     void addTree(const std::string& path);
 
-    std::set<std::string> paths_;         ///< "/usr/bin/x", without the first "/"
-    std::set<std::string> commandPaths_;  ///< those in a line that sets permissions
-    std::set<std::string> words_;         ///< names, for loops over them
+    std::set<std::string> paths_;              ///< "/usr/bin/x", without the first "/"
+    std::set<std::string> commandPaths_;       ///< those in a line that sets permissions
+    std::set<std::string> words_;              ///< names, for loops over them
     std::unordered_set<std::string> endings_;  ///< "x/y" of "$directory/x/y"
     std::unordered_set<std::string> trees_;    ///< with all that they hold
 };

@@ -32,7 +32,8 @@ std::vector<Sentence> sentencesOf(const Tally& tally)
         "%1$@ package was not compared: it is larger than any package may be.",
         "%1$@ packages were not compared: they are larger than any package may be.");
     add(tally.foreign,
-        "%1$@ file may not lend the rights of others: its content is not known to be its package's.",
+        "%1$@ file may not lend the rights of others: its content is not known to be its "
+        "package's.",
         "%1$@ files may not lend the rights of others: their content is not known to be their "
         "packages'.");
     add(tally.undecided,

@@ -20,8 +20,7 @@ namespace fs = std::filesystem;
 
 FileDescriptor openDirectory(const fs::path& path)
 {
-    return FileDescriptor(
-        ::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+    return FileDescriptor(::open(path.c_str(), O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
 }
 
 // Who made it holds a lock on it for as long as it lives. One that is being made has none yet.
@@ -30,8 +29,8 @@ bool isLeftBehind(const fs::path& path)
     constexpr std::time_t secondsToLock = 60;
     const FileDescriptor directory = openDirectory(path);
     struct stat status = {};
-    return directory && ::fstat(directory.get(), &status) == 0 &&
-           status.st_uid == ::geteuid() && std::time(nullptr) - status.st_ctime > secondsToLock &&
+    return directory && ::fstat(directory.get(), &status) == 0 && status.st_uid == ::geteuid() &&
+           std::time(nullptr) - status.st_ctime > secondsToLock &&
            ::flock(directory.get(), LOCK_EX | LOCK_NB) == 0;
 }
 

@@ -40,7 +40,7 @@ private:
 
 /// How much a file may be for it to be copied.
 struct CopyBounds {
-    std::uint64_t mostBytes = 0;         ///< written
+    std::uint64_t mostBytes = 0;          ///< written
     std::uint64_t mostApparentBytes = 0;  ///< holes included
 };
 

@@ -37,8 +37,7 @@ bool reduceRights(const ReducedLimits& limits) noexcept
     return limit(RLIMIT_AS, limits.addressSpace) && limit(RLIMIT_CPU, limits.processorTime) &&
            limit(RLIMIT_FSIZE, limits.fileBytes) && limit(RLIMIT_NOFILE, limits.descriptors) &&
            limit(RLIMIT_CORE, 0) && becomeNobody() && ::prctl(PR_SET_DUMPABLE, 0) == 0 &&
-           ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 &&
-           ::prctl(PR_SET_PDEATHSIG, SIGKILL) == 0;
+           ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 && ::prctl(PR_SET_PDEATHSIG, SIGKILL) == 0;
 }
 
 }  // namespace pellar

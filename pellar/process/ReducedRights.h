@@ -11,9 +11,9 @@ inline constexpr gid_t groupOfReduced = 65534;
 
 /// What a process may use that reads what strangers wrote.
 struct ReducedLimits {
-    unsigned long addressSpace = 4UL << 30U;    ///< bytes
-    unsigned long processorTime = 60UL * 60;    ///< seconds
-    unsigned long fileBytes = 512UL << 20U;     ///< of each file that it writes
+    unsigned long addressSpace = 4UL << 30U;  ///< bytes
+    unsigned long processorTime = 60UL * 60;  ///< seconds
+    unsigned long fileBytes = 512UL << 20U;   ///< of each file that it writes
     unsigned long descriptors = 256;
 };
 

@@ -41,8 +41,8 @@ public:
           accounts_(accounts),
           sources_(sources),
           diversions_(text("var/lib/dpkg/diversions"), root.aliases()),
-          overrides_(parseStatOverrides(text("var/lib/dpkg/statoverride"), accounts,
-                                        root.aliases())),
+          overrides_(
+              parseStatOverrides(text("var/lib/dpkg/statoverride"), accounts, root.aliases())),
           temporaryFiles_(temporaryFileRulesOf(root))
     {
         for (const std::string& name : root.names(infoDirectory))

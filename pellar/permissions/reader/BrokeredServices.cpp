@@ -11,8 +11,7 @@
 
 namespace pellar {
 
-ReaderMessage BrokeredServices::ask(Question question, std::string_view bytes,
-                                    int descriptor) const
+ReaderMessage BrokeredServices::ask(Question question, std::string_view bytes, int descriptor) const
 {
     const std::string packet = static_cast<char>(question) + std::string(bytes);
     std::optional<ReaderMessage> answer;

@@ -31,24 +31,28 @@ using Answer = std::variant<References, Sentence>;
 constexpr std::size_t largestResult = 512U << 20U;
 constexpr int socketOfReader = 0;
 
-const Sentence readerFailed{"the package database could not be read: reading it needs more than any "
-                            "system's does, or it is damaged",
-                            {},
-                            {}};
-const Sentence readerRefused{"the package database cannot be read with reduced rights here", {}, {}};
+const Sentence readerFailed{
+    "the package database could not be read: reading it needs more than any "
+    "system's does, or it is damaged",
+    {},
+    {}};
+const Sentence readerRefused{
+    "the package database cannot be read with reduced rights here", {}, {}};
 
 // The child of a process with threads. Locks that another thread held at the fork stay held: the
-// reading takes memory (fork(2) of glibc sees to that), its two ends of the socket, and nothing else
-// that is shared.
+// reading takes memory (fork(2) of glibc sees to that), its two ends of the socket, and nothing
+// else that is shared.
 void readAndAnswer(const PathAliases& aliases, const DpkgSources& has, const Reading& reading)
 {
     BrokeredServices services(socketOfReader, aliases);
     DpkgSources sources;
     sources.kept = has.kept != nullptr ? &services : nullptr;
     if (has.fetch)
-        sources.fetch = [&services](auto packages) { return services.fetch(packages); };
-    const auto references = reading(services, sources,
-                                    [&services](double percent) { return services.progress(percent); });
+        sources.fetch = [&services](auto packages) {
+            return services.fetch(packages);
+        };
+    const auto references = reading(
+        services, sources, [&services](double percent) { return services.progress(percent); });
     const auto send = [](Question question, const std::vector<int>& descriptors) {
         const char kind = static_cast<char>(question);
         sendMessage(socketOfReader, {&kind, 1}, descriptors);
@@ -131,7 +135,8 @@ public:
     /// None for as long as it goes on.
     std::optional<Answer> serve(ReaderMessage message)
     {
-        const std::string bytes = message.bytes.substr(std::min<std::size_t>(1, message.bytes.size()));
+        const std::string bytes =
+            message.bytes.substr(std::min<std::size_t>(1, message.bytes.size()));
         const bool isText = bytes.find('\0') == std::string::npos;
         const auto question = static_cast<Question>(message.bytes.empty() ? -1 : message.bytes[0]);
         switch (question) {

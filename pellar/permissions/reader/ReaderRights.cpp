@@ -12,21 +12,43 @@
 namespace pellar {
 namespace {
 
-// What the reading of the largest system needs, beside the host's own pages that a fork takes along.
+// What the reading of the largest system needs, beside the host's own pages that a fork takes
+// along.
 constexpr unsigned long mostMemory = 2UL << 30U;
 
-constexpr int allowedCalls[] = {
-    SCMP_SYS(read),         SCMP_SYS(pread64),       SCMP_SYS(readv),
-    SCMP_SYS(write),        SCMP_SYS(lseek),         SCMP_SYS(_llseek),
-    SCMP_SYS(close),        SCMP_SYS(fstat),         SCMP_SYS(fstat64),
-    SCMP_SYS(sendmsg),      SCMP_SYS(recvmsg),       SCMP_SYS(memfd_create),
-    SCMP_SYS(brk),          SCMP_SYS(mmap),          SCMP_SYS(mmap2),
-    SCMP_SYS(munmap),       SCMP_SYS(mremap),        SCMP_SYS(mprotect),
-    SCMP_SYS(madvise),      SCMP_SYS(futex),         SCMP_SYS(futex_time64),
-    SCMP_SYS(rt_sigreturn), SCMP_SYS(rt_sigprocmask), SCMP_SYS(sigaltstack),
-    SCMP_SYS(getpid),       SCMP_SYS(getppid),       SCMP_SYS(getrandom),
-    SCMP_SYS(clock_gettime), SCMP_SYS(clock_gettime64), SCMP_SYS(gettimeofday),
-    SCMP_SYS(sched_yield),  SCMP_SYS(exit),          SCMP_SYS(exit_group)};
+constexpr int allowedCalls[] = {SCMP_SYS(read),
+                                SCMP_SYS(pread64),
+                                SCMP_SYS(readv),
+                                SCMP_SYS(write),
+                                SCMP_SYS(lseek),
+                                SCMP_SYS(_llseek),
+                                SCMP_SYS(close),
+                                SCMP_SYS(fstat),
+                                SCMP_SYS(fstat64),
+                                SCMP_SYS(sendmsg),
+                                SCMP_SYS(recvmsg),
+                                SCMP_SYS(memfd_create),
+                                SCMP_SYS(brk),
+                                SCMP_SYS(mmap),
+                                SCMP_SYS(mmap2),
+                                SCMP_SYS(munmap),
+                                SCMP_SYS(mremap),
+                                SCMP_SYS(mprotect),
+                                SCMP_SYS(madvise),
+                                SCMP_SYS(futex),
+                                SCMP_SYS(futex_time64),
+                                SCMP_SYS(rt_sigreturn),
+                                SCMP_SYS(rt_sigprocmask),
+                                SCMP_SYS(sigaltstack),
+                                SCMP_SYS(getpid),
+                                SCMP_SYS(getppid),
+                                SCMP_SYS(getrandom),
+                                SCMP_SYS(clock_gettime),
+                                SCMP_SYS(clock_gettime64),
+                                SCMP_SYS(gettimeofday),
+                                SCMP_SYS(sched_yield),
+                                SCMP_SYS(exit),
+                                SCMP_SYS(exit_group)};
 
 bool allow(scmp_filter_ctx filter)
 {

@@ -44,10 +44,9 @@ std::variant<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
         const FileDescriptor from = root.openFile(database + '/' + file);
         if (!from || !isCopied(file))
             continue;
-        const FileDescriptor to(::open((made->path() / file).c_str(),
-                                       O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
-        const Copying copying =
-            to ? copyFile(from.get(), to.get(), bounds, stop) : Copying::Failed;
+        const FileDescriptor to(
+            ::open((made->path() / file).c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+        const Copying copying = to ? copyFile(from.get(), to.get(), bounds, stop) : Copying::Failed;
         if (copying != Copying::Done)
             return sentenceFor(copying);
     }

@@ -101,15 +101,17 @@ TEST_F(PermissionJob, MissingArchivesAreFetchedAFewAtATimeAndWhatTheySayIsKept)
         fs::rename(system_->archiveOf(name), mirror / system_->archiveOf(name).filename());
     std::vector<std::size_t> asked;
     ReferenceStore store(system_->store());
-    const DpkgSources sources{&store, [&](std::span<const DpkgPackage> packages) {
-        asked.push_back(packages.size());
-        std::vector<FileDescriptor> archives;
-        for (const DpkgPackage& package : packages)
-            archives.emplace_back(package.name == "lost" ? -1
-                                                         : ::open((mirror / (package.fileName() + ".deb")).c_str(),
-                                                                  O_RDONLY | O_CLOEXEC));
-        return archives;
-    }};
+    const DpkgSources sources{
+        &store, [&](std::span<const DpkgPackage> packages) {
+            asked.push_back(packages.size());
+            std::vector<FileDescriptor> archives;
+            for (const DpkgPackage& package : packages)
+                archives.emplace_back(package.name == "lost"
+                                          ? -1
+                                          : ::open((mirror / (package.fileName() + ".deb")).c_str(),
+                                                   O_RDONLY | O_CLOEXEC));
+            return archives;
+        }};
     for (const std::vector<std::size_t>& expected : {std::vector<std::size_t>{3}, {1}}) {
         asked.clear();
         const References read = readAsOwn(sources);
@@ -445,9 +447,10 @@ TEST(RPMJob, TheDatabaseIsAskedWithCapabilities)
                                       work.path("one.spec")}),
         0);
     fs::create_directories(base.path("var/lib/rpm"));
-    std::vector<std::string> registering{"--dbpath", base.path("var/lib/rpm"), "-i", "--justdb",
-                                         "--nodeps",
-                                         work.path("top/RPMS/noarch/one-1-1.noarch.rpm")};
+    std::vector<std::string> registering{
+        "--dbpath", base.path("var/lib/rpm"),
+        "-i",       "--justdb",
+        "--nodeps", work.path("top/RPMS/noarch/one-1-1.noarch.rpm")};
     // Debian 12's rpm 4.18 installs only when it is forced to; Debian 13's knows no such option.
     if (test::runProgram("rpm", {"--force-debian", "--version"}) == 0)
         registering.emplace_back("--force-debian");

@@ -34,7 +34,9 @@ std::variant<References, Sentence> readIn(const fs::path& directory, const Readi
                                           StopSwitch& stop)
 {
     const auto root = RootDirectory::open(directory);
-    const ReadingProgress progress = [](double) { return true; };
+    const ReadingProgress progress = [](double) {
+        return true;
+    };
     return root ? readApart({*root, {}, progress}, stop, reading) : Sentence{"no root", {}, {}};
 }
 
@@ -57,7 +59,9 @@ TEST(ReaderProcess, ReachesNothingButTheFilesItIsGiven)
     const auto answer = readIn(
         workshop.path("root"),
         [host](const RootFiles& root, const auto&, const auto&) -> std::optional<References> {
-            const auto isOpen = [](int descriptor) { return descriptor >= 0 ? "open " : ""; };
+            const auto isOpen = [](int descriptor) {
+                return descriptor >= 0 ? "open " : "";
+            };
             std::string word = root.read("file", 100).value_or("nothing") + ' ';
             word += root.openFile("link") || root.openFile("../../etc/passwd") ? "outside " : "";
             word += std::to_string(root.names("").size()) + " names ";
@@ -83,8 +87,9 @@ TEST(ReaderProcess, EndsWithASentenceWhateverItDoes)
         std::string_view because;
     };
     for (const Case& c :
-         {Case{[](const auto&, const auto&, const auto&) -> std::optional<References> { ::abort(); },
-               "a crash"},
+         {Case{
+              [](const auto&, const auto&, const auto&) -> std::optional<References> { ::abort(); },
+              "a crash"},
           Case{[](const auto&, const auto&, const auto&) {
                    return std::optional(saying(std::string(1U << 20U, 'x')));
                },
@@ -129,8 +134,8 @@ TEST(ReaderProcess, IsStoppedInTheMiddleOfALoop)
 TEST(ReferenceBytes, AreReferencesOrNone)
 {
     References references;
-    references.files.push_back({"usr/bin/su", FileKind::Regular, 04755, 0, 8, "", Doubt::State,
-                                std::string(32, '0')});
+    references.files.push_back(
+        {"usr/bin/su", FileKind::Regular, 04755, 0, 8, "", Doubt::State, std::string(32, '0')});
     references.packages = 3;
     references.filesWithoutSource = {"a", "b"};
     const std::string bytes = bytesOf(references);
