@@ -30,7 +30,7 @@ bool isLeftBehind(const fs::path& path)
     const FileDescriptor directory = openDirectory(path);
     struct stat status = {};
     return directory && ::fstat(directory.get(), &status) == 0 && status.st_uid == ::geteuid() &&
-           std::time(nullptr) - status.st_ctime > secondsToLock &&
+           std::time(nullptr) - status.st_mtime > secondsToLock &&
            ::flock(directory.get(), LOCK_EX | LOCK_NB) == 0;
 }
 

@@ -37,7 +37,8 @@ public:
             return;
         }
         RPMFile file = isCut ? RPMFile() : parseRPMFile(line, accounts_, aliases_);
-        if (file.line == RPMLine::Malformed)
+        constexpr std::uint64_t mostMalformed = 1'000'000;
+        if (file.line == RPMLine::Malformed && malformed_ < mostMalformed)
             ++malformed_;
         if (file.line != RPMLine::File)
             return;

@@ -5,7 +5,6 @@
 #include "pellar/permissions/RootDirectory.h"
 #include "pellar/permissions/ScriptMentions.h"
 #include "pellar/permissions/TemporaryDirectory.h"
-#include "pellar/permissions/reader/ReaderMessages.h"
 #include "pellar/permissions/reader/ReaderProcess.h"
 #include "pellar/permissions/reader/ReferenceBytes.h"
 #include "pellar/permissions/rpm/DatabaseCopy.h"
@@ -13,7 +12,7 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
-#include <sys/socket.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -273,6 +272,20 @@ TEST(RPMDatabaseCopy, IsBoundedAndLeavesNothingBehind)
     stop.press();
     EXPECT_EQ(contents(copyOf(4096, stop)), "") << "stopped";
     EXPECT_TRUE(fs::is_empty(workshop.path("tmp")));
+    // Left by a process that was killed, just made by one, and held by one since long.
+    for (const char* const name : {"killed", "young", "held"}) {
+        const fs::path left = workshop.path(std::string("tmp/orvane-rpmdb.") + name);
+        fs::create_directories(left / "files/deep");
+        if (std::string_view(name) != "young")
+            fs::last_write_time(left, fs::file_time_type::clock::now() - std::chrono::hours(1));
+    }
+    const FileDescriptor lock(
+        ::open(workshop.path("tmp/orvane-rpmdb.held").c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    ASSERT_EQ(::flock(lock.get(), LOCK_EX | LOCK_NB), 0);
+    EXPECT_EQ(contents(copyOf(4096, stop)), "") << "stopped";
+    EXPECT_FALSE(fs::exists(workshop.path("tmp/orvane-rpmdb.killed")));
+    EXPECT_TRUE(fs::exists(workshop.path("tmp/orvane-rpmdb.young")));
+    EXPECT_TRUE(fs::exists(workshop.path("tmp/orvane-rpmdb.held")));
     ::setenv("TMPDIR", kept.c_str(), 1);
 }
 
