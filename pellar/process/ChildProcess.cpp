@@ -34,6 +34,7 @@ struct Preparation {
     Access access = Access::ReadOnly;
     bool ignoresStops = false;
     bool isReduced = false;
+    FileDescriptor writingRule;
 };
 
 /// Above the numbers that the child hands out, so no duplication overwrites another.
@@ -59,6 +60,8 @@ Preparation prepare(const Command& command, const ChildStreams& streams, int fai
     ready.access = streams.access;
     ready.ignoresStops = streams.ignoresStops;
     ready.isReduced = command.isReduced;
+    if (command.isReduced && !command.writable.empty())
+        ready.writingRule = ruleForWritingBelow(command.writable);
     return ready;
 }
 
@@ -106,7 +109,9 @@ bool place(const FileDescriptor& source, int number)
     // Ours are all closed on exec; this is for those of other libraries in the process.
     const unsigned first = progressDescriptorOfTool + (ready.progress ? 1U : 0U);
     ::syscall(SYS_close_range, first, ~0U, CLOSE_RANGE_CLOEXEC);
-    const bool hasItsRights = !ready.isReduced || reduceRights({});
+    const bool hasItsRights =
+        !ready.isReduced ||
+        (reduceRights({}) && (!ready.writingRule || obeyRule(ready.writingRule.get())));
     if (!isOrphan && isPlaced && hasItsRights && ::chdir("/") == 0)
         ::execve(ready.executable.c_str(), ready.arguments.data(),
                  const_cast<char* const*>(environment.data()));

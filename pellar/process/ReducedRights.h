@@ -1,7 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/process/FileDescriptor.h"
+
 #include <sys/types.h>
+
+#include <filesystem>
 
 namespace pellar {
 
@@ -21,5 +25,12 @@ struct ReducedLimits {
 /// starts has more (PR_SET_NO_NEW_PRIVS), it leaves no core, and is killed when the thread that
 /// forked it ends. NO when any of it fails. Safe after a fork (signal-safety(7)).
 [[nodiscard]] bool reduceRights(const ReducedLimits& limits) noexcept;
+
+/// A rule by which nothing can be written, made or removed but below this directory (Landlock);
+/// none where the kernel has no such rules. Made before the fork.
+[[nodiscard]] FileDescriptor ruleForWritingBelow(const std::filesystem::path& directory);
+
+/// After reduceRights. Safe after a fork.
+[[nodiscard]] bool obeyRule(int rule) noexcept;
 
 }  // namespace pellar

@@ -19,7 +19,8 @@ Command commandFor(const RPMQuery& query)
     return {query.program,
             {"--dbpath", query.database.native(), "--nosignature", "--nodigest", "-qa",
              "--queryformat", std::string(packageLine) + "%{NAME}\n" + std::string(rpmFileFormat)},
-            true};
+            true,
+            query.database};
 }
 
 /// Takes rpm's answer as it comes.

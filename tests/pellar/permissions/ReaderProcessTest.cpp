@@ -8,11 +8,14 @@
 #include "pellar/permissions/reader/ReaderProcess.h"
 #include "pellar/permissions/reader/ReferenceBytes.h"
 #include "pellar/permissions/rpm/DatabaseCopy.h"
+#include "pellar/process/ChildProcess.h"
+#include "pellar/process/ReducedRights.h"
 #include "tests/pellar/permissions/DebianSystem.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/file.h>
+#include <sys/socket.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -128,6 +131,29 @@ TEST(ReaderProcess, IsStoppedInTheMiddleOfALoop)
     EXPECT_TRUE(std::get<Sentence>(answer).isEmpty());
     EXPECT_LT(Clock::now() - begin, std::chrono::seconds(5));
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
+}
+
+TEST(ReducedProgram, IsNobodyAndWritesWhereItMay)
+{
+    if (::geteuid() != 0)
+        GTEST_SKIP() << "becoming another user needs root";
+    const test::Workshop workshop;
+    ::chmod(workshop.path("").c_str(), 0755);
+    for (const char* const name : {"own", "other"}) {
+        fs::create_directory(workshop.path(name));
+        ::chmod(workshop.path(name).c_str(), 0777);
+    }
+    const bool hasLandlock = bool(ruleForWritingBelow(workshop.path("own")));
+    const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
+    for (const char* const name : {"own/file", "other/file"}) {
+        auto started = ChildProcess::start(
+            {"/usr/bin/touch", {workshop.path(name)}, true, workshop.path("own")}, {sink.get()});
+        ASSERT_TRUE(std::holds_alternative<ChildProcess>(started));
+        static_cast<void>(std::get<ChildProcess>(started).reap());
+    }
+    ASSERT_TRUE(fs::exists(workshop.path("own/file")));
+    EXPECT_EQ(test::rightsOf(workshop.path("own/file")).user, userOfReduced);
+    EXPECT_NE(fs::exists(workshop.path("other/file")), hasLandlock);
 }
 
 TEST(ReferenceBytes, AreReferencesOrNone)
