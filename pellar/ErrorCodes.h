@@ -10,6 +10,13 @@ namespace pellar {
 /// Verified: damaged, and this kind of volume is not repaired here.
 inline constexpr fixwell::ErrorCode kPLErrorDamagedForGood = -69712;
 
+/// A repair of what is not repaired here, though it can be verified.
+inline constexpr fixwell::ErrorCode kPLErrorNoRepairHere = -69740;
+/// The medium, not the file system: places of the disk cannot be read.
+inline constexpr fixwell::ErrorCode kPLErrorUnreadable = -69741;
+/// The end of the volume is not on the disk.
+inline constexpr fixwell::ErrorCode kPLErrorCutShort = -69742;
+
 inline constexpr fixwell::ErrorCode kPLErrorNoPartitionMap = -69720;
 inline constexpr fixwell::ErrorCode kPLErrorMapDamaged = -69721;      ///< a repair can restore it
 inline constexpr fixwell::ErrorCode kPLErrorMapNeedsPerson = -69722;  ///< and none can

@@ -30,6 +30,13 @@ constexpr std::array texts{
     ErrorText{kPLErrorDamagedForGood,
               "The volume is damaged, and this kind of volume is not repaired here; copy what "
               "matters to another disk."},
+    ErrorText{kPLErrorNoRepairHere,
+              "This kind of volume is not repaired here; copy what matters to another disk."},
+    ErrorText{kPLErrorUnreadable,
+              "The disk cannot be read in places; copy it to another disk first (ddrescue)."},
+    ErrorText{kPLErrorCutShort,
+              "The end of the volume is missing, and no repair brings it back; copy what matters "
+              "to another disk."},
     ErrorText{fixwell::kPLErrorNotRepaired, "The volume is still damaged after the repair."},
     ErrorText{fixwell::kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},
@@ -50,13 +57,14 @@ constexpr std::array texts{
     ErrorText{fixwell::kPLErrorReadOnly, "The disk cannot be written, so it cannot be repaired."},
     ErrorText{fixwell::kPLErrorBusy, "Another operation is still running."},
     ErrorText{kPLErrorNoPartitionMap, "There is no partition map on the disk."},
-    ErrorText{kPLErrorMapDamaged, "The partition map is damaged; use Repair Disk."},
+    ErrorText{kPLErrorMapDamaged, "The partition map is damaged, and a repair can restore it."},
     ErrorText{kPLErrorMapNeedsPerson,
               "The partition map is damaged in a way that only a person can put right."},
     ErrorText{kPLErrorMapNotRepaired, "The partition map is damaged and was not repaired."},
 };
 
-// Codes are given out in two headers. A number that stood in both would give one error the other's text.
+// Codes are given out in two headers. A number that stood in both would give one error the other's
+// text.
 consteval bool everyCodeAndTextIsThereOnce()
 {
     for (auto text = texts.begin(); text != texts.end(); ++text)

@@ -57,11 +57,13 @@ void OVFXW::buildActionList(FXWAction requested)
     host().mainRunLoop().performOnMainThread([this] { clearMessageText(); },
                                              RunLoop::Wait::UntilDone);
     queueSelection(requested);
+    // The question comes before anything runs: also before an image is attached.
     if (requested == FXWActionVerifyDisk && actionListContainsBootPartition()) {
         enableButtons();
         return;
     }
     startRunningState(requested);
+    attachSelectedImages();
     enableButtons();
 }
 
@@ -71,12 +73,10 @@ void OVFXW::queueSelection(FXWAction requested)
     if (!selection)
         return;
     for (const OVDiskPointer& disk : *selection) {
-        if (disk->diskType() == OVDisk::typeDiskImage) {
-            ++_deferredDisksNotYetAttached;
-            detachAttachThread(disk);
-        } else if (diskNotInActionList(disk)) {
+        if (disk->diskType() == OVDisk::typeDiskImage)
+            imagesToAttach_.push_back(disk);
+        else if (diskNotInActionList(disk))
             queueDisk(disk, requested);
-        }
     }
 }
 
@@ -164,7 +164,9 @@ void OVFXW::alertDidEnd(Alert& alert, long returnCode)
     if (returnCode == verifyTag) {
         alert.orderOut();
         startRunningState(FXWActionVerifyDisk);
-        processActionList();
+        attachSelectedImages();
+        if (_deferredDisksNotYetAttached == 0)
+            processActionList();
     } else {
         clearActionList();
     }
@@ -177,6 +179,7 @@ void OVFXW::clearActionList()
     if (completedList)
         completedList.removeAll();
     inflightItem = {};
+    imagesToAttach_.clear();
     _deferredDisksNotYetAttached = 0;
 }
 

@@ -193,6 +193,7 @@ private:
     void fileInflightItem();
     void setActionMessage();
     void setActionMessageWithPercentComplete(double percent);
+    void attachSelectedImages();
     void detachAttachThread(const OVDiskPointer& image);
     static OVDiskPointer attachThread(HostServices& host, const std::string& path);
     void attachFinished(const OVDiskPointer& topLevelDisk);
@@ -291,6 +292,7 @@ private:
     static inline std::optional<Threads::Date> lastReloadDate;
     static inline std::size_t lastReloadCount = 0;
 
+    DiskList imagesToAttach_;  ///< selected, and attached when the job begins
     std::shared_ptr<Alert> startupDiskWarning_;
     LineClassifier lineClassifier_;
     MessageRows rows_;

@@ -2,12 +2,22 @@
 #include "fixwell/jobs/ActionListEntry.h"
 #include "fixwell/module/OVFXW.h"
 
+#include <utility>
+
 namespace fixwell {
 namespace {
 
 constexpr std::chrono::milliseconds timeForDisksToAppear{500};
 
 }  // namespace
+
+void OVFXW::attachSelectedImages()
+{
+    for (const OVDiskPointer& image : std::exchange(imagesToAttach_, {})) {
+        ++_deferredDisksNotYetAttached;
+        detachAttachThread(image);
+    }
+}
 
 // The worker gets the path, and nothing of the module but a token that says whether it is still
 // there. An image without a path never reports back, so its job does not start.

@@ -3,7 +3,6 @@
 
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/WindowState.h"
-#include "orvane/jobs/HostReasons.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "pellar/ErrorTexts.h"
 
@@ -21,15 +20,19 @@ constexpr std::array<fixwell::Name const*, 4> diskNotifications{
     &fixwell::OVDiskAppearedNotification, &fixwell::OVDiskUnmountedNotification,
     &fixwell::OVDiskChangedNotification, &fixwell::OVDiskEjectedNotification};
 
-std::string joined(const std::vector<std::string>& sentences)
+// Of the report that a module gives when its job is over (fixwell/history/CompletionReport.h).
+const fixwell::Name reportResultKey{"kOVOP_ResultKey"};
+constexpr std::string_view reportOfFailure = "kOVOP_FailKey";
+
+}  // namespace
+
+std::string DesktopSession::joined(const std::vector<std::string>& sentences)
 {
     std::string text;
     for (const std::string& sentence : sentences)
         text += (text.empty() ? "" : "\n") + sentence;
     return text;
 }
-
-}  // namespace
 
 DesktopSession::DesktopSession(SessionOptions options)
     : options_(std::move(options)),
@@ -38,19 +41,22 @@ DesktopSession::DesktopSession(SessionOptions options)
       library_(loop_, libraryTexts_, libraryOptions()),
       host_(supportOptions(), loop_),
       window_(host_.translator()),
-      disks_(
-          host_.sharedDiskController(), [this](const Disk& disk) { return lastCheckOf(disk); },
-          host_.translator()),
+      disks_(host_.sharedDiskController(), diskStates(), host_.translator()),
       controller_(window_),
       jobs_(host_, ledgerEvents()),
       images_(host_, {[this](const Disk& disk) { window_.disks().select(disk); },
                       [this](const std::vector<std::string>& sentences) {
                           host_.alerts().simpleModuleAlert(text("Not everything could be opened."),
                                                            joined(sentences), 0);
+                      },
+                      [this] {
+                          window_.disks().synchronize();
+                          refreshHints();
                       }}),
       scan_(loop_, [this](const std::vector<DiskTree>& disks) { disksRead(disks); })
 {
     host_.setWindow(&window_);
+    host_.histories().rememberCleared();
     // Before the modules do: the list must have changed when they ask it for the selection.
     observeDisks();
     loadModules();
@@ -81,7 +87,7 @@ SupportOptions DesktopSession::supportOptions()
                                       library_.canVerifyLive(type)};
     };
     options.errorText = [this](fixwell::ErrorCode code) {
-        return pellar::errorText(code, libraryTexts_);
+        return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.historyCompleted = [this] {
         reloadLog();
@@ -103,26 +109,21 @@ pellar::ManagerOptions DesktopSession::libraryOptions()
     return options;
 }
 
-std::optional<LastCheck> DesktopSession::lastCheckOf(const Disk& disk)
-{
-    const auto run = host_.historyStore().lastRun(host_.histories().keyOf(disk.facts()));
-    if (!run)
-        return std::nullopt;
-    const auto started =
-        std::chrono::duration_cast<std::chrono::milliseconds>(run->started.time_since_epoch());
-    return LastCheck{run->end ? run->end->verdict : "", run->end ? run->end->message : "",
-                     QDateTime::fromMSecsSinceEpoch(started.count())};
-}
-
 void DesktopSession::observeDisks()
 {
     for (const fixwell::Name* const name : diskNotifications)
-        host_.defaultCenter().addObserver(
-            this, *name, [this](const fixwell::Notification&) { window_.disks().synchronize(); });
+        host_.defaultCenter().addObserver(this, *name, [this](const fixwell::Notification&) {
+            window_.disks().synchronize();
+            refreshHints();
+        });
     host_.sharedDiskController().hooks().notifyFrontmost =
         [this](fixwell::Name, const fixwell::Notification& notification) {
             if (ModuleTab* const tab = activeTab())
                 tab->deliver(notification);
+            window_.disks().synchronize();
+            refreshHints();
+            // What the user clears later is another step.
+            loop_.post([this] { host_.histories().closeClearing(); });
         };
 }
 
@@ -146,21 +147,34 @@ void DesktopSession::connectWindow()
             names += (names.empty() ? "" : ", ") + disk->displayName();
         return names;
     });
-    controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); }, {}});
+    controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
+                           [this](const fixwell::Dictionary& report) {
+                               job_.hasFailed = report.string(reportResultKey) == reportOfFailure;
+                           }});
+    window_.disks().setContextMenuPolicy(Qt::CustomContextMenu);
+    QObject::connect(&window_.disks(), &QWidget::customContextMenuRequested, &window_,
+                     [this](const QPoint& place) { showDiskMenu(place); });
 }
 
 void DesktopSession::loadModules()
 {
+    std::string switchedOff;
     for (const std::filesystem::path& bundle : findModuleBundles(options_.moduleDirectories)) {
         auto tab = ModuleTab::load(bundle, {host_, controller_, jobs_, libraryOptions()});
         if (failed(tab))
             warn(failureMessage(tab));
         else if (std::get<std::unique_ptr<ModuleTab>>(tab))
             addTab(std::get<std::unique_ptr<ModuleTab>>(std::move(tab)));
+        else
+            switchedOff += (switchedOff.empty() ? "" : ", ") + bundle.stem().string();
     }
     if (!tabs_.empty())
         return;
-    auto* const label = new QLabel(toQt(text("No module is installed that could work on disks.")));
+    const std::string why =
+        switchedOff.empty()
+            ? text("No module is installed that could work on disks.")
+            : host_.translator().sentence("%@ is switched off in the settings.", {switchedOff});
+    auto* const label = new QLabel(toQt(why));
     label->setTextFormat(Qt::PlainText);
     label->setAlignment(Qt::AlignCenter);
     label->setWordWrap(true);
@@ -178,6 +192,9 @@ void DesktopSession::addTab(std::unique_ptr<ModuleTab> tab)
         tab->interface() != nullptr ? &tab->interface()->widget() : new QWidget(&window_);
     window_.tabs().insertTab(static_cast<int>(place - tabs_.begin()), page,
                              toQtTitle(tab->module().displayName()));
+    if (tab->interface() != nullptr)
+        tab->interface()->setBeforeAction(
+            [this](std::string_view action) { lastAction_ = action; });
     tabs_.insert(place, std::move(tab));
 }
 
@@ -194,6 +211,7 @@ void DesktopSession::updateTabs()
         tab->setActive(tab.get() == activeTab());
     if (ModuleTab* const tab = activeTab())
         tab->tellOfSelection();
+    refreshHints();
 }
 
 void DesktopSession::selectionChanged()
@@ -201,20 +219,8 @@ void DesktopSession::selectionChanged()
     for (std::size_t i = 0; i < tabs_.size(); ++i)
         window_.tabs().setTabEnabled(static_cast<int>(i), tabs_[i]->isOffered());
     updateTabs();
-    tellWhyNot();
-}
-
-// A button that is grey has no words for a disk that the module knows nothing about.
-void DesktopSession::tellWhyNot()
-{
-    ModuleTab* const tab = activeTab();
-    EmptyNote* const note =
-        tab != nullptr && tab->interface() != nullptr ? tab->interface()->emptyNote() : nullptr;
-    if (note == nullptr)
-        return;
-    const auto disks = window_.disks().selectedDisks();
-    note->tell(disks.size() == 1 ? toQt(reasonOfHost(*disks.front(), library_, host_.translator()))
-                                 : QString());
+    for (const auto& disk : window_.disks().selectedDisks())
+        images_.refresh(*disk);
 }
 
 void DesktopSession::show()

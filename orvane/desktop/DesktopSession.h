@@ -19,7 +19,9 @@
 
 #include <chrono>
 #include <functional>
+#include <map>
 #include <memory>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -60,7 +62,9 @@ public:
 private:
     SupportOptions supportOptions();
     pellar::ManagerOptions libraryOptions();
+    DiskStates diskStates();
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
+    std::string activityOn(const Disk& disk);
     void observeDisks();
     void watchSystemDisks();
     void disksRead(const std::vector<DiskTree>& disks);
@@ -73,7 +77,12 @@ private:
     void addTab(std::unique_ptr<ModuleTab> tab);
     void updateTabs();
     void selectionChanged();
-    void tellWhyNot();
+    void refreshHints();
+    void tellEmptyText();
+    void tellReasons();
+    std::string reasonFor(const Disk& disk, std::string_view button);
+    std::map<std::string, std::string> reasonsByDisk();
+    std::string emptyText();
     void windowAppeared();
 
     std::vector<Menu> menus();
@@ -93,6 +102,13 @@ private:
     bool canEdit(fixwell::Selector action);
     bool fetchesArchives();
     void switchArchiveFetching();
+    void undoClearing();
+    void showDiskMenu(const QPoint& place);
+    QtButton* moduleButton(const char* name);
+    MenuCommand buttonCommand(const char* objectName, std::string_view title, const char* button);
+    MenuCommand mapCommand(const char* objectName, std::string_view title, const char* button);
+    std::shared_ptr<Disk> diskWithMap();
+    void treatMap(const char* button);
     bool isInDiskList() const;
     void selectAll();
     QtButton* detailsButton();
@@ -107,10 +123,14 @@ private:
     DesktopNotifier::Options notifierOptions();
     void runBegan(const StartedRun& run);
     void runEnded(const StartedRun& run, const RunEnd& end);
+    void stopAsked();
     void jobBegan();
     void jobEnded();
+    void lookBackAtJob();
+    std::vector<std::string> keepUnreachedImages();
 
     void warn(const std::string& sentence);
+    static std::string joined(const std::vector<std::string>& sentences);
     void showWarnings();
     void showFailures(const std::vector<std::string>& sentences);
     std::string text(std::string_view key) { return host_.translator().text(key); }
@@ -120,6 +140,7 @@ private:
     bool hasAppeared_ = false;
     bool hasReadDisks_ = false;
     bool isEnding_ = false;
+    bool areHintsAwaited_ = false;
 
     QtLoop loop_;
     Catalogue hostTexts_;
@@ -142,6 +163,17 @@ private:
     DesktopNotifier notifier_{notifierOptions()};
     std::chrono::steady_clock::time_point jobStart_;
     std::vector<FinishedRun> finishedRuns_;  ///< of the job that runs
+
+    /// The job that runs, or ran last.
+    struct Job {
+        std::string action;                        ///< the selector that began it
+        std::vector<std::shared_ptr<Disk>> disks;  ///< that it was to work on
+        std::set<std::string> reached;             ///< identifiers of disks that a run was about
+        bool isStopAsked = false;
+        bool hasFailed = false;  ///< by the module's own report
+    };
+    Job job_;
+    std::string lastAction_;
 };
 
 }  // namespace orvane::desktop

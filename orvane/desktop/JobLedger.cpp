@@ -7,7 +7,7 @@ void JobLedger::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operatio
 {
     runs_.begin(disk, operation);
     isJobRunning_ = true;
-    run_ = {operation, disk ? disk->name : std::string()};
+    run_ = {operation, disk ? disk->name : std::string(), disk ? disk->identifier : std::string()};
     events_.began(run_);
 }
 

@@ -15,6 +15,7 @@ public:
     struct Events {
         std::function<void(const StartedRun&)> began;
         std::function<void(const StartedRun&, const RunEnd&)> ended;  ///< the run is kept
+        std::function<void()> stopAsked;
     };
 
     /// The host outlives this object.
@@ -22,12 +23,16 @@ public:
 
     /// A tool is at work. It is not while a job's images are being read.
     bool isJobRunning() const { return isJobRunning_; }
+    /// The run that is under way; none when none is.
+    const StartedRun* currentRun() const { return isJobRunning_ ? &run_ : nullptr; }
+    const RunKeeper& runs() const { return runs_; }
 
     void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) override;
     void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
                         fixwell::ErrorCode error) override;
     void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
                        const fixwell::Dictionary& result) override;
+    void stopWasAsked() override { events_.stopAsked(); }
 
 private:
     void end(const RunEnd& end);

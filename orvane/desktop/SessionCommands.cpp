@@ -6,6 +6,8 @@
 
 #include <QFile>
 #include <QFileDialog>
+#include <QMenu>
+#include <QMenuBar>
 
 namespace orvane::desktop {
 namespace {
@@ -35,7 +37,12 @@ std::vector<Menu> DesktopSession::menus()
                            [this](const auto& names) { attachAsDevices(names); });
           },
           isUnlocked},
-         {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { scan_.start(); }, isUnlocked},
+         {"rescan", "&Rescan Disks", QKeySequence::Refresh,
+          [this] {
+              images_.refreshAll();
+              scan_.start();
+          },
+          isUnlocked},
          diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
          diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U),
                      DiskAction::Unmount),
@@ -70,6 +77,10 @@ std::vector<Menu> DesktopSession::menus()
                 [this] {
                     return canEdit("delete:");
                 }},
+               {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
+                [this] {
+                    return !controller_.interfaceLock() && host_.histories().hasCleared();
+                }},
                line,
                {"fetchArchives",
                 "Download &Package Archives",
@@ -79,6 +90,12 @@ std::vector<Menu> DesktopSession::menus()
                 [this] {
                     return fetchesArchives();
                 }}}};
+    Menu disk{"Dis&k",
+              {buttonCommand("verifyDisk", "&Verify Disk", "verifyDiskButton"),
+               buttonCommand("repairDisk", "&Repair Disk", "repairDiskButton"), line,
+               mapCommand("verifyMap", "Verify Partition &Map", "verifyDiskButton"),
+               mapCommand("repairMap", "Repair &Partition Map", "repairDiskButton")},
+              "diskMenu"};
     Menu view{"&View",
               {{"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
                 [this] { detailsButton()->press(); },
@@ -89,7 +106,7 @@ std::vector<Menu> DesktopSession::menus()
     Menu help{"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
                              host_.sharedHelpManager().openHelpAnchor("ovhelp11868");
                          }}}};
-    return {file, edit, view, help};
+    return {file, edit, disk, view, help};
 }
 
 void DesktopSession::chooseImages(
@@ -169,12 +186,81 @@ void DesktopSession::selectAll()
     }
 }
 
-QtButton* DesktopSession::detailsButton()
+QtButton* DesktopSession::moduleButton(const char* name)
 {
     ModuleTab* const tab = activeTab();
-    return tab != nullptr && tab->interface() != nullptr
-               ? tab->interface()->button("showDetailsButton")
-               : nullptr;
+    return tab != nullptr && tab->interface() != nullptr ? tab->interface()->button(name) : nullptr;
+}
+
+QtButton* DesktopSession::detailsButton()
+{
+    return moduleButton("showDetailsButton");
+}
+
+void DesktopSession::undoClearing()
+{
+    host_.histories().restoreCleared();
+    window_.disks().synchronize();
+    updateTabs();
+}
+
+MenuCommand DesktopSession::buttonCommand(const char* objectName, std::string_view title,
+                                          const char* button)
+{
+    return {objectName,
+            title,
+            {},
+            [this, button] { moduleButton(button)->press(); },
+            [this, button] {
+                QtButton* const control = moduleButton(button);
+                return !controller_.interfaceLock() && control != nullptr && control->isEnabled();
+            }};
+}
+
+MenuCommand DesktopSession::mapCommand(const char* objectName, std::string_view title,
+                                       const char* button)
+{
+    return {objectName,
+            title,
+            {},
+            [this, button] { treatMap(button); },
+            [this] {
+                return diskWithMap() != nullptr;
+            }};
+}
+
+// The whole disk that is selected, or that is in the selected image, where a map can be treated.
+std::shared_ptr<Disk> DesktopSession::diskWithMap()
+{
+    const auto disks = window_.disks().selectedDisks();
+    if (disks.size() != 1 || controller_.interfaceLock() || activeTab() == nullptr)
+        return nullptr;
+    const auto whole =
+        disks.front()->isOfflineDiskImage() ? disks.front()->contents() : disks.front();
+    const bool hasMap = whole && whole->isWhole() && !whole->hasGone() &&
+                        library_.reasonAgainstPartitionMap(*whole->theKRDisk()).empty();
+    return hasMap ? whole : nullptr;
+}
+
+// The module takes the map of what is selected as a whole disk, as it does with a device; of an
+// image it takes the volumes.
+void DesktopSession::treatMap(const char* button)
+{
+    controller_.setSelection({diskWithMap()});
+    activeTab()->tellOfSelection();
+    if (QtButton* const control = moduleButton(button))
+        control->press();
+    if (controller_.interfaceLock())
+        return;  // until the job is over
+    controller_.setSelection({});
+    updateTabs();
+}
+
+void DesktopSession::showDiskMenu(const QPoint& place)
+{
+    for (QAction* action : window_.menuBar()->actions())
+        if (action->menu() != nullptr && action->menu()->objectName() == QLatin1String("diskMenu"))
+            action->menu()->popup(window_.disks().viewport()->mapToGlobal(place));
 }
 
 }  // namespace orvane::desktop

@@ -39,10 +39,14 @@ void DesktopSession::openNamed(bool areFiles)
     images_.open(names);
 }
 
-// What is selected when the window is locked is what the job works on.
+// What the modules see as selected when the window is locked is what the job works on.
 void DesktopSession::holdDisks()
 {
-    host_.sharedDiskController().hold(window_.disks().selectedDisks());
+    auto disks = window_.disks().selectedDisks();
+    for (const auto& disk : controller_.allSelectedItemsFilterDuplicates(false, true))
+        if (auto other = std::dynamic_pointer_cast<Disk>(disk))
+            disks.push_back(std::move(other));
+    host_.sharedDiskController().hold(std::move(disks));
 }
 
 void DesktopSession::releaseDisks()

@@ -4,6 +4,7 @@
 #include "fixwell/host/foundation/UTF8.h"
 #include "orvane/desktop/DesktopEntry.h"
 #include "orvane/desktop/DesktopSession.h"
+#include "orvane/jobs/UnreachedImage.h"
 
 #include <QApplication>
 
@@ -14,8 +15,9 @@ namespace orvane::desktop {
 JobLedger::Events DesktopSession::ledgerEvents()
 {
     return {[this](const StartedRun& run) { runBegan(run); },
-            [this](const StartedRun& run, const RunEnd& end) {
-                runEnded(run, end);
+            [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
+            [this] {
+                stopAsked();
             }};
 }
 
@@ -36,8 +38,21 @@ void DesktopSession::runBegan(const StartedRun& run)
             host_.translator().sentence("Repairing “%@”", {fixwell::printable(run.disk)}));
     else
         wakefulness_.release();
+    job_.reached.insert(run.identifier);
+    window_.disks().synchronize();
     if (isEnding_)
         stopAndClose();
+    else if (job_.isStopAsked)
+        loop_.post([this] { stopJob(); });
+}
+
+// While the job's images are attached, the module has no tool to stop: it has forgotten what it
+// was to do, and waits for the images. They end at once.
+void DesktopSession::stopAsked()
+{
+    job_.isStopAsked = true;
+    if (!jobs_.isJobRunning())
+        host_.imageAttachment().stopAttachments();
 }
 
 void DesktopSession::runEnded(const StartedRun& run, const RunEnd& end)
@@ -51,19 +66,60 @@ void DesktopSession::jobBegan()
 {
     jobStart_ = std::chrono::steady_clock::now();
     finishedRuns_.clear();
+    job_ = {lastAction_, window_.disks().selectedDisks(), {}, false, false};
     holdDisks();
+    refreshHints();
 }
 
 void DesktopSession::jobEnded()
 {
     wakefulness_.release();
+    host_.imageAttachment().resumeAttachments();
     const auto length = std::chrono::steady_clock::now() - jobStart_;
     const auto runs = std::exchange(finishedRuns_, {});
     const bool isActive = QApplication::activeWindow() != nullptr;
     if (!runs.empty() && !isEnding_ && isWorthANotice(length, isActive, options_.longestGlanceAway))
         notifier_.show(noticeOf(runs, host_.translator()));
     // Posted, because the module has not finished with the job when it gives the window free.
-    loop_.post([this] { releaseDisks(); });
+    loop_.post([this] { lookBackAtJob(); });
+}
+
+void DesktopSession::lookBackAtJob()
+{
+    releaseDisks();
+    if (controller_.interfaceLock())
+        return;  // the next job has begun
+    controller_.setSelection({});
+    auto sentences =
+        job_.isStopAsked || isEnding_ ? std::vector<std::string>() : keepUnreachedImages();
+    if (job_.hasFailed && !job_.isStopAsked && sentences.empty() && job_.reached.empty())
+        sentences.push_back(text("Nothing that is selected could be checked."));
+    for (const auto& disk : job_.disks)
+        images_.refresh(*disk);
+    window_.disks().synchronize();
+    updateTabs();
+    if (!sentences.empty())
+        host_.alerts().simpleModuleAlert(text("Not everything could be checked."),
+                                         joined(sentences), 0);
+}
+
+// Images that no tool got to see. The module has nothing to say about them.
+std::vector<std::string> DesktopSession::keepUnreachedImages()
+{
+    std::vector<std::string> sentences;
+    for (const auto& disk : job_.disks) {
+        const std::string& name = disk->facts().identifier;
+        const auto inside = job_.reached.lower_bound(name);
+        const bool isReached =
+            inside != job_.reached.end() && (*inside == name || inside->starts_with(name + "#"));
+        if (!disk->isOfflineDiskImage() || isReached)
+            continue;
+        sentences.push_back(whyUnreached(host_, *disk, disk->displayName()));
+        const bool isRepair = job_.action.starts_with("repair");
+        keepUnreached(host_, *disk, isRepair ? Operation::RepairDisk : Operation::VerifyDisk,
+                      sentences.back());
+    }
+    return sentences;
 }
 
 }  // namespace orvane::desktop

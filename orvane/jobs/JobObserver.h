@@ -30,6 +30,8 @@ public:
     /// The library refused; the job is over.
     virtual void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
                                 fixwell::ErrorCode error) = 0;
+    /// The user has pressed Stop. There may be no job yet: images may still be attached for it.
+    virtual void stopWasAsked() {}
     /// Before the module hears of it. `result` has the result keys.
     virtual void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
                                const fixwell::Dictionary& result) = 0;

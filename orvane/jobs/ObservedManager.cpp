@@ -65,7 +65,11 @@ public:
     {
         return tool_->canVerifyStoragesystemFilesystemForDisk(disk, error);
     }
-    void cancelCurrentOperation() override { tool_->cancelCurrentOperation(); }
+    void cancelCurrentOperation() override
+    {
+        manager_.observer_.stopWasAsked();
+        tool_->cancelCurrentOperation();
+    }
 
 private:
     ErrorCode begin(const DiskReferencePointer& disk, Operation operation,

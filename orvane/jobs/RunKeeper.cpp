@@ -1,7 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/RunKeeper.h"
 
+#include "fixwell/host/pellar/ErrorCodes.h"
 #include "fixwell/host/pellar/MessageKeys.h"
+#include "pellar/volumes/DiskUse.h"
+
+#include <sys/stat.h>
 
 #include <utility>
 
@@ -9,6 +13,11 @@ namespace orvane {
 
 void RunKeeper::begin(const fixwell::DiskReferencePointer& reference, Operation operation)
 {
+    // What was said until now has its time before this run's.
+    host_.histories().saveNew();
+    const bool isOfImage =
+        reference && reference->storage == fixwell::DiskReference::Storage::FileRegion;
+    image_ = isOfImage ? reference->path : std::filesystem::path();
     const auto disk =
         std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
     run_ = disk ? host_.historyStore().beginRun(host_.histories().keyOf(disk->facts()),
@@ -32,6 +41,21 @@ RunEnd RunKeeper::finish(fixwell::ErrorCode error, const fixwell::Dictionary& re
         end.verdict = (error == 0 ? fixwell::kPLVerdictSound : fixwell::kPLVerdictFailed).text();
     keep(end);
     return end;
+}
+
+std::string RunKeeper::withDevice(fixwell::ErrorCode error, std::string text) const
+{
+    const bool isInUse = error == fixwell::kPLErrorDiskInUse ||
+                         error == fixwell::kOVErrorDiskInUse ||
+                         error == fixwell::kOVErrorCannotRepairInUse;
+    struct stat status = {};
+    if (!isInUse || image_.empty() || ::stat(image_.c_str(), &status) != 0)
+        return text;
+    const std::string device =
+        pellar::loopDeviceOn(status.st_dev, status.st_ino, pellar::SystemPaths());
+    return device.empty()
+               ? text
+               : text + " " + host_.translator().sentence("The image is attached as %@.", {device});
 }
 
 void RunKeeper::keep(const RunEnd& end)

@@ -19,11 +19,16 @@ public:
     /// `result` has the result keys. Where it names no verdict, the error decides.
     RunEnd finish(fixwell::ErrorCode error, const fixwell::Dictionary& result);
 
+    /// The text of an error of the job at hand; where the disk is in use because its image is a
+    /// device as well, that device is named.
+    std::string withDevice(fixwell::ErrorCode error, std::string text) const;
+
 private:
     void keep(const RunEnd& end);
 
     SupportHost& host_;
-    std::int64_t run_ = 0;  ///< the one that is under way; 0 when it could not be written
+    std::filesystem::path image_;  ///< that the last run was about; empty for a device
+    std::int64_t run_ = 0;         ///< the one that is under way; 0 when it could not be written
 };
 
 }  // namespace orvane

@@ -65,7 +65,7 @@ std::string lineFromEvent(const pellar::Event& event)
 
 std::optional<pellar::Event> eventFromLine(std::string_view line)
 {
-    const json parts = json::parse(line, nullptr, false);
+    const json parts = parsedJSON(line);
     if (!parts.is_array() || parts.empty())
         return std::nullopt;
     try {

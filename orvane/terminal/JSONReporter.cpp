@@ -139,6 +139,9 @@ void JSONReporter::listed(const DiskLine& disk)
            {"mountPoint", textOrNull(disk.mountPoint)},
            {"lastChecked", textOrNull(disk.lastChecked)},
            {"verdict", textOrNull(disk.verdict)},
+           {"laterAttempt", disk.later ? ordered_json{{"started", disk.later->started},
+                                                      {"verdict", textOrNull(disk.later->verdict)}}
+                                       : ordered_json(nullptr)},
            {"actions", actions}});
 }
 

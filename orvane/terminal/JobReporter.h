@@ -46,6 +46,7 @@ public:
     const std::string& currentDisk() const { return current_; }
     /// Between a job's beginning and its end.
     bool isInFlight() const { return isInFlight_; }
+    const RunKeeper& runs() const { return runs_; }
     /// By disk identifier.
     const std::map<std::string, RunEnd>& outcomes() const { return outcomes_; }
 

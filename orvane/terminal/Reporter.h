@@ -31,6 +31,12 @@ struct DiskLine {
     bool isVolume = false;
     std::string lastChecked;  ///< local time; empty when never
     std::string verdict;
+    /// A later check that came to no answer (it was stopped, or failed); mostly none.
+    struct Attempt {
+        std::string started;  ///< local time
+        std::string verdict;  ///< empty when it was cut off
+    };
+    std::optional<Attempt> later = {};
     std::vector<ActionLine> actions;
 };
 

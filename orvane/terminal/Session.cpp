@@ -75,7 +75,7 @@ SupportOptions Session::supportOptions(const Request& request)
                                       library_.canVerifyLive(type)};
     };
     options.errorText = [this](fixwell::ErrorCode code) {
-        return pellar::errorText(code, libraryTexts_);
+        return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.warn = [this](const std::string& sentence) {
         reporter_.warning(sentence);
@@ -243,8 +243,9 @@ void Session::writeAllRowsOf(const std::string& name)
     logView_.writeAllRows();
 }
 
-// The first interruption is the Stop button. A job whose images are still being attached cannot
-// be stopped yet; it is as soon as it begins. Every further one presses the tool harder.
+// The first interruption is the Stop button. A job whose images are still being attached has none
+// that works; the attaching ends, and should the job begin all the same, it is stopped then. Every
+// further interruption presses the tool harder.
 void Session::interrupt()
 {
     reporter_.prompt(Reporter::Prompt::Left);
@@ -252,8 +253,8 @@ void Session::interrupt()
     isStopping_ = true;
     if (!isFirst)
         observedLibrary_.cancelAgain();
-    else
-        pressStop();
+    else if (!pressStop())
+        host_.imageAttachment().stopAttachments();
 }
 
 bool Session::pressStop()

@@ -180,6 +180,11 @@ void TextReporter::listed(const DiskLine& disk)
                ? sentence("never checked", {})
                : sentence("last checked %@: %@", {disk.lastChecked, verdictText(disk.verdict)})) +
           "\n");
+    if (disk.later)
+        write(indent + "    " +
+              sentence("after that, %@: %@",
+                       {disk.later->started, verdictText(disk.later->verdict)}) +
+              "\n");
     for (const ActionLine& action : disk.actions)
         write(fmt::format(
             "{}    {:<24} {}\n", indent, action.title,

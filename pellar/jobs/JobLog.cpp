@@ -143,8 +143,12 @@ void JobLog::endOfRun()
 }
 
 // The module ends a failure's line itself, a success's it does not.
-void JobLog::verdict(Verdict verdict, Access access)
+void JobLog::verdict(Verdict verdict, Access access, bool isForGood)
 {
+    if (verdict == Verdict::Damaged && access == Access::ReadOnly && isForGood) {
+        const Sentence said{"The volume “%1$@” is damaged.", diskName_, {}};
+        return add(message(fixwell::kFsckError, text(said), mainLevel));
+    }
     const auto line = verdictLineFor(verdict, access);
     if (!line)
         return;

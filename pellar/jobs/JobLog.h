@@ -45,8 +45,9 @@ public:
     void progress(double percentOfRun);
     /// Names the number of problems that were not shown.
     void endOfRun();
-    /// The line by which the module knows the result; none for a verdict without a phrase.
-    void verdict(Verdict verdict, Access access);
+    /// The line by which the module knows the result; none for a verdict without a phrase. What is
+    /// damaged for good does not “need to be repaired”.
+    void verdict(Verdict verdict, Access access, bool isForGood = false);
     void finished(fixwell::ErrorCode mainError, std::int32_t detailError, fixwell::Name verdict,
                   const std::string& message);
 

@@ -1,18 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobScript.h"
 
+#include "pellar/ErrorCodes.h"
+
 #include "fixwell/host/foundation/UTF8.h"
 #include "fixwell/host/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
-#include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Capability.h"
+#include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
+#include "pellar/volumes/DiskBytes.h"
 #include "pellar/volumes/DiskForTool.h"
 #include "pellar/volumes/LogReplay.h"
 #include "pellar/volumes/SignatureProbe.h"
 
+#include <algorithm>
+#include <chrono>
 #include <utility>
 
 namespace pellar {
@@ -79,13 +84,13 @@ JobScript::State JobScript::examine()
         repairProgram_ = findProgram(tool_->repairName, options_.toolPath);
         volume_ = factsFor(*tool_);
     }
+    if (const auto objection = objectionToDisk())
+        return end(*objection);
     if (const auto objection = this->objection())
         return end(*objection);
     if (const auto objection = objectionToSize())
         return end(*objection);
-    if (operation_ == Operation::Verify)
-        return State::Verifying;
-    return tool_->habits.isLookedAtBeforeRepair ? State::Looking : State::Repairing;
+    return operation_ == Operation::Verify ? State::Verifying : State::Looking;
 }
 
 /// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
@@ -97,6 +102,14 @@ std::optional<Outcome> JobScript::objectionToJob() const
         capabilityFor(disk_.reference().filesystem, operation_, options_.toolPath);
     return capability.isGiven() ? std::nullopt
                                 : std::optional(failedOutcome(capability.error, capability.reason));
+}
+
+/// Where no file system is found in its place, that may be for want of reading.
+std::optional<Outcome> JobScript::objectionToDisk()
+{
+    const bool isInPlace = tool_ != nullptr && volume_.isRecognized && volume_.hasPrimary;
+    const auto byte = isInPlace ? std::nullopt : unreadableByte({});
+    return byte ? std::optional(outcomeOfVerification(unreadable(byte))) : std::nullopt;
 }
 
 /// Why no tool may run; none when one may.
@@ -112,7 +125,7 @@ std::optional<Outcome> JobScript::objection() const
     if (tool_ == nullptr)
         return withoutTool();
     if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failedOutcome(fixwell::kPLErrorUnsupported, tool_->reasonAgainstRepair);
+        return failedOutcome(kPLErrorNoRepairHere, tool_->reasonAgainstRepair);
     if (volume_.isForeign)
         return failedOutcome(
             fixwell::kPLErrorUnsupported,
@@ -153,36 +166,50 @@ std::optional<Outcome> JobScript::objectionToSize()
                 std::to_string(volume_.volumeBytes), std::to_string(volume_.availableBytes)});
     if (operation_ == Operation::Verify)
         return std::nullopt;
-    return Outcome{Verdict::Damaged,
-                   fixwell::kPLErrorNotRepaired,
-                   0,
-                   {"its end is missing, and a repair would throw away what lies there", {}, {}}};
+    return outcomeOfVerification(cutShort(0));
 }
 
 JobScript::State JobScript::verify()
 {
-    const RunEvidence evidence = runOnce(Access::ReadOnly);
+    const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
     const Judgement judgement = judge(evidence);
     if (judgement.verdict == Verdict::Damaged && !volume_.isCutShort())
-        for (const std::string_view meaning : meaningOf(evidence.findings.damage))
-            log_.remark(texts_.text(meaning));
+        tellMeaning(evidence);
     return end(tool_->canRepair() ? outcomeOfVerification(judgement)
                                   : outcomeWithoutRepair(judgement));
 }
 
-/// A sound volume is not written to, and what is not known to be damaged is not repaired.
+void JobScript::tellMeaning(const RunEvidence& evidence)
+{
+    Damage damage = evidence.findings.damage;
+    if (!evidence.findings.isComplete)
+        damage.add(Damage::Unsurveyed);
+    for (const std::string_view meaning : meaningOf(damage, tool_->canRepair()))
+        log_.remark(texts_.text(meaning));
+}
+
+/// A sound volume is not written to, what is not known to be damaged is not repaired, and nothing
+/// is written to a disk that cannot be read.
 JobScript::State JobScript::look()
 {
     log_.meter().setRange(0, lookShare);
-    const RunEvidence evidence = runOnce(Access::ReadOnly);
+    // What is wrong before a journal is replayed may not be wrong afterwards.
+    const bool hasJournal = volume_.needsRecovery;
+    const RunEvidence evidence =
+        runOnce(Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = judge(evidence);
-    const bool waitsForReplay = judgement.verdict == Verdict::Inconclusive &&
-                                evidence.findings.skippedJournal &&
-                                !tool_->habits.logReplayedAs.empty();
-    if (waitsForReplay)
+    counts_.collectedOne = tool_->habits.collectedOne;
+    counts_.collectedMany = tool_->habits.collectedMany;
+    counts_.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
+    foundDamage_ = judgement.verdict == Verdict::Damaged;
+    const bool waitsForReplay =
+        judgement.verdict == Verdict::Inconclusive && evidence.findings.skippedJournal;
+    if (waitsForReplay && !tool_->habits.logReplayedAs.empty())
         return State::Replaying;
-    return judgement.verdict == Verdict::Damaged ? State::Repairing
-                                                 : end(outcomeOfVerification(judgement));
+    if (!foundDamage_ && !(waitsForReplay && tool_->habits.replaysInRepair))
+        return end(outcomeOfVerification(judgement));
+    const auto byte = firstUnreadable(evidence.volume.backups);
+    return byte ? end(outcomeOfVerification(unreadable(byte))) : State::Repairing;
 }
 
 JobScript::State JobScript::replay()
@@ -205,14 +232,17 @@ JobScript::State JobScript::replay()
 
 JobScript::State JobScript::repair()
 {
-    log_.meter().setRange(passes_.empty() && tool_->habits.isLookedAtBeforeRepair ? lookShare : 0,
-                          repairShare);
-    const RunEvidence evidence = runOnce(Access::ReadWrite);
+    log_.meter().setRange(passes_.empty() ? lookShare : 0, repairShare);
+    const RunEvidence evidence = runOnce(
+        Access::ReadWrite, foundDamage_ ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = judge(evidence);
     passes_.push_back({judgement, evidence.findings.replayedJournal,
-                       evidence.findings.problems > 0 || tool_->habits.isLookedAtBeforeRepair});
+                       evidence.findings.problems > 0 || foundDamage_});
+    counts_.reconnected += evidence.findings.reconnected;
+    counts_.cleared += evidence.findings.cleared;
     // The disk went away, or the user did not want more: nothing is left to be confirmed.
     const bool isOver = judgement.verdict == Verdict::Stopped ||
+                        judgement.code == kPLErrorUnreadable ||
                         judgement.code == fixwell::kPLErrorDiskChanged ||
                         judgement.code == fixwell::kPLErrorDiskInUse;
     return isOver ? end(outcomeOfVerification(judgement)) : State::Confirming;
@@ -221,10 +251,12 @@ JobScript::State JobScript::repair()
 JobScript::State JobScript::confirm()
 {
     log_.meter().setRange(repairShare, 100);
-    const Judgement judgement = judge(runOnce(Access::ReadOnly));
+    const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
+    const Judgement judgement = judge(evidence);
     if (isWorthAnotherPass(passes_, judgement))
         return State::Repairing;
-    const Outcome outcome = outcomeOfRepair(passes_, judgement);
+    counts_.after = evidence.findings.files;
+    const Outcome outcome = outcomeOfRepair(passes_, judgement, counts_);
     // The verification behind it decides, but a repair that was cut off is not kept quiet about.
     if (outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired)
         for (const RepairPass& pass : passes_)
@@ -245,7 +277,7 @@ VolumeFacts JobScript::factsFor(const Tool& tool) const
                         disk_.claim().availableBytes());
 }
 
-RunEvidence JobScript::runOnce(Access access)
+RunEvidence JobScript::runOnce(Access access, ToolRun::Problems problems)
 {
     volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
     const auto form =
@@ -255,7 +287,7 @@ RunEvidence JobScript::runOnce(Access access)
         obstacle_ = notAttached(*tool_, *error);
         return {access, {NotStarted{*error}}, {}, volume_};
     }
-    ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access,
+    ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access, problems,
                 {options_, log_, road_, stop_});
     return run.run(std::get<DiskForTool>(disk), volume_);
 }
@@ -274,10 +306,49 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
                          false};
     };
     if (!disk_.claim().isStillWhole())
-        return lost("the disk became shorter or unreadable meanwhile");
+        return lost("the disk became shorter meanwhile");
     if (!disk_.claim().isStillInPlace())
         return lost("the disk was deleted, moved or replaced meanwhile");
-    return judgement;
+    if (!disk_.claim().isEndReadable())
+        return unreadable(disk_.claim().availableBytes() - 1);
+    return asKernelSays(judgement, evidence);
+}
+
+/// What a tool takes for damage may be a disk that cannot be read, which not every tool says.
+Judgement JobScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
+{
+    const bool isAnswer =
+        judgement.code == kPLErrorUnreadable || judgement.code == fixwell::kPLErrorDamaged ||
+        judgement.code == kPLErrorCutShort || judgement.code == fixwell::kPLErrorInconclusive ||
+        judgement.code == fixwell::kPLErrorToolFailed;
+    if (obstacle_ || !isAnswer || stop_.isPressed() ||
+        std::holds_alternative<NotStarted>(evidence.result.ending))
+        return judgement;
+    const auto byte = unreadableByte(evidence.findings.readFault.value_or(ReadFault()));
+    return byte ? unreadable(byte) : judgement;
+}
+
+/// Our own reading of where the tool could not, and of where a file system keeps what it is built
+/// on; of all, for half a minute, where a tool could not read and does not say where.
+std::optional<std::uint64_t> JobScript::unreadableByte(const ReadFault& fault) const
+{
+    constexpr std::uint64_t around = 1U << 20U;
+    const std::uint64_t available = disk_.claim().availableBytes();
+    std::vector<DiskPiece> pieces = endsOfVolume(available);
+    const auto byte =
+        fault.block ? productOrGreatest(*fault.block, volume_.blockBytes) : fault.byte;
+    if (byte && *byte < available)
+        pieces.insert(pieces.begin(), {*byte, std::min(around, available - *byte)});
+    else if (fault.isUnproven)
+        pieces.push_back({0, available});
+    return firstUnreadable(pieces);
+}
+
+std::optional<std::uint64_t> JobScript::firstUnreadable(const std::vector<DiskPiece>& pieces) const
+{
+    const auto deadline = Clock::now() + std::chrono::seconds(30);
+    return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces,
+                                   [&] { return stop_.isPressed() || Clock::now() > deadline; });
 }
 
 }  // namespace pellar

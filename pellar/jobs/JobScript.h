@@ -7,6 +7,7 @@
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Outcome.h"
 #include "pellar/jobs/Script.h"
+#include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Tool.h"
 
 #include <filesystem>
@@ -25,12 +26,12 @@ struct JobRequest {
 
 /// What a job does, from the claimed disk to the verdict, on the thread that calls `run`:
 ///
-///     Examining ─→ Verifying ──────────────→ Done
-///              ├─→ Repairing ⇄ Confirming ─→ Done
-///              └─→ Looking ─→ Repairing, or ─→ Replaying ─→ Confirming, or ─→ Done
+///     Examining ─→ Verifying ─→ Done
+///              └─→ Looking ─→ Repairing ⇄ Confirming ─→ Done
+///                         ├─→ Replaying ─→ Confirming
+///                         └─→ Done
 ///
-/// Looking verifies before a repair, for tools that need it; Replaying brings a log to its place
-/// by mounting.
+/// Looking verifies before a repair; Replaying brings a log to its place by mounting.
 ///
 /// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
 /// tells *started* once, first, and *finished* once, last. The references outlive it.
@@ -59,11 +60,16 @@ private:
     }
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
+    std::optional<Outcome> objectionToDisk();
     std::optional<Outcome> objectionToSize();
     VolumeFacts factsFor(const Tool& tool) const;
     Outcome withoutTool() const;
-    RunEvidence runOnce(Access access);
+    void tellMeaning(const RunEvidence& evidence);
+    RunEvidence runOnce(Access access, ToolRun::Problems problems);
     Judgement judge(const RunEvidence& evidence) const;
+    Judgement asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const;
+    std::optional<std::uint64_t> unreadableByte(const ReadFault& fault) const;
+    std::optional<std::uint64_t> firstUnreadable(const std::vector<DiskPiece>& pieces) const;
 
     const Operation operation_;
     const Tool* tool_;
@@ -79,6 +85,8 @@ private:
     VolumeFacts volume_;
     std::optional<Judgement> obstacle_;  ///< why the last run could not even be prepared
     std::vector<RepairPass> passes_;
+    bool foundDamage_ = false;  ///< the verification before the repair did
+    FileCounts counts_;
     Outcome outcome_;
 };
 

@@ -50,7 +50,7 @@ Sentence reasonOf(fixwell::ErrorCode claimError)
 
 Outcome stopped()
 {
-    return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+    return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}, {}};
 }
 
 }  // namespace
@@ -99,14 +99,15 @@ Outcome MapScript::carryOut()
     if (stop_.isPressed())
         return stopped();
     if (const auto* const error = std::get_if<fixwell::ErrorCode>(&taken))
-        return {Verdict::Failed, *error, 0, reasonOf(*error)};
+        return failedOutcome(*error, reasonOf(*error));
     const auto& disk = std::get<MapClaim>(taken);
     const PartitionMap map = disk.readMap();
     const MapReport found = reportOn(map);
     tellMap(map);
     for (const Finding& finding : found.findings)
         tell(finding);
-    if (operation_ == Operation::Repair && found.verdict == MapVerdict::Repairable)
+    if (operation_ == Operation::Repair && found.verdict == MapVerdict::Repairable &&
+        !map.unreadableSector)
         return repair(disk, map, found);
     const Outcome outcome = outcomeOfMapVerification(map, found);
     return operation_ == Operation::Repair && outcome.verdict == Verdict::Damaged

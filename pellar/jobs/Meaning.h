@@ -9,6 +9,7 @@
 namespace pellar {
 
 /// What damage means to the owner of the files, gravest first: English texts, and text keys.
-std::vector<std::string_view> meaningOf(Damage damage);
+/// They speak of a repair only where there is one.
+std::vector<std::string_view> meaningOf(Damage damage, bool canBeRepaired = true);
 
 }  // namespace pellar

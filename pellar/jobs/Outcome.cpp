@@ -51,7 +51,7 @@ std::string_view messageKey(const Outcome& outcome, Operation operation)
 
 Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason)
 {
-    return {Verdict::Failed, code, 0, std::move(reason)};
+    return {Verdict::Failed, code, 0, std::move(reason), {}};
 }
 
 Outcome outcomeWithoutRepair(const Judgement& judgement)
@@ -64,7 +64,7 @@ Outcome outcomeWithoutRepair(const Judgement& judgement)
 
 Outcome outcomeOfVerification(const Judgement& judgement)
 {
-    return {judgement.verdict, judgement.code, judgement.detail, judgement.reason};
+    return {judgement.verdict, judgement.code, judgement.detail, judgement.reason, {}};
 }
 
 bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& confirmation)
@@ -73,7 +73,27 @@ bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& 
            passes.size() < mostRepairPasses && passes.back().judgement.madeProgress;
 }
 
-Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation)
+std::vector<Sentence> lossesOf(const FileCounts& counts)
+{
+    std::vector<Sentence> losses;
+    const bool areCounted = counts.before && counts.after;
+    if (areCounted && *counts.after < *counts.before)
+        losses.push_back(sentenceAbout(
+            *counts.before - *counts.after, "no damage is left, but %1$@ of %2$@ files is gone",
+            "no damage is left, but %1$@ of %2$@ files are gone", std::to_string(*counts.before)));
+    if (counts.reconnected > 0)
+        losses.push_back(
+            sentenceAbout(counts.reconnected, counts.collectedOne, counts.collectedMany));
+    if (counts.cleared > 0 && !areCounted)
+        losses.push_back(sentenceAbout(
+            counts.cleared,
+            "no damage is left, but %1$@ file or name that made no sense had to be cleared",
+            "no damage is left, but %1$@ files or names that made no sense had to be cleared"));
+    return losses;
+}
+
+Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation,
+                        const FileCounts& counts)
 {
     Outcome outcome = outcomeOfVerification(confirmation);
     if (confirmation.verdict == Verdict::Sound &&
@@ -81,8 +101,12 @@ Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& 
         outcome.verdict = Verdict::Repaired;
         if (onlyReplayedJournal(passes))
             outcome.reason = {"its journal was replayed; nothing else was wrong", {}, {}};
+        outcome.warnings = lossesOf(counts);
+        if (!outcome.warnings.empty())
+            outcome.reason = outcome.warnings.front();
     } else if (confirmation.verdict == Verdict::Damaged) {
-        outcome.code = fixwell::kPLErrorNotRepaired;
+        outcome.code =
+            outcome.code == kPLErrorCutShort ? kPLErrorCutShort : fixwell::kPLErrorNotRepaired;
         if (!passes.empty() && passes.back().judgement.verdict == Verdict::Failed)
             outcome.reason = passes.back().judgement.reason;
     }

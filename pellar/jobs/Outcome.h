@@ -7,6 +7,7 @@
 #include "pellar/tools/Operation.h"
 
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -18,6 +19,8 @@ struct Outcome {
     fixwell::ErrorCode code = fixwell::kPLErrorToolFailed;
     std::int32_t detail = 0;
     Sentence reason;
+    /// What a repair cost, to be seen by everybody; `reason` then says the gravest of it.
+    std::vector<Sentence> warnings = {};
 
     friend bool operator==(const Outcome&, const Outcome&) = default;
 };
@@ -28,6 +31,20 @@ struct RepairPass {
     bool replayedJournal = false;
     bool foundProblems = false;
 };
+
+/// What became of the files in a repair, as far as it is known.
+struct FileCounts {
+    std::optional<std::uint64_t> before;
+    std::optional<std::uint64_t> after;
+    std::uint64_t reconnected = 0;
+    std::uint64_t cleared = 0;
+    std::string_view collectedOne = {};  ///< ToolHabits
+    std::string_view collectedMany = {};
+};
+
+/// The losses that a repaired volume is left with, the gravest first; none when nothing is known to
+/// be lost.
+std::vector<Sentence> lossesOf(const FileCounts& counts);
 
 inline constexpr std::size_t mostRepairPasses = 5;
 
@@ -40,7 +57,8 @@ Outcome outcomeWithoutRepair(const Judgement& judgement);
 bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& confirmation);
 
 /// The verification after the passes decides, whatever they said themselves.
-Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation);
+Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation,
+                        const FileCounts& counts = {});
 
 fixwell::Name nameOf(Verdict verdict);
 

@@ -8,11 +8,12 @@
 
 namespace pellar {
 
-ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access,
+ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
                  RunSurroundings surroundings)
     : tool_(tool),
       program_(std::move(program)),
       access_(access),
+      problems_(problems),
       surroundings_(surroundings),
       reader_(tool.makeReader())
 {
@@ -66,6 +67,7 @@ void ToolRun::line(std::string_view line, bool isCut)
 {
     reader_->read(line, lines_);
     tellToolLines();
+    endIfUnreadable();
     if (isCut)
         surroundings_.log.detail(surroundings_.log.text("(The line above was longer and is cut.)"));
 }
@@ -89,10 +91,17 @@ bool ToolRun::isUnstoppable() const
     return access_ == Access::ReadWrite && !tool_.habits.endsInOrder;
 }
 
-/// The verification before the repair has shown them.
-bool ToolRun::areProblemsKnown() const
+/// What is written where the disk fails is written without knowing what it replaces. A tool that
+/// leaves the disk in order is ended; the others give up by themselves, or are let come to their
+/// end.
+void ToolRun::endIfUnreadable()
 {
-    return access_ == Access::ReadWrite && tool_.habits.isLookedAtBeforeRepair;
+    const auto& fault = reader_->findings().readFault;
+    if (isEnded_ || access_ == Access::ReadOnly || !tool_.habits.endsInOrder || !fault ||
+        fault->isUnproven)
+        return;
+    isEnded_ = true;
+    surroundings_.stop.press();
 }
 
 void ToolRun::stopAsked()
@@ -113,7 +122,7 @@ void ToolRun::tellToolLines()
         switch (line.kind) {
             case ToolLine::Kind::Phase: log.step(stepType(), log.text(line.phaseKey)); break;
             case ToolLine::Kind::Problem:
-                areProblemsKnown() ? log.detail(text) : log.problem(text);
+                problems_ == Problems::Kept ? log.detail(text) : log.problem(text);
                 break;
             case ToolLine::Kind::Detail: log.detail(text); break;
             case ToolLine::Kind::Progress: log.progress(line.percent); break;

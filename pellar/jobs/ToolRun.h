@@ -24,7 +24,11 @@ struct RunSurroundings {
 /// gathers what they say.
 class ToolRun final : private RunListener {
 public:
-    ToolRun(const Tool& tool, std::filesystem::path program, Access access,
+    /// How the problems are shown that it tells of: as such, or, where the run before has shown
+    /// them, or the one behind it will, among the details.
+    enum class Problems { Shown, Kept };
+
+    ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
             RunSurroundings surroundings);
 
     /// Runs the tool to its end. `volume` is what was seen of the disk before.
@@ -33,7 +37,7 @@ public:
 private:
     RunRequest requestFor(const DiskForTool& disk) const;
     bool isUnstoppable() const;
-    bool areProblemsKnown() const;
+    void endIfUnreadable();
     void tellEndOf(const RunResult& result);
     void tellToolLines();
     fixwell::Name stepType() const;
@@ -48,9 +52,11 @@ private:
     const Tool& tool_;
     std::filesystem::path program_;
     Access access_;
+    Problems problems_;
     RunSurroundings surroundings_;
     std::unique_ptr<OutputReader> reader_;
     std::vector<ToolLine> lines_;
+    bool isEnded_ = false;  ///< by us, because of the disk
 };
 
 }  // namespace pellar

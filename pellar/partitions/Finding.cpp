@@ -52,6 +52,9 @@ constexpr std::array findings{
     KnownFinding{ProtectiveWrongSize, Repairable, "The protective MBR states a wrong size."},
     KnownFinding{ProtectiveWrongStart, Repairable,
                  "The protective MBR does not begin where it should."},
+    KnownFinding{ProtectiveReplaced, NeedsPerson,
+                 "Two maps contradict each other: a GUID partition table in good order, and an MBR "
+                 "with one partition over the whole disk in place of the protective one."},
     KnownFinding{Hybrid, Note,
                  "The disk has a hybrid MBR: some partitions are listed there as well. It is left "
                  "as it is."},

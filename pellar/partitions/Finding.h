@@ -35,6 +35,7 @@ enum class FindingKind {
     ProtectiveMissing,
     ProtectiveWrongSize,
     ProtectiveWrongStart,
+    ProtectiveReplaced,
     Hybrid,
     Remnants,
     EndBeforeStart,

@@ -4,6 +4,7 @@
 #include "pellar/partitions/Extents.h"
 
 #include <algorithm>
+#include <limits>
 
 namespace pellar {
 namespace {
@@ -83,6 +84,16 @@ void addChain(const MBRPartitions& mbr, Findings& findings)
     }
 }
 
+/// It takes the place of the protective entry: from the first sector to the last, or as far as an
+/// MBR counts, before a GUID partition table that is good in both copies.
+bool hasReplacedProtective(const PartitionMap& map)
+{
+    constexpr std::uint64_t greatest = std::numeric_limits<std::uint32_t>::max();
+    const std::vector<MBRPartition>& partitions = map.mbr.partitions;
+    return map.hasCopiesInPlace() && partitions.size() == 1 && partitions.front().first == 1 &&
+           partitions.front().count() >= std::min(map.lastSector(), greatest);
+}
+
 }  // namespace
 
 std::vector<Finding> mbrFindings(const PartitionMap& map)
@@ -96,7 +107,9 @@ std::vector<Finding> mbrFindings(const PartitionMap& map)
     addOverlaps(partitions, true, findings);
     addLogicalPlaces(partitions, findings);
     addChain(map.mbr, findings);
-    if (map.primary.header.hasSignature() || map.backup.header.hasSignature())
+    if (hasReplacedProtective(map))
+        findings.push_back({FindingKind::ProtectiveReplaced, {}});
+    else if (map.primary.header.hasSignature() || map.backup.header.hasSignature())
         findings.push_back({FindingKind::Remnants, {}});
     return findings;
 }

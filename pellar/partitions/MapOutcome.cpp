@@ -3,6 +3,8 @@
 
 #include "pellar/ErrorCodes.h"
 
+#include <cerrno>
+
 namespace pellar {
 namespace {
 
@@ -24,35 +26,41 @@ std::string_view messageKey(Verdict verdict, bool isRepair)
                     : "cannot verify the partition map of “%1$@”: %2$@";
 }
 
-// A disk that cannot be read is not one without a map.
-Outcome outcomeWithoutMap(const PartitionMap& map)
+Outcome unreadableMap(std::uint64_t sector)
 {
-    if (!map.boot.isReadable)
-        return {Verdict::Failed,
-                fixwell::kPLErrorCannotOpen,
-                0,
-                {"the start of the disk cannot be read", {}, {}}};
-    return {Verdict::Failed, kPLErrorNoPartitionMap, 0, {"there is no partition map", {}, {}}};
+    return {Verdict::Failed,
+            kPLErrorUnreadable,
+            EIO,
+            {"sector %1$@ cannot be read; copy the disk to another one first (ddrescue)",
+             std::to_string(sector),
+             {}},
+            {}};
 }
 
 }  // namespace
 
 Outcome outcomeOfMapVerification(const PartitionMap& map, const MapReport& report)
 {
+    // What cannot be read is neither damaged nor missing.
+    if (map.unreadableSector)
+        return unreadableMap(*map.unreadableSector);
     switch (report.verdict) {
-        case MapVerdict::None: return outcomeWithoutMap(map);
-        case MapVerdict::Sound: return {Verdict::Sound, fixwell::kPLNoError, 0, {}};
+        case MapVerdict::None:
+            return failedOutcome(kPLErrorNoPartitionMap, {"there is no partition map", {}, {}});
+        case MapVerdict::Sound: return {Verdict::Sound, fixwell::kPLNoError, 0, {}, {}};
         case MapVerdict::Repairable:
             return {Verdict::Damaged,
                     kPLErrorMapDamaged,
                     0,
-                    {"a repair can restore it from the copy that is sound", {}, {}}};
+                    {"a repair can restore it from the copy that is sound", {}, {}},
+                    {}};
         case MapVerdict::NeedsPerson: break;
     }
     return {Verdict::Damaged,
             kPLErrorMapNeedsPerson,
             0,
-            {"only a person can decide what is right, so no repair will touch it", {}, {}}};
+            {"only a person can decide what is right, so no repair will touch it", {}, {}},
+            {}};
 }
 
 Outcome outcomeOfMapRepair(const PartitionMap& map, const MapReport& confirmation)
@@ -64,13 +72,14 @@ Outcome outcomeOfMapRepair(const PartitionMap& map, const MapReport& confirmatio
         outcome = {Verdict::Damaged,
                    kPLErrorMapNotRepaired,
                    0,
-                   {"it was written, but is still damaged", {}, {}}};
+                   {"it was written, but is still damaged", {}, {}},
+                   {}};
     return outcome;
 }
 
 Outcome outcomeOfRefusedRepair(Sentence reason)
 {
-    return {Verdict::Damaged, kPLErrorMapNotRepaired, 0, std::move(reason)};
+    return {Verdict::Damaged, kPLErrorMapNotRepaired, 0, std::move(reason), {}};
 }
 
 Sentence mapMessageOf(const Outcome& outcome, Operation operation, const std::string& diskName,

@@ -9,6 +9,37 @@
 namespace pellar {
 namespace {
 
+/// Notes what is on the disk and cannot be read all the same.
+class NotingSectors final : public Sectors {
+public:
+    NotingSectors(const Sectors& sectors, std::optional<std::uint64_t>& unreadable)
+        : sectors_(sectors), unreadable_(unreadable)
+    {
+    }
+
+    std::uint32_t sectorBytes() const override { return sectors_.sectorBytes(); }
+    std::uint64_t count() const override { return sectors_.count(); }
+    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override
+    {
+        auto bytes = sectors_.read(first, number);
+        if (!bytes && !unreadable_ && isOnDisk(first, number, count()))
+            unreadable_ = firstUnreadable(first, number);
+        return bytes;
+    }
+
+private:
+    std::uint64_t firstUnreadable(std::uint64_t first, std::uint64_t number) const
+    {
+        for (std::uint64_t i = 0; i < number; ++i)
+            if (!sectors_.read(first + i, 1))
+                return first + i;
+        return first;
+    }
+
+    const Sectors& sectors_;
+    std::optional<std::uint64_t>& unreadable_;
+};
+
 GPTCopy readCopy(const Sectors& sectors, std::uint64_t place)
 {
     GPTCopy copy;
@@ -99,10 +130,11 @@ bool PartitionMap::hasCopiesInPlace() const
     return primary.isGood() && backup.isGood() && backupPlace == lastSector();
 }
 
-PartitionMap readPartitionMap(const Sectors& sectors, std::string wholeSignature)
+PartitionMap readPartitionMap(const Sectors& disk, std::string wholeSignature)
 {
     constexpr std::uint64_t fewestSectors = 2;
     PartitionMap map;
+    const NotingSectors sectors(disk, map.unreadableSector);
     map.sectorBytes = sectors.sectorBytes();
     map.sectorCount = sectors.count();
     map.wholeSignature = std::move(wholeSignature);

@@ -4,6 +4,7 @@
 #include "pellar/partitions/GPTEntries.h"
 #include "pellar/partitions/MBR.h"
 
+#include <optional>
 #include <string>
 
 namespace pellar {
@@ -36,6 +37,7 @@ struct PartitionMap {
     MBRPartitions mbr;  ///< of an MBR only
     GPTCopy primary;
     GPTCopy backup;
+    std::optional<std::uint64_t> unreadableSector;  ///< the first of those that were looked for
     std::uint64_t backupPlace = 0;  ///< where the backup's header was looked for last
 
     std::uint64_t lastSector() const { return sectorCount - 1; }
@@ -46,7 +48,7 @@ struct PartitionMap {
 };
 
 /// Reads the map, from a few sectors at the start and the end of the disk.
-[[nodiscard]] PartitionMap readPartitionMap(const Sectors& sectors, std::string wholeSignature);
+[[nodiscard]] PartitionMap readPartitionMap(const Sectors& disk, std::string wholeSignature);
 
 /// A header of a GUID partition table stands at the start or the end, whether or not it is sound.
 [[nodiscard]] bool hasGPTHeader(const Sectors& sectors);

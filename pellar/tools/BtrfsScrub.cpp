@@ -134,6 +134,8 @@ Judgement judgeScrub(const RunResult& result, const ScrubReport& report, std::si
         return *judgement;
     constexpr int foundUncorrectable = 3;
     const int status = std::get<Exited>(result.ending).status;
+    if (report.unreadable > 0)
+        return unreadable(std::nullopt);
     if (report.hasDamage() || status == foundUncorrectable)
         return damaged(status, reasonOfDamage(report));
     if (report.foundOther)

@@ -2,6 +2,7 @@
 #include "pellar/tools/Capability.h"
 
 #include "fixwell/host/foundation/UTF8.h"
+#include "pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -38,7 +39,7 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
                 {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
                 {}};
     if (operation == Operation::Repair && !tool->canRepair())
-        return {fixwell::kPLErrorUnsupported, tool->reasonAgainstRepair, {}};
+        return {kPLErrorNoRepairHere, tool->reasonAgainstRepair, {}};
     // A repair is confirmed by verifying, so it needs both.
     std::filesystem::path program = findProgram(tool->name, toolPath);
     if (program.empty())

@@ -28,15 +28,16 @@ Judgement judgeStatus(int status, const RunEvidence& evidence)
     if ((status & cancelledByUser) != 0)
         return stopped(status);
     if (found.crashSignal != 0)
-        return failed(status,
-                      {"%1$@ crashed (signal %2$@)", "e2fsck", std::to_string(found.crashSignal)});
+        return brokenOff(
+            evidence, status,
+            {"%1$@ crashed (signal %2$@)", "e2fsck", std::to_string(found.crashSignal)});
     if ((status & (usageError | libraryError)) != 0 || (status & ~knownBits) != 0)
-        return failed(status, statusReason);
+        return brokenOff(evidence, status, statusReason);
     if (found.foundDiskInUse && (status & operationalError) != 0)
         return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
     // The file is shorter than the file system: no journal can make up for that.
     if (evidence.volume.isCutShort())
-        return damaged(status);
+        return cutShort(status);
     if (found.lacksExternalJournal)
         return inconclusive(status,
                             {"its journal is kept on another disk, which was not found", {}, {}});
@@ -87,6 +88,11 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     facts.hasPrimary = superblock && !superblock->isBackup;
     facts.volumeBytes = superblock ? superblock->volumeBytes() : 0;
     facts.needsRecovery = facts.hasPrimary && superblock->needsRecovery;
+    facts.blockBytes = superblock ? superblock->blockBytes : 0;
+    if (superblock)
+        facts.backups = superblock->backups(availableBytes);
+    if (facts.hasPrimary && !superblock->needsRecovery)
+        facts.files = countExtFiles(disk, offset, *superblock);
     if (!facts.hasPrimary && availableBytes > 0) {
         const Signature signature = probeSignature(disk, offset, availableBytes);
         const bool isExt = signature.type.starts_with("ext") || signature.type.empty();
@@ -126,7 +132,7 @@ const Tool& e2fsck()
         .package = "e2fsprogs",
         .habits = {.takesOffset = true,
                    .wantsTerminal = false,
-                   .isLookedAtBeforeRepair = false,
+                   .replaysInRepair = true,
                    .endsInOrder = true,
                    .logReplayedAs = {}},
         .examine = examine,

@@ -87,6 +87,39 @@ bool isSavingOnly(std::string_view text)
            (text.starts_with(") could be narrower.") || text.starts_with(") could be shorter."));
 }
 
+/// "11/2048 files": how many are in use.
+std::optional<std::uint64_t> filesIn(std::string_view tally)
+{
+    std::uint64_t files = 0;
+    const auto [end, error] = std::from_chars(tally.data(), tally.data() + tally.size(), files);
+    return error == std::errc() ? std::optional(files) : std::nullopt;
+}
+
+/// What e2fsck or its library says where it could not read:
+///     "Error reading block 357 (Input/output error).  Ignore error? no"
+///     "Error while iterating over blocks in inode 7: Input/output error"
+///     "NAME: Input/output error reading journal superblock"
+///     "e2fsck: Input/output error while trying to open NAME"
+/// or, in the first form, "(Attempt to read block from filesystem resulted in short read)". Names
+/// of files stand in none of them.
+std::optional<ReadFault> readFaultIn(std::string_view line)
+{
+    constexpr std::string_view inputError = "Input/output error";
+    std::string_view rest = line;
+    if (take(rest, "Error reading block ")) {
+        ReadFault fault;
+        std::uint64_t block = 0;
+        const auto [end, error] = std::from_chars(rest.data(), rest.data() + rest.size(), block);
+        if (error == std::errc())
+            fault.block = block;
+        fault.isUnproven = rest.find(inputError) == std::string_view::npos;
+        return fault;
+    }
+    const bool isFault = behindVolumeName(line).starts_with(inputError) ||
+                         (line.starts_with("Error while ") && line.ends_with(inputError));
+    return isFault ? std::optional(ReadFault()) : std::nullopt;
+}
+
 /// "e2fsck 1.47.0 (5-Feb-2023)": the first line of every run.
 bool isBanner(std::string_view text)
 {
@@ -127,6 +160,8 @@ void E2fsckOutput::read(std::string_view line, std::vector<ToolLine>& lines)
         releaseKept(Kind::Detail, lines);
         return;
     }
+    if (!findings_.readFault)
+        findings_.readFault = readFaultIn(line);
     const Answer answer = answerOf(line);
     const bool isSecondQuestion = wasAnswered_ && kept_.empty() && isBareAnswer(line);
     wasAnswered_ = answer != Answer::None;
@@ -167,21 +202,29 @@ bool E2fsckOutput::readTrouble(std::string_view line)
         findings_.crashSignal = signal;
     findings_.foundDiskInUse = findings_.foundDiskInUse || isInUse;
     findings_.lacksExternalJournal = findings_.lacksExternalJournal || lacksJournal;
-    if (line.starts_with("e2fsck: Superblock invalid, ")) {
+    // It asks nothing there, and ends with 0 although it writes.
+    const bool isClearedJournal =
+        line == "Found invalid V2 journal superblock fields (from V1 journal).";
+    if (line.starts_with("e2fsck: Superblock invalid, ") || isClearedJournal) {
         ++findings_.problems;
         findings_.damage.add(Damage::Structure);
     }
-    return signal != 0 || isInUse || lacksJournal || line.starts_with("e2fsck: ") ||
-           line.starts_with("ext2fs_");
+    return signal != 0 || isClearedJournal || isInUse || lacksJournal ||
+           line.starts_with("e2fsck: ") || line.starts_with("ext2fs_");
 }
 
 bool E2fsckOutput::readRemark(std::string_view line)
 {
     const std::string_view named = behindVolumeName(line);
-    if (isTally(named))
+    if (isTally(named)) {
         findings_.isComplete = true;
-    else if (named == "***** FILE SYSTEM WAS MODIFIED *****")
+        // It repeats what the volume's books say, which are wrong where anything is.
+        if (findings_.problems == findings_.corrections)
+            findings_.files = filesIn(named);
+    } else if (named == "***** FILE SYSTEM WAS MODIFIED *****")
         findings_.wasModified = true;
+    else if (line == "Clearing fields beyond the V1 journal superblock...")
+        ++findings_.corrections;
     else if (named == "********** WARNING: Filesystem still has errors **********")
         findings_.hasErrorsLeft = true;
     else if (named == "recovering journal")
@@ -197,13 +240,25 @@ void E2fsckOutput::readAnswer(std::string_view line, bool isYes, std::vector<Too
 {
     const bool hasItsText = !isBareAnswer(line) || kept_.empty();
     const bool isProblem = !isSavingOnly(line);
+    const std::string_view problem = hasItsText ? line : std::string_view(kept_.front());
     if (isProblem)
-        findings_.damage.add(e2fsckDamageOf(hasItsText ? line : std::string_view(kept_.front())));
+        findings_.damage.add(e2fsckDamageOf(problem));
+    if (isYes)
+        countLosses(problem, line);
     releaseKept(hasItsText ? Kind::Detail : Kind::Problem, lines);
     lines.push_back(
         {hasItsText && isProblem ? Kind::Problem : Kind::Detail, std::string(line), {}});
     findings_.problems += isProblem ? 1 : 0;
     findings_.corrections += isProblem && isYes ? 1 : 0;
+}
+
+/// "Connect to /lost+found? yes", "Clear inode? yes", "Clear? yes" of a file or a name.
+void E2fsckOutput::countLosses(std::string_view problem, std::string_view answer)
+{
+    const bool isAboutFile = problem.starts_with("Inode ") || problem.starts_with("Entry ");
+    const bool isCleared = answer.ends_with("Clear? yes") || answer.ends_with("Clear inode? yes");
+    findings_.reconnected += answer.ends_with("Connect to /lost+found? yes") ? 1 : 0;
+    findings_.cleared += isAboutFile && isCleared ? 1 : 0;
 }
 
 void E2fsckOutput::keepBack(std::string_view line, std::vector<ToolLine>& lines)

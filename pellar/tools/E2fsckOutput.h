@@ -9,7 +9,7 @@
 
 namespace pellar {
 
-/// Reads what e2fsck 1.47.0 prints in the C locale.
+/// Reads what e2fsck 1.47 prints in the C locale.
 ///
 /// A problem is a line that ends in a question with its answer,
 ///     "Inode 16 ref count is 9, should be 1.  Fix? no"
@@ -30,6 +30,7 @@ private:
     bool readTrouble(std::string_view line);
     bool readRemark(std::string_view line);
     void readAnswer(std::string_view line, bool isYes, std::vector<ToolLine>& lines);
+    void countLosses(std::string_view problem, std::string_view answer);
     void keepBack(std::string_view line, std::vector<ToolLine>& lines);
     void releaseKept(ToolLine::Kind firstKind, std::vector<ToolLine>& lines);
 

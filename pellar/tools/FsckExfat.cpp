@@ -6,6 +6,8 @@
 #include "pellar/volumes/ExfatBootSector.h"
 
 #include <array>
+#include <cinttypes>
+#include <cstdio>
 
 namespace pellar {
 namespace {
@@ -37,6 +39,8 @@ class ExfatOutput final : public LineOutput {
     {
         if (line.starts_with("/proc/self/fd/"))
             return tally(line);
+        if (line.starts_with("failed to read "))
+            noteReadFault({std::nullopt, std::nullopt, true});
         const DamageSign* const sign = damageIn(signs, line);
         if (sign == nullptr)
             return detail(line);
@@ -50,7 +54,22 @@ class ExfatOutput final : public LineOutput {
         const bool isClean = line.find(": clean. directories ") != std::string_view::npos;
         findings_.hasErrorsLeft = findings_.hasErrorsLeft || isCorrupted;
         findings_.isComplete = findings_.isComplete || isCorrupted || isClean;
+        if (findings_.isComplete)
+            findings_.files = filesIn(std::string(line));
         return detail(line);
+    }
+
+    /// "NAME: clean. directories 1, files 0"
+    static std::optional<std::uint64_t> filesIn(const std::string& tally)
+    {
+        std::uint64_t directories = 0;
+        std::uint64_t files = 0;
+        const std::size_t start = tally.rfind("directories ");
+        const bool isCount =
+            start != std::string::npos &&
+            std::sscanf(tally.c_str() + start, "directories %" SCNu64 ", files %" SCNu64,
+                        &directories, &files) == 2;
+        return isCount ? std::optional(directories + files) : std::nullopt;
     }
 };
 

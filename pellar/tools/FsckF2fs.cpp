@@ -44,6 +44,9 @@ class F2fsOutput final : public LineOutput {
         // Data that was written after the last checkpoint waits to be rolled forward.
         if (line.starts_with(state) && line.find(" unmount") == std::string_view::npos)
             findings_.skippedJournal = true;
+        if (line.starts_with("[ASSERT]") && (line.find("dev_read") != std::string_view::npos ||
+                                             line.find("read NAT bits") != std::string_view::npos))
+            noteReadFault({std::nullopt, std::nullopt, true});
         if (!tellsOfDamage(line))
             return detail(line);
         const DamageSign* const sign = damageIn(signs, line);

@@ -6,6 +6,8 @@
 #include "pellar/volumes/FatBootSector.h"
 
 #include <array>
+#include <cinttypes>
+#include <cstdio>
 
 namespace pellar {
 namespace {
@@ -47,6 +49,41 @@ constexpr std::array signs{
 
 constexpr std::array bootDetails{"Root directory start", "Data area starts", "First FAT starts"};
 
+/// "Read 512 bytes at 16384:Input/output error", or less of it came: "Got 1024 bytes instead of
+/// 4096 at 16384".
+std::optional<ReadFault> readFaultIn(const std::string& line)
+{
+    std::uint64_t count = 0;
+    std::uint64_t wanted = 0;
+    std::uint64_t place = 0;
+    if (std::sscanf(line.c_str(), "Read %" SCNu64 " bytes at %" SCNu64 ":", &wanted, &place) == 2)
+        return ReadFault{place, std::nullopt, false};
+    if (std::sscanf(line.c_str(), "Got %" SCNu64 " bytes instead of %" SCNu64 " at %" SCNu64,
+                    &count, &wanted, &place) == 3)
+        return ReadFault{place + count, std::nullopt, true};
+    return std::nullopt;
+}
+
+/// "NAME: 2 files, 1/10211 clusters"
+std::optional<std::uint64_t> filesIn(const std::string& tally)
+{
+    std::uint64_t files = 0;
+    const std::size_t end = tally.find(": ");
+    const bool isCount = end != std::string::npos &&
+                         std::sscanf(tally.c_str() + end + 2, "%" SCNu64 " files", &files) == 1;
+    return isCount ? std::optional(files) : std::nullopt;
+}
+
+/// "Reclaimed 12 unused clusters (24576 bytes) in 2 chains."
+std::uint64_t reclaimedIn(const std::string& line)
+{
+    std::uint64_t chains = 0;
+    const std::size_t start = line.find(") in ");
+    if (line.starts_with("Reclaimed ") && start != std::string::npos)
+        std::sscanf(line.c_str() + start, ") in %" SCNu64 " chain", &chains);
+    return chains;
+}
+
 /// Reads what fsck.fat 4.2 -v prints. What is wrong with a file stands below its path:
 ///     /FILE.TXT
 ///       File size is 5000 bytes, cluster chain length is 2048 bytes.
@@ -59,6 +96,11 @@ class FatOutput final : public LineOutput {
         const bool isTally = line.starts_with("/proc/self/fd/") && line.ends_with(" clusters");
         wasPath_ = line.starts_with('/') && !isTally;
         findings_.isComplete = findings_.isComplete || isTally;
+        if (isTally)
+            findings_.files = filesIn(std::string(line));
+        if (const auto fault = readFaultIn(std::string(line)))
+            noteReadFault(*fault);
+        findings_.reconnected += reclaimedIn(std::string(line));
         findings_.wasModified = findings_.wasModified || line == "*** Filesystem was changed ***";
         if (const PhaseSign* const sign = phaseIn(phases, line))
             return phase(line, sign->key);
@@ -121,6 +163,10 @@ const Tool& fsckFat()
         .name = name,
         .repairName = name,
         .package = "dosfstools",
+        .habits = {.collectedOne =
+                       "no damage is left; lost parts were made into %1$@ file (FSCK0000.REC)",
+                   .collectedMany = "no damage is left; lost parts were made into %1$@ files "
+                                    "(FSCK0000.REC and so on)"},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<FatOutput>,

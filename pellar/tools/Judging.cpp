@@ -1,7 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Judging.h"
 
+#include "pellar/ErrorCodes.h"
+#include "pellar/volumes/DiskBytes.h"
+
 #include <algorithm>
+#include <cerrno>
 #include <cstring>
 #include <string>
 
@@ -19,6 +23,29 @@ Judgement judgementOfEnded(const RunEvidence& evidence, std::string_view tool)
     if (hasDamage(evidence))
         return damaged(0, reason);
     return failed(0, reason, fixwell::kPLErrorToolMisbehaved);
+}
+
+bool hasFindings(const RunEvidence& evidence)
+{
+    return evidence.findings.problems > 0 || evidence.findings.hasErrorsLeft;
+}
+
+/// What was named before the tool broke off is damage, unless a log that waits may put it right.
+bool hasSeenDamage(const RunEvidence& evidence)
+{
+    return evidence.access == Access::ReadOnly && hasDamage(evidence) &&
+           !evidence.findings.skippedJournal && !evidence.volume.needsRecovery;
+}
+
+/// What the tool could not read because of the disk.
+std::optional<Judgement> judgementOfReading(const RunEvidence& evidence)
+{
+    const auto& fault = evidence.findings.readFault;
+    if (!fault || fault->isUnproven)
+        return std::nullopt;
+    if (fault->block && evidence.volume.blockBytes > 0)
+        return unreadable(productOrGreatest(*fault->block, evidence.volume.blockBytes));
+    return unreadable(fault->byte);
 }
 
 /// Why nothing that the tool says can decide; none when it can.
@@ -45,6 +72,14 @@ Judgement damaged(std::int32_t detail, Sentence reason)
     return {Verdict::Damaged, fixwell::kPLErrorDamaged, detail, std::move(reason)};
 }
 
+Judgement cutShort(std::int32_t detail)
+{
+    return {Verdict::Damaged,
+            kPLErrorCutShort,
+            detail,
+            {"its end is missing, and a repair would throw away what lies there", {}, {}}};
+}
+
 Judgement inconclusive(std::int32_t detail, Sentence reason)
 {
     return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, detail, std::move(reason)};
@@ -60,25 +95,53 @@ Judgement failed(std::int32_t detail, Sentence reason, fixwell::ErrorCode code)
     return {Verdict::Failed, code, detail, std::move(reason)};
 }
 
+Judgement unreadable(std::optional<std::uint64_t> byte)
+{
+    const Sentence reason =
+        byte ? Sentence{"the disk cannot be read at byte %1$@ of the volume; copy it to another "
+                        "disk first (ddrescue)",
+                        std::to_string(*byte),
+                        {}}
+             : Sentence{"the disk cannot be read in places; copy it to another disk first "
+                        "(ddrescue)",
+                        {},
+                        {}};
+    return failed(EIO, reason, kPLErrorUnreadable);
+}
+
+Judgement brokenOff(const RunEvidence& evidence, std::int32_t detail, Sentence reason)
+{
+    if (evidence.volume.isCutShort())
+        return cutShort(detail);
+    return hasSeenDamage(evidence) ? damaged(detail, std::move(reason))
+                                   : failed(detail, std::move(reason));
+}
+
 bool hasDamage(const RunEvidence& evidence)
 {
-    return evidence.findings.problems > 0 || evidence.findings.hasErrorsLeft ||
-           evidence.volume.isCutShort();
+    return hasFindings(evidence) || evidence.volume.isCutShort() ||
+           evidence.volume.differsFromBackup;
 }
 
 std::optional<Judgement> judgementOfEnding(const RunEvidence& evidence, std::string_view tool)
 {
     const Ending& ending = evidence.result.ending;
-    if (evidence.result.cause == StopCause::User)
+    auto ofReading = judgementOfReading(evidence);
+    // A repair that met an unreadable place is ended by us, as if by the user.
+    if (evidence.result.cause == StopCause::User &&
+        (!ofReading || evidence.access == Access::ReadOnly))
         return stopped(0);
     if (const auto* const notStarted = std::get_if<NotStarted>(&ending))
         return failed(notStarted->error, {"%1$@ could not be started: %2$@", std::string(tool),
                                           ::strerrordesc_np(notStarted->error)});
+    if (ofReading)
+        return ofReading;
     if (evidence.result.cause != StopCause::None)
         return judgementOfEnded(evidence, tool);
     if (const auto* const killed = std::get_if<Killed>(&ending))
-        return failed(killed->signal, {"%1$@ was killed (signal %2$@)", std::string(tool),
-                                       std::to_string(killed->signal)});
+        return brokenOff(
+            evidence, killed->signal,
+            {"%1$@ was killed (signal %2$@)", std::string(tool), std::to_string(killed->signal)});
     return std::nullopt;
 }
 
@@ -102,11 +165,13 @@ Judgement judgeVerification(int status, const RunEvidence& evidence, const ExitM
     if (evidence.findings.foundDiskInUse && status != 0)
         return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
     if (volume.isCutShort())  // no log can make up for what is not there
-        return damaged(status);
+        return cutShort(status);
     if (const auto reason = obstacle(evidence))
         return inconclusive(status, *reason);
     if (!volume.hasPrimary)
         return damaged(status, {"its first superblock is lost; a copy of it was found", {}, {}});
+    if (volume.differsFromBackup && !hasFindings(evidence))
+        return damaged(status, {"its boot sector and the backup of it differ", {}, {}});
     if (hasDamage(evidence) || (saysDamaged && evidence.findings.isComplete))
         return damaged(status);
     if (status != 0)

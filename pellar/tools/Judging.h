@@ -12,10 +12,19 @@ namespace pellar {
 
 Judgement sound(std::int32_t detail);
 Judgement damaged(std::int32_t detail, Sentence reason = {});
+/// The volume is longer than what is there of it.
+Judgement cutShort(std::int32_t detail);
 Judgement inconclusive(std::int32_t detail, Sentence reason);
 Judgement stopped(std::int32_t detail);
 Judgement failed(std::int32_t detail, Sentence reason,
                  fixwell::ErrorCode code = fixwell::kPLErrorToolFailed);
+
+/// The disk cannot be read at this byte of the volume, where that is known.
+Judgement unreadable(std::optional<std::uint64_t> byte);
+
+/// The tool crashed or gave up: damaged by what it had named before, where that stands, else
+/// failed.
+Judgement brokenOff(const RunEvidence& evidence, std::int32_t detail, Sentence reason);
 
 /// The tool found something, or we did.
 bool hasDamage(const RunEvidence& evidence);

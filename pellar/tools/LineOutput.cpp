@@ -26,6 +26,12 @@ ToolLine LineOutput::progress(double percent)
     return {Kind::Progress, {}, {}, percent};
 }
 
+void LineOutput::noteReadFault(const ReadFault& fault)
+{
+    if (!findings_.readFault || (findings_.readFault->isUnproven && !fault.isUnproven))
+        findings_.readFault = fault;
+}
+
 ToolLine LineOutput::problem(std::string_view line, Damage damage)
 {
     ++findings_.problems;

@@ -20,6 +20,8 @@ protected:
     static ToolLine phase(std::string_view line, std::string_view key);
     static ToolLine progress(double percent);
     ToolLine problem(std::string_view line, Damage damage);
+    /// Kept unless there is one, or one that is less sure.
+    void noteReadFault(const ReadFault& fault);
 
     Findings findings_;
 };

@@ -8,6 +8,8 @@
 
 #include <array>
 #include <charconv>
+#include <cinttypes>
+#include <cstdio>
 
 namespace pellar {
 namespace {
@@ -71,14 +73,30 @@ class NtfsOutput final : public LineOutput {
         if (line.starts_with("Collecting resizing constraints"))
             findings_.isComplete = true;
         if (line.starts_with("Correcting differences in") ||
-            line.starts_with("The boot sector has been rewritten"))
+            line.starts_with("The boot sector has been rewritten") ||
+            line == "Checking the alternate boot sector... FIXED")
             ++findings_.corrections;
+        noteReading(std::string(line));
         if (line.find("NTFS is inconsistent") != std::string_view::npos)
             findings_.hasErrorsLeft = true;
         if (line.find("is hibernated") != std::string_view::npos ||
             line.find("unclean file system") != std::string_view::npos)
             findings_.skippedJournal = true;
     }
+
+    // "Input/output error" by itself it also says of records that make no sense. The size of a file
+    // it finds out by reading, and takes a bad place for the end.
+    void noteReading(const std::string& line)
+    {
+        std::sscanf(line.c_str(), "Current device size: %" SCNu64 " bytes", &readableBytes_);
+        if (line.ends_with("pread failed: Input/output error") ||
+            line == "Error reading bootsector: Input/output error")
+            noteReadFault({});
+        else if (line.find("volume size is bigger than the device size") != std::string::npos)
+            noteReadFault({readableBytes_, std::nullopt, true});
+    }
+
+    std::uint64_t readableBytes_ = 0;
 };
 
 constexpr std::array damagedStatuses{1};
@@ -98,7 +116,9 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
     checked.volume.isMarkedDirty = checked.volume.needsRecovery = false;
     Judgement judgement = judgeVerification(statusWithoutResizing(status, evidence.findings),
                                             checked, {name, damagedStatuses});
-    if (judgement.verdict == Verdict::Damaged)
+    const bool isBackupAlone =
+        evidence.volume.differsFromBackup && evidence.findings.problems == 0 && status == 0;
+    if (judgement.code == fixwell::kPLErrorDamaged && !isBackupAlone)
         judgement.reason = ownSystem;
     // The mark, and a journal that goes with it, are for its own system to deal with: nothing here
     // knows what a check by that would find.
@@ -122,6 +142,8 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     const auto sector = readNtfsBootSector(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(sector, "ntfs", disk, offset, availableBytes);
     facts.volumeBytes = sector ? sector->volumeBytes : 0;
+    facts.differsFromBackup =
+        facts.hasPrimary && !facts.isCutShort() && differsFromNtfsBackup(disk, offset, *sector);
     facts.isMarkedDirty = sector && isNtfsMarkedDirty(disk, offset, *sector).value_or(false);
     facts.needsRecovery = sector && hasNtfsJournalWaiting(disk, offset, *sector).value_or(false);
     return facts;

@@ -5,6 +5,7 @@
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/tools/Damage.h"
 #include "pellar/tools/Judgement.h"
+#include "pellar/volumes/Readability.h"
 
 #include <cstdint>
 #include <memory>
@@ -33,6 +34,16 @@ struct ToolLine {
     friend bool operator==(const ToolLine&, const ToolLine&) = default;
 };
 
+/// What a tool could not read.
+struct ReadFault {
+    std::optional<std::uint64_t> byte;   ///< from the volume's start, where that is said
+    std::optional<std::uint64_t> block;  ///< or this, of `VolumeFacts::blockBytes`
+    /// It does not say whether the disk failed it or it looked in a wrong place; the kernel knows.
+    bool isUnproven = false;
+
+    friend bool operator==(const ReadFault&, const ReadFault&) = default;
+};
+
 /// What the lines of one run say together.
 struct Findings {
     std::uint64_t problems = 0;     ///< problem lines
@@ -46,7 +57,12 @@ struct Findings {
     bool lacksExternalJournal = false;
     bool lacksOtherDisk = false;  ///< a part of the volume is on a disk that was not found
     bool foundDiskInUse = false;
-    int crashSignal = 0;  ///< caught by the tool itself; 0 for none
+    bool expectsDifference = false;  ///< in what is no damage, and so no matter of its exit status
+    int crashSignal = 0;             ///< caught by the tool itself; 0 for none
+    std::optional<ReadFault> readFault;  ///< the first
+    std::optional<std::uint64_t> files;  ///< that it counted, where it says so at its end
+    std::uint64_t reconnected = 0;       ///< files that it gave a new name, as they had none
+    std::uint64_t cleared = 0;           ///< files and names that it did away with
 
     friend bool operator==(const Findings&, const Findings&) = default;
 };
@@ -72,6 +88,11 @@ struct VolumeFacts {
     bool isMarkedDirty = false;     ///< it says itself that it was not properly unmounted
     std::uint64_t volumeBytes = 0;  ///< 0 when not known
     std::uint64_t availableBytes = 0;
+    std::uint64_t blockBytes = 0;  ///< of the blocks that its tool counts in; 0 when it does not
+    bool differsFromBackup =
+        false;  ///< the two copies of the main superblock contradict each other
+    std::optional<std::uint64_t> files;  ///< by its own books, where these agree with each other
+    std::vector<DiskPiece> backups;      ///< what a repair uses and a verification does not read
 
     bool isCutShort() const { return volumeBytes > availableBytes; }
 };
@@ -90,14 +111,16 @@ struct ToolHabits {
     bool takesOffset = false;
     /// It holds its output back unless it writes to a terminal.
     bool wantsTerminal = true;
-    /// Its repair would write to a sound volume as well, or does not say whether it has changed
-    /// anything: so the volume is verified before.
-    bool isLookedAtBeforeRepair = true;
+    /// Its repair replays a journal first.
+    bool replaysInRepair = false;
     /// Asked to end in the middle of a repair, it leaves the disk in order.
     bool endsInOrder = false;
     /// A log that waits is brought to its place by mounting, as this file system; empty: the tool
     /// does it, or there is no log.
-    std::string_view logReplayedAs;
+    std::string_view logReplayedAs = {};
+    /// Where a repair collects files that have lost their names: for one of them, and for many.
+    std::string_view collectedOne = "no damage is left; %1$@ file is now in lost+found";
+    std::string_view collectedMany = "no damage is left; %1$@ files are now in lost+found";
 };
 
 /// For `Tool::makeReader`.

@@ -99,9 +99,31 @@ class XfsOutput final : public LineOutput {
         return problem(line, sign == nullptr ? Damage::Contents : sign->kind);
     }
 
+    /// "superblock read failed, offset 0, size 32768, ag 0, rval -1", "fatal error -- Input/output
+    /// error", "xfs_repair: read failed: Input/output error"
+    void noteReading(std::string_view line)
+    {
+        if (line.ends_with("Input/output error"))
+            noteReadFault({});
+        else if (line.starts_with("superblock read failed, ") || line.starts_with("can't read ") ||
+                 line.starts_with("cannot read "))
+            noteReadFault({std::nullopt, std::nullopt, true});
+    }
+
+    /// "disconnected inode 132, moving to lost+found", "cleared inode 133"
+    void noteLosses(std::string_view line)
+    {
+        const bool isMoved =
+            line.starts_with("disconnected ") && line.ends_with(", moving to lost+found");
+        findings_.reconnected += isMoved ? 1 : 0;
+        findings_.cleared += line.starts_with("cleared inode ") ? 1 : 0;
+    }
+
     /// YES for a line that tells of the check and not of the volume.
     bool note(std::string_view line)
     {
+        noteReading(line);
+        noteLosses(line);
         const bool isEnd =
             line.starts_with("No modify flag set, skipping filesystem flush") || line == "done";
         const bool isLog =

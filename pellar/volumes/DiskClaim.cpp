@@ -140,9 +140,12 @@ bool DiskClaim::isStillInPlace() const
 
 bool DiskClaim::isStillWhole() const
 {
+    return sizeOf(disk_.get()) >= offset_ + availableBytes_;
+}
+
+bool DiskClaim::isEndReadable() const
+{
     const std::uint64_t end = offset_ + availableBytes_;
-    if (sizeOf(disk_.get()) < end)
-        return false;
     char last = 0;
     return availableBytes_ == 0 || ::pread(disk_.get(), &last, 1, static_cast<off_t>(end - 1)) == 1;
 }

@@ -40,8 +40,10 @@ public:
     bool isAllOfIt() const { return isAllOfIt_; }
     bool isBlockDevice() const;
 
-    /// NO when the disk has become shorter since it was claimed, or its end can no longer be read.
+    /// NO when the disk has become shorter since it was claimed.
     bool isStillWhole() const;
+    /// NO when its last byte cannot be read, or no longer.
+    bool isEndReadable() const;
     /// NO when the name no longer leads to the disk that was claimed: an image was deleted, moved
     /// or replaced, a device went away. What was found is then true of nothing that is left.
     bool isStillInPlace() const;

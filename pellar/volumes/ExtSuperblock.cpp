@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/volumes/ExtSuperblock.h"
 
+#include "pellar/volumes/DiskBytes.h"
+
 #include <unistd.h>
 
+#include <algorithm>
 #include <array>
 #include <limits>
 
@@ -14,9 +17,10 @@ constexpr std::uint32_t compatHasJournal = 0x4;
 constexpr std::uint32_t incompatRecover = 0x4;
 constexpr std::uint32_t incompatJournalDevice = 0x8;
 constexpr std::uint32_t incompat64Bit = 0x80;
+constexpr std::uint32_t incompatMetaGroups = 0x10;
+constexpr std::uint32_t compatFewBackups = 0x200;
+constexpr std::uint32_t readOnlyCompatSparseBackups = 0x1;
 constexpr std::uint32_t readOnlyCompatMetadataChecksum = 0x400;
-
-using Bytes = std::span<const std::uint8_t>;
 
 std::uint32_t number(Bytes bytes, std::size_t offset, std::size_t length)
 {
@@ -73,6 +77,38 @@ std::uint64_t ExtSuperblock::volumeBytes() const
     return blockCount > greatest / blockBytes ? greatest : blockCount * blockBytes;
 }
 
+std::uint64_t ExtSuperblock::groups() const
+{
+    return groupBlocks == 0 || firstDataBlock >= blockCount
+               ? 0
+               : (blockCount - firstDataBlock - 1) / groupBlocks + 1;
+}
+
+std::uint64_t ExtSuperblock::descriptorTableBytes() const
+{
+    constexpr std::uint64_t largestTable = 64U << 20U;
+    const std::uint64_t bytes = productOrGreatest(groups(), descriptorBytes);
+    return bytes > largestTable ? 0 : (bytes + blockBytes - 1) / blockBytes * blockBytes;
+}
+
+// With sparse backups they are in the groups 1 and all powers of 3, 5 and 7.
+std::vector<DiskPiece> ExtSuperblock::backups(std::uint64_t availableBytes) const
+{
+    std::vector<DiskPiece> pieces;
+    if (!hasSparseBackups || hasFewBackups)
+        return pieces;
+    const std::uint64_t bytes = blockBytes + (hasMetaGroups ? 0 : descriptorTableBytes());
+    for (const std::uint64_t base : {3U, 5U, 7U})
+        for (std::uint64_t group = base == 3 ? 1 : base; group < groups(); group *= base) {
+            const std::uint64_t start =
+                productOrGreatest(firstDataBlock + group * groupBlocks, blockBytes);
+            if (start >= availableBytes)
+                break;
+            pieces.push_back({start, std::min(bytes, availableBytes - start)});
+        }
+    return pieces;
+}
+
 std::optional<ExtSuperblock> parseExtSuperblock(Bytes bytes)
 {
     constexpr std::uint32_t greatestBlockShift = 6;  // blocks of 64 KiB
@@ -90,6 +126,14 @@ std::optional<ExtSuperblock> parseExtSuperblock(Bytes bytes)
     block.blockBytes = 1024U << blockShift;
     block.hasJournal = (compat & compatHasJournal) != 0;
     block.hasExternalJournal = block.hasJournal && number(bytes, 0xE0, 4) == 0;
+    block.inodeCount = number(bytes, 0x00, 4);
+    block.freeInodes = number(bytes, 0x10, 4);
+    block.firstDataBlock = number(bytes, 0x14, 4);
+    block.groupBlocks = number(bytes, 0x20, 4);
+    block.descriptorBytes = (incompat & incompat64Bit) != 0 ? number(bytes, 0xFE, 2) : 32;
+    block.hasMetaGroups = (incompat & incompatMetaGroups) != 0;
+    block.hasFewBackups = (compat & compatFewBackups) != 0;
+    block.hasSparseBackups = (number(bytes, 0x64, 4) & readOnlyCompatSparseBackups) != 0;
     block.isJournalDevice = (incompat & incompatJournalDevice) != 0;
     block.needsRecovery = (incompat & incompatRecover) != 0;
     return block;
@@ -113,6 +157,33 @@ std::optional<ExtSuperblock> readExtSuperblock(int descriptor, std::uint64_t off
         }
     }
     return std::nullopt;
+}
+
+// The kernel brings the superblock's count up to date at unmounting, those of the groups with each
+// file.
+std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
+                                           const ExtSuperblock& superblock)
+{
+    constexpr std::uint32_t smallestWithHighHalf = 64;
+    const std::uint64_t bytes = superblock.descriptorTableBytes();
+    if (superblock.hasMetaGroups || bytes == 0 || superblock.descriptorBytes < 32 ||
+        superblock.freeInodes > superblock.inodeCount)
+        return std::nullopt;
+    const std::uint64_t place =
+        (std::uint64_t{superblock.firstDataBlock} + 1) * superblock.blockBytes;
+    const auto table = readDisk(descriptor, offset + place, bytes);
+    if (!table)
+        return std::nullopt;
+    std::uint64_t free = 0;
+    for (std::uint64_t group = 0; group < superblock.groups(); ++group) {
+        const Bytes entry =
+            Bytes(*table).subspan(group * superblock.descriptorBytes, superblock.descriptorBytes);
+        free += number(entry, 0x0E, 2);
+        if (superblock.descriptorBytes >= smallestWithHighHalf)
+            free += std::uint64_t{number(entry, 0x2E, 2)} << 16U;
+    }
+    return free == superblock.freeInodes ? std::optional(superblock.inodeCount - free)
+                                         : std::nullopt;
 }
 
 }  // namespace pellar

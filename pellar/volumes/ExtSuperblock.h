@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/volumes/Readability.h"
+
 #include <cstddef>
 #include <cstdint>
 #include <optional>
 #include <span>
+#include <vector>
 
 namespace pellar {
 
@@ -23,6 +26,22 @@ struct ExtSuperblock {
     bool needsRecovery = false;
     bool isBackup = false;
 
+    std::uint64_t inodeCount = 0;
+    std::uint64_t freeInodes = 0;
+    std::uint32_t firstDataBlock = 0;
+    std::uint32_t groupBlocks = 0;  ///< of a block group
+    std::uint32_t descriptorBytes = 0;
+    bool hasMetaGroups = false;  ///< descriptors stand in several places
+    bool hasFewBackups = false;  ///< two at most, wherever they are
+    bool hasSparseBackups = false;
+
+    std::uint64_t groups() const;
+    /// What the descriptors of all groups take, whole blocks; 0 when that makes no sense.
+    std::uint64_t descriptorTableBytes() const;
+    /// Where its copies are, each with the descriptors behind it, as far as they are on the disk;
+    /// none where these stand elsewhere than by default.
+    std::vector<DiskPiece> backups(std::uint64_t availableBytes) const;
+
     /// Bytes; the greatest number when the product does not fit.
     std::uint64_t volumeBytes() const;
 
@@ -38,5 +57,10 @@ std::optional<ExtSuperblock> parseExtSuperblock(std::span<const std::uint8_t> by
 /// there is neither. Reads a few KiB.
 std::optional<ExtSuperblock> readExtSuperblock(int descriptor, std::uint64_t offset,
                                                std::uint64_t availableBytes);
+
+/// How many files there are by the volume's own books, directories and those that it keeps for
+/// itself among them. None where the books do not agree with each other, or cannot be read.
+std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
+                                           const ExtSuperblock& superblock);
 
 }  // namespace pellar

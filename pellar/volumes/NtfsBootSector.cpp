@@ -63,4 +63,11 @@ std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t o
     return backup;
 }
 
+bool differsFromNtfsBackup(int descriptor, std::uint64_t offset, const NtfsBootSector& sector)
+{
+    const auto bytes = readDisk(descriptor, offset + sector.volumeBytes - sector.sectorBytes,
+                                NtfsBootSector::size);
+    return bytes && parseNtfsBootSector(*bytes) != sector;
+}
+
 }  // namespace pellar

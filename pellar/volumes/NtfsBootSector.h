@@ -26,4 +26,8 @@ std::optional<NtfsBootSector> parseNtfsBootSector(Bytes bytes);
 std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t offset,
                                                  std::uint64_t availableBytes);
 
+/// Whether the backup, in the sector behind the volume's last, can be read and is none, or tells of
+/// another volume than `sector`, the one in front.
+bool differsFromNtfsBackup(int descriptor, std::uint64_t offset, const NtfsBootSector& sector);
+
 }  // namespace pellar

@@ -43,8 +43,19 @@ protected:
     Notifications center_;
     DiskController controller_{
         center_, {[](std::string_view) { return FilesystemCapabilities(); }, nullptr}};
-    DiskTreeModel model_{controller_, [](const Disk&) { return std::optional<LastCheck>(); },
-                         texts_};
+    std::map<std::string, LastCheck> checks_;
+    std::string busy_;
+    DiskTreeModel model_{
+        controller_,
+        {[this](const Disk& disk) {
+             const auto found = checks_.find(disk.facts().identifier);
+             return found != checks_.end() ? std::optional(found->second) : std::nullopt;
+         },
+         [this](const Disk& disk) { return disk.facts().identifier == busy_ ? "verifying…" : ""; },
+         [](const Disk&) {
+             return std::string();
+         }},
+        texts_};
     DiskList list_{texts_};
 };
 
@@ -97,6 +108,32 @@ TEST_F(DiskListTest, SelectedDisksComeInTheListsOrder)
     for (const auto& selected : list_.selectedDisks())
         order += selected->diskIdentifier() + " ";
     EXPECT_EQ(order, "a a1 a2 b b1 ");
+}
+
+TEST_F(DiskListTest, AParentSaysWhatItsWorstPartIs)
+{
+    list_.show(model_, [] {});
+    struct Case {
+        std::string verdictOfDisk;
+        std::string verdictOfPart;
+        std::string busy;
+        std::string state;
+    };
+    for (const Case& c :
+         {Case{"sound", "damaged", "", "damaged"}, Case{"damaged", "sound", "", "damaged"},
+          Case{"sound", "failed", "", "failed"}, Case{"sound", "sound", "", "sound"},
+          Case{"sound", "", "", "partly checked"}, Case{"", "", "", ""},
+          Case{"damaged", "sound", "a1", "verifying…"}}) {
+        checks_.clear();
+        if (!c.verdictOfDisk.empty())
+            checks_["a"].told.verdict = c.verdictOfDisk;
+        if (!c.verdictOfPart.empty())
+            checks_["a1"].told.verdict = c.verdictOfPart;
+        busy_ = c.busy;
+        synchronize({disk("a", {disk("a1")})});
+        const QModelIndex row = model_.index(0, static_cast<int>(DiskColumn::Verdict));
+        EXPECT_EQ(fromQt(row.data().toString()), c.state) << c.verdictOfDisk << c.verdictOfPart;
+    }
 }
 
 TEST_F(DiskListTest, ALabelIsNeverMoreThanText)

@@ -6,7 +6,11 @@
 
 #include <signal.h>
 
+#include <QTest>
+
 #include <cstdlib>
+#include <future>
+#include <memory>
 
 namespace orvane::desktop::test {
 namespace {
@@ -95,6 +99,101 @@ TEST_F(JobFaultTest, AnImageThatIsLostDuringItsCheckIsNeverTakenForAnother)
     }
 }
 
+// A check that did not take place must not look like one that had nothing to say.
+TEST_F(JobFaultTest, AnImageThatNoToolGotToSeeIsSaid)
+{
+    struct Case {
+        std::string name;
+        std::function<void(const std::string& image)> lose;
+        std::string why;
+        std::string note;
+    };
+    for (const Case& c :
+         {Case{"gone", [](const std::string& image) { fs::remove(image); },
+               "No such file or directory", "cannot be read: No such file or directory"},
+          Case{"emptied", [](const std::string& image) { fs::resize_file(image, 0); },
+               "the file is empty", "cannot be read: the file is empty"},
+          Case{"swap",
+               [](const std::string& image) {
+                   EXPECT_EQ(
+                       orvane::test::runTool({"sfdisk", "-q", image}, "label: gpt\ntype=swap\n"),
+                       0);
+               },
+               "there is no volume on it that can be checked", ""}}) {
+        const std::string image = makeImage(c.name);
+        const std::string other = makeImage("other");
+        open({image, other});
+        window().disks().setFocus();
+        command("selectAll").trigger();
+        c.lose(image);
+        button("verifyDiskButton").press();
+        ASSERT_TRUE(waitForJob());
+        ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; })) << c.name;
+        takePicture("unreached-" + c.name);
+        const std::string alert = takeAlert();
+        EXPECT_NE(alert.find(c.why), std::string::npos) << alert;
+        EXPECT_NE(alert.find(c.name + ".img"), std::string::npos) << alert;
+        EXPECT_EQ(cell(image, DiskColumn::Verdict), "failed") << c.name;
+        EXPECT_EQ(cell(other, DiskColumn::Verdict), "sound") << c.name;
+        select(image);
+        EXPECT_TRUE(logHolds(c.why)) << testing::PrintToString(logRows());
+        EXPECT_TRUE(waitUntil([&] { return details(image).find(c.note) != std::string::npos; }))
+            << details(image);
+        close();
+    }
+}
+
+TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
+{
+    const std::string image = makeImage("first");
+    start("verifyDiskButton", image);
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(image, DiskColumn::Name), "first (first.img)");
+    fs::rename(makeDamagedImage("second"), image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_NE(takeAlert().find("“second”"), std::string::npos);
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "damaged");
+    EXPECT_EQ(cell(image, DiskColumn::Name), "second (first.img)");
+    EXPECT_TRUE(logHolds("needs to be repaired")) << testing::PrintToString(logRows());
+    EXPECT_FALSE(logHolds("appears to be OK")) << "that was another volume";
+
+    fs::rename(makePartitionedImage("parts"), image);
+    command("rescan").trigger();
+    EXPECT_TRUE(waitUntil([&] { return cell(image + "#1", DiskColumn::Format) == "ext4"; }));
+}
+
+// As on a network that has gone: nobody knows when the file will answer.
+TEST_F(JobFaultTest, ASlowImageHoldsNoOtherJobUpAndItsOwnCanBeStopped)
+{
+    const std::string quick = makeImage("quick");
+    const std::string slow = makeImage("slow");
+    open({quick, slow});
+    const auto answers = std::make_shared<std::promise<void>>();
+    session().host().imageAttachment().setReader(
+        [slow, answered = answers->get_future().share()](const fs::path& image) {
+            if (image == slow)
+                answered.wait();
+            return ImageReading::readNow(image);
+        });
+    select(slow);  // has it read again
+    select(quick);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(cell(quick, DiskColumn::Verdict), "sound");
+
+    window().disks().selectAll();
+    button("verifyDiskButton").press();
+    EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    QTest::qWait(100);
+    EXPECT_EQ(sheet(), nullptr) << takeAlert();
+    EXPECT_EQ(cell(slow, DiskColumn::Verdict), "");
+    EXPECT_TRUE(button("verifyDiskButton").isEnabled());
+    answers->set_value();
+}
+
 TEST_F(JobFaultTest, AToolThatIsKilledHasFoundNothing)
 {
     struct Case {
@@ -105,13 +204,11 @@ TEST_F(JobFaultTest, AToolThatIsKilledHasFoundNothing)
     };
     for (const Case& c :
          {Case{"verifyDiskButton", "failed", "tool failed", "nothing is known"},
-          Case{"repairDiskButton", "damaged", "still damaged", "it was read once more"},
-          Case{"repairDiskButton", "sound", "", "and found to be sound"}}) {
+          Case{"repairDiskButton", "failed", "tool failed", "it was looked at before a repair"}}) {
         fs::remove(mayGo());
         fs::remove(waits());
         useWaitingTool();
-        const std::string image =
-            c.verdict == "sound" ? makeImage(c.verdict) : makeDamagedImage(c.verdict);
+        const std::string image = makeDamagedImage(c.action);
         start(c.action, image);
         std::string process;
         ASSERT_TRUE(waitUntil([&] {

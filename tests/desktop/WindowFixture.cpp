@@ -127,6 +127,11 @@ std::string WindowFixture::cell(const std::string& image, DiskColumn column)
     return fromQt(row(image).siblingAtColumn(static_cast<int>(column)).data().toString());
 }
 
+std::string WindowFixture::details(const std::string& image)
+{
+    return fromQt(row(image).data(DiskTreeModel::DetailsRole).toString());
+}
+
 QtButton& WindowFixture::button(const char* name)
 {
     return *session_->activeTab()->interface()->button(name);

@@ -42,6 +42,8 @@ protected:
     bool logHolds(const std::string& text);
     /// What the disk list says about the image.
     std::string cell(const std::string& image, DiskColumn column);
+    /// The second line of its row.
+    std::string details(const std::string& image);
     QAction& command(const char* name);
     /// The sheet that is open; none when there is none.
     QMessageBox* sheet();

@@ -9,6 +9,8 @@
 #include <QMimeData>
 #include <QTest>
 
+#include <fstream>
+
 namespace orvane::desktop::test {
 namespace {
 
@@ -106,16 +108,55 @@ TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
     EXPECT_TRUE(logRows().empty());
 }
 
-TEST_F(WindowTest, AJobCanBeStopped)
+TEST_F(WindowTest, WhatWasClearedCanBeBroughtBack)
 {
-    useEndlessTool();
+    const std::vector<std::string> images{makeImage("one"), makeImage("two")};
+    open(images);
+    select(images[0]);
+    QtButton& clear = button("clearHistoryButton");
+    EXPECT_FALSE(clear.isEnabled()) << "never checked";
+    window().disks().selectAll();
+    EXPECT_FALSE(clear.isEnabled());
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    const auto rows = logRows();
+    EXPECT_TRUE(clear.isEnabled());
+    clear.press();
+    EXPECT_FALSE(clear.isEnabled());
+    EXPECT_TRUE(logRows().empty());
+    for (const std::string& image : images)
+        EXPECT_EQ(cell(image, DiskColumn::Verdict), "") << "the list follows at once";
+    command("undoClear").trigger();
+    EXPECT_EQ(logRows(), rows);
+    EXPECT_TRUE(clear.isEnabled());
+    command("undoClear").trigger();
+    EXPECT_EQ(logRows(), rows) << "there is nothing more to bring back";
+    close();
+    open(images);
+    window().disks().selectAll();
+    EXPECT_EQ(logRows(), rows) << "it is kept";
+    for (const std::string& image : images)
+        EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound");
+}
+
+TEST_F(WindowTest, AJobCanBeStoppedAndTheLastVerdictStands)
+{
     const std::string image = openImage("sound");
     button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
+    ASSERT_TRUE(waitForJob());
+    close();
+    useEndlessTool();
+    open({image});
+    select(image);
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitUntil([&] { return cell(image, DiskColumn::Verdict) == "verifying…"; }));
+    takePicture("verifying");
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitForJob());
     EXPECT_TRUE(logHolds("Stopped by user")) << testing::PrintToString(logRows());
-    EXPECT_EQ(cell(image, DiskColumn::Verdict), "stopped");
+    EXPECT_EQ(cell(image, DiskColumn::Verdict), "sound");
+    EXPECT_NE(cell(image, DiskColumn::LastCheck).find("then stopped"), std::string::npos)
+        << cell(image, DiskColumn::LastCheck);
 }
 
 TEST_F(WindowTest, ClosingDuringAJobAsks)
@@ -172,6 +213,66 @@ TEST_F(WindowTest, AnImageWithPartitionsShowsItsVolumes)
     // A disk of a job keeps its place until the job is over in every respect.
     EXPECT_TRUE(waitUntil([&disks] { return disks.rowCount() == 0; }));
     EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "nothing is selected any more";
+}
+
+TEST_F(WindowTest, TheMapOfAnImageIsVerifiedAndRepaired)
+{
+    const std::string image = makePartitionedImage("partitioned");
+    std::fstream(image) << std::string(1024, '\0');  // the boot record and the primary header
+    open({image});
+    select(image);
+    EXPECT_NE(details(image).find("its partition map is damaged"), std::string::npos);
+    command("verifyMap").trigger();
+    EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
+    ASSERT_TRUE(waitForJob());
+    EXPECT_TRUE(waitUntil([&] { return cell(image, DiskColumn::Verdict) == "damaged"; }));
+    takePicture("damaged-map");
+    if (QMessageBox* const box = sheet())
+        box->close();
+    command("repairMap").trigger();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_TRUE(waitUntil([&] {
+        return details(image).find("partition map is damaged") == std::string::npos;
+    })) << testing::PrintToString(logRows());
+    EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}), 0);
+}
+
+TEST_F(WindowTest, EveryRowOfSeveralDisksStandsInTheLogOnce)
+{
+    const std::string image = makePartitionedImage("partitioned");
+    open({image});
+    select(image + "#1");
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    const auto rows = logRows();
+    window().disks().selectAll();
+    EXPECT_EQ(logRows(), rows);
+}
+
+TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)
+{
+    const std::string image = makeImage("image");
+    const std::string locked = makeImage("locked");
+    useEndlessTool();
+    open({image, locked});
+    window().disks().clearSelection();
+    const auto toolTip = [this](const char* name) {
+        return fromQt(button(name).widget().toolTip());
+    };
+    const auto says = [&](const char* name, const std::string& reason) {
+        return waitUntil([&] { return toolTip(name).find(reason) != std::string::npos; });
+    };
+    EXPECT_TRUE(says("verifyDiskButton", "Select a disk first.")) << toolTip("verifyDiskButton");
+    select(image);
+    EXPECT_TRUE(says("clearHistoryButton", "There is no history to clear."));
+    window().disks().selectAll();
+    EXPECT_TRUE(says("verifyPermissionsButton", "“locked.img”: "))
+        << toolTip("verifyPermissionsButton");
+    button("verifyDiskButton").press();
+    EXPECT_TRUE(says("repairDiskButton", "Not available while a job runs."));
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(toolTip("repairDiskButton").find("while a job runs"), std::string::npos);
 }
 
 TEST_F(WindowTest, WhatCannotBeOpenedIsSaidInOneSheet)

@@ -10,6 +10,9 @@
 
 #include <gtest/gtest.h>
 
+#include <cmath>
+#include <limits>
+
 #include <random>
 
 namespace fixwell {
@@ -33,6 +36,9 @@ TEST(Values, ReadTheNeutralValueWhereTheKindDoesNotFit)
     EXPECT_FALSE(text.array());
     EXPECT_TRUE(text.array().isEmpty());
     EXPECT_EQ(Value(-2.9).integer(), -2);
+    EXPECT_EQ(Value(4e24).integer(), std::numeric_limits<std::int64_t>::max());
+    EXPECT_EQ(Value(-4e24).integer(), std::numeric_limits<std::int64_t>::min());
+    EXPECT_EQ(Value(std::nan("")).integer(), 0);
     EXPECT_TRUE(Value(1).boolean());
     EXPECT_EQ(Value(1'000'000'007).integer(), 1'000'000'007) << "beyond the shared numbers";
     EXPECT_EQ(Value(Name("x")), Value("x")) << "a name reads as its text";
@@ -148,7 +154,9 @@ TEST(PhraseMatching, IgnoresTheCaseOfLettersInSeveralScripts)
     for (const auto& [upper, lower] :
          std::vector<std::pair<std::string, std::string>>{{"ÜBERPRÜFUNG", "überprüfung"},
                                                           {"ПРОВЕРКА Ё", "проверка ё"},
-                                                          {"ΕΛΕΓΧΟΣ", "ελεγχοσ"},
+                                                          {"ΕΛΕΓΧΟΣ ΌΛΗΣ", "ελεγχοσ όλησ"},
+                                                          {"ПЕРЕВІРКА ҐҚӀ", "перевірка ґқӏ"},
+                                                          {"Ÿ", "ÿ"},
                                                           {"ŁÓDŹ ĀĊŻ", "łódź āċż"}}) {
         EXPECT_EQ(foldedCase(upper), lower);
         EXPECT_EQ(PhraseMatcher(std::vector{lower}).firstIn("x " + upper + " y"), 0U);
@@ -214,6 +222,9 @@ TEST(RichText, EscapesEverythingThatRTFWouldObey)
     EXPECT_NE(made.find("{\\f0\\b\\fs22\\cf1 a\\\\b\\{c\\}\\tab d\\par\n}"), std::string::npos);
     EXPECT_NE(made.find("\\u233?\\u28450?\\u-10179?\\u-8780?[0m\\u-3?"), std::string::npos) << made;
     EXPECT_EQ(made.find('\x1b'), std::string::npos);
+    const Color beyond{4e24, -1, std::nan(""), 1};
+    EXPECT_NE(rtf(StyledText::make("x", {{}, beyond, {}})).find("\\red255\\green0\\blue0;"),
+              std::string::npos);
     EXPECT_EQ(rtf(StyledText()).front(), '{') << "empty text is still a document";
 }
 

@@ -349,6 +349,38 @@ TEST_F(OVFXWTest, ImagesAreAttachedFirstAndEjectedAfterwards)
     EXPECT_TRUE(host.has("report"));
 }
 
+TEST_F(OVFXWTest, TheStartupDiskIsAskedAboutBeforeAnImageIsAttached)
+{
+    const auto boot = addDisk("root");
+    boot->boot = true;
+    boot->fileSystem.verifiesLive = true;
+    const auto image = addDisk("/bare.img");
+    image->type = OVDisk::typeDiskImage;
+    image->imagePath = "/bare.img";
+    const auto bare = addDisk("bare");
+    host.images = {{"/bare.img", bare}};
+    select(image, boot);
+
+    module->verifyDisk(nullptr);
+    ASSERT_TRUE(host.sheet);
+    EXPECT_TRUE(host.workers.empty());
+    host.sheet->end(*host.sheet, 1001);
+    EXPECT_TRUE(host.workers.empty()) << "cancelled, so nothing is attached";
+    EXPECT_EQ(action(), FXWActionNone);
+
+    module->verifyDisk(nullptr);
+    host.sheet->end(*host.sheet, 1000);
+    ASSERT_EQ(host.workers.size(), 1U);
+    EXPECT_TRUE(host.has("lock")) << "the job is running while the image is attached";
+    EXPECT_FALSE(host.has("verify root"));
+    host.workers.front()();
+    host.runTasks();
+    finish(boot);
+    EXPECT_TRUE(host.has("verify bare"));
+    finish(bare);
+    EXPECT_EQ(host.count("lock"), 1);
+}
+
 TEST_F(OVFXWTest, AnImageWithoutAPathNeverStartsTheJob)
 {
     const auto disk = addDisk("nowhere");

@@ -45,6 +45,7 @@ TEST(E2fsckVerdict, OfRecordedVerifications)
           Case{"wrong-free-count", 0, Verdict::Damaged, "a repair would write this, despite 0"},
           Case{"damaged", 4, Verdict::Damaged, "it says so itself"},
           Case{"multiply-claimed", 4, Verdict::Damaged, "it says so itself"},
+          Case{"old-journal", 0, Verdict::Damaged, "a repair would write this, and asks nothing"},
           Case{"backup-superblock", 4, Verdict::Damaged, "the main superblock is lost"},
           Case{"gave-up", 12, Verdict::Damaged, "gave up with damage in sight"},
           Case{"journal-skipped", 0, Verdict::Inconclusive,

@@ -3,8 +3,9 @@
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
+//   say-in-repair TEXT: when it was called with -a or -y
 //   await NAME: until there is such a file beside it
-//   await-in-repair NAME: the same, when it was called with -a
+//   await-in-repair NAME: the same, when it was called with -a or -y
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
@@ -65,12 +66,12 @@ void tellTerminal()
                            std::to_string(size.ws_col) + "\n");
 }
 
-/// The option by which fsck.fat is told to write.
+/// The option by which fsck.fat or e2fsck is told to write.
 bool isRepairing()
 {
     std::ifstream commandLine("/proc/self/cmdline");
     for (std::string word; std::getline(commandLine, word, '\0');)
-        if (word == "-a")
+        if (word == "-a" || word == "-y")
             return true;
     return false;
 }
@@ -85,7 +86,7 @@ void await(const std::string& name)
 void act(const std::string& action, const std::string& text)
 {
     const int number = std::atoi(text.c_str());
-    if (action == "say")
+    if (action == "say" || (action == "say-in-repair" && isRepairing()))
         put(STDOUT_FILENO, text + "\n");
     else if (action == "progress")
         put(4, text + "\n");

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "pellar/ErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -76,6 +77,18 @@ TEST(Job, VerifyAnswersWhatIsTrue)
         EXPECT_FALSE(stage.heard.message.empty()) << c.because;
         expectOneEnd(stage);
     }
+}
+
+TEST(Job, ARepairIsEndedWhereTheDiskCannotBeRead)
+{
+    Stage stage(
+        "say Free blocks count wrong (1, counted=2).  Fix? no\n"
+        "say-in-repair Error reading block 5 (Input/output error).  Ignore error? yes\n"
+        "await-in-repair never\nexit 4");
+    ASSERT_EQ(stage.bench.repair(stage.disk), 0);
+    EXPECT_EQ(stage.heard.error, kPLErrorUnreadable) << stage.heard.message;
+    EXPECT_EQ(stage.heard.verdict, "failed");
+    expectOneEnd(stage);
 }
 
 TEST(Job, FloodIsEndedWithASentence)

@@ -142,7 +142,9 @@ TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
     verification.kill();
     EXPECT_TRUE(comesTrue([this] { return mounts() == before_; })) << "the tool went with it";
 
-    options.toolPath = workshop_.fakeTools("ignore 15\nsay writing\nawait end");
+    options.toolPath = workshop_.fakeTools(
+        "ignore 15\nsay Free blocks count wrong (1, counted=2).  Fix? no\nawait-in-repair end\n"
+        "exit 4");
     OtherProgram repair(options, disk(), true);
     ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
     ::usleep(300'000);  // the tool has begun

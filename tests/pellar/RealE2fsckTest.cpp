@@ -2,6 +2,7 @@
 //
 // The real e2fsck on real volumes, damaged on purpose. Without root.
 
+#include "pellar/ErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -121,9 +122,48 @@ TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)
     ASSERT_EQ(bench.verify(test::reference(image)), 0);
     EXPECT_EQ(bench.listener.verdict, "damaged");
     EXPECT_TRUE(bench.listener.hasErrorWith("The volume is cut short"));
+    EXPECT_EQ(bench.listener.error, kPLErrorCutShort) << "nobody is sent to a repair";
+    EXPECT_FALSE(bench.listener.hasPlainLine("needs to be repaired."));
     ASSERT_EQ(bench.repair(test::reference(image)), 0);
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorNotRepaired);
+    EXPECT_EQ(bench.listener.error, kPLErrorCutShort) << "nor called damaged after a repair";
     EXPECT_TRUE(bytesOf(image) == before) << "something was written";
+}
+
+// What a repair costs is said where everybody sees it, in numbers that are true.
+TEST(RealE2fsck, SaysWhatARepairHasCost)
+{
+    struct Loss {
+        std::vector<std::string> commands;
+        std::size_t overwritten;  ///< of the inode table, with nonsense
+        std::string_view message;
+        std::string_view because;
+    };
+    for (const Loss& loss :
+         {Loss{{}, 300U << 10U, "no damage is left, but 8 of 19 files are gone", "all of them"},
+          Loss{{"clri f3"}, 0, "no damage is left, but 1 of 19 files is gone", "one"},
+          Loss{{"unlink f3", "unlink f4"},
+               0,
+               "no damage is left; 2 files are now in lost+found",
+               "without names"},
+          Loss{{"set_super_value free_inodes_count 3"},
+               0,
+               "no damage is left",
+               "a wrong count loses nothing"}}) {
+        const test::Workshop workshop;
+        const auto image = makeVolume(workshop, {"-b", "1024"});
+        for (const std::string& command : loss.commands)
+            workshop.damage(image, command);
+        if (loss.overwritten > 0) {
+            std::fstream file(image, std::ios::in | std::ios::out | std::ios::binary);
+            file.seekp(134 << 10) << std::string(loss.overwritten, '\xA5');
+        }
+        test::Bench bench;
+        ASSERT_EQ(bench.repair(test::reference(image)), 0);
+        EXPECT_EQ(bench.listener.message, "repaired “Disk”: " + std::string(loss.message));
+        const auto warnings = bench.listener.textsOf(fixwell::kFsckFail);
+        EXPECT_EQ(warnings.empty(), loss.message == "no damage is left") << loss.because;
+        EXPECT_TRUE(warnings.empty() || warnings.front() == bench.listener.message);
+    }
 }
 
 TEST(RealE2fsck, SavesAVolumeByItsBackupSuperblock)

@@ -182,6 +182,101 @@ TEST(ToolVerdict, WeighsWhatWeKnowBesides)
         }
 }
 
+// Mounting makes anew what they tell of; for the quotas it exits with 1.
+TEST(ToolVerdict, RemarksOfBtrfsAreNoDamage)
+{
+    const Tool& btrfs = *toolFor("btrfs");
+    auto lines = linesOf(recordingOf("btrfs/sound"));
+    const auto insert = [&lines](std::string line) {
+        lines.insert(lines.begin() + 3, std::move(line));
+    };
+    insert("cache and super generation don't match, space cache will be invalidated");
+    EXPECT_EQ(judge(btrfs, lines, Exited{0}).verdict, Verdict::Sound);
+    EXPECT_EQ(judge(btrfs, lines, Exited{1}).verdict, Verdict::Damaged);
+    insert("Rescan hasn't been initialized, a difference in qgroup accounting is expected");
+    EXPECT_EQ(judge(btrfs, lines, Exited{1}).verdict, Verdict::Sound);
+    insert("checksum verify failed on 22036480 wanted 0x00000000 found 0x12345678");
+    EXPECT_EQ(judge(btrfs, lines, Exited{1}).verdict, Verdict::Damaged);
+}
+
+// Some say so plainly; of the others the kernel is asked.
+TEST(ToolVerdict, WhatCannotBeReadIsNotDamaged)
+{
+    struct Fault {
+        std::string_view filesystem;
+        std::vector<std::string> lines;
+        Verdict verdict;
+        std::optional<ReadFault> fault;
+    };
+    const ReadFault somewhere;
+    const ReadFault perhaps{std::nullopt, std::nullopt, true};
+    for (const Fault& c :
+         {Fault{"ext4",
+                {"Error reading block 357 (Input/output error).  Ignore error? no"},
+                Verdict::Failed,
+                ReadFault{std::nullopt, 357, false}},
+          Fault{"ext4",
+                {"Error reading block 9 (Attempt to read block from filesystem resulted in short "
+                 "read) while reading inode and block bitmaps.  Ignore error? no"},
+                Verdict::Damaged,
+                ReadFault{std::nullopt, 9, true}},
+          Fault{"ext4",
+                {"DISK: Input/output error reading journal superblock"},
+                Verdict::Failed,
+                somewhere},
+          Fault{"ext4",
+                {"Entry 'Input/output error' in / (2) is a link to '.'  Clear? no"},
+                Verdict::Damaged,
+                std::nullopt},
+          Fault{"vfat",
+                {"Read 512 bytes at 16384:Input/output error"},
+                Verdict::Failed,
+                ReadFault{16384, std::nullopt, false}},
+          Fault{"vfat",
+                {"Got 100 bytes instead of 512 at 16384"},
+                Verdict::Failed,
+                ReadFault{16484, std::nullopt, true}},
+          Fault{"exfat", {"failed to read bitmap"}, Verdict::Damaged, perhaps},
+          Fault{"ntfs",
+                {"ntfs_attr_pread_i: ntfs_pread failed: Input/output error"},
+                Verdict::Failed,
+                somewhere},
+          Fault{"xfs", {"xfs_repair: read failed: Input/output error"}, Verdict::Failed, somewhere},
+          Fault{"btrfs", {"Error reading 22036480, -1"}, Verdict::Failed, somewhere},
+          Fault{"f2fs",
+                {"[ASSERT] (get_current_sit_page:2054) dev_read_block(sit_blk, blk_addr) >= 0"},
+                Verdict::Damaged,
+                perhaps}}) {
+        const Tool& tool = *toolFor(c.filesystem);
+        EXPECT_EQ(readAll(tool, c.lines).findings.readFault, c.fault) << c.lines.front();
+        EXPECT_EQ(judge(tool, c.lines, Exited{1}).verdict, c.verdict) << c.lines.front();
+    }
+}
+
+// What was named before stands, unless a log may put it right.
+TEST(ToolVerdict, ACrashDoesNotUndoWhatWasFound)
+{
+    VolumeFacts waiting = plainVolume();
+    waiting.needsRecovery = true;
+    for (const auto& [filesystem, line] : std::map<std::string_view, std::string>{
+             {"ext4", "Free blocks count wrong (1, counted=40914).  Fix? no"},
+             {"vfat", "Dirty bit is set. Fs was not properly unmounted"},
+             {"xfs", "agi unlinked bucket 3 is 131 in ag 0"}}) {
+        const Tool& tool = *toolFor(filesystem);
+        const Ending crash = Killed{SIGSEGV};
+        EXPECT_EQ(judge(tool, {line}, crash).verdict, Verdict::Damaged) << filesystem;
+        EXPECT_EQ(judge(tool, {}, crash).verdict, Verdict::Failed) << filesystem;
+        EXPECT_EQ(judge(tool, {line}, crash, waiting).verdict, Verdict::Failed) << filesystem;
+    }
+    EXPECT_EQ(judge(*toolFor("ext4"),
+                    {"Unattached inode 12", "Connect to /lost+found? no",
+                     "Signal (11) SIGSEGV si_code=SEGV_MAPERR fault addr=0x8"},
+                    Exited{8})
+                  .verdict,
+              Verdict::Damaged)
+        << "it caught it itself";
+}
+
 TEST(ToolVerdict, AMarkOfImproperUnmountingIsNeverSound)
 {
     VolumeFacts marked = plainVolume();

@@ -29,6 +29,8 @@ pid_t start(const std::string& file, int output)
     posix_spawn_file_actions_t actions;
     ::posix_spawn_file_actions_init(&actions);
     ::posix_spawn_file_actions_adddup2(&actions, output, addressDescriptor);
+    // A daemon that outlives a test that crashed holds no pipe of who runs the tests.
+    ::posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
     // It complains when it may not raise its own limits.
     ::posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, "/dev/null", O_WRONLY, 0);
     std::string name = program;

@@ -2,6 +2,8 @@
 #include "TemporaryDirectory.h"
 #include "fixwell/host/foundation/StyledText.h"
 #include "fixwell/host/pellar/MessageKeys.h"
+#include "orvane/support/disks/Disk.h"
+#include "orvane/support/history/Database.h"
 #include "orvane/support/history/DiskHistories.h"
 #include "orvane/support/history/HistoryKey.h"
 #include "orvane/support/history/HistoryStore.h"
@@ -281,8 +283,55 @@ TEST(HistoryStore, RunsAreKeptAndCutOffOnesStayOpen)
     EXPECT_EQ(runs[0].end, end);
     EXPECT_EQ(runs[0].finished, start + std::chrono::seconds(5));
     EXPECT_FALSE(runs[1].end) << "the program ended in the middle of it";
+    EXPECT_EQ(runs[1].verdict(), "running") << "this program is still there";
     EXPECT_EQ(mine.lastRun("v")->action, "repair");
     EXPECT_FALSE(mine.lastRun("w"));
+
+    Database file = Database::open(store.file);
+    for (const char* const program : {"owner || '1'", "'other ' || owner", "''", "'a ../self 1'"}) {
+        ASSERT_TRUE(file.execute(
+            ("UPDATE openRuns SET owner = " + std::string(program)).c_str()));
+        EXPECT_EQ(mine.lastRun("v")->verdict(), "") << "cut off with its program: " << program;
+    }
+}
+
+TEST(HistoryStore, WhatAnotherProgramHoldsUpIsWrittenLater)
+{
+    const TemporaryDirectory directory;
+    Store store{directory / "history.sqlite3", {}};
+    HistoryStore mine = store.open();
+    ASSERT_TRUE(mine.append("v", Array::of({line(1)}), 0));
+    Database other = Database::open(store.file);
+    ASSERT_TRUE(other.execute("BEGIN IMMEDIATE"));
+    const auto before = std::chrono::steady_clock::now();
+    const auto run = mine.beginRun("v", "verify", {});
+    for (int i = 0; i < 20; ++i)
+        EXPECT_FALSE(mine.append("v", Array::of({line(1), line(2)}), 1));
+    mine.endRun(run, {"sound", 0, ""}, {});
+    EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(20))
+        << "it is waited for once, and not for each record";
+    ASSERT_TRUE(other.execute("COMMIT"));
+    EXPECT_TRUE(mine.append("v", Array::of({line(1), line(2)}), 1));
+    ASSERT_TRUE(mine.lastRun("v"));
+    EXPECT_EQ(mine.lastRun("v")->verdict(), "sound");
+    EXPECT_EQ(store.warnings.size(), 1U);
+}
+
+TEST(HistoryStore, ALinkIsNotFollowedAndTheReasonOfAFailureIsItsOwn)
+{
+    const TemporaryDirectory directory;
+    fs::create_symlink(directory / "victim", directory / "history.sqlite3");
+    Store store{directory / "history.sqlite3", {}};
+    EXPECT_FALSE(store.open().isKept());
+    EXPECT_FALSE(fs::exists(directory / "victim"));
+
+    Database database = Database::inMemory();
+    ASSERT_TRUE(database.execute("PRAGMA max_page_count = 2; CREATE TABLE t (a)"));
+    {
+        const Transaction transaction(database);
+        EXPECT_FALSE(database.execute("INSERT INTO t VALUES (zeroblob(100000))"));
+    }
+    EXPECT_EQ(database.lastError(), "database or disk is full");
 }
 
 TEST(HistoryKey, CopiesOfAVolumeAreNotMixed)
@@ -391,6 +440,51 @@ TEST(DiskHistories, SaveWhatIsNewAndSeeAListThatWasEmptiedBehindTheirBack)
     EXPECT_TRUE(histories.clearHistoryOf(disk));
     EXPECT_FALSE(histories.clearHistoryOf(disk));
     EXPECT_TRUE(loaded(mine, histories.keyOf(disk)).isEmpty());
+}
+
+// Volumes are checked in any order, and the programs end in between.
+TEST(DiskHistories, AWholeDiskShowsItsRecordsInTheOrderOfTime)
+{
+    const TemporaryDirectory directory;
+    DiskTree tree;
+    tree.facts.identifier = "sda";
+    for (const char* const name : {"sda1", "sda2", "sda3"}) {
+        tree.children.push_back({});
+        tree.children.back().facts.identifier = name;
+    }
+    const auto later = [] {
+        ::usleep(3000);
+    };
+    std::string all;
+    for (const bool isWatched : {true, false}) {
+        HistoryStore store(directory / "history.sqlite3", {}, [](const std::string&) {});
+        DiskHistories histories(store);
+        const auto disk = Disk::make(tree, {{}, &histories});
+        const auto shown = [&] {
+            std::string text;
+            for (const Value& record : disk->fsckHistory().values())
+                text += std::to_string(record.dictionary().integer(fixwell::kFsckVerbosity)) + " ";
+            return text;
+        };
+        const auto say = [&](int part, int number) {
+            disk->parts()[static_cast<std::size_t>(part)]->fsckHistoryNoChildren().append(
+                Dictionary::of({{fixwell::kFsckVerbosity, number}}));
+            all += std::to_string(number) + " ";
+            if (isWatched) {
+                EXPECT_EQ(shown(), all);
+            }
+        };
+        EXPECT_EQ(static_cast<bool>(disk->fsckHistory()), !all.empty()) << "none was ever checked";
+        for (const int part : {2, 0, 1, 0, 2}) {
+            say(part, 1 + 10 * part);
+            histories.saveNew();
+            later();
+            say(part, 2 + 10 * part);
+        }
+        histories.saveNew();
+        later();
+        EXPECT_EQ(shown(), all);
+    }
 }
 
 }  // namespace

@@ -172,6 +172,7 @@ TEST(ImageAttacher, FailuresAreCodesWithASentence)
 {
     const TemporaryDirectory directory;
     test::write(directory / "x\x1b.img", "");
+    test::write(directory / "notes.txt", "Grüße\n");
     ASSERT_EQ(::mkfifo((directory / "fifo").c_str(), 0600), 0);
     ImageAttacher attacher({}, Translator());
     struct Case {
@@ -180,7 +181,10 @@ TEST(ImageAttacher, FailuresAreCodesWithASentence)
     };
     for (const Case& c : {Case{"x\x1b.img", "cannot attach ‘x\uFFFD.img’: the file is empty"},
                           Case{"none", "cannot attach ‘none’: No such file or directory"},
-                          Case{"fifo", "cannot attach ‘fifo’: it is not a regular file"}}) {
+                          Case{"fifo", "cannot attach ‘fifo’: it is not a regular file"},
+                          Case{"notes.txt",
+                               "cannot attach ‘notes.txt’: it is a text file, not a "
+                               "disk image"}}) {
         fixwell::Dictionary result;
         EXPECT_EQ(attacher.AttachImageWithURL(directory / c.name, result),
                   fixwell::kPLErrorCannotOpen);

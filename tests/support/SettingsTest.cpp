@@ -29,6 +29,11 @@ TEST(XDGPaths, VariablesHomesAndNothingAtAll)
                "",
                "/h/.config/orvane",
                "a relative path is ignored"},
+          Case{{{"HOME", "/foreign"}}, "/p", "/p/.config/orvane", "somebody else's home"},
+          Case{{{"HOME", "/h"}, {"XDG_CONFIG_HOME", "/foreign"}},
+               "/p",
+               "/h/.config/orvane",
+               "somebody else's directory in one's own home"},
           Case{{}, "/p", "/p/.config/orvane", "without HOME, the account's"},
           Case{{{"HOME", ""}}, "", "", "nowhere: nothing is kept"}}) {
         const auto paths = xdgPathsFrom(
@@ -36,7 +41,9 @@ TEST(XDGPaths, VariablesHomesAndNothingAtAll)
                 const auto found = c.environment.find(name);
                 return found == c.environment.end() ? std::nullopt : std::optional(found->second);
             },
-            c.accountHome);
+            c.accountHome, [](const std::filesystem::path& directory) {
+                return directory.native().starts_with("/foreign");
+            });
         EXPECT_EQ(paths.config, c.config) << c.because;
     }
 }
@@ -85,8 +92,11 @@ TEST(SettingsFile, AnotherProgramsChangeIsKept)
 
 TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
 {
-    for (const char* const broken :
-         {"{\"a\": tru", "[1, 2]", "", "\xFF\xFE", "{\"a\":{\"dictionary\":[3]}}"}) {
+    const std::string deep(100'000, '[');
+    for (const std::string& broken :
+         {std::string("{\"a\": tru"), std::string("[1, 2]"), std::string(),
+          std::string("\xFF\xFE"), std::string("{\"a\":{\"dictionary\":[3]}}"),
+          "{\"a\":" + deep + std::string(deep.size(), ']') + "}"}) {
         const TemporaryDirectory directory;
         Settings settings{directory / "settings.json", {}};
         test::write(settings.file, broken);

@@ -260,7 +260,6 @@ void addMethod(sdbus::IObject& object, const char* interface, const char* name, 
         .forInterface(std::string(interface));
 #else
     object.registerMethod(name).onInterface(interface).implementedAs(std::move(function));
-    object.finishRegistration();
 #endif
 }
 
@@ -275,6 +274,13 @@ void addProperties(sdbus::IObject& object, const char* interface,
 #else
     (object.registerProperty(properties.first).onInterface(interface).withGetter(properties.second),
      ...);
+#endif
+}
+
+/// When all has been added.
+void finish([[maybe_unused]] sdbus::IObject& object)
+{
+#if ORVANE_SDBUS == 1
     object.finishRegistration();
 #endif
 }
@@ -293,8 +299,11 @@ public:
                       return std::vector{
                           sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
                   });
+        finish(*manager_);
         addVolume();
         addDrive();
+        finish(*volume_);
+        finish(*drive_);
         connection_->requestName(BusServiceName("org.freedesktop.UDisks2"));
         connection_->enterEventLoopAsync();
     }

@@ -94,6 +94,7 @@ inline const std::vector<VolumeState>& volumeStates()
     constexpr std::uint64_t ntfsMap = 1031 * 4096;
     constexpr std::uint64_t ntfsJournal = 4096 * 4096;
     constexpr std::uint64_t ntfsVolumeFlags = 3 * 1024 + 426;
+    constexpr std::uint64_t ntfsBackup = (32U << 20U) - 512;
     constexpr std::uint64_t f2fsSegments = 1536 * 4096;
     static const std::string exfatNonsense =
         std::string("\x85\x02", 2) + zeros(30) + "\xC0" + zeros(31) + "\xC1" + zeros(31);
@@ -197,6 +198,14 @@ inline const std::vector<VolumeState>& volumeStates()
          "inconclusive",
          "inconclusive",
          "brought back from the backup, and marked"},
+        {"ntfs",
+         "no backup of the boot sector",
+         {{ntfsBackup, zeros(512)}},
+         {},
+         "damaged",
+         "inconclusive",
+         "inconclusive",
+         "ntfsresize pays no heed to it; ntfsfix writes it anew, and marks the volume"},
         {"xfs", "sound", {}, {}, "sound", "sound", "sound", "nothing is written to it"},
         {"xfs",
          "wrong count",

@@ -30,17 +30,21 @@ std::string zeros(std::size_t count)
     return std::string(count, '\0');
 }
 
-TEST_F(PartitionMapTest, IsNamedWhereNothingElseInAnImageCanBeChecked)
+TEST_F(PartitionMapTest, ADamagedMapOfAnImageIsNamedWhateverElseIsChecked)
 {
     const auto disk = makeDisk("disk.img");
-    const auto pointer = [this] {
-        const RunResult result = run({"verify", "disk.img"});
-        return result.errors.find("“disk.img” has a partition map; --partition-map checks it");
+    const auto names = [this](const char* command) {
+        const RunResult result = run({command, "disk.img"});
+        return result.errors.find(
+                   "the partition map of “disk.img” is damaged; --partition-map "
+                   "checks and repairs it") != std::string::npos;
     };
-    EXPECT_EQ(pointer(), std::string::npos) << "its volume is checked";
+    EXPECT_FALSE(names("verify")) << "both copies are sound";
     patch(disk, 512, zeros(512));
+    EXPECT_TRUE(names("verify")) << "its volume is checked, and the map is not";
+    EXPECT_TRUE(names("list"));
     patch(disk, 16 * mebibyte - 512, zeros(512));
-    EXPECT_NE(pointer(), std::string::npos) << "neither copy says where its volume is";
+    EXPECT_TRUE(names("verify")) << "neither copy says where its volume is";
 }
 
 TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)

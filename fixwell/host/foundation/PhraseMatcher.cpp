@@ -26,9 +26,25 @@ constexpr char32_t loweredWide(char32_t c)
         return c + 32;
     if (isWithin(c, 0x400, 0x40F))
         return c + 80;
-    const bool evenIsUpper =
-        isWithin(c, 0x100, 0x12F) || isWithin(c, 0x132, 0x137) || isWithin(c, 0x14A, 0x177);
-    const bool oddIsUpper = isWithin(c, 0x139, 0x148) || isWithin(c, 0x179, 0x17E);
+    switch (c) {
+        case 0x178: return 0xFF;
+        case 0x386: return 0x3AC;
+        case 0x388:
+        case 0x389:
+        case 0x38A: return c + 37;
+        case 0x38C: return 0x3CC;
+        case 0x38E:
+        case 0x38F: return c + 63;
+        case 0x3C2: return 0x3C3;  // the sigma at the end of a word
+        case 0x4C0: return 0x4CF;
+        default: break;
+    }
+    const bool evenIsUpper = isWithin(c, 0x100, 0x12F) || isWithin(c, 0x132, 0x137) ||
+                             isWithin(c, 0x14A, 0x177) || isWithin(c, 0x3D8, 0x3EF) ||
+                             isWithin(c, 0x460, 0x481) || isWithin(c, 0x48A, 0x4BF) ||
+                             isWithin(c, 0x4D0, 0x4FF);
+    const bool oddIsUpper =
+        isWithin(c, 0x139, 0x148) || isWithin(c, 0x179, 0x17E) || isWithin(c, 0x4C1, 0x4CE);
     if ((evenIsUpper && c % 2 == 0) || (oddIsUpper && c % 2 == 1))
         return c + 1;
     return c;

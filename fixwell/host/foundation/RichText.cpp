@@ -25,7 +25,8 @@ std::string colorTable(const std::vector<Color>& colors)
     // Entry 0 is the reader's own text colour; ours count from 1.
     std::string table = "{\\colortbl;";
     const auto level = [](double part) {
-        return std::to_string(static_cast<int>(part * 255 + 0.5));
+        const bool isPart = part > 0;  // NO for what is no number, too
+        return std::to_string(isPart ? static_cast<int>(std::min(part, 1.0) * 255 + 0.5) : 0);
     };
     for (const Color& color : colors)
         table += "\\red" + level(color.red) + "\\green" + level(color.green) + "\\blue" +

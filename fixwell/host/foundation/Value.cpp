@@ -6,6 +6,8 @@
 #include <algorithm>
 #include <array>
 #include <charconv>
+#include <cmath>
+#include <limits>
 
 namespace fixwell {
 namespace {
@@ -100,12 +102,24 @@ bool Value::isNumber() const noexcept
     return kind() == Kind::Boolean || kind() == Kind::Integer || kind() == Kind::Real;
 }
 
+// Beyond the range of the type a conversion has no defined result.
+static std::int64_t nearestInteger(double real) noexcept
+{
+    constexpr double limit = 9223372036854775808.0;  // 2^63
+    if (std::isnan(real))
+        return 0;
+    if (real >= limit)
+        return std::numeric_limits<std::int64_t>::max();
+    return real < -limit ? std::numeric_limits<std::int64_t>::min()
+                         : static_cast<std::int64_t>(real);
+}
+
 std::int64_t Value::integer() const noexcept
 {
     switch (kind()) {
         case Kind::Boolean:
         case Kind::Integer: return as<NumberNode>(node_).integer;
-        case Kind::Real: return static_cast<std::int64_t>(as<NumberNode>(node_).real);
+        case Kind::Real: return nearestInteger(as<NumberNode>(node_).real);
         default: return 0;
     }
 }

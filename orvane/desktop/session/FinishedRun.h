@@ -11,7 +11,8 @@ namespace orvane::desktop {
 /// One tool's run on one disk, as the user would name it.
 struct StartedRun {
     Operation operation = Operation::VerifyDisk;
-    std::string disk;  ///< any bytes
+    std::string disk;             ///< any bytes
+    std::string identifier = {};  ///< the disk's
 
     friend bool operator==(const StartedRun&, const StartedRun&) = default;
 };

@@ -72,8 +72,15 @@ LogModel::Change LogModel::changeTo(int rows) const
     return holdsOldRows(rows - rows_) ? Change::MoreInFront : Change::Other;
 }
 
+fixwell::OutlineItem LogModel::itemAt(int row) const
+{
+    return view_ != nullptr && row >= 0 ? view_->itemAtRow(static_cast<std::size_t>(row))
+                                        : fixwell::OutlineItem();
+}
+
 // Records are only ever added to a history, or replaced altogether: where the first and the last
-// of the old rows are what they were, so are those between.
+// of the old rows are what they were and none was added between, so are the others. Where one of
+// several histories grows in front of another, one of the two has moved.
 bool LogModel::holdsOldRows(int offset) const
 {
     return view_->itemAtRow(static_cast<std::size_t>(offset)).isSameAs(first_) &&

@@ -27,11 +27,14 @@ public:
     };
     void setSpokenTypes(SpokenTypes types) { spoken_ = std::move(types); }
 
-    /// Takes up the rows there are now. When there are only more of them, the selection and the
-    /// place of the view stay.
     /// How the rows differ from those before.
     enum class Change { None, MoreAtEnd, MoreInFront, Other };
+    /// Takes up the rows there are now. When there are only more of them at one end, the selection
+    /// stays.
     Change reload();
+
+    /// The record in a row, as the view answers it now; none for a row that it does not have.
+    fixwell::OutlineItem itemAt(int row) const;
 
     int rowCount(const QModelIndex& parent = {}) const override;
     /// The row's plain text for Qt::DisplayRole, and with its type for Qt::AccessibleTextRole; the

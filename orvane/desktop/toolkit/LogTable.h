@@ -7,8 +7,9 @@
 
 namespace orvane::desktop {
 
-/// The widget of the log: one column, equal rows, no header. A table rather than a tree, because
-/// a tree lays all its rows out anew whenever one is added.
+/// The widget of the log: one column, no header. Rows have one line until they come into sight;
+/// then they are as high as the delegate wants them. A table rather than a tree, because a tree
+/// lays all its rows out anew whenever one is added.
 class LogTable final : public QTableView {
 public:
     struct Handlers {
@@ -22,10 +23,13 @@ public:
     void setHandlers(Handlers handlers) { handlers_ = std::move(handlers); }
     /// Selected rows can be dragged out of the log.
     void setDraggable(bool isDraggable) { isDraggable_ = isDraggable; }
-    /// What a table does with a key that nobody else wants.
     /// What is hidden below the last visible row.
     int pixelsToEnd() const;
     void scrollToPixelsBeforeEnd(int pixels);
+    /// Scrolls until the row's top is so many pixels below that of the viewport, or as near as the
+    /// ends allow.
+    void putRowAt(int row, int top);
+    /// What a table does with a key that nobody else wants.
     void handleKey(QKeyEvent& event) { QTableView::keyPressEvent(&event); }
 
 protected:
@@ -33,9 +37,12 @@ protected:
     void mousePressEvent(QMouseEvent* event) override;
     void startDrag(Qt::DropActions supported) override;
     void changeEvent(QEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+    void paintEvent(QPaintEvent* event) override;
 
 private:
     void adoptFont();
+    bool fitRowsInSight();
 
     Handlers handlers_;
     bool isDraggable_ = true;

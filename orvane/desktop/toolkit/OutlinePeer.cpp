@@ -55,6 +55,9 @@ void OutlinePeer::setView(fixwell::OutlineView* view)
 void OutlinePeer::reloadData()
 {
     const bool hasSource = view_ != nullptr && view_->dataSource() != nullptr;
+    // Asked for their number, the source goes on to other rows.
+    if (!mustReload_)
+        place_ = LogPlace(*table_, model_);
     rows_ = hasSource ? view_->dataSource()->outlineViewNumberOfChildrenOfItem({}) : 0;
     mustReload_ = true;
     noteChange();
@@ -79,25 +82,26 @@ void OutlinePeer::flush()
         table_->viewport()->update();
     }
     const auto row = std::exchange(mustShow_, std::nullopt);
-    if (!row || *row >= rows_)
-        return;
-    if (*row == rows_ - 1)
-        table_->scrollToBottom();
-    else
+    if (std::exchange(mustShowEnd_, false))
+        table_->scrollToPixelsBeforeEnd(0);
+    else if (row && *row < rows_)
         table_->scrollTo(model_.index(static_cast<int>(*row)));
 }
 
-// Another log is shown from its end, where the last verdict stands. Where older rows come in front
-// of those that are there, these stay where they are.
+// Another log is shown from its end, where the last verdict stands. In one that goes on, who reads
+// at its end is shown the new end, and who has scrolled up keeps the place.
 void OutlinePeer::reload()
 {
-    const int pixelsBelow = table_->pixelsToEnd();
     const LogModel::Change change = model_.reload();
     rows_ = static_cast<std::size_t>(model_.rowCount());
+    if (change == LogModel::Change::None)
+        return;
     if (change == LogModel::Change::Other)
-        table_->scrollToBottom();
-    else if (change == LogModel::Change::MoreInFront)
-        table_->scrollToPixelsBeforeEnd(pixelsBelow);
+        place_.restoreSelection(*table_, model_);
+    if (place_.isAtEnd())
+        table_->scrollToPixelsBeforeEnd(0);
+    else if (change != LogModel::Change::MoreAtEnd && !place_.restoreSight(*table_, model_))
+        table_->scrollToPixelsBeforeEnd(0);
 }
 
 std::string OutlinePeer::selectionHTML() const
@@ -131,6 +135,8 @@ std::size_t OutlinePeer::numberOfSelectedRows() const
 void OutlinePeer::scrollRowToVisible(std::size_t row)
 {
     mustShow_ = row;
+    // Rows that come until then make another one the last.
+    mustShowEnd_ = row + 1 == rows_;
     noteChange();
 }
 

@@ -3,6 +3,7 @@
 
 #include "fixwell/host/toolkit/OutlineView.h"
 #include "orvane/desktop/toolkit/LogModel.h"
+#include "orvane/desktop/toolkit/LogPlace.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/QtScroller.h"
 
@@ -67,7 +68,9 @@ private:
     std::size_t rows_ = 0;
     bool mustReload_ = false;
     bool isWaiting_ = false;  ///< the event loop will come to `flush`
+    LogPlace place_;          ///< of the reader, before the reload that is waiting
     std::optional<std::size_t> mustShow_;
+    bool mustShowEnd_ = false;  ///< the row to be shown was the last one
     fixwell::DragOperation localMask_ = fixwell::DragOperation::None;
     fixwell::DragOperation outsideMask_ = fixwell::DragOperation::None;
 };

@@ -5,6 +5,8 @@
 
 #include <QPushButton>
 
+#include <utility>
+
 namespace orvane::desktop {
 
 QtButton::QtButton(QAbstractButton& widget, Pressed pressed)
@@ -31,6 +33,29 @@ void QtButton::setToolTip(std::string_view text)
     if (toolTip_ == text)
         return;
     toolTip_ = text;
+    reason_.clear();
+    showToolTip();
+}
+
+void QtButton::setReason(std::string_view reason)
+{
+    if (widget_.isEnabled() || reason_ == reason)
+        return;
+    reason_ = reason;
+    showToolTip();
+}
+
+void QtButton::setEnabled(bool isEnabled)
+{
+    widget_.setEnabled(isEnabled);
+    if (isEnabled && !std::exchange(reason_, {}).empty())
+        showToolTip();
+}
+
+void QtButton::showToolTip()
+{
+    const std::string between = reason_.empty() || toolTip_.empty() ? "" : "\n\n";
+    const std::string text = toolTip_ + between + reason_;
     widget_.setToolTip(toQtToolTip(text));
     widget_.setAccessibleDescription(toQt(text));
 }

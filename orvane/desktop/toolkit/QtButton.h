@@ -22,7 +22,8 @@ public:
     ~QtButton() override;
 
     void setNeedsDisplay(bool needsDisplay) override;
-    void setEnabled(bool isEnabled) override { widget_.setEnabled(isEnabled); }
+    /// A button that works has no reason not to.
+    void setEnabled(bool isEnabled) override;
     bool isEnabled() const override { return widget_.isEnabled(); }
     void setToolTip(std::string_view text) override;
     void setTitle(std::string_view title) override;
@@ -35,21 +36,27 @@ public:
     /// As the module gave it, without the escapes that the widget needs.
     const std::string& title() const { return title_; }
     const std::string& toolTip() const { return toolTip_; }
+    /// What the host has to say about why the button is grey, behind the module's tooltip; until
+    /// the module says something else, or the button can be pressed again.
+    void setReason(std::string_view reason);
     std::int64_t tag() const { return tag_; }
     bool isChecked() const { return widget_.isChecked(); }
     /// Return presses it.
     bool isDefault() const { return isDefault_; }
-    QAbstractButton& widget() { return widget_; }
+    QAbstractButton& widget() const { return widget_; }
 
     /// As a click does; nothing when the button is disabled.
     void press() { widget_.click(); }
 
 private:
+    void showToolTip();
+
     QAbstractButton& widget_;
     QMetaObject::Connection clicks_;
     std::string action_;
     std::string title_;
     std::string toolTip_;
+    std::string reason_;
     std::int64_t tag_ = 0;
     bool isDefault_ = false;
 };

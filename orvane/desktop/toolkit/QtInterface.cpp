@@ -34,6 +34,8 @@ void LoadedInterface::adoptButtons()
 {
     for (QAbstractButton* widget : root_->findChildren<QAbstractButton*>()) {
         auto button = std::make_unique<QtButton>(*widget, [this](QtButton& sender) {
+            if (beforeAction_)
+                beforeAction_(sender.action());
             if (owner_ != nullptr)
                 owner_->perform(sender.action(), &sender);
         });

@@ -36,6 +36,11 @@ public:
     QWidget& widget() { return *root_; }
     /// None when the file has no button of that name.
     QtButton* button(std::string_view name);
+    /// Told of every action before the module performs it.
+    void setBeforeAction(std::function<void(std::string_view action)> told)
+    {
+        beforeAction_ = std::move(told);
+    }
     /// The module's view of its log, for the menus: copy, select all, delete, validation. None
     /// when the file has none, and after the module has gone.
     fixwell::OutlineView* outlineView() { return outlineView_.get(); }
@@ -58,6 +63,7 @@ private:
     QPointer<QWidget> root_;
     fixwell::InterfaceOwner* owner_;
     const std::function<void()>& beforeRows_;
+    std::function<void(std::string_view action)> beforeAction_;
     std::map<std::string, std::unique_ptr<QtButton>, std::less<>> buttons_;
     std::vector<std::unique_ptr<fixwell::View>> texts_;
     std::unique_ptr<OutlinePeer> peer_;

@@ -152,25 +152,60 @@ QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLook
     return formats;
 }
 
-void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks)
+namespace {
+
+void layOut(QTextLayout& layout, const StyledLine& line, const LineLooks& looks,
+            QTextOption::WrapMode wrapMode, double width)
 {
-    const QFont font = widestFont(line, looks);
-    const StyledLine shown = fitted(line, QFontMetricsF(font, painter.device()), rect.width());
-    QTextLayout layout(shown.text, font, painter.device());
     QTextOption option;
-    option.setWrapMode(QTextOption::NoWrap);
+    option.setWrapMode(wrapMode);
     layout.setTextOption(option);
-    layout.setFormats(formatsOf(shown, looks));
+    layout.setFormats(formatsOf(line, looks));
+    double height = 0;
     layout.beginLayout();
-    QTextLine textLine = layout.createLine();
-    if (textLine.isValid())
-        textLine.setLineWidth(rect.width());
+    for (QTextLine part = layout.createLine(); part.isValid(); part = layout.createLine()) {
+        part.setLineWidth(width);
+        part.setPosition({0, height});
+        height += part.height();
+        if (wrapMode == QTextOption::NoWrap)
+            break;
+    }
     layout.endLayout();
+}
+
+void drawCentred(QPainter& painter, const QRectF& rect, const QTextLayout& layout)
+{
     const double top = rect.top() + (rect.height() - layout.boundingRect().height()) / 2;
     painter.save();
     painter.setClipRect(rect, Qt::IntersectClip);
     layout.draw(&painter, QPointF(rect.left(), top));
     painter.restore();
+}
+
+}  // namespace
+
+void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks)
+{
+    const QFont font = widestFont(line, looks);
+    const StyledLine shown = fitted(line, QFontMetricsF(font, painter.device()), rect.width());
+    QTextLayout layout(shown.text, font, painter.device());
+    layOut(layout, shown, looks, QTextOption::NoWrap, rect.width());
+    drawCentred(painter, rect, layout);
+}
+
+void drawWrapped(QPainter& painter, const QRectF& rect, const StyledLine& line,
+                 const LineLooks& looks)
+{
+    QTextLayout layout(line.text, widestFont(line, looks), painter.device());
+    layOut(layout, line, looks, QTextOption::WrapAtWordBoundaryOrAnywhere, rect.width());
+    drawCentred(painter, rect, layout);
+}
+
+double wrappedHeight(const StyledLine& line, const LineLooks& looks, double width)
+{
+    QTextLayout layout(line.text, widestFont(line, looks));
+    layOut(layout, line, looks, QTextOption::WrapAtWordBoundaryOrAnywhere, width);
+    return layout.boundingRect().height();
 }
 
 }  // namespace orvane::desktop

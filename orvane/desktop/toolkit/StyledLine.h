@@ -49,5 +49,10 @@ QFont widestFont(const StyledLine& line, const LineLooks& looks);
 QList<QTextLayout::FormatRange> formatsOf(const StyledLine& line, const LineLooks& looks);
 /// Fits the line into the rectangle and draws it, centred vertically.
 void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const LineLooks& looks);
+/// Draws the line on as many lines as it takes at the rectangle's width.
+void drawWrapped(QPainter& painter, const QRectF& rect, const StyledLine& line,
+                 const LineLooks& looks);
+/// How high that is.
+double wrappedHeight(const StyledLine& line, const LineLooks& looks, double width);
 
 }  // namespace orvane::desktop

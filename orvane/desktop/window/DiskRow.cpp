@@ -29,10 +29,18 @@ std::string_view kindText(std::int32_t type)
     }
 }
 
-QString nameText(const DiskFacts& facts)
+/// As the log names it, by its label, and with the file or the device that bears it.
+QString nameText(const DiskRow& row)
 {
+    const DiskFacts& facts = row.facts;
+    const QString file = shown(facts.path.filename().native());
+    const QString label = shown(row.label);
+    const bool isInImage = facts.storage == fixwell::DiskReference::Storage::FileRegion &&
+                           facts.type != diskType::diskImage;
+    if (!label.isEmpty() && !isInImage && !file.isEmpty())
+        return label + QStringLiteral(" (") + file + QLatin1Char(')');
     const QString name = shown(facts.displayName);
-    return name.isEmpty() ? shown(facts.path.filename().native()) : name;
+    return name.isEmpty() ? file : name;
 }
 
 QString sizeText(std::uint64_t bytes)
@@ -42,28 +50,68 @@ QString sizeText(std::uint64_t bytes)
     return QLocale().formattedDataSize(static_cast<qint64>(bytes), 1, QLocale::DataSizeIecFormat);
 }
 
-QString timeText(const LastCheck& check)
+QString timeText(const QDateTime& time)
 {
-    return QLocale().toString(check.started, QLocale::ShortFormat);
+    return QLocale().toString(time, QLocale::ShortFormat);
+}
+
+QString verdictText(const Check& check, const Translator& texts)
+{
+    return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
+}
+
+/// "11/22/26 2:08 AM, then stopped"
+QString lastCheckText(const LastCheck& check, const Translator& texts)
+{
+    const QString time = timeText(check.told.started);
+    return check.later
+               ? toQt(texts.sentence("%@, then %@",
+                                     {fromQt(time), fromQt(verdictText(*check.later, texts))}))
+               : time;
+}
+
+QStringList toolTipOfCheck(const LastCheck& check, const Translator& texts)
+{
+    QStringList lines;
+    if (check.isPartial)
+        lines += toQt(texts.text("not all of its volumes have been checked"));
+    if (!check.part.empty())
+        lines += toQt(texts.sentence("on it: “%@”", {fixwell::printable(check.part)}));
+    lines += toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(check.told.started)),
+                                                         fromQt(verdictText(check.told, texts))}));
+    if (!check.told.message.empty())
+        lines += shown(check.told.message);
+    if (!check.later)
+        return lines;
+    lines += toQt(texts.sentence("after that, %@: %@", {fromQt(timeText(check.later->started)),
+                                                        fromQt(verdictText(*check.later, texts))}));
+    if (!check.later->message.empty())
+        lines += shown(check.later->message);
+    return lines;
 }
 
 }  // namespace
 
-QString verdictText(const LastCheck& check, const Translator& texts)
+QString stateText(const DiskRow& row, const Translator& texts)
 {
-    return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
+    if (!row.activity.empty())
+        return shown(row.activity);
+    if (!row.lastCheck)
+        return {};
+    return row.lastCheck->isPartial ? toQt(texts.text("partly checked"))
+                                    : verdictText(row.lastCheck->told, texts);
 }
 
 QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts)
 {
     switch (column) {
-        case DiskColumn::Name: return nameText(row.facts);
+        case DiskColumn::Name: return nameText(row);
         case DiskColumn::Size: return sizeText(row.facts.length);
         case DiskColumn::Format: return shown(row.filesystem);
         case DiskColumn::MountPoint: return shown(row.facts.mountPoint);
-        case DiskColumn::Verdict:
-            return row.lastCheck ? verdictText(*row.lastCheck, texts) : QString();
-        case DiskColumn::LastCheck: return row.lastCheck ? timeText(*row.lastCheck) : QString();
+        case DiskColumn::Verdict: return stateText(row, texts);
+        case DiskColumn::LastCheck:
+            return row.lastCheck ? lastCheckText(*row.lastCheck, texts) : QString();
     }
     return {};
 }
@@ -86,6 +134,9 @@ QString columnTitle(DiskColumn column, const Translator& texts)
 
 QString rowDetails(const DiskRow& row, const Translator& texts)
 {
+    // There is room for a few words.
+    if (!row.note.empty())
+        return shown(row.note);
     QStringList parts{row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
                                              : shown(row.filesystem)};
     if (row.facts.length != 0)
@@ -99,18 +150,19 @@ QString rowDetails(const DiskRow& row, const Translator& texts)
 
 QString rowSummary(const DiskRow& row, const Translator& texts)
 {
-    QStringList parts{nameText(row.facts)};
-    if (row.lastCheck)
-        parts += verdictText(*row.lastCheck, texts);
+    QStringList parts{nameText(row)};
+    if (const QString state = stateText(row, texts); !state.isEmpty())
+        parts += state;
     parts += rowDetails(row, texts);
     if (row.lastCheck)
-        parts += toQt(texts.sentence("last checked %@", {fromQt(timeText(*row.lastCheck))}));
+        parts +=
+            toQt(texts.sentence("last checked %@", {fromQt(lastCheckText(*row.lastCheck, texts))}));
     return parts.join(QStringLiteral(", "));
 }
 
 QString rowToolTip(const DiskRow& row, const Translator& texts)
 {
-    QStringList lines{nameText(row.facts), shown(row.facts.path.native()),
+    QStringList lines{nameText(row), shown(row.facts.path.native()),
                       toQt(texts.text(kindText(row.facts.type)))};
     if (row.facts.length != 0)
         lines.back() += QStringLiteral(", ") + sizeText(row.facts.length);
@@ -118,15 +170,14 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
         lines.back() += QStringLiteral(", ") + shown(row.filesystem);
     if (!row.facts.mountPoint.empty())
         lines += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
-    if (!row.lastCheck) {
+    if (!row.note.empty())
+        lines += shown(row.note);
+    if (!row.activity.empty())
+        lines += shown(row.activity);
+    if (row.lastCheck)
+        lines += toolTipOfCheck(*row.lastCheck, texts);
+    else if (row.activity.empty())
         lines += toQt(texts.text("never checked"));
-        return lines.join(QLatin1Char('\n'));
-    }
-    lines +=
-        toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(*row.lastCheck)),
-                                                    fromQt(verdictText(*row.lastCheck, texts))}));
-    if (!row.lastCheck->message.empty())
-        lines += shown(row.lastCheck->message);
     return lines.join(QLatin1Char('\n'));
 }
 

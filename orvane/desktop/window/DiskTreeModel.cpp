@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/DiskTreeModel.h"
 
+#include "fixwell/host/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskIcons.h"
 
@@ -13,6 +14,25 @@ bool isImageContents(const Disk& disk)
 {
     return disk.facts().storage == fixwell::DiskReference::Storage::FileRegion &&
            !disk.isOfflineDiskImage();
+}
+
+/// What is good is 0, and what is known to be bad is worse than what is not known.
+int badness(const Check& check)
+{
+    if (check.verdict == fixwell::kPLVerdictSound.text() ||
+        check.verdict == fixwell::kPLVerdictRepaired.text())
+        return 0;
+    return check.verdict == fixwell::kPLVerdictDamaged.text() ? 2 : 1;
+}
+
+/// None while something is done to the disk: its verdict is not shown then.
+QIcon stateIcon(const DiskRow& row)
+{
+    if (!row.activity.empty() || (row.lastCheck && row.lastCheck->isPartial))
+        return {};
+    if (row.lastCheck)
+        return verdictIcon(row.lastCheck->told.verdict);
+    return row.note.empty() ? QIcon() : verdictIcon("");
 }
 
 }  // namespace
@@ -32,12 +52,9 @@ struct DiskTreeModel::Node {
     }
 };
 
-DiskTreeModel::DiskTreeModel(const DiskController& disks, LastCheckLookup lastCheckOf,
+DiskTreeModel::DiskTreeModel(const DiskController& disks, DiskStates states,
                              const Translator& texts)
-    : disks_(disks),
-      lastCheckOf_(std::move(lastCheckOf)),
-      texts_(texts),
-      top_(std::make_unique<Node>())
+    : disks_(disks), states_(std::move(states)), texts_(texts), top_(std::make_unique<Node>())
 {
 }
 
@@ -79,13 +96,59 @@ std::vector<DiskTreeModel::DiskPointer> DiskTreeModel::rootsShown() const
 
 DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
 {
-    DiskRow row{disk->facts(), disk->facts().filesystem, lastCheckOf_(*disk)};
-    const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr;
-    if (!contents)
-        return row;
-    row.filesystem = contents->facts().filesystem;
-    row.lastCheck = lastCheckOf_(*contents);
+    DiskRow row{disk->facts(), disk->facts().label, disk->facts().filesystem, checkOf(*disk)};
+    row.activity = activityOf(*disk);
+    row.note = states_.note(*disk);
+    if (const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr) {
+        row.label = contents->facts().label;
+        row.filesystem = contents->facts().filesystem;
+    }
     return row;
+}
+
+// What was said of an image file itself concerns an attempt that did not get at its contents.
+std::optional<LastCheck> DiskTreeModel::ownCheckOf(const Disk& disk) const
+{
+    auto own = states_.lastCheck(disk);
+    const DiskPointer contents = disk.isOfflineDiskImage() ? contentsOf(disk) : nullptr;
+    auto inside = contents ? states_.lastCheck(*contents) : std::nullopt;
+    if (!own || !inside)
+        return own ? own : inside;
+    const Check& last = inside->later ? *inside->later : inside->told;
+    if (own->told.started > last.started)
+        inside->later = own->told;
+    return inside;
+}
+
+// The worst there is, the disk's own before its parts'.
+std::optional<LastCheck> DiskTreeModel::checkOf(const Disk& disk) const
+{
+    auto worst = ownCheckOf(disk);
+    bool isPartial = false;
+    for (const DiskPointer& child : childrenOf(disk)) {
+        auto check = checkOf(*child);
+        isPartial = isPartial || !check || check->isPartial;
+        if (!check || (worst && badness(worst->told) >= badness(check->told)))
+            continue;
+        if (check->part.empty())
+            check->part = child->displayName();
+        worst = std::move(check);
+    }
+    if (worst)
+        worst->isPartial = isPartial && badness(worst->told) == 0;
+    return worst;
+}
+
+std::string DiskTreeModel::activityOf(const Disk& disk) const
+{
+    std::string activity = states_.activity(disk);
+    const DiskPointer contents = disk.isOfflineDiskImage() ? contentsOf(disk) : nullptr;
+    if (activity.empty() && contents)
+        activity = states_.activity(*contents);
+    for (const DiskPointer& child : childrenOf(disk))
+        if (activity.empty())
+            activity = activityOf(*child);
+    return activity;
 }
 
 void DiskTreeModel::synchronize()
@@ -196,9 +259,7 @@ QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
         case Qt::DecorationRole:
             if (column == DiskColumn::Name)
                 return diskIcon(row.facts);
-            if (column == DiskColumn::Verdict && row.lastCheck)
-                return verdictIcon(row.lastCheck->verdict);
-            return {};
+            return column == DiskColumn::Verdict ? stateIcon(row) : QIcon();
         case Qt::TextAlignmentRole:
             return column == DiskColumn::Size ? QVariant(Qt::AlignRight | Qt::AlignVCenter)
                                               : QVariant();

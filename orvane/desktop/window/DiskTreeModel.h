@@ -20,8 +20,7 @@ public:
     static constexpr int DetailsRole = Qt::UserRole + 1;
 
     /// All outlive this object.
-    DiskTreeModel(const DiskController& disks, LastCheckLookup lastCheckOf,
-                  const Translator& texts);
+    DiskTreeModel(const DiskController& disks, DiskStates states, const Translator& texts);
     ~DiskTreeModel() override;
 
     /// Takes rows in and out where disks have come or gone, and shows the others as they are now.
@@ -52,9 +51,12 @@ private:
     void removeGone(Node& node, const QModelIndex& at, const std::vector<DiskPointer>& wanted);
     void synchronize(Node& node, const QModelIndex& at, const std::vector<DiskPointer>& wanted);
     DiskRow rowOf(const DiskPointer& disk) const;
+    std::optional<LastCheck> ownCheckOf(const Disk& disk) const;
+    std::optional<LastCheck> checkOf(const Disk& disk) const;
+    std::string activityOf(const Disk& disk) const;
 
     const DiskController& disks_;
-    const LastCheckLookup lastCheckOf_;
+    const DiskStates states_;
     const Translator& texts_;
     std::unique_ptr<Node> top_;
 };

@@ -51,6 +51,7 @@ void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Transla
 {
     for (const Menu& menu : menus) {
         QMenu* const added = window.menuBar()->addMenu(toQt(texts.text(menu.title)));
+        added->setObjectName(QLatin1String(menu.objectName));
         for (const MenuCommand& command : menu.commands)
             addCommand(*added, command, texts);
     }

@@ -27,6 +27,7 @@ struct MenuCommand {
 struct Menu {
     std::string_view title;
     std::vector<MenuCommand> commands;
+    const char* objectName = "";
 };
 
 /// Gives the window a menu bar. Whether a command is available is found out when it matters:

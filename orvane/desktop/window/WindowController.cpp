@@ -7,6 +7,8 @@ namespace orvane::desktop {
 std::vector<fixwell::OVDiskPointer> WindowController::allSelectedItemsFilterDuplicates(
     bool /*flag*/, bool /*filtersDuplicates*/)
 {
+    if (!selection_.empty())
+        return selection_;
     const auto disks = window_.disks().selectedDisks();
     return {disks.begin(), disks.end()};
 }

@@ -20,6 +20,10 @@ public:
     explicit WindowController(MainWindow& window) : window_(window) {}
     void setEvents(Events events) { events_ = std::move(events); }
 
+    using Disks = std::vector<fixwell::OVDiskPointer>;
+    /// The modules see these as the selection, whatever the list shows, until none are given.
+    void setSelection(Disks disks) { selection_ = std::move(disks); }
+
     std::vector<fixwell::OVDiskPointer> allSelectedItemsFilterDuplicates(
         bool flag, bool filtersDuplicates) override;
     void setInterfaceLock() override { setLocked(true); }
@@ -40,6 +44,7 @@ private:
 
     MainWindow& window_;
     Events events_;
+    Disks selection_;  ///< in place of the list's
     bool isLocked_ = false;
 };
 

@@ -77,6 +77,20 @@ void Disk::setParts(std::vector<std::shared_ptr<Disk>> parts)
         child->parent_ = weak_from_this();
 }
 
+void Disk::setContents(std::shared_ptr<Disk> contents)
+{
+    contents_ = std::move(contents);
+    if (contents_)
+        contents_->image_ = weak_from_this();
+}
+
+std::shared_ptr<fixwell::OVDisk> Disk::parentDisk() const
+{
+    const auto parent = parent_.lock();
+    const auto image = parent ? parent->image_.lock() : nullptr;
+    return image ? image : parent;
+}
+
 std::vector<std::shared_ptr<fixwell::OVDisk>> Disk::children() const
 {
     return {children_.begin(), children_.end()};
@@ -117,18 +131,24 @@ std::vector<std::shared_ptr<Disk>> Disk::inside() const
     return disks;
 }
 
-void Disk::collectHistories(std::vector<Array>& histories) const
+void Disk::collect(std::vector<const Disk*>& disks) const
 {
-    histories.push_back(fsckHistoryNoChildren());
+    disks.push_back(this);
     for (const auto& disk : inside())
-        disk->collectHistories(histories);
+        disk->collect(disks);
 }
 
 Array Disk::fsckHistory() const
 {
+    std::vector<const Disk*> disks;
+    collect(disks);
     std::vector<Array> histories;
-    collectHistories(histories);
-    return histories.size() == 1 ? histories.front() : merged_.of(histories);
+    for (const Disk* disk : disks)
+        histories.push_back(disk->fsckHistoryNoChildren());
+    HistoryKeeper* const keeper = surroundings_.histories;
+    return merged_.of(histories, [&](std::size_t i) {
+        return keeper != nullptr ? &keeper->timesOf(disks[i]->facts_) : nullptr;
+    });
 }
 
 void Disk::setFsckHistory(const Array& history)

@@ -37,7 +37,9 @@ public:
     void setGone();
     bool hasGone() const { return hasGone_; }
     /// An image file shows the histories of what was found in it, also after it was detached.
-    void setContents(std::shared_ptr<Disk> contents) { contents_ = std::move(contents); }
+    void setContents(std::shared_ptr<Disk> contents);
+    /// None for what is no image file, or was never attached.
+    const std::shared_ptr<Disk>& contents() const { return contents_; }
 
     std::string diskIdentifier() const override { return facts_.identifier; }
     /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.
@@ -45,7 +47,8 @@ public:
     std::int32_t diskType() const override { return facts_.type; }
     std::int64_t diskNumber() const override { return facts_.number; }
     bool isWhole() const override { return facts_.isWhole; }
-    std::shared_ptr<OVDisk> parentDisk() const override { return parent_.lock(); }
+    /// Of what lies in an image, the image: the whole disk in it is in no list.
+    std::shared_ptr<OVDisk> parentDisk() const override;
     std::vector<std::shared_ptr<OVDisk>> children() const override;
     std::optional<std::string> mountPoint() const override
     {
@@ -73,7 +76,7 @@ public:
 
 private:
     std::vector<std::shared_ptr<Disk>> inside() const;
-    void collectHistories(std::vector<fixwell::Array>& histories) const;
+    void collect(std::vector<const Disk*>& disks) const;
 
     DiskFacts facts_;
     bool hasGone_ = false;
@@ -83,6 +86,7 @@ private:
     std::weak_ptr<Disk> parent_;
     std::vector<std::shared_ptr<Disk>> children_;
     std::shared_ptr<Disk> contents_;
+    std::weak_ptr<Disk> image_;  ///< of a disk that is the contents of one
 
     mutable fixwell::Array own_;
     mutable std::uint64_t ownRevision_ = 0;  ///< of the keeper, when it was asked

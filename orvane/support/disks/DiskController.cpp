@@ -35,6 +35,14 @@ void collect(const std::shared_ptr<Disk>& disk, std::vector<std::shared_ptr<Disk
         collect(child, all);
 }
 
+DiskTree treeOf(const Disk& disk)
+{
+    DiskTree tree{disk.facts(), {}};
+    for (const auto& part : disk.parts())
+        tree.children.push_back(treeOf(*part));
+    return tree;
+}
+
 DiskFacts factsOf(const fixwell::DiskReference& reference)
 {
     DiskFacts facts;
@@ -99,17 +107,40 @@ std::shared_ptr<Disk> DiskController::addDevice(const DiskFacts& facts)
     return add(facts);
 }
 
+void DiskController::adopt(const DiskTree& top)
+{
+    adopt(Disk::make(top, surroundings_));
+}
+
 void DiskController::adopt(const std::shared_ptr<Disk>& top)
 {
-    if (diskNamed(top->facts().identifier) != nullptr)
+    const auto known = diskNamed(top->facts().identifier);
+    if (known == top)
         return;
     const auto image = find([&](const Disk& disk) {
         return disk.isOfflineDiskImage() && disk.facts().imagePath == top->facts().path;
     });
     if (image)
+        bringUpToDate(image, top->facts());
+    if (known) {
+        update(known, treeOf(*top));
+        return;
+    }
+    if (image)
         image->setContents(top);
     roots_.push_back(top);
     appear(top);
+}
+
+void DiskController::bringUpToDate(const std::shared_ptr<Disk>& image, const DiskFacts& contents)
+{
+    DiskFacts facts = image->facts();
+    facts.length = contents.length;
+    facts.isWritable = contents.isWritable;
+    if (facts == image->facts())
+        return;
+    image->setFacts(facts);
+    post(fixwell::OVDiskChangedNotification, image);
 }
 
 void DiskController::post(fixwell::Name name, const std::shared_ptr<Disk>& disk)

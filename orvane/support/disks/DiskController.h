@@ -42,8 +42,10 @@ public:
     std::shared_ptr<Disk> addImage(const DiskFacts& facts);
     /// Takes in a device that the system's list does not have, until the next `synchronize`.
     std::shared_ptr<Disk> addDevice(const DiskFacts& facts);
-    /// Makes the disk of an attached image known, with all its parts. Once is enough.
+    /// Makes the disk of an attached image known, with all its parts. Where it is known already,
+    /// it is brought up to date: what is in the image may have changed.
     void adopt(const std::shared_ptr<Disk>& top);
+    void adopt(const DiskTree& top);
     /// Brings the system's disks up to date: what is new appears, what has gone is ejected, what
     /// is different is changed or unmounted. Image files and their contents stay.
     void synchronize(const std::vector<DiskTree>& systemDisks);
@@ -81,6 +83,7 @@ private:
     void tellGone(const std::shared_ptr<Disk>& disk);
     void forget(const std::shared_ptr<Disk>& root);
     void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
+    void bringUpToDate(const std::shared_ptr<Disk>& image, const DiskFacts& contents);
     void warn(const Outcome<>& outcome);
 
     fixwell::NotificationCenter& center_;

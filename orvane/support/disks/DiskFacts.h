@@ -43,6 +43,8 @@ struct DiskFacts {
     bool isEjectable = false;
     /// The drive says of itself that it is failing (SMART), or so does that of a part.
     bool hasSMARTError = false;
+    /// Of the whole disk in an image: its partition map was found damaged when it was read.
+    bool hasDamagedMap = false;
 
     std::filesystem::path imagePath;  ///< of an image file that is not attached
 

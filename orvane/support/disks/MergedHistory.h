@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
+#include "orvane/support/disks/HistoryKeeper.h"
 
 #include <cstddef>
+#include <functional>
 #include <vector>
 
 namespace orvane {
@@ -13,10 +14,14 @@ namespace orvane {
 /// so that keeping up costs the same per record however long the histories are.
 class MergedHistory {
 public:
-    /// The list of all records; where only one history has any, that one. At first one history
-    /// after the other, then each new record behind all others, so that the newest is the last one
-    /// whichever disk it concerns. A history that was cleared or replaced begins a new list.
-    fixwell::Array of(const std::vector<fixwell::Array>& histories);
+    /// Answers the times of the history at a position in the list of histories.
+    using TimesLookup = std::function<const RecordTimes*(std::size_t history)>;
+
+    /// The list of all records in the order of their times, each history's in its own order; where
+    /// only one history has any, that one, and no list where none has. What came at the same time
+    /// goes on with the history that the last record was of, because one job runs at a time. A
+    /// history that was cleared or replaced begins a new list.
+    fixwell::Array of(const std::vector<fixwell::Array>& histories, const TimesLookup& timesOf);
 
 private:
     /// A history as far as it was taken over: enough to see that it has only grown since.
@@ -27,13 +32,15 @@ private:
         fixwell::Value last;
 
         bool hasOnlyGrown(const fixwell::Array& now) const;
-        void takeNew(const fixwell::Array& merged);
+        void take(std::size_t end, const fixwell::Array& merged);
     };
 
     bool canGoOn(const std::vector<fixwell::Array>& histories) const;
+    void takeNew(const TimesLookup& timesOf);
 
     fixwell::Array merged_;
     std::vector<Part> parts_;
+    std::size_t newest_ = 0;  ///< the part that the last record is of
 };
 
 }  // namespace orvane

@@ -46,13 +46,11 @@ std::optional<Mount> parseLine(const std::string& line)
         return std::nullopt;
     while (fields >> optional && optional != "-") {
     }
-    std::string filesystem, source, superOptions;
+    std::string filesystem, source;
     if (!(fields >> filesystem >> source))
         return std::nullopt;
-    fields >> superOptions;
-    return Mount{
-        device,     unescaped(root),   unescaped(mountPoint),
-        filesystem, unescaped(source), hasOption(options, "ro") || hasOption(superOptions, "ro")};
+    return Mount{device,     unescaped(root),   unescaped(mountPoint),
+                 filesystem, unescaped(source), hasOption(options, "ro")};
 }
 
 /// A device mapper's volume is mounted by its name, which is a link to its node.

@@ -16,6 +16,8 @@ struct Mount {
     std::string mountPoint;
     std::string filesystem;
     std::string source;  ///< the device's path, where there is one
+    /// It was asked for. A file system that the kernel no longer writes since it met an error is not:
+    /// that one is still to be repaired.
     bool isReadOnly = false;
 
     friend bool operator==(const Mount&, const Mount&) = default;

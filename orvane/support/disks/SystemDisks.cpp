@@ -117,11 +117,13 @@ void addMount(DiskFacts& facts, const std::string& number, const DiskSources& so
     facts.mountPoint = mount->mountPoint;
     if (facts.filesystem.empty())
         facts.filesystem = filesystemOf(*mount);
+    facts.isWritable = facts.isWritable && !mount->isReadOnly;
     facts.isBootVolume = mount->mountPoint == "/";
     const auto home = sources.homeDirectory.empty()
                           ? std::nullopt
                           : mountHolding(sources.mounts, sources.homeDirectory);
-    facts.containsUserHome = home && home->device == mount->device;
+    // What holds both is known as the startup disk.
+    facts.containsUserHome = home && home->device == mount->device && !facts.isBootVolume;
 }
 
 void addSuperblock(DiskFacts& facts, const Contents& contents)

@@ -3,11 +3,18 @@
 
 #include <sqlite3.h>
 
+#include <thread>
+
 namespace orvane {
 namespace {
 
-// How long another program may hold the right to write before we give up.
-constexpr int patienceMilliseconds = 3000;
+using namespace std::chrono_literals;
+
+// Another program may hold the right to write for so long; then every attempt gives up at once until
+// it is free. A check does not wait for its history once for each record.
+constexpr auto longestWait = 2s;
+// What was free for so long is held anew.
+constexpr auto newBeginning = 10s;
 
 }  // namespace
 
@@ -75,19 +82,38 @@ Database Database::opened(const char* name)
 {
     Database result;
     sqlite3* database = nullptr;
-    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE;
+    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE |
+                      SQLITE_OPEN_NOFOLLOW;
     const int error = sqlite3_open_v2(name, &database, flags, nullptr);
     result.database_.reset(database);
-    if (error != SQLITE_OK)
+    if (error != SQLITE_OK) {
         result.database_.reset();
-    else
-        sqlite3_busy_timeout(database, patienceMilliseconds);
+        return result;
+    }
+    result.patience_ = std::make_unique<Patience>();
+    sqlite3_busy_handler(database, waitOrGiveUp, result.patience_.get());
     return result;
+}
+
+int Database::waitOrGiveUp(void* patience, int /*count*/)
+{
+    auto& waited = *static_cast<Patience*>(patience);
+    const auto now = Patience::Clock::now();
+    if (now - waited.last > newBeginning)
+        waited.first = now;
+    waited.last = now;
+    if (now - waited.first > longestWait)
+        return 0;
+    std::this_thread::sleep_for(10ms);
+    return 1;
 }
 
 Database Database::open(const std::filesystem::path& file)
 {
-    return opened(file.c_str());
+    // The directory may be reached through links, the file itself may be none.
+    std::error_code error;
+    const auto directory = std::filesystem::canonical(file.parent_path(), error);
+    return error ? Database() : opened((directory / file.filename()).c_str());
 }
 
 Database Database::inMemory()
@@ -115,7 +141,7 @@ std::int64_t Database::lastInsertedRow() const
 
 Database::Trouble Database::trouble() const
 {
-    switch (sqlite3_errcode(database_.get()) & 0xFF) {
+    switch ((kept_ ? kept_->code : sqlite3_errcode(database_.get())) & 0xFF) {
         case SQLITE_OK:
         case SQLITE_ROW:
         case SQLITE_DONE: return Trouble::None;
@@ -129,19 +155,27 @@ Database::Trouble Database::trouble() const
 
 std::string Database::lastError() const
 {
-    return sqlite3_errmsg(database_.get());
+    return kept_ ? kept_->text : sqlite3_errmsg(database_.get());
 }
 
-Transaction::Transaction(Database& database)
-    : database_(database), isOpen_(database.execute("BEGIN IMMEDIATE"))
+void Database::keepError()
 {
+    kept_ = {sqlite3_extended_errcode(database_.get()), sqlite3_errmsg(database_.get())};
+}
+
+Transaction::Transaction(Database& database) : database_(database)
+{
+    database_.forgetError();
+    isOpen_ = database_.execute("BEGIN IMMEDIATE");
 }
 
 // A failed statement may have rolled everything back already; then there is nothing left to undo.
 Transaction::~Transaction()
 {
-    if (isOpen_)
-        static_cast<void>(database_.execute("ROLLBACK"));
+    if (!isOpen_)
+        return;
+    database_.keepError();
+    static_cast<void>(database_.execute("ROLLBACK"));
 }
 
 bool Transaction::commit()

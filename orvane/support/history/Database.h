@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include <chrono>
 #include <cstdint>
 #include <filesystem>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -66,14 +68,31 @@ public:
 
     [[nodiscard]] Trouble trouble() const;
     [[nodiscard]] std::string lastError() const;
+    /// Keeps what the two say now for as long as no transaction begins: undoing what failed would
+    /// overwrite it.
+    void keepError();
+    void forgetError() { kept_.reset(); }
 
 private:
+    /// How long other programs have held the right to write.
+    struct Patience {
+        using Clock = std::chrono::steady_clock;
+        Clock::time_point first;
+        Clock::time_point last;
+    };
+    struct Error {
+        int code = 0;
+        std::string text;
+    };
+    static int waitOrGiveUp(void* patience, int count);
     struct Close {
         void operator()(sqlite3* database) const;
     };
     static Database opened(const char* name);
 
+    std::unique_ptr<Patience> patience_;  ///< SQLite has its address
     std::unique_ptr<sqlite3, Close> database_;
+    std::optional<Error> kept_;
 };
 
 /// Everything until `commit` comes about, or nothing does. Takes the right to write at once, so
@@ -90,7 +109,7 @@ public:
 
 private:
     Database& database_;
-    bool isOpen_;
+    bool isOpen_ = false;
 };
 
 }  // namespace orvane

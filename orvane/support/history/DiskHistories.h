@@ -36,7 +36,9 @@ public:
     bool loadAll();
 
     fixwell::Array historyOf(const DiskFacts& disk) override;
+    const RecordTimes& timesOf(const DiskFacts& disk) override;
     void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) override;
+    /// YES also where there were runs without records.
     bool clearHistoryOf(const DiskFacts& disk) override;
     std::uint64_t revision() const override { return revision_; }
 
@@ -45,6 +47,15 @@ public:
     /// nothing when there is nothing new. What cannot be saved now is tried again the next time.
     void saveNew();
 
+    /// From now on what is cleared is remembered, and can be brought back until this object goes.
+    void rememberCleared() { remembersCleared_ = true; }
+    /// What is cleared from now on is brought back by itself: the user has done something else.
+    void closeClearing() { ++clearing_; }
+    bool hasCleared() const { return !cleared_.empty(); }
+    /// Brings back the histories that were cleared together last, in front of what has come since.
+    /// The lists are others now.
+    void restoreCleared();
+
     /// What the disk's runs and records are filed under; the same for as long as the program runs.
     std::string keyOf(const DiskFacts& disk);
 
@@ -52,26 +63,41 @@ private:
     /// The records before those that are in the list already.
     struct Older {
         fixwell::Array records;
+        RecordTimes times;
         HistoryStore::Range left;
     };
 
     struct History {
         fixwell::Array records;
+        RecordTimes times;
         std::size_t savedCount = 0;
         fixwell::Value lastSaved;
         std::optional<Older> older = std::nullopt;
     };
 
+    struct Cleared {
+        std::string key;
+        fixwell::Array records;
+        RecordTimes times;
+        std::vector<Run> runs;
+        std::uint64_t clearing;
+    };
+
+    void remember(const std::string& key, History& history, std::vector<Run> runs);
+    void restore(const Cleared& cleared);
     History& find(const DiskFacts& disk);
     History load(const std::string& key);
     static void complete(History& history);
-    void save(const std::string& key, History& history);
+    void save(const std::string& key, History& history, RecordTimes::Time now);
     static bool hasOnlyGrown(const History& history);
 
     HistoryStore& store_;
     std::map<std::string, History> histories_;               ///< by key
     std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it
     std::function<void()> isIncomplete_;
+    bool remembersCleared_ = false;
+    std::vector<Cleared> cleared_;  ///< the last one at the end
+    std::uint64_t clearing_ = 0;    ///< which of them belong together
     std::uint64_t revision_ = 1;
     std::uint64_t generation_ = 0;
 };

@@ -33,9 +33,11 @@ constexpr const char* layout = R"(
     PRAGMA user_version = 1;
 )";
 
-// Finds where runs end without reading every record between.
+// The index finds where runs end without reading every record between. The table has the runs that
+// have no end yet, with the process that they are of.
 constexpr const char* laterAdditions =
-    "CREATE INDEX IF NOT EXISTS summaries ON records (id) WHERE verbosity = -2";
+    "CREATE INDEX IF NOT EXISTS summaries ON records (id) WHERE verbosity = -2;"
+    "CREATE TABLE IF NOT EXISTS openRuns (run INTEGER PRIMARY KEY, owner TEXT NOT NULL)";
 
 // WAL lets other programs read while one writes. With synchronous = NORMAL what was saved survives
 // the end of the program, however it comes; a power failure may take the last moments. Checkpoints
@@ -90,7 +92,7 @@ Condition makeReady(Database& database, std::string& reason)
 int createPrivateFile(const std::filesystem::path& file)
 {
     const FileDescriptor made(
-        ::open(file.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NONBLOCK, 0600));
+        ::open(file.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW, 0600));
     return made ? 0 : errno;
 }
 

@@ -22,6 +22,7 @@ HistoryStore::HistoryStore(std::filesystem::path file, Limits limits, WarningSin
 
 HistoryStore::~HistoryStore()
 {
+    writeLate();
     tables_->records.dropAllSurplus();
 }
 
@@ -36,9 +37,11 @@ void HistoryStore::open()
     tables_ = std::make_unique<Tables>(database_, limits_);
 }
 
-HistoryStore::Mishap HistoryStore::lastMishap() const
+HistoryStore::Mishap HistoryStore::lastMishap()
 {
-    return {database_.lastError(), database_.trouble() == Database::Trouble::Damaged};
+    Mishap mishap{database_.lastError(), database_.trouble() == Database::Trouble::Damaged};
+    database_.forgetError();
+    return mishap;
 }
 
 // Always NO, for the caller to pass on.
@@ -74,13 +77,20 @@ HistoryStore::Range HistoryStore::recordsOf(std::string_view key)
     return {};
 }
 
-void HistoryStore::load(Range records, const Array& history)
+void HistoryStore::load(Range records, const Array& history, RecordTimes& times)
 {
-    if (records.size() > 0 && !tables_->records.read(records, history))
+    if (records.size() > 0 && !tables_->records.read(records, history, times))
         failedTo("read the history", lastMishap());
 }
 
-bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew)
+void HistoryStore::load(Range records, const Array& history)
+{
+    RecordTimes ignored;
+    load(records, history, ignored);
+}
+
+bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew,
+                          const RecordTimes& times)
 {
     // In memory the lists themselves are all there is to keep.
     if (!isKept_ || firstNew >= history.size())
@@ -90,8 +100,9 @@ bool HistoryStore::append(std::string_view key, const Array& history, std::size_
         Transaction transaction(database_);
         const std::int64_t volume = transaction.hasBegun() ? tables_->volumes.intern(key) : 0;
         if (volume != 0 &&
-            tables_->records.append(volume, history, firstNew, Run::Time::clock::now()) &&
+            tables_->records.append(volume, history, firstNew, times, Run::Time::clock::now()) &&
             transaction.commit()) {
+            writeLate();
             countAdded(static_cast<std::int64_t>(history.size() - firstNew));
             return true;
         }
@@ -122,17 +133,48 @@ bool HistoryStore::clear(std::string_view key)
 std::int64_t HistoryStore::beginRun(std::string_view key, std::string_view action,
                                     Run::Time started)
 {
+    if (const std::int64_t run = noteBegin(key, action, started))
+        return run;
+    const bool isLocked = database_.trouble() == Database::Trouble::Locked;
+    failedTo("note the run in the history", lastMishap());
+    if (!isLocked)
+        return 0;
+    late_.push_back({0, std::string(key), std::string(action), started, std::nullopt, {}});
+    return -static_cast<std::int64_t>(late_.size());
+}
+
+std::int64_t HistoryStore::noteBegin(std::string_view key, std::string_view action,
+                                     Run::Time started)
+{
+    database_.forgetError();
     const std::int64_t volume = tables_->volumes.intern(key);
-    const std::int64_t run = volume != 0 ? tables_->runs.begin(volume, action, started) : 0;
-    if (run == 0)
-        failedTo("note the run in the history", lastMishap());
-    return run;
+    return volume != 0 ? tables_->runs.begin(volume, action, started) : 0;
 }
 
 void HistoryStore::endRun(std::int64_t run, const RunEnd& end, Run::Time finished)
 {
-    if (run != 0)
-        tables_->runs.end(run, end, finished);
+    if (run > 0 && !tables_->runs.end(run, end, finished))
+        late_.push_back({run, {}, {}, {}, end, finished});
+    if (run < 0) {
+        LateRun& late = late_.at(static_cast<std::size_t>(-run - 1));
+        late.end = end;
+        late.finished = finished;
+        writeLate();
+    }
+}
+
+// The list only grows: its places are the numbers of runs that have none in the database yet.
+void HistoryStore::writeLate()
+{
+    for (LateRun& late : late_) {
+        if (!late.end)
+            continue;
+        if (late.run == 0)
+            late.run = noteBegin(late.key, late.action, late.started);
+        if (late.run == 0 || !tables_->runs.end(late.run, *late.end, late.finished))
+            return;
+        late.end.reset();
+    }
 }
 
 std::vector<Run> HistoryStore::runs(std::string_view key)

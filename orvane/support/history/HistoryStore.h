@@ -39,12 +39,13 @@ public:
 
     /// All that the volume has.
     [[nodiscard]] Range recordsOf(std::string_view key);
-    /// Appends those of the records that are still there, oldest first.
+    /// Appends those of the records that are still there, oldest first, and their times.
+    void load(Range records, const fixwell::Array& history, RecordTimes& times);
     void load(Range records, const fixwell::Array& history);
-    /// Appends the records from `firstNew` on to the volume's. All of them or, when it answers
-    /// NO, none: try again later.
+    /// Appends the records from `firstNew` on to the volume's, with their times; where none are
+    /// given, with the present one. All of them or, when it answers NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const fixwell::Array& history,
-                              std::size_t firstNew);
+                              std::size_t firstNew, const RecordTimes& times = {});
     /// The volume's records and its runs.
     [[nodiscard]] bool clear(std::string_view key);
 
@@ -75,7 +76,20 @@ private:
     };
 
     void open();
-    Mishap lastMishap() const;
+    /// What could not be written while another program held the database. It is as soon as that is
+    /// possible, and at the end.
+    struct LateRun {
+        std::int64_t run = 0;  ///< its number in the database, once it has one
+        std::string key;
+        std::string action;
+        Run::Time started;
+        std::optional<RunEnd> end;  ///< none as long as the run goes on, and when it is written
+        Run::Time finished;
+    };
+
+    Mishap lastMishap();
+    std::int64_t noteBegin(std::string_view key, std::string_view action, Run::Time started);
+    void writeLate();
     bool failedTo(std::string_view attempt, const Mishap& mishap);
     std::int64_t knownVolume(std::string_view key);
     void countAdded(std::int64_t records);
@@ -91,6 +105,7 @@ private:
     bool isKept_ = false;
     bool hasWarned_ = false;
     std::uint64_t generation_ = 0;
+    std::vector<LateRun> late_;
 };
 
 }  // namespace orvane

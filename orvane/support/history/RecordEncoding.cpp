@@ -70,7 +70,7 @@ public:
     explicit Extras(std::string_view text)
     {
         if (!text.empty())
-            values_ = nlohmann::json::parse(text, nullptr, false);
+            values_ = parsedJSON(text);
     }
 
     Value next()
@@ -122,7 +122,7 @@ std::string RecordShape::toJSON() const
 
 std::optional<RecordShape> RecordShape::fromJSON(std::string_view text)
 {
-    const auto list = nlohmann::json::parse(text, nullptr, false);
+    const auto list = parsedJSON(text);
     if (!list.is_array())
         return std::nullopt;
     RecordShape shape;

@@ -23,6 +23,11 @@ void bindText(Statement& statement, int parameter, std::string_view text)
         statement.bind(parameter, text);
 }
 
+std::int64_t milliseconds(RecordTable::Time time)
+{
+    return std::chrono::duration_cast<std::chrono::milliseconds>(time.time_since_epoch()).count();
+}
+
 /// The one number that a statement over a range of records answers; none when it gives no row.
 std::int64_t numberIn(Statement& statement, std::int64_t first, std::int64_t end)
 {
@@ -41,8 +46,9 @@ RecordTable::RecordTable(Database& database, std::int64_t mostOfVolume)
       vocabulary_(database),
       add_(database.prepare("INSERT INTO records (id, shape, type, verbosity, message, text, "
                             "style, time, extra) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)")),
-      read_(database.prepare("SELECT shape, type, verbosity, message, text, style, extra FROM "
-                             "records WHERE id >= ? AND id < ? ORDER BY id")),
+      read_(
+          database.prepare("SELECT shape, type, verbosity, message, text, style, extra, time FROM "
+                           "records WHERE id >= ? AND id < ? ORDER BY id")),
       oldest_(
           database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id LIMIT 1")),
       newest_(database.prepare(
@@ -67,7 +73,7 @@ RecordRange RecordTable::recordsOf(std::int64_t volume)
     return first != noRecord ? RecordRange{first, behindNewest(volume)} : RecordRange();
 }
 
-bool RecordTable::read(RecordRange records, const fixwell::Array& history)
+bool RecordTable::read(RecordRange records, const fixwell::Array& history, RecordTimes& times)
 {
     read_.bind(1, records.next);
     read_.bind(2, records.end);
@@ -79,24 +85,28 @@ bool RecordTable::read(RecordRange records, const fixwell::Array& history)
         if (!read_.isNothing(5))
             columns.style = vocabulary_.style(read_.integer(5));
         history.append(recordFrom(columns, shape));
+        times.add(history.size(), Time(std::chrono::milliseconds(read_.integer(7))));
     }
     return step == Statement::Step::Done;
 }
 
 bool RecordTable::append(std::int64_t volume, const fixwell::Array& history, std::size_t firstNew,
-                         Time now)
+                         const RecordTimes& times, Time now)
 {
     if (!makeRoom(volume, static_cast<std::int64_t>(history.size() - firstNew)))
         return false;
     // The newest ones, when there are more at once than a volume may have.
     const auto limit = static_cast<std::size_t>(mostOfVolume_);
     firstNew = std::max(firstNew, history.size() - std::min(limit, history.size()));
-    const std::int64_t time =
-        std::chrono::duration_cast<std::chrono::milliseconds>(now.time_since_epoch()).count();
     std::int64_t id = behindNewest(volume);
-    for (std::size_t i = firstNew; i < history.size(); ++i)
+    auto next = times.stretches.begin();
+    std::int64_t time = milliseconds(now);
+    for (std::size_t i = firstNew; i < history.size(); ++i) {
+        for (; next != times.stretches.end() && next->first <= i; ++next)
+            time = milliseconds(next->time);
         if (!insert(id++, history.values()[i].dictionary(), time))
             return false;
+    }
     return true;
 }
 

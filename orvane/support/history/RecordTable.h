@@ -2,6 +2,7 @@
 #pragma once
 
 #include "fixwell/host/foundation/Array.h"
+#include "orvane/support/disks/HistoryKeeper.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/RecordVocabulary.h"
 
@@ -32,11 +33,13 @@ public:
     RecordTable(Database& database, std::int64_t mostOfVolume);
 
     [[nodiscard]] RecordRange recordsOf(std::int64_t volume);
-    /// Appends those of the records that are still there to the history, oldest first.
-    [[nodiscard]] bool read(RecordRange records, const fixwell::Array& history);
-    /// Appends the history's records from `firstNew` on to the volume's. Within a transaction.
+    /// Appends those of the records that are still there to the history, oldest first, and their
+    /// times to `times`.
+    [[nodiscard]] bool read(RecordRange records, const fixwell::Array& history, RecordTimes& times);
+    /// Appends the history's records from `firstNew` on to the volume's; where there are no
+    /// times, with `now`. Within a transaction.
     [[nodiscard]] bool append(std::int64_t volume, const fixwell::Array& history,
-                              std::size_t firstNew, Time now);
+                              std::size_t firstNew, const RecordTimes& times, Time now);
     [[nodiscard]] bool removeAll(std::int64_t volume);
     /// At the end: what cannot be dropped now will be when the volume is appended to again.
     void dropAllSurplus();

@@ -12,7 +12,7 @@ namespace {
 fixwell::TextStyle readStyle(const std::string& text)
 {
     try {
-        return styleFromJSON(nlohmann::json::parse(text, nullptr, false));
+        return styleFromJSON(parsedJSON(text));
     } catch (const nlohmann::json::exception&) {
         return {};
     }

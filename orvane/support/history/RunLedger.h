@@ -27,13 +27,16 @@ struct Run {
 
     std::string action;
     Time started;
-    /// Neither is known for a run that was cut off with the program.
+    /// Neither is known for a run that goes on, or was cut off with its program.
     std::optional<Time> finished;
     std::optional<RunEnd> end;
+    bool isGoingOn = false;  ///< in this program or another
+
+    /// The verdict, "running", or nothing when it was cut off.
+    [[nodiscard]] std::string verdict() const;
 };
 
-/// The runs of every volume, oldest first. Part of the history store: main thread only. What
-/// cannot be written is missing later, and the store's warning has said so.
+/// The runs of every volume, oldest first. Part of the history store: main thread only.
 class RunLedger {
 public:
     /// The database must outlive this object.
@@ -41,7 +44,7 @@ public:
 
     /// The run's number, for `end`; 0 when it could not be written.
     std::int64_t begin(std::int64_t volume, std::string_view action, Run::Time started);
-    void end(std::int64_t run, const RunEnd& end, Run::Time finished);
+    [[nodiscard]] bool end(std::int64_t run, const RunEnd& end, Run::Time finished);
     /// At most `limit` of the newest ones.
     [[nodiscard]] std::vector<Run> runs(std::int64_t volume, std::int64_t limit = 1000);
 
@@ -50,6 +53,8 @@ public:
 
 private:
     Statement begin_;
+    Statement open_;
+    Statement close_;
     Statement end_;
     Statement list_;
     Statement trim_;

@@ -2,8 +2,6 @@
 #include "orvane/support/images/ImageAttacher.h"
 
 #include "fixwell/host/foundation/UTF8.h"
-#include "orvane/support/images/ImageContents.h"
-#include "orvane/support/images/ImageDisks.h"
 
 #include <utility>
 
@@ -22,21 +20,51 @@ ImageAttacher::ImageAttacher(Disk::Surroundings surroundings, Translator transla
 fixwell::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path& image,
                                                      fixwell::Dictionary& result)
 {
-    auto opened = openImage(image, translator_);
-    if (failed(opened)) {
-        const std::string name = fixwell::printable(image.filename().native());
+    const auto reading = ImageReading::start(image, {}, reader_);
+    {
         const std::lock_guard guard(lock_);
-        lastErrors_[image.native()] =
-            translator_.sentence("cannot attach ‘%@’: %@", {name, failureMessage(opened)});
-        return fixwell::kPLErrorCannotOpen;
+        readings_.insert(reading);
+        if (isStopped_)
+            reading->giveUp();
     }
-    const auto& open = std::get<OpenImage>(opened);
-    DiskTree disks = disksOfImage(open, readContents(open));
+    const ImageReading::State state = reading->waitFor(longestWait_);
     const std::lock_guard guard(lock_);
+    readings_.erase(reading);
+    if (state == ImageReading::State::GivenUp)
+        return note(image, translator_.text("it was stopped"), fixwell::kPLErrorCancelled);
+    if (state == ImageReading::State::Reading)
+        return note(image, translator_.text("the file does not answer"),
+                    fixwell::kPLErrorCannotOpen);
+    const ImageReading::Result read = *reading->result();
+    if (failed(read))
+        return note(image, translator_.text(failureMessage(read)), fixwell::kPLErrorCannotOpen);
     lastErrors_.erase(image.native());
-    attached_.emplace(++attachments_, std::move(disks));
+    attached_.emplace(++attachments_, std::get<ReadImage>(read).disks);
     result = fixwell::Dictionary::of({{attachmentKey, attachments_}});
     return fixwell::kPLNoError;
+}
+
+// With the lock held.
+fixwell::ErrorCode ImageAttacher::note(const std::filesystem::path& image, std::string_view reason,
+                                       fixwell::ErrorCode code)
+{
+    const std::string name = fixwell::printable(image.filename().native());
+    lastErrors_[image.native()] = translator_.sentence("cannot attach ‘%@’: %@", {name, reason});
+    return code;
+}
+
+void ImageAttacher::stopAttachments()
+{
+    const std::lock_guard guard(lock_);
+    isStopped_ = true;
+    for (const auto& reading : readings_)
+        reading->giveUp();
+}
+
+void ImageAttacher::resumeAttachments()
+{
+    const std::lock_guard guard(lock_);
+    isStopped_ = false;
 }
 
 fixwell::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(const fixwell::Dictionary& result)

@@ -3,12 +3,17 @@
 
 #include "fixwell/host/support/HostServices.h"
 #include "orvane/support/disks/Disk.h"
+#include "orvane/support/images/ImageReading.h"
 #include "orvane/support/texts/Translator.h"
 
+#include <chrono>
 #include <filesystem>
 #include <map>
+#include <memory>
 #include <mutex>
+#include <set>
 #include <string>
+#include <string_view>
 
 namespace orvane {
 
@@ -22,23 +27,41 @@ class ImageAttacher final : public fixwell::ImageAttachment {
 public:
     ImageAttacher(Disk::Surroundings surroundings, Translator translator);
 
-    /// kPLErrorCannotOpen when the file cannot be opened, is empty, or is no regular file.
+    /// kPLErrorCannotOpen when the file cannot be opened, is empty, is no disk image, or does not
+    /// answer for half a minute; kPLErrorCancelled after `stopAttachments`.
     [[nodiscard]] fixwell::ErrorCode AttachImageWithURL(const std::filesystem::path& image,
                                                         fixwell::Dictionary& result) override;
     fixwell::OVDiskPointer TopLevelPLDiskForImageDict(const fixwell::Dictionary& result) override;
+
+    /// Attachments that are under way end at once, and no others begin before
+    /// `resumeAttachments`.
+    void stopAttachments();
+    void resumeAttachments();
+    /// Before anything is attached: how an image is read, and how long that may take.
+    void setReader(ImageReading::Reader reader) { reader_ = std::move(reader); }
+    const ImageReading::Reader& reader() const { return reader_; }
+    void setLongestWait(std::chrono::milliseconds longest) { longestWait_ = longest; }
 
     /// Why the last attachment of this image failed, as a sentence to show ("cannot attach
     /// ‘x.img’: the file is empty"); empty when it did not.
     [[nodiscard]] std::string lastError(const std::filesystem::path& image) const;
 
 private:
+    fixwell::ErrorCode note(const std::filesystem::path& image, std::string_view reason,
+                            fixwell::ErrorCode code);
+
     const Disk::Surroundings surroundings_;
     const Translator translator_;
 
+    ImageReading::Reader reader_ = ImageReading::readNow;
+    std::chrono::milliseconds longestWait_ = std::chrono::seconds(30);
+
     mutable std::mutex lock_;
-    std::map<std::int64_t, DiskTree> attached_;      ///< by attachment, until asked for; guarded
-    std::int64_t attachments_ = 0;                   ///< guarded
-    std::map<std::string, std::string> lastErrors_;  ///< by the path as given; guarded
+    std::set<std::shared_ptr<ImageReading>> readings_;  ///< that are waited for; guarded
+    std::map<std::int64_t, DiskTree> attached_;         ///< by attachment, until asked for; guarded
+    std::int64_t attachments_ = 0;                      ///< guarded
+    bool isStopped_ = false;                            ///< guarded
+    std::map<std::string, std::string> lastErrors_;     ///< by the path as given; guarded
 };
 
 }  // namespace orvane

@@ -1,11 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/images/ImageContents.h"
 
+#include "pellar/partitions/MapDisk.h"
+#include "pellar/partitions/MapReport.h"
+
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <array>
 #include <cerrno>
 #include <utility>
 
@@ -16,6 +20,37 @@ namespace {
 bool isOpticalImage(const Superblock& superblock)
 {
     return superblock.type == "iso9660" || superblock.type == "udf";
+}
+
+bool isTextByte(unsigned char byte)
+{
+    if (byte < 0x20)
+        return byte == '\t' || byte == '\n' || byte == '\r' || byte == '\f';
+    return byte != 0x7f && byte < 0xf5;  // UTF-8 ends there, and erased memory is 0xff
+}
+
+// Looked at in four places: a disk whose beginning a text was written over is still a disk.
+bool isText(int descriptor, off_t length)
+{
+    constexpr off_t sampleBytes = 4096;
+    std::array<unsigned char, sampleBytes> sample{};
+    for (const off_t place :
+         {off_t{0}, length / 3, length / 3 * 2, std::max(off_t{0}, length - sampleBytes)}) {
+        const ssize_t got = ::pread(descriptor, sample.data(), sample.size(), place);
+        if (got <= 0 || !std::all_of(sample.begin(), sample.begin() + got, isTextByte))
+            return false;
+    }
+    return true;
+}
+
+bool isMapDamaged(const OpenImage& image)
+{
+    using pellar::MapVerdict;
+    const auto sectors = pellar::sectorsOf(image.descriptor.get(), 0, image.length);
+    const MapVerdict verdict =
+        pellar::reportOn(pellar::readMapOf(image.descriptor.get(), sectors, 0, image.length))
+            .verdict;
+    return verdict == MapVerdict::Repairable || verdict == MapVerdict::NeedsPerson;
 }
 
 // A partition may claim more than the file has; what is there is still worth a look.
@@ -59,6 +94,8 @@ Outcome<OpenImage> openImage(const std::filesystem::path& path, const Translator
         return Failure{translator.text("it is not a regular file")};
     if (status.st_size == 0)
         return Failure{translator.text("the file is empty")};
+    if (isText(descriptor.get(), status.st_size))
+        return Failure{translator.text("it is a text file, not a disk image")};
     std::error_code error;
     const std::filesystem::path canonical = std::filesystem::canonical(path, error);
     if (error)
@@ -81,6 +118,7 @@ ImageContents readContents(const OpenImage& image)
     contents.hasPartitionMap =
         (table && !isBootSector(image.descriptor.get(), *table, contents.whole.superblock)) ||
         (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
+    contents.isMapDamaged = contents.hasPartitionMap && isMapDamaged(image);
     for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
         contents.partitions.push_back(readVolume(image, partition));
     return contents;

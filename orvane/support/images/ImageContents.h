@@ -21,8 +21,8 @@ struct OpenImage {
     bool isWritable = false;     ///< by this process
 };
 
-/// Opens a regular file that is not empty; otherwise the bare reason ("the file is empty"). Any
-/// thread; does not wait for whatever else the path may name.
+/// Opens a regular file that may be a disk image: it is not empty, and no text; otherwise the bare
+/// reason ("the file is empty"). Any thread; does not wait for whatever else the path may name.
 [[nodiscard]] Outcome<OpenImage> openImage(const std::filesystem::path& path,
                                            const Translator& translator);
 
@@ -38,6 +38,7 @@ struct ImageVolume {
 
 struct ImageContents {
     bool hasPartitionMap = false;  ///< also where it is damaged beyond reading
+    bool isMapDamaged = false;
     /// Of the file as a whole, where there is no partition map.
     ImageVolume whole;
     std::vector<ImageVolume> partitions;

@@ -73,6 +73,7 @@ DiskTree disksOfImage(const OpenImage& image, const ImageContents& contents)
     }
     top.facts.type = diskType::whole;
     top.facts.isWhole = true;
+    top.facts.hasDamagedMap = contents.isMapDamaged;
     for (const ImageVolume& volume : contents.partitions)
         top.children.push_back(partitionOf(image, volume));
     return top;

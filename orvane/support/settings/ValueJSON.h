@@ -6,6 +6,8 @@
 
 #include <nlohmann/json.hpp>
 
+#include <string_view>
+
 namespace orvane {
 
 // Values as JSON and back, with their kinds, the order of dictionaries and any bytes in strings.
@@ -16,6 +18,9 @@ namespace orvane {
 //   {"dictionary": [["key", value], ...]}
 //   {"styled": [["characters", style], ...]}
 // An object with an identity (a disk) cannot be stored; its description is, as a string.
+
+/// Discarded when it is no JSON, or nested deeper than anything that is written by us.
+[[nodiscard]] nlohmann::json parsedJSON(std::string_view text);
 
 [[nodiscard]] nlohmann::json jsonFromValue(const fixwell::Value& value);
 /// No value for null and for what jsonFromValue never writes.

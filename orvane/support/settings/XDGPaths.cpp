@@ -2,6 +2,7 @@
 #include "orvane/support/settings/XDGPaths.h"
 
 #include <pwd.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <array>
@@ -27,6 +28,15 @@ std::filesystem::path accountHomeDirectory()
     return found->pw_dir;
 }
 
+/// Or would, once it is made: then the directory above counts.
+bool belongsToRoot(std::filesystem::path directory)
+{
+    struct stat status = {};
+    while (::stat(directory.c_str(), &status) != 0 && directory.has_relative_path())
+        directory = directory.parent_path();
+    return status.st_uid == 0;
+}
+
 }  // namespace
 
 std::optional<std::string> environmentValue(const char* name)
@@ -36,15 +46,17 @@ std::optional<std::string> environmentValue(const char* name)
 }
 
 XDGPaths xdgPathsFrom(const EnvironmentLookup& environment,
-                      const std::filesystem::path& accountHome)
+                      const std::filesystem::path& accountHome, const IsForeign& isForeign)
 {
     const std::filesystem::path wanted = absolutePathIn(environment, "HOME");
     const std::filesystem::path home = wanted.empty() ? accountHome : wanted;
     const auto below = [&](const char* variable, const char* inHome) -> std::filesystem::path {
         const std::filesystem::path base = absolutePathIn(environment, variable);
-        if (!base.empty())
-            return base / "orvane";
-        return home.is_absolute() ? home / inHome / "orvane" : std::filesystem::path();
+        for (const auto& directory : {base, home.empty() ? home : home / inHome})
+            if (directory.is_absolute() && !isForeign(directory))
+                return directory / "orvane";
+        return accountHome.is_absolute() ? accountHome / inHome / "orvane"
+                                         : std::filesystem::path();
     };
     return {below("XDG_CONFIG_HOME", ".config"), below("XDG_STATE_HOME", ".local/state"),
             below("XDG_CACHE_HOME", ".cache"), below("XDG_DATA_HOME", ".local/share")};
@@ -52,7 +64,10 @@ XDGPaths xdgPathsFrom(const EnvironmentLookup& environment,
 
 XDGPaths userXDGPaths()
 {
-    return xdgPathsFrom(environmentValue, accountHomeDirectory());
+    const auto isForeign = [](const std::filesystem::path& directory) {
+        return ::geteuid() == 0 && !belongsToRoot(directory);
+    };
+    return xdgPathsFrom(environmentValue, accountHomeDirectory(), isForeign);
 }
 
 }  // namespace orvane

@@ -24,12 +24,19 @@ struct XDGPaths {
     std::filesystem::path data;
 };
 
-/// `accountHome` stands in when HOME is not set; a variable that is no absolute path is ignored,
-/// as the specification asks.
-[[nodiscard]] XDGPaths xdgPathsFrom(const EnvironmentLookup& environment,
-                                    const std::filesystem::path& accountHome);
+/// Whether a base directory is somebody else's.
+using IsForeign = std::function<bool(const std::filesystem::path& directory)>;
 
-/// For this process: its environment, and the home directory of its account (passwd(5)).
+/// `accountHome` stands in when HOME is not set or foreign; a variable that is no absolute path is
+/// ignored, as that standard asks, and so is one that names a foreign directory.
+[[nodiscard]] XDGPaths xdgPathsFrom(
+    const EnvironmentLookup& environment, const std::filesystem::path& accountHome,
+    const IsForeign& isForeign = [](const std::filesystem::path&) { return false; });
+
+/// For this process: its environment, and the home directory of its account (passwd(5)). For root, to
+/// whom an environment may have been left by another user (sudo -E), that user's directories are
+/// foreign: what root makes in them the user could not use any more, and links in them lead root
+/// anywhere.
 [[nodiscard]] XDGPaths userXDGPaths();
 
 }  // namespace orvane

@@ -51,46 +51,35 @@ int shorter(int timeout, std::optional<Clock::time_point> end)
     return timeout < 0 ? most : std::min(timeout, most);
 }
 
-#if ORVANE_SDBUS == 2
-
 sdbus::MethodCall callOf(sdbus::IProxy& proxy, const BusMethod& method)
 {
+#if ORVANE_SDBUS == 2
     return proxy.createMethodCall(sdbus::InterfaceName(method.interface),
                                   sdbus::MethodName(method.name));
-}
-
-template <class Handler>
-sdbus::PendingAsyncCall send(sdbus::IProxy& proxy, const sdbus::MethodCall& call, Handler handler,
-                             milliseconds timeout)
-{
-    return proxy.callMethodAsync(call, std::move(handler), timeout);
-}
-
-bool processNext(sdbus::IConnection& connection)
-{
-    return connection.processPendingEvent();
-}
-
 #else
-
-sdbus::MethodCall callOf(sdbus::IProxy& proxy, const BusMethod& method)
-{
     return proxy.createMethodCall(method.interface, method.name);
+#endif
 }
 
 template <class Handler>
 sdbus::PendingAsyncCall send(sdbus::IProxy& proxy, const sdbus::MethodCall& call, Handler handler,
                              milliseconds timeout)
 {
+#if ORVANE_SDBUS == 2
+    return proxy.callMethodAsync(call, std::move(handler), timeout);
+#else
     return proxy.callMethod(call, std::move(handler), timeout);
+#endif
 }
 
 bool processNext(sdbus::IConnection& connection)
 {
+#if ORVANE_SDBUS == 2
+    return connection.processPendingEvent();
+#else
     return connection.processPendingRequest();
-}
-
 #endif
+}
 
 }  // namespace
 

@@ -9,6 +9,8 @@
 namespace orvane {
 namespace {
 
+// The service is started by the first question where it does not run yet.
+constexpr std::chrono::milliseconds longestFirstWait{3000};
 constexpr std::chrono::milliseconds longestWait{50};
 
 bool isMeant(const DiskTree& tree, const std::set<std::string>& nodes)
@@ -39,12 +41,13 @@ std::vector<DiskTree> DiskReader::read(const DiskSources& sources)
     UDisks udisks;
     udisks.askForFailingDrives();
     auto disks = readSystemDisks(sources);
-    const auto answer = udisks.failingDrives(longestWait);
-    if (const auto* const failing = std::get_if<std::set<std::string>>(&answer))
-        failing_ = *failing;
-    else if (std::get<Refusal>(answer).kind != Refusal::Kind::Abandoned)
-        failing_.clear();
-    markFailing(disks, failing_);
+    const auto answer = udisks.failingDrives(failing_ ? longestWait : longestFirstWait);
+    const auto* const refusal = std::get_if<Refusal>(&answer);
+    if (refusal == nullptr)
+        failing_ = std::get<std::set<std::string>>(answer);
+    else if (!failing_ || refusal->kind != Refusal::Kind::Abandoned)
+        failing_.emplace();
+    markFailing(disks, *failing_);
     return disks;
 }
 

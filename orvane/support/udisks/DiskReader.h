@@ -3,6 +3,7 @@
 
 #include "orvane/support/disks/SystemDisks.h"
 
+#include <optional>
 #include <set>
 #include <string>
 
@@ -12,12 +13,13 @@ namespace orvane {
 /// time.
 class DiskReader {
 public:
-    /// As readSystemDisks. UDisks2 is asked before the disks are read and waited for no longer
-    /// than 50 ms after that; when it is late, what it said the last time stands.
+    /// As readSystemDisks. UDisks2 is asked before the disks are read, and waited for after that: the
+    /// first time three seconds at most, for it may have to be started, later 50 ms. When it is
+    /// late, what it said the last time stands.
     [[nodiscard]] std::vector<DiskTree> read(const DiskSources& sources);
 
 private:
-    std::set<std::string> failing_;
+    std::optional<std::set<std::string>> failing_;  ///< none before the first answer
 };
 
 /// Marks a disk and all its parts when the drive of one of them is failing.

@@ -22,6 +22,13 @@ std::string unavailableReason(Session& session, const TerminalButton& button, co
                           : reason;
 }
 
+std::string damagedMapSentence(Session& session, const NamedDisk& image)
+{
+    return session.host().translator().sentence(
+        "the partition map of “%@” is damaged; --partition-map checks and repairs it",
+        {image.name});
+}
+
 std::string unavailableSentence(Session& session, const TerminalButton& button,
                                 const NamedDisk& disk)
 {

@@ -32,4 +32,7 @@ std::string unavailableReason(Session& session, const TerminalButton& button, co
 std::string unavailableSentence(Session& session, const TerminalButton& button,
                                 const NamedDisk& disk);
 
+/// That an image's partition map is damaged, and what can be done about it.
+std::string damagedMapSentence(Session& session, const NamedDisk& image);
+
 }  // namespace orvane

@@ -3,25 +3,39 @@
 #include "orvane/terminal/commands/LocalTime.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace orvane {
 namespace {
 
 std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Session& session)
 {
-    std::vector<Run> runs;
+    std::vector<std::pair<Run::Time, Run>> runs;
     for (const std::shared_ptr<Disk>& disk : disks) {
-        const std::vector<Run> more =
-            session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()));
-        runs.insert(runs.end(), more.begin(), more.end());
+        // Of one disk they stand in the order in which they were, though a clock was put back.
+        Run::Time newest{};
+        for (Run& run :
+             session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()))) {
+            newest = std::max(newest, run.started);
+            runs.emplace_back(newest, std::move(run));
+        }
     }
     std::stable_sort(runs.begin(), runs.end(),
-                     [](const Run& a, const Run& b) { return a.started < b.started; });
+                     [](const auto& a, const auto& b) { return a.first < b.first; });
     std::vector<RunLine> lines;
-    for (const Run& run : runs)
-        lines.push_back({localTime(run.started), run.action, run.end ? run.end->verdict : "",
+    for (const auto& [time, run] : runs)
+        lines.push_back({localTime(run.started), run.action, run.verdict(),
                          run.end ? run.end->message : ""});
     return lines;
+}
+
+// The module leaves out the disks of a failing drive, on which nothing is to be done. Their history is
+// wanted most of all, and looking at it does nothing to them.
+void forgetFailure(const std::shared_ptr<Disk>& disk)
+{
+    DiskFacts facts = disk->facts();
+    facts.hasSMARTError = false;
+    disk->setFacts(facts);
 }
 
 }  // namespace
@@ -33,7 +47,11 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
         const std::shared_ptr<Disk> top = session.attach(named.disk);
         const std::shared_ptr<Disk> shown = top ? top : named.disk;
         std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
-        session.select({shown});
+        // What was said of the image as a file is its history, too.
+        if (top)
+            selection.push_back(named.disk);
+        std::for_each(selection.begin(), selection.end(), forgetFailure);
+        session.select({named.disk});
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
             session.select(selection);

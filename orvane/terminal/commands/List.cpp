@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/host/foundation/UTF8.h"
+#include "orvane/jobs/LastRuns.h"
 #include "orvane/support/disks/DiskTypes.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
@@ -44,11 +45,14 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     line.filesystem = facts.filesystem;
     line.bytes = facts.length;
     line.mountPoint = facts.mountPoint;
-    if (const auto run =
-            session.host().historyStore().lastRun(session.host().histories().keyOf(facts))) {
-        line.lastChecked = localTime(run->started);
-        line.verdict = run->end ? run->end->verdict : "";
-    }
+    const auto runs =
+        lastRunsOf(session.host().historyStore(), session.host().histories().keyOf(facts));
+    if (!runs)
+        return line;
+    line.lastChecked = localTime(runs->told.started);
+    line.verdict = runs->told.verdict();
+    if (const auto& later = runs->later)
+        line.later = {localTime(later->started), later->verdict()};
     return line;
 }
 
@@ -76,6 +80,7 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
         line.name = volume.name;
         line.lastChecked = volume.lastChecked;
         line.verdict = volume.verdict;
+        line.later = volume.later;
     }
     reporter.listed(line);
     for (const std::shared_ptr<Disk>& part :
@@ -86,6 +91,8 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
         volume.isVolume = true;
         reporter.listed(volume);
     }
+    if (top && top->facts().hasDamagedMap)
+        reporter.warning(damagedMapSentence(session, image));
     session.detach(top);
 }
 

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/host/pellar/ErrorCodes.h"
+#include "orvane/jobs/UnreachedImage.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
@@ -38,7 +39,7 @@ std::vector<std::shared_ptr<Disk>> selectionOf(const std::vector<NamedDisk>& dis
 }
 
 /// The verdicts of the disk and of what lies inside it; for a disk that no job reached, why.
-int settle(const NamedDisk& named, Session& session, Reporter& reporter)
+int settle(const NamedDisk& named, const ActionButton& action, Session& session, Reporter& reporter)
 {
     int status = 0;
     bool wasReached = false;
@@ -52,14 +53,14 @@ int settle(const NamedDisk& named, Session& session, Reporter& reporter)
         return status | exitStopped;
     if (wasReached)
         return status;
-    const Translator& translator = session.host().translator();
-    std::string why = session.host().imageAttachment().lastError(named.disk->diskImagePath());
+    std::string why = whyUnreached(session.host(), *named.disk, named.name);
     if (session.wasDeclined())
-        why = translator.sentence("“%@” was not checked: the question was not answered with yes",
-                                  {named.name});
-    else if (why.empty())
-        why = translator.sentence("cannot check “%@”: there is no volume on it that can be checked",
-                                  {named.name});
+        why = session.host().translator().sentence(
+            "“%@” was not checked: the question was not answered with yes", {named.name});
+    else if (named.disk->isOfflineDiskImage())
+        keepUnreached(
+            session.host(), *named.disk,
+            action.command == Command::Repair ? Operation::RepairDisk : Operation::VerifyDisk, why);
     reporter.failure(named.name, why);
     return exitUnchecked;
 }
@@ -74,12 +75,16 @@ bool wasUnderstood(const NamedDisk& named, Session& session)
     });
 }
 
-/// Where nothing in an image could be checked, its partition map still can.
+/// Where nothing in an image could be checked, its partition map still can; and a damaged one must
+/// be, whatever its volumes are.
 void pointToMap(const NamedDisk& named, Session& session, Reporter& reporter)
 {
     const bool wasTried = !session.wasStopped() && !session.wasDeclined();
-    if (wasTried && named.disk->isOfflineDiskImage() && !wasUnderstood(named, session) &&
-        session.reasonAgainstPartitionMap(named.disk).empty())
+    const auto& contents = named.disk->contents();
+    if (wasTried && contents && contents->facts().hasDamagedMap)
+        reporter.warning(damagedMapSentence(session, named));
+    else if (wasTried && named.disk->isOfflineDiskImage() && !wasUnderstood(named, session) &&
+             session.reasonAgainstPartitionMap(named.disk).empty())
         reporter.warning(session.host().translator().sentence(
             "“%@” has a partition map; --partition-map checks it", {named.name}));
 }
@@ -97,7 +102,7 @@ int treat(const std::vector<NamedDisk>& wanted, const ActionButton& action, Sess
     session.pressAndWait(session.button(action.outlet));
     session.host().sharedDiskController().release();
     for (const NamedDisk& named : disks) {
-        status |= settle(named, session, reporter);
+        status |= settle(named, action, session, reporter);
         pointToMap(named, session, reporter);
     }
     return status;

@@ -77,6 +77,78 @@ TEST_F(LogView, ALogOpensAtItsEndAndStaysWhereItIsWhenOlderRowsComeInFront)
         << "the same row as before";
 }
 
+// Records go on coming between the moment at which the module asks for the last row and the one at
+// which the loop comes to it.
+TEST_F(LogView, WhoReadsAtTheEndIsShownEveryNewEnd)
+{
+    for (int i = 0; i < 200; ++i)
+        addRow("row " + std::to_string(i));
+    reload();
+    for (const int burst : {1, 40, 1000}) {
+        view->reloadData();
+        view->scrollRowToVisible(view->numberOfRows() - 1);
+        for (int i = 0; i < burst; ++i)
+            addRow("more");
+        settle();
+        EXPECT_EQ(view->verticalScroller()->value(), 1.0) << burst;
+    }
+    interface->widget().resize(640, 480);
+    settle();
+    EXPECT_EQ(view->verticalScroller()->value(), 1.0) << "less room";
+}
+
+TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
+{
+    const auto other = std::make_shared<fixwell::testing::FakeDisk>("loop1");
+    other->history = fixwell::Array::make();
+    for (int i = 0; i < 200; ++i) {
+        addRow("one " + std::to_string(i), i % 4 == 0 ? 0 : 1);
+        std::swap(disk->history, other->history);
+        addRow("two " + std::to_string(i), i % 4 == 0 ? 0 : 1);
+        std::swap(disk->history, other->history);
+    }
+    host.fake.disks.push_back(other);
+    host.fake.selection = {disk, other};
+    interface->button("showDetailsButton")->press();
+    selectDisk();
+    const auto rowOf = [this](const QString& text) {
+        int row = 0;
+        while (row < table().model()->rowCount() && rowText(row) != text)
+            ++row;
+        return row;
+    };
+    const auto toggleDetails = [this] {
+        interface->button("showDetailsButton")->press();
+    };
+    struct Case {
+        std::function<void()> change;
+        std::string_view because;
+    };
+    for (const char* const name : {"one 100", "two 100"}) {
+        const QString line = QString::fromLatin1(name);
+        table().selectRow(rowOf(line));
+        table().scrollTo(table().currentIndex(), QAbstractItemView::PositionAtCenter);
+        const int top = table().rowViewportPosition(rowOf(line));
+        for (const Case& c :
+             {Case{[&] { addRow("more"); }, "between the histories"},
+              Case{[&] { other->history.append(disk->history.back()); }, "at the end"},
+              Case{[&] {
+                       addRow("more");
+                       other->history.append(disk->history.back());
+                   },
+                   "in both"},
+              Case{toggleDetails, "without details"}, Case{toggleDetails, "with details"}}) {
+            c.change();
+            reload();
+            EXPECT_EQ(view->selectedRowIndexes(),
+                      std::vector{static_cast<std::size_t>(rowOf(line))})
+                << c.because;
+            EXPECT_EQ(table().rowViewportPosition(rowOf(line)), top)
+                << line.toStdString() << c.because;
+        }
+    }
+}
+
 TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
 {
     for (int i = 0; i < 1'000'000; ++i)

@@ -152,6 +152,10 @@ TEST(MapReport, TellsWhatIsWrongWithAGPT)
          repairable,
          {ProtectiveWrongStart},
          "its place"},
+        {[](const DiskImage& d) { d.fill(protective + 4, 1, 0x83); },
+         person,
+         {ProtectiveReplaced},
+         "an ordinary entry over the whole disk, and both copies good"},
         {[](const DiskImage& d) {
              d.put(protective + 16, Bytes{0, 0, 2, 0, 0x83, 0, 0, 0, 0, 8, 0, 0, 0, 32, 0, 0});
          },

@@ -1,0 +1,173 @@
+// SPDX-License-Identifier: Apache-2.0
+//
+// The real tools on a disk of which places cannot be read.
+
+#include "tests/support/FailingDisk.h"
+
+#include "pellar/ErrorCodes.h"
+#include "pellar/process/Command.h"
+#include "tests/pellar/partitions/DiskMaker.h"
+#include "tests/support/VolumeStates.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+
+namespace {
+
+using namespace pellar;
+using orvane::test::FailingDisk;
+
+/// Places of the volumes that `volumeMakers` make, and of an ext4 of 16 MiB.
+struct BadPlace {
+    std::string_view filesystem;
+    FailingDisk::Bad bad;
+    std::string_view because;
+};
+
+const std::vector<BadPlace> badPlaces{
+    {"ext4", {134 << 10, 198 << 10}, "the inode table"},
+    {"ext4", {0, 4096}, "the superblock"},
+    {"vfat", {2048, 6144}, "the first table"},
+    {"vfat", {0, 512}, "the boot sector"},
+    {"exfat", {2 << 20, (2 << 20) + 65536}, "the bitmap, of which it says no more than failed"},
+    {"exfat", {0, 65536}, "the boot sector and its backup"},
+    {"ntfs", {64 << 10, 128 << 10}, "it takes it for the end of the disk"},
+    {"ntfs", {16 << 10, 20 << 10}, "the file table"},
+    {"ntfs", {0, 4096}, "the boot sector, of which the backup is good"},
+    {"xfs", {128 << 10, 192 << 10}, "the first group"},
+    {"xfs", {0, 4096}, "the superblock"},
+    {"btrfs", {64 << 10, 68 << 10}, "the superblock, of which the mirror is good"},
+    {"btrfs", {20 << 20, 40 << 20}, "trees, with status 0 where a copy is good"},
+    {"f2fs", {6 << 20, (6 << 20) + 65536}, "the segment table, an assertion to it"},
+    {"f2fs", {0, 65536}, "both superblocks"},
+};
+
+class FailingDiskTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        if (const std::string obstacle = FailingDisk::obstacle(); !obstacle.empty())
+            GTEST_SKIP() << obstacle;
+        std::filesystem::create_directory(workshop_.path("mounted"));
+    }
+
+    /// None where the program that makes it is not installed.
+    std::filesystem::path make(std::string_view filesystem) const
+    {
+        if (filesystem == "ext4")
+            return makeExt();
+        const auto& makers = orvane::test::volumeMakers();
+        const auto maker = std::find_if(makers.begin(), makers.end(), [filesystem](const auto& m) {
+            return m.filesystem == filesystem;
+        });
+        if (findProgram(maker->command.front(), "/usr/sbin:/usr/bin:/sbin:/bin").empty())
+            return {};
+        workshop_.write("backing", {});
+        std::filesystem::resize_file(workshop_.path("backing"), maker->bytes);
+        workshop_.prepare(maker->command, workshop_.path("backing"));
+        return workshop_.path("backing");
+    }
+
+    std::filesystem::path makeExt() const
+    {
+        const auto image = workshop_.makeExt("backing", 16U << 20U, {"-b", "1024"});
+        for (int i = 0; i < 40; ++i)
+            workshop_.damage(image, "mkdir d" + std::to_string(i));
+        return image;
+    }
+
+    test::Workshop workshop_;
+};
+
+void expectAdviceToCopy(const test::Listener& heard, std::string_view because)
+{
+    EXPECT_EQ(heard.verdict, "failed") << because << ": " << heard.message;
+    EXPECT_EQ(heard.error, kPLErrorUnreadable) << because;
+    EXPECT_NE(heard.message.find("ddrescue"), std::string::npos) << heard.message;
+    EXPECT_FALSE(heard.hasPlainLine("needs to be repaired.")) << because;
+}
+
+TEST_F(FailingDiskTest, IsNeitherDamagedNorWrittenTo)
+{
+    for (const BadPlace& place : badPlaces)
+        for (const bool repairs : {false, true}) {
+            const auto backing = make(place.filesystem);
+            if (backing.empty())
+                continue;
+            // Not known by its label or kind, as a disk whose beginning cannot be read.
+            const bool isListed = place.bad.start > 0;
+            const FailingDisk failing(workshop_.path("mounted"), backing, {place.bad});
+            const auto disk = test::reference(
+                failing.path(), isListed ? std::string(place.filesystem) : std::string());
+            test::Bench bench;
+            ASSERT_EQ(repairs ? bench.repair(disk) : bench.verify(disk), 0);
+            const std::string because =
+                std::string(place.filesystem) + ", " + std::string(place.because);
+            if (repairs && place.filesystem == "btrfs" && isListed)
+                EXPECT_EQ(bench.listener.error, kPLErrorNoRepairHere) << because;
+            else
+                expectAdviceToCopy(bench.listener, because);
+            EXPECT_FALSE(failing.wasWritten()) << because;
+        }
+}
+
+TEST_F(FailingDiskTest, IsNoEmptyDisk)
+{
+    const auto backing = make("ext4");
+    const FailingDisk failing(workshop_.path("mounted"), backing, {{0, 16U << 20U}});
+    test::Bench bench;
+    ASSERT_EQ(bench.verify(test::reference(failing.path(), "")), 0);
+    expectAdviceToCopy(bench.listener, "all of it is bad");
+}
+
+// Nothing is restored over a copy that was only not to be read.
+TEST_F(FailingDiskTest, IsNoDamagedPartitionMap)
+{
+    const auto backing = test::DiskImage::gpt(workshop_, "backing").path();
+    for (const FailingDisk::Bad bad :
+         {FailingDisk::Bad{0, 512}, FailingDisk::Bad{32735 * 512, 32768 * 512}})
+        for (const bool repairs : {false, true}) {
+            const FailingDisk failing(workshop_.path("mounted"), backing, {bad});
+            const auto whole = test::wholeDisk(failing.path());
+            test::Bench bench;
+            ASSERT_EQ(bench.finish(repairs ? bench.tool->beginPartitionMapRepairForDisk(whole)
+                                           : bench.tool->beginPartitionMapVerifyForDisk(whole)),
+                      0);
+            expectAdviceToCopy(bench.listener, "a copy of the partition map");
+            EXPECT_FALSE(failing.wasWritten());
+        }
+}
+
+// e2fsck -n never reads them, e2fsck -y would answer each question of theirs with yes.
+TEST_F(FailingDiskTest, WhatOnlyARepairReadsIsReadBeforeIt)
+{
+    const auto backing = make("ext4");
+    workshop_.damage(backing, "set_super_value free_blocks_count 1");
+    const FailingDisk failing(workshop_.path("mounted"), backing, {{8193 << 10, 8195 << 10}});
+    test::Bench bench;
+    ASSERT_EQ(bench.repair(test::reference(failing.path())), 0);
+    expectAdviceToCopy(bench.listener, "a backup of the superblock");
+    EXPECT_NE(bench.listener.message.find("byte 8388608 "), std::string::npos)
+        << bench.listener.message;
+    EXPECT_FALSE(failing.wasWritten());
+}
+
+TEST_F(FailingDiskTest, EndsARepairThatMeetsItOnTheWay)
+{
+    const auto backing = make("ext4");
+    workshop_.damage(backing, "feature needs_recovery");
+    workshop_.damage(backing, "clri d7");
+    const FailingDisk failing(workshop_.path("mounted"), backing, {{134 << 10, 646 << 10}},
+                              FailingDisk::Since::FirstWrite);
+    test::Bench bench;
+    ASSERT_EQ(bench.repair(test::reference(failing.path())), 0);
+    EXPECT_TRUE(failing.wasWritten()) << "it began";
+    expectAdviceToCopy(bench.listener, "it failed while it was being repaired");
+    EXPECT_EQ(std::count_if(bench.traces.begin(), bench.traces.end(),
+                            [](const std::string& line) { return line.starts_with("run: "); }),
+              2)
+        << "nothing more is asked of the disk";
+}
+
+}  // namespace
