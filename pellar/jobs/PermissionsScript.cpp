@@ -94,6 +94,7 @@ std::variant<References, Sentence> PermissionsScript::readReferences(const RootD
                                    options_.toolPath,
                                    options_.outputLimits,
                                    [this](std::string line) { log_.trace(std::move(line)); },
+                                   [this](std::string line) { log_.remark(std::move(line)); },
                                    fetchesArchives_};
     return readInstalledReferences(root, accounts_, sources, stop_, [this](double percent) {
         log_.progress(percent);
@@ -108,6 +109,7 @@ std::optional<Tally> PermissionsScript::look(const RootDirectory& root,
 {
     Tally tally;
     tally.withoutSource = references.filesWithoutSource.size();
+    tally.packagesBeyondBounds = references.packagesBeyondBounds;
     double done = 0;
     for (const Reference& reference : references.files) {
         if (stop_.isPressed())
@@ -138,6 +140,8 @@ void PermissionsScript::lookAt(const RootDirectory& root, const Reference& refer
         return;
     tally.differing += isUndecided ? 0 : 1;
     tell(reference, file, difference);
+    if (!isUndecided && !mayBeLentRights(reference, file, tally))
+        return;
     if (pass == Pass::Repair && !isUndecided)
         repair(root, reference, file);
 }
@@ -172,6 +176,26 @@ void PermissionsScript::tell(const Reference& reference, const FoundFile& file,
     }
 }
 
+/// YES also for a file that lends none.
+bool PermissionsScript::mayBeLentRights(const Reference& reference, const FoundFile& file,
+                                        Tally& tally)
+{
+    if (file.permissions.kind != FileKind::Regular || !lendsRights(reference))
+        return true;
+    const Contents contents = contentsOf(file, reference);
+    if (contents == Contents::AsPackaged)
+        return true;
+    ++tally.foreign;
+    log_.problem(log_.text(Sentence{
+        contents == Contents::NotAsPackaged
+            ? "“%1$@”: its content is not the package's, so a repair does not give it these rights."
+            : "“%1$@”: it is not known whether its content is the package's, so a repair does not "
+              "give it these rights.",
+        fixwell::printable(reference.path),
+        {}}));
+    return false;
+}
+
 void PermissionsScript::repair(const RootDirectory& root, const Reference& reference,
                                const FoundFile& file)
 {
@@ -185,7 +209,8 @@ void PermissionsScript::repair(const RootDirectory& root, const Reference& refer
     } else if (const auto* const refusal = std::get_if<NotPermitted>(&restoring)) {
         log_.problem(log_.text(Sentence{"“%1$@” cannot be set right: %2$@.", path,
                                         std::generic_category().message(refusal->error)}));
-    } else if (std::holds_alternative<ChangedMeanwhile>(restoring)) {
+    } else if (std::holds_alternative<ChangedMeanwhile>(restoring) ||
+               std::holds_alternative<ForeignContents>(restoring)) {
         log_.problem(log_.text(
             Sentence{"“%1$@” changed while it was looked at, and was left alone.", path, {}}));
     } else {

@@ -38,6 +38,7 @@ private:
     void lookAt(const RootDirectory& root, const Reference& reference, Pass pass, Tally& tally);
     void tellUnseen(const Reference& reference, Unseen unseen);
     void tell(const Reference& reference, const FoundFile& file, const Difference& difference);
+    bool mayBeLentRights(const Reference& reference, const FoundFile& file, Tally& tally);
     void repair(const RootDirectory& root, const Reference& reference, const FoundFile& file);
     void tellDatabaseIsRead();
     void tell(const Tally& tally);

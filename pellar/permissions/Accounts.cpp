@@ -9,7 +9,7 @@
 namespace pellar {
 namespace {
 
-constexpr std::size_t largestFile = 64U << 20U;
+constexpr std::size_t largestFile = 8U << 20U;
 
 std::optional<std::uint32_t> numberIn(std::string_view text)
 {

@@ -2,6 +2,9 @@
 #include "pellar/permissions/Inspection.h"
 
 #include "pellar/permissions/Capabilities.h"
+#include "pellar/permissions/Digest.h"
+
+#include <fcntl.h>
 
 #include <cerrno>
 
@@ -34,6 +37,21 @@ std::optional<Permissions> permissionsOf(int object, struct stat& status)
         permissions.capabilities = *std::move(capabilities);
     }
     return permissions;
+}
+
+Contents contentsOf(const FoundFile& file, const Reference& reference)
+{
+    constexpr std::uint64_t largest = 256U << 20U;
+    const auto kind = kindOfDigest(reference.digest);
+    if (!kind || file.permissions.kind != FileKind::Regular)
+        return Contents::NotKnown;
+    const FileDescriptor readable(
+        ::open(pathOfDescriptor(file.object.get()).c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const auto digest =
+        readable ? digestOfFile(readable.get(), *kind, largest) : std::optional<std::string>();
+    if (!digest)
+        return Contents::NotKnown;
+    return *digest == reference.digest ? Contents::AsPackaged : Contents::NotAsPackaged;
 }
 
 std::variant<FoundFile, Unseen> inspect(const RootDirectory& root, const std::string& path)

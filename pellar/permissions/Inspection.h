@@ -29,6 +29,16 @@ enum class Unseen {
 [[nodiscard]] std::variant<FoundFile, Unseen> inspect(const RootDirectory& root,
                                                       const std::string& path);
 
+/// Whether what was found holds what its package brought. Only asked of files that lend rights.
+enum class Contents {
+    AsPackaged,
+    NotAsPackaged,
+    NotKnown,  ///< the package does not say, or they cannot be read
+};
+
+/// Reads all of it, a quarter of a gigabyte at most.
+[[nodiscard]] Contents contentsOf(const FoundFile& file, const Reference& reference);
+
 /// Reads the permissions of what was found once more; none when that fails.
 [[nodiscard]] std::optional<Permissions> permissionsOf(int object, struct stat& status);
 

@@ -5,6 +5,7 @@
 #include "pellar/permissions/dpkg/ArchiveFetch.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/permissions/pacman/PacmanReferences.h"
+#include "pellar/permissions/reader/ReaderProcess.h"
 #include "pellar/permissions/rpm/DatabaseCopy.h"
 #include "pellar/permissions/rpm/RPMReferences.h"
 #include "pellar/process/Command.h"
@@ -16,22 +17,39 @@ namespace {
 
 using Answer = std::variant<References, Sentence>;
 
-Answer orStopped(std::optional<References> references)
-{
-    return references ? Answer(*std::move(references)) : Answer(Sentence{});
-}
-
 Answer askRPM(const RootDirectory& root, const Accounts& accounts, const ReferenceSources& sources,
               StopSwitch& stop)
 {
     const std::filesystem::path program = findProgram("rpm", sources.toolPath);
     if (program.empty())
         return Sentence{"%1$@ is not installed (package %2$@)", "rpm", "rpm"};
-    const auto database = DatabaseCopy::make(root, rpmDatabaseOf(root).native());
-    if (!database)
-        return Sentence{"the package database cannot be copied to be read", {}, {}};
-    const RPMQuery query{program, database->path(), sources.outputLimits, sources.trace};
+    const auto database = copyDatabase(root, rpmDatabaseOf(root).native(), stop);
+    if (const auto* const reason = std::get_if<Sentence>(&database))
+        return *reason;
+    const RPMQuery query{program, std::get<TemporaryDirectory>(database).path(),
+                         sources.outputLimits, sources.trace};
     return readRPMReferences(root, accounts, query, stop);
+}
+
+// The running system's own package lists are root's, and so are its archives. What another system
+// says of its own goes nowhere but into the answer.
+Answer askDpkg(const RootDirectory& root, const Accounts& accounts, const ReferenceSources& sources,
+               StopSwitch& stop, const ReadingProgress& progress)
+{
+    const bool isRunning = sources.root == "/";
+    std::optional<ReferenceStore> store;
+    const ArchiveFetch archives(sources.toolPath, stop, {sources.trace, sources.remark});
+    DpkgSources own;
+    if (isRunning)
+        own.kept = &store.emplace(sources.store);
+    if (isRunning && sources.fetchesArchives)
+        own.fetch = [&archives](const auto& packages) {
+            return archives.fetch(packages);
+        };
+    return readApart({root, own, progress}, stop,
+                     [&accounts](const auto& files, const auto& from, const auto& told) {
+                         return readDpkgReferences(files, accounts, from, told);
+                     });
 }
 
 }  // namespace
@@ -43,18 +61,13 @@ std::variant<References, Sentence> readInstalledReferences(const RootDirectory& 
                                                            const ReadingProgress& progress)
 {
     switch (installedSystemAt(root)) {
-        case PackageDatabase::Dpkg: {
-            ReferenceStore store(sources.store);
-            const ArchiveFetch archives(sources.toolPath, stop, sources.trace);
-            FetchArchives fetch;
-            if (sources.fetchesArchives && sources.root == "/")
-                fetch = [&archives](const auto& packages, const auto& directory) {
-                    archives.fetch(packages, directory);
-                };
-            return orStopped(readDpkgReferences(root, accounts, store, fetch, progress));
-        }
+        case PackageDatabase::Dpkg: return askDpkg(root, accounts, sources, stop, progress);
         case PackageDatabase::RPM: return askRPM(root, accounts, sources, stop);
-        case PackageDatabase::Pacman: return orStopped(readPacmanReferences(root, progress));
+        case PackageDatabase::Pacman:
+            return readApart({root, {}, progress}, stop,
+                             [](const auto& files, const auto&, const auto& told) {
+                                 return readPacmanReferences(files, told);
+                             });
         case PackageDatabase::None: break;
     }
     return Sentence{"there is no package database that is known here", {}, {}};

@@ -17,10 +17,11 @@ namespace pellar {
 /// What the reading of a database needs of its host.
 struct ReferenceSources {
     std::filesystem::path root;   ///< as this host sees it
-    std::filesystem::path store;  ///< see ReferenceStore; may be empty
+    std::filesystem::path store;  ///< see ReferenceStore; may be empty; for the running system
     std::string toolPath;         ///< where rpm(8) is looked for
     OutputLimits outputLimits;
     std::function<void(std::string)> trace;
+    std::function<void(std::string)> remark;  ///< told what apt complains of, fit to be shown
     /// The user wants the archives that are missing to be fetched over the network; only done for
     /// the running system, whose apt knows where from.
     bool fetchesArchives = false;

@@ -1,61 +1,108 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/PackagedFile.h"
 
+#include "pellar/permissions/Digest.h"
 #include "pellar/permissions/PathAliases.h"
 
 #include <archive.h>
 #include <archive_entry.h>
+#include <sys/stat.h>
 
 #include <array>
 #include <memory>
+#include <unordered_map>
 
 namespace pellar {
 namespace {
 
 struct FreeArchive {
     void operator()(archive* opened) const { ::archive_free(opened); }
-    void operator()(archive_entry* entry) const { ::archive_entry_free(entry); }
 };
 using ArchivePointer = std::unique_ptr<archive, FreeArchive>;
 
 constexpr std::size_t blockBytes = 65536;
-/// No package has so many; an archive that was made to have them is no sound one.
-constexpr std::size_t mostFiles = 2'000'000;
+
+// dpkg's own (dpkg-deb(1), -Z, and what it reads from before), and lz4 for apt's indexes. A library
+// built without one of them answers ARCHIVE_WARN, and would run a program found by PATH.
+bool supportFilters(archive* opened)
+{
+    return ::archive_read_support_filter_gzip(opened) == ARCHIVE_OK &&
+           ::archive_read_support_filter_xz(opened) == ARCHIVE_OK &&
+           ::archive_read_support_filter_zstd(opened) == ARCHIVE_OK &&
+           ::archive_read_support_filter_bzip2(opened) == ARCHIVE_OK &&
+           ::archive_read_support_filter_lzma(opened) == ARCHIVE_OK;
+}
 
 std::string textOf(const char* text, const char* asUTF8)
 {
     return text != nullptr ? text : asUTF8 != nullptr ? asUTF8 : "";
 }
 
-// A hard link of tar's has no type of its own; it is a regular file's further name.
-PackagedFile fileOf(archive_entry* entry)
-{
-    const bool isHardLink = ::archive_entry_hardlink(entry) != nullptr;
-    PackagedFile file;
-    file.path = withoutSlashes(
-        textOf(::archive_entry_pathname(entry), ::archive_entry_pathname_utf8(entry)));
-    file.kind = isHardLink ? FileKind::Regular : kindOf(::archive_entry_filetype(entry));
-    file.mode = ::archive_entry_perm(entry) & 07777U;
-    file.user = {textOf(::archive_entry_uname(entry), nullptr),
-                 static_cast<std::uint32_t>(::archive_entry_uid(entry))};
-    file.group = {textOf(::archive_entry_gname(entry), nullptr),
-                  static_cast<std::uint32_t>(::archive_entry_gid(entry))};
-    return file;
-}
+/// Reads a tree of files, within the bounds of a package.
+class TarReading {
+public:
+    explicit TarReading(archive* opened) : opened_(opened) {}
 
-std::optional<std::vector<PackagedFile>> allFilesOf(archive* opened)
-{
-    std::vector<PackagedFile> files;
-    archive_entry* entry = nullptr;
-    int result = ARCHIVE_OK;
-    while ((result = ::archive_read_next_header(opened, &entry)) == ARCHIVE_OK ||
-           result == ARCHIVE_WARN) {
-        files.push_back(fileOf(entry));
-        if (files.size() > mostFiles)
-            return std::nullopt;
+    PackagedFiles read()
+    {
+        archive_entry* entry = nullptr;
+        int result = ARCHIVE_OK;
+        while ((result = ::archive_read_next_header(opened_, &entry)) == ARCHIVE_OK ||
+               result == ARCHIVE_WARN) {
+            if (isBeyondBounds(entry))
+                return PackageFault::BeyondBounds;
+            add(entry);
+        }
+        if (result != ARCHIVE_EOF)
+            return PackageFault::Malformed;
+        return std::move(files_);
     }
-    return result == ARCHIVE_EOF ? std::optional(std::move(files)) : std::nullopt;
-}
+
+private:
+    // What a member holds is unpacked even to be skipped.
+    bool isBeyondBounds(archive_entry* entry) const
+    {
+        const la_int64_t before = ::archive_filter_bytes(opened_, 0);
+        const la_int64_t size = ::archive_entry_size(entry);
+        constexpr auto most = static_cast<la_int64_t>(mostBytesOfPackage);
+        return files_.size() >= mostFilesOfPackage || size < 0 || before > most ||
+               size > most - before;
+    }
+
+    // A hard link of tar's has no type and no contents of its own; it is a regular file's further
+    // name, and that stands before it.
+    void add(archive_entry* entry)
+    {
+        const char* const link = ::archive_entry_hardlink(entry);
+        PackagedFile file;
+        file.path = withoutSlashes(
+            textOf(::archive_entry_pathname(entry), ::archive_entry_pathname_utf8(entry)));
+        file.kind = link != nullptr ? FileKind::Regular : kindOf(::archive_entry_filetype(entry));
+        file.mode = ::archive_entry_perm(entry) & 07777U;
+        file.user = {textOf(::archive_entry_uname(entry), nullptr),
+                     static_cast<std::uint32_t>(::archive_entry_uid(entry))};
+        file.group = {textOf(::archive_entry_gname(entry), nullptr),
+                      static_cast<std::uint32_t>(::archive_entry_gid(entry))};
+        if (file.kind == FileKind::Regular && (file.mode & (S_ISUID | S_ISGID)) != 0)
+            file.digest = link != nullptr ? digests_[withoutSlashes(link)]
+                                          : digests_[file.path] = digestOfContents();
+        files_.push_back(std::move(file));
+    }
+
+    std::string digestOfContents()
+    {
+        Digester digester(DigestKind::SHA256);
+        std::array<char, blockBytes> block{};
+        la_ssize_t count = 0;
+        while ((count = ::archive_read_data(opened_, block.data(), block.size())) > 0)
+            digester.add({block.data(), static_cast<std::size_t>(count)});
+        return count == 0 ? digester.finish() : std::string();
+    }
+
+    archive* opened_;
+    std::vector<PackagedFile> files_;
+    std::unordered_map<std::string, std::string> digests_;
+};
 
 /// A member of an archive as the contents of another.
 struct Member {
@@ -70,46 +117,16 @@ struct Member {
     }
 };
 
-std::optional<std::vector<PackagedFile>> filesOfMember(archive* outer)
+PackagedFiles filesOfMember(archive* outer)
 {
     const auto member = std::make_unique<Member>(Member{outer});
     const ArchivePointer inner(::archive_read_new());
-    ::archive_read_support_filter_all(inner.get());
-    ::archive_read_support_format_tar(inner.get());
-    if (::archive_read_open(inner.get(), member.get(), nullptr, Member::read, nullptr) !=
-        ARCHIVE_OK)
-        return std::nullopt;
-    return allFilesOf(inner.get());
-}
-
-la_ssize_t append(archive*, void* text, const void* bytes, std::size_t length)
-{
-    static_cast<std::string*>(text)->append(static_cast<const char*>(bytes), length);
-    return static_cast<la_ssize_t>(length);
-}
-
-unsigned typeOf(FileKind kind)
-{
-    switch (kind) {
-        case FileKind::Regular: return AE_IFREG;
-        case FileKind::Directory: return AE_IFDIR;
-        case FileKind::SymbolicLink: return AE_IFLNK;
-        case FileKind::Other: break;
-    }
-    return AE_IFSOCK;
-}
-
-bool write(archive* opened, archive_entry* entry, const PackagedFile& file)
-{
-    ::archive_entry_clear(entry);
-    ::archive_entry_set_pathname(entry, file.path.c_str());
-    ::archive_entry_set_filetype(entry, typeOf(file.kind));
-    ::archive_entry_set_perm(entry, file.mode);
-    ::archive_entry_set_uid(entry, file.user.number);
-    ::archive_entry_set_gid(entry, file.group.number);
-    ::archive_entry_set_uname(entry, file.user.name.c_str());
-    ::archive_entry_set_gname(entry, file.group.name.c_str());
-    return ::archive_write_header(opened, entry) == ARCHIVE_OK;
+    if (!supportFilters(inner.get()) ||
+        ::archive_read_support_format_tar(inner.get()) != ARCHIVE_OK ||
+        ::archive_read_open(inner.get(), member.get(), nullptr, Member::read, nullptr) !=
+            ARCHIVE_OK)
+        return PackageFault::Malformed;
+    return TarReading(inner.get()).read();
 }
 
 }  // namespace
@@ -119,42 +136,43 @@ std::uint32_t numberFor(const PackagedOwner& owner, const AccountNames& accounts
     return accounts.numberOf(owner.name).value_or(owner.number);
 }
 
-std::optional<std::vector<PackagedFile>> readDebArchive(int file)
+PackagedFiles readDebArchive(int file)
 {
     const ArchivePointer outer(::archive_read_new());
     ::archive_read_support_format_ar(outer.get());
     if (::archive_read_open_fd(outer.get(), file, blockBytes) != ARCHIVE_OK)
-        return std::nullopt;
+        return PackageFault::Malformed;
+    constexpr int mostMembers = 16;  // deb(5) has three, and may get more
     archive_entry* entry = nullptr;
-    while (::archive_read_next_header(outer.get(), &entry) == ARCHIVE_OK)
+    for (int i = 0; i < mostMembers; ++i) {
+        if (::archive_read_next_header(outer.get(), &entry) != ARCHIVE_OK)
+            break;
         if (textOf(::archive_entry_pathname(entry), nullptr).starts_with("data.tar"))
             return filesOfMember(outer.get());
-    return std::nullopt;
+    }
+    return PackageFault::Malformed;
 }
 
-std::optional<std::vector<PackagedFile>> readMtree(std::string_view bytes)
+bool unpack(int file, const std::function<bool(std::string_view)>& take)
 {
     const ArchivePointer opened(::archive_read_new());
-    ::archive_read_support_filter_gzip(opened.get());
-    ::archive_read_support_format_mtree(opened.get());
-    if (::archive_read_open_memory(opened.get(), bytes.data(), bytes.size()) != ARCHIVE_OK)
-        return std::nullopt;
-    return allFilesOf(opened.get());
-}
-
-std::optional<std::string> writeMtree(const std::vector<PackagedFile>& files)
-{
-    std::string text;
-    const ArchivePointer opened(::archive_write_new());
-    const std::unique_ptr<archive_entry, FreeArchive> entry(::archive_entry_new());
-    ::archive_write_set_format_mtree(opened.get());
-    ::archive_write_set_options(opened.get(), "!all,type,mode,uid,gid,uname,gname");
-    if (::archive_write_open(opened.get(), &text, nullptr, append, nullptr) != ARCHIVE_OK)
-        return std::nullopt;
-    for (const PackagedFile& file : files)
-        if (!file.path.empty() && !write(opened.get(), entry.get(), file))
-            return std::nullopt;
-    return ::archive_write_close(opened.get()) == ARCHIVE_OK ? std::optional(text) : std::nullopt;
+    archive_entry* entry = nullptr;
+    if (!supportFilters(opened.get()) ||
+        ::archive_read_support_filter_lz4(opened.get()) != ARCHIVE_OK ||
+        ::archive_read_support_format_raw(opened.get()) != ARCHIVE_OK ||
+        ::archive_read_support_format_empty(opened.get()) != ARCHIVE_OK ||
+        ::archive_read_open_fd(opened.get(), file, blockBytes) != ARCHIVE_OK)
+        return false;
+    const int opening = ::archive_read_next_header(opened.get(), &entry);
+    if (opening == ARCHIVE_EOF)
+        return true;  // an empty file
+    la_ssize_t count = opening == ARCHIVE_OK ? 0 : -1;
+    std::array<char, blockBytes> block{};
+    while (count >= 0 &&
+           (count = ::archive_read_data(opened.get(), block.data(), block.size())) > 0)
+        if (!take({block.data(), static_cast<std::size_t>(count)}))
+            return false;
+    return count == 0;
 }
 
 }  // namespace pellar

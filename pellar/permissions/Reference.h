@@ -32,12 +32,18 @@ struct Reference {
     /// None where the source does not tell.
     std::optional<std::string> capabilities;
     Doubt doubt = Doubt::None;
+    /// Of the contents, see kindOfDigest; empty where it is not known.
+    std::string digest;
 };
+
+/// Whether a file that is so lends rights to those who run it.
+bool lendsRights(const Reference& reference);
 
 struct References {
     std::vector<Reference> files;  ///< by path, a directory before what it holds
     std::uint64_t packages = 0;
     std::uint64_t packagesWithoutSource = 0;
+    std::uint64_t packagesBeyondBounds = 0;       ///< of those: larger than a package may be
     std::vector<std::string> filesWithoutSource;  ///< installed, but nobody says how
 };
 

@@ -1,11 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/ReferenceCollector.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 #include <utility>
 
 namespace pellar {
 namespace {
+
+/// A full installation of a distribution has less than two million.
+constexpr std::size_t mostFilesOfSystem = 3'000'000;
 
 bool saysTheSame(const Reference& one, const Reference& other)
 {
@@ -15,8 +20,23 @@ bool saysTheSame(const Reference& one, const Reference& other)
 
 }  // namespace
 
+bool lendsRights(const Reference& reference)
+{
+    const bool mayBeRegular = !reference.kind || *reference.kind == FileKind::Regular;
+    const bool hasBits = (reference.mode & (S_ISUID | S_ISGID)) != 0;
+    return mayBeRegular &&
+           (hasBits || (reference.capabilities && !reference.capabilities->empty()));
+}
+
+bool ReferenceCollector::isFull() const
+{
+    return files_.size() + withoutSource_.size() >= mostFilesOfSystem;
+}
+
 void ReferenceCollector::add(Reference reference)
 {
+    if (isFull())
+        return;
     const auto [known, isNew] = files_.try_emplace(reference.path, reference);
     if (isNew)
         return;
@@ -24,11 +44,14 @@ void ReferenceCollector::add(Reference reference)
         known->second.doubt = reference.doubt;
     if (known->second.doubt == Doubt::None && !saysTheSame(known->second, reference))
         known->second.doubt = Doubt::PackagesDiffer;
+    if (known->second.digest != reference.digest)
+        known->second.digest.clear();  // of two, neither is the file's own
 }
 
 void ReferenceCollector::addWithoutSource(const std::string& path)
 {
-    withoutSource_.push_back(path);
+    if (!isFull())
+        withoutSource_.push_back(path);
 }
 
 void ReferenceCollector::override(Reference reference)
@@ -46,8 +69,10 @@ References ReferenceCollector::take() &&
 {
     for (auto& [path, override] : overrides_) {
         const auto known = files_.find(path);
-        if (known != files_.end())
+        if (known != files_.end()) {
             override.kind = known->second.kind;
+            override.digest = known->second.digest;
+        }
         files_[path] = override;
     }
     for (auto& [path, reference] : files_)

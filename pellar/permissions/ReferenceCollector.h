@@ -20,6 +20,10 @@ public:
     void override(Reference reference);
 
     void countPackage(bool hasSource);
+    /// Of a package that was counted as one without a source.
+    void countBeyondBounds() { ++result_.packagesBeyondBounds; }
+    /// More files than an installed system may have: what comes now is not taken.
+    bool isFull() const;
     [[nodiscard]] References take() &&;
 
 private:

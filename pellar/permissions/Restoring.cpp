@@ -9,6 +9,8 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <csignal>
+#include <optional>
 
 namespace pellar {
 namespace {
@@ -59,6 +61,38 @@ int setAll(const Reference& reference, const Permissions& is, int object)
     return error;
 }
 
+// A lease is refused while somebody has the file open for writing (fcntl(2)); where a file system
+// knows none, the kernel still takes setuid away when another writes. SIGURG, which would tell of
+// the next to open it, is ignored by default.
+bool isOpenForWriting(int object)
+{
+    const FileDescriptor readable(
+        ::open(pathOfDescriptor(object).c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    ::fcntl(readable.get(), F_SETSIG, SIGURG);
+    return readable && ::fcntl(readable.get(), F_SETLEASE, F_RDLCK) != 0 && errno == EAGAIN;
+}
+
+/// Makes the file one that nobody but its rightful owner can write to, without lending any right
+/// yet, and looks at its contents then. None when they are the package's.
+std::optional<Restoring> objectionToLending(const Reference& reference, const FoundFile& seen)
+{
+    if (contentsOf(seen, reference) != Contents::AsPackaged)
+        return ForeignContents{};
+    const int object = seen.object.get();
+    int error = setOwner(reference, object);
+    constexpr mode_t harmless = 0755;
+    if (error == 0)
+        error =
+            ::chmod(pathOfDescriptor(object).c_str(), reference.mode & harmless) == 0 ? 0 : errno;
+    if (error != 0)
+        return NotPermitted{error};
+    if (isOpenForWriting(object))
+        return ChangedMeanwhile{};
+    if (contentsOf(seen, reference) != Contents::AsPackaged)
+        return ForeignContents{};
+    return std::nullopt;
+}
+
 }  // namespace
 
 Restoring restore(const RootDirectory& root, const Reference& reference, const FoundFile& seen)
@@ -70,9 +104,13 @@ Restoring restore(const RootDirectory& root, const Reference& reference, const F
         seen.permissions.kind == FileKind::Regular && seen.status.st_nlink > 1;
     if (hasFurtherNames && !isClosedToOthers(root, reference.path))
         return SuspiciousLink{};
-    if (const int error = setAll(reference, seen.permissions, seen.object.get()))
-        return NotPermitted{error};
+    const bool lends = seen.permissions.kind == FileKind::Regular && lendsRights(reference);
+    if (const auto objection = lends ? objectionToLending(reference, seen) : std::nullopt)
+        return *objection;
     struct stat status = {};
+    const auto before = permissionsOf(seen.object.get(), status);
+    if (const int error = before ? setAll(reference, *before, seen.object.get()) : EIO)
+        return NotPermitted{error};
     const auto now = permissionsOf(seen.object.get(), status);
     if (!now || !compare(reference, *now).isNone())
         return NotPermitted{EIO};  // the file system took the order and did not carry it out

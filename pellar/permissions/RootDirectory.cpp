@@ -84,33 +84,17 @@ FileDescriptor RootDirectory::openFile(const std::string& path) const
     return FileDescriptor(::open(pathOfDescriptor(object.get()).c_str(), O_RDONLY | O_CLOEXEC));
 }
 
-std::optional<std::string> RootDirectory::read(const std::string& path, std::size_t largest) const
-{
-    const FileDescriptor file = openFile(path);
-    if (!file)
-        return std::nullopt;
-    std::string contents;
-    std::array<char, 65536> buffer{};
-    while (contents.size() <= largest) {
-        const ssize_t count = ::read(file.get(), buffer.data(), buffer.size());
-        if (count < 0 && errno != EINTR)
-            return std::nullopt;
-        if (count == 0)
-            return contents;
-        contents.append(buffer.data(), static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
-    }
-    return std::nullopt;
-}
-
 std::vector<std::string> RootDirectory::names(const std::string& directory) const
 {
     const FileDescriptor opened =
         openWithin(directory_.get(), directory, O_RDONLY | O_DIRECTORY, RESOLVE_IN_ROOT);
+    constexpr std::size_t mostNames = 500'000;  // dpkg has some ten for each package in one
     std::vector<std::string> names;
     const std::unique_ptr<DIR, CloseDirectory> stream(
         opened ? ::opendir(pathOfDescriptor(opened.get()).c_str()) : nullptr);
     while (const dirent* const entry = stream ? ::readdir(stream.get()) : nullptr)
-        if (const std::string name = entry->d_name; name != "." && name != "..")
+        if (const std::string name = entry->d_name;
+            name != "." && name != ".." && names.size() < mostNames)
             names.push_back(name);
     std::sort(names.begin(), names.end());
     return names;

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <array>
+#include <vector>
 
 namespace pellar {
 namespace {
@@ -93,9 +94,24 @@ std::size_t depthOf(std::string_view path)
     return static_cast<std::size_t>(std::count(path.begin(), path.end(), '/')) + 1;
 }
 
-bool isBelow(std::string_view path, std::string_view tree)
+/// Asks about what stands behind each "/" of a path, and so takes the time that one path does,
+/// however many there are to be found among.
+bool hasEnding(const std::unordered_set<std::string>& endings, const std::string& path)
 {
-    return path.size() > tree.size() && path.starts_with(tree) && path[tree.size()] == '/';
+    for (std::size_t slash = path.find('/'); slash != std::string::npos && !endings.empty();
+         slash = path.find('/', slash + 1))
+        if (endings.count(path.substr(slash + 1)) > 0)
+            return true;
+    return false;
+}
+
+bool isBelowOne(const std::unordered_set<std::string>& trees, const std::string& path)
+{
+    for (std::size_t slash = path.find('/'); slash != std::string::npos && !trees.empty();
+         slash = path.find('/', slash + 1))
+        if (trees.count(path.substr(0, slash)) > 0)
+            return true;
+    return false;
 }
 
 }  // namespace
@@ -130,7 +146,7 @@ void ScriptMentions::add(std::string_view script, const PathAliases& aliases)
 void ScriptMentions::addTree(const std::string& path)
 {
     if (depthOf(path) > 2)
-        trees_.push_back(path);
+        trees_.insert(path);
 }
 
 // "VARIABLE=/path" and "root:/path" come here whole: the path begins at the first "/".
@@ -147,7 +163,7 @@ void ScriptMentions::addPath(std::string_view token, bool isWhole, bool isOnPerm
     const std::size_t slash = path.rfind('/');
     words_.insert(slash == std::string::npos ? path : path.substr(slash + 1));
     if (!isWhole)
-        endings_.push_back("/" + path);
+        endings_.insert(path);
 }
 
 // The directories that everybody has are spoken of everywhere; only a command's own word counts.
@@ -159,10 +175,7 @@ bool ScriptMentions::mayConcernOwn(const std::string& path, FileKind kind) const
     const std::size_t slash = path.rfind('/');
     const std::string name = slash == std::string::npos ? path : path.substr(slash + 1);
     return paths_.count(path) > 0 || (kind != FileKind::Directory && words_.count(name) > 0) ||
-           std::any_of(endings_.begin(), endings_.end(),
-                       [&](const std::string& ending) { return path.ends_with(ending); }) ||
-           std::any_of(trees_.begin(), trees_.end(),
-                       [&](const std::string& tree) { return isBelow(path, tree); });
+           hasEnding(endings_, path) || isBelowOne(trees_, path);
 }
 
 bool ScriptMentions::mayConcernForeign(const std::string& path) const

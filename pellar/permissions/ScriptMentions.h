@@ -7,7 +7,7 @@
 #include <set>
 #include <string>
 #include <string_view>
-#include <vector>
+#include <unordered_set>
 
 namespace pellar {
 
@@ -33,11 +33,11 @@ private:
 
     void addTree(const std::string& path);
 
-    std::set<std::string> paths_;         ///< "/usr/bin/x", without the first "/"
-    std::set<std::string> commandPaths_;  ///< those in a line that sets permissions
-    std::set<std::string> words_;         ///< names, for loops over them
-    std::vector<std::string> endings_;    ///< "/x" of "$directory/x"
-    std::vector<std::string> trees_;      ///< with all that they hold
+    std::set<std::string> paths_;              ///< "/usr/bin/x", without the first "/"
+    std::set<std::string> commandPaths_;       ///< those in a line that sets permissions
+    std::set<std::string> words_;              ///< names, for loops over them
+    std::unordered_set<std::string> endings_;  ///< "x/y" of "$directory/x/y"
+    std::unordered_set<std::string> trees_;    ///< with all that they hold
 };
 
 }  // namespace pellar

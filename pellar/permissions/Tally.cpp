@@ -28,6 +28,14 @@ std::vector<Sentence> sentencesOf(const Tally& tally)
         "%1$@ file was not compared: it is not known here what permissions its package gives it.",
         "%1$@ files were not compared: it is not known here what permissions their packages give "
         "them.");
+    add(tally.packagesBeyondBounds,
+        "%1$@ package was not compared: it is larger than any package may be.",
+        "%1$@ packages were not compared: they are larger than any package may be.");
+    add(tally.foreign,
+        "%1$@ file may not lend the rights of others: its content is not known to be its "
+        "package's.",
+        "%1$@ files may not lend the rights of others: their content is not known to be their "
+        "packages'.");
     add(tally.undecided,
         "%1$@ file is undecided: the system may rightly have changed it after its installation.",
         "%1$@ files are undecided: the system may rightly have changed them after their "

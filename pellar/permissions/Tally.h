@@ -15,7 +15,9 @@ struct Tally {
     std::uint64_t compared = 0;
     std::uint64_t differing = 0;  ///< of those
     std::uint64_t undecided = 0;
+    std::uint64_t foreign = 0;  ///< of the differing: of other contents than the package's
     std::uint64_t withoutSource = 0;
+    std::uint64_t packagesBeyondBounds = 0;  ///< larger than a package may be
     std::uint64_t missing = 0;
     std::uint64_t elsewhere = 0;    ///< on another file system, which is another volume's
     std::uint64_t unreachable = 0;  ///< behind a link, or not readable

@@ -2,7 +2,7 @@
 #include "pellar/permissions/TemporaryFileRules.h"
 
 #include "pellar/permissions/Lines.h"
-#include "pellar/permissions/RootDirectory.h"
+#include "pellar/permissions/RootFiles.h"
 
 #include <fnmatch.h>
 
@@ -11,7 +11,9 @@
 namespace pellar {
 namespace {
 
-constexpr std::size_t largestFile = 4U << 20U;
+constexpr std::size_t largestFile = 1U << 20U;
+/// Each file of the system is held against each pattern. Debian's own rules have some thirty.
+constexpr std::size_t mostPatterns = 1000;
 
 bool matches(const std::string& pattern, const std::string& path)
 {
@@ -67,14 +69,14 @@ void TemporaryFileRules::add(std::string_view text, const PathAliases& aliases)
 
 bool TemporaryFileRules::concern(const std::string& path) const
 {
-    return paths_.count(path) > 0 ||
+    return patterns_.size() + trees_.size() > mostPatterns || paths_.count(path) > 0 ||
            std::any_of(patterns_.begin(), patterns_.end(),
                        [&](const std::string& pattern) { return matches(pattern, path); }) ||
            std::any_of(trees_.begin(), trees_.end(),
                        [&](const std::string& tree) { return isBelowPattern(path, tree); });
 }
 
-TemporaryFileRules temporaryFileRulesOf(const RootDirectory& root)
+TemporaryFileRules temporaryFileRulesOf(const RootFiles& root)
 {
     TemporaryFileRules rules;
     for (const std::string directory :

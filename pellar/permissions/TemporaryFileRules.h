@@ -10,7 +10,7 @@
 
 namespace pellar {
 
-class RootDirectory;
+class RootFiles;
 
 /// Files whose permissions are set at each start of the system (tmpfiles.d(5)): what a package
 /// says of them is not the last word. sysusers.d(5) makes accounts and sets no permissions.
@@ -18,6 +18,7 @@ class TemporaryFileRules {
 public:
     /// Takes a file of rules.
     void add(std::string_view text, const PathAliases& aliases);
+    /// YES for every file where there are more patterns than a system may have.
     bool concern(const std::string& path) const;
 
 private:
@@ -26,6 +27,6 @@ private:
     std::vector<std::string> trees_;     ///< patterns of directories, with all that they hold
 };
 
-TemporaryFileRules temporaryFileRulesOf(const RootDirectory& root);
+TemporaryFileRules temporaryFileRulesOf(const RootFiles& root);
 
 }  // namespace pellar

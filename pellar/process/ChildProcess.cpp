@@ -2,6 +2,7 @@
 #include "pellar/process/ChildProcess.h"
 
 #include "pellar/process/ForkedSignals.h"
+#include "pellar/process/ReducedRights.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>
@@ -32,6 +33,8 @@ struct Preparation {
     pid_t parent = 0;
     Access access = Access::ReadOnly;
     bool ignoresStops = false;
+    bool isReduced = false;
+    FileDescriptor writingRule;
 };
 
 /// Above the numbers that the child hands out, so no duplication overwrites another.
@@ -56,6 +59,9 @@ Preparation prepare(const Command& command, const ChildStreams& streams, int fai
     ready.parent = ::getpid();
     ready.access = streams.access;
     ready.ignoresStops = streams.ignoresStops;
+    ready.isReduced = command.isReduced;
+    if (command.isReduced && !command.writable.empty())
+        ready.writingRule = ruleForWritingBelow(command.writable);
     return ready;
 }
 
@@ -103,7 +109,10 @@ bool place(const FileDescriptor& source, int number)
     // Ours are all closed on exec; this is for those of other libraries in the process.
     const unsigned first = progressDescriptorOfTool + (ready.progress ? 1U : 0U);
     ::syscall(SYS_close_range, first, ~0U, CLOSE_RANGE_CLOEXEC);
-    if (!isOrphan && isPlaced && ::chdir("/") == 0)
+    const bool hasItsRights =
+        !ready.isReduced ||
+        (reduceRights({}) && (!ready.writingRule || obeyRule(ready.writingRule.get())));
+    if (!isOrphan && isPlaced && hasItsRights && ::chdir("/") == 0)
         ::execve(ready.executable.c_str(), ready.arguments.data(),
                  const_cast<char* const*>(environment.data()));
     const int error = errno;

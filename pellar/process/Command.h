@@ -12,6 +12,10 @@ namespace pellar {
 struct Command {
     std::filesystem::path executable;  ///< absolute
     std::vector<std::string> arguments;
+    /// It reads what strangers wrote and needs no rights for it: see reduceRights.
+    bool isReduced = false;
+    /// Where it may write when its rights are reduced, as far as the kernel can see to that.
+    std::filesystem::path writable = {};
 };
 
 /// One line for a log: the words, separated by blanks, fit to be shown.

@@ -1,10 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/dpkg/ArchiveFetch.h"
 
+#include "fixwell/host/foundation/UTF8.h"
 #include "pellar/permissions/Lines.h"
+#include "pellar/permissions/PackagedFile.h"
+#include "pellar/permissions/TemporaryDirectory.h"
 
+#include <fcntl.h>
+#include <pwd.h>
 #include <unistd.h>
 
+#include <cstdlib>
 #include <unordered_set>
 #include <utility>
 
@@ -31,6 +37,35 @@ public:
     std::vector<ArchiveAddress> addresses;
 };
 
+/// Passes on what apt complains of: a warning begins with "W:", an error with "E:". The first few
+/// say what the others do.
+class ComplaintReader final : public RunListener {
+public:
+    explicit ComplaintReader(const std::function<void(std::string)>& tell) : tell_(tell) {}
+
+    void line(std::string_view line, bool) override
+    {
+        constexpr int mostComplaints = 10;
+        const bool isComplaint = line.starts_with("W: ") || line.starts_with("E: ");
+        if (isComplaint && tell_ && told_++ < mostComplaints)
+            tell_("apt: " + fixwell::printable(std::string(line)));
+    }
+    void progressLine(std::string_view) override {}
+    void lineLimitReached() override {}
+    void pause() override {}
+    void tick() override {}
+
+private:
+    const std::function<void(std::string)>& tell_;
+    int told_ = 0;
+};
+
+/// apt's own user for what comes from the network; nobody where root does not fetch.
+const passwd* userOfApt()
+{
+    return ::geteuid() == 0 ? ::getpwnam("_apt") : nullptr;
+}
+
 }  // namespace
 
 // 'http://deb.debian.org/debian/pool/main/h/hello/hello_2.10-3_amd64.deb' hello_2.10-3_amd64.deb
@@ -51,10 +86,39 @@ std::optional<ArchiveAddress> parseArchiveAddress(std::string_view line)
     return ArchiveAddress{std::string(address), std::string(name), std::string(hash)};
 }
 
-ArchiveFetch::ArchiveFetch(const std::string& toolPath, StopSwitch& stop,
-                           std::function<void(std::string)> trace)
-    : aptGet_(findProgram("apt-get", toolPath)), stop_(stop), trace_(std::move(trace))
+ArchiveFetch::ArchiveFetch(const std::string& toolPath, StopSwitch& stop, FetchListener listener)
+    : aptGet_(findProgram("apt-get", toolPath)), stop_(stop), listener_(std::move(listener))
 {
+}
+
+std::vector<FileDescriptor> ArchiveFetch::fetch(std::span<const DpkgPackage> packages) const
+{
+    const auto directory = TemporaryDirectory::make("archives");
+    const passwd* const user = userOfApt();
+    if (!directory || (user != nullptr && !directory->giveTo(user->pw_uid, 0)))
+        return {};
+    fetch(packages, directory->path());
+    std::vector<FileDescriptor> archives;
+    for (const DpkgPackage& package : packages)
+        archives.push_back(privateCopy(directory->path() / (package.fileName() + ".deb")));
+    return archives;
+}
+
+// apt's user could still write to the file itself while it is checked and read.
+FileDescriptor ArchiveFetch::privateCopy(const std::filesystem::path& archive) const
+{
+    const FileDescriptor from(
+        ::open(archive.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+    std::error_code error;
+    std::string name = std::filesystem::temp_directory_path(error).native() + "/orvane-deb.XXXXXX";
+    FileDescriptor copy(from && !error ? ::mkostemp(name.data(), O_CLOEXEC) : -1);
+    if (!copy)
+        return {};
+    ::unlink(name.c_str());
+    CopyBounds bounds{mostBytesOfPackage, mostBytesOfPackage};
+    const bool isCopied = copyFile(from.get(), copy.get(), bounds, stop_) == Copying::Done;
+    ::unlink(archive.c_str());
+    return isCopied ? std::move(copy) : FileDescriptor();
 }
 
 void ArchiveFetch::fetch(std::span<const DpkgPackage> packages,
@@ -94,8 +158,8 @@ bool ArchiveFetch::download(std::span<const Download> downloads) const
     for (const Download& one : downloads)
         command.arguments.insert(command.arguments.end(),
                                  {one.archive.address, one.target.native(), one.archive.hash});
-    AddressReader nothing;
-    return run(std::move(command), nothing);
+    ComplaintReader complaints(listener_.remark);
+    return run(std::move(command), complaints);
 }
 
 bool ArchiveFetch::run(Command command, RunListener& listener) const
@@ -105,8 +169,8 @@ bool ArchiveFetch::run(Command command, RunListener& listener) const
     RunRequest request;
     request.command = std::move(command);
     request.graceTimes = graceTimesFor(Access::ReadOnly);
-    if (trace_)
-        trace_(shown(request.command));
+    if (listener_.trace)
+        listener_.trace(shown(request.command));
     return runTool(request, stop_, listener).ending == Ending(Exited{0});
 }
 

@@ -3,6 +3,7 @@
 
 #include "pellar/permissions/dpkg/DpkgStatus.h"
 #include "pellar/process/Command.h"
+#include "pellar/process/FileDescriptor.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/process/StopSwitch.h"
 
@@ -29,17 +30,24 @@ struct ArchiveAddress {
 /// without a hash to check the archive by.
 std::optional<ArchiveAddress> parseArchiveAddress(std::string_view line);
 
+/// Who hears of a fetch; either may be empty.
+struct FetchListener {
+    std::function<void(std::string)> trace;   ///< told each command
+    std::function<void(std::string)> remark;  ///< told what apt complains of, fit to be shown
+};
+
 /// Fetches archives over the network with the apt of the running system, which also checks them.
 /// Only to be used when the user has asked for it.
 class ArchiveFetch {
 public:
     /// `toolPath` is searched for apt-get. The switch outlives it.
-    ArchiveFetch(const std::string& toolPath, StopSwitch& stop,
-                 std::function<void(std::string)> trace);
+    ArchiveFetch(const std::string& toolPath, StopSwitch& stop, FetchListener listener);
 
-    /// Into this directory, as the packages' file names say. What cannot be had, or is not what it
-    /// should be, is not there. Takes as long as the network does; stopping ends it.
-    void fetch(std::span<const DpkgPackage> packages, const std::filesystem::path& directory) const;
+    /// A private copy of each package's archive, which lies in no directory; none for what cannot
+    /// be had, or is not what it should be. apt gets a directory that its own user can write to,
+    /// so that it can fetch without root's rights. Takes as long as the network does; stopping
+    /// ends it.
+    std::vector<FileDescriptor> fetch(std::span<const DpkgPackage> packages) const;
 
 private:
     struct Download {
@@ -47,14 +55,17 @@ private:
         std::filesystem::path target;
     };
 
+    void fetch(std::span<const DpkgPackage> packages, const std::filesystem::path& directory) const;
     std::vector<Download> downloadsOf(std::span<const DpkgPackage> packages,
                                       const std::filesystem::path& directory) const;
     bool download(std::span<const Download> downloads) const;
+    FileDescriptor privateCopy(const std::filesystem::path& archive) const;
+    /// What it complains of while it downloads is told; NO when it failed.
     bool run(Command command, RunListener& listener) const;
 
     std::filesystem::path aptGet_;
     StopSwitch& stop_;
-    std::function<void(std::string)> trace_;
+    FetchListener listener_;
 };
 
 }  // namespace pellar

@@ -3,30 +3,36 @@
 
 #include "pellar/permissions/Accounts.h"
 #include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
+#include "pellar/permissions/RootFiles.h"
 #include "pellar/permissions/dpkg/DpkgStatus.h"
 #include "pellar/permissions/dpkg/ReferenceStore.h"
 
-#include <filesystem>
 #include <functional>
 #include <span>
+#include <vector>
 
 namespace pellar {
 
-/// Gets the archives of these packages into the directory, as their file names say.
-using FetchArchives = std::function<void(std::span<const DpkgPackage> packages,
-                                         const std::filesystem::path& directory)>;
+/// Gets the archives of these packages: a descriptor for each, at its beginning, or none.
+using FetchArchives =
+    std::function<std::vector<FileDescriptor>(std::span<const DpkgPackage> packages)>;
+
+/// Where archives' words come from besides the system that is looked at. Both are only for the
+/// running system itself.
+struct DpkgSources {
+    KeptReferences* kept = nullptr;  ///< borrowed; may be none
+    FetchArchives fetch;             ///< empty where nobody has asked for that
+};
 
 /// What the packages of a Debian system say about their files. dpkg's database names the files
 /// and no more (dpkg(1), --verify), so the rest comes from the archives in the system's own
-/// var/cache/apt/archives and from what the store has kept; packages with neither are counted.
-/// Reading the archives takes about a second for 1,500 files. `fetch` gets the missing ones, a few
-/// at a time, which go again once they have been read; empty where nobody has asked for that. None
-/// when it was stopped.
-[[nodiscard]] std::optional<References> readDpkgReferences(const RootDirectory& root,
+/// var/cache/apt/archives and from what was kept of such archives before; packages with neither
+/// are counted. An archive must have the digest that the system's own apt knows it by, where that
+/// knows the version. Reading the archives takes about a second for 1,500 files; missing ones are
+/// fetched a few at a time. None when `progress` asked for an end.
+[[nodiscard]] std::optional<References> readDpkgReferences(const RootFiles& root,
                                                            const Accounts& accounts,
-                                                           ReferenceStore& store,
-                                                           const FetchArchives& fetch,
+                                                           const DpkgSources& sources,
                                                            const ReadingProgress& progress);
 
 }  // namespace pellar

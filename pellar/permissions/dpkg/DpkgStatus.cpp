@@ -10,10 +10,11 @@ namespace pellar {
 namespace {
 
 // Debian Policy 5.6.1, 5.6.12: letters, digits and . + - ~ :, none of which leaves a directory as
-// long as the text does not begin with a point.
-bool isAllowed(std::string_view text)
+// long as the text does not begin with a point, nor is an option where it begins with none.
+bool isAllowedField(std::string_view text)
 {
-    return !text.empty() && text.front() != '.' &&
+    constexpr std::size_t longest = 255;
+    return !text.empty() && text.size() <= longest && text.front() != '.' && text.front() != '-' &&
            std::all_of(text.begin(), text.end(), [](char c) {
                return (c >= '0' && c <= '9') || (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
                       std::string_view(".+-~:_").find(c) != std::string_view::npos;
@@ -32,6 +33,11 @@ void takeStatus(std::string_view value, DpkgPackage& package, bool& isThere)
 
 }  // namespace
 
+bool DpkgPackage::isAllowed() const
+{
+    return isAllowedField(name) && isAllowedField(version) && isAllowedField(architecture);
+}
+
 std::string DpkgPackage::fileName() const
 {
     std::string escaped;
@@ -47,8 +53,7 @@ std::vector<DpkgPackage> parseDpkgStatus(std::string_view text)
     bool isThere = false;
     const auto endParagraph = [&] {
         const DpkgPackage ended = std::exchange(package, {});
-        if (std::exchange(isThere, false) && isAllowed(ended.name) && isAllowed(ended.version) &&
-            isAllowed(ended.architecture))
+        if (std::exchange(isThere, false) && ended.isAllowed())
             packages.push_back(ended);
     };
     forEachLine(text, [&](std::string_view line) {

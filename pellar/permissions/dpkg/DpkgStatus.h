@@ -17,6 +17,8 @@ struct DpkgPackage {
 
     /// As apt names its archive, "ntfs-3g_1%3a2022.10.3-1_amd64.deb", without ".deb".
     std::string fileName() const;
+    /// Its three words are such as Debian allows.
+    bool isAllowed() const;
 
     friend bool operator==(const DpkgPackage&, const DpkgPackage&) = default;
 };

@@ -1,15 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/dpkg/ReferenceStore.h"
 
-#include "pellar/process/FileDescriptor.h"
+#include "pellar/permissions/Digest.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdio>
-#include <fstream>
-#include <iterator>
+#include <cstdlib>
+#include <vector>
 
 namespace pellar {
 namespace {
@@ -19,6 +19,11 @@ bool isOwn(const std::filesystem::path& path)
     struct stat status = {};
     return ::lstat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode) &&
            status.st_uid == ::geteuid() && (status.st_mode & (S_IWGRP | S_IWOTH)) == 0;
+}
+
+bool isDigest(std::string_view text)
+{
+    return kindOfDigest(text) == DigestKind::SHA256;
 }
 
 bool writeAll(int file, std::string_view bytes)
@@ -42,39 +47,50 @@ ReferenceStore::ReferenceStore(std::filesystem::path directory) : directory_(std
     std::filesystem::create_directories(directory_.parent_path(), error);
     ::mkdir(directory_.c_str(), 0700);
     isTrusted_ = isOwn(directory_);
+    if (isTrusted_)
+        removeOthers();
 }
 
-std::filesystem::path ReferenceStore::pathOf(const std::string& name) const
+// References without a digest were kept by earlier versions, of whatever system was looked at.
+void ReferenceStore::removeOthers() const
 {
-    return directory_ / (name + ".mtree");
+    std::error_code error;
+    std::vector<std::filesystem::path> others;
+    for (const auto& entry : std::filesystem::directory_iterator(directory_, error)) {
+        const std::string name = entry.path().filename();
+        const std::string stem = name.substr(0, name.find('.'));
+        const bool isOurs = name.ends_with(".mtree") || name.ends_with(".deb") ||
+                            name.find(".mtree.") != std::string::npos;
+        if (isOurs && (!isDigest(stem) || name != stem + ".mtree"))
+            others.push_back(entry.path());
+    }
+    for (const std::filesystem::path& path : others)
+        ::unlink(path.c_str());
 }
 
-std::optional<std::vector<PackagedFile>> ReferenceStore::find(const std::string& name) const
+std::filesystem::path ReferenceStore::pathOf(const std::string& digest) const
 {
-    if (!isTrusted_)
-        return std::nullopt;
-    std::ifstream file(pathOf(name), std::ios::binary);
-    if (!file)
-        return std::nullopt;
-    return readMtree(std::string(std::istreambuf_iterator<char>(file), {}));
+    return directory_ / (digest + ".mtree");
 }
 
-bool ReferenceStore::has(const std::string& name) const
+FileDescriptor ReferenceStore::open(const std::string& digest) const
 {
-    return isTrusted_ && ::access(pathOf(name).c_str(), R_OK) == 0;
+    if (!isTrusted_ || !isDigest(digest))
+        return {};
+    return FileDescriptor(
+        ::open(pathOf(digest).c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
 }
 
 // Whole or not at all: half a reference would leave files without one, unseen.
-void ReferenceStore::keep(const std::string& name, const std::vector<PackagedFile>& files)
+void ReferenceStore::keep(const std::string& digest, std::string_view mtree)
 {
-    const auto text = isTrusted_ ? writeMtree(files) : std::nullopt;
-    if (!text)
+    if (!isTrusted_ || !isDigest(digest))
         return;
-    std::string temporary = pathOf(name).native() + ".XXXXXX";
+    std::string temporary = pathOf(digest).native() + ".XXXXXX";
     const FileDescriptor file(::mkostemp(temporary.data(), O_CLOEXEC));
     if (!file)
         return;
-    if (!writeAll(file.get(), *text) || ::rename(temporary.c_str(), pathOf(name).c_str()) != 0)
+    if (!writeAll(file.get(), mtree) || ::rename(temporary.c_str(), pathOf(digest).c_str()) != 0)
         ::unlink(temporary.c_str());
 }
 

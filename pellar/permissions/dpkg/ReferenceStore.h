@@ -1,40 +1,42 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/permissions/PackagedFile.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <filesystem>
-#include <optional>
 #include <string>
-#include <vector>
+#include <string_view>
 
 namespace pellar {
 
-/// What archives have said about their packages' files, kept for when the archives are gone: a
-/// mtree(5) for each package and version, in one directory. What lies there decides about the
-/// rights to a system's files, so it is only read when nobody but this user (or root) can write
-/// to it.
-class ReferenceStore {
+/// What archives have said about their packages' files, kept for when the archives are gone. Each
+/// is named by the SHA-256 digest of the archive it was read from, so nothing but that archive
+/// can have said it.
+class KeptReferences {
 public:
-    /// An empty path keeps nothing. The directory is made when it is first needed.
+    virtual ~KeptReferences() = default;
+
+    /// A mtree(5) for reading; none when nothing is kept of such an archive.
+    [[nodiscard]] virtual FileDescriptor open(const std::string& digest) const = 0;
+    /// Not being able to keep it loses time at the next run, nothing else.
+    virtual void keep(const std::string& digest, std::string_view mtree) = 0;
+};
+
+/// They lie in one directory. What lies there decides about the rights to a system's files, so it
+/// is only read when nobody but this user (or root) can write to it, and is only used for the
+/// running system itself: what another one brings goes into no store.
+class ReferenceStore final : public KeptReferences {
+public:
+    /// An empty path keeps nothing. The directory is made when it is first needed; what lies in
+    /// it under other names than digests is taken away.
     explicit ReferenceStore(std::filesystem::path directory);
 
-    /// `name` is a DpkgPackage's file name.
-    [[nodiscard]] std::optional<std::vector<PackagedFile>> find(const std::string& name) const;
-    /// Not being able to keep it loses time at the next run, nothing else.
-    void keep(const std::string& name, const std::vector<PackagedFile>& files);
-
-    [[nodiscard]] bool has(const std::string& name) const;
-
-    /// Where it keeps them, and where archives go that are fetched to be read; empty where the
-    /// store is of no use.
-    [[nodiscard]] std::filesystem::path directory() const
-    {
-        return isTrusted_ ? directory_ : std::filesystem::path();
-    }
+    [[nodiscard]] FileDescriptor open(const std::string& digest) const override;
+    void keep(const std::string& digest, std::string_view mtree) override;
 
 private:
-    std::filesystem::path pathOf(const std::string& name) const;
+    std::filesystem::path pathOf(const std::string& digest) const;
+    void removeOthers() const;
 
     std::filesystem::path directory_;
     bool isTrusted_ = false;

@@ -13,7 +13,7 @@ namespace pellar {
 namespace {
 
 const std::string localDirectory = "var/lib/pacman/local";
-constexpr std::size_t largestFile = 64U << 20U;
+constexpr std::size_t largestFile = 32U << 20U;
 
 /// ".PKGINFO", ".BUILDINFO", ".INSTALL", ".CHANGELOG": the archive's own, never unpacked.
 bool isOfArchive(const std::string& path)
@@ -24,7 +24,7 @@ bool isOfArchive(const std::string& path)
 /// One reading of a pacman database.
 class PacmanReading {
 public:
-    explicit PacmanReading(const RootDirectory& root)
+    explicit PacmanReading(const RootFiles& root)
         : root_(root), temporaryFiles_(temporaryFileRulesOf(root))
     {
     }
@@ -33,7 +33,7 @@ public:
     {
         const std::vector<std::string> names = root_.names(localDirectory);
         for (const std::string& name : names)
-            foreign_.addForeign(scriptsOf(name));
+            foreign_.addForeign(scriptsOf(name).value_or(ScriptMentions()));
         double done = 0;
         for (const std::string& name : names) {
             if (!progress(100 * done++ / static_cast<double>(names.size())))
@@ -50,26 +50,37 @@ private:
         return root_.read(localDirectory + '/' + package + '/' + file, largestFile).value_or("");
     }
 
-    ScriptMentions scriptsOf(const std::string& package) const
+    /// None where there is one that cannot be read: it may concern any file.
+    std::optional<ScriptMentions> scriptsOf(const std::string& package) const
     {
         ScriptMentions mentions;
-        mentions.add(text(package, "install"), root_.aliases());
+        const FileDescriptor file = root_.openFile(localDirectory + '/' + package + "/install");
+        const auto script = file ? contentsOf(file.get(), largestFile) : std::string();
+        if (!script)
+            return std::nullopt;
+        mentions.add(*script, root_.aliases());
         return mentions;
     }
 
     void add(const std::string& package)
     {
-        const auto said = readMtree(text(package, "mtree"));
-        const bool hasSource = said && !said->empty();
+        const FileDescriptor mtree = root_.openFile(localDirectory + '/' + package + "/mtree");
+        const auto scripts = scriptsOf(package);
+        const PackagedFiles said = !scripts ? PackageFault::BeyondBounds
+                                   : mtree  ? readMtree(mtree.get())
+                                            : PackageFault::Malformed;
+        const auto* const files = std::get_if<std::vector<PackagedFile>>(&said);
+        const bool hasSource = files && !files->empty();
         collector_.countPackage(hasSource);
         if (!hasSource) {
+            if (!files && std::get<PackageFault>(said) == PackageFault::BeyondBounds)
+                collector_.countBeyondBounds();
             addWithoutSource(text(package, "files"));
             return;
         }
-        const ScriptMentions scripts = scriptsOf(package);
-        for (const PackagedFile& file : *said)
+        for (const PackagedFile& file : *files)
             if (!isOfArchive(file.path))
-                collector_.add(referenceFor(file, scripts));
+                collector_.add(referenceFor(file, *scripts));
     }
 
     // %FILES% stands before the paths, and another heading behind them.
@@ -93,6 +104,7 @@ private:
         reference.mode = file.mode;
         reference.user = file.user.number;
         reference.group = file.group.number;
+        reference.digest = file.digest;
         if (scripts.mayConcernOwn(reference.path, file.kind) ||
             foreign_.mayConcernForeign(reference.path))
             reference.doubt = Doubt::Script;
@@ -101,7 +113,7 @@ private:
         return reference;
     }
 
-    const RootDirectory& root_;
+    const RootFiles& root_;
     TemporaryFileRules temporaryFiles_;
     ScriptMentions foreign_;
     ReferenceCollector collector_;
@@ -109,7 +121,7 @@ private:
 
 }  // namespace
 
-std::optional<References> readPacmanReferences(const RootDirectory& root,
+std::optional<References> readPacmanReferences(const RootFiles& root,
                                                const ReadingProgress& progress)
 {
     return PacmanReading(root).read(progress);

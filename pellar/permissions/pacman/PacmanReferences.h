@@ -2,13 +2,13 @@
 #pragma once
 
 #include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
+#include "pellar/permissions/RootFiles.h"
 
 namespace pellar {
 
 /// What the packages of a pacman system say about their files: var/lib/pacman/local has a
 /// mtree(5) for each. None when it was stopped.
-[[nodiscard]] std::optional<References> readPacmanReferences(const RootDirectory& root,
+[[nodiscard]] std::optional<References> readPacmanReferences(const RootFiles& root,
                                                              const ReadingProgress& progress);
 
 }  // namespace pellar

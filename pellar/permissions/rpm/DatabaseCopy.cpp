@@ -1,28 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/rpm/DatabaseCopy.h"
 
-#include <fcntl.h>
-#include <sys/sendfile.h>
-#include <sys/stat.h>
-#include <unistd.h>
+#include "pellar/process/ReducedRights.h"
 
-#include <cstdlib>
-#include <utility>
+#include <fcntl.h>
+#include <unistd.h>
 
 namespace pellar {
 namespace {
 
-bool copy(const FileDescriptor& from, const std::filesystem::path& path)
-{
-    const FileDescriptor to(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
-    if (!from || !to)
-        return false;
-    constexpr std::size_t portion = 16U << 20U;
-    ssize_t count = 0;
-    while ((count = ::sendfile(to.get(), from.get(), nullptr, portion)) > 0) {
-    }
-    return count == 0;
-}
+// The largest known have 400 million bytes.
+constexpr CopyBounds boundsOfDatabase{2ULL << 30U, 8ULL << 30U};
 
 // SQLite makes its shared memory anew, and a lock is of no use in a copy.
 bool isCopied(const std::string& name)
@@ -30,31 +18,41 @@ bool isCopied(const std::string& name)
     return !name.starts_with('.') && !name.ends_with("-shm") && !name.starts_with("__db.");
 }
 
-}  // namespace
-
-std::optional<DatabaseCopy> DatabaseCopy::make(const RootDirectory& root,
-                                               const std::string& database)
+Sentence sentenceFor(Copying copying)
 {
-    std::error_code error;
-    std::string name = std::filesystem::temp_directory_path(error).native() + "/rpmdb.XXXXXX";
-    if (error || ::mkdtemp(name.data()) == nullptr)
-        return std::nullopt;
-    DatabaseCopy made{std::filesystem::path(name)};
-    for (const std::string& file : root.names(database)) {
-        const FileDescriptor from = root.openFile(database + '/' + file);
-        if (from && isCopied(file) && !copy(from, made.path_ / file))
-            return std::nullopt;
+    switch (copying) {
+        case Copying::Stopped: return {};
+        case Copying::BeyondBounds:
+            return {"the package database is larger than any system's is; it was not read", {}, {}};
+        case Copying::Failed:
+        case Copying::Done: break;
     }
-    return made;
+    return {"the package database cannot be copied to be read", {}, {}};
 }
 
-DatabaseCopy::DatabaseCopy(DatabaseCopy&& other) noexcept : path_(std::exchange(other.path_, {})) {}
+}  // namespace
 
-DatabaseCopy::~DatabaseCopy()
+std::variant<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
+                                                        const std::string& database,
+                                                        const StopSwitch& stop)
 {
-    std::error_code error;
-    if (!path_.empty())
-        std::filesystem::remove_all(path_, error);
+    auto made = TemporaryDirectory::make("rpmdb");
+    if (!made)
+        return sentenceFor(Copying::Failed);
+    CopyBounds bounds = boundsOfDatabase;
+    for (const std::string& file : root.names(database)) {
+        const FileDescriptor from = root.openFile(database + '/' + file);
+        if (!from || !isCopied(file))
+            continue;
+        const FileDescriptor to(
+            ::open((made->path() / file).c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
+        const Copying copying = to ? copyFile(from.get(), to.get(), bounds, stop) : Copying::Failed;
+        if (copying != Copying::Done)
+            return sentenceFor(copying);
+    }
+    if (::geteuid() == 0 && !made->giveTo(userOfReduced, groupOfReduced))
+        return sentenceFor(Copying::Failed);
+    return *std::move(made);
 }
 
 }  // namespace pellar

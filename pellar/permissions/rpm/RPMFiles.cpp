@@ -2,6 +2,7 @@
 #include "pellar/permissions/rpm/RPMFiles.h"
 
 #include "pellar/permissions/Capabilities.h"
+#include "pellar/permissions/Digest.h"
 #include "pellar/permissions/Lines.h"
 
 #include <charconv>
@@ -37,7 +38,7 @@ bool setOwners(Reference& reference, const std::string& user, const std::string&
 
 }  // namespace
 
-// 100755\t0\t4294967295\t0\troot\troot\tcap_net_raw=ep\t/usr/bin/ping
+// 100755\t0\t4294967295\t0\troot\troot\tcap_net_raw=ep\t9b1f…\t/usr/bin/ping
 RPMFile parseRPMFile(std::string_view line, const Accounts& accounts, const PathAliases& aliases)
 {
     const auto mode = numberIn<std::uint32_t>(takeField(line, '\t'), 8);
@@ -47,6 +48,7 @@ RPMFile parseRPMFile(std::string_view line, const Accounts& accounts, const Path
     const std::string user(takeField(line, '\t'));
     const std::string group(takeField(line, '\t'));
     const std::string capabilities(takeField(line, '\t'));
+    const std::string digest(takeField(line, '\t'));
     if (!mode || !state || !verified || !flags || !line.starts_with('/'))
         return {};
     if (*state != 0)  // RPMFILE_STATE_NORMAL
@@ -59,6 +61,8 @@ RPMFile parseRPMFile(std::string_view line, const Accounts& accounts, const Path
     reference.mode = *mode & 07777U;
     reference.capabilities =
         canonicalCapabilities(capabilities == "(none)" ? std::string() : capabilities);
+    if (kindOfDigest(digest))
+        reference.digest = digest;
     if (!setOwners(reference, user, group, accounts))
         reference.doubt = Doubt::UnknownAccount;
     else if ((*verified & verifiesAll) != verifiesAll || (*flags & isGhost) != 0)

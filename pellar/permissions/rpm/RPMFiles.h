@@ -15,7 +15,7 @@ namespace pellar {
 /// hold anything but a line end.
 inline constexpr std::string_view rpmFileFormat =
     "[%{FILEMODES:octal}\t%{FILESTATES}\t%{FILEVERIFYFLAGS}\t%{FILEFLAGS}\t%{FILEUSERNAME}\t"
-    "%{FILEGROUPNAME}\t%{FILECAPS}\t%{FILENAMES}\n]";
+    "%{FILEGROUPNAME}\t%{FILECAPS}\t%{FILEDIGESTS}\t%{FILENAMES}\n]";
 
 enum class RPMLine { File, NotInstalled, Malformed };
 

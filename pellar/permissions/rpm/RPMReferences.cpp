@@ -18,7 +18,9 @@ Command commandFor(const RPMQuery& query)
 {
     return {query.program,
             {"--dbpath", query.database.native(), "--nosignature", "--nodigest", "-qa",
-             "--queryformat", std::string(packageLine) + "%{NAME}\n" + std::string(rpmFileFormat)}};
+             "--queryformat", std::string(packageLine) + "%{NAME}\n" + std::string(rpmFileFormat)},
+            true,
+            query.database};
 }
 
 /// Takes rpm's answer as it comes.
@@ -36,7 +38,8 @@ public:
             return;
         }
         RPMFile file = isCut ? RPMFile() : parseRPMFile(line, accounts_, aliases_);
-        if (file.line == RPMLine::Malformed)
+        constexpr std::uint64_t mostMalformed = 1'000'000;
+        if (file.line == RPMLine::Malformed && malformed_ < mostMalformed)
             ++malformed_;
         if (file.line != RPMLine::File)
             return;

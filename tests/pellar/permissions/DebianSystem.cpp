@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/permissions/DebianSystem.h"
 
+#include "pellar/permissions/Digest.h"
 #include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>
@@ -101,19 +102,37 @@ void DebianSystem::install(const std::string& name, const std::vector<PackageFil
                                 "Maintainer: Nobody <nobody@example.org>\nDescription: test\n";
     writeFile(tree / "DEBIAN/control", control);
     std::string list = "/.\n";
+    std::string sums;
     for (const PackageFile& file : files) {
         make(tree, file);
         list += '/' + nameOf(file) + '\n';
+        Digester digester(DigestKind::MD5);
+        digester.add("contents\n");
+        sums += digester.finish() + "  " + nameOf(file) + '\n';
     }
     ASSERT_EQ(runProgram("dpkg-deb", {"-b", tree, archiveOf(name)}), 0);
     // dpkg unpacks "bin/x" behind the link; dpkg-deb would put a directory in its place.
     for (const PackageFile& file : files)
         make(path(), file);
     write("var/lib/dpkg/info/" + name + ".list", list);
+    write("var/lib/dpkg/info/" + name + ".md5sums", sums);
     if (!afterInstallation.empty())
         write("var/lib/dpkg/info/" + name + ".postinst", afterInstallation);
     status_ += control + "Status: install ok installed\n\n";
     write("var/lib/dpkg/status", status_);
+}
+
+void DebianSystem::writeIndex() const
+{
+    std::string index;
+    for (const auto& entry : fs::directory_iterator(path("var/cache/apt/archives"))) {
+        const std::string name = entry.path().filename();
+        const FileDescriptor archive(::open(entry.path().c_str(), O_RDONLY | O_CLOEXEC));
+        index += "Package: " + name.substr(0, name.find('_')) +
+                 "\nArchitecture: all\nVersion: 1:2.0-1\nDescription: x\nSHA256: " +
+                 digestOfFile(archive.get(), DigestKind::SHA256, 1U << 20U).value_or("") + "\n\n";
+    }
+    write("var/lib/apt/lists/example_main_Packages", index);
 }
 
 fixwell::DiskReferencePointer DebianSystem::disk() const

@@ -40,6 +40,8 @@ public:
 
     void install(const std::string& name, const std::vector<PackageFile>& files,
                  std::string_view afterInstallation = {});
+    /// Writes what its apt knows: the digests of the archives that are there now.
+    void writeIndex() const;
     void write(std::string_view path, std::string_view bytes) const;
     std::filesystem::path path(std::string_view name = {}) const;
     std::filesystem::path archiveOf(const std::string& name) const;

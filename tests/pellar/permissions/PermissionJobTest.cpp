@@ -4,16 +4,18 @@
 
 #include "pellar/ErrorCodes.h"
 #include "pellar/permissions/InstalledSystem.h"
-#include "pellar/permissions/PackagedFile.h"
+#include "pellar/permissions/RootDirectory.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/permissions/DebianSystem.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <fstream>
 
 namespace {
 
@@ -74,38 +76,93 @@ protected:
         static_cast<void>(::chown(path("var/lib/games/list").c_str(), 0, 0));
     }
 
+    /// As the running system is read.
+    References readAsOwn(const DpkgSources& sources) const
+    {
+        const auto root = RootDirectory::open(path("").native());
+        const auto read = root ? readDpkgReferences(*root, accountsOf(*root), sources,
+                                                    [](double) { return true; })
+                               : std::nullopt;
+        EXPECT_TRUE(read);
+        return read.value_or(References());
+    }
+
     std::unique_ptr<DebianSystem> system_;
 };
 
-TEST_F(PermissionJob, MissingArchivesAreFetchedAFewAtATimeAndGoAgain)
+TEST_F(PermissionJob, MissingArchivesAreFetchedAFewAtATimeAndWhatTheySayIsKept)
 {
     system_->install("second", {{"usr/share/second", 0600}});
     system_->install("lost", {{"usr/share/lost", 0600}, {"usr/share/lost2", 0600}});
+    system_->writeIndex();
     const fs::path mirror = path("mirror");
     fs::create_directory(mirror);
     for (const char* const name : {"games", "second", "lost"})
         fs::rename(system_->archiveOf(name), mirror / system_->archiveOf(name).filename());
     std::vector<std::size_t> asked;
-    const FetchArchives fetch = [&](std::span<const DpkgPackage> packages,
-                                    const fs::path& directory) {
-        asked.push_back(packages.size());
-        for (const DpkgPackage& package : packages)
-            if (const std::string name = package.fileName() + ".deb"; package.name != "lost")
-                fs::copy_file(mirror / name, directory / name);
-    };
-    const auto root = RootDirectory::open(path("").native());
-    ASSERT_TRUE(root);
+    ReferenceStore store(system_->store());
+    const DpkgSources sources{
+        &store, [&](std::span<const DpkgPackage> packages) {
+            asked.push_back(packages.size());
+            std::vector<FileDescriptor> archives;
+            for (const DpkgPackage& package : packages)
+                archives.emplace_back(package.name == "lost"
+                                          ? -1
+                                          : ::open((mirror / (package.fileName() + ".deb")).c_str(),
+                                                   O_RDONLY | O_CLOEXEC));
+            return archives;
+        }};
     for (const std::vector<std::size_t>& expected : {std::vector<std::size_t>{3}, {1}}) {
         asked.clear();
-        ReferenceStore store(system_->store());
-        const auto read =
-            readDpkgReferences(*root, accountsOf(*root), store, fetch, [](double) { return true; });
-        ASSERT_TRUE(read);
+        const References read = readAsOwn(sources);
         EXPECT_EQ(asked, expected) << "what is known is not fetched twice";
-        EXPECT_EQ(read->filesWithoutSource.size(), 2U) << "what could not be had is said";
+        EXPECT_EQ(read.filesWithoutSource.size(), 2U) << "what could not be had is said";
     }
-    for (const std::string& name : namesIn(system_->store()))
-        EXPECT_TRUE(name.ends_with(".mtree")) << name;
+    EXPECT_EQ(namesIn(system_->store()).size(), 2U);
+}
+
+// What decides is the archive's digest, by which the looked-at system's own apt names it.
+TEST_F(PermissionJob, WhatIsKeptIsBoundToTheArchiveAndToTheRunningSystem)
+{
+    constexpr std::size_t all = 9;
+    const auto withoutSource = [&] {
+        ReferenceStore store(system_->store());
+        return readAsOwn({&store, {}}).filesWithoutSource.size();
+    };
+    fs::create_directory(system_->store());
+    fs::permissions(system_->store(), fs::perms::owner_all);
+    const fs::path old = system_->store() / "games_1%3a2.0-1_all.mtree";
+    std::ofstream(old) << "#mtree\n./bin/play mode=6777 type=file uid=0 gid=0\n";
+    EXPECT_EQ(withoutSource(), 0U) << "apt does not know this version: its archive is taken";
+    EXPECT_EQ(namesIn(system_->store()).size(), 0U) << "not kept, and the old name is gone";
+    system_->writeIndex();
+    EXPECT_EQ(withoutSource(), 0U);
+    EXPECT_EQ(namesIn(system_->store()).size(), 1U);
+    const fs::path archive = system_->archiveOf("games");
+    fs::rename(archive, path("aside"));
+    EXPECT_EQ(withoutSource(), 0U) << "kept";
+    PermissionBench foreign(*system_);
+    EXPECT_EQ(foreign.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(foreign.listener.error, kPLErrorNoReferences) << "not for a system that is mounted";
+    fs::permissions(system_->store(), fs::perms::all);
+    EXPECT_EQ(withoutSource(), all) << "others could write to the store";
+    fs::permissions(system_->store(), fs::perms::owner_all);
+    system_->write("var/lib/apt/lists/example_main_Packages", "");
+    EXPECT_EQ(withoutSource(), all) << "nobody names the archive any more";
+
+    DebianSystem forged;
+    forged.install("games", {{"bin/play", 06777}});
+    fs::copy_file(forged.archiveOf("games"), archive);
+    forged.writeIndex();
+    PermissionBench second(*system_);
+    EXPECT_EQ(second.verifyPermissions(forged.disk()), 0);
+    EXPECT_EQ(second.listener.verdict, "sound") << "it is as its own packages say";
+    EXPECT_EQ(namesIn(system_->store()).size(), 1U) << "and nothing of that is kept";
+    fs::copy_file(path("aside"), archive, fs::copy_options::overwrite_existing);
+    system_->writeIndex();
+    fs::copy_file(forged.archiveOf("games"), archive, fs::copy_options::overwrite_existing);
+    fs::remove_all(system_->store());
+    EXPECT_EQ(withoutSource(), all) << "an archive that apt knows by another digest";
 }
 
 TEST_F(PermissionJob, AHealthySystemIsSound)
@@ -245,28 +302,55 @@ TEST_F(PermissionJob, AnotherNameOfSomebodyElsesFileIsLeftAlone)
 
 TEST_F(PermissionJob, WhatNobodyKnowsIsNotPassedAsRight)
 {
-    PermissionBench first(*system_);
-    EXPECT_EQ(first.verifyPermissions(system_->disk()), 0);
     fs::remove(system_->archiveOf("games"));
-    PermissionBench second(*system_);
-    EXPECT_EQ(second.verifyPermissions(system_->disk()), 0);
-    EXPECT_EQ(second.listener.verdict, "sound") << "kept from the first time";
-    PermissionBench third(system_->path("no-store"));
-    EXPECT_EQ(third.verifyPermissions(system_->disk()), 0);
-    EXPECT_EQ(third.listener.verdict, "inconclusive");
-    EXPECT_EQ(third.listener.error, kPLErrorNoReferences);
-    EXPECT_TRUE(contains(third.remarks(), "9 files were not compared")) << third.remarks();
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
+    EXPECT_EQ(bench.listener.verdict, "inconclusive");
+    EXPECT_EQ(bench.listener.error, kPLErrorNoReferences);
+    EXPECT_TRUE(contains(bench.remarks(), "9 files were not compared")) << bench.remarks();
 }
 
-TEST_F(PermissionJob, AStoreThatOthersCanWriteToIsNotBelieved)
+// Whoever could write to the file would have his program run with the rights of others.
+TEST_F(PermissionJob, RightsAreOnlyLentToWhatThePackageBrought)
 {
-    PermissionBench first(*system_);
-    EXPECT_EQ(first.verifyPermissions(system_->disk()), 0);
-    fs::remove(system_->archiveOf("games"));
-    ::chmod(system_->store().c_str(), 0777);
-    PermissionBench second(*system_);
-    EXPECT_EQ(second.verifyPermissions(system_->disk()), 0);
-    EXPECT_EQ(second.listener.verdict, "inconclusive");
+    system_->install("login", {{"bin/su", 04755}, {"bin/helper", 0755}});
+    system_->write("var/lib/dpkg/statoverride", "root root 4755 /bin/helper\n");
+    struct Case {
+        const char* path;
+        const char* contents;
+        Rights before;
+        Rights after;
+        std::string_view because;
+    };
+    constexpr uid_t player = 4242;
+    for (const Case& c :
+         {Case{"usr/bin/su", "another's\n", {04755, player, 0}, {04755, player, 0}, "another's"},
+          Case{"usr/bin/su", "another's\n", {0755, 0, 0}, {0755, 0, 0}, "the mode alone"},
+          Case{"usr/bin/su", "contents\n", {0755, player, 0}, {04755, 0, 0}, "the package's"},
+          Case{"usr/bin/helper", "another's\n", {0755, 0, 0}, {0755, 0, 0}, "by an override"},
+          Case{"usr/bin/helper", "contents\n", {0755, 0, 0}, {04755, 0, 0}, "by an override"}}) {
+        for (const char* const name : {"usr/bin/su", "usr/bin/helper"}) {
+            system_->write(name, "contents\n");
+            ::chmod(path(name).c_str(), 04755);
+        }
+        system_->write(c.path, c.contents);
+        ASSERT_EQ(::chown(path(c.path).c_str(), c.before.user, c.before.group), 0);
+        ASSERT_EQ(::chmod(path(c.path).c_str(), c.before.mode), 0);
+        PermissionBench bench(*system_);
+        EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+        EXPECT_EQ(rightsOf(path(c.path)), c.after) << c.path << c.because;
+        const bool isForeign = c.after == c.before;
+        EXPECT_EQ(contains(bench.problems(), "its content is not the package's"), isForeign)
+            << bench.problems();
+        EXPECT_EQ(contains(bench.remarks(), "1 file may not lend the rights"), isForeign);
+        EXPECT_EQ(bench.listener.verdict, isForeign ? "damaged" : "repaired") << c.because;
+        ASSERT_EQ(::chown(path(c.path).c_str(), 0, 0), 0);
+    }
+    const FileDescriptor writer(::open(path("usr/bin/su").c_str(), O_RDWR | O_CLOEXEC));
+    ::chmod(path("usr/bin/su").c_str(), 0755);
+    PermissionBench bench(*system_);
+    EXPECT_EQ(bench.repairPermissions(system_->disk()), 0);
+    EXPECT_EQ(rightsOf(path("usr/bin/su")).mode, 0755U) << "somebody can still write to it";
 }
 
 TEST_F(PermissionJob, ADamagedArchiveIsNoSource)
@@ -326,7 +410,9 @@ TEST(PacmanJob, TheLocalDatabaseSaysAll)
     base.write(local + "tool-1-1/mtree",
                "#mtree\n/set type=file uid=0 gid=0 mode=644\n./.PKGINFO time=1.0 size=9\n"
                "./usr time=1.0 mode=755 type=dir\n./usr/bin time=1.0 mode=755 type=dir\n"
-               "./usr/bin/su\\040do time=1.0 mode=4755\n./usr/bin/tool time=1.0 mode=755 gid=60\n");
+               "./usr/bin/su\\040do time=1.0 mode=4755 sha256digest="
+               "2d711642b726b04401627ca9fbac32f5c8530fb1903cc4db02258717921a4881\n"
+               "./usr/bin/tool time=1.0 mode=755 gid=60\n");
     base.write("usr/bin/su do", "x");
     base.write("usr/bin/tool", "x");
     ::chmod(base.path("usr/bin/tool").c_str(), 0755);
@@ -361,15 +447,16 @@ TEST(RPMJob, TheDatabaseIsAskedWithCapabilities)
                                       work.path("one.spec")}),
         0);
     fs::create_directories(base.path("var/lib/rpm"));
-    std::vector<std::string> registering{"--dbpath", base.path("var/lib/rpm"), "-i", "--justdb",
-                                         "--nodeps",
-                                         work.path("top/RPMS/noarch/one-1-1.noarch.rpm")};
+    std::vector<std::string> registering{
+        "--dbpath", base.path("var/lib/rpm"),
+        "-i",       "--justdb",
+        "--nodeps", work.path("top/RPMS/noarch/one-1-1.noarch.rpm")};
     // Debian 12's rpm 4.18 installs only when it is forced to; Debian 13's knows no such option.
     if (test::runProgram("rpm", {"--force-debian", "--version"}) == 0)
         registering.emplace_back("--force-debian");
     ASSERT_EQ(test::runProgram("rpm", registering), 0);
     for (const char* const name : {"usr/bin/send", "usr/bin/su", "etc/loose", "etc/odd"})
-        base.write(name, "x");
+        base.write(name, "\n");
     ::chmod(base.path("etc/loose").c_str(), 0600);
     for (const char* const name : {".rpm.lock", "rpmdb.sqlite-shm"})
         fs::remove(base.path("var/lib/rpm") / name);

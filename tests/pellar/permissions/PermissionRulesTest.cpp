@@ -56,7 +56,7 @@ TEST(ModeText, IsThatOfLs)
 TEST(Comparison, SeesWhatAFileOfItsKindHas)
 {
     const Permissions file{FileKind::Regular, 0755, 1, 2, "cap_net_raw=ep"};
-    Reference should{"x", FileKind::Regular, 0755, 1, 2, "cap_net_raw=ep", Doubt::None};
+    Reference should{"x", FileKind::Regular, 0755, 1, 2, "cap_net_raw=ep", Doubt::None, {}};
     EXPECT_TRUE(compare(should, file).isNone());
     should.capabilities.reset();
     EXPECT_TRUE(compare(should, file).isNone()) << "the source does not tell capabilities";
@@ -97,6 +97,7 @@ TEST(ScriptMentions, DoubtWhatAScriptMaySet)
                   "etc/polkit-1/rules.d", directory, true, "a function"},
              Case{"dpkg-statoverride --add root g 710 \"/etc/ssl/private\"", "etc/ssl/private",
                   directory, true, "quoted"},
+             Case{"D=/var/lib/x\nchown u $D/y", "var/lib/x/yy", regular, false, "another's end"},
              Case{"setcap cap_net_raw+ep /bin/ping", "usr/bin/ping", regular, true, "capabilities"},
          }) {
         ScriptMentions mentions;
@@ -151,7 +152,7 @@ TEST(ArchiveAddress, IsOnlyTakenWithAHash)
 TEST(RPMFiles, ALineIsOneFileOrNone)
 {
     Accounts accounts{AccountNames("root:x:0:0\nmail:x:8:8\n"), AccountNames("root:x:0:\n")};
-    const std::string good = "104755\t0\t4294967295\t0\tmail\troot\t\t/bin/x\ty";
+    const std::string good = "104755\t0\t4294967295\t0\tmail\troot\t\t\t/bin/x\ty";
     const RPMFile file = parseRPMFile(good, accounts, merged());
     EXPECT_EQ(file.line, RPMLine::File);
     EXPECT_EQ(file.reference.path, "usr/bin/x\ty");
@@ -161,10 +162,10 @@ TEST(RPMFiles, ALineIsOneFileOrNone)
     const auto doubtOf = [&](std::string_view line) {
         return parseRPMFile(line, accounts, merged()).reference.doubt;
     };
-    EXPECT_EQ(doubtOf("100644\t0\t4294967295\t0\tnobody\troot\t\t/a"), Doubt::UnknownAccount);
-    EXPECT_EQ(doubtOf("100644\t0\t4294967207\t0\troot\troot\t\t/a"), Doubt::NotVerified);
-    EXPECT_EQ(doubtOf("100644\t0\t4294967295\t64\troot\troot\t\t/a"), Doubt::NotVerified);
-    EXPECT_EQ(parseRPMFile("100644\t2\t0\t0\troot\troot\t\t/a", accounts, {}).line,
+    EXPECT_EQ(doubtOf("100644\t0\t4294967295\t0\tnobody\troot\t\t\t/a"), Doubt::UnknownAccount);
+    EXPECT_EQ(doubtOf("100644\t0\t4294967207\t0\troot\troot\t\t\t/a"), Doubt::NotVerified);
+    EXPECT_EQ(doubtOf("100644\t0\t4294967295\t64\troot\troot\t\t\t/a"), Doubt::NotVerified);
+    EXPECT_EQ(parseRPMFile("100644\t2\t0\t0\troot\troot\t\t\t/a", accounts, {}).line,
               RPMLine::NotInstalled);
     for (std::size_t length = 0; length < good.find('/'); ++length)
         EXPECT_EQ(parseRPMFile(good.substr(0, length), accounts, {}).line, RPMLine::Malformed)
@@ -173,22 +174,18 @@ TEST(RPMFiles, ALineIsOneFileOrNone)
 
 TEST(Mtree, GivesBackWhatWasWritten)
 {
+    const std::string digest(64, 'a');
     const std::vector<PackagedFile> files{
-        {"usr", FileKind::Directory, 0755, {"root", 0}, {"root", 0}},
-        {"usr/a b\\#=\xC3\xBC", FileKind::Regular, 04755, {"", 4242}, {"mail", 8}},
-        {"usr/link", FileKind::SymbolicLink, 0777, {"root", 0}, {"root", 0}}};
-    const auto text = writeMtree(files);
-    ASSERT_TRUE(text.has_value());
-    const auto read = readMtree(*text);
-    ASSERT_TRUE(read.has_value()) << *text;
-    ASSERT_EQ(read->size(), files.size());
-    for (std::size_t i = 0; i < files.size(); ++i) {
-        EXPECT_EQ((*read)[i].path, files[i].path);
-        EXPECT_EQ((*read)[i].mode, files[i].mode);
-        EXPECT_EQ((*read)[i].kind, files[i].kind);
-        EXPECT_EQ((*read)[i].user.number, files[i].user.number);
-        EXPECT_EQ((*read)[i].group.name, files[i].group.name);
-    }
+        {"usr", FileKind::Directory, 0755, {"root", 0}, {"root", 0}, {}},
+        {"usr/a b\\#=\xC3\xBC", FileKind::Regular, 04755, {"", 4242}, {"mail", 8}, digest},
+        {"usr/link", FileKind::SymbolicLink, 0777, {"root", 0}, {"root", 0}, {}}};
+    const std::string text = writeMtree(files);
+    const PackagedFiles read = parseMtree(text);
+    ASSERT_TRUE(std::holds_alternative<std::vector<PackagedFile>>(read)) << text;
+    EXPECT_EQ(std::get<std::vector<PackagedFile>>(read), files) << text;
+    for (const char* const line : {"./x mode=9\n", "./x uid=\n", "/etc/x mode=1\n", "x\n",
+                                   "./x sha256digest=../../x\n", "\x89PNG\n"})
+        EXPECT_FALSE(std::holds_alternative<std::vector<PackagedFile>>(parseMtree(line))) << line;
 }
 
 }  // namespace
