@@ -24,7 +24,7 @@ constexpr std::array phases{
     PhaseSign{"checking quota groups", "Checking quotas"},
 };
 
-// btrfs-progs 6.2, check/. What stands in a line's beginning.
+// btrfs-progs 6.2 and 6.14, check/. What stands in a line's beginning.
 constexpr std::array signs{
     DamageSign{"checksum verify failed", Damage::Structure},
     DamageSign{"parent transid verify failed", Damage::Structure},

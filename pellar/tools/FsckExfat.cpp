@@ -14,7 +14,7 @@ namespace {
 
 constexpr std::string_view name = "fsck.exfat";
 
-// exfatprogs 1.2.0, fsck.c, repair.c and libexfat.c.
+// exfatprogs 1.2.0 and 1.2.9, fsck.c, repair.c and libexfat.c.
 constexpr std::array signs{
     DamageSign{"boot region", Damage::Structure},
     DamageSign{"boot sector", Damage::Structure},

@@ -12,7 +12,7 @@ namespace {
 
 constexpr std::string_view name = "fsck.f2fs";
 
-// f2fs-tools 1.15, fsck/fsck.c and fsck/mount.c.
+// f2fs-tools 1.15 and 1.16, fsck/fsck.c and fsck/mount.c.
 constexpr std::array signs{
     DamageSign{"a valid F2FS superblock", Damage::Structure},
     DamageSign{"Magic Mismatch", Damage::Structure},

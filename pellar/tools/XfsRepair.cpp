@@ -22,8 +22,8 @@ constexpr std::array phases{
     PhaseSign{"Phase 7 - ", "Checking link counts"},
 };
 
-// Lines that tell of no damage (xfsprogs 6.1, repair/). Everything else does: xfs_repair has many
-// hundreds of messages, and few for a sound volume.
+// Lines that tell of no damage (xfsprogs 6.1 and 6.13, repair/). Everything else does: xfs_repair
+// has many hundreds of messages, and few for a sound volume.
 constexpr std::array<std::string_view, 27> harmless{
     "        - ",
     "Cannot get host filesystem geometry",

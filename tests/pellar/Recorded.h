@@ -11,7 +11,8 @@
 
 namespace pellar::test {
 
-/// What e2fsck 1.47.0 really printed, standard output and standard error as they came.
+/// What e2fsck 1.47.0 really printed, standard output and standard error as they came; 1.47.2
+/// prints the same.
 inline std::vector<std::string> recordedLines(std::string_view name)
 {
     std::ifstream file(std::filesystem::path(PELLAR_RECORDED_DIRECTORY) /

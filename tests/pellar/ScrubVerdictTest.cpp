@@ -42,6 +42,14 @@ TEST(ScrubVerdict, OfWhatBtrfsScrubReallyPrinted)
                   "the worse of the two is told"},
              Case{"superblock", Exited{0}, Verdict::Damaged, "", "0, and no warning at all"},
              Case{"missing-disk", Exited{0}, Verdict::Inconclusive, "another disk", "0"},
+             Case{"debian13-sound", Exited{0}, Verdict::Sound, "", "it says that it starts"},
+             Case{"debian13-two-disks", Exited{0}, Verdict::Sound, "", "for each disk"},
+             Case{"debian13-file", Exited{3}, Verdict::Damaged, "without any good copy",
+                  "it counts the errors in its sentence"},
+             Case{"debian13-one-copy", Exited{0}, Verdict::Damaged, "another, good copy",
+                  "\"1 corrected\", but nothing was corrected"},
+             Case{"debian13-missing-disk", Exited{0}, Verdict::Inconclusive, "another disk",
+                  "it says that it starts on the missing one"},
              Case{"other", Exited{1}, Verdict::Failed, "another program is", "says so"},
              Case{"other-unrecorded", Exited{1}, Verdict::Failed, "another program is",
                   "only the kernel knows of the other"},
@@ -53,7 +61,7 @@ TEST(ScrubVerdict, OfWhatBtrfsScrubReallyPrinted)
          }) {
         const Judgement judgement =
             judge(test::recordedLines("btrfs-scrub/" + std::string(c.recording)), c.ending,
-                  StopCause::None, c.recording == std::string_view("two-disks") ? 2 : 1);
+                  StopCause::None, std::string_view(c.recording).ends_with("two-disks") ? 2 : 1);
         EXPECT_EQ(judgement.verdict, c.verdict) << c.recording << ": " << c.because;
         EXPECT_NE(judgement.reason.key.find(c.says), std::string_view::npos)
             << c.recording << ": " << judgement.reason.key;
