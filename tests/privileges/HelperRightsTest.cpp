@@ -85,7 +85,7 @@ TEST(AskingProgram, OneThatHadOtherRightsIsNotTrusted)
                           const bool isReady = ::read(ready[0], &byte, 1) == 1;
                           ::_exit(isReady && AskingProgram::of(somebody) ? 0 : 1);
                       }
-                      static_cast<void>(::setresuid(c.real, c.effective, c.saved));
+                      static_cast<void>(!::setresuid(c.real, c.effective, c.saved));
                       ::prctl(PR_SET_DUMPABLE, c.isDumpable ? 1 : 0);
                       static_cast<void>(!::write(ready[1], "x", 1));
                       int status = -1;

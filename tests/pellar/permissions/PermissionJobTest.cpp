@@ -72,8 +72,8 @@ protected:
         ::chmod(path("usr/bin/play").c_str(), 04777);
         ::chmod(path("usr/bin/score").c_str(), 0755);
         ::chmod(path("usr/share/games").c_str(), 0777);
-        static_cast<void>(::lchown(path("usr/share/games/link").c_str(), 4242, 0));
-        static_cast<void>(::chown(path("var/lib/games/list").c_str(), 0, 0));
+        static_cast<void>(!::lchown(path("usr/share/games/link").c_str(), 4242, 0));
+        static_cast<void>(!::chown(path("var/lib/games/list").c_str(), 0, 0));
     }
 
     /// As the running system is read.
