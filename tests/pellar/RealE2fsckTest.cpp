@@ -150,7 +150,8 @@ TEST(RealE2fsck, SaysWhatARepairHasCost)
                "no damage is left",
                "a wrong count loses nothing"}}) {
         const test::Workshop workshop;
-        const auto image = makeVolume(workshop, {"-b", "1024"});
+        // From e2fsprogs 1.47.1 on a new volume has one inode more, of the orphan file.
+        const auto image = makeVolume(workshop, {"-b", "1024", "-O", "^orphan_file"});
         for (const std::string& command : loss.commands)
             workshop.damage(image, command);
         if (loss.overwritten > 0) {
