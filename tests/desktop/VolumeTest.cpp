@@ -40,7 +40,8 @@ protected:
                          directory_ / "data"};
         session_ = std::make_unique<DesktopSession>(std::move(options));
         session_->show();
-        ASSERT_TRUE(waitUntil([&] { return cell(device_->name(), DiskColumn::Name) == "volume"; }));
+        ASSERT_TRUE(waitUntil(
+            [&] { return cell(device_->name(), DiskColumn::Name).starts_with("volume ("); }));
         select(device_->name());
     }
 
