@@ -60,6 +60,8 @@ protected:
         return mountPlacesOf(status.st_rdev, {});
     }
     fixwell::DiskReferencePointer disk() const { return test::reference(device_->name()); }
+    /// A program that verifies the disk is killed while it is unmounted.
+    void expectMountedAgainAfterKill() const;
 
     test::Workshop workshop_;
     std::unique_ptr<orvane::test::LoopDevice> device_;
@@ -132,6 +134,16 @@ private:
     for (int tries = 0; tries < 1000 && !condition(); ++tries)
         ::usleep(10'000);
     return condition();
+}
+
+void MountedDisk::expectMountedAgainAfterKill() const
+{
+    ManagerOptions options;
+    options.toolPath = workshop_.fakeTools("wait");
+    OtherProgram verification(options, disk(), false);
+    EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
+    verification.kill();
+    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
 }
 
 TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
@@ -245,12 +257,7 @@ TEST_F(MountedDisk, IsMountedAgainWhereItLiesOnItself)
     EXPECT_EQ(bench.verify(disk()), 0);
     EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
     EXPECT_EQ(mounts(), before_);
-    ManagerOptions options;
-    options.toolPath = workshop_.fakeTools("wait");
-    OtherProgram verification(options, disk(), false);
-    EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
-    verification.kill();
-    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
+    expectMountedAgainAfterKill();
 }
 
 // By its path, one would unmount the other disk.
@@ -275,12 +282,7 @@ TEST_F(MountedDisk, IsMountedAgainOverWhatLiesBelowWhenTheProgramIsKilled)
     ASSERT_EQ(::mount("tmpfs", covered.c_str(), "tmpfs", 0, nullptr), 0);
     ASSERT_EQ(::mount(device_->name().c_str(), covered.c_str(), "ext4", 0, nullptr), 0);
     before_ = mounts();
-    ManagerOptions options;
-    options.toolPath = workshop_.fakeTools("wait");
-    OtherProgram verification(options, disk(), false);
-    EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
-    verification.kill();
-    EXPECT_TRUE(comesTrue([this] { return mounts() == before_; }));
+    expectMountedAgainAfterKill();
     for (const MountPlace& place : mounts())
         ::umount2(place.target.c_str(), MNT_DETACH);
     ::umount(covered.c_str());
