@@ -9,9 +9,9 @@
 namespace orvane::bench {
 namespace {
 
-class EndlessJob final : public fixwell::PLRepairDisk {
-    using Reference = fixwell::DiskReferencePointer;
-    using Code = fixwell::ErrorCode;
+class EndlessJob final : public contract::PLRepairDisk {
+    using Reference = contract::DiskReferencePointer;
+    using Code = contract::ErrorCode;
 
     Code beginStoragesystemFilesystemVerifyForDisk(const Reference&) override { return 0; }
     Code beginStoragesystemFilesystemRepairForDisk(const Reference&) override { return 0; }
@@ -43,7 +43,7 @@ DiskTree sampleDisk()
     tree.facts.type = diskType::bareVolume;
     tree.facts.filesystem = "ext4";
     tree.facts.path = "/somewhere/on/this/machine/sample.img";
-    tree.facts.storage = fixwell::DiskReference::Storage::FileRegion;
+    tree.facts.storage = contract::DiskReference::Storage::FileRegion;
     tree.facts.length = 1U << 30U;
     return tree;
 }
@@ -59,7 +59,7 @@ BenchHost::BenchHost(const std::filesystem::path& state)
               "FXW"),
       host_(optionsIn(state), loop_, interface_, alerts_, reporter_, false),
       disk_(Disk::make(sampleDisk(), {optionsIn(state).capabilities, &host_.histories()})),
-      module_(std::make_unique<fixwell::OVFXW>(host_, *this))
+      module_(std::make_unique<contract::OVFXW>(host_, *this))
 {
     host_.sharedDiskController().adopt(disk_);
     reference_ = disk_->theKRDisk();
@@ -75,7 +75,7 @@ BenchHost::~BenchHost()
 void BenchHost::selectDisk()
 {
     window_.select({disk_});
-    module_->windowChangedNotication({fixwell::OVDiskChangedNotification, nullptr, {}});
+    module_->windowChangedNotication({contract::OVDiskChangedNotification, nullptr, {}});
 }
 
 void BenchHost::showDetails(bool shows)
@@ -84,7 +84,7 @@ void BenchHost::showDetails(bool shows)
         module_->showDetailsAction(nullptr);
 }
 
-std::unique_ptr<fixwell::PLRepairDisk> BenchHost::makeRepairDisk()
+std::unique_ptr<contract::PLRepairDisk> BenchHost::makeRepairDisk()
 {
     return std::make_unique<EndlessJob>();
 }

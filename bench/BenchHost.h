@@ -13,16 +13,16 @@ namespace orvane::bench {
 /// Says nothing: what is measured ends before a reporter would begin.
 class SilentReporter final : public Reporter {
     void started(const std::string&, std::string_view, const std::string&) override {}
-    void record(const std::string&, const fixwell::Dictionary&, const fixwell::StyledText&) override
+    void record(const std::string&, const contract::Dictionary&, const contract::StyledText&) override
     {
     }
     void rowsWritten() override {}
     void progress(const std::string&, std::optional<double>, const std::string&) override {}
-    void finished(const std::string&, std::string_view, fixwell::ErrorCode,
+    void finished(const std::string&, std::string_view, contract::ErrorCode,
                   std::string_view) override
     {
     }
-    void report(const std::string&, const fixwell::Dictionary&) override {}
+    void report(const std::string&, const contract::Dictionary&) override {}
     void alert(const std::string&, const std::string&) override {}
     void failure(const std::string&, const std::string&) override {}
     void warning(const std::string&) override {}
@@ -35,15 +35,15 @@ class SilentReporter final : public Reporter {
 
 /// The real host of the terminal program with the real module in it, and a library whose one job
 /// never ends: a benchmark says what the tool says.
-class BenchHost final : public fixwell::ModuleSite, public fixwell::PLManager {
+class BenchHost final : public contract::ModuleSite, public contract::PLManager {
 public:
     /// Logs and histories go below `state`.
     explicit BenchHost(const std::filesystem::path& state);
     ~BenchHost() override;
 
-    fixwell::OVFXW& module() { return *module_; }
-    fixwell::OutlineViewDelegate& rows() { return *module_; }
-    const fixwell::DiskReferencePointer& reference() const { return reference_; }
+    contract::OVFXW& module() { return *module_; }
+    contract::OutlineViewDelegate& rows() { return *module_; }
+    const contract::DiskReferencePointer& reference() const { return reference_; }
     Disk& disk() { return *disk_; }
     TerminalHost& host() { return host_; }
     void selectDisk();
@@ -51,13 +51,13 @@ public:
 
 private:
     bool isActiveTab() const override { return true; }
-    fixwell::OVWindowController& windowController() override { return window_; }
-    fixwell::OVDiskPointer workingDisk() const override { return nullptr; }
-    fixwell::Window& window() override { return window_; }
-    fixwell::Bundle& bundle() override { return bundle_; }
-    fixwell::PLManager& pl() override { return *this; }
-    void setDelegate(fixwell::PLAsyncDelegate*) override {}
-    std::unique_ptr<fixwell::PLRepairDisk> makeRepairDisk() override;
+    contract::OVWindowController& windowController() override { return window_; }
+    contract::OVDiskPointer workingDisk() const override { return nullptr; }
+    contract::Window& window() override { return window_; }
+    contract::Bundle& bundle() override { return bundle_; }
+    contract::PLManager& pl() override { return *this; }
+    void setDelegate(contract::PLAsyncDelegate*) override {}
+    std::unique_ptr<contract::PLRepairDisk> makeRepairDisk() override;
 
     SilentReporter reporter_;
     MainLoop loop_;
@@ -68,8 +68,8 @@ private:
     ModuleBundle bundle_;
     TerminalHost host_;
     std::shared_ptr<Disk> disk_;
-    fixwell::DiskReferencePointer reference_;
-    std::unique_ptr<fixwell::OVFXW> module_;
+    contract::DiskReferencePointer reference_;
+    std::unique_ptr<contract::OVFXW> module_;
 };
 
 }  // namespace orvane::bench

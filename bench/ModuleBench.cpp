@@ -6,7 +6,7 @@
 #include "bench/BenchHost.h"
 #include "bench/RealOutput.h"
 #include "bench/TimedProcess.h"
-#include "fixwell/host/pellar/ResultPhrases.h"
+#include "contract/pellar/ResultPhrases.h"
 #include "fixwell/messagelog/MessageRecord.h"
 
 #include <benchmark/benchmark.h>
@@ -76,7 +76,7 @@ void compareWithGrep()
     const std::vector<std::string_view> lines = linesOf(text);
     const auto phrases = scratch / "phrases.txt";
     std::ofstream stream(phrases);
-    for (const fixwell::ResultPhrase& phrase : fixwell::resultPhrases)
+    for (const contract::ResultPhrase& phrase : contract::resultPhrases)
         stream << phrase.key << '\n';
     stream.close();
 
@@ -85,7 +85,7 @@ void compareWithGrep()
         secondsOf({"grep", "-c", "-i", "-F", "-f", phrases.string(), outputFile.string()});
     });
     BenchHost host(scratch / "state");
-    fixwell::LineClassifier classifier(host.host().hostBundle());
+    contract::LineClassifier classifier(host.host().hostBundle());
     long found = 0;
     const double classify = bestSeconds(5, [&] {
         for (const std::string_view line : lines)
@@ -114,9 +114,9 @@ void compareWithGrep()
 }
 
 /// A history as a long check leaves it: one row in eight is shown without details.
-fixwell::Array makeHistory(std::size_t records)
+contract::Array makeHistory(std::size_t records)
 {
-    using namespace fixwell;
+    using namespace contract;
     const Array history = Array::make();
     for (std::size_t i = 0; i < records; ++i)
         history.append(Dictionary::of(

@@ -13,12 +13,12 @@
 
 namespace pellar {
 
-Manager::Manager(fixwell::RunLoop& loop, const Texts& texts, ManagerOptions options)
+Manager::Manager(contract::RunLoop& loop, const Texts& texts, ManagerOptions options)
     : loop_(loop), texts_(texts), options_(std::move(options))
 {
 }
 
-std::unique_ptr<fixwell::PLRepairDisk> Manager::makeRepairDisk()
+std::unique_ptr<contract::PLRepairDisk> Manager::makeRepairDisk()
 {
     if (delegate_ == nullptr)
         return nullptr;
@@ -55,7 +55,7 @@ std::string Manager::reasonAgainstLive(std::string_view filesystemType) const
                      : texts_.text("only an administrator may verify it while it is in use");
 }
 
-std::string Manager::reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const
+std::string Manager::reasonAgainstPartitionMap(const contract::DiskReference& disk) const
 {
     const PartitionMap map = glanceAtMap(disk);
     // What this user may not read is looked at when the job has the right to.

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/foundation/RunLoop.h"
+#include "contract/pellar/PLRepairDisk.h"
 #include "pellar/ManagerOptions.h"
-#include "pellar/Texts.h"
+#include "pellar/texts/Texts.h"
 #include "pellar/tools/Operation.h"
 
 #include <memory>
@@ -15,13 +15,13 @@ namespace pellar {
 
 /// The library as one module sees it. Main thread; outlives the tools made with it, as the run
 /// loop and the texts outlive the manager.
-class Manager final : public fixwell::PLManager {
+class Manager final : public contract::PLManager {
 public:
-    Manager(fixwell::RunLoop& loop, const Texts& texts, ManagerOptions options = {});
+    Manager(contract::RunLoop& loop, const Texts& texts, ManagerOptions options = {});
 
-    void setDelegate(fixwell::PLAsyncDelegate* delegate) override { delegate_ = delegate; }
+    void setDelegate(contract::PLAsyncDelegate* delegate) override { delegate_ = delegate; }
     /// Null when there is no delegate yet.
-    std::unique_ptr<fixwell::PLRepairDisk> makeRepairDisk() override;
+    std::unique_ptr<contract::PLRepairDisk> makeRepairDisk() override;
 
     /// There is an installed tool that can verify (repair) this kind of file system, by
     /// libblkid's name of it. Looks in a few directories.
@@ -37,13 +37,13 @@ public:
 
     /// Why the disk's partition map cannot be verified, in the user's language: it has none, or
     /// cannot be read; empty when it can. Reads a few sectors.
-    std::string reasonAgainstPartitionMap(const fixwell::DiskReference& disk) const;
+    std::string reasonAgainstPartitionMap(const contract::DiskReference& disk) const;
 
 private:
-    fixwell::RunLoop& loop_;
+    contract::RunLoop& loop_;
     const Texts& texts_;
     const ManagerOptions options_;
-    fixwell::PLAsyncDelegate* delegate_ = nullptr;  // not owned
+    contract::PLAsyncDelegate* delegate_ = nullptr;  // not owned
 };
 
 }  // namespace pellar

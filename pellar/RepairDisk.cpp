@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/RepairDisk.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/jobs/JobScript.h"
 #include "pellar/jobs/LiveScript.h"
 #include "pellar/jobs/MapScript.h"
@@ -22,8 +22,8 @@
 namespace pellar {
 namespace {
 
-using fixwell::DiskReferencePointer;
-using fixwell::ErrorCode;
+using contract::DiskReferencePointer;
+using contract::ErrorCode;
 
 bool isVolume(const DiskReferencePointer& disk)
 {
@@ -33,7 +33,7 @@ bool isVolume(const DiskReferencePointer& disk)
 /// Whether a device may be neither opened as the operation must, nor unmounted, by this user; and
 /// whether installed files are to be changed. Nobody is asked for a password merely to look at the
 /// files of a volume that is mounted: what this user may not see of it is counted and said.
-bool needsPrivileges(Subject subject, const fixwell::DiskReference& disk, Operation operation,
+bool needsPrivileges(Subject subject, const contract::DiskReference& disk, Operation operation,
                      const SystemPaths& paths)
 {
     struct stat status = {};
@@ -48,14 +48,14 @@ bool needsPrivileges(Subject subject, const fixwell::DiskReference& disk, Operat
 bool answer(bool value, ErrorCode* error)
 {
     if (error != nullptr)
-        *error = fixwell::kPLNoError;
+        *error = contract::kPLNoError;
     return value;
 }
 
 }  // namespace
 
-RepairDisk::RepairDisk(fixwell::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
-                       fixwell::PLAsyncDelegate& delegate)
+RepairDisk::RepairDisk(contract::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
+                       contract::PLAsyncDelegate& delegate)
     : loop_(loop), texts_(texts), options_(options), delegate_(delegate)
 {
 }
@@ -124,7 +124,7 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     if (const ErrorCode error = refusal(disk, operation))
         return error;
     if (beginPrivileged(Subject::Filesystem, disk, operation))
-        return fixwell::kPLNoError;
+        return contract::kPLNoError;
     const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     auto claim = DiskClaim::attempt(*disk, access, options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
@@ -134,7 +134,7 @@ ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operatio
     if (auto* const taken = std::get_if<DiskClaim>(&claim))
         request.claim.emplace(std::move(*taken));
     startVolume(std::move(request));
-    return fixwell::kPLNoError;
+    return contract::kPLNoError;
 }
 
 /// NO when the job needs nobody's help, or there is none.
@@ -157,7 +157,7 @@ bool RepairDisk::beginPrivileged(Subject subject, const DiskReferencePointer& di
 ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation operation,
                                    ErrorCode error)
 {
-    if (error != fixwell::kPLErrorCouldNotUnmount && error != fixwell::kPLErrorDiskInUse)
+    if (error != contract::kPLErrorCouldNotUnmount && error != contract::kPLErrorDiskInUse)
         return error;
     auto mounts = mountPlacesOf(disk->path, options_.systemPaths);
     const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
@@ -170,7 +170,7 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
         return error;
     else
         startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});
-    return fixwell::kPLNoError;
+    return contract::kPLNoError;
 }
 
 void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<MountPlace>& mounts)
@@ -205,59 +205,59 @@ bool RepairDisk::isPartThatOthersAttach(const JobRequest& request) const
 ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operation operation)
 {
     if (job_)
-        return fixwell::kPLErrorBusy;
+        return contract::kPLErrorBusy;
     if (!disk || disk->path.empty())
-        return fixwell::kPLErrorNoDiskReference;
+        return contract::kPLErrorNoDiskReference;
     if (!disk->isWhole)
-        return fixwell::kPLErrorUnsupported;
+        return contract::kPLErrorUnsupported;
     if (beginPrivileged(Subject::PartitionMap, disk, operation))
-        return fixwell::kPLNoError;
+        return contract::kPLNoError;
     start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
     });
-    return fixwell::kPLNoError;
+    return contract::kPLNoError;
 }
 
 // The volume stays mounted, and need not be claimed: its files are what is looked at.
 ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operation operation)
 {
     if (job_)
-        return fixwell::kPLErrorBusy;
+        return contract::kPLErrorBusy;
     if (!disk || disk->path.empty())
-        return fixwell::kPLErrorNoDiskReference;
+        return contract::kPLErrorNoDiskReference;
     if (disk->isWhole || disk->mountPoint.empty() ||
         installedSystemAt(disk->mountPoint) == PackageDatabase::None) {
         if (options_.commandTrace)
             options_.commandTrace(
                 texts_.text("the volume is not mounted as the root of a system with a package "
                             "database that is known here"));
-        return fixwell::kPLErrorUnsupported;
+        return contract::kPLErrorUnsupported;
     }
     if (beginPrivileged(Subject::Permissions, disk, operation))
-        return fixwell::kPLNoError;
+        return contract::kPLNoError;
     start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
     });
-    return fixwell::kPLNoError;
+    return contract::kPLNoError;
 }
 
 /// What can be said without touching the disk.
 ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operation) const
 {
     if (job_)
-        return fixwell::kPLErrorBusy;
+        return contract::kPLErrorBusy;
     if (!disk || disk->path.empty())
-        return fixwell::kPLErrorNoDiskReference;
+        return contract::kPLErrorNoDiskReference;
     if (disk->isWhole)
-        return fixwell::kPLErrorUnsupported;
+        return contract::kPLErrorUnsupported;
     if (disk->filesystem.empty())
-        return fixwell::kPLNoError;
+        return contract::kPLNoError;
     const Capability capability = capabilityFor(disk->filesystem, operation, options_.toolPath);
     if (options_.commandTrace)
         options_.commandTrace(
-            fixwell::printable(disk->filesystem) + ": " +
+            contract::printable(disk->filesystem) + ": " +
             (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
-    return fixwell::kPLNoError;  // the job itself says why there is no way
+    return contract::kPLNoError;  // the job itself says why there is no way
 }
 
 void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)

@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/foundation/RunLoop.h"
+#include "contract/pellar/PLRepairDisk.h"
 #include "pellar/ManagerOptions.h"
-#include "pellar/Texts.h"
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobScript.h"
+#include "pellar/texts/Texts.h"
 #include "pellar/tools/Operation.h"
 
 #include <memory>
@@ -15,55 +15,55 @@
 namespace pellar {
 
 /// The library's tool of one module. The references, and the delegate, outlive it.
-class RepairDisk final : public fixwell::PLRepairDisk {
+class RepairDisk final : public contract::PLRepairDisk {
 public:
-    RepairDisk(fixwell::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
-               fixwell::PLAsyncDelegate& delegate);
+    RepairDisk(contract::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
+               contract::PLAsyncDelegate& delegate);
 
-    fixwell::ErrorCode beginStoragesystemFilesystemVerifyForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
-    fixwell::ErrorCode beginStoragesystemFilesystemRepairForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
-    fixwell::ErrorCode beginPermissionsVerifyForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
-    fixwell::ErrorCode beginPermissionsRepairForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
-    fixwell::ErrorCode beginPartitionMapVerifyForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
-    fixwell::ErrorCode beginPartitionMapRepairForDisk(
-        const fixwell::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginStoragesystemFilesystemVerifyForDisk(
+        const contract::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginStoragesystemFilesystemRepairForDisk(
+        const contract::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginPermissionsVerifyForDisk(
+        const contract::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginPermissionsRepairForDisk(
+        const contract::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginPartitionMapVerifyForDisk(
+        const contract::DiskReferencePointer& disk) override;
+    contract::ErrorCode beginPartitionMapRepairForDisk(
+        const contract::DiskReferencePointer& disk) override;
 
-    bool canRepairPartitionMapForDisk(const fixwell::DiskReferencePointer& disk,
-                                      fixwell::ErrorCode* error) override;
-    bool canRepairStoragesystemFilesystemForDisk(const fixwell::DiskReferencePointer& disk,
-                                                 fixwell::ErrorCode* error) override;
-    bool canVerifyStoragesystemFilesystemForDisk(const fixwell::DiskReferencePointer& disk,
-                                                 fixwell::ErrorCode* error) override;
+    bool canRepairPartitionMapForDisk(const contract::DiskReferencePointer& disk,
+                                      contract::ErrorCode* error) override;
+    bool canRepairStoragesystemFilesystemForDisk(const contract::DiskReferencePointer& disk,
+                                                 contract::ErrorCode* error) override;
+    bool canVerifyStoragesystemFilesystemForDisk(const contract::DiskReferencePointer& disk,
+                                                 contract::ErrorCode* error) override;
 
     void cancelCurrentOperation() override;
 
 private:
-    fixwell::ErrorCode begin(const fixwell::DiskReferencePointer& disk, Operation operation);
-    fixwell::ErrorCode beginMounted(const fixwell::DiskReferencePointer& disk, Operation operation,
-                                    fixwell::ErrorCode error);
-    fixwell::ErrorCode beginPartitionMap(const fixwell::DiskReferencePointer& disk,
+    contract::ErrorCode begin(const contract::DiskReferencePointer& disk, Operation operation);
+    contract::ErrorCode beginMounted(const contract::DiskReferencePointer& disk, Operation operation,
+                                    contract::ErrorCode error);
+    contract::ErrorCode beginPartitionMap(const contract::DiskReferencePointer& disk,
                                          Operation operation);
-    fixwell::ErrorCode beginPermissions(const fixwell::DiskReferencePointer& disk,
+    contract::ErrorCode beginPermissions(const contract::DiskReferencePointer& disk,
                                         Operation operation);
-    fixwell::ErrorCode refusal(const fixwell::DiskReferencePointer& disk,
+    contract::ErrorCode refusal(const contract::DiskReferencePointer& disk,
                                Operation operation) const;
-    bool beginPrivileged(Subject subject, const fixwell::DiskReferencePointer& disk,
+    bool beginPrivileged(Subject subject, const contract::DiskReferencePointer& disk,
                          Operation operation);
     bool isPartThatOthersAttach(const JobRequest& request) const;
     void startVolume(JobRequest request);
-    void startLive(const fixwell::DiskReferencePointer& disk,
+    void startLive(const contract::DiskReferencePointer& disk,
                    const std::vector<MountPlace>& mounts);
-    void start(const fixwell::DiskReferencePointer& disk, const ScriptMaker& makeScript);
+    void start(const contract::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
-    fixwell::RunLoop& loop_;
+    contract::RunLoop& loop_;
     const Texts& texts_;
     const ManagerOptions& options_;
-    fixwell::PLAsyncDelegate& delegate_;
+    contract::PLAsyncDelegate& delegate_;
     std::unique_ptr<Job> job_;
 };
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/availability/ButtonDecision.h"
 
-#include "fixwell/host/support/OVDisk.h"
+#include "contract/support/OVDisk.h"
 #include "fixwell/jobs/ActionCodes.h"
 
 namespace fixwell {

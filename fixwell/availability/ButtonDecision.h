@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/Contract.h"
 #include "fixwell/availability/Reasons.h"
 
 #include <cstdint>

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "fixwell/Contract.h"
+
 #include <cstdint>
 
 namespace fixwell {

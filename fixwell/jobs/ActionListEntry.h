@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/support/OVDiskController.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/support/OVDiskController.h"
+#include "fixwell/Contract.h"
 #include "fixwell/jobs/ActionCodes.h"
 
 namespace fixwell {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/messagelog/ColorMarkers.h"
 
-#include "fixwell/host/pellar/ResultPhrases.h"
+#include "contract/pellar/ResultPhrases.h"
 
 namespace fixwell {
 

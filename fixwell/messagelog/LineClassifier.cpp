@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/messagelog/LineClassifier.h"
 
-#include "fixwell/host/pellar/ResultPhrases.h"
+#include "contract/pellar/ResultPhrases.h"
 
 #include <string>
 #include <vector>

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
-#include "fixwell/host/foundation/PhraseMatcher.h"
+#include "contract/foundation/Bundle.h"
+#include "contract/foundation/PhraseMatcher.h"
+#include "fixwell/Contract.h"
 
 #include <cstdint>
 #include <optional>

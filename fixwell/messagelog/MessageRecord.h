@@ -1,9 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/pellar/MessageKeys.h"
+#include "fixwell/Contract.h"
 
 #include <cstdint>
 

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/Dictionary.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/Dictionary.h"
+#include "fixwell/Contract.h"
 
 #include <cstddef>
 #include <cstdint>

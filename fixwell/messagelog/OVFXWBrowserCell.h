@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/BrowserCell.h"
+#include "contract/toolkit/BrowserCell.h"
+#include "fixwell/Contract.h"
 
 namespace fixwell {
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/messagelog/OVFXWMessageOutlineView.h"
 
-#include "fixwell/host/foundation/RichText.h"
+#include "contract/foundation/RichText.h"
 #include "fixwell/messagelog/MessageRecord.h"
 
 namespace fixwell {

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/OutlineView.h"
+#include "contract/toolkit/OutlineView.h"
+#include "fixwell/Contract.h"
 
 namespace fixwell {
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/messagelog/ParameterSubstitution.h"
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/Format.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/Format.h"
 
 namespace fixwell {
 namespace {

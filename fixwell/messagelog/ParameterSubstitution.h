@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
+#include "fixwell/Contract.h"
 
 #include <functional>
 #include <string>

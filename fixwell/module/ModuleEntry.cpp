@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/support/ModuleEntry.h"
+#include "contract/support/ModuleEntry.h"
 
 #include "fixwell/module/OVFXW.h"
 

@@ -1,10 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/foundation/Format.h"
+#include "contract/foundation/Lock.h"
+#include "contract/support/OVModule.h"
+#include "fixwell/Contract.h"
 #include "fixwell/availability/ButtonDecision.h"
-#include "fixwell/host/foundation/Format.h"
-#include "fixwell/host/foundation/Lock.h"
-#include "fixwell/host/support/OVModule.h"
 #include "fixwell/jobs/ActionCodes.h"
 #include "fixwell/messagelog/LineClassifier.h"
 #include "fixwell/messagelog/MessageRows.h"

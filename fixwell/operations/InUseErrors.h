@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "fixwell/host/support/OVDisk.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/support/OVDisk.h"
+#include "fixwell/Contract.h"
 #include "fixwell/jobs/ActionCodes.h"
 
 namespace fixwell {

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/pellar/PLRepairDisk.h"
+#include "fixwell/Contract.h"
 #include "fixwell/jobs/ActionCodes.h"
 
 #include <string_view>

@@ -22,7 +22,7 @@ public:
     void setWindow(QWidget* window);
 
     QtAlerts& alerts() override { return alerts_; }
-    fixwell::Events& events() override { return events_; }
+    contract::Events& events() override { return events_; }
     QtHelp& sharedHelpManager() override { return help_; }
     QtInterface& interfaceLoader() override { return interface_; }
     QtPasteboard& generalPasteboard() override { return pasteboard_; }

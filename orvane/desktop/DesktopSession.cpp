@@ -4,7 +4,7 @@
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/WindowState.h"
 #include "orvane/privileges/LibraryOptions.h"
-#include "pellar/ErrorTexts.h"
+#include "pellar/texts/ErrorTexts.h"
 
 #include <QFile>
 #include <QLabel>
@@ -16,12 +16,12 @@
 namespace orvane::desktop {
 namespace {
 
-constexpr std::array<fixwell::Name const*, 4> diskNotifications{
-    &fixwell::OVDiskAppearedNotification, &fixwell::OVDiskUnmountedNotification,
-    &fixwell::OVDiskChangedNotification, &fixwell::OVDiskEjectedNotification};
+constexpr std::array<contract::Name const*, 4> diskNotifications{
+    &contract::OVDiskAppearedNotification, &contract::OVDiskUnmountedNotification,
+    &contract::OVDiskChangedNotification, &contract::OVDiskEjectedNotification};
 
 // Of the report that a module gives when its job is over (fixwell/history/CompletionReport.h).
-const fixwell::Name reportResultKey{"kOVOP_ResultKey"};
+const contract::Name reportResultKey{"kOVOP_ResultKey"};
 constexpr std::string_view reportOfFailure = "kOVOP_FailKey";
 
 }  // namespace
@@ -72,7 +72,7 @@ DesktopSession::~DesktopSession()
     controller_.setEvents({});
     // The modules go before what they were given, their running job with them.
     tabs_.clear();
-    for (const fixwell::Name* const name : diskNotifications)
+    for (const contract::Name* const name : diskNotifications)
         host_.defaultCenter().removeObserver(this, *name);
     host_.histories().saveNew();
 }
@@ -86,7 +86,7 @@ SupportOptions DesktopSession::supportOptions()
         return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type),
                                       library_.canVerifyLive(type)};
     };
-    options.errorText = [this](fixwell::ErrorCode code) {
+    options.errorText = [this](contract::ErrorCode code) {
         return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.historyCompleted = [this] {
@@ -111,13 +111,13 @@ pellar::ManagerOptions DesktopSession::libraryOptions()
 
 void DesktopSession::observeDisks()
 {
-    for (const fixwell::Name* const name : diskNotifications)
-        host_.defaultCenter().addObserver(this, *name, [this](const fixwell::Notification&) {
+    for (const contract::Name* const name : diskNotifications)
+        host_.defaultCenter().addObserver(this, *name, [this](const contract::Notification&) {
             window_.disks().synchronize();
             refreshHints();
         });
     host_.sharedDiskController().hooks().notifyFrontmost =
-        [this](fixwell::Name, const fixwell::Notification& notification) {
+        [this](contract::Name, const contract::Notification& notification) {
             if (ModuleTab* const tab = activeTab())
                 tab->deliver(notification);
             window_.disks().synchronize();
@@ -148,7 +148,7 @@ void DesktopSession::connectWindow()
         return names;
     });
     controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
-                           [this](const fixwell::Dictionary& report) {
+                           [this](const contract::Dictionary& report) {
                                job_.hasFailed = report.string(reportResultKey) == reportOfFailure;
                            }});
     window_.disks().setContextMenuPolicy(Qt::CustomContextMenu);

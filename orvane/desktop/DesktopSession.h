@@ -95,11 +95,11 @@ private:
     void doToSelection(DiskAction action);
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
                             DiskAction action);
-    fixwell::OutlineView* log();
+    contract::OutlineView* log();
     void reloadLog();
     void completeLog();
     std::string selectionHTML();
-    bool canEdit(fixwell::Selector action);
+    bool canEdit(contract::Selector action);
     bool fetchesArchives();
     void switchArchiveFetching();
     void undoClearing();

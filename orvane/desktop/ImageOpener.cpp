@@ -122,7 +122,7 @@ std::string ImageOpener::noteOn(const Disk& disk) const
 
 bool ImageOpener::canEject(const Disk& disk)
 {
-    return disk.facts().storage == fixwell::DiskReference::Storage::FileRegion;
+    return disk.facts().storage == contract::DiskReference::Storage::FileRegion;
 }
 
 void ImageOpener::eject(const Disk& disk)

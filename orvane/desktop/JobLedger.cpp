@@ -3,7 +3,7 @@
 
 namespace orvane::desktop {
 
-void JobLedger::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation)
+void JobLedger::jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation)
 {
     runs_.begin(disk, operation);
     isJobRunning_ = true;
@@ -11,14 +11,14 @@ void JobLedger::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operatio
     events_.began(run_);
 }
 
-void JobLedger::jobDidNotBegin(const fixwell::DiskReferencePointer& /*disk*/,
-                               fixwell::ErrorCode error)
+void JobLedger::jobDidNotBegin(const contract::DiskReferencePointer& /*disk*/,
+                               contract::ErrorCode error)
 {
     end(runs_.refuse(error));
 }
 
-void JobLedger::jobWillFinish(const fixwell::DiskReferencePointer& /*disk*/,
-                              fixwell::ErrorCode error, const fixwell::Dictionary& result)
+void JobLedger::jobWillFinish(const contract::DiskReferencePointer& /*disk*/,
+                              contract::ErrorCode error, const contract::Dictionary& result)
 {
     end(runs_.finish(error, result));
 }

@@ -27,11 +27,11 @@ public:
     const StartedRun* currentRun() const { return isJobRunning_ ? &run_ : nullptr; }
     const RunKeeper& runs() const { return runs_; }
 
-    void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) override;
-    void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
-                        fixwell::ErrorCode error) override;
-    void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
-                       const fixwell::Dictionary& result) override;
+    void jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation) override;
+    void jobDidNotBegin(const contract::DiskReferencePointer& disk,
+                        contract::ErrorCode error) override;
+    void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
+                       const contract::Dictionary& result) override;
     void stopWasAsked() override { events_.stopAsked(); }
 
 private:

@@ -44,14 +44,14 @@ Outcome<> ModuleTab::makeModule()
     auto made = orvane::makeModule(loaded_, host_, *this);
     if (failed(made))
         return Failure{failureMessage(made)};
-    module_ = std::get<std::unique_ptr<fixwell::OVModule>>(std::move(made));
+    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
     if (LoadedInterface* const latest = host_.interfaceLoader().latest(); latest != before)
         interface_ = latest;
     observedLibrary_.setDelegate(module_->asyncDelegate());
     return Done{};
 }
 
-fixwell::OVDiskPointer ModuleTab::workingDisk() const
+contract::OVDiskPointer ModuleTab::workingDisk() const
 {
     const auto selected = window_.allSelectedItemsFilterDuplicates(false, true);
     return selected.empty() ? nullptr : selected.front();
@@ -59,10 +59,10 @@ fixwell::OVDiskPointer ModuleTab::workingDisk() const
 
 void ModuleTab::tellOfSelection()
 {
-    module_->windowChangedNotication({fixwell::OVDiskChangedNotification, nullptr, {}});
+    module_->windowChangedNotication({contract::OVDiskChangedNotification, nullptr, {}});
 }
 
-void ModuleTab::deliver(const fixwell::Notification& notification)
+void ModuleTab::deliver(const contract::Notification& notification)
 {
     module_->diskChangedHandler(&notification);
 }

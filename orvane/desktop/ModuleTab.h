@@ -14,7 +14,7 @@
 namespace orvane::desktop {
 
 /// One module and its place in the window. Main thread.
-class ModuleTab final : private fixwell::ModuleSite {
+class ModuleTab final : private contract::ModuleSite {
 public:
     /// All outlive the tab.
     struct Surroundings {
@@ -33,7 +33,7 @@ public:
     /// Ends the module, its running job with it.
     ~ModuleTab() override;
 
-    fixwell::OVModule& module() { return *module_; }
+    contract::OVModule& module() { return *module_; }
     /// None when the module has no interface file.
     LoadedInterface* interface() { return interface_; }
 
@@ -41,7 +41,7 @@ public:
     void setActive(bool isActive) { isActive_ = isActive; }
     void tellOfSelection();
     /// The host's word to the modules that are shown.
-    void deliver(const fixwell::Notification& notification);
+    void deliver(const contract::Notification& notification);
     /// Whether the tab is offered for what is selected.
     bool isOffered();
 
@@ -54,11 +54,11 @@ private:
     Outcome<> makeModule();
 
     bool isActiveTab() const override { return isActive_; }
-    fixwell::OVWindowController& windowController() override { return window_; }
-    fixwell::OVDiskPointer workingDisk() const override;
-    fixwell::Window& window() override { return window_; }
-    fixwell::Bundle& bundle() override { return *loaded_.bundle; }
-    fixwell::PLManager& pl() override { return observedLibrary_; }
+    contract::OVWindowController& windowController() override { return window_; }
+    contract::OVDiskPointer workingDisk() const override;
+    contract::Window& window() override { return window_; }
+    contract::Bundle& bundle() override { return *loaded_.bundle; }
+    contract::PLManager& pl() override { return observedLibrary_; }
 
     DesktopHost& host_;
     WindowController& window_;
@@ -66,7 +66,7 @@ private:
     LibraryTexts libraryTexts_;
     pellar::Manager library_;
     ObservedManager observedLibrary_;
-    std::unique_ptr<fixwell::OVModule> module_;
+    std::unique_ptr<contract::OVModule> module_;
     LoadedInterface* interface_ = nullptr;  ///< of the host's loader
     bool isActive_ = false;
 };

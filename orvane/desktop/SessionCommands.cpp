@@ -128,7 +128,7 @@ void DesktopSession::chooseImages(
     dialog->open();
 }
 
-fixwell::OutlineView* DesktopSession::log()
+contract::OutlineView* DesktopSession::log()
 {
     ModuleTab* const tab = activeTab();
     return tab != nullptr && tab->interface() != nullptr ? tab->interface()->outlineView()
@@ -154,7 +154,7 @@ std::string DesktopSession::selectionHTML()
                             : std::string();
 }
 
-bool DesktopSession::canEdit(fixwell::Selector action)
+bool DesktopSession::canEdit(contract::Selector action)
 {
     return log() != nullptr && log()->validateMenuItem({action});
 }

@@ -16,7 +16,7 @@ void DesktopSession::watchSystemDisks()
     if (!options_.scansSystemDisks)
         return;
     if (const auto watching = watch_.start(); failed(watching))
-        host_.log().ov_log(fixwell::OVLog::error, 0, failureMessage(watching));
+        host_.log().ov_log(contract::OVLog::error, 0, failureMessage(watching));
     scan_.start();
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // What a job means beyond its tab: for the list, the disks it works on, and the user's session.
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/DesktopEntry.h"
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/jobs/UnreachedImage.h"
@@ -35,7 +35,7 @@ void DesktopSession::runBegan(const StartedRun& run)
 {
     if (writes(run.operation))
         wakefulness_.hold(
-            host_.translator().sentence("Repairing “%@”", {fixwell::printable(run.disk)}));
+            host_.translator().sentence("Repairing “%@”", {contract::printable(run.disk)}));
     else
         wakefulness_.release();
     job_.reached.insert(run.identifier);

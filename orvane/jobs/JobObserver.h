@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/pellar/PLRepairDisk.h"
 
 #include <string_view>
 
@@ -26,15 +26,15 @@ public:
     virtual ~JobObserver() = default;
 
     /// Before the library is asked. The module has announced the job in the disk's history.
-    virtual void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) = 0;
+    virtual void jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation) = 0;
     /// The library refused; the job is over.
-    virtual void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
-                                fixwell::ErrorCode error) = 0;
+    virtual void jobDidNotBegin(const contract::DiskReferencePointer& disk,
+                                contract::ErrorCode error) = 0;
     /// The user has pressed Stop. There may be no job yet: images may still be attached for it.
     virtual void stopWasAsked() {}
     /// Before the module hears of it. `result` has the result keys.
-    virtual void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
-                               const fixwell::Dictionary& result) = 0;
+    virtual void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
+                               const contract::Dictionary& result) = 0;
 };
 
 }  // namespace orvane

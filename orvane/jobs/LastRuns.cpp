@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/LastRuns.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <algorithm>
 #include <utility>
@@ -14,9 +14,9 @@ bool hasAnswer(const Run& run)
     if (!run.end)
         return false;
     const std::string& verdict = run.end->verdict;
-    return verdict == fixwell::kPLVerdictSound.text() ||
-           verdict == fixwell::kPLVerdictDamaged.text() ||
-           verdict == fixwell::kPLVerdictRepaired.text();
+    return verdict == contract::kPLVerdictSound.text() ||
+           verdict == contract::kPLVerdictDamaged.text() ||
+           verdict == contract::kPLVerdictRepaired.text();
 }
 
 }  // namespace

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/support/texts/Catalogue.h"
-#include "pellar/Texts.h"
+#include "pellar/texts/Texts.h"
 
 #include <algorithm>
 #include <limits>

@@ -3,10 +3,10 @@
 
 namespace orvane {
 
-using fixwell::Dictionary;
-using fixwell::DiskReferencePointer;
-using fixwell::ErrorCode;
-using fixwell::PLRepairDisk;
+using contract::Dictionary;
+using contract::DiskReferencePointer;
+using contract::ErrorCode;
+using contract::PLRepairDisk;
 
 class ObservedManager::ObservedRepairDisk final : public PLRepairDisk {
 public:
@@ -77,7 +77,7 @@ private:
     {
         manager_.observer_.jobWillBegin(disk, operation);
         const ErrorCode error = (tool_.get()->*method)(disk);
-        if (error != fixwell::kPLNoError)
+        if (error != contract::kPLNoError)
             manager_.observer_.jobDidNotBegin(disk, error);
         return error;
     }
@@ -99,13 +99,13 @@ std::string_view nameOf(Operation operation)
     return {};
 }
 
-ObservedManager::ObservedManager(fixwell::PLManager& library, JobObserver& observer)
+ObservedManager::ObservedManager(contract::PLManager& library, JobObserver& observer)
     : library_(library), observer_(observer)
 {
     library_.setDelegate(this);
 }
 
-void ObservedManager::setDelegate(fixwell::PLAsyncDelegate* delegate)
+void ObservedManager::setDelegate(contract::PLAsyncDelegate* delegate)
 {
     module_ = delegate;
 }

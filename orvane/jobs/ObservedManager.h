@@ -9,13 +9,13 @@ namespace orvane {
 
 /// Stands between a module and the disk-management library, passes everything on unchanged, and
 /// tells an observer about the jobs. Main thread only.
-class ObservedManager final : public fixwell::PLManager, private fixwell::PLAsyncDelegate {
+class ObservedManager final : public contract::PLManager, private contract::PLAsyncDelegate {
 public:
     /// Both outlive this object.
-    ObservedManager(fixwell::PLManager& library, JobObserver& observer);
+    ObservedManager(contract::PLManager& library, JobObserver& observer);
 
-    void setDelegate(fixwell::PLAsyncDelegate* delegate) override;
-    std::unique_ptr<fixwell::PLRepairDisk> makeRepairDisk() override;
+    void setDelegate(contract::PLAsyncDelegate* delegate) override;
+    std::unique_ptr<contract::PLRepairDisk> makeRepairDisk() override;
 
     /// Presses the running job harder to end; nothing happens when none runs.
     void cancelAgain();
@@ -23,18 +23,18 @@ public:
 private:
     class ObservedRepairDisk;
 
-    void plAsyncStartedForDisk(const fixwell::DiskReferencePointer& disk) override;
-    void plAsyncMessageForDisk(const fixwell::DiskReferencePointer& disk, std::string_view string,
-                               const fixwell::Dictionary& dictionary) override;
-    void plAsyncProgressForDisk(const fixwell::DiskReferencePointer& disk, bool barberPole,
+    void plAsyncStartedForDisk(const contract::DiskReferencePointer& disk) override;
+    void plAsyncMessageForDisk(const contract::DiskReferencePointer& disk, std::string_view string,
+                               const contract::Dictionary& dictionary) override;
+    void plAsyncProgressForDisk(const contract::DiskReferencePointer& disk, bool barberPole,
                                 float percent) override;
-    void plAsyncFinishedForDisk(const fixwell::DiskReferencePointer& disk,
-                                fixwell::ErrorCode mainError, fixwell::ErrorCode detailError,
-                                const fixwell::Dictionary& dictionary) override;
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer& disk,
+                                contract::ErrorCode mainError, contract::ErrorCode detailError,
+                                const contract::Dictionary& dictionary) override;
 
-    fixwell::PLManager& library_;
+    contract::PLManager& library_;
     JobObserver& observer_;
-    fixwell::PLAsyncDelegate* module_ = nullptr;
+    contract::PLAsyncDelegate* module_ = nullptr;
     ObservedRepairDisk* latest_ = nullptr;  ///< not owned; forgets itself when it goes
 };
 

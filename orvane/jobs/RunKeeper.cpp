@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/RunKeeper.h"
 
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/volumes/DiskUse.h"
 
 #include <sys/stat.h>
@@ -11,12 +11,12 @@
 
 namespace orvane {
 
-void RunKeeper::begin(const fixwell::DiskReferencePointer& reference, Operation operation)
+void RunKeeper::begin(const contract::DiskReferencePointer& reference, Operation operation)
 {
     // What was said until now has its time before this run's.
     host_.histories().saveNew();
     const bool isOfImage =
-        reference && reference->storage == fixwell::DiskReference::Storage::FileRegion;
+        reference && reference->storage == contract::DiskReference::Storage::FileRegion;
     image_ = isOfImage ? reference->path : std::filesystem::path();
     const auto disk =
         std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
@@ -25,29 +25,29 @@ void RunKeeper::begin(const fixwell::DiskReferencePointer& reference, Operation 
                 : 0;
 }
 
-RunEnd RunKeeper::refuse(fixwell::ErrorCode error)
+RunEnd RunKeeper::refuse(contract::ErrorCode error)
 {
-    const RunEnd end{std::string(fixwell::kPLVerdictFailed.text()), error,
+    const RunEnd end{std::string(contract::kPLVerdictFailed.text()), error,
                      host_.OVLocalizedErrorString(error)};
     keep(end);
     return end;
 }
 
-RunEnd RunKeeper::finish(fixwell::ErrorCode error, const fixwell::Dictionary& result)
+RunEnd RunKeeper::finish(contract::ErrorCode error, const contract::Dictionary& result)
 {
-    RunEnd end{std::string(result.string(fixwell::kPLVerdict)), error,
-               std::string(result.string(fixwell::kPLMessage))};
+    RunEnd end{std::string(result.string(contract::kPLVerdict)), error,
+               std::string(result.string(contract::kPLMessage))};
     if (end.verdict.empty())
-        end.verdict = (error == 0 ? fixwell::kPLVerdictSound : fixwell::kPLVerdictFailed).text();
+        end.verdict = (error == 0 ? contract::kPLVerdictSound : contract::kPLVerdictFailed).text();
     keep(end);
     return end;
 }
 
-std::string RunKeeper::withDevice(fixwell::ErrorCode error, std::string text) const
+std::string RunKeeper::withDevice(contract::ErrorCode error, std::string text) const
 {
-    const bool isInUse = error == fixwell::kPLErrorDiskInUse ||
-                         error == fixwell::kOVErrorDiskInUse ||
-                         error == fixwell::kOVErrorCannotRepairInUse;
+    const bool isInUse = error == contract::kPLErrorDiskInUse ||
+                         error == contract::kOVErrorDiskInUse ||
+                         error == contract::kOVErrorCannotRepairInUse;
     struct stat status = {};
     if (!isInUse || image_.empty() || ::stat(image_.c_str(), &status) != 0)
         return text;

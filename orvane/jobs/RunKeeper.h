@@ -13,15 +13,15 @@ public:
     /// The host outlives this object.
     explicit RunKeeper(SupportHost& host) : host_(host) {}
 
-    void begin(const fixwell::DiskReferencePointer& disk, Operation operation);
+    void begin(const contract::DiskReferencePointer& disk, Operation operation);
     /// The run did not begin after all; answers its end.
-    RunEnd refuse(fixwell::ErrorCode error);
+    RunEnd refuse(contract::ErrorCode error);
     /// `result` has the result keys. Where it names no verdict, the error decides.
-    RunEnd finish(fixwell::ErrorCode error, const fixwell::Dictionary& result);
+    RunEnd finish(contract::ErrorCode error, const contract::Dictionary& result);
 
     /// The text of an error of the job at hand; where the disk is in use because its image is a
     /// device as well, that device is named.
-    std::string withDevice(fixwell::ErrorCode error, std::string text) const;
+    std::string withDevice(contract::ErrorCode error, std::string text) const;
 
 private:
     void keep(const RunEnd& end);

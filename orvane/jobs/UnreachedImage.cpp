@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/UnreachedImage.h"
 
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <chrono>
 
@@ -11,18 +11,18 @@ namespace orvane {
 namespace {
 
 // As the modules make the heading of an error (fixwell/messagelog).
-fixwell::Dictionary headingOfError(const std::string& sentence)
+contract::Dictionary headingOfError(const std::string& sentence)
 {
     constexpr int heading = -1;
     constexpr double points = 11;
-    const fixwell::Color red{1, 0, 0, 1};
-    return fixwell::Dictionary::of(
-        {{fixwell::kFsckMessageType, fixwell::kFsckFail},
-         {fixwell::kFsckMessageString, std::string_view(sentence)},
-         {fixwell::kFsckVerbosity, heading},
-         {fixwell::Name("kOV_finalAttributedString_type"),
-          fixwell::StyledText::make(sentence + "\n",
-                                    {fixwell::Font::boldSystem(points), red, {}})}});
+    const contract::Color red{1, 0, 0, 1};
+    return contract::Dictionary::of(
+        {{contract::kFsckMessageType, contract::kFsckFail},
+         {contract::kFsckMessageString, std::string_view(sentence)},
+         {contract::kFsckVerbosity, heading},
+         {contract::Name("kOV_finalAttributedString_type"),
+          contract::StyledText::make(sentence + "\n",
+                                    {contract::Font::boldSystem(points), red, {}})}});
 }
 
 }  // namespace
@@ -43,7 +43,7 @@ void keepUnreached(SupportHost& host, Disk& image, Operation operation, const st
     const std::int64_t run =
         store.beginRun(host.histories().keyOf(image.facts()), nameOf(operation), now);
     store.endRun(
-        run, {std::string(fixwell::kPLVerdictFailed.text()), fixwell::kPLErrorCannotOpen, sentence},
+        run, {std::string(contract::kPLVerdictFailed.text()), contract::kPLErrorCannotOpen, sentence},
         now);
     image.fsckHistoryNoChildren().append(headingOfError(sentence));
     host.histories().saveNew();

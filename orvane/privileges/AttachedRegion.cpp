@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/AttachedRegion.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -14,9 +14,9 @@ namespace {
 
 using pellar::Access;
 
-Undone undone(fixwell::ErrorCode error, pellar::Sentence reason)
+Undone undone(contract::ErrorCode error, pellar::Sentence reason)
 {
-    return {error, fixwell::kPLVerdictFailed, std::move(reason)};
+    return {error, contract::kPLVerdictFailed, std::move(reason)};
 }
 
 /// How the file is open; none when it can be neither read nor written through the descriptor.
@@ -32,7 +32,7 @@ std::optional<Access> accessOf(int file)
     }
 }
 
-bool isInside(const fixwell::DiskReference& region, int file)
+bool isInside(const contract::DiskReference& region, int file)
 {
     struct stat status = {};
     if (::fstat(file, &status) != 0 || !S_ISREG(status.st_mode))
@@ -50,23 +50,23 @@ std::variant<AttachedRegion, Undone> AttachedRegion::attach(const FileDescriptor
         request.operation == pellar::Operation::Repair ? Access::ReadWrite : Access::ReadOnly;
     const auto given = accessOf(image.get());
     if (!given || !isInside(request.disk, image.get()))
-        return undone(fixwell::kPLErrorCannotOpen,
+        return undone(contract::kPLErrorCannotOpen,
                       {"it is not a part of an image that you have opened", {}, {}});
     if (wanted == Access::ReadWrite && given == Access::ReadOnly)
-        return undone(fixwell::kPLErrorReadOnly, {"you may not write to the image", {}, {}});
+        return undone(contract::kPLErrorReadOnly, {"you may not write to the image", {}, {}});
     auto device =
         pellar::LoopDevice::attach(image.get(), request.disk.offset, request.disk.length, wanted);
     if (const int* const error = std::get_if<int>(&device))
         return undone(
-            fixwell::kPLErrorCannotOpen,
+            contract::kPLErrorCannotOpen,
             {"it could not be attached as a device: %1$@", ::strerrordesc_np(*error), {}});
     return AttachedRegion(std::get<pellar::LoopDevice>(std::move(device)));
 }
 
-fixwell::DiskReference AttachedRegion::disk(const HelperRequest& request) const
+contract::DiskReference AttachedRegion::disk(const HelperRequest& request) const
 {
-    fixwell::DiskReference disk = request.disk;
-    disk.storage = fixwell::DiskReference::Storage::BlockDevice;
+    contract::DiskReference disk = request.disk;
+    disk.storage = contract::DiskReference::Storage::BlockDevice;
     disk.path = device_.node();
     disk.offset = 0;
     return disk;

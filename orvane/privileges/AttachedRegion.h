@@ -19,7 +19,7 @@ public:
                                                                      const HelperRequest& request);
 
     /// The request's disk, on the device.
-    fixwell::DiskReference disk(const HelperRequest& request) const;
+    contract::DiskReference disk(const HelperRequest& request) const;
 
 private:
     explicit AttachedRegion(pellar::LoopDevice device) : device_(std::move(device)) {}

@@ -10,12 +10,12 @@ using nlohmann::json;
 
 json jsonFromText(const std::string& text)
 {
-    return jsonFromValue(fixwell::Value(std::string_view(text)));
+    return jsonFromValue(contract::Value(std::string_view(text)));
 }
 
-json jsonFromDictionary(const fixwell::Dictionary& dictionary)
+json jsonFromDictionary(const contract::Dictionary& dictionary)
 {
-    return dictionary ? jsonFromValue(fixwell::Value(dictionary)) : json();
+    return dictionary ? jsonFromValue(contract::Value(dictionary)) : json();
 }
 
 struct Writer {

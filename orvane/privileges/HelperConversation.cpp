@@ -26,20 +26,20 @@ bool write(const std::string& line)
 
 }  // namespace
 
-void Teller::plAsyncStartedForDisk(const fixwell::DiskReferencePointer&)
+void Teller::plAsyncStartedForDisk(const contract::DiskReferencePointer&)
 {
     tell(pellar::Started{});
 }
 
-void Teller::plAsyncMessageForDisk(const fixwell::DiskReferencePointer&, std::string_view string,
-                                   const fixwell::Dictionary& dictionary)
+void Teller::plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
+                                   const contract::Dictionary& dictionary)
 {
     tell(pellar::Message{std::string(string), dictionary});
 }
 
-void Teller::plAsyncFinishedForDisk(const fixwell::DiskReferencePointer&,
-                                    fixwell::ErrorCode mainError, fixwell::ErrorCode detailError,
-                                    const fixwell::Dictionary& result)
+void Teller::plAsyncFinishedForDisk(const contract::DiskReferencePointer&,
+                                    contract::ErrorCode mainError, contract::ErrorCode detailError,
+                                    const contract::Dictionary& result)
 {
     isOver_ = true;
     tell(pellar::Finished{mainError, detailError, result});

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/pellar/PLRepairDisk.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "pellar/jobs/Event.h"
 
@@ -10,15 +10,15 @@
 namespace orvane {
 
 /// Tells whoever asked what happens in the job: a line for each event on standard output.
-class Teller final : public fixwell::PLAsyncDelegate {
+class Teller final : public contract::PLAsyncDelegate {
 public:
-    void plAsyncStartedForDisk(const fixwell::DiskReferencePointer& disk) override;
-    void plAsyncMessageForDisk(const fixwell::DiskReferencePointer& disk, std::string_view string,
-                               const fixwell::Dictionary& dictionary) override;
-    void plAsyncProgressForDisk(const fixwell::DiskReferencePointer&, bool, float) override {}
-    void plAsyncFinishedForDisk(const fixwell::DiskReferencePointer& disk,
-                                fixwell::ErrorCode mainError, fixwell::ErrorCode detailError,
-                                const fixwell::Dictionary& result) override;
+    void plAsyncStartedForDisk(const contract::DiskReferencePointer& disk) override;
+    void plAsyncMessageForDisk(const contract::DiskReferencePointer& disk, std::string_view string,
+                               const contract::Dictionary& dictionary) override;
+    void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer& disk,
+                                contract::ErrorCode mainError, contract::ErrorCode detailError,
+                                const contract::Dictionary& result) override;
 
     void trace(std::string_view line);
     bool isOver() const { return isOver_; }

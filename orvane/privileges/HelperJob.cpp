@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/HelperJob.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/AskingProgram.h"
 #include "orvane/privileges/AttachedRegion.h"
 #include "orvane/privileges/HelperConversation.h"
@@ -20,8 +20,8 @@
 namespace orvane {
 namespace {
 
-using fixwell::DiskReference;
-using fixwell::ErrorCode;
+using contract::DiskReference;
+using contract::ErrorCode;
 using pellar::Subject;
 
 // Where sectors are kept that the repair of a partition map overwrites, and what archives have
@@ -34,8 +34,8 @@ std::variant<AttachedRegion, Undone> attachedRegion(const HelperRequest& request
 {
     const auto program = user ? AskingProgram::of(*user) : std::nullopt;
     if (!program)
-        return Undone{fixwell::kPLErrorCannotOpen,
-                      fixwell::kPLVerdictFailed,
+        return Undone{contract::kPLErrorCannotOpen,
+                      contract::kPLVerdictFailed,
                       {"the program that asked for it has gone, or is not yours", {}, {}}};
     return AttachedRegion::attach(program->take(request.image), request);
 }
@@ -75,13 +75,13 @@ private:
         device_ = FileDescriptor(
             ::open(disk_.path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_NOFOLLOW | O_CLOEXEC));
         if (!device_)
-            return Undone{fixwell::kPLErrorCannotOpen,
-                          fixwell::kPLVerdictFailed,
+            return Undone{contract::kPLErrorCannotOpen,
+                          contract::kPLVerdictFailed,
                           {"it cannot be opened: %1$@", ::strerrordesc_np(errno), {}}};
         if (!request_.identity.isStill(identityOf(device_)))
             return Undone{
-                fixwell::kPLErrorDiskChanged,
-                fixwell::kPLVerdictFailed,
+                contract::kPLErrorDiskChanged,
+                contract::kPLVerdictFailed,
                 {"the disk changed: another one has its name now; nothing was done", {}, {}}};
         return std::nullopt;
     }
@@ -90,7 +90,7 @@ private:
     {
         const auto place = mountedSystemOn(disk_.path);
         if (const auto* const reason = std::get_if<pellar::Sentence>(&place))
-            return Undone{fixwell::kPLErrorUnsupported, fixwell::kPLVerdictFailed, *reason};
+            return Undone{contract::kPLErrorUnsupported, contract::kPLVerdictFailed, *reason};
         disk_.mountPoint = std::get<std::string>(place);
         return std::nullopt;
     }
@@ -131,7 +131,7 @@ private:
         loop_.runUntil([this] { return teller_.isOver(); });
     }
 
-    ErrorCode begin(fixwell::PLRepairDisk& tool) const
+    ErrorCode begin(contract::PLRepairDisk& tool) const
     {
         const auto disk = std::make_shared<const DiskReference>(disk_);
         const bool isRepair = request_.operation == pellar::Operation::Repair;

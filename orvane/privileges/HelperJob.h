@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/privileges/HelperRequest.h"
-#include "pellar/Texts.h"
+#include "pellar/texts/Texts.h"
 
 #include <sys/types.h>
 

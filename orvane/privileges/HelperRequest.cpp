@@ -115,7 +115,7 @@ Read readRegion(Arguments arguments)
         return "no region of a file";
     HelperRequest request{task->subject, task->operation, {}, {}, static_cast<int>(*image), {},
                           false};
-    request.disk.storage = fixwell::DiskReference::Storage::FileRegion;
+    request.disk.storage = contract::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
     return withTexts(std::move(request), arguments.subspan(4));
@@ -160,7 +160,7 @@ HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& la
 
 std::vector<std::string> argumentsOf(const HelperRequest& request)
 {
-    const fixwell::DiskReference& disk = request.disk;
+    const contract::DiskReference& disk = request.disk;
     std::vector<std::string> arguments;
     if (request.isOnImage())
         arguments = {std::string(attaching) + std::string(taskOf(request)->word),

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "orvane/privileges/DiskIdentity.h"
 #include "pellar/jobs/PrivilegedJob.h"
 
@@ -17,7 +17,7 @@ struct HelperRequest {
     pellar::Subject subject = pellar::Subject::Filesystem;
     pellar::Operation operation = pellar::Operation::Verify;
     /// A block device; or, without a path, a region of an image file.
-    fixwell::DiskReference disk;
+    contract::DiskReference disk;
     DiskIdentity identity;  ///< of the block device
     int image = -1;         ///< the image's descriptor in the program that asks; -1 for a device
     std::string languages;  ///< for the texts; empty for English

@@ -5,7 +5,7 @@
 #include "orvane/support/Failure.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/ManagerOptions.h"
-#include "pellar/Texts.h"
+#include "pellar/texts/Texts.h"
 
 namespace orvane {
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/MountedSystem.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/mounts/MountPlace.h"
 #include "pellar/permissions/InstalledSystem.h"
 
@@ -59,7 +59,7 @@ std::variant<std::string, pellar::Sentence> mountedSystemOn(const std::filesyste
     if (safe != places.end())
         return safe->target;
     return pellar::Sentence{"it is mounted at “%1$@”, to which others than root can change the way",
-                            fixwell::printable(places.front().target),
+                            contract::printable(places.front().target),
                             {}};
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
+#include "pellar/texts/Sentence.h"
 
 #include <filesystem>
 #include <string>

@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/PrivilegedScript.h"
 
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/EventWire.h"
 #include "orvane/privileges/HelperProcess.h"
-#include "pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 
 #include <poll.h>
@@ -112,12 +111,12 @@ void PrivilegedScript::take(pellar::Event event)
 void PrivilegedScript::takeEnd(pellar::Finished end)
 {
     hasFinished_ = true;
-    const bool isAnswer = job_.image && end.mainError != fixwell::kPLErrorCancelled;
+    const bool isAnswer = job_.image && end.mainError != contract::kPLErrorCancelled;
     if (isAnswer && !job_.image->isStillWhole())
-        return finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+        return finish(contract::kPLErrorDiskChanged, contract::kPLVerdictFailed,
                       "the disk became shorter or unreadable meanwhile");
     if (isAnswer && !job_.image->isStillInPlace())
-        return finish(fixwell::kPLErrorDiskChanged, fixwell::kPLVerdictFailed,
+        return finish(contract::kPLErrorDiskChanged, contract::kPLVerdictFailed,
                       "the disk was deleted, moved or replaced meanwhile");
     for (pellar::Event& event : held_)
         road_.add(std::move(event));
@@ -131,10 +130,10 @@ bool PrivilegedScript::isResult(const pellar::Event& event) const
     if (message == nullptr)
         return false;
     if (message->dictionary)
-        return message->dictionary.string(fixwell::kFsckMessageType) ==
-               fixwell::kFsckSuccess.text();
+        return message->dictionary.string(contract::kFsckMessageType) ==
+               contract::kFsckSuccess.text();
     const auto meaning = guard_.meaningOf(message->text);
-    return meaning == fixwell::LinePhrase::Success || meaning == fixwell::LinePhrase::Failure;
+    return meaning == contract::LinePhrase::Success || meaning == contract::LinePhrase::Failure;
 }
 
 void PrivilegedScript::passStopOn(HelperProcess& helper)
@@ -159,22 +158,22 @@ void PrivilegedScript::explain(std::optional<int> status)
     constexpr int dismissed = 126;
     constexpr int notAuthorized = 127;
     if (status == dismissed || (!hasStarted_ && stop_.isPressed()))
-        finish(fixwell::kPLErrorCancelled, fixwell::kPLVerdictStopped,
+        finish(contract::kPLErrorCancelled, contract::kPLVerdictStopped,
                "the authorisation was not given; nothing was done");
     else if (status == notAuthorized && !hasStarted_)
-        finish(pellar::kPLErrorNotAuthorized, fixwell::kPLVerdictFailed,
+        finish(contract::kPLErrorNotAuthorized, contract::kPLVerdictFailed,
                job_.image ? "its tool needs it attached as a device of its own, for which you are "
                             "not authorised; nothing was done"
                           : "you are not authorised to work on this disk; nothing was done");
     else if (!hasStarted_)
-        finish(pellar::kPLErrorNotAuthorized, fixwell::kPLVerdictFailed,
+        finish(contract::kPLErrorNotAuthorized, contract::kPLVerdictFailed,
                "it needs an administrator's rights, and they could not be asked for");
     else
-        finish(fixwell::kPLErrorToolFailed, fixwell::kPLVerdictFailed,
+        finish(contract::kPLErrorToolFailed, contract::kPLVerdictFailed,
                "the program that works on it as administrator ended unexpectedly");
 }
 
-void PrivilegedScript::finish(fixwell::ErrorCode error, fixwell::Name verdict,
+void PrivilegedScript::finish(contract::ErrorCode error, contract::Name verdict,
                               std::string_view reason)
 {
     tellUndone({error, verdict, {reason, {}, {}}}, request_, texts_, log_);

@@ -3,10 +3,10 @@
 
 #include "orvane/privileges/HelperRequest.h"
 #include "orvane/privileges/UndoneJob.h"
-#include "pellar/Texts.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/LineGuard.h"
 #include "pellar/jobs/Script.h"
+#include "pellar/texts/Texts.h"
 
 #include <functional>
 #include <string>
@@ -49,7 +49,7 @@ private:
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);
     void asked();
-    void finish(fixwell::ErrorCode error, fixwell::Name verdict, std::string_view reason);
+    void finish(contract::ErrorCode error, contract::Name verdict, std::string_view reason);
 
     const HelperLaunch launch_;
     const pellar::PrivilegedJob job_;  ///< its image stays open for the helper

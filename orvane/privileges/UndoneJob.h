@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Name.h"
-#include "fixwell/host/pellar/ErrorCodes.h"
+#include "contract/foundation/Name.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "orvane/privileges/HelperRequest.h"
 #include "pellar/jobs/JobLog.h"
 
@@ -10,8 +10,8 @@ namespace orvane {
 
 /// How a job ends that somebody else was to do and did not.
 struct Undone {
-    fixwell::ErrorCode error;
-    fixwell::Name verdict;
+    contract::ErrorCode error;
+    contract::Name verdict;
     pellar::Sentence reason;
 };
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/Failure.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <fmt/format.h>
 #include <system_error>
@@ -15,7 +15,7 @@ std::string errorText(int errorNumber)
 
 Failure cannot(std::string_view attempt, std::string_view object, std::string_view outcome)
 {
-    return {fmt::format("cannot {} ‘{}’: {}", attempt, fixwell::printable(object), outcome)};
+    return {fmt::format("cannot {} ‘{}’: {}", attempt, contract::printable(object), outcome)};
 }
 
 Failure cannot(std::string_view attempt, std::string_view object, int errorNumber)

@@ -110,24 +110,24 @@ void SupportHost::loadHistories()
 
 void SupportHost::warn(const std::string& sentence)
 {
-    log_.ov_log(fixwell::OVLog::error, 0, sentence);
+    log_.ov_log(contract::OVLog::error, 0, sentence);
     if (options_.warn)
         options_.warn(sentence);
 }
 
-std::unique_ptr<fixwell::OVTimeEstimator> SupportHost::makeTimeEstimator()
+std::unique_ptr<contract::OVTimeEstimator> SupportHost::makeTimeEstimator()
 {
     return std::make_unique<TimeEstimator>([] { return std::chrono::system_clock::now(); },
                                            translator_);
 }
 
-std::string SupportHost::OVLocalizedErrorString(fixwell::ErrorCode code)
+std::string SupportHost::OVLocalizedErrorString(contract::ErrorCode code)
 {
     std::string text = options_.errorText ? options_.errorText(code) : std::string();
     return text.empty() ? translator_.sentence("error %ld", {code}) : text;
 }
 
-std::string SupportHost::decimalString(const fixwell::Value& number)
+std::string SupportHost::decimalString(const contract::Value& number)
 {
     return decimalText(number, currentLanguage());
 }

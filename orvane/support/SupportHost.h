@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/HostServices.h"
+#include "contract/support/HostServices.h"
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/history/DiskHistories.h"
 #include "orvane/support/history/HistoryStore.h"
@@ -29,7 +29,7 @@ namespace orvane {
 struct SupportOptions {
     XDGPaths paths = userXDGPaths();
     std::filesystem::path hostBundle;  ///< the directory with the host's `locale`
-    int keptLogLevel = fixwell::OVLog::error;
+    int keptLogLevel = contract::OVLog::error;
     int shownLogLevel = 0;  ///< developers' lines up to this level also go to standard error
     bool keepsHistory = true;
     HistoryStore::Limits historyLimits = {};
@@ -43,14 +43,14 @@ struct SupportOptions {
         return FilesystemCapabilities();
     };
     /// The text of an error code; "error CODE" where it answers nothing.
-    std::function<std::string(fixwell::ErrorCode)> errorText;
+    std::function<std::string(contract::ErrorCode)> errorText;
     /// Also told what goes to the log, once for each thing that does not work.
     WarningSink warn;
 };
 
 /// The host's services that need no toolkit. A front end derives from it and adds those that do.
 /// Main thread; the loop must outlive it.
-class SupportHost : public fixwell::HostServices {
+class SupportHost : public contract::HostServices {
 public:
     SupportHost(SupportOptions options, HostLoop& loop);
     SupportHost(const SupportHost&) = delete;
@@ -58,7 +58,7 @@ public:
     /// Waits for worker threads and saves what is unsaved.
     ~SupportHost() override;
 
-    fixwell::OVPreferences& sharedPreferences() override { return preferences_; }
+    contract::OVPreferences& sharedPreferences() override { return preferences_; }
     DiskController& sharedDiskController() override { return disks_; }
     ActivityLog& log() override { return log_; }
     Notifications& defaultCenter() override { return center_; }
@@ -68,9 +68,9 @@ public:
     ModuleBundle& hostBundle() override { return bundle_; }
     ImageAttacher& imageAttachment() override { return images_; }
 
-    std::unique_ptr<fixwell::OVTimeEstimator> makeTimeEstimator() override;
-    std::string OVLocalizedErrorString(fixwell::ErrorCode code) override;
-    std::string decimalString(const fixwell::Value& number) override;
+    std::unique_ptr<contract::OVTimeEstimator> makeTimeEstimator() override;
+    std::string OVLocalizedErrorString(contract::ErrorCode code) override;
+    std::string decimalString(const contract::Value& number) override;
 
     const Translator& translator() const { return translator_; }
     HistoryStore& historyStore() { return store_; }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/CommandLine.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/terminal/ExitStatus.h"
 
 #include <CLI/CLI.hpp>
@@ -110,7 +110,7 @@ std::variant<Request, Ending> readCommandLine(int argc, const char* const* argv)
         return Ending{exitSound, text.str()};
     } catch (const CLI::ParseError& error) {
         return Ending{exitUsage,
-                      "fixwell: " + fixwell::printable(error.what()) + "\nTry “fixwell --help”.\n"};
+                      "fixwell: " + contract::printable(error.what()) + "\nTry “fixwell --help”.\n"};
     }
 }
 

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/ExitStatus.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 namespace orvane {
 
 int exitStatusFor(std::string_view verdict)
 {
-    using namespace fixwell;
+    using namespace contract;
     if (verdict == kPLVerdictSound.text())
         return exitSound;
     if (verdict == kPLVerdictRepaired.text())

@@ -5,7 +5,7 @@ namespace orvane {
 namespace {
 
 /// What the interface file says of a button; the module sets the others itself.
-fixwell::Selector actionInFile(std::string_view outlet)
+contract::Selector actionInFile(std::string_view outlet)
 {
     if (outlet == "showDetailsButton")
         return "showDetailsAction:";
@@ -17,24 +17,24 @@ constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
 
 }  // namespace
 
-bool Interface::loadInterface(std::string_view /*name*/, fixwell::InterfaceOwner& owner)
+bool Interface::loadInterface(std::string_view /*name*/, contract::InterfaceOwner& owner)
 {
     owner_ = &owner;
-    for (const fixwell::Outlet& outlet : owner.outlets())
+    for (const contract::Outlet& outlet : owner.outlets())
         connect(outlet, owner);
     owner.awakeFromNib();
     return true;
 }
 
-void Interface::connect(const fixwell::Outlet& outlet, fixwell::InterfaceOwner& owner)
+void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
 {
-    if (auto* const button = std::get_if<fixwell::Button**>(&outlet.place)) {
+    if (auto* const button = std::get_if<contract::Button**>(&outlet.place)) {
         TerminalButton& made = buttons_[std::string(outlet.name)];
         made.setAction(actionInFile(outlet.name));
         **button = &made;
-    } else if (auto* const field = std::get_if<fixwell::TextField**>(&outlet.place)) {
+    } else if (auto* const field = std::get_if<contract::TextField**>(&outlet.place)) {
         **field = &textField_;
-    } else if (auto* const view = std::get_if<fixwell::TextView**>(&outlet.place)) {
+    } else if (auto* const view = std::get_if<contract::TextView**>(&outlet.place)) {
         **view = &textView_;
     } else {
         outlineView_ = owner.makeOutlineView(logViewClass, logView_);
@@ -42,11 +42,11 @@ void Interface::connect(const fixwell::Outlet& outlet, fixwell::InterfaceOwner& 
             return;
         outlineView_->setDataSource(owner.outlineViewDelegate());
         logView_.setView(outlineView_.get());
-        *std::get<fixwell::OutlineView**>(outlet.place) = outlineView_.get();
+        *std::get<contract::OutlineView**>(outlet.place) = outlineView_.get();
     }
 }
 
-void Interface::disconnect(fixwell::InterfaceOwner& owner)
+void Interface::disconnect(contract::InterfaceOwner& owner)
 {
     if (owner_ == &owner)
         owner_ = nullptr;

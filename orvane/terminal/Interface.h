@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Interface.h"
+#include "contract/toolkit/Interface.h"
 #include "orvane/terminal/Controls.h"
 #include "orvane/terminal/LogView.h"
 
@@ -14,12 +14,12 @@ namespace orvane {
 
 /// A module's interface on a terminal: for each outlet a control that nobody sees, and the log's
 /// rows on standard output. The controls are pressed by commands.
-class Interface final : public fixwell::InterfaceLoader {
+class Interface final : public contract::InterfaceLoader {
 public:
     explicit Interface(LogView& logView) : logView_(logView) {}
 
-    bool loadInterface(std::string_view name, fixwell::InterfaceOwner& owner) override;
-    void disconnect(fixwell::InterfaceOwner& owner) override;
+    bool loadInterface(std::string_view name, contract::InterfaceOwner& owner) override;
+    void disconnect(contract::InterfaceOwner& owner) override;
 
     /// None when the module has no such outlet.
     TerminalButton* button(std::string_view outlet);
@@ -27,14 +27,14 @@ public:
     bool press(TerminalButton& button);
 
 private:
-    void connect(const fixwell::Outlet& outlet, fixwell::InterfaceOwner& owner);
+    void connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner);
 
     LogView& logView_;
-    fixwell::InterfaceOwner* owner_ = nullptr;
+    contract::InterfaceOwner* owner_ = nullptr;
     std::map<std::string, TerminalButton, std::less<>> buttons_;
     TerminalTextField textField_;
     TerminalTextView textView_;
-    std::unique_ptr<fixwell::OutlineView> outlineView_;
+    std::unique_ptr<contract::OutlineView> outlineView_;
 };
 
 }  // namespace orvane

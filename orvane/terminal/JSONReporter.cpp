@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/JSONReporter.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <nlohmann/json.hpp>
 
@@ -17,13 +17,13 @@ using nlohmann::ordered_json;
 /// A step of this size is worth a line.
 constexpr double percentStep = 0.5;
 
-ordered_json jsonOf(const fixwell::Value& value)
+ordered_json jsonOf(const contract::Value& value)
 {
     switch (value.kind()) {
-        case fixwell::Kind::Boolean: return value.boolean();
-        case fixwell::Kind::Integer: return value.integer();
-        case fixwell::Kind::Real: return value.real();
-        case fixwell::Kind::None: return nullptr;
+        case contract::Kind::Boolean: return value.boolean();
+        case contract::Kind::Integer: return value.integer();
+        case contract::Kind::Real: return value.real();
+        case contract::Kind::None: return nullptr;
         default: return value.description();
     }
 }
@@ -50,13 +50,13 @@ void JSONReporter::started(const std::string& disk, std::string_view action,
     shownPercent_.reset();
 }
 
-void JSONReporter::record(const std::string& disk, const fixwell::Dictionary& record,
-                          const fixwell::StyledText& text)
+void JSONReporter::record(const std::string& disk, const contract::Dictionary& record,
+                          const contract::StyledText& text)
 {
     write({{"event", "record"},
            {"disk", disk},
-           {"type", textOrNull(record.string(fixwell::kFsckMessageType))},
-           {"verbosity", record.integer(fixwell::kFsckVerbosity)},
+           {"type", textOrNull(record.string(contract::kFsckMessageType))},
+           {"verbosity", record.integer(contract::kFsckVerbosity)},
            {"text", std::string(text.characters())}});
 }
 
@@ -82,7 +82,7 @@ void JSONReporter::progress(const std::string& disk, std::optional<double> perce
 }
 
 void JSONReporter::finished(const std::string& disk, std::string_view verdict,
-                            fixwell::ErrorCode error, std::string_view message)
+                            contract::ErrorCode error, std::string_view message)
 {
     write({{"event", "finished"},
            {"disk", disk},
@@ -92,12 +92,12 @@ void JSONReporter::finished(const std::string& disk, std::string_view verdict,
     flush();
 }
 
-void JSONReporter::report(const std::string& disk, const fixwell::Dictionary& report)
+void JSONReporter::report(const std::string& disk, const contract::Dictionary& report)
 {
     ordered_json event{{"event", "report"}};
     for (const auto& [key, value] : report.entries())
         event[std::string(key.text())] =
-            value.kind() == fixwell::Kind::Object ? ordered_json(disk) : jsonOf(value);
+            value.kind() == contract::Kind::Object ? ordered_json(disk) : jsonOf(value);
     write(event);
 }
 
@@ -111,8 +111,8 @@ void JSONReporter::failure(const std::string& disk, const std::string& sentence)
 {
     write({{"event", "finished"},
            {"disk", disk},
-           {"verdict", fixwell::kPLVerdictFailed.text()},
-           {"error", fixwell::kPLErrorCannotOpen},
+           {"verdict", contract::kPLVerdictFailed.text()},
+           {"error", contract::kPLErrorCannotOpen},
            {"message", sentence}});
     flush();
 }
@@ -120,7 +120,7 @@ void JSONReporter::failure(const std::string& disk, const std::string& sentence)
 // Standard output is for events.
 void JSONReporter::warning(const std::string& sentence)
 {
-    const std::string line = "fixwell: " + fixwell::printable(sentence) + "\n";
+    const std::string line = "fixwell: " + contract::printable(sentence) + "\n";
     std::fwrite(line.data(), 1, line.size(), stderr);
 }
 

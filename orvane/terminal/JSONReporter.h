@@ -15,14 +15,14 @@ class JSONReporter final : public Reporter {
 public:
     void started(const std::string& disk, std::string_view action,
                  const std::string& title) override;
-    void record(const std::string& disk, const fixwell::Dictionary& record,
-                const fixwell::StyledText& text) override;
+    void record(const std::string& disk, const contract::Dictionary& record,
+                const contract::StyledText& text) override;
     void rowsWritten() override;
     void progress(const std::string& disk, std::optional<double> percent,
                   const std::string& status) override;
-    void finished(const std::string& disk, std::string_view verdict, fixwell::ErrorCode error,
+    void finished(const std::string& disk, std::string_view verdict, contract::ErrorCode error,
                   std::string_view message) override;
-    void report(const std::string& disk, const fixwell::Dictionary& report) override;
+    void report(const std::string& disk, const contract::Dictionary& report) override;
     void alert(const std::string& title, const std::string& message) override;
     void failure(const std::string& disk, const std::string& sentence) override;
     void warning(const std::string& sentence) override;

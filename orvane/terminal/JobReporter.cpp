@@ -3,7 +3,7 @@
 
 namespace orvane {
 
-void JobReporter::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation)
+void JobReporter::jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation)
 {
     flush();
     current_ = names_.nameOf(disk->identifier);
@@ -14,14 +14,14 @@ void JobReporter::jobWillBegin(const fixwell::DiskReferencePointer& disk, Operat
 }
 
 // The module's row with the reason is still to come, so the end is not said here.
-void JobReporter::jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
-                                 fixwell::ErrorCode error)
+void JobReporter::jobDidNotBegin(const contract::DiskReferencePointer& disk,
+                                 contract::ErrorCode error)
 {
     settle(disk->identifier, runs_.refuse(error));
 }
 
-void JobReporter::jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
-                                const fixwell::Dictionary& result)
+void JobReporter::jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
+                                const contract::Dictionary& result)
 {
     settle(disk->identifier, runs_.finish(error, result));
 }

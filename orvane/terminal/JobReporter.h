@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVDiskController.h"
+#include "contract/support/OVDiskController.h"
 #include "orvane/jobs/JobObserver.h"
 #include "orvane/jobs/RunKeeper.h"
 #include "orvane/terminal/DiskNames.h"
@@ -23,7 +23,7 @@ public:
         /// Writes the rows that are waiting.
         std::function<void()> flushRows;
         /// A job begins on this disk; its first row is the newest of the disk's log.
-        std::function<void(const fixwell::DiskReferencePointer& disk)> follow;
+        std::function<void(const contract::DiskReferencePointer& disk)> follow;
     };
 
     /// All outlive this object.
@@ -33,11 +33,11 @@ public:
     {
     }
 
-    void jobWillBegin(const fixwell::DiskReferencePointer& disk, Operation operation) override;
-    void jobDidNotBegin(const fixwell::DiskReferencePointer& disk,
-                        fixwell::ErrorCode error) override;
-    void jobWillFinish(const fixwell::DiskReferencePointer& disk, fixwell::ErrorCode error,
-                       const fixwell::Dictionary& result) override;
+    void jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation) override;
+    void jobDidNotBegin(const contract::DiskReferencePointer& disk,
+                        contract::ErrorCode error) override;
+    void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
+                       const contract::Dictionary& result) override;
 
     /// Says that the last job has finished, once the module has added its last rows.
     void flush();

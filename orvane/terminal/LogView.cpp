@@ -31,7 +31,7 @@ void LogView::reloadData()
     if (!isWriting_ || isWaiting_)
         return;
     isWaiting_ = true;
-    loop_.performOnMainThread([this] { flush(); }, fixwell::RunLoop::Wait::No);
+    loop_.performOnMainThread([this] { flush(); }, contract::RunLoop::Wait::No);
 }
 
 void LogView::holdBack()
@@ -54,9 +54,9 @@ void LogView::writeNewRows()
     if (written_ >= rows_ || view_ == nullptr)
         return;
     beforeRows_();
-    fixwell::BrowserCell* const cell = view_->dataCell();
+    contract::BrowserCell* const cell = view_->dataCell();
     for (; written_ < rows_; ++written_) {
-        const fixwell::OutlineItem item = view_->itemAtRow(written_);
+        const contract::OutlineItem item = view_->itemAtRow(written_);
         if (cell == nullptr || !item)
             continue;
         view_->dataSource()->outlineViewWillDisplayCellForTableColumnItem(*cell, item);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/ProgressLine.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/terminal/TerminalText.h"
 
 #include <fmt/format.h>
@@ -42,7 +42,7 @@ std::string progressLine(const JobProgress& progress, std::size_t columns)
 {
     const std::string gauge =
         progress.percent ? bar(*progress.percent) : wanderingMark(progress.elapsed);
-    return fittedTo(gauge + "  " + fixwell::printable(progress.status), columns);
+    return fittedTo(gauge + "  " + contract::printable(progress.status), columns);
 }
 
 }  // namespace orvane

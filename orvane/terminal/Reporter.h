@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/pellar/ErrorCodes.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/pellar/ErrorCodes.h"
 
 #include <optional>
 #include <string>
@@ -57,16 +57,16 @@ public:
     virtual void started(const std::string& disk, std::string_view action,
                          const std::string& title) = 0;
     /// A row of the log, with its text as the log view's cell holds it.
-    virtual void record(const std::string& disk, const fixwell::Dictionary& record,
-                        const fixwell::StyledText& text) = 0;
+    virtual void record(const std::string& disk, const contract::Dictionary& record,
+                        const contract::StyledText& text) = 0;
     /// The rows that were waiting are written; a reader should see them now.
     virtual void rowsWritten() = 0;
     /// No percentage while there is no telling.
     virtual void progress(const std::string& disk, std::optional<double> percent,
                           const std::string& status) = 0;
     virtual void finished(const std::string& disk, std::string_view verdict,
-                          fixwell::ErrorCode error, std::string_view message) = 0;
-    virtual void report(const std::string& disk, const fixwell::Dictionary& report) = 0;
+                          contract::ErrorCode error, std::string_view message) = 0;
+    virtual void report(const std::string& disk, const contract::Dictionary& report) = 0;
     /// Somebody else asks for a password on the terminal: nothing is drawn meanwhile. `Left`: it
     /// was left with Ctrl-C, in the middle of its line.
     enum class Prompt { Open, Left, Over };

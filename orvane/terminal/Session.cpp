@@ -6,7 +6,7 @@
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
-#include "pellar/ErrorTexts.h"
+#include "pellar/texts/ErrorTexts.h"
 
 #include <unistd.h>
 
@@ -32,7 +32,7 @@ Session::Session(const Request& request, Reporter& reporter)
       tracesCommands_(request.tracesCommands),
       logView_(
           loop_,
-          [this](const fixwell::Dictionary& record, const fixwell::StyledText& text) {
+          [this](const contract::Dictionary& record, const contract::StyledText& text) {
               reporter_.record(jobs_.currentDisk(), record, text);
           },
           [this] { host_.histories().saveNew(); }, [this] { reporter_.rowsWritten(); }),
@@ -50,9 +50,9 @@ Session::Session(const Request& request, Reporter& reporter)
             if (jobs_.isInFlight())
                 reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status());
         },
-        [this](const fixwell::Dictionary& report) {
+        [this](const contract::Dictionary& report) {
             jobs_.flush();
-            reporter_.report(names_.nameOf(report.string(fixwell::Name("kOVOP_DiskIdentifierKey"))),
+            reporter_.report(names_.nameOf(report.string(contract::Name("kOVOP_DiskIdentifierKey"))),
                              report);
         },
     });
@@ -69,13 +69,13 @@ SupportOptions Session::supportOptions(const Request& request)
 {
     SupportOptions options;
     options.hostBundle = hostBundleDirectory(runningExecutable());
-    options.keptLogLevel = std::max(request.logLevel, fixwell::OVLog::error);
+    options.keptLogLevel = std::max(request.logLevel, contract::OVLog::error);
     options.shownLogLevel = request.logLevel;
     options.capabilities = [this](std::string_view type) {
         return FilesystemCapabilities{library_.canVerify(type), library_.canRepair(type),
                                       library_.canVerifyLive(type)};
     };
-    options.errorText = [this](fixwell::ErrorCode code) {
+    options.errorText = [this](contract::ErrorCode code) {
         return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.warn = [this](const std::string& sentence) {
@@ -137,7 +137,7 @@ JobReporter::Hooks Session::jobHooks()
     hooks.flushRows = [this] {
         logView_.flush();
     };
-    hooks.follow = [this](const fixwell::DiskReferencePointer& disk) {
+    hooks.follow = [this](const contract::DiskReferencePointer& disk) {
         follow(disk);
     };
     return hooks;
@@ -160,7 +160,7 @@ Outcome<> Session::loadModule()
     auto made = makeModule(loaded_, host_, *this);
     if (failed(made))
         return Failure{failureMessage(made)};
-    module_ = std::get<std::unique_ptr<fixwell::OVModule>>(std::move(made));
+    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
     observedLibrary_.setDelegate(module_->asyncDelegate());
     return Done{};
 }
@@ -183,7 +183,7 @@ Session::DiskPointer Session::attach(const DiskPointer& image)
 {
     if (!image->isOfflineDiskImage())
         return nullptr;
-    fixwell::Dictionary result;
+    contract::Dictionary result;
     if (host_.imageAttachment().AttachImageWithURL(image->diskImagePath(), result) != 0)
         return nullptr;
     const auto top =
@@ -213,12 +213,12 @@ void Session::select(const std::vector<DiskPointer>& disks)
 {
     logView_.holdBack();
     window_.select({disks.begin(), disks.end()});
-    module_->windowChangedNotication({fixwell::OVDiskChangedNotification, nullptr, {}});
+    module_->windowChangedNotication({contract::OVDiskChangedNotification, nullptr, {}});
 }
 
 // The disk list of a window would keep its selection; here the log goes with the disk that is
 // being worked on, so that its rows come one after the other.
-void Session::follow(const fixwell::DiskReferencePointer& reference)
+void Session::follow(const contract::DiskReferencePointer& reference)
 {
     if (const auto disk =
             std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference)))

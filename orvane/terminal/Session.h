@@ -22,7 +22,7 @@ namespace orvane {
 
 /// One run of the program: the host, the library and the module, and what the commands do with
 /// them. Main thread only; one at a time.
-class Session final : private fixwell::ModuleSite {
+class Session final : private contract::ModuleSite {
 public:
     using DiskPointer = std::shared_ptr<Disk>;
 
@@ -66,18 +66,18 @@ public:
 
 private:
     bool isActiveTab() const override { return true; }
-    fixwell::OVWindowController& windowController() override { return window_; }
-    fixwell::OVDiskPointer workingDisk() const override { return nullptr; }
-    fixwell::Window& window() override { return window_; }
-    fixwell::Bundle& bundle() override { return *loaded_.bundle; }
-    fixwell::PLManager& pl() override { return observedLibrary_; }
+    contract::OVWindowController& windowController() override { return window_; }
+    contract::OVDiskPointer workingDisk() const override { return nullptr; }
+    contract::Window& window() override { return window_; }
+    contract::Bundle& bundle() override { return *loaded_.bundle; }
+    contract::PLManager& pl() override { return observedLibrary_; }
 
     SupportOptions supportOptions(const Request& request);
     pellar::ManagerOptions libraryOptions(const Request& request);
     void trace(std::string_view line);
     Asking asking();
     JobReporter::Hooks jobHooks();
-    void follow(const fixwell::DiskReferencePointer& disk);
+    void follow(const contract::DiskReferencePointer& disk);
     void interrupt();
     bool pressStop();
 
@@ -97,7 +97,7 @@ private:
     JobReporter jobs_;
     ObservedManager observedLibrary_;
     LoadedModule loaded_;
-    std::unique_ptr<fixwell::OVModule> module_;
+    std::unique_ptr<contract::OVModule> module_;
     bool isStopping_ = false;
     bool knowsSystemDisks_ = false;
 };

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/TerminalAlerts.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/terminal/Controls.h"
 
 #include <cstdio>
@@ -9,16 +9,16 @@
 
 namespace orvane {
 
-class TerminalAlerts::Question final : public fixwell::Alert,
+class TerminalAlerts::Question final : public contract::Alert,
                                        public std::enable_shared_from_this<Question> {
 public:
     Question(TerminalAlerts& alerts, Text text) : alerts_(alerts), text_(std::move(text)) {}
 
-    std::vector<fixwell::Button*> buttons() override { return {&default_, &alternate_}; }
+    std::vector<contract::Button*> buttons() override { return {&default_, &alternate_}; }
     void orderOut() override {}
 
-    void beginSheetModalForWindow(fixwell::Window* /*window*/,
-                                  std::function<void(fixwell::Alert&, long)> end) override
+    void beginSheetModalForWindow(contract::Window* /*window*/,
+                                  std::function<void(contract::Alert&, long)> end) override
     {
         alerts_.isAsking_ = true;
         alerts_.loop_.performOnMainThread(
@@ -29,7 +29,7 @@ public:
                 const TerminalButton& pressed = isConfirmed ? self->default_ : self->alternate_;
                 end(*self, static_cast<long>(pressed.tag()));
             },
-            fixwell::RunLoop::Wait::No);
+            contract::RunLoop::Wait::No);
     }
 
 private:
@@ -38,7 +38,7 @@ private:
         if (alerts_.answer_ != Answer::Ask)
             return alerts_.answer_ == Answer::Confirm;
         alerts_.reporter_.alert(text_.message, text_.informative);
-        std::printf("%s [y/N] ", fixwell::printable(text_.defaultButton).c_str());
+        std::printf("%s [y/N] ", contract::printable(text_.defaultButton).c_str());
         std::fflush(stdout);
         std::string answer;
         std::getline(std::cin, answer);
@@ -51,7 +51,7 @@ private:
     TerminalButton alternate_;
 };
 
-std::shared_ptr<fixwell::Alert> TerminalAlerts::makeAlert(const fixwell::Alert::Text& text)
+std::shared_ptr<contract::Alert> TerminalAlerts::makeAlert(const contract::Alert::Text& text)
 {
     return std::make_shared<Question>(*this, text);
 }

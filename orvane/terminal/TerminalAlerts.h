@@ -1,25 +1,25 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
-#include "fixwell/host/toolkit/Alert.h"
+#include "contract/foundation/RunLoop.h"
+#include "contract/toolkit/Alert.h"
 #include "orvane/terminal/Reporter.h"
 
 namespace orvane {
 
 /// Alerts as text. A question is answered by --yes, or asked on the terminal, where only the word
 /// for yes confirms; without a terminal it is answered with the button that Return stands for.
-class TerminalAlerts final : public fixwell::Alerts {
+class TerminalAlerts final : public contract::Alerts {
 public:
     enum class Answer { Confirm, Ask, Decline };
 
     /// Both outlive this object.
-    TerminalAlerts(fixwell::RunLoop& loop, Reporter& reporter, Answer answer)
+    TerminalAlerts(contract::RunLoop& loop, Reporter& reporter, Answer answer)
         : loop_(loop), reporter_(reporter), answer_(answer)
     {
     }
 
-    std::shared_ptr<fixwell::Alert> makeAlert(const fixwell::Alert::Text& text) override;
+    std::shared_ptr<contract::Alert> makeAlert(const contract::Alert::Text& text) override;
     void simpleModuleAlert(const std::string& title, const std::string& message,
                            std::int32_t error) override;
 
@@ -31,7 +31,7 @@ public:
 private:
     class Question;
 
-    fixwell::RunLoop& loop_;
+    contract::RunLoop& loop_;
     Reporter& reporter_;
     Answer answer_;
     bool isAsking_ = false;

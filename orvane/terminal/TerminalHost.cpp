@@ -21,17 +21,17 @@ void TerminalHost::openHelpAnchor(std::string_view /*anchor*/)
     reporter_.warning(translator().text("Help is shown by “fixwell --help”."));
 }
 
-void TerminalHost::declareTypes(const std::vector<fixwell::PasteboardType>& /*types*/,
+void TerminalHost::declareTypes(const std::vector<contract::PasteboardType>& /*types*/,
                                 const void* /*owner*/)
 {
     reporter_.warning(translator().text("Copying is done by the terminal."));
 }
 
-void TerminalHost::setData(std::string_view /*data*/, fixwell::PasteboardType /*type*/) {}
+void TerminalHost::setData(std::string_view /*data*/, contract::PasteboardType /*type*/) {}
 
-void TerminalHost::runPrintOperation(fixwell::OutlineView& /*view*/,
-                                     const fixwell::PrintInfo& /*info*/, bool /*showsPanel*/,
-                                     fixwell::Window* /*window*/)
+void TerminalHost::runPrintOperation(contract::OutlineView& /*view*/,
+                                     const contract::PrintInfo& /*info*/, bool /*showsPanel*/,
+                                     contract::Window* /*window*/)
 {
     reporter_.warning(translator().text("Printing is done by redirecting “fixwell history”."));
 }

@@ -11,9 +11,9 @@
 namespace orvane {
 
 /// Preferences as stored, but for what the command line says for this once.
-class RequestedPreferences final : public fixwell::OVPreferences {
+class RequestedPreferences final : public contract::OVPreferences {
 public:
-    RequestedPreferences(fixwell::OVPreferences& stored, std::optional<bool> showsDetails)
+    RequestedPreferences(contract::OVPreferences& stored, std::optional<bool> showsDetails)
         : stored_(stored), showsDetails_(showsDetails)
     {
     }
@@ -30,47 +30,47 @@ public:
     bool rootVolumeIsReadOnly() const override { return stored_.rootVolumeIsReadOnly(); }
 
 private:
-    fixwell::OVPreferences& stored_;
+    contract::OVPreferences& stored_;
     std::optional<bool> showsDetails_;
 };
 
 /// The host on a terminal: the shared services, and a toolkit without a screen.
 class TerminalHost final : public SupportHost,
-                           public fixwell::Events,
-                           public fixwell::HelpManager,
-                           public fixwell::Pasteboard,
-                           public fixwell::Printing {
+                           public contract::Events,
+                           public contract::HelpManager,
+                           public contract::Pasteboard,
+                           public contract::Printing {
 public:
     /// All references outlive this object.
     TerminalHost(SupportOptions options, MainLoop& loop, Interface& interface,
                  TerminalAlerts& alerts, Reporter& reporter, std::optional<bool> showsDetails);
 
-    fixwell::OVPreferences& sharedPreferences() override { return preferences_; }
-    fixwell::Alerts& alerts() override { return alerts_; }
-    fixwell::Events& events() override { return *this; }
-    fixwell::HelpManager& sharedHelpManager() override { return *this; }
-    fixwell::InterfaceLoader& interfaceLoader() override { return interface_; }
-    fixwell::Pasteboard& generalPasteboard() override { return *this; }
-    fixwell::Printing& printing() override { return *this; }
+    contract::OVPreferences& sharedPreferences() override { return preferences_; }
+    contract::Alerts& alerts() override { return alerts_; }
+    contract::Events& events() override { return *this; }
+    contract::HelpManager& sharedHelpManager() override { return *this; }
+    contract::InterfaceLoader& interfaceLoader() override { return interface_; }
+    contract::Pasteboard& generalPasteboard() override { return *this; }
+    contract::Printing& printing() override { return *this; }
 
     /// A terminal sends no modifier keys with a command.
     std::uint64_t currentModifierFlags() const override { return 0; }
     void openHelpAnchor(std::string_view anchor) override;
     /// No command copies or prints; the terminal and the shell do that. What is asked for all the
     /// same is answered with a sentence.
-    void declareTypes(const std::vector<fixwell::PasteboardType>& types,
+    void declareTypes(const std::vector<contract::PasteboardType>& types,
                       const void* owner) override;
-    void setData(std::string_view data, fixwell::PasteboardType type) override;
-    fixwell::PrintInfo& sharedPrintInfo() override { return printInfo_; }
-    void runPrintOperation(fixwell::OutlineView& view, const fixwell::PrintInfo& info,
-                           bool showsPanel, fixwell::Window* window) override;
+    void setData(std::string_view data, contract::PasteboardType type) override;
+    contract::PrintInfo& sharedPrintInfo() override { return printInfo_; }
+    void runPrintOperation(contract::OutlineView& view, const contract::PrintInfo& info,
+                           bool showsPanel, contract::Window* window) override;
 
 private:
     RequestedPreferences preferences_;
     Interface& interface_;
     TerminalAlerts& alerts_;
     Reporter& reporter_;
-    fixwell::PrintInfo printInfo_;
+    contract::PrintInfo printInfo_;
 };
 
 }  // namespace orvane

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/TerminalText.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 #include <cwchar>
@@ -11,7 +11,7 @@ namespace {
 
 constexpr std::string_view reset = "\x1b[0m";
 
-std::string lookOf(const fixwell::TextStyle& style)
+std::string lookOf(const contract::TextStyle& style)
 {
     std::string look;
     if (style.font && style.font->isBold)
@@ -35,7 +35,7 @@ void appendLine(std::string& result, std::string_view line, const std::string& l
     if (line.empty())
         return;
     result += look;
-    result += fixwell::printable(line);
+    result += contract::printable(line);
     if (!look.empty())
         result += reset;
 }
@@ -47,7 +47,7 @@ std::string safeLines(std::string_view text)
     std::string result;
     while (!text.empty()) {
         const std::size_t end = std::min(text.find('\n'), text.size());
-        result += fixwell::printable(text.substr(0, end));
+        result += contract::printable(text.substr(0, end));
         if (end < text.size())
             result += '\n';
         text.remove_prefix(std::min(end + 1, text.size()));
@@ -55,13 +55,13 @@ std::string safeLines(std::string_view text)
     return result;
 }
 
-std::string terminalText(const fixwell::StyledText& text, bool colors)
+std::string terminalText(const contract::StyledText& text, bool colors)
 {
     if (!colors)
         return safeLines(text.characters());
     std::string result;
     std::string_view rest = text.characters();
-    for (const fixwell::StyledText::Run& run : text.runs()) {
+    for (const contract::StyledText::Run& run : text.runs()) {
         const std::string look = lookOf(*run.style);
         std::string_view part = rest.substr(0, run.length);
         rest.remove_prefix(run.length);
@@ -80,12 +80,12 @@ std::string fittedTo(std::string_view text, std::size_t columns)
 {
     std::string fitted;
     while (!text.empty()) {
-        const char32_t character = fixwell::takeCharacter(text);
+        const char32_t character = contract::takeCharacter(text);
         const std::size_t width = columnsOf(character);
         if (width > columns)
             break;
         columns -= width;
-        fixwell::appendUTF8(fitted, character);
+        contract::appendUTF8(fitted, character);
     }
     return fitted;
 }

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVWindowController.h"
-#include "fixwell/host/toolkit/Control.h"
+#include "contract/support/OVWindowController.h"
+#include "contract/toolkit/Control.h"
 
 #include <functional>
 #include <optional>
@@ -12,15 +12,15 @@ namespace orvane {
 
 /// What a window is to a module, for a program that has none: a selection, progress and a status
 /// text, and the word that a job is over.
-class TerminalWindow final : public fixwell::OVWindowController, public fixwell::Window {
+class TerminalWindow final : public contract::OVWindowController, public contract::Window {
 public:
     struct Events {
         std::function<void()> progressChanged;
-        std::function<void(const fixwell::Dictionary& report)> completed;
+        std::function<void(const contract::Dictionary& report)> completed;
     };
 
     void setEvents(Events events) { events_ = std::move(events); }
-    void select(std::vector<fixwell::OVDiskPointer> disks) { selection_ = std::move(disks); }
+    void select(std::vector<contract::OVDiskPointer> disks) { selection_ = std::move(disks); }
     /// From 0 to 100; none while there is no telling.
     std::optional<double> percent() const
     {
@@ -28,7 +28,7 @@ public:
     }
     const std::string& status() const { return status_; }
 
-    std::vector<fixwell::OVDiskPointer> allSelectedItemsFilterDuplicates(bool, bool) override
+    std::vector<contract::OVDiskPointer> allSelectedItemsFilterDuplicates(bool, bool) override
     {
         return selection_;
     }
@@ -52,7 +52,7 @@ public:
         status_ = text;
         changed();
     }
-    void notifyWindowOfCompletion(const fixwell::Dictionary& report) override
+    void notifyWindowOfCompletion(const contract::Dictionary& report) override
     {
         if (events_.completed)
             events_.completed(report);
@@ -67,7 +67,7 @@ private:
     }
 
     Events events_;
-    std::vector<fixwell::OVDiskPointer> selection_;
+    std::vector<contract::OVDiskPointer> selection_;
     bool isLocked_ = false;
     bool isIndeterminate_ = true;
     double percent_ = 0;

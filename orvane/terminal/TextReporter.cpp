@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/TextReporter.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/terminal/ByteCount.h"
 #include "orvane/terminal/TerminalText.h"
 
@@ -17,10 +17,10 @@ namespace {
 constexpr std::chrono::milliseconds redrawInterval{100};
 
 /// A heading that is neither good nor bad and says what it is about: a job's first line.
-bool isStartOfRun(const fixwell::Dictionary& record)
+bool isStartOfRun(const contract::Dictionary& record)
 {
-    return record.integer(fixwell::kFsckVerbosity) < 0 && !record.has(fixwell::kFsckMessageType) &&
-           record.has(fixwell::kFsckMessageString);
+    return record.integer(contract::kFsckVerbosity) < 0 && !record.has(contract::kFsckMessageType) &&
+           record.has(contract::kFsckMessageString);
 }
 
 std::size_t terminalColumns()
@@ -49,9 +49,9 @@ void TextReporter::endLine()
 }
 
 std::string TextReporter::sentence(std::string_view key,
-                                   std::initializer_list<fixwell::FormatArgument> arguments) const
+                                   std::initializer_list<contract::FormatArgument> arguments) const
 {
-    return fixwell::format(options_.translate(key), arguments);
+    return contract::format(options_.translate(key), arguments);
 }
 
 std::string TextReporter::verdictText(std::string_view verdict) const
@@ -74,8 +74,8 @@ void TextReporter::started(const std::string& /*disk*/, std::string_view /*actio
     endLine();
 }
 
-void TextReporter::record(const std::string& /*disk*/, const fixwell::Dictionary& record,
-                          const fixwell::StyledText& text)
+void TextReporter::record(const std::string& /*disk*/, const contract::Dictionary& record,
+                          const contract::StyledText& text)
 {
     if (hasWrittenRows_ && isStartOfRun(record)) {
         endLine();
@@ -124,7 +124,7 @@ void TextReporter::hideProgress()
 
 // What a person needs to know of these three stands in the log's rows and in the alert.
 void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verdict*/,
-                            fixwell::ErrorCode /*error*/, std::string_view /*message*/)
+                            contract::ErrorCode /*error*/, std::string_view /*message*/)
 {
     progress_.status.clear();
     hideProgress();
@@ -132,7 +132,7 @@ void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verd
     flush();
 }
 
-void TextReporter::report(const std::string& /*disk*/, const fixwell::Dictionary& /*report*/) {}
+void TextReporter::report(const std::string& /*disk*/, const contract::Dictionary& /*report*/) {}
 
 void TextReporter::prompt(Prompt state)
 {
@@ -160,7 +160,7 @@ void TextReporter::warning(const std::string& sentence)
     hideProgress();
     endLine();
     flush();
-    const std::string line = "fixwell: " + fixwell::printable(sentence) + "\n";
+    const std::string line = "fixwell: " + contract::printable(sentence) + "\n";
     std::fwrite(line.data(), 1, line.size(), stderr);
 }
 
@@ -173,8 +173,8 @@ void TextReporter::listed(const DiskLine& disk)
     if (!disk.mountPoint.empty())
         facts += "  " + sentence("mounted at %@", {disk.mountPoint});
     write(indent + bold(disk.disk) +
-          (disk.name.empty() ? "" : fixwell::printable("  “" + disk.name + "”")) + "  " +
-          fixwell::printable(facts) + "\n");
+          (disk.name.empty() ? "" : contract::printable("  “" + disk.name + "”")) + "  " +
+          contract::printable(facts) + "\n");
     write(indent + "    " +
           (disk.lastChecked.empty()
                ? sentence("never checked", {})
@@ -188,13 +188,13 @@ void TextReporter::listed(const DiskLine& disk)
     for (const ActionLine& action : disk.actions)
         write(fmt::format(
             "{}    {:<24} {}\n", indent, action.title,
-            action.isAvailable ? sentence("available", {}) : fixwell::printable(action.reason)));
+            action.isAvailable ? sentence("available", {}) : contract::printable(action.reason)));
 }
 
 void TextReporter::done(const std::string& /*disk*/, std::string_view /*action*/,
                         const std::string& /*place*/, const std::string& sentence)
 {
-    write(fixwell::printable(sentence) + "\n");
+    write(contract::printable(sentence) + "\n");
     flush();
 }
 
@@ -203,7 +203,7 @@ void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& run
     endLine();
     write(bold(disk) + (runs.empty() ? ": " + sentence("never checked", {}) + "\n" : "\n"));
     for (const RunLine& run : runs)
-        write(fixwell::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
+        write(contract::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
                                              verdictText(run.verdict))) +
               "\n");
     if (!runs.empty())

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Format.h"
+#include "contract/foundation/Format.h"
 #include "orvane/terminal/ProgressLine.h"
 #include "orvane/terminal/Reporter.h"
 
@@ -28,14 +28,14 @@ public:
 
     void started(const std::string& disk, std::string_view action,
                  const std::string& title) override;
-    void record(const std::string& disk, const fixwell::Dictionary& record,
-                const fixwell::StyledText& text) override;
+    void record(const std::string& disk, const contract::Dictionary& record,
+                const contract::StyledText& text) override;
     void rowsWritten() override;
     void progress(const std::string& disk, std::optional<double> percent,
                   const std::string& status) override;
-    void finished(const std::string& disk, std::string_view verdict, fixwell::ErrorCode error,
+    void finished(const std::string& disk, std::string_view verdict, contract::ErrorCode error,
                   std::string_view message) override;
-    void report(const std::string& disk, const fixwell::Dictionary& report) override;
+    void report(const std::string& disk, const contract::Dictionary& report) override;
     void prompt(Prompt state) override;
     void alert(const std::string& title, const std::string& message) override;
     void failure(const std::string& disk, const std::string& sentence) override;
@@ -55,7 +55,7 @@ private:
     void drawProgress();
     std::string bold(std::string_view text) const;
     std::string sentence(std::string_view key,
-                         std::initializer_list<fixwell::FormatArgument> arguments) const;
+                         std::initializer_list<contract::FormatArgument> arguments) const;
     std::string verdictText(std::string_view verdict) const;
 
     Options options_;

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/pellar/ErrorCodes.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/pellar/ErrorCodes.h"
 
 #include <cstdint>
 #include <string>
@@ -15,7 +15,7 @@ struct Started {};
 /// A plain line when there is no dictionary.
 struct Message {
     std::string text;
-    fixwell::Dictionary dictionary;
+    contract::Dictionary dictionary;
 };
 
 /// For the developers: a command before it runs, why a tool was chosen or refused.
@@ -24,9 +24,9 @@ struct Trace {
 };
 
 struct Finished {
-    fixwell::ErrorCode mainError = fixwell::kPLNoError;
+    contract::ErrorCode mainError = contract::kPLNoError;
     std::int32_t detailError = 0;
-    fixwell::Dictionary result;
+    contract::Dictionary result;
 };
 
 /// What a job tells, in the order in which it happened.

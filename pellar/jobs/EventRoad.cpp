@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/EventRoad.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <condition_variable>
 #include <mutex>
@@ -19,9 +19,9 @@ std::size_t bytesOf(const Event& event)
     const auto* const message = std::get_if<Message>(&event);
     if (message == nullptr)
         return overhead;
-    const fixwell::Dictionary& dictionary = message->dictionary;
+    const contract::Dictionary& dictionary = message->dictionary;
     return overhead + message->text.size() +
-           (dictionary ? dictionary.string(fixwell::kFsckMessageString).size() : 0);
+           (dictionary ? dictionary.string(contract::kFsckMessageString).size() : 0);
 }
 
 }  // namespace
@@ -60,7 +60,7 @@ private:
     std::vector<Event> events_;
 };
 
-EventRoad::EventRoad(fixwell::RunLoop& loop, EventReceiver receiver)
+EventRoad::EventRoad(contract::RunLoop& loop, EventReceiver receiver)
     : loop_(loop), shared_(std::make_shared<Shared>(std::move(receiver)))
 {
 }
@@ -91,7 +91,7 @@ void EventRoad::flush()
     }
     // Posted without the lock: a loop may run the task at once.
     const auto crossing = std::make_shared<Crossing>(shared_, std::move(events));
-    loop_.performOnMainThread([crossing] { crossing->arrive(); }, fixwell::RunLoop::Wait::No);
+    loop_.performOnMainThread([crossing] { crossing->arrive(); }, contract::RunLoop::Wait::No);
 }
 
 void EventRoad::flushIfDue()

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
-#include "fixwell/host/pellar/PLRepairDisk.h"
+#include "contract/foundation/RunLoop.h"
+#include "contract/pellar/PLRepairDisk.h"
 #include "pellar/jobs/Event.h"
 #include "pellar/process/StopLadder.h"
 
@@ -16,8 +16,8 @@ namespace pellar {
 
 /// Where a job's events arrive, on the main thread.
 struct EventReceiver {
-    fixwell::PLAsyncDelegate* delegate = nullptr;  ///< not owned
-    fixwell::DiskReferencePointer disk;
+    contract::PLAsyncDelegate* delegate = nullptr;  ///< not owned
+    contract::DiskReferencePointer disk;
     std::function<void(std::string_view)> trace;  ///< may be empty
     /// The job is over; called just before the delegate hears so, so that the delegate may begin
     /// the next one. It may destroy the road.
@@ -33,7 +33,7 @@ public:
     static constexpr std::size_t batchBytes = 256U << 10U;
     static constexpr int batchesUnderWay = 4;
 
-    EventRoad(fixwell::RunLoop& loop, EventReceiver receiver);
+    EventRoad(contract::RunLoop& loop, EventReceiver receiver);
 
     // The job's thread.
 
@@ -54,7 +54,7 @@ private:
 
     static void deliver(Shared& shared, std::vector<Event>& events);
 
-    fixwell::RunLoop& loop_;
+    contract::RunLoop& loop_;
     std::shared_ptr<Shared> shared_;
     std::vector<Event> batch_;
     std::size_t bytes_ = 0;

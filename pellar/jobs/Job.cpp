@@ -6,7 +6,7 @@
 
 namespace pellar {
 
-Job::Job(const ScriptMaker& makeScript, EventReceiver receiver, fixwell::RunLoop& loop)
+Job::Job(const ScriptMaker& makeScript, EventReceiver receiver, contract::RunLoop& loop)
     : road_(loop, std::move(receiver))
 {
     auto script = makeScript(stop_, road_);

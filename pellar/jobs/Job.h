@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
+#include "contract/foundation/RunLoop.h"
 #include "pellar/jobs/EventRoad.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/process/StopSwitch.h"
@@ -15,7 +15,7 @@ namespace pellar {
 /// tell. The loop outlives it.
 class Job {
 public:
-    Job(const ScriptMaker& makeScript, EventReceiver receiver, fixwell::RunLoop& loop);
+    Job(const ScriptMaker& makeScript, EventReceiver receiver, contract::RunLoop& loop);
     Job(const Job&) = delete;
     Job& operator=(const Job&) = delete;
     ~Job();

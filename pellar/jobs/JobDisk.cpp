@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobDisk.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <utility>
 
 namespace pellar {
 
-JobDisk::JobDisk(fixwell::DiskReferencePointer disk, std::optional<DiskClaim> claim,
+JobDisk::JobDisk(contract::DiskReferencePointer disk, std::optional<DiskClaim> claim,
                  std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log)
     : disk_(std::move(disk)),
       claim_(std::move(claim)),
@@ -25,7 +25,7 @@ std::optional<Outcome> JobDisk::take(Access access)
         if (auto refusal = unmount())
             return refusal;
     auto claim = DiskClaim::take(*disk_, access, paths_);
-    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&claim))
+    if (const auto* const error = std::get_if<contract::ErrorCode>(&claim))
         return failedOutcome(*error, {unmounted_ ? "it was unmounted, but could not be opened"
                                                  : "another program has it to itself",
                                       {},
@@ -36,11 +36,11 @@ std::optional<Outcome> JobDisk::take(Access access)
 
 std::optional<Outcome> JobDisk::unmount()
 {
-    log_.step(fixwell::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
+    log_.step(contract::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
     log_.flush();  // what is still to be written may take long
     auto unmounted = UnmountedDisk::take(std::move(mounts_), paths_);
     if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
-        return failedOutcome(fixwell::kPLErrorCouldNotUnmount, *refusal);
+        return failedOutcome(contract::kPLErrorCouldNotUnmount, *refusal);
     unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
     return std::nullopt;
 }
@@ -50,7 +50,7 @@ void JobDisk::giveBack()
     claim_.reset();
     if (!unmounted_)
         return;
-    log_.step(fixwell::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
+    log_.step(contract::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
     for (const Sentence& failure : unmounted_->mountAgain())
         log_.error(failure);
     unmounted_.reset();

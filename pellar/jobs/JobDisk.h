@@ -18,7 +18,7 @@ class JobDisk {
 public:
     /// `claim` is there when the disk was at rest and free as the job began; else `mounts` tells
     /// where it is mounted.
-    JobDisk(fixwell::DiskReferencePointer disk, std::optional<DiskClaim> claim,
+    JobDisk(contract::DiskReferencePointer disk, std::optional<DiskClaim> claim,
             std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log);
 
     /// Why it cannot be had, and then nothing is changed; none when it is the job's. May take long.
@@ -27,14 +27,14 @@ public:
     void giveBack();
 
     /// What it is listed as.
-    const fixwell::DiskReference& reference() const { return *disk_; }
+    const contract::DiskReference& reference() const { return *disk_; }
     /// Between `take` and `giveBack`.
     const DiskClaim& claim() const { return *claim_; }
 
 private:
     std::optional<Outcome> unmount();
 
-    const fixwell::DiskReferencePointer disk_;
+    const contract::DiskReferencePointer disk_;
     std::optional<DiskClaim> claim_;
     std::vector<MountPlace> mounts_;
     std::optional<UnmountedDisk> unmounted_;

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobLog.h"
 
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <filesystem>
 #include <optional>
@@ -11,9 +11,9 @@
 namespace pellar {
 namespace {
 
-using fixwell::Dictionary;
-using fixwell::LinePhrase;
-using fixwell::Name;
+using contract::Dictionary;
+using contract::LinePhrase;
+using contract::Name;
 
 constexpr int errorLevel = -1;  // always shown, as a heading is
 constexpr int mainLevel = 0;
@@ -21,15 +21,15 @@ constexpr int detailLevel = 2;
 
 Dictionary message(Name type, std::string_view text, int verbosity)
 {
-    return Dictionary::of({{fixwell::kFsckMessageType, type},
-                           {fixwell::kFsckMessageString, text},
-                           {fixwell::kFsckVerbosity, verbosity}});
+    return Dictionary::of({{contract::kFsckMessageType, type},
+                           {contract::kFsckMessageString, text},
+                           {contract::kFsckVerbosity, verbosity}});
 }
 
 Dictionary untypedMessage(std::string_view text, int verbosity)
 {
     return Dictionary::of(
-        {{fixwell::kFsckMessageString, text}, {fixwell::kFsckVerbosity, verbosity}});
+        {{contract::kFsckMessageString, text}, {contract::kFsckVerbosity, verbosity}});
 }
 
 struct VerdictLine {
@@ -57,18 +57,18 @@ std::optional<VerdictLine> verdictLineFor(Verdict verdict, Access access)
 
 }  // namespace
 
-std::string shownNameOf(const fixwell::DiskReference& disk, const LineGuard& guard)
+std::string shownNameOf(const contract::DiskReference& disk, const LineGuard& guard)
 {
     const std::string candidates[] = {
-        fixwell::printable(disk.name),
-        fixwell::printable(std::filesystem::path(disk.identifier).filename().string())};
+        contract::printable(disk.name),
+        contract::printable(std::filesystem::path(disk.identifier).filename().string())};
     for (const std::string& name : candidates)
         if (!name.empty() && !guard.isSuspicious(name))
             return name;
     return "volume";
 }
 
-JobLog::JobLog(const fixwell::DiskReference& disk, const Texts& texts, EventRoad& road)
+JobLog::JobLog(const contract::DiskReference& disk, const Texts& texts, EventRoad& road)
     : texts_(texts), road_(road), guard_(texts), diskName_(shownNameOf(disk, guard_))
 {
 }
@@ -91,7 +91,7 @@ void JobLog::step(Name type, std::string_view text)
 // A plain line brings its own line end; a dictionary's text gets one from the module.
 void JobLog::detail(std::string_view line)
 {
-    const std::string text = fixwell::printable(line);
+    const std::string text = contract::printable(line);
     if (guard_.isSuspicious(text))
         add(untypedMessage(text, detailLevel));
     else
@@ -101,14 +101,14 @@ void JobLog::detail(std::string_view line)
 void JobLog::problem(std::string_view line)
 {
     if (problems_.admits(line))
-        add(message(fixwell::kFsckError, fixwell::printable(line), errorLevel));
+        add(message(contract::kFsckError, contract::printable(line), errorLevel));
     else
         detail(line);
 }
 
 void JobLog::error(const Sentence& sentence)
 {
-    add(message(fixwell::kFsckError, text(sentence), errorLevel));
+    add(message(contract::kFsckError, text(sentence), errorLevel));
 }
 
 void JobLog::remark(std::string_view text)
@@ -118,26 +118,26 @@ void JobLog::remark(std::string_view text)
 
 void JobLog::failure(std::string_view text)
 {
-    add(message(fixwell::kFsckFail, text, mainLevel));
+    add(message(contract::kFsckFail, text, mainLevel));
 }
 
 void JobLog::progress(double percentOfRun)
 {
     if (const std::optional<double> percent = meter_.report(percentOfRun, Clock::now()))
-        add(Dictionary::of({{fixwell::kFsckMessageType, fixwell::kFsckProgress},
-                            {fixwell::kFsckParameters, fixwell::Array::of({*percent})}}));
+        add(Dictionary::of({{contract::kFsckMessageType, contract::kFsckProgress},
+                            {contract::kFsckParameters, contract::Array::of({*percent})}}));
 }
 
 void JobLog::endOfRun()
 {
     for (const ProblemLimiter::Remainder& rest : problems_.takeRemainders()) {
         const bool isVarious = rest.kind.empty();
-        Dictionary line = message(fixwell::kFsckError,
+        Dictionary line = message(contract::kFsckError,
                                   texts_.text(isVarious ? "… and more problems of other kinds: %1$@"
                                                         : "… and %1$@ more like “%2$@”"),
                                   errorLevel);
-        line.set(fixwell::kFsckParameters,
-                 fixwell::Array::of({rest.count, fixwell::printable(rest.kind)}));
+        line.set(contract::kFsckParameters,
+                 contract::Array::of({rest.count, contract::printable(rest.kind)}));
         add(std::move(line));
     }
 }
@@ -147,25 +147,25 @@ void JobLog::verdict(Verdict verdict, Access access, bool isForGood)
 {
     if (verdict == Verdict::Damaged && access == Access::ReadOnly && isForGood) {
         const Sentence said{"The volume “%1$@” is damaged.", diskName_, {}};
-        return add(message(fixwell::kFsckError, text(said), mainLevel));
+        return add(message(contract::kFsckError, text(said), mainLevel));
     }
     const auto line = verdictLineFor(verdict, access);
     if (!line)
         return;
-    const std::string said = fixwell::format(texts_.resultText(line->key), {diskName_});
+    const std::string said = contract::format(texts_.resultText(line->key), {diskName_});
     const bool isSuccess = line->meaning == LinePhrase::Success;
     if (guard_.meaningOf(said) == line->meaning)
         road_.add(Message{isSuccess ? said + '\n' : said, {}});
     else  // a translation whose sentence and phrase do not agree
-        add(message(isSuccess ? fixwell::kFsckSuccess : fixwell::kFsckError, said, mainLevel));
+        add(message(isSuccess ? contract::kFsckSuccess : contract::kFsckError, said, mainLevel));
 }
 
-void JobLog::finished(fixwell::ErrorCode mainError, std::int32_t detailError, Name verdict,
+void JobLog::finished(contract::ErrorCode mainError, std::int32_t detailError, Name verdict,
                       const std::string& message)
 {
     road_.add(
         Finished{mainError, detailError,
-                 Dictionary::of({{fixwell::kPLVerdict, verdict}, {fixwell::kPLMessage, message}})});
+                 Dictionary::of({{contract::kPLVerdict, verdict}, {contract::kPLMessage, message}})});
     road_.flush();
 }
 

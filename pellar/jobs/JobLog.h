@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
-#include "pellar/Sentence.h"
+#include "contract/pellar/DiskReference.h"
 #include "pellar/jobs/EventRoad.h"
 #include "pellar/jobs/LineGuard.h"
 #include "pellar/jobs/ProblemLimiter.h"
 #include "pellar/jobs/ProgressMeter.h"
+#include "pellar/texts/Sentence.h"
 #include "pellar/tools/Judgement.h"
 
 #include <string>
@@ -16,13 +16,13 @@ namespace pellar {
 
 /// What the disk is called in messages: its name, fit to be shown; where that holds a phrase that
 /// the module would take for a verdict, the end of its identifier, or just "volume".
-std::string shownNameOf(const fixwell::DiskReference& disk, const LineGuard& guard);
+std::string shownNameOf(const contract::DiskReference& disk, const LineGuard& guard);
 
 /// Writes a job's messages in the forms that the module understands, in the user's language. The
 /// job's thread. `texts` and `road` outlive it.
 class JobLog {
 public:
-    JobLog(const fixwell::DiskReference& disk, const Texts& texts, EventRoad& road);
+    JobLog(const contract::DiskReference& disk, const Texts& texts, EventRoad& road);
 
     const std::string& diskName() const { return diskName_; }
     /// The module ends a plain line itself in jobs that are not about a file system.
@@ -31,7 +31,7 @@ public:
     void started();
     void trace(std::string line);
     /// A step, shown with the details. `type`: kFsckVerify or kFsckRepair.
-    void step(fixwell::Name type, std::string_view text);
+    void step(contract::Name type, std::string_view text);
     /// A line of a tool that says nothing in particular.
     void detail(std::string_view line);
     /// Shown as an error, or as a detail where there are too many of its kind.
@@ -48,7 +48,7 @@ public:
     /// The line by which the module knows the result; none for a verdict without a phrase. What is
     /// damaged for good does not “need to be repaired”.
     void verdict(Verdict verdict, Access access, bool isForGood = false);
-    void finished(fixwell::ErrorCode mainError, std::int32_t detailError, fixwell::Name verdict,
+    void finished(contract::ErrorCode mainError, std::int32_t detailError, contract::Name verdict,
                   const std::string& message);
 
     /// Shows now what was written so far.
@@ -59,7 +59,7 @@ public:
     std::string text(std::string_view key) const { return texts_.text(key); }
 
 private:
-    void add(fixwell::Dictionary dictionary);
+    void add(contract::Dictionary dictionary);
 
     const Texts& texts_;
     EventRoad& road_;

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/JobScript.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/jobs/Meaning.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
@@ -118,20 +118,20 @@ std::optional<Outcome> JobScript::objection() const
     constexpr std::uint64_t smallestVolume = 2048;
     const std::uint64_t available = disk_.claim().availableBytes();
     if (available <= smallestVolume)
-        return failedOutcome(fixwell::kPLErrorUnsupported,
+        return failedOutcome(contract::kPLErrorUnsupported,
                              {"only %1$@ bytes are there, too few for a file system",
                               std::to_string(available),
                               {}});
     if (tool_ == nullptr)
         return withoutTool();
     if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failedOutcome(kPLErrorNoRepairHere, tool_->reasonAgainstRepair);
+        return failedOutcome(contract::kPLErrorNoRepairHere, tool_->reasonAgainstRepair);
     if (volume_.isForeign)
         return failedOutcome(
-            fixwell::kPLErrorUnsupported,
+            contract::kPLErrorUnsupported,
             {"it holds something other than the file system it is listed with", {}, {}});
     if (program_.empty() || (operation_ == Operation::Repair && repairProgram_.empty()))
-        return failedOutcome(fixwell::kPLErrorToolMissing,
+        return failedOutcome(contract::kPLErrorToolMissing,
                              {"%1$@ is not installed (package %2$@)",
                               std::string(program_.empty() ? tool_->name : tool_->repairName),
                               std::string(tool_->package)});
@@ -145,14 +145,14 @@ Outcome JobScript::withoutTool() const
                                             disk_.claim().availableBytes())
                                  .type;
     if (type.empty())
-        return failedOutcome(fixwell::kPLErrorUnsupported,
+        return failedOutcome(contract::kPLErrorUnsupported,
                              {"no file system was found that can be checked", {}, {}});
     const Capability capability = capabilityFor(type, operation_, options_.toolPath);
     return failedOutcome(
-        fixwell::kPLErrorUnsupported,
+        contract::kPLErrorUnsupported,
         capability.isGiven()
             ? Sentence{"its file system looks like “%1$@”, but too little of it is left",
-                       fixwell::printable(type),
+                       contract::printable(type),
                        {}}
             : capability.reason);
 }
@@ -214,7 +214,7 @@ JobScript::State JobScript::look()
 
 JobScript::State JobScript::replay()
 {
-    log_.step(fixwell::kFsckRepair, texts_.text("Replaying the log by mounting the volume"));
+    log_.step(contract::kFsckRepair, texts_.text("Replaying the log by mounting the volume"));
     const std::string filesystem(tool_->habits.logReplayedAs);
     log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
     road_.flush();
@@ -226,7 +226,7 @@ JobScript::State JobScript::replay()
                           : replayLog(filesystem, std::get<DiskForTool>(disk).descriptor());
     if (error != 0)
         return end(notReplayed(error));
-    passes_.push_back({{Verdict::Inconclusive, fixwell::kPLErrorInconclusive, 0, {}, true}, true});
+    passes_.push_back({{Verdict::Inconclusive, contract::kPLErrorInconclusive, 0, {}, true}, true});
     return State::Confirming;
 }
 
@@ -242,9 +242,9 @@ JobScript::State JobScript::repair()
     counts_.cleared += evidence.findings.cleared;
     // The disk went away, or the user did not want more: nothing is left to be confirmed.
     const bool isOver = judgement.verdict == Verdict::Stopped ||
-                        judgement.code == kPLErrorUnreadable ||
-                        judgement.code == fixwell::kPLErrorDiskChanged ||
-                        judgement.code == fixwell::kPLErrorDiskInUse;
+                        judgement.code == contract::kPLErrorUnreadable ||
+                        judgement.code == contract::kPLErrorDiskChanged ||
+                        judgement.code == contract::kPLErrorDiskInUse;
     return isOver ? end(outcomeOfVerification(judgement)) : State::Confirming;
 }
 
@@ -300,7 +300,7 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
         return judgement;
     const auto lost = [&judgement](std::string_view reason) {
         return Judgement{Verdict::Failed,
-                         fixwell::kPLErrorDiskChanged,
+                         contract::kPLErrorDiskChanged,
                          judgement.detail,
                          {reason, {}, {}},
                          false};
@@ -318,9 +318,9 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
 Judgement JobScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
 {
     const bool isAnswer =
-        judgement.code == kPLErrorUnreadable || judgement.code == fixwell::kPLErrorDamaged ||
-        judgement.code == kPLErrorCutShort || judgement.code == fixwell::kPLErrorInconclusive ||
-        judgement.code == fixwell::kPLErrorToolFailed;
+        judgement.code == contract::kPLErrorUnreadable || judgement.code == contract::kPLErrorDamaged ||
+        judgement.code == contract::kPLErrorCutShort || judgement.code == contract::kPLErrorInconclusive ||
+        judgement.code == contract::kPLErrorToolFailed;
     if (obstacle_ || !isAnswer || stop_.isPressed() ||
         std::holds_alternative<NotStarted>(evidence.result.ending))
         return judgement;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobDisk.h"
 #include "pellar/jobs/JobLog.h"
@@ -17,7 +17,7 @@
 namespace pellar {
 
 struct JobRequest {
-    fixwell::DiskReferencePointer disk;
+    contract::DiskReferencePointer disk;
     Operation operation = Operation::Verify;
     std::optional<DiskClaim> claim;  ///< none: the job claims the disk itself, unmounted before
     std::vector<MountPlace> mounts;  ///< where it is mounted, when there is no claim

@@ -10,7 +10,7 @@ namespace {
 std::vector<std::string> localizedPhrases(const Texts& texts)
 {
     std::vector<std::string> phrases;
-    for (const fixwell::ResultPhrase& phrase : fixwell::resultPhrases)
+    for (const contract::ResultPhrase& phrase : contract::resultPhrases)
         phrases.push_back(texts.resultText(phrase.key));
     return phrases;
 }
@@ -18,9 +18,9 @@ std::vector<std::string> localizedPhrases(const Texts& texts)
 std::vector<std::string> suspiciousPhrases(const Texts& texts)
 {
     std::vector<std::string> phrases = localizedPhrases(texts);
-    for (const fixwell::ResultPhrase& phrase : fixwell::resultPhrases)
+    for (const contract::ResultPhrase& phrase : contract::resultPhrases)
         phrases.emplace_back(phrase.key);
-    phrases.emplace_back(fixwell::errorMarker);
+    phrases.emplace_back(contract::errorMarker);
     return phrases;
 }
 
@@ -33,15 +33,15 @@ LineGuard::LineGuard(const Texts& texts)
 
 bool LineGuard::isSuspicious(std::string_view line) const
 {
-    return everything_.firstIn(line) != fixwell::PhraseMatcher::none;
+    return everything_.firstIn(line) != contract::PhraseMatcher::none;
 }
 
-std::optional<fixwell::LinePhrase> LineGuard::meaningOf(std::string_view line) const
+std::optional<contract::LinePhrase> LineGuard::meaningOf(std::string_view line) const
 {
     const std::size_t first = localized_.firstIn(line);
-    if (first == fixwell::PhraseMatcher::none)
+    if (first == contract::PhraseMatcher::none)
         return std::nullopt;
-    return fixwell::resultPhrases[first].meaning;
+    return contract::resultPhrases[first].meaning;
 }
 
 }  // namespace pellar

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/PhraseMatcher.h"
-#include "fixwell/host/pellar/ResultPhrases.h"
-#include "pellar/Texts.h"
+#include "contract/foundation/PhraseMatcher.h"
+#include "contract/pellar/ResultPhrases.h"
+#include "pellar/texts/Texts.h"
 
 #include <optional>
 #include <string_view>
@@ -19,12 +19,12 @@ public:
     /// The line holds a result phrase or the marker of an error, whatever the case.
     bool isSuspicious(std::string_view line) const;
     /// What the module will take the line for; none for an ordinary line.
-    std::optional<fixwell::LinePhrase> meaningOf(std::string_view line) const;
+    std::optional<contract::LinePhrase> meaningOf(std::string_view line) const;
 
 private:
-    fixwell::PhraseMatcher
+    contract::PhraseMatcher
         localized_;  ///< in the module's order, so it answers what the module does
-    fixwell::PhraseMatcher everything_;
+    contract::PhraseMatcher everything_;
 };
 
 }  // namespace pellar

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/LiveScript.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/jobs/DiskNaming.h"
 #include "pellar/jobs/OutcomeReport.h"
 #include "pellar/tools/LiveVerification.h"
@@ -24,7 +24,7 @@ constexpr std::uint64_t anyBytes = ~std::uint64_t{0};
 
 }  // namespace
 
-LiveScript::LiveScript(fixwell::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+LiveScript::LiveScript(contract::DiskReferencePointer disk, std::vector<MountPlace> mounts,
                        const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                        EventRoad& road)
     : disk_(std::move(disk)),
@@ -60,10 +60,10 @@ std::optional<Outcome> LiveScript::findVolume()
 {
     if (const int error = reachVolume())
         return failedOutcome(
-            fixwell::kPLErrorCannotOpen,
+            contract::kPLErrorCannotOpen,
             {"it is mounted, but could not be reached there: %1$@", ::strerrordesc_np(error), {}});
     if (volume_->scrubbedBytes())
-        return failedOutcome(fixwell::kPLErrorToolFailed,
+        return failedOutcome(contract::kPLErrorToolFailed,
                              {"another program is checking it just now", {}, {}});
     return std::nullopt;
 }
@@ -83,7 +83,7 @@ int LiveScript::reachVolume()
             error = *openError;
         } else if (superblock && std::get<MountedBtrfs>(opened).id() == superblock->id) {
             volume_.emplace(std::get<MountedBtrfs>(std::move(opened)));
-            log_.trace("it is verified through " + fixwell::printable(place.target));
+            log_.trace("it is verified through " + contract::printable(place.target));
             return 0;
         }
     }
@@ -94,7 +94,7 @@ Judgement LiveScript::scrub()
 {
     const RunRequest run = request();
     log_.trace("run: " + shown(run.command));
-    log_.step(fixwell::kFsckVerify,
+    log_.step(contract::kFsckVerify,
               log_.text({"Verifying “%1$@” while it stays mounted", log_.diskName(), {}}));
     road_.flush();
     storedBytes_ = volume_->storedBytes();
@@ -102,7 +102,7 @@ Judgement LiveScript::scrub()
     Judgement judgement = judgeScrub(result, report_, volume_->disks());
     if (judgement.verdict != Verdict::Stopped && !isStillThere())
         judgement = {Verdict::Failed,
-                     fixwell::kPLErrorDiskChanged,
+                     contract::kPLErrorDiskChanged,
                      judgement.detail,
                      {"the disk became shorter or unreadable meanwhile", {}, {}},
                      false};

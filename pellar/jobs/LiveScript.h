@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/Outcome.h"
@@ -23,7 +23,7 @@ namespace pellar {
 class LiveScript final : public Script, private RunListener {
 public:
     /// `mounts` is where the disk is mounted, not empty.
-    LiveScript(fixwell::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+    LiveScript(contract::DiskReferencePointer disk, std::vector<MountPlace> mounts,
                const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                EventRoad& road);
 
@@ -45,7 +45,7 @@ private:
     void pause() override { road_.flush(); }
     void tick() override;
 
-    const fixwell::DiskReferencePointer disk_;
+    const contract::DiskReferencePointer disk_;
     const std::vector<MountPlace> mounts_;
     const ManagerOptions& options_;
     const Texts& texts_;

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/MapScript.h"
 
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/partitions/MapOutcome.h"
 #include "pellar/partitions/SavedSectors.h"
 
@@ -19,7 +19,7 @@ namespace {
 constexpr int errorLevel = -1;
 constexpr int mainLevel = 0;
 
-fixwell::Value valueOf(const FindingArgument& argument)
+contract::Value valueOf(const FindingArgument& argument)
 {
     if (const auto* const text = std::get_if<std::string>(&argument))
         return std::string_view(*text);
@@ -29,33 +29,33 @@ fixwell::Value valueOf(const FindingArgument& argument)
     return static_cast<std::int64_t>(number);
 }
 
-fixwell::Array parametersOf(const Finding& finding)
+contract::Array parametersOf(const Finding& finding)
 {
-    const fixwell::Array parameters = fixwell::Array::make();
+    const contract::Array parameters = contract::Array::make();
     for (const FindingArgument& argument : finding.arguments)
         parameters.append(valueOf(argument));
     return parameters;
 }
 
-Sentence reasonOf(fixwell::ErrorCode claimError)
+Sentence reasonOf(contract::ErrorCode claimError)
 {
     switch (claimError) {
-        case fixwell::kPLErrorDiskInUse:
-        case fixwell::kPLErrorCouldNotUnmount:
+        case contract::kPLErrorDiskInUse:
+        case contract::kPLErrorCouldNotUnmount:
             return {"the disk, or a part of it, is mounted or in use", {}, {}};
-        case fixwell::kPLErrorReadOnly: return {"the disk cannot be written", {}, {}};
+        case contract::kPLErrorReadOnly: return {"the disk cannot be written", {}, {}};
         default: return {"the disk cannot be opened", {}, {}};
     }
 }
 
 Outcome stopped()
 {
-    return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}, {}};
+    return {Verdict::Stopped, contract::kPLErrorCancelled, 0, {}, {}};
 }
 
 }  // namespace
 
-MapScript::MapScript(fixwell::DiskReferencePointer disk, Operation operation,
+MapScript::MapScript(contract::DiskReferencePointer disk, Operation operation,
                      const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                      EventRoad& road)
     : disk_(std::move(disk)),
@@ -76,15 +76,15 @@ void MapScript::run()
 
 // udev locks a device while it looks at it, as it does after every change (systemd's "Locking Block
 // Device Access"). That is over in a moment; a mount is not.
-std::variant<MapClaim, fixwell::ErrorCode> MapScript::claim() const
+std::variant<MapClaim, contract::ErrorCode> MapScript::claim() const
 {
     constexpr std::chrono::milliseconds pause{50};
     constexpr int mostTries = 40;
     const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     for (int tries = 1;; ++tries) {
         auto taken = MapClaim::take(*disk_, access, options_.systemPaths);
-        const auto* const error = std::get_if<fixwell::ErrorCode>(&taken);
-        const bool isBusy = error != nullptr && *error == fixwell::kPLErrorDiskInUse;
+        const auto* const error = std::get_if<contract::ErrorCode>(&taken);
+        const bool isBusy = error != nullptr && *error == contract::kPLErrorDiskInUse;
         if (!isBusy || tries == mostTries || stop_.isPressed())
             return taken;
         std::this_thread::sleep_for(pause);
@@ -98,7 +98,7 @@ Outcome MapScript::carryOut()
     const auto taken = claim();
     if (stop_.isPressed())
         return stopped();
-    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&taken))
+    if (const auto* const error = std::get_if<contract::ErrorCode>(&taken))
         return failedOutcome(*error, reasonOf(*error));
     const auto& disk = std::get<MapClaim>(taken);
     const PartitionMap map = disk.readMap();
@@ -145,7 +145,7 @@ bool MapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& out
         return false;
     }
     const std::string directory =
-        fixwell::printable(std::get<std::filesystem::path>(saved).native());
+        contract::printable(std::get<std::filesystem::path>(saved).native());
     log_.remark(
         log_.text(Sentence{"The sectors that are overwritten are kept in %1$@; the "
                            "README.txt there tells how to put them back.",
@@ -201,12 +201,12 @@ void MapScript::tellMap(const PartitionMap& map)
 void MapScript::tell(const Finding& finding)
 {
     const bool isNote = levelOf(finding.kind) == FindingLevel::Note;
-    const fixwell::Dictionary message =
-        fixwell::Dictionary::of({{fixwell::kFsckMessageString, texts_.text(textOf(finding.kind))},
-                                 {fixwell::kFsckVerbosity, isNote ? mainLevel : errorLevel},
-                                 {fixwell::kFsckParameters, parametersOf(finding)}});
+    const contract::Dictionary message =
+        contract::Dictionary::of({{contract::kFsckMessageString, texts_.text(textOf(finding.kind))},
+                                 {contract::kFsckVerbosity, isNote ? mainLevel : errorLevel},
+                                 {contract::kFsckParameters, parametersOf(finding)}});
     if (!isNote)
-        message.set(fixwell::kFsckMessageType, fixwell::kFsckError);
+        message.set(contract::kFsckMessageType, contract::kFsckError);
     road_.add(Message{{}, message});
 }
 
@@ -226,21 +226,21 @@ void MapScript::report(const Outcome& outcome)
         log_.remark(message);
     const Sentence line = mapVerdictLine(outcome.verdict, operation_, log_.diskName());
     if (!line.isEmpty()) {
-        const bool isGood = outcome.code == fixwell::kPLNoError;
+        const bool isGood = outcome.code == contract::kPLNoError;
         road_.add(Message{
             {},
-            fixwell::Dictionary::of(
-                {{fixwell::kFsckMessageType, isGood ? fixwell::kFsckSuccess : fixwell::kFsckError},
-                 {fixwell::kFsckMessageString, line.in(texts_)},
-                 {fixwell::kFsckVerbosity, mainLevel}})});
+            contract::Dictionary::of(
+                {{contract::kFsckMessageType, isGood ? contract::kFsckSuccess : contract::kFsckError},
+                 {contract::kFsckMessageString, line.in(texts_)},
+                 {contract::kFsckVerbosity, mainLevel}})});
     }
     log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
     log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
 }
 
-fixwell::Name MapScript::stepType() const
+contract::Name MapScript::stepType() const
 {
-    return operation_ == Operation::Verify ? fixwell::kFsckVerify : fixwell::kFsckRepair;
+    return operation_ == Operation::Verify ? contract::kFsckVerify : contract::kFsckRepair;
 }
 
 }  // namespace pellar

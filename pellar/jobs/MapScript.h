@@ -15,14 +15,14 @@ namespace pellar {
 /// will be overwritten, writes, and reads and judges it again. The references outlive it.
 class MapScript final : public Script {
 public:
-    MapScript(fixwell::DiskReferencePointer disk, Operation operation,
+    MapScript(contract::DiskReferencePointer disk, Operation operation,
               const ManagerOptions& options, const Texts& texts, StopSwitch& stop, EventRoad& road);
 
     void run() override;
 
 private:
     Outcome carryOut();
-    std::variant<MapClaim, fixwell::ErrorCode> claim() const;
+    std::variant<MapClaim, contract::ErrorCode> claim() const;
     Outcome repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report);
     Outcome write(const MapClaim& claim, const RepairPlan& plan);
     bool save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome);
@@ -30,9 +30,9 @@ private:
     void tell(const Finding& finding);
     void step(Sentence sentence, double percent);
     void report(const Outcome& outcome);
-    fixwell::Name stepType() const;
+    contract::Name stepType() const;
 
-    const fixwell::DiskReferencePointer disk_;
+    const contract::DiskReferencePointer disk_;
     const Operation operation_;
     const ManagerOptions& options_;
     const Texts& texts_;

@@ -30,7 +30,7 @@ Judgement notAttached(const Tool& tool, int error)
                        {}}
             : Sentence{"the volume could not be made a disk of its own for %1$@: %2$@", name,
                        textOf(error)};
-    return {Verdict::Failed, fixwell::kPLErrorCannotOpen, error, reason};
+    return {Verdict::Failed, contract::kPLErrorCannotOpen, error, reason};
 }
 
 Outcome notReplayed(int error)
@@ -41,7 +41,7 @@ Outcome notReplayed(int error)
                        {},
                        {}}
             : Sentence{"its log could not be replayed by mounting it: %1$@", textOf(error), {}};
-    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, error, reason};
+    return {Verdict::Inconclusive, contract::kPLErrorInconclusive, error, reason};
 }
 
 }  // namespace pellar

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/Outcome.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <algorithm>
 
@@ -49,7 +49,7 @@ std::string_view messageKey(const Outcome& outcome, Operation operation)
 
 }  // namespace
 
-Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason)
+Outcome failedOutcome(contract::ErrorCode code, Sentence reason)
 {
     return {Verdict::Failed, code, 0, std::move(reason), {}};
 }
@@ -57,8 +57,8 @@ Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason)
 Outcome outcomeWithoutRepair(const Judgement& judgement)
 {
     Outcome outcome = outcomeOfVerification(judgement);
-    if (outcome.code == fixwell::kPLErrorDamaged)
-        outcome.code = kPLErrorDamagedForGood;
+    if (outcome.code == contract::kPLErrorDamaged)
+        outcome.code = contract::kPLErrorDamagedForGood;
     return outcome;
 }
 
@@ -106,24 +106,24 @@ Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& 
             outcome.reason = outcome.warnings.front();
     } else if (confirmation.verdict == Verdict::Damaged) {
         outcome.code =
-            outcome.code == kPLErrorCutShort ? kPLErrorCutShort : fixwell::kPLErrorNotRepaired;
+            outcome.code == contract::kPLErrorCutShort ? contract::kPLErrorCutShort : contract::kPLErrorNotRepaired;
         if (!passes.empty() && passes.back().judgement.verdict == Verdict::Failed)
             outcome.reason = passes.back().judgement.reason;
     }
     return outcome;
 }
 
-fixwell::Name nameOf(Verdict verdict)
+contract::Name nameOf(Verdict verdict)
 {
     switch (verdict) {
-        case Verdict::Sound: return fixwell::kPLVerdictSound;
-        case Verdict::Damaged: return fixwell::kPLVerdictDamaged;
-        case Verdict::Repaired: return fixwell::kPLVerdictRepaired;
-        case Verdict::Inconclusive: return fixwell::kPLVerdictInconclusive;
+        case Verdict::Sound: return contract::kPLVerdictSound;
+        case Verdict::Damaged: return contract::kPLVerdictDamaged;
+        case Verdict::Repaired: return contract::kPLVerdictRepaired;
+        case Verdict::Inconclusive: return contract::kPLVerdictInconclusive;
         case Verdict::Failed: break;
-        case Verdict::Stopped: return fixwell::kPLVerdictStopped;
+        case Verdict::Stopped: return contract::kPLVerdictStopped;
     }
-    return fixwell::kPLVerdictFailed;
+    return contract::kPLVerdictFailed;
 }
 
 std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Name.h"
-#include "pellar/Texts.h"
+#include "contract/foundation/Name.h"
+#include "pellar/texts/Texts.h"
 #include "pellar/tools/Judgement.h"
 #include "pellar/tools/Operation.h"
 
@@ -16,7 +16,7 @@ namespace pellar {
 /// How a job ended.
 struct Outcome {
     Verdict verdict = Verdict::Failed;
-    fixwell::ErrorCode code = fixwell::kPLErrorToolFailed;
+    contract::ErrorCode code = contract::kPLErrorToolFailed;
     std::int32_t detail = 0;
     Sentence reason;
     /// What a repair cost, to be seen by everybody; `reason` then says the gravest of it.
@@ -48,7 +48,7 @@ std::vector<Sentence> lossesOf(const FileCounts& counts);
 
 inline constexpr std::size_t mostRepairPasses = 5;
 
-Outcome failedOutcome(fixwell::ErrorCode code, Sentence reason);
+Outcome failedOutcome(contract::ErrorCode code, Sentence reason);
 Outcome outcomeOfVerification(const Judgement& judgement);
 /// The same for a kind of volume that is not repaired here: nobody is sent to a repair.
 Outcome outcomeWithoutRepair(const Judgement& judgement);
@@ -60,7 +60,7 @@ bool isWorthAnotherPass(const std::vector<RepairPass>& passes, const Judgement& 
 Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& confirmation,
                         const FileCounts& counts = {});
 
-fixwell::Name nameOf(Verdict verdict);
+contract::Name nameOf(Verdict verdict);
 
 /// One sentence that names the attempt, the disk and the outcome.
 std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/OutcomeReport.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 
 namespace pellar {
 
@@ -15,7 +15,7 @@ void tellOutcome(const Outcome& outcome, Operation operation, const Texts& texts
     else if (!outcome.reason.isEmpty() && outcome.warnings.empty())
         log.remark(message);
     const bool isForGood =
-        outcome.code == kPLErrorDamagedForGood || outcome.code == kPLErrorCutShort;
+        outcome.code == contract::kPLErrorDamagedForGood || outcome.code == contract::kPLErrorCutShort;
     log.verdict(outcome.verdict,
                 operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite, isForGood);
     // What a repair cost is the last word, not the success.

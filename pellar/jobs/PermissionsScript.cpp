@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/PermissionsScript.h"
 
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
-#include "pellar/ErrorCodes.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/permissions/InstalledReferences.h"
 #include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PermissionsOutcome.h"
@@ -26,7 +26,7 @@ constexpr double repairWasTried = 80;
 
 }  // namespace
 
-PermissionsScript::PermissionsScript(fixwell::DiskReferencePointer disk, Operation operation,
+PermissionsScript::PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
                                      const ManagerOptions& options, const Texts& texts,
                                      StopSwitch& stop, EventRoad& road)
     : disk_(std::move(disk)),
@@ -51,13 +51,13 @@ Outcome PermissionsScript::carryOut()
 {
     if (operation_ == Operation::Repair && ::geteuid() != 0)
         return {Verdict::Failed,
-                kPLErrorNotAdministrator,
+                contract::kPLErrorNotAdministrator,
                 0,
                 {"only an administrator may set permissions", {}, {}}};
     const auto root = RootDirectory::open(disk_->mountPoint);
     if (!root)
         return {Verdict::Failed,
-                fixwell::kPLErrorCannotOpen,
+                contract::kPLErrorCannotOpen,
                 errno,
                 {"the root of the system cannot be opened", {}, {}}};
     tellDatabaseIsRead();
@@ -80,7 +80,7 @@ Outcome PermissionsScript::treat(const RootDirectory& root, const References& re
         tally = look(root, references, Pass::Confirm);
     }
     if (!tally)
-        return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
+        return {Verdict::Stopped, contract::kPLErrorCancelled, 0, {}};
     tell(*tally);
     return isRepair ? outcomeOfPermissionsRepair(*tally, restored_)
                     : outcomeOfPermissionsVerification(*tally);
@@ -148,7 +148,7 @@ void PermissionsScript::lookAt(const RootDirectory& root, const Reference& refer
 
 void PermissionsScript::tellUnseen(const Reference& reference, Unseen unseen)
 {
-    const std::string path = fixwell::printable(reference.path);
+    const std::string path = contract::printable(reference.path);
     switch (unseen) {
         case Unseen::Missing:
             log_.detail(log_.text(Sentence{"“%1$@” is not there.", path, {}}));
@@ -191,7 +191,7 @@ bool PermissionsScript::mayBeLentRights(const Reference& reference, const FoundF
             ? "“%1$@”: its content is not the package's, so a repair does not give it these rights."
             : "“%1$@”: it is not known whether its content is the package's, so a repair does not "
               "give it these rights.",
-        fixwell::printable(reference.path),
+        contract::printable(reference.path),
         {}}));
     return false;
 }
@@ -201,7 +201,7 @@ void PermissionsScript::repair(const RootDirectory& root, const Reference& refer
 {
     if (reference.kind && *reference.kind != file.permissions.kind)
         return;
-    const std::string path = fixwell::printable(reference.path);
+    const std::string path = contract::printable(reference.path);
     const Restoring restoring = restore(root, reference, file);
     if (std::holds_alternative<Restored>(restoring)) {
         ++restored_;
@@ -227,9 +227,9 @@ void PermissionsScript::tellDatabaseIsRead()
 {
     step("Reading what the packages say about their files");
     road_.add(Message{{},
-                      fixwell::Dictionary::of(
-                          {{fixwell::kFsckMessageType, fixwell::kFsckProgress},
-                           {fixwell::kFsckParameters, fixwell::Array::of({databaseIsRead})}})});
+                      contract::Dictionary::of(
+                          {{contract::kFsckMessageType, contract::kFsckProgress},
+                           {contract::kFsckParameters, contract::Array::of({databaseIsRead})}})});
     road_.flush();
 }
 
@@ -259,13 +259,13 @@ void PermissionsScript::tellWhatIsMissing(const Tally& tally)
 void PermissionsScript::step(std::string_view key)
 {
     const bool isVerify = operation_ == Operation::Verify;
-    log_.step(isVerify ? fixwell::kFsckVerify : fixwell::kFsckRepair, texts_.text(key));
+    log_.step(isVerify ? contract::kFsckVerify : contract::kFsckRepair, texts_.text(key));
 }
 
 void PermissionsScript::report(const Outcome& outcome)
 {
     const std::string message = permissionsMessageOf(outcome, operation_, log_.diskName(), texts_);
-    if (outcome.code != fixwell::kPLNoError && outcome.verdict != Verdict::Stopped)
+    if (outcome.code != contract::kPLNoError && outcome.verdict != Verdict::Stopped)
         log_.failure(message);
     log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
     log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);

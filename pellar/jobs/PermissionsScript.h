@@ -22,7 +22,7 @@ namespace pellar {
 class PermissionsScript final : public Script {
 public:
     /// Main thread.
-    PermissionsScript(fixwell::DiskReferencePointer disk, Operation operation,
+    PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
                       const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                       EventRoad& road);
 
@@ -46,7 +46,7 @@ private:
     void step(std::string_view key);
     void report(const Outcome& outcome);
 
-    const fixwell::DiskReferencePointer disk_;
+    const contract::DiskReferencePointer disk_;
     const Operation operation_;
     const ManagerOptions& options_;
     const bool fetchesArchives_;

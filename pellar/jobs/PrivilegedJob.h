@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/tools/Operation.h"
 #include "pellar/volumes/DiskClaim.h"
@@ -19,7 +19,7 @@ enum class Subject { Filesystem, PartitionMap, Permissions };
 struct PrivilegedJob {
     Subject subject = Subject::Filesystem;
     Operation operation = Operation::Verify;
-    fixwell::DiskReference disk;
+    contract::DiskReference disk;
     /// The image file of which the disk is a part, as this user has opened it: whoever does the
     /// job may do no more with it. None for a block device.
     std::shared_ptr<const DiskClaim> image;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/ToolRun.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/jobs/DiskNaming.h"
 
 #include <utility>
@@ -131,9 +131,9 @@ void ToolRun::tellToolLines()
     lines_.clear();
 }
 
-fixwell::Name ToolRun::stepType() const
+contract::Name ToolRun::stepType() const
 {
-    return access_ == Access::ReadOnly ? fixwell::kFsckVerify : fixwell::kFsckRepair;
+    return access_ == Access::ReadOnly ? contract::kFsckVerify : contract::kFsckRepair;
 }
 
 }  // namespace pellar

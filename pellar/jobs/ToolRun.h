@@ -40,7 +40,7 @@ private:
     void endIfUnreadable();
     void tellEndOf(const RunResult& result);
     void tellToolLines();
-    fixwell::Name stepType() const;
+    contract::Name stepType() const;
 
     void line(std::string_view line, bool isCut) override;
     void progressLine(std::string_view line) override;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/mounts/Holders.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 #include <fstream>
@@ -92,7 +92,7 @@ std::string shownNames(const std::vector<std::string>& names)
     constexpr std::size_t most = 4;
     std::string text;
     for (std::size_t i = 0; i < names.size() && i < most; ++i)
-        text += (text.empty() ? "" : ", ") + fixwell::printable(names[i]);
+        text += (text.empty() ? "" : ", ") + contract::printable(names[i]);
     return names.size() > most ? text + ", …" : text;
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/mounts/UnmountedDisk.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/mounts/Holders.h"
 
 #include <algorithm>
@@ -33,7 +33,7 @@ int unmountPatiently(const MountCalls& calls, std::size_t index)
 
 Sentence refusal(const MountPlace& place, int error, const SystemPaths& paths)
 {
-    const std::string target = fixwell::printable(place.target);
+    const std::string target = contract::printable(place.target);
     if (error == EPERM || error == EACCES)
         return {"it is mounted at “%1$@”, and only an administrator may unmount it", target, {}};
     if (error != EBUSY)
@@ -54,13 +54,13 @@ Sentence objectionTo(const std::vector<MountPlace>& places)
     for (const MountPlace& place : places)
         if (place.filesystem.starts_with("fuse") || !isWhole)
             return {"it is mounted at “%1$@” in a way that could not be put back (%2$@)",
-                    fixwell::printable(place.target), fixwell::printable(place.filesystem)};
+                    contract::printable(place.target), contract::printable(place.filesystem)};
     return {};
 }
 
 Sentence whyNotHeld(const MountPlace& place, int error, const SystemPaths& paths)
 {
-    const std::string target = fixwell::printable(place.target);
+    const std::string target = contract::printable(place.target);
     if (error == EBUSY)
         return {"it is mounted at “%1$@”, and something else over it", target, {}};
     if (error == EPERM || error == EACCES)
@@ -71,7 +71,7 @@ Sentence whyNotHeld(const MountPlace& place, int error, const SystemPaths& paths
 
 Sentence whyNotMountedAgain(const MountCall& call, int error)
 {
-    const std::string target = fixwell::printable(call.target);
+    const std::string target = contract::printable(call.target);
     if (error == ESTALE)
         return {"It stays unmounted: “%1$@” is no longer the directory at which it was mounted.",
                 target,

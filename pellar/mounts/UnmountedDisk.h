@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/mounts/MountKeeper.h"
 #include "pellar/mounts/MountPlace.h"
+#include "pellar/texts/Sentence.h"
 
 #include <optional>
 #include <utility>

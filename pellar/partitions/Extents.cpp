@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/Extents.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 #include <tuple>
@@ -11,7 +11,7 @@ namespace pellar {
 // A name like "%2$@" must not be taken for a place that the next argument fills.
 std::string partitionLabel(std::uint64_t number, const std::string& name)
 {
-    std::string shown = fixwell::printable(name);
+    std::string shown = contract::printable(name);
     std::replace(shown.begin(), shown.end(), '%', ' ');
     return std::to_string(number) + (shown.empty() ? "" : " “" + shown + "”");
 }

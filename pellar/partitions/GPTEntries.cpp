@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/GPTEntries.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 
@@ -32,12 +32,12 @@ std::string nameIn(ByteView entry)
         const std::uint64_t next =
             i + 1 < nameUnits ? littleEndian(entry, nameOffset + 2 * (i + 1), 2) : 0;
         if (isHighSurrogate(unit) && isLowSurrogate(next)) {
-            fixwell::appendUTF8(
+            contract::appendUTF8(
                 name, static_cast<char32_t>(0x10000 + ((unit - 0xD800) << 10U) + (next - 0xDC00)));
             ++i;
         } else {
             const bool isHalf = isHighSurrogate(unit) || isLowSurrogate(unit);
-            fixwell::appendUTF8(name, isHalf ? U'\uFFFD' : static_cast<char32_t>(unit));
+            contract::appendUTF8(name, isHalf ? U'\uFFFD' : static_cast<char32_t>(unit));
         }
     }
     return name;

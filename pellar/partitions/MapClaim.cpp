@@ -31,23 +31,23 @@ FileDescriptor openClaimed(const DiskClaim& claim)
 
 }  // namespace
 
-std::variant<MapClaim, fixwell::ErrorCode> MapClaim::take(const fixwell::DiskReference& disk,
+std::variant<MapClaim, contract::ErrorCode> MapClaim::take(const contract::DiskReference& disk,
                                                           Access access, const SystemPaths& paths)
 {
     if (access == Access::ReadOnly) {
         auto opened = openDiskForReading(disk);
         if (!opened)
-            return fixwell::kPLErrorCannotOpen;
+            return contract::kPLErrorCannotOpen;
         const std::uint64_t length = lengthOfDisk(opened.get(), disk);
         return MapClaim(std::move(opened), std::nullopt, disk.offset, length);
     }
     auto taken = DiskClaim::take(disk, access, paths);
-    if (const auto* const error = std::get_if<fixwell::ErrorCode>(&taken))
+    if (const auto* const error = std::get_if<contract::ErrorCode>(&taken))
         return *error;
     auto& claim = std::get<DiskClaim>(taken);
     FileDescriptor opened = openClaimed(claim);
     if (!opened)
-        return errno == EBUSY ? fixwell::kPLErrorDiskInUse : fixwell::kPLErrorCannotOpen;
+        return errno == EBUSY ? contract::kPLErrorDiskInUse : contract::kPLErrorCannotOpen;
     const std::uint64_t length = claim.availableBytes();
     return MapClaim(std::move(opened), std::move(claim), disk.offset, length);
 }

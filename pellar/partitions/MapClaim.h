@@ -17,8 +17,8 @@ class MapClaim {
 public:
     /// kPLErrorDiskInUse also when a partition is mounted or in use, kPLErrorReadOnly,
     /// kPLErrorCannotOpen.
-    [[nodiscard]] static std::variant<MapClaim, fixwell::ErrorCode> take(
-        const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
+    [[nodiscard]] static std::variant<MapClaim, contract::ErrorCode> take(
+        const contract::DiskReference& disk, Access access, const SystemPaths& paths);
 
     FileSectors sectors() const;
     [[nodiscard]] PartitionMap readMap() const;

@@ -30,13 +30,13 @@ bool isDisk(int descriptor)
 
 }  // namespace
 
-FileDescriptor openDiskForReading(const fixwell::DiskReference& disk)
+FileDescriptor openDiskForReading(const contract::DiskReference& disk)
 {
     FileDescriptor opened(::open(disk.path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
     return opened && isDisk(opened.get()) ? std::move(opened) : FileDescriptor();
 }
 
-std::uint64_t lengthOfDisk(int descriptor, const fixwell::DiskReference& disk)
+std::uint64_t lengthOfDisk(int descriptor, const contract::DiskReference& disk)
 {
     const off_t end = ::lseek(descriptor, 0, SEEK_END);
     const std::uint64_t size = end < 0 ? 0 : static_cast<std::uint64_t>(end);
@@ -66,7 +66,7 @@ PartitionMap readMapOf(int descriptor, const FileSectors& sectors, std::uint64_t
     return readPartitionMap(sectors, signature.isAmbivalent ? "?" : signature.type);
 }
 
-PartitionMap glanceAtMap(const fixwell::DiskReference& disk)
+PartitionMap glanceAtMap(const contract::DiskReference& disk)
 {
     const FileDescriptor opened = openDiskForReading(disk);
     if (!opened)

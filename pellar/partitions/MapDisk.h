@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "pellar/partitions/FileSectors.h"
 #include "pellar/partitions/PartitionMap.h"
 #include "pellar/process/FileDescriptor.h"
@@ -10,10 +10,10 @@ namespace pellar {
 
 /// None when it cannot be opened, or is neither a device nor a file. Does not wait, and does not
 /// mind that the disk is in use.
-[[nodiscard]] FileDescriptor openDiskForReading(const fixwell::DiskReference& disk);
+[[nodiscard]] FileDescriptor openDiskForReading(const contract::DiskReference& disk);
 
 /// Bytes of the disk that are really there.
-[[nodiscard]] std::uint64_t lengthOfDisk(int descriptor, const fixwell::DiskReference& disk);
+[[nodiscard]] std::uint64_t lengthOfDisk(int descriptor, const contract::DiskReference& disk);
 
 /// A disk in the sectors that its map counts in: those of the device; of an image 512 bytes, or
 /// 4096 where only they fit what stands there. The descriptor outlives the answer. `length` bytes
@@ -26,6 +26,6 @@ namespace pellar {
 
 /// Opens the disk for a look and reads its map; a map of no kind when it cannot be opened. Reads a
 /// few sectors.
-[[nodiscard]] PartitionMap glanceAtMap(const fixwell::DiskReference& disk);
+[[nodiscard]] PartitionMap glanceAtMap(const contract::DiskReference& disk);
 
 }  // namespace pellar

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapOutcome.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 
 #include <cerrno>
 
@@ -29,7 +29,7 @@ std::string_view messageKey(Verdict verdict, bool isRepair)
 Outcome unreadableMap(std::uint64_t sector)
 {
     return {Verdict::Failed,
-            kPLErrorUnreadable,
+            contract::kPLErrorUnreadable,
             EIO,
             {"sector %1$@ cannot be read; copy the disk to another one first (ddrescue)",
              std::to_string(sector),
@@ -46,18 +46,18 @@ Outcome outcomeOfMapVerification(const PartitionMap& map, const MapReport& repor
         return unreadableMap(*map.unreadableSector);
     switch (report.verdict) {
         case MapVerdict::None:
-            return failedOutcome(kPLErrorNoPartitionMap, {"there is no partition map", {}, {}});
-        case MapVerdict::Sound: return {Verdict::Sound, fixwell::kPLNoError, 0, {}, {}};
+            return failedOutcome(contract::kPLErrorNoPartitionMap, {"there is no partition map", {}, {}});
+        case MapVerdict::Sound: return {Verdict::Sound, contract::kPLNoError, 0, {}, {}};
         case MapVerdict::Repairable:
             return {Verdict::Damaged,
-                    kPLErrorMapDamaged,
+                    contract::kPLErrorMapDamaged,
                     0,
                     {"a repair can restore it from the copy that is sound", {}, {}},
                     {}};
         case MapVerdict::NeedsPerson: break;
     }
     return {Verdict::Damaged,
-            kPLErrorMapNeedsPerson,
+            contract::kPLErrorMapNeedsPerson,
             0,
             {"only a person can decide what is right, so no repair will touch it", {}, {}},
             {}};
@@ -70,7 +70,7 @@ Outcome outcomeOfMapRepair(const PartitionMap& map, const MapReport& confirmatio
         outcome.verdict = Verdict::Repaired;
     else if (outcome.verdict == Verdict::Damaged)
         outcome = {Verdict::Damaged,
-                   kPLErrorMapNotRepaired,
+                   contract::kPLErrorMapNotRepaired,
                    0,
                    {"it was written, but is still damaged", {}, {}},
                    {}};
@@ -79,7 +79,7 @@ Outcome outcomeOfMapRepair(const PartitionMap& map, const MapReport& confirmatio
 
 Outcome outcomeOfRefusedRepair(Sentence reason)
 {
-    return {Verdict::Damaged, kPLErrorMapNotRepaired, 0, std::move(reason), {}};
+    return {Verdict::Damaged, contract::kPLErrorMapNotRepaired, 0, std::move(reason), {}};
 }
 
 Sentence mapMessageOf(const Outcome& outcome, Operation operation, const std::string& diskName,

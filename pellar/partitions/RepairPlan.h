@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/partitions/MapReport.h"
+#include "pellar/texts/Sentence.h"
 
 #include <variant>
 

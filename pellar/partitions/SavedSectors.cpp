@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/SavedSectors.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
@@ -40,7 +40,7 @@ std::string fileNameOf(const SectorWrite& write)
 std::string quoted(const fs::path& path)
 {
     std::string text = "'";
-    for (const char character : fixwell::printable(path.native()))
+    for (const char character : contract::printable(path.native()))
         text += character == '\'' ? std::string("'\\''") : std::string(1, character);
     return text + "'";
 }
@@ -108,7 +108,7 @@ std::string instructionsFor(const RepairPlan& plan, const SavedDisk& disk, const
 {
     std::string text =
         "Sectors of a partition map, as they were before it was repaired.\n\nDisk:  " +
-        fixwell::printable(disk.path.native()) +
+        contract::printable(disk.path.native()) +
         "\nDate:  " + dateText(disk.now, "%Y-%m-%d %H:%M:%S UTC") +
         "\nSector size:  " + std::to_string(disk.sectorBytes) + " bytes\n\n";
     for (const SectorWrite& write : plan.writes)

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/partitions/RepairPlan.h"
+#include "pellar/texts/Sentence.h"
 
 #include <chrono>
 #include <filesystem>

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/Comparison.h"
 
-#include "fixwell/host/foundation/Format.h"
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/Format.h"
+#include "contract/foundation/UTF8.h"
 
 namespace pellar {
 namespace {
@@ -22,7 +22,7 @@ std::string_view textOf(FileKind kind)
 std::string accountText(std::uint32_t number, const std::string& name)
 {
     const std::string text = std::to_string(number);
-    return name.empty() ? text : text + " (" + fixwell::printable(name) + ")";
+    return name.empty() ? text : text + " (" + contract::printable(name) + ")";
 }
 
 std::string capabilityText(const std::string& capabilities, const Texts& texts)
@@ -53,7 +53,7 @@ std::vector<std::string> linesOf(const Difference& difference, const Reference& 
     const auto add = [&](std::string_view key, const std::string& found,
                          const std::string& wanted) {
         lines.push_back(
-            fixwell::format(texts.text(key), {fixwell::printable(should.path), found, wanted}));
+            contract::format(texts.text(key), {contract::printable(should.path), found, wanted}));
     };
     if (difference.kind)
         add("“%1$@” is %2$@, should be %3$@; it was not compared.", texts.text(textOf(is.kind)),

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Texts.h"
 #include "pellar/permissions/Accounts.h"
 #include "pellar/permissions/Reference.h"
+#include "pellar/texts/Texts.h"
 
 #include <string>
 #include <vector>

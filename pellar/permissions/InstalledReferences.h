@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/permissions/Accounts.h"
 #include "pellar/permissions/Reference.h"
 #include "pellar/permissions/RootDirectory.h"
 #include "pellar/process/OutputBudget.h"
 #include "pellar/process/StopSwitch.h"
+#include "pellar/texts/Sentence.h"
 
 #include <filesystem>
 #include <string>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/PermissionsOutcome.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 
 namespace pellar {
 namespace {
@@ -11,7 +11,7 @@ const Sentence incomplete{"not all files could be compared; none of the others d
 std::string_view messageKey(const Outcome& outcome, Operation operation)
 {
     const bool isRepair = operation == Operation::Repair;
-    const bool hasFailed = outcome.code != fixwell::kPLNoError;
+    const bool hasFailed = outcome.code != contract::kPLNoError;
     if (outcome.verdict == Verdict::Stopped)
         return isRepair ? "stopped while repairing the permissions on “%1$@”"
                         : "stopped while verifying the permissions on “%1$@”";
@@ -27,7 +27,7 @@ std::string_view messageKey(const Outcome& outcome, Operation operation)
 Outcome nothingCompared()
 {
     return {Verdict::Inconclusive,
-            kPLErrorNoReferences,
+            contract::kPLErrorNoReferences,
             0,
             {"it is not known here what permissions the packages give their files", {}, {}}};
 }
@@ -35,7 +35,7 @@ Outcome nothingCompared()
 Outcome withoutDifferences(const Tally& tally)
 {
     const Verdict verdict = verdictOf(tally);
-    return {verdict, fixwell::kPLNoError, 0,
+    return {verdict, contract::kPLNoError, 0,
             verdict == Verdict::Inconclusive ? incomplete : Sentence{}};
 }
 
@@ -46,7 +46,7 @@ Outcome outcomeOfPermissionsVerification(const Tally& tally)
     if (tally.compared == 0)
         return nothingCompared();
     if (tally.differing > 0)
-        return {Verdict::Damaged, fixwell::kPLNoError, 0,
+        return {Verdict::Damaged, contract::kPLNoError, 0,
                 sentenceAbout(tally.differing, "those of %1$@ file differ",
                               "those of %1$@ files differ")};
     return withoutDifferences(tally);
@@ -57,11 +57,11 @@ Outcome outcomeOfPermissionsRepair(const Tally& afterwards, std::uint64_t restor
     if (afterwards.compared == 0)
         return nothingCompared();
     if (afterwards.differing > 0)
-        return {Verdict::Damaged, kPLErrorPermissionsNotRepaired, 0,
+        return {Verdict::Damaged, contract::kPLErrorPermissionsNotRepaired, 0,
                 sentenceAbout(afterwards.differing, "those of %1$@ file still differ",
                               "those of %1$@ files still differ")};
     if (restored > 0)
-        return {Verdict::Repaired, fixwell::kPLNoError, 0,
+        return {Verdict::Repaired, contract::kPLNoError, 0,
                 sentenceAbout(restored, "%1$@ file was set right", "%1$@ files were set right")};
     return withoutDifferences(afterwards);
 }
@@ -69,8 +69,8 @@ Outcome outcomeOfPermissionsRepair(const Tally& afterwards, std::uint64_t restor
 Outcome outcomeWithoutReferences(const Sentence& reason)
 {
     if (reason.isEmpty())
-        return {Verdict::Stopped, fixwell::kPLErrorCancelled, 0, {}};
-    return {Verdict::Failed, fixwell::kPLErrorToolFailed, 0, reason};
+        return {Verdict::Stopped, contract::kPLErrorCancelled, 0, {}};
+    return {Verdict::Failed, contract::kPLErrorToolFailed, 0, reason};
 }
 
 std::string permissionsMessageOf(const Outcome& outcome, Operation operation,

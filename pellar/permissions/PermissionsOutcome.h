@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Texts.h"
 #include "pellar/jobs/Outcome.h"
 #include "pellar/permissions/Tally.h"
+#include "pellar/texts/Texts.h"
 
 #include <string>
 

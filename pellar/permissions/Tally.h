@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/permissions/Inspection.h"
+#include "pellar/texts/Sentence.h"
 #include "pellar/tools/Judgement.h"
 
 #include <cstdint>

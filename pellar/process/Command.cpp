@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/Command.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/process/TrustedWay.h"
 
 #include <unistd.h>
@@ -15,7 +15,7 @@ std::string shown(const Command& command)
     std::string line = command.executable.string();
     for (const std::string& argument : command.arguments)
         line += ' ' + argument;
-    return fixwell::printable(line);
+    return contract::printable(line);
 }
 
 namespace {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/TrustedWay.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -52,7 +52,7 @@ Opened openChecked(int directory, const std::filesystem::path& name,
     const std::string reason = whyOthersCanChange(status);
     if (reason.empty())
         return opened;
-    return isOnWay ? "“" + fixwell::printable(shown.native()) + "”, on the way there: " + reason
+    return isOnWay ? "“" + contract::printable(shown.native()) + "”, on the way there: " + reason
                    : reason;
 }
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Capability.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "pellar/ErrorCodes.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -11,7 +11,7 @@ namespace {
 
 Capability missing(const Tool& tool, std::string_view name)
 {
-    return {fixwell::kPLErrorToolMissing,
+    return {contract::kPLErrorToolMissing,
             {"%1$@ is not installed (package %2$@)", std::string(name), std::string(tool.package)},
             {}};
 }
@@ -35,11 +35,11 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
 {
     const Tool* const tool = toolFor(filesystemType);
     if (tool == nullptr)
-        return {fixwell::kPLErrorUnsupported,
-                {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
+        return {contract::kPLErrorUnsupported,
+                {objectionTo(filesystemType), contract::printable(filesystemType), {}},
                 {}};
     if (operation == Operation::Repair && !tool->canRepair())
-        return {kPLErrorNoRepairHere, tool->reasonAgainstRepair, {}};
+        return {contract::kPLErrorNoRepairHere, tool->reasonAgainstRepair, {}};
     // A repair is confirmed by verifying, so it needs both.
     std::filesystem::path program = findProgram(tool->name, toolPath);
     if (program.empty())
@@ -48,7 +48,7 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
         program = findProgram(tool->repairName, toolPath);
     if (program.empty())
         return missing(*tool, tool->repairName);
-    return {fixwell::kPLNoError, {}, std::move(program)};
+    return {contract::kPLNoError, {}, std::move(program)};
 }
 
 }  // namespace pellar

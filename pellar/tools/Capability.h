@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "pellar/Sentence.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "pellar/texts/Sentence.h"
 #include "pellar/tools/Operation.h"
 
 #include <filesystem>
@@ -12,11 +12,11 @@ namespace pellar {
 
 /// Whether there is an installed tool that can do something with a kind of file system.
 struct Capability {
-    fixwell::ErrorCode error = fixwell::kPLNoError;
+    contract::ErrorCode error = contract::kPLNoError;
     Sentence reason;                ///< why not; empty when it is given
     std::filesystem::path program;  ///< what would run
 
-    bool isGiven() const { return error == fixwell::kPLNoError; }
+    bool isGiven() const { return error == contract::kPLNoError; }
 };
 
 /// `filesystemType` as libblkid names it; `toolPath` is searched for the tool.

@@ -34,7 +34,7 @@ Judgement judgeStatus(int status, const RunEvidence& evidence)
     if ((status & (usageError | libraryError)) != 0 || (status & ~knownBits) != 0)
         return brokenOff(evidence, status, statusReason);
     if (found.foundDiskInUse && (status & operationalError) != 0)
-        return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
+        return failed(status, {"the disk is in use", {}, {}}, contract::kPLErrorDiskInUse);
     // The file is shorter than the file system: no journal can make up for that.
     if (evidence.volume.isCutShort())
         return cutShort(status);
@@ -52,7 +52,7 @@ Judgement judgeStatus(int status, const RunEvidence& evidence)
         return damaged(status);
     if ((status & operationalError) != 0)
         return found.problems > 0 ? damaged(status) : failed(status, statusReason);
-    return {Verdict::Sound, fixwell::kPLNoError, status, {}};
+    return {Verdict::Sound, contract::kPLNoError, status, {}};
 }
 
 // Exit 0 alone says nothing: -n answers it after "Free blocks count wrong ... Fix? no", and output

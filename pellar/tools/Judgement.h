@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/ErrorCodes.h"
-#include "pellar/Sentence.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "pellar/texts/Sentence.h"
 
 #include <cstdint>
 
@@ -14,7 +14,7 @@ enum class Verdict { Sound, Damaged, Repaired, Inconclusive, Failed, Stopped };
 struct Judgement {
     Verdict verdict = Verdict::Failed;
     /// 0 for Sound; for the others what the job reports when this run decides it.
-    fixwell::ErrorCode code = fixwell::kPLNoError;
+    contract::ErrorCode code = contract::kPLNoError;
     /// The tool's own number: exit status, signal or errno.
     std::int32_t detail = 0;
     /// Why, where the verdict does not say all.

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Judging.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/volumes/DiskBytes.h"
 
 #include <algorithm>
@@ -22,7 +22,7 @@ Judgement judgementOfEnded(const RunEvidence& evidence, std::string_view tool)
                           {}};
     if (hasDamage(evidence))
         return damaged(0, reason);
-    return failed(0, reason, fixwell::kPLErrorToolMisbehaved);
+    return failed(0, reason, contract::kPLErrorToolMisbehaved);
 }
 
 bool hasFindings(const RunEvidence& evidence)
@@ -64,33 +64,33 @@ std::optional<Sentence> obstacle(const RunEvidence& evidence)
 
 Judgement sound(std::int32_t detail)
 {
-    return {Verdict::Sound, fixwell::kPLNoError, detail, {}};
+    return {Verdict::Sound, contract::kPLNoError, detail, {}};
 }
 
 Judgement damaged(std::int32_t detail, Sentence reason)
 {
-    return {Verdict::Damaged, fixwell::kPLErrorDamaged, detail, std::move(reason)};
+    return {Verdict::Damaged, contract::kPLErrorDamaged, detail, std::move(reason)};
 }
 
 Judgement cutShort(std::int32_t detail)
 {
     return {Verdict::Damaged,
-            kPLErrorCutShort,
+            contract::kPLErrorCutShort,
             detail,
             {"its end is missing, and a repair would throw away what lies there", {}, {}}};
 }
 
 Judgement inconclusive(std::int32_t detail, Sentence reason)
 {
-    return {Verdict::Inconclusive, fixwell::kPLErrorInconclusive, detail, std::move(reason)};
+    return {Verdict::Inconclusive, contract::kPLErrorInconclusive, detail, std::move(reason)};
 }
 
 Judgement stopped(std::int32_t detail)
 {
-    return {Verdict::Stopped, fixwell::kPLErrorCancelled, detail, {}};
+    return {Verdict::Stopped, contract::kPLErrorCancelled, detail, {}};
 }
 
-Judgement failed(std::int32_t detail, Sentence reason, fixwell::ErrorCode code)
+Judgement failed(std::int32_t detail, Sentence reason, contract::ErrorCode code)
 {
     return {Verdict::Failed, code, detail, std::move(reason)};
 }
@@ -106,7 +106,7 @@ Judgement unreadable(std::optional<std::uint64_t> byte)
                         "(ddrescue)",
                         {},
                         {}};
-    return failed(EIO, reason, kPLErrorUnreadable);
+    return failed(EIO, reason, contract::kPLErrorUnreadable);
 }
 
 Judgement brokenOff(const RunEvidence& evidence, std::int32_t detail, Sentence reason)
@@ -163,7 +163,7 @@ Judgement judgeVerification(int status, const RunEvidence& evidence, const ExitM
     const VolumeFacts& volume = evidence.volume;
     const bool saysDamaged = std::ranges::find(meanings.damaged, status) != meanings.damaged.end();
     if (evidence.findings.foundDiskInUse && status != 0)
-        return failed(status, {"the disk is in use", {}, {}}, fixwell::kPLErrorDiskInUse);
+        return failed(status, {"the disk is in use", {}, {}}, contract::kPLErrorDiskInUse);
     if (volume.isCutShort())  // no log can make up for what is not there
         return cutShort(status);
     if (const auto reason = obstacle(evidence))

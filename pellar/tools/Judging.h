@@ -17,7 +17,7 @@ Judgement cutShort(std::int32_t detail);
 Judgement inconclusive(std::int32_t detail, Sentence reason);
 Judgement stopped(std::int32_t detail);
 Judgement failed(std::int32_t detail, Sentence reason,
-                 fixwell::ErrorCode code = fixwell::kPLErrorToolFailed);
+                 contract::ErrorCode code = contract::kPLErrorToolFailed);
 
 /// The disk cannot be read at this byte of the volume, where that is known.
 Judgement unreadable(std::optional<std::uint64_t> byte);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/LiveVerification.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 namespace pellar {
 namespace {
@@ -26,8 +26,8 @@ Capability liveCapabilityFor(std::string_view filesystemType, std::string_view t
 {
     if (filesystemType == "btrfs")
         return capabilityFor(filesystemType, Operation::Verify, toolPath);
-    return {fixwell::kPLErrorUnsupported,
-            {objectionTo(filesystemType), fixwell::printable(filesystemType), {}},
+    return {contract::kPLErrorUnsupported,
+            {objectionTo(filesystemType), contract::printable(filesystemType), {}},
             {}};
 }
 

@@ -118,7 +118,7 @@ Judgement judgeNtfs(int status, const RunEvidence& evidence)
                                             checked, {name, damagedStatuses});
     const bool isBackupAlone =
         evidence.volume.differsFromBackup && evidence.findings.problems == 0 && status == 0;
-    if (judgement.code == fixwell::kPLErrorDamaged && !isBackupAlone)
+    if (judgement.code == contract::kPLErrorDamaged && !isBackupAlone)
         judgement.reason = ownSystem;
     // The mark, and a journal that goes with it, are for its own system to deal with: nothing here
     // knows what a check by that would find.

@@ -17,47 +17,47 @@ namespace pellar {
 namespace {
 
 using namespace std::chrono_literals;
-using fixwell::ErrorCode;
+using contract::ErrorCode;
 
 // O_NONBLOCK: opening a FIFO in a disk's place must not wait for its other end. It has no effect
 // on regular files and block devices (open(2)).
-FileDescriptor openDisk(const fixwell::DiskReference& disk, int mode)
+FileDescriptor openDisk(const contract::DiskReference& disk, int mode)
 {
     return FileDescriptor(::open(disk.path.c_str(), mode | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
 }
 
-ErrorCode openError(const fixwell::DiskReference& disk, Access access, int error)
+ErrorCode openError(const contract::DiskReference& disk, Access access, int error)
 {
     if (error == EBUSY || error == ETXTBSY)
-        return fixwell::kPLErrorDiskInUse;
+        return contract::kPLErrorDiskInUse;
     const bool isRefused = error == EACCES || error == EPERM || error == EROFS;
     if (access == Access::ReadWrite && isRefused && openDisk(disk, O_RDONLY))
-        return fixwell::kPLErrorReadOnly;
-    return fixwell::kPLErrorCannotOpen;
+        return contract::kPLErrorReadOnly;
+    return contract::kPLErrorCannotOpen;
 }
 
 /// A device that a mount, a swap area, a RAID or a mapping holds refuses to be opened
 /// exclusively (open(2), O_EXCL on block devices). Only asked: the tool wants it for itself.
-bool isHeldByKernel(const fixwell::DiskReference& disk)
+bool isHeldByKernel(const contract::DiskReference& disk)
 {
     return !openDisk(disk, O_RDONLY | O_EXCL) && errno == EBUSY;
 }
 
-ErrorCode useError(const fixwell::DiskReference& disk, const struct stat& status,
+ErrorCode useError(const contract::DiskReference& disk, const struct stat& status,
                    const SystemPaths& paths)
 {
     // A file that took a device's name is no disk that was meant.
-    if (S_ISREG(status.st_mode) && disk.storage == fixwell::DiskReference::Storage::BlockDevice)
-        return fixwell::kPLErrorCannotOpen;
+    if (S_ISREG(status.st_mode) && disk.storage == contract::DiskReference::Storage::BlockDevice)
+        return contract::kPLErrorCannotOpen;
     if (S_ISREG(status.st_mode))
         return loopDeviceOn(status.st_dev, status.st_ino, paths).empty()
-                   ? fixwell::kPLNoError
-                   : fixwell::kPLErrorDiskInUse;
+                   ? contract::kPLNoError
+                   : contract::kPLErrorDiskInUse;
     if (!S_ISBLK(status.st_mode))
-        return fixwell::kPLErrorCannotOpen;
+        return contract::kPLErrorCannotOpen;
     if (isMounted(status.st_rdev, paths))
-        return fixwell::kPLErrorCouldNotUnmount;
-    return isHeldByKernel(disk) ? fixwell::kPLErrorDiskInUse : fixwell::kPLNoError;
+        return contract::kPLErrorCouldNotUnmount;
+    return isHeldByKernel(disk) ? contract::kPLErrorDiskInUse : contract::kPLNoError;
 }
 
 /// NO when somebody else has it. Some network file systems know no locks; that is no reason to
@@ -78,20 +78,20 @@ std::uint64_t sizeOf(int descriptor)
 }  // namespace
 
 std::variant<DiskClaim, ErrorCode, DiskClaim::Locked> DiskClaim::attempt(
-    const fixwell::DiskReference& disk, Access access, const SystemPaths& paths)
+    const contract::DiskReference& disk, Access access, const SystemPaths& paths)
 {
     FileDescriptor opened = openDisk(disk, access == Access::ReadOnly ? O_RDONLY : O_RDWR);
     if (!opened)
         return openError(disk, access, errno);
     struct stat status = {};
     if (::fstat(opened.get(), &status) != 0)
-        return fixwell::kPLErrorCannotOpen;
+        return contract::kPLErrorCannotOpen;
     if (const ErrorCode error = useError(disk, status, paths))
         return error;
     if (!lock(opened.get(), access)) {
         if (S_ISBLK(status.st_mode))
             return Locked{};
-        return fixwell::kPLErrorDiskInUse;
+        return contract::kPLErrorDiskInUse;
     }
     // Whoever attaches an image holds the lock until it is attached, which may just have been.
     if (const ErrorCode error = useError(disk, status, paths))
@@ -99,7 +99,7 @@ std::variant<DiskClaim, ErrorCode, DiskClaim::Locked> DiskClaim::attempt(
     return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
 }
 
-std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference& disk,
+std::variant<DiskClaim, ErrorCode> DiskClaim::take(const contract::DiskReference& disk,
                                                    Access access, const SystemPaths& paths)
 {
     constexpr int attempts = 50;
@@ -111,7 +111,7 @@ std::variant<DiskClaim, ErrorCode> DiskClaim::take(const fixwell::DiskReference&
             return *error;
         std::this_thread::sleep_for(20ms);
     }
-    return fixwell::kPLErrorDiskInUse;
+    return contract::kPLErrorDiskInUse;
 }
 
 DiskClaim::DiskClaim(FileDescriptor disk, std::filesystem::path path, std::uint64_t offset,

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
-#include "fixwell/host/pellar/ErrorCodes.h"
+#include "contract/pellar/DiskReference.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/process/Access.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/volumes/SystemPaths.h"
@@ -25,11 +25,11 @@ public:
     /// An error code when the disk is in use (kPLErrorCouldNotUnmount: mounted;
     /// kPLErrorDiskInUse: held by the kernel, or an image that is locked or attached as a loop
     /// device), when it cannot be opened, or is no disk at all. Does not wait.
-    [[nodiscard]] static std::variant<DiskClaim, fixwell::ErrorCode, Locked> attempt(
-        const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
+    [[nodiscard]] static std::variant<DiskClaim, contract::ErrorCode, Locked> attempt(
+        const contract::DiskReference& disk, Access access, const SystemPaths& paths);
     /// The same; a locked device is waited for, a second at most, and is then in use.
-    [[nodiscard]] static std::variant<DiskClaim, fixwell::ErrorCode> take(
-        const fixwell::DiskReference& disk, Access access, const SystemPaths& paths);
+    [[nodiscard]] static std::variant<DiskClaim, contract::ErrorCode> take(
+        const contract::DiskReference& disk, Access access, const SystemPaths& paths);
 
     int descriptor() const { return disk_.get(); }
     std::uint64_t offset() const { return offset_; }

@@ -86,7 +86,7 @@ TEST_F(HotPlugTest, TheEmptyLogSaysWhyNothingCanBeDone)
     DiskTree disk;
     disk.facts.identifier = "/dev/none";
     disk.facts.type = diskType::bareVolume;
-    disk.facts.storage = fixwell::DiskReference::Storage::BlockDevice;
+    disk.facts.storage = contract::DiskReference::Storage::BlockDevice;
     disk.facts.filesystem = "ext4";
     const EmptyNote* const note = session().activeTab()->interface()->emptyNote();
     ASSERT_NE(note, nullptr);
@@ -120,7 +120,7 @@ TEST_F(HotPlugTest, ADiskThatGoesDuringItsJobIsListedUntilTheEnd)
     disk.facts.identifier = device.name();
     disk.facts.displayName = "stick";
     disk.facts.type = diskType::bareVolume;
-    disk.facts.storage = fixwell::DiskReference::Storage::BlockDevice;
+    disk.facts.storage = contract::DiskReference::Storage::BlockDevice;
     disk.facts.path = disk.facts.identifier;
     disk.facts.length = 8 << 20;
     disk.facts.filesystem = "ext4";

@@ -14,7 +14,7 @@
 namespace orvane::desktop::test {
 namespace {
 
-using Wait = fixwell::RunLoop::Wait;
+using Wait = contract::RunLoop::Wait;
 
 constexpr int longestWait = 30'000;  // milliseconds
 

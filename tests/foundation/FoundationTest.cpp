@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/Format.h"
-#include "fixwell/host/foundation/Lock.h"
-#include "fixwell/host/foundation/PhraseMatcher.h"
-#include "fixwell/host/foundation/RichText.h"
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/Format.h"
+#include "contract/foundation/Lock.h"
+#include "contract/foundation/PhraseMatcher.h"
+#include "contract/foundation/RichText.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/foundation/UTF8.h"
 
 #include <gtest/gtest.h>
 
@@ -15,7 +15,7 @@
 
 #include <random>
 
-namespace fixwell {
+namespace contract {
 namespace {
 
 struct Counted final : Object {
@@ -238,4 +238,4 @@ TEST(Locks, MayBeGivenBackByOneWhoDidNotGetThem)
     EXPECT_TRUE(lock.tryLock());
 }
 
-}  // namespace fixwell
+}  // namespace contract

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/module/FakeHost.h"
 
-#include "fixwell/host/foundation/Format.h"
+#include "contract/foundation/Format.h"
 
 namespace fixwell::testing {
 

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVModule.h"
+#include "contract/support/OVModule.h"
+#include "fixwell/Contract.h"
 
 #include <algorithm>
 #include <functional>

@@ -13,24 +13,24 @@
 namespace {
 
 using namespace pellar;
-using fixwell::ErrorCode;
+using contract::ErrorCode;
 
 ErrorCode claimError(const std::filesystem::path& path, Access access = Access::ReadOnly,
                      const SystemPaths& paths = {})
 {
     const auto claim = DiskClaim::take(*test::reference(path), access, paths);
     const auto* const error = std::get_if<ErrorCode>(&claim);
-    return error == nullptr ? fixwell::kPLNoError : *error;
+    return error == nullptr ? contract::kPLNoError : *error;
 }
 
 TEST(DiskClaim, RefusesWhatIsNoDisk)
 {
     const test::Workshop workshop;
-    EXPECT_EQ(claimError(workshop.path("nothing")), fixwell::kPLErrorCannotOpen);
-    EXPECT_EQ(claimError(workshop.path("")), fixwell::kPLErrorCannotOpen) << "a directory";
+    EXPECT_EQ(claimError(workshop.path("nothing")), contract::kPLErrorCannotOpen);
+    EXPECT_EQ(claimError(workshop.path("")), contract::kPLErrorCannotOpen) << "a directory";
     ASSERT_EQ(::mkfifo(workshop.path("fifo").c_str(), 0600), 0);
-    EXPECT_EQ(claimError(workshop.path("fifo")), fixwell::kPLErrorCannotOpen);
-    EXPECT_EQ(claimError("/dev/zero"), fixwell::kPLErrorCannotOpen);
+    EXPECT_EQ(claimError(workshop.path("fifo")), contract::kPLErrorCannotOpen);
+    EXPECT_EQ(claimError("/dev/zero"), contract::kPLErrorCannotOpen);
 }
 
 TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
@@ -40,11 +40,11 @@ TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
     const auto disk = test::reference(workshop.path("disk"));
     {
         const auto reader = DiskClaim::take(*disk, Access::ReadOnly, {});
-        EXPECT_EQ(claimError(disk->path), fixwell::kPLNoError);
-        EXPECT_EQ(claimError(disk->path, Access::ReadWrite), fixwell::kPLErrorDiskInUse);
+        EXPECT_EQ(claimError(disk->path), contract::kPLNoError);
+        EXPECT_EQ(claimError(disk->path, Access::ReadWrite), contract::kPLErrorDiskInUse);
     }
     const auto writer = DiskClaim::take(*disk, Access::ReadWrite, {});
-    EXPECT_EQ(claimError(disk->path), fixwell::kPLErrorDiskInUse);
+    EXPECT_EQ(claimError(disk->path), contract::kPLErrorDiskInUse);
 }
 
 TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
@@ -58,8 +58,8 @@ TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
     workshop.write("block/loop0/loop/backing_file", workshop.path("second name").string() + "\n");
     const SystemPaths paths{workshop.path("block"), "/proc/self/mountinfo"};
     EXPECT_EQ(claimError(workshop.path("disk"), Access::ReadOnly, paths),
-              fixwell::kPLErrorDiskInUse);
-    EXPECT_EQ(claimError(workshop.path("other"), Access::ReadOnly, paths), fixwell::kPLNoError);
+              contract::kPLErrorDiskInUse);
+    EXPECT_EQ(claimError(workshop.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
 }
 
 // The device manager locks a device while it looks at it, and the main thread waits for nobody.
@@ -77,12 +77,12 @@ TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
         ASSERT_EQ(::flock(other.get(), LOCK_EX), 0);
         test::Bench bench;
         const auto begun = bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
-        EXPECT_EQ(begun, fixwell::kPLNoError);
+        EXPECT_EQ(begun, contract::kPLNoError);
         EXPECT_EQ(DiskClaim::attempt(*disk, Access::ReadOnly, {}).index(), 2U) << "locked still";
         if (isLetGo)
             ::flock(other.get(), LOCK_UN);
         bench.finish(begun);
-        EXPECT_EQ(bench.listener.error, isLetGo ? fixwell::kPLNoError : fixwell::kPLErrorDiskInUse);
+        EXPECT_EQ(bench.listener.error, isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
     }
 }
 

@@ -103,11 +103,11 @@ TEST(E2fsckVerdict, WeighsWhatWeKnowBesides)
     run.result.cause = StopCause::TooMuchOutput;
     EXPECT_EQ(judge(run).verdict, Verdict::Damaged) << "what it had found stands";
     run.findings = {};
-    EXPECT_EQ(judge(run).code, fixwell::kPLErrorToolMisbehaved);
+    EXPECT_EQ(judge(run).code, contract::kPLErrorToolMisbehaved);
 
     Findings inUse;
     inUse.foundDiskInUse = true;
-    EXPECT_EQ(judge(evidence(Exited{8}, inUse)).code, fixwell::kPLErrorDiskInUse);
+    EXPECT_EQ(judge(evidence(Exited{8}, inUse)).code, contract::kPLErrorDiskInUse);
 }
 
 TEST(E2fsckVerdict, OfRepairingRuns)

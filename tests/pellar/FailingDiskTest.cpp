@@ -4,7 +4,7 @@
 
 #include "tests/support/FailingDisk.h"
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 #include "tests/support/VolumeStates.h"
@@ -83,7 +83,7 @@ protected:
 void expectAdviceToCopy(const test::Listener& heard, std::string_view because)
 {
     EXPECT_EQ(heard.verdict, "failed") << because << ": " << heard.message;
-    EXPECT_EQ(heard.error, kPLErrorUnreadable) << because;
+    EXPECT_EQ(heard.error, contract::kPLErrorUnreadable) << because;
     EXPECT_NE(heard.message.find("ddrescue"), std::string::npos) << heard.message;
     EXPECT_FALSE(heard.hasPlainLine("needs to be repaired.")) << because;
 }
@@ -105,7 +105,7 @@ TEST_F(FailingDiskTest, IsNeitherDamagedNorWrittenTo)
             const std::string because =
                 std::string(place.filesystem) + ", " + std::string(place.because);
             if (repairs && place.filesystem == "btrfs" && isListed)
-                EXPECT_EQ(bench.listener.error, kPLErrorNoRepairHere) << because;
+                EXPECT_EQ(bench.listener.error, contract::kPLErrorNoRepairHere) << because;
             else
                 expectAdviceToCopy(bench.listener, because);
             EXPECT_FALSE(failing.wasWritten()) << because;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -29,7 +29,7 @@ struct Stage {
     }
 
     test::Workshop workshop;
-    fixwell::DiskReferencePointer disk;
+    contract::DiskReferencePointer disk;
     test::Bench bench;
     test::Listener& heard = bench.listener;
 };
@@ -54,24 +54,24 @@ TEST(Job, VerifyAnswersWhatIsTrue)
 {
     struct Case {
         std::string script;
-        fixwell::ErrorCode error;
+        contract::ErrorCode error;
         std::string_view verdict;
         std::string_view because;
     };
     for (const Case& c :
          {Case{soundRun, 0, "sound", "all is said"},
-          Case{"say Pass 1: Checking inodes, blocks, and sizes\n", fixwell::kPLErrorInconclusive,
+          Case{"say Pass 1: Checking inodes, blocks, and sizes\n", contract::kPLErrorInconclusive,
                "inconclusive", "it never came to the end"},
-          Case{"", fixwell::kPLErrorInconclusive, "inconclusive", "it said nothing"},
-          Case{soundRun + "exit 16", fixwell::kPLErrorToolFailed, "failed", "usage"},
-          Case{soundRun + "kill 9", fixwell::kPLErrorToolFailed, "failed", "killed"},
-          Case{soundRun + "shrink 4194304", fixwell::kPLErrorDiskChanged, "failed",
+          Case{"", contract::kPLErrorInconclusive, "inconclusive", "it said nothing"},
+          Case{soundRun + "exit 16", contract::kPLErrorToolFailed, "failed", "usage"},
+          Case{soundRun + "kill 9", contract::kPLErrorToolFailed, "failed", "killed"},
+          Case{soundRun + "shrink 4194304", contract::kPLErrorDiskChanged, "failed",
                "the file shrank below it"},
-          Case{"flood-lines", fixwell::kPLErrorDamaged, "damaged", "problems without end"},
-          Case{"flood-bytes", fixwell::kPLErrorToolMisbehaved, "failed", "noise without end"}}) {
+          Case{"flood-lines", contract::kPLErrorDamaged, "damaged", "problems without end"},
+          Case{"flood-bytes", contract::kPLErrorToolMisbehaved, "failed", "noise without end"}}) {
         Stage stage(c.script, fewLines());
         // The claim is read-only, so the tool needs write access of its own to cut the file.
-        EXPECT_EQ(stage.bench.verify(stage.disk), fixwell::kPLNoError) << c.because;
+        EXPECT_EQ(stage.bench.verify(stage.disk), contract::kPLNoError) << c.because;
         EXPECT_EQ(stage.heard.error, c.error) << c.because;
         EXPECT_EQ(stage.heard.verdict, c.verdict) << c.because;
         EXPECT_FALSE(stage.heard.message.empty()) << c.because;
@@ -86,7 +86,7 @@ TEST(Job, ARepairIsEndedWhereTheDiskCannotBeRead)
         "say-in-repair Error reading block 5 (Input/output error).  Ignore error? yes\n"
         "await-in-repair never\nexit 4");
     ASSERT_EQ(stage.bench.repair(stage.disk), 0);
-    EXPECT_EQ(stage.heard.error, kPLErrorUnreadable) << stage.heard.message;
+    EXPECT_EQ(stage.heard.error, contract::kPLErrorUnreadable) << stage.heard.message;
     EXPECT_EQ(stage.heard.verdict, "failed");
     expectOneEnd(stage);
 }
@@ -95,8 +95,8 @@ TEST(Job, FloodIsEndedWithASentence)
 {
     Stage stage("flood-lines", fewLines());
     ASSERT_EQ(stage.bench.verify(stage.disk), 0);
-    EXPECT_EQ(stage.heard.textsOf(fixwell::kFsckFail).size(), 1U);
-    EXPECT_EQ(stage.heard.textsOf(fixwell::kFsckError).size(), 11U) << "ten, and how many more";
+    EXPECT_EQ(stage.heard.textsOf(contract::kFsckFail).size(), 1U);
+    EXPECT_EQ(stage.heard.textsOf(contract::kFsckError).size(), 11U) << "ten, and how many more";
 }
 
 TEST(Job, CancelIsHeardAndReported)
@@ -110,7 +110,7 @@ TEST(Job, CancelIsHeardAndReported)
             press();
     };
     ASSERT_EQ(stage.bench.verify(stage.disk), 0);
-    EXPECT_EQ(stage.heard.error, fixwell::kPLErrorCancelled);
+    EXPECT_EQ(stage.heard.error, contract::kPLErrorCancelled);
     EXPECT_EQ(stage.heard.verdict, "stopped");
     press();  // nothing runs
     expectOneEnd(stage);
@@ -146,34 +146,34 @@ TEST(Job, MayBeDestroyedByTheOneWhoHearsIt)
 TEST(Job, TheNextMayBeginInTheFinishedOfTheLast)
 {
     Stage stage(soundRun);
-    fixwell::ErrorCode second = -1;
+    contract::ErrorCode second = -1;
     stage.heard.onFinished = [&] {
         if (stage.heard.finished == 1)
             second = stage.bench.tool->beginStoragesystemFilesystemRepairForDisk(stage.disk);
     };
     ASSERT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk), 0);
     EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(stage.disk),
-              fixwell::kPLErrorBusy);
+              contract::kPLErrorBusy);
     ASSERT_TRUE(stage.bench.loop.runUntil([&] { return stage.heard.finished == 2; }));
-    EXPECT_EQ(second, fixwell::kPLNoError);
+    EXPECT_EQ(second, contract::kPLNoError);
     EXPECT_EQ(stage.heard.verdict, "sound");
 }
 
 TEST(Job, RefusesBeforeItStarts)
 {
     Stage stage(soundRun);
-    const auto begin = [&stage](const fixwell::DiskReference& disk) {
+    const auto begin = [&stage](const contract::DiskReference& disk) {
         return stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(
-            std::make_shared<fixwell::DiskReference>(disk));
+            std::make_shared<contract::DiskReference>(disk));
     };
-    fixwell::DiskReference disk = *stage.disk;
+    contract::DiskReference disk = *stage.disk;
     disk.isWhole = true;
-    EXPECT_EQ(begin(disk), fixwell::kPLErrorUnsupported);
+    EXPECT_EQ(begin(disk), contract::kPLErrorUnsupported);
     disk = *stage.disk;
     disk.path.clear();
-    EXPECT_EQ(begin(disk), fixwell::kPLErrorNoDiskReference);
+    EXPECT_EQ(begin(disk), contract::kPLErrorNoDiskReference);
     EXPECT_EQ(stage.bench.tool->beginStoragesystemFilesystemVerifyForDisk(nullptr),
-              fixwell::kPLErrorNoDiskReference);
+              contract::kPLErrorNoDiskReference);
     stage.bench.loop.drain();
     EXPECT_EQ(stage.heard.started, 0) << "a refused begin calls nobody back";
 }
@@ -185,18 +185,18 @@ TEST(Job, SaysWhyThereIsNoWay)
     std::filesystem::remove(stage.workshop.path("tools/e2fsck"));
     struct Case {
         std::string_view filesystem;
-        fixwell::ErrorCode error;
+        contract::ErrorCode error;
         std::string_view says;
     };
     for (const Case& c :
-         {Case{"%@fs", fixwell::kPLErrorUnsupported, "no tool for the file system “%@fs”"},
-          Case{"swap", fixwell::kPLErrorUnsupported, "it is swap space"},
-          Case{"crypto_LUKS", fixwell::kPLErrorUnsupported, "it is encrypted"},
-          Case{"ext4", fixwell::kPLErrorToolMissing,
+         {Case{"%@fs", contract::kPLErrorUnsupported, "no tool for the file system “%@fs”"},
+          Case{"swap", contract::kPLErrorUnsupported, "it is swap space"},
+          Case{"crypto_LUKS", contract::kPLErrorUnsupported, "it is encrypted"},
+          Case{"ext4", contract::kPLErrorToolMissing,
                "e2fsck is not installed (package e2fsprogs)"}}) {
-        fixwell::DiskReference disk = *stage.disk;
+        contract::DiskReference disk = *stage.disk;
         disk.filesystem = c.filesystem;
-        ASSERT_EQ(stage.bench.repair(std::make_shared<fixwell::DiskReference>(disk)), 0);
+        ASSERT_EQ(stage.bench.repair(std::make_shared<contract::DiskReference>(disk)), 0);
         EXPECT_EQ(stage.heard.error, c.error) << c.filesystem;
         EXPECT_NE(stage.heard.message.find(c.says), std::string::npos) << stage.heard.message;
         EXPECT_FALSE(stage.bench.manager.canRepair(c.filesystem));
@@ -253,8 +253,8 @@ TEST(Job, IsToldThatAWritingToolComesToItsEndBeforeItStops)
     EXPECT_EQ(
         std::count_if(
             bench.listener.dictionaries.begin(), bench.listener.dictionaries.end(),
-            [](const fixwell::Dictionary& message) {
-                return message.string(fixwell::kFsckMessageString).find("fsck.fat is writing") !=
+            [](const contract::Dictionary& message) {
+                return message.string(contract::kFsckMessageString).find("fsck.fat is writing") !=
                        std::string::npos;
             }),
         1);
@@ -266,9 +266,9 @@ TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
     test::Bench bench(stage.options);
     ASSERT_EQ(bench.repair(test::reference(stage.workshop.path("disk"), "vfat")), 0);
     EXPECT_EQ(bench.listener.verdict, "damaged") << "it never says that it has changed anything";
-    EXPECT_EQ(bench.listener.textsOf(fixwell::kFsckError).size(), 2U)
+    EXPECT_EQ(bench.listener.textsOf(contract::kFsckError).size(), 2U)
         << "once before the repair, and once for what is left";
-    EXPECT_EQ(bench.listener.textsOf(fixwell::kFsckRepair).size(), 1U) << "one pass is enough";
+    EXPECT_EQ(bench.listener.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";
 }
 
 TEST(Job, ProgressOnlyGrows)

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
 #include "pellar/jobs/DiskNaming.h"
 #include "pellar/jobs/JobLog.h"
 #include "tests/pellar/Workshop.h"
@@ -36,7 +36,7 @@ struct Scene {
 
     test::TestLoop loop;
     test::Listener listener;
-    fixwell::DiskReferencePointer disk;
+    contract::DiskReferencePointer disk;
     EventRoad road;
     JobLog log;
 };
@@ -51,7 +51,7 @@ TEST(JobLog, LetsNothingPassForAVerdict)
         scene.deliver();
         EXPECT_TRUE(scene.listener.plainLines.empty()) << hostile;
         ASSERT_EQ(scene.listener.dictionaries.size(), 1U) << hostile;
-        EXPECT_EQ(scene.listener.dictionaries[0].integer(fixwell::kFsckVerbosity), 2) << hostile;
+        EXPECT_EQ(scene.listener.dictionaries[0].integer(contract::kFsckVerbosity), 2) << hostile;
     }
 }
 
@@ -62,7 +62,7 @@ TEST(JobLog, ShowsNoControlCharacters)
     scene.log.problem("\x1b[2Jgone");
     scene.deliver();
     EXPECT_EQ(scene.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
-    EXPECT_EQ(scene.listener.textsOf(fixwell::kFsckError),
+    EXPECT_EQ(scene.listener.textsOf(contract::kFsckError),
               std::vector<std::string>{"\uFFFD[2Jgone"});
 }
 
@@ -78,7 +78,7 @@ TEST(JobLog, NamesTheDiskSoThatItCannotLie)
          {Case{"My Disk", "/dev/sdb1", "My Disk"},
           Case{"it appears to be ok.", "/dev/sdb1", "sdb1"}, Case{"", "/dev/sdb1", "sdb1"},
           Case{"[31mred", "/x/needs to be repaired.", "volume"}, Case{"a\nb", "x", "a\uFFFDb"}}) {
-        fixwell::DiskReference disk;
+        contract::DiskReference disk;
         disk.name = c.name;
         disk.identifier = c.identifier;
         EXPECT_EQ(shownNameOf(disk, guard), c.shown);
@@ -121,7 +121,7 @@ TEST(JobLog, VerdictSurvivesAnIncompleteTranslation)
     Scene scene(texts);
     scene.log.verdict(Verdict::Sound, Access::ReadOnly);
     scene.deliver();
-    EXPECT_EQ(scene.listener.textsOf(fixwell::kFsckSuccess),
+    EXPECT_EQ(scene.listener.textsOf(contract::kFsckSuccess),
               std::vector<std::string>{"Das Volume „Disk“ ist in Ordnung."});
 }
 
@@ -137,12 +137,12 @@ TEST(JobLog, KeepsTenThousandProblemsReadable)
         scene.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
     scene.log.endOfRun();
     scene.deliver();
-    const auto errors = scene.listener.textsOf(fixwell::kFsckError);
+    const auto errors = scene.listener.textsOf(contract::kFsckError);
     EXPECT_EQ(errors.size(), ProblemLimiter::shownInAll + 2);
     EXPECT_EQ(errors[100], "… and %1$@ more like “%2$@”");
     EXPECT_EQ(scene.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
         << "nothing is lost in the detailed log";
-    const fixwell::Array rest = scene.listener.dictionaries[100][fixwell::kFsckParameters].array();
+    const contract::Array rest = scene.listener.dictionaries[100][contract::kFsckParameters].array();
     EXPECT_EQ(rest.at(0).integer(), 9990);
     EXPECT_EQ(rest.at(1).string(), "Inode # ref count is #, should be #.");
 }

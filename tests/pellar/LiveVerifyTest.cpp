@@ -114,7 +114,7 @@ protected:
 
     fs::path image() const { return workshop_.path("image"); }
     fs::path place() const { return workshop_.path("home"); }
-    fixwell::DiskReferencePointer disk() const { return test::reference(device_->name(), "btrfs"); }
+    contract::DiskReferencePointer disk() const { return test::reference(device_->name(), "btrfs"); }
     std::unique_ptr<test::Bench> bench() const
     {
         ManagerOptions options;

@@ -59,7 +59,7 @@ protected:
         ::stat(device_->name().c_str(), &status);
         return mountPlacesOf(status.st_rdev, {});
     }
-    fixwell::DiskReferencePointer disk() const { return test::reference(device_->name()); }
+    contract::DiskReferencePointer disk() const { return test::reference(device_->name()); }
     /// A program that verifies the disk is killed while it is unmounted.
     void expectMountedAgainAfterKill() const;
 
@@ -109,7 +109,7 @@ TEST_F(MountedDisk, IsMountedAgainAfterAStop)
 /// A job in a process of its own, to be killed.
 class OtherProgram {
 public:
-    OtherProgram(const ManagerOptions& options, const fixwell::DiskReferencePointer& disk,
+    OtherProgram(const ManagerOptions& options, const contract::DiskReferencePointer& disk,
                  bool repairs)
         : id_(::fork())
     {
@@ -267,7 +267,7 @@ TEST_F(MountedDisk, WhatLiesOverItIsLeftAlone)
     std::ofstream(place() / "kept") << "x";
     test::Bench bench;
     EXPECT_EQ(bench.verify(disk()), 0);
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorCouldNotUnmount);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorCouldNotUnmount);
     EXPECT_NE(bench.listener.message.find("something else over it"), std::string::npos)
         << bench.listener.message;
     EXPECT_TRUE(fs::exists(place() / "kept"));
@@ -301,7 +301,7 @@ TEST_F(MountedDisk, WhoHoldsItIsNamedAndNothingIsChanged)
     const auto refusal = [this] {
         test::Bench bench;
         EXPECT_EQ(bench.verify(disk()), 0);
-        EXPECT_EQ(bench.listener.error, fixwell::kPLErrorCouldNotUnmount);
+        EXPECT_EQ(bench.listener.error, contract::kPLErrorCouldNotUnmount);
         EXPECT_EQ(mounts(), before_);
         return bench.listener.message;
     };

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/ErrorTexts.h"
 #include "pellar/jobs/Outcome.h"
+#include "pellar/texts/ErrorTexts.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -16,7 +16,7 @@ Judgement sound()
 
 Judgement damaged(bool madeProgress = false)
 {
-    return {Verdict::Damaged, fixwell::kPLErrorDamaged, 4, {}, madeProgress};
+    return {Verdict::Damaged, contract::kPLErrorDamaged, 4, {}, madeProgress};
 }
 
 Judgement corrected()
@@ -26,7 +26,7 @@ Judgement corrected()
 
 Judgement killed()
 {
-    return {Verdict::Failed, fixwell::kPLErrorToolFailed, 9, {"killed", {}, {}}, false};
+    return {Verdict::Failed, contract::kPLErrorToolFailed, 9, {"killed", {}, {}}, false};
 }
 
 TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
@@ -35,7 +35,7 @@ TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
         std::vector<RepairPass> passes;
         Judgement confirmation;
         Verdict verdict;
-        fixwell::ErrorCode code;
+        contract::ErrorCode code;
         std::string_view because;
     };
     for (const Case& c :
@@ -45,7 +45,7 @@ TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
           Case{{{corrected(), false, true}},
                damaged(),
                Verdict::Damaged,
-               fixwell::kPLErrorNotRepaired,
+               contract::kPLErrorNotRepaired,
                "the tool was too sure of itself"},
           Case{{{damaged(true), false, true}, {corrected(), false, true}},
                sound(),
@@ -55,7 +55,7 @@ TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
           Case{{{killed(), false, false}},
                damaged(),
                Verdict::Damaged,
-               fixwell::kPLErrorNotRepaired,
+               contract::kPLErrorNotRepaired,
                "the repair was killed"}}) {
         const Outcome outcome = outcomeOfRepair(c.passes, c.confirmation);
         EXPECT_EQ(outcome.verdict, c.verdict) << c.because;

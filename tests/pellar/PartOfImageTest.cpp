@@ -59,7 +59,7 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
         auto part = *test::reference(workshop.path("image"), c.filesystem);
         part.offset = 4096;
         part.length = 1 << 16;
-        const auto disk = std::make_shared<const fixwell::DiskReference>(part);
+        const auto disk = std::make_shared<const contract::DiskReference>(part);
         auto claim = DiskClaim::take(*disk, Access::ReadWrite, {});
         auto request = std::make_shared<JobRequest>(JobRequest{
             disk, c.operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(c.filesystem)});

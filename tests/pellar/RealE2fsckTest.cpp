@@ -2,7 +2,7 @@
 //
 // The real e2fsck on real volumes, damaged on purpose. Without root.
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "tests/pellar/Workshop.h"
 
 #include <gtest/gtest.h>
@@ -63,13 +63,13 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         const std::string before = bytesOf(image);
         ASSERT_EQ(bench.verify(disk), 0);
         EXPECT_EQ(bench.listener.verdict, "damaged") << damage.because;
-        EXPECT_EQ(bench.listener.error, fixwell::kPLErrorDamaged);
-        EXPECT_FALSE(bench.listener.textsOf(fixwell::kFsckError).empty()) << damage.because;
+        EXPECT_EQ(bench.listener.error, contract::kPLErrorDamaged);
+        EXPECT_FALSE(bench.listener.textsOf(contract::kFsckError).empty()) << damage.because;
         EXPECT_TRUE(bytesOf(image) == before) << "a verification wrote: " << damage.because;
 
         ASSERT_EQ(bench.repair(disk), 0);
         EXPECT_EQ(bench.listener.verdict, "repaired") << damage.because;
-        EXPECT_EQ(bench.listener.error, fixwell::kPLNoError);
+        EXPECT_EQ(bench.listener.error, contract::kPLNoError);
         ASSERT_EQ(bench.verify(disk), 0);
         EXPECT_EQ(bench.listener.verdict, "sound") << "after: " << damage.because;
         EXPECT_EQ(bench.listener.finished, 4);
@@ -83,7 +83,7 @@ TEST(RealE2fsck, UnreplayedJournalIsInconclusiveUntilRepaired)
     workshop.damage(image, "feature needs_recovery");
     test::Bench bench;
     ASSERT_EQ(bench.verify(test::reference(image)), 0);
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorInconclusive);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorInconclusive);
     ASSERT_EQ(bench.repair(test::reference(image)), 0);
     EXPECT_EQ(bench.listener.verdict, "repaired");
     EXPECT_EQ(bench.listener.message,
@@ -100,7 +100,7 @@ TEST(RealE2fsck, WorksOnARegionAndTouchesNothingBesides)
     auto region = *test::reference(workshop.path("whole"), "");
     region.offset = margin.size();
     region.length -= 2 * margin.size();
-    const auto disk = std::make_shared<fixwell::DiskReference>(region);
+    const auto disk = std::make_shared<contract::DiskReference>(region);
     test::Bench bench;
     ASSERT_EQ(bench.verify(disk), 0);
     EXPECT_EQ(bench.listener.verdict, "damaged");
@@ -122,10 +122,10 @@ TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)
     ASSERT_EQ(bench.verify(test::reference(image)), 0);
     EXPECT_EQ(bench.listener.verdict, "damaged");
     EXPECT_TRUE(bench.listener.hasErrorWith("The volume is cut short"));
-    EXPECT_EQ(bench.listener.error, kPLErrorCutShort) << "nobody is sent to a repair";
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorCutShort) << "nobody is sent to a repair";
     EXPECT_FALSE(bench.listener.hasPlainLine("needs to be repaired."));
     ASSERT_EQ(bench.repair(test::reference(image)), 0);
-    EXPECT_EQ(bench.listener.error, kPLErrorCutShort) << "nor called damaged after a repair";
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorCutShort) << "nor called damaged after a repair";
     EXPECT_TRUE(bytesOf(image) == before) << "something was written";
 }
 
@@ -161,7 +161,7 @@ TEST(RealE2fsck, SaysWhatARepairHasCost)
         test::Bench bench;
         ASSERT_EQ(bench.repair(test::reference(image)), 0);
         EXPECT_EQ(bench.listener.message, "repaired “Disk”: " + std::string(loss.message));
-        const auto warnings = bench.listener.textsOf(fixwell::kFsckFail);
+        const auto warnings = bench.listener.textsOf(contract::kFsckFail);
         EXPECT_EQ(warnings.empty(), loss.message == "no damage is left") << loss.because;
         EXPECT_TRUE(warnings.empty() || warnings.front() == bench.listener.message);
     }
@@ -194,12 +194,12 @@ TEST(RealE2fsck, SaysWhatIsNoFileSystem)
     struct Case {
         std::string_view name;
         std::string filesystem;
-        fixwell::ErrorCode error;
+        contract::ErrorCode error;
     };
-    for (const Case& c : {Case{"noise", "", fixwell::kPLErrorUnsupported},
-                          Case{"empty", "ext4", fixwell::kPLErrorUnsupported},
-                          Case{"tiny", "", fixwell::kPLErrorUnsupported},
-                          Case{"noise", "ext4", fixwell::kPLErrorDamaged}}) {
+    for (const Case& c : {Case{"noise", "", contract::kPLErrorUnsupported},
+                          Case{"empty", "ext4", contract::kPLErrorUnsupported},
+                          Case{"tiny", "", contract::kPLErrorUnsupported},
+                          Case{"noise", "ext4", contract::kPLErrorDamaged}}) {
         test::Bench bench;
         ASSERT_EQ(bench.verify(test::reference(workshop.path(c.name), c.filesystem)), 0);
         EXPECT_EQ(bench.listener.error, c.error) << c.name << c.filesystem;
@@ -221,7 +221,7 @@ TEST(RealE2fsck, WritesNoExtOverAnotherKind)
     const std::string before = bytesOf(image);
     test::Bench bench;
     ASSERT_EQ(bench.repair(test::reference(image)), 0);
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorUnsupported);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorUnsupported);
     EXPECT_TRUE(bytesOf(image) == before) << "something was written";
 }
 
@@ -255,7 +255,7 @@ TEST(RealE2fsck, StopsWhenAsked)
             bench.tool->cancelCurrentOperation();
     };
     ASSERT_EQ(bench.verify(test::reference(image)), 0);
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorCancelled);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorCancelled);
     EXPECT_FALSE(bench.listener.hasPlainLine("appears to be OK."));
 }
 

@@ -3,7 +3,7 @@
 // The real tools on real volumes, damaged on purpose; e2fsck has a file of its own. A tool that is
 // not installed is named, and its cases are skipped.
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/process/Command.h"
 #include "pellar/volumes/DiskUse.h"
 #include "pellar/volumes/LoopDevice.h"
@@ -109,7 +109,7 @@ TEST_P(RealTools, SayWhatIsTrue)
     ASSERT_EQ(bench.verify(disk), 0);
     EXPECT_EQ(bench.listener.verdict, state.verified) << bench.listener.message;
     EXPECT_TRUE(isSame(lastWriteOf(image), before)) << "a verification wrote";
-    EXPECT_EQ(bench.listener.error == kPLErrorDamagedForGood,
+    EXPECT_EQ(bench.listener.error == contract::kPLErrorDamagedForGood,
               state.verified == "damaged" && state.filesystem == "btrfs")
         << "nobody is sent to a repair that there is not";
     ASSERT_EQ(bench.repair(disk), 0);
@@ -175,7 +175,7 @@ bool isOnALoopDevice(const std::filesystem::path& image)
 }
 
 /// The volume, moved into the middle of a larger file.
-fixwell::DiskReferencePointer embed(const test::Workshop& workshop,
+contract::DiskReferencePointer embed(const test::Workshop& workshop,
                                     const std::filesystem::path& volume,
                                     std::string_view filesystem)
 {
@@ -186,7 +186,7 @@ fixwell::DiskReferencePointer embed(const test::Workshop& workshop,
     auto region = *test::reference(workshop.path("whole"), std::string(filesystem));
     region.offset = margin;
     region.length -= 2 * margin;
-    return std::make_shared<fixwell::DiskReference>(region);
+    return std::make_shared<contract::DiskReference>(region);
 }
 
 TEST(RealToolsInAnImage, WorkOnARegionAndLeaveNoLoopDevice)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/Workshop.h"
 
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
 #include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>
@@ -69,38 +69,38 @@ std::size_t TestLoop::waiting()
     return tasks_.size();
 }
 
-void Listener::plAsyncMessageForDisk(const fixwell::DiskReferencePointer&, std::string_view string,
-                                     const fixwell::Dictionary& dictionary)
+void Listener::plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
+                                     const contract::Dictionary& dictionary)
 {
     callsAfterFinished += finished > 0 ? 1 : 0;
     if (!dictionary)
         plainLines.emplace_back(string);
-    else if (dictionary.string(fixwell::kFsckMessageType) == fixwell::kFsckProgress.text())
-        progress.push_back(dictionary[fixwell::kFsckParameters].array().front().real());
+    else if (dictionary.string(contract::kFsckMessageType) == contract::kFsckProgress.text())
+        progress.push_back(dictionary[contract::kFsckParameters].array().front().real());
     else
         dictionaries.push_back(dictionary);
     if (onMessage)
         onMessage();
 }
 
-void Listener::plAsyncFinishedForDisk(const fixwell::DiskReferencePointer&,
-                                      fixwell::ErrorCode mainError, fixwell::ErrorCode,
-                                      const fixwell::Dictionary& result)
+void Listener::plAsyncFinishedForDisk(const contract::DiskReferencePointer&,
+                                      contract::ErrorCode mainError, contract::ErrorCode,
+                                      const contract::Dictionary& result)
 {
     ++finished;
     error = mainError;
-    verdict = result.string(fixwell::kPLVerdict);
-    message = result.string(fixwell::kPLMessage);
+    verdict = result.string(contract::kPLVerdict);
+    message = result.string(contract::kPLMessage);
     if (onFinished)
         onFinished();
 }
 
-std::vector<std::string> Listener::textsOf(fixwell::Name type) const
+std::vector<std::string> Listener::textsOf(contract::Name type) const
 {
     std::vector<std::string> texts;
-    for (const fixwell::Dictionary& dictionary : dictionaries)
-        if (dictionary.string(fixwell::kFsckMessageType) == type.text())
-            texts.emplace_back(dictionary.string(fixwell::kFsckMessageString));
+    for (const contract::Dictionary& dictionary : dictionaries)
+        if (dictionary.string(contract::kFsckMessageType) == type.text())
+            texts.emplace_back(dictionary.string(contract::kFsckMessageString));
     return texts;
 }
 
@@ -113,7 +113,7 @@ bool Listener::hasPlainLine(std::string_view part) const
 
 bool Listener::hasErrorWith(std::string_view part) const
 {
-    const auto errors = textsOf(fixwell::kFsckError);
+    const auto errors = textsOf(contract::kFsckError);
     return std::any_of(errors.begin(), errors.end(), [part](const std::string& line) {
         return line.find(part) != std::string::npos;
     });
@@ -172,11 +172,11 @@ std::string Workshop::fakeTools(std::string_view script, std::string_view tool) 
     return tools;
 }
 
-fixwell::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,
+contract::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,
                                         std::string name)
 {
-    auto disk = std::make_shared<fixwell::DiskReference>();
-    disk->storage = fixwell::DiskReference::Storage::FileRegion;
+    auto disk = std::make_shared<contract::DiskReference>();
+    disk->storage = contract::DiskReference::Storage::FileRegion;
     disk->path = image;
     std::error_code error;
     disk->length = std::filesystem::file_size(image, error);
@@ -198,20 +198,20 @@ Bench::Bench(ManagerOptions options)
     tool = manager.makeRepairDisk();
 }
 
-fixwell::ErrorCode Bench::verify(const fixwell::DiskReferencePointer& disk)
+contract::ErrorCode Bench::verify(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginStoragesystemFilesystemVerifyForDisk(disk));
 }
 
-fixwell::ErrorCode Bench::repair(const fixwell::DiskReferencePointer& disk)
+contract::ErrorCode Bench::repair(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginStoragesystemFilesystemRepairForDisk(disk));
 }
 
-fixwell::ErrorCode Bench::finish(fixwell::ErrorCode begun)
+contract::ErrorCode Bench::finish(contract::ErrorCode begun)
 {
     const int before = listener.finished;
-    if (begun != fixwell::kPLNoError)
+    if (begun != contract::kPLNoError)
         return begun;
     EXPECT_EQ(listener.finished, before) << "called back from inside the begin";
     EXPECT_TRUE(loop.runUntil([&] { return listener.finished > before; })) << "never finished";

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/RunLoop.h"
+#include "contract/pellar/MessageKeys.h"
 #include "pellar/Manager.h"
 
 #include <chrono>
@@ -18,7 +18,7 @@
 namespace pellar::test {
 
 /// A main loop that the test's thread turns by hand.
-class TestLoop final : public fixwell::RunLoop {
+class TestLoop final : public contract::RunLoop {
 public:
     bool isMainThread() const override { return std::this_thread::get_id() == main_; }
     void performOnMainThread(Task task, Wait wait) override;
@@ -45,28 +45,28 @@ public:
 };
 
 /// Writes down what a module would hear.
-class Listener final : public fixwell::PLAsyncDelegate {
+class Listener final : public contract::PLAsyncDelegate {
 public:
-    void plAsyncStartedForDisk(const fixwell::DiskReferencePointer&) override { ++started; }
-    void plAsyncMessageForDisk(const fixwell::DiskReferencePointer&, std::string_view string,
-                               const fixwell::Dictionary& dictionary) override;
-    void plAsyncProgressForDisk(const fixwell::DiskReferencePointer&, bool, float) override {}
-    void plAsyncFinishedForDisk(const fixwell::DiskReferencePointer&, fixwell::ErrorCode mainError,
-                                fixwell::ErrorCode, const fixwell::Dictionary& result) override;
+    void plAsyncStartedForDisk(const contract::DiskReferencePointer&) override { ++started; }
+    void plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
+                               const contract::Dictionary& dictionary) override;
+    void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer&, contract::ErrorCode mainError,
+                                contract::ErrorCode, const contract::Dictionary& result) override;
 
     /// The texts of dictionaries of this type.
-    std::vector<std::string> textsOf(fixwell::Name type) const;
+    std::vector<std::string> textsOf(contract::Name type) const;
     bool hasPlainLine(std::string_view part) const;
     bool hasErrorWith(std::string_view part) const;
 
     int started = 0;
     int finished = 0;
     int callsAfterFinished = 0;
-    fixwell::ErrorCode error = 0;
+    contract::ErrorCode error = 0;
     std::string verdict;
     std::string message;
     std::vector<std::string> plainLines;
-    std::vector<fixwell::Dictionary> dictionaries;
+    std::vector<contract::Dictionary> dictionaries;
     std::vector<double> progress;
     std::function<void()> onMessage;
     std::function<void()> onFinished;
@@ -97,7 +97,7 @@ private:
     std::filesystem::path directory_;
 };
 
-fixwell::DiskReferencePointer reference(const std::filesystem::path& image,
+contract::DiskReferencePointer reference(const std::filesystem::path& image,
                                         std::string filesystem = "ext4", std::string name = "Disk");
 
 /// One library, one listener, one loop.
@@ -105,16 +105,16 @@ struct Bench {
     explicit Bench(ManagerOptions options = {});
 
     /// Runs a job to its *finished* and answers what the begin answered.
-    fixwell::ErrorCode verify(const fixwell::DiskReferencePointer& disk);
-    fixwell::ErrorCode repair(const fixwell::DiskReferencePointer& disk);
-    fixwell::ErrorCode finish(fixwell::ErrorCode begun);
+    contract::ErrorCode verify(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode repair(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode finish(contract::ErrorCode begun);
 
     TestLoop loop;
     EnglishTexts texts;
     Listener listener;
     std::vector<std::string> traces;
     Manager manager;
-    std::unique_ptr<fixwell::PLRepairDisk> tool;
+    std::unique_ptr<contract::PLRepairDisk> tool;
 };
 
 }  // namespace pellar::test

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/EventWire.h"
 #include "orvane/privileges/HelperRequest.h"
 
@@ -173,10 +173,10 @@ TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
 TEST(EventWire, EventsComeBackAsTheyWere)
 {
     const auto dictionary =
-        fixwell::Dictionary::of({{fixwell::kFsckMessageType, fixwell::kFsckError},
-                                 {fixwell::kFsckMessageString, "line\nend \"quoted\" \xff\x1b"},
-                                 {fixwell::kFsckVerbosity, -1},
-                                 {fixwell::kFsckParameters, fixwell::Array::of({"x", 42, 1.5})}});
+        contract::Dictionary::of({{contract::kFsckMessageType, contract::kFsckError},
+                                 {contract::kFsckMessageString, "line\nend \"quoted\" \xff\x1b"},
+                                 {contract::kFsckVerbosity, -1},
+                                 {contract::kFsckParameters, contract::Array::of({"x", 42, 1.5})}});
     for (const pellar::Event& event : std::initializer_list<pellar::Event>{
              pellar::Started{}, pellar::Message{"plain \xc3\x28\n", {}},
              pellar::Message{{}, dictionary}, pellar::Trace{"e2fsck -n"},

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // The asking side of the helper, with programs in the helper's place.
 
+#include "contract/pellar/ErrorCodes.h"
 #include "orvane/privileges/PrivilegedScript.h"
-#include "pellar/ErrorCodes.h"
 #include "pellar/jobs/Job.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
@@ -77,19 +77,19 @@ TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)
 {
     struct Case {
         const char* script;
-        fixwell::ErrorCode error;
+        contract::ErrorCode error;
         std::string_view message;
     };
     for (const Case& c : {
-             Case{"exit 126", fixwell::kPLErrorCancelled,
+             Case{"exit 126", contract::kPLErrorCancelled,
                   "cannot repair “Stick”: the authorisation was not given; nothing was done"},
-             Case{"exit 127", pellar::kPLErrorNotAuthorized,
+             Case{"exit 127", contract::kPLErrorNotAuthorized,
                   "cannot repair “Stick”: you are not authorised to work on this disk; nothing was "
                   "done"},
-             Case{"exit 2", pellar::kPLErrorNotAuthorized,
+             Case{"exit 2", contract::kPLErrorNotAuthorized,
                   "cannot repair “Stick”: it needs an administrator's rights, and they could not "
                   "be asked for"},
-             Case{"printf '[\"started\"]\\n'; kill -9 $$", fixwell::kPLErrorToolFailed,
+             Case{"printf '[\"started\"]\\n'; kill -9 $$", contract::kPLErrorToolFailed,
                   "cannot repair “Stick”: the program that works on it as administrator ended "
                   "unexpectedly"},
          }) {
@@ -170,7 +170,7 @@ TEST_F(PrivilegedScriptTest, AnImageThatWasDeletedGetsNoResult)
             std::filesystem::remove(image);
         workshop_.write("end", "");
         ASSERT_TRUE(finishes());
-        EXPECT_EQ(listener_.error, isDeleted ? fixwell::kPLErrorDiskChanged : 0);
+        EXPECT_EQ(listener_.error, isDeleted ? contract::kPLErrorDiskChanged : 0);
         EXPECT_EQ(listener_.hasPlainLine("appears to be OK."), !isDeleted);
         job_.reset();
         std::filesystem::remove(workshop_.path("end"));
@@ -188,13 +188,13 @@ TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
     const std::string other = workshop_.makeExt("other", 4U << 20U);
     struct Case {
         std::string meanwhile;
-        fixwell::ErrorCode error;
+        contract::ErrorCode error;
         std::string_view verdict;
     };
     for (const Case& c :
          {Case{"ulimit -S -n 16", 0, "sound"},
           Case{"losetup -d " + device.name() + "\nlosetup " + device.name() + " '" + other + "'",
-               fixwell::kPLErrorDiskChanged, "failed"}}) {
+               contract::kPLErrorDiskChanged, "failed"}}) {
         listener_ = {};
         launch(c.meanwhile + "\nexec " PELLAR_HELPER " \"$@\"",
                {pellar::Subject::Filesystem, pellar::Operation::Verify,

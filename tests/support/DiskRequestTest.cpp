@@ -9,7 +9,7 @@ namespace orvane {
 namespace {
 
 using Kind = Refusal::Kind;
-using fixwell::DiskReference;
+using contract::DiskReference;
 
 DiskFacts facts(const std::string& node, std::int32_t type, const std::string& mountPoint = "")
 {

@@ -30,10 +30,10 @@ DiskTree tree(const std::string& identifier, std::vector<DiskTree> children = {}
 struct Host {
     Host()
     {
-        for (const fixwell::Name name :
-             {fixwell::OVDiskAppearedNotification, fixwell::OVDiskUnmountedNotification,
-              fixwell::OVDiskChangedNotification, fixwell::OVDiskEjectedNotification})
-            center.addObserver(this, name, [this](const fixwell::Notification& notification) {
+        for (const contract::Name name :
+             {contract::OVDiskAppearedNotification, contract::OVDiskUnmountedNotification,
+              contract::OVDiskChangedNotification, contract::OVDiskEjectedNotification})
+            center.addObserver(this, name, [this](const contract::Notification& notification) {
                 heard += notification.name.text().substr(6, 2);
                 heard += ' ' + notification.object->description() + '\n';
             });
@@ -138,11 +138,11 @@ TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)
 TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
 {
     const auto record = [](int number) {
-        return fixwell::Dictionary::of({{fixwell::Name("n"), number}});
+        return contract::Dictionary::of({{contract::Name("n"), number}});
     };
     const auto disk = Disk::make(tree("sda", {tree("sda1"), tree("sda2")}), {});
     const auto shown = [&] {
-        return fixwell::Value(disk->fsckHistory()).description();
+        return contract::Value(disk->fsckHistory()).description();
     };
     disk->fsckHistoryNoChildren().append(record(1));
     disk->parts()[1]->fsckHistoryNoChildren().append(record(3));

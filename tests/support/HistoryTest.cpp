@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TemporaryDirectory.h"
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/support/disks/Disk.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/DiskHistories.h"
@@ -20,27 +20,27 @@
 namespace orvane {
 namespace {
 
-using fixwell::Array;
-using fixwell::Dictionary;
-using fixwell::Name;
-using fixwell::StyledText;
-using fixwell::Value;
+using contract::Array;
+using contract::Dictionary;
+using contract::Name;
+using contract::StyledText;
+using contract::Value;
 using test::TemporaryDirectory;
 namespace fs = std::filesystem;
 
-const fixwell::TextStyle red{fixwell::Font::boldSystem(11), fixwell::Color{1, 0, 0.25, 1}, {}};
+const contract::TextStyle red{contract::Font::boldSystem(11), contract::Color{1, 0, 0.25, 1}, {}};
 
 Dictionary line(int number)
 {
     return Dictionary::of({{Name("kOV_typeOfOutputKey"), Name("kOV_typeOfOutput_string")},
-                           {fixwell::kFsckVerbosity, 2},
+                           {contract::kFsckVerbosity, 2},
                            {Name("kOV_finalAttributedString_type"),
                             StyledText::make("line " + std::to_string(number) + "\n", red)}});
 }
 
 Dictionary summary()
 {
-    return Dictionary::of({{fixwell::kFsckVerbosity, -2}, {fixwell::kFsckError, 3}});
+    return Dictionary::of({{contract::kFsckVerbosity, -2}, {contract::kFsckError, 3}});
 }
 
 /// A record as exact text: kinds, order, styles and bytes.
@@ -75,19 +75,19 @@ TEST(HistoryStore, RecordsComeBackAsTheyWere)
     const std::string hostile("\0\x1b[31m\xc3\x28%s'\"", 13);
     const Array history = Array::of(
         {line(1),
-         Dictionary::of({{fixwell::kFsckMessageType, fixwell::kFsckError},
-                         {fixwell::kFsckMessageString, "Entry %1$@ is %2$@"},
-                         {fixwell::kFsckParameters, Array::of({"x", 2, 2.0, true, hostile})},
-                         {fixwell::kFsckVerbosity, -1},
+         Dictionary::of({{contract::kFsckMessageType, contract::kFsckError},
+                         {contract::kFsckMessageString, "Entry %1$@ is %2$@"},
+                         {contract::kFsckParameters, Array::of({"x", 2, 2.0, true, hostile})},
+                         {contract::kFsckVerbosity, -1},
                          {Name("kOV_typeOfOutputKey"), Name("kOV_typeOfOutput_dict")},
                          {Name("kOV_finalAttributedString_type"), twoStyles}}),
          // The same keys, but not of the kinds that they have in good order.
-         Dictionary::of({{fixwell::kFsckVerbosity, 1.5},
-                         {fixwell::kFsckMessageType, 7},
+         Dictionary::of({{contract::kFsckVerbosity, 1.5},
+                         {contract::kFsckMessageType, 7},
                          {Name("kOV_typeOfOutputKey"), "made up"},
                          {Name("kOV_finalAttributedString_type"), hostile}}),
          Dictionary::of({{Name("kOV_finalAttributedString_type"), StyledText::make("", red)},
-                         {fixwell::kFsckMessageType, ""},
+                         {contract::kFsckMessageType, ""},
                          {Name(hostile), Dictionary::of({{Name("deep"), Array::make()}})},
                          {Name("infinite"), -INFINITY}}),
          Dictionary::make(), summary()});
@@ -344,7 +344,7 @@ TEST(HistoryKey, CopiesOfAVolumeAreNotMixed)
     EXPECT_EQ(historyKeyOf(device, false), historyKeyOf(copy, false)) << "a new name, the same";
     EXPECT_NE(historyKeyOf(device, false), historyKeyOf(copy, true)) << "both are known at once";
     DiskFacts image = device;
-    image.storage = fixwell::DiskReference::Storage::FileRegion;
+    image.storage = contract::DiskReference::Storage::FileRegion;
     image.identifier = "/a.img#1";
     DiskFacts imageCopy = image;
     imageCopy.identifier = "/b.img#1";
@@ -463,12 +463,12 @@ TEST(DiskHistories, AWholeDiskShowsItsRecordsInTheOrderOfTime)
         const auto shown = [&] {
             std::string text;
             for (const Value& record : disk->fsckHistory().values())
-                text += std::to_string(record.dictionary().integer(fixwell::kFsckVerbosity)) + " ";
+                text += std::to_string(record.dictionary().integer(contract::kFsckVerbosity)) + " ";
             return text;
         };
         const auto say = [&](int part, int number) {
             disk->parts()[static_cast<std::size_t>(part)]->fsckHistoryNoChildren().append(
-                Dictionary::of({{fixwell::kFsckVerbosity, number}}));
+                Dictionary::of({{contract::kFsckVerbosity, number}}));
             all += std::to_string(number) + " ";
             if (isWatched) {
                 EXPECT_EQ(shown(), all);

@@ -150,8 +150,8 @@ TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
     const auto offline =
         controller.addImage(factsOfImage(std::get<OpenImage>(openImage(image, Translator()))));
     ImageAttacher attacher({}, Translator());
-    fixwell::Dictionary result;
-    fixwell::OVDiskPointer top;
+    contract::Dictionary result;
+    contract::OVDiskPointer top;
     std::thread worker([&] {
         ASSERT_EQ(attacher.AttachImageWithURL(image, result), 0);
         top = attacher.TopLevelPLDiskForImageDict(result);
@@ -162,7 +162,7 @@ TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
     ASSERT_EQ(controller.viewablePartitions(top).size(), 1U);
     EXPECT_EQ(controller.diskWithKRDisk(top->theKRDisk()), top) << "known once it was asked for";
 
-    top->fsckHistoryNoChildren().append(fixwell::Dictionary::make());
+    top->fsckHistoryNoChildren().append(contract::Dictionary::make());
     controller.ejectDisk(top, true);
     EXPECT_EQ(controller.diskWithIdentifier(top->diskIdentifier()), nullptr);
     EXPECT_EQ(offline->fsckHistory().size(), 1U) << "the image still shows what was found in it";
@@ -185,9 +185,9 @@ TEST(ImageAttacher, FailuresAreCodesWithASentence)
                           Case{"notes.txt",
                                "cannot attach ‘notes.txt’: it is a text file, not a "
                                "disk image"}}) {
-        fixwell::Dictionary result;
+        contract::Dictionary result;
         EXPECT_EQ(attacher.AttachImageWithURL(directory / c.name, result),
-                  fixwell::kPLErrorCannotOpen);
+                  contract::kPLErrorCannotOpen);
         EXPECT_EQ(attacher.lastError(directory / c.name), c.sentence);
         EXPECT_EQ(attacher.TopLevelPLDiskForImageDict(result), nullptr);
     }

@@ -57,10 +57,10 @@ TEST(ActivityLog, EntriesWithAndWithoutLineEnds)
 TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
 {
     const TemporaryDirectory directory;
-    ActivityLog log({directory.path, fixwell::OVLog::error}, {});
-    EXPECT_FALSE(log.keepsLevel(fixwell::OVLog::trace));
-    log.ov_log(fixwell::OVLog::trace, 0, "unheard");
-    log.ov_log(fixwell::OVLog::error, 0, "bad \x1b[31mthing %s\n");
+    ActivityLog log({directory.path, contract::OVLog::error}, {});
+    EXPECT_FALSE(log.keepsLevel(contract::OVLog::trace));
+    log.ov_log(contract::OVLog::trace, 0, "unheard");
+    log.ov_log(contract::OVLog::error, 0, "bad \x1b[31mthing %s\n");
     const std::string text = contentsOf(directory / "fixwell.log");
     EXPECT_EQ(text.find("unheard"), std::string::npos);
     EXPECT_NE(text.find("notice bad \uFFFD[31mthing %s\n"), std::string::npos) << "there at once";

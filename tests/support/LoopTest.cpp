@@ -14,7 +14,7 @@
 namespace orvane {
 namespace {
 
-using Wait = fixwell::RunLoop::Wait;
+using Wait = contract::RunLoop::Wait;
 using namespace std::chrono_literals;
 
 TEST(MainLoop, RunsWhatOtherThreadsHandOverInTheirOrder)
@@ -133,7 +133,7 @@ TEST(WorkerThreads, ClosingWakesSleepersAndThoseWhoWaitForTheMainThread)
 
 TEST(Notifications, ChangesInTheMiddleOfADelivery)
 {
-    const fixwell::Name name("N");
+    const contract::Name name("N");
     Notifications center;
     std::string heard;
     int a = 0, b = 0, c = 0;

@@ -69,10 +69,10 @@ TEST(SettingsFile, KeepsValuesAndTheirKinds)
     settings.open().setObjectForKey("No", "word");
     settings.open().setObjectForKey({}, "number");
     const SettingsFile read = settings.open();
-    EXPECT_EQ(read.objectForKey("flag").kind(), fixwell::Kind::Boolean);
+    EXPECT_EQ(read.objectForKey("flag").kind(), contract::Kind::Boolean);
     EXPECT_TRUE(read.objectForKey("number").isNone()) << "no value removes the key";
     EXPECT_EQ(read.objectForKey("bytes").string(), "caf\xE9") << "any bytes";
-    EXPECT_EQ(read.objectForKey("word").kind(), fixwell::Kind::Boolean) << "spells a truth value";
+    EXPECT_EQ(read.objectForKey("word").kind(), contract::Kind::Boolean) << "spells a truth value";
     EXPECT_FALSE(read.objectForKey("word").boolean());
     EXPECT_TRUE(settings.warnings.empty());
     struct stat status = {};

@@ -114,7 +114,7 @@ TEST(ModuleBundle, ResourcesStayInsideTheBundle)
 TEST(DecimalNumbers, GroupingByLanguage)
 {
     struct Case {
-        fixwell::Value number;
+        contract::Value number;
         const char* language;
         const char* text;
     };

@@ -114,8 +114,8 @@ protected:
     {
         const std::string image = directory_ / "other.img";
         test::write(image, std::string(1 << 20, 'x'));
-        fixwell::DiskReference disk;
-        disk.storage = fixwell::DiskReference::Storage::FileRegion;
+        contract::DiskReference disk;
+        disk.storage = contract::DiskReference::Storage::FileRegion;
         disk.path = image;
         {
             const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/terminal/ByteCount.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/ProgressLine.h"
@@ -26,7 +26,7 @@ std::size_t widthOf(std::string_view text)
     std::size_t columns = 0;
     while (!text.empty())
         columns += static_cast<std::size_t>(
-            std::max(0, ::wcwidth(static_cast<wchar_t>(fixwell::takeCharacter(text)))));
+            std::max(0, ::wcwidth(static_cast<wchar_t>(contract::takeCharacter(text)))));
     return columns;
 }
 
@@ -79,11 +79,11 @@ TEST_F(TerminalTextTest, ABarGrowsWithThePercentage)
     EXPECT_EQ(progressLine({}, 80).find('%'), std::string::npos);
 }
 
-fixwell::StyledText styled(std::string_view text, fixwell::Color color)
+contract::StyledText styled(std::string_view text, contract::Color color)
 {
-    fixwell::TextStyle style;
+    contract::TextStyle style;
     style.color = color;
-    return fixwell::StyledText::make(text, style);
+    return contract::StyledText::make(text, style);
 }
 
 TEST_F(TerminalTextTest, HostileTextIsMadeHarmless)
@@ -92,7 +92,7 @@ TEST_F(TerminalTextTest, HostileTextIsMadeHarmless)
                                         "\xc2\x9b"
                                         "2J",
                                         "\xff\xfe", "a\x7f", "\x1b]0;t\x07"}) {
-        const auto plain = fixwell::StyledText::make(text, {});
+        const auto plain = contract::StyledText::make(text, {});
         EXPECT_FALSE(holdsControls(terminalText(plain, false))) << text;
         EXPECT_FALSE(holdsControls(terminalText(plain, true))) << "a text without a look";
         EXPECT_FALSE(holdsControls(safeLines(text))) << text;

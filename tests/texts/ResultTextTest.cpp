@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/Format.h"
-#include "fixwell/host/foundation/PhraseMatcher.h"
-#include "fixwell/host/pellar/ResultPhrases.h"
+#include "contract/foundation/Format.h"
+#include "contract/foundation/PhraseMatcher.h"
+#include "contract/pellar/ResultPhrases.h"
 #include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
 
@@ -13,7 +13,7 @@
 
 namespace {
 
-using namespace fixwell;
+using namespace contract;
 
 constexpr std::string_view table = "LocalizableFsck";
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/session/JobNotice.h"
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <algorithm>
 
@@ -18,9 +18,9 @@ std::string titleOf(const std::vector<FinishedRun>& runs, const Translator& text
     if (runs.size() == 1)
         return texts.sentence(
             isRepair ? texts.text("Repair of “%@”") : texts.text("Verification of “%@”"),
-            {fixwell::printable(first.disk)});
+            {contract::printable(first.disk)});
     const long count = static_cast<long>(runs.size());
-    return fixwell::format(
+    return contract::format(
         isRepair ? texts.plural("Repair of %ld disk", "Repair of %ld disks", count)
                  : texts.plural("Verification of %ld disk", "Verification of %ld disks", count),
         {count});
@@ -35,7 +35,7 @@ std::string lineOf(const FinishedRun& finished, const Translator& texts)
 
 bool isSound(const FinishedRun& finished)
 {
-    return finished.end.verdict == fixwell::kPLVerdictSound.text();
+    return finished.end.verdict == contract::kPLVerdictSound.text();
 }
 
 }  // namespace
@@ -63,7 +63,7 @@ Notice noticeOf(std::vector<FinishedRun> runs, const Translator& texts)
 std::string noticeMarkup(std::string_view text)
 {
     std::string markup;
-    for (const char c : fixwell::printable(text))
+    for (const char c : contract::printable(text))
         switch (c) {
             case '&': markup += "&amp;"; break;
             case '<': markup += "&lt;"; break;

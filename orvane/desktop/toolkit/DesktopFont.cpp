@@ -12,7 +12,7 @@ double desktopFontScale()
     return QFontInfo(QApplication::font()).pointSizeF() / moduleTextPoints;
 }
 
-QFont scaledFont(const fixwell::Font& font, double scale)
+QFont scaledFont(const contract::Font& font, double scale)
 {
     QFont result = QApplication::font();
     const double size = font.points > 0 ? font.points : moduleTextPoints;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/StyledText.h"
+#include "contract/foundation/StyledText.h"
 
 #include <QFont>
 
@@ -14,6 +14,6 @@ inline constexpr double moduleTextPoints = 11;
 double desktopFontScale();
 
 /// The application's font in the weight that `font` asks for, and in its size times `scale`.
-QFont scaledFont(const fixwell::Font& font, double scale);
+QFont scaledFont(const contract::Font& font, double scale);
 
 }  // namespace orvane::desktop

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/HelpWindow.h"
 
-#include "fixwell/host/foundation/Format.h"
+#include "contract/foundation/Format.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QAction>
@@ -21,7 +21,7 @@ constexpr int pageMargin = 16;  // pixels
 
 }  // namespace
 
-HelpWindow::HelpWindow(HelpBook book, const fixwell::Bundle& texts)
+HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts)
     : book_(std::move(book)),
       texts_(texts),
       browser_(new QTextBrowser(this)),
@@ -104,7 +104,7 @@ void HelpWindow::open(std::string_view anchor)
     const QString page = book_.pageWith(anchor);
     if (!QFileInfo(page).isReadable()) {
         browser_->setPlainText(
-            toQt(fixwell::format(texts_.localizedString("The help book %@ cannot be read."),
+            toQt(contract::format(texts_.localizedString("The help book %@ cannot be read."),
                                  {page.isEmpty() ? std::string("index.html") : fromQt(page)})));
         return;
     }
@@ -148,7 +148,7 @@ void HelpWindow::find(Direction direction)
         return;
     }
     statusBar()->showMessage(
-        toQt(fixwell::format(texts_.localizedString("“%@” was not found."), {fromQt(wanted)})));
+        toQt(contract::format(texts_.localizedString("“%@” was not found."), {fromQt(wanted)})));
 }
 
 void HelpWindow::closeEvent(QCloseEvent* event)

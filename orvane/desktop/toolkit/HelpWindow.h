@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
+#include "contract/foundation/Bundle.h"
 #include "orvane/desktop/toolkit/HelpBook.h"
 
 #include <QLineEdit>
@@ -17,7 +17,7 @@ namespace orvane::desktop {
 class HelpWindow final : public QMainWindow {
 public:
     /// `texts` outlives the window.
-    HelpWindow(HelpBook book, const fixwell::Bundle& texts);
+    HelpWindow(HelpBook book, const contract::Bundle& texts);
 
     /// Shows the page where the anchor stands; an empty one is the contents. A book that cannot
     /// be read is said so in the window.
@@ -43,7 +43,7 @@ private:
     bool findInPage(Direction direction);
 
     const HelpBook book_;
-    const fixwell::Bundle& texts_;
+    const contract::Bundle& texts_;
     QTextBrowser* browser_;
     QLineEdit* findField_;
     std::function<void(const QByteArray&)> closed_;

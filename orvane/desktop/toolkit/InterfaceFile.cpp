@@ -25,12 +25,12 @@ public:
     }
 };
 
-QString translated(const QString& text, const fixwell::Bundle& texts)
+QString translated(const QString& text, const contract::Bundle& texts)
 {
     return text.isEmpty() ? text : toQt(texts.localizedString(fromQt(text)));
 }
 
-void translate(QWidget& widget, const fixwell::Bundle& texts)
+void translate(QWidget& widget, const contract::Bundle& texts)
 {
     if (auto* const button = qobject_cast<QAbstractButton*>(&widget)) {
         const QKeySequence shortcut = button->shortcut();
@@ -54,7 +54,7 @@ void translate(QWidget& widget, const fixwell::Bundle& texts)
 }  // namespace
 
 std::unique_ptr<QWidget> loadInterfaceFile(const std::filesystem::path& file,
-                                           const fixwell::Bundle& texts, QString& error)
+                                           const contract::Bundle& texts, QString& error)
 {
     QFile contents(QString::fromStdString(file.string()));
     if (!contents.open(QIODevice::ReadOnly)) {

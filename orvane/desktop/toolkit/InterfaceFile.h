@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
+#include "contract/foundation/Bundle.h"
 
 #include <QString>
 #include <QWidget>
@@ -22,7 +22,7 @@ inline constexpr const char* viewClassProperty = "viewClass";  ///< of a LogTabl
 /// custom widget class of a name that Qt does not know becomes a LogTable. None when the file
 /// cannot be read; then `error` says why.
 [[nodiscard]] std::unique_ptr<QWidget> loadInterfaceFile(const std::filesystem::path& file,
-                                                         const fixwell::Bundle& texts,
+                                                         const contract::Bundle& texts,
                                                          QString& error);
 
 }  // namespace orvane::desktop

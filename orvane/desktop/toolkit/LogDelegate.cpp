@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogDelegate.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/DesktopFont.h"
 #include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
@@ -19,7 +19,7 @@
 namespace orvane::desktop {
 namespace {
 
-LineLooks looksOf(const QStyleOptionViewItem& option, const fixwell::Font& font)
+LineLooks looksOf(const QStyleOptionViewItem& option, const contract::Font& font)
 {
     const bool isSelected = option.state.testFlag(QStyle::State_Selected);
     const auto group = !option.state.testFlag(QStyle::State_Enabled) ? QPalette::Disabled
@@ -37,10 +37,10 @@ LineLooks looksOf(const QStyleOptionViewItem& option, const fixwell::Font& font)
 }
 
 /// None where there is nothing to show yet, or any more.
-fixwell::OutlineView* viewOf(const QModelIndex& index)
+contract::OutlineView* viewOf(const QModelIndex& index)
 {
     const auto* const model = static_cast<const LogModel*>(index.model());
-    fixwell::OutlineView* const view = model != nullptr ? model->view() : nullptr;
+    contract::OutlineView* const view = model != nullptr ? model->view() : nullptr;
     return view != nullptr && view->dataCell() != nullptr ? view : nullptr;
 }
 
@@ -49,7 +49,7 @@ bool isSentence(const QModelIndex& index)
 {
     constexpr std::int64_t detailVerbosity = 1;
     const auto* const model = static_cast<const LogModel*>(index.model());
-    return model->itemAt(index.row()).integer(fixwell::kFsckVerbosity) < detailVerbosity;
+    return model->itemAt(index.row()).integer(contract::kFsckVerbosity) < detailVerbosity;
 }
 
 void drawBackground(QPainter& painter, const QStyleOptionViewItem& option)
@@ -67,11 +67,11 @@ void LogDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
                         const QModelIndex& index) const
 {
     drawBackground(*painter, option);
-    fixwell::OutlineView* const view = viewOf(index);
+    contract::OutlineView* const view = viewOf(index);
     if (view == nullptr)
         return;
     const auto row = static_cast<std::size_t>(index.row());
-    const fixwell::Rect frame = view->frameOfCellAtColumnRow(0, row);
+    const contract::Rect frame = view->frameOfCellAtColumnRow(0, row);
     const auto put = isSentence(index) ? drawWrapped : draw;
     put(*painter, QRectF(frame.x, frame.y, frame.width, frame.height),
         oneLine(textOfRow(*view, row)), looksOf(option, view->dataCell()->font()));
@@ -80,7 +80,7 @@ void LogDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
 QSize LogDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const
 {
     constexpr int mostLines = 12;  // a name may be as long as it likes
-    fixwell::OutlineView* const view = viewOf(index);
+    contract::OutlineView* const view = viewOf(index);
     if (view == nullptr || !isSentence(index))
         return option.rect.size();
     const auto row = static_cast<std::size_t>(index.row());
@@ -99,7 +99,7 @@ QSize LogDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelInde
 bool LogDelegate::helpEvent(QHelpEvent* event, QAbstractItemView* table,
                             const QStyleOptionViewItem& option, const QModelIndex& index)
 {
-    fixwell::OutlineView* const view = viewOf(index);
+    contract::OutlineView* const view = viewOf(index);
     if (view == nullptr || event->type() != QEvent::ToolTip)
         return QStyledItemDelegate::helpEvent(event, table, option, index);
     const auto row = static_cast<std::size_t>(index.row());

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogModel.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include <algorithm>
@@ -9,21 +9,21 @@
 
 namespace orvane::desktop {
 
-fixwell::StyledText textOfItem(fixwell::OutlineView& view, const fixwell::OutlineItem& item)
+contract::StyledText textOfItem(contract::OutlineView& view, const contract::OutlineItem& item)
 {
-    fixwell::BrowserCell* const cell = view.dataCell();
+    contract::BrowserCell* const cell = view.dataCell();
     if (cell == nullptr || view.dataSource() == nullptr || !item)
         return {};
     view.dataSource()->outlineViewWillDisplayCellForTableColumnItem(*cell, item);
     return cell->attributedStringValue();
 }
 
-fixwell::StyledText textOfRow(fixwell::OutlineView& view, std::size_t row)
+contract::StyledText textOfRow(contract::OutlineView& view, std::size_t row)
 {
     return textOfItem(view, view.itemAtRow(row));
 }
 
-void LogModel::setView(fixwell::OutlineView* view)
+void LogModel::setView(contract::OutlineView* view)
 {
     view_ = view;
     reload();
@@ -72,10 +72,10 @@ LogModel::Change LogModel::changeTo(int rows) const
     return holdsOldRows(rows - rows_) ? Change::MoreInFront : Change::Other;
 }
 
-fixwell::OutlineItem LogModel::itemAt(int row) const
+contract::OutlineItem LogModel::itemAt(int row) const
 {
     return view_ != nullptr && row >= 0 ? view_->itemAtRow(static_cast<std::size_t>(row))
-                                        : fixwell::OutlineItem();
+                                        : contract::OutlineItem();
 }
 
 // Records are only ever added to a history, or replaced altogether: where the first and the last
@@ -90,9 +90,9 @@ bool LogModel::holdsOldRows(int offset) const
 void LogModel::remember(int rows)
 {
     rows_ = rows;
-    first_ = rows > 0 ? view_->itemAtRow(0) : fixwell::OutlineItem();
+    first_ = rows > 0 ? view_->itemAtRow(0) : contract::OutlineItem();
     last_ =
-        rows > 0 ? view_->itemAtRow(static_cast<std::size_t>(rows - 1)) : fixwell::OutlineItem();
+        rows > 0 ? view_->itemAtRow(static_cast<std::size_t>(rows - 1)) : contract::OutlineItem();
 }
 
 int LogModel::rowCount(const QModelIndex& parent) const
@@ -104,7 +104,7 @@ QVariant LogModel::data(const QModelIndex& index, int role) const
 {
     if (!index.isValid() || view_ == nullptr)
         return {};
-    const fixwell::OutlineItem item = view_->itemAtRow(static_cast<std::size_t>(index.row()));
+    const contract::OutlineItem item = view_->itemAtRow(static_cast<std::size_t>(index.row()));
     switch (role) {
         case Qt::DisplayRole: return oneLine(textOfItem(*view_, item)).text;
         case Qt::AccessibleTextRole: return spokenText(item);
@@ -112,15 +112,15 @@ QVariant LogModel::data(const QModelIndex& index, int role) const
     }
 }
 
-QString LogModel::spokenText(const fixwell::OutlineItem& item) const
+QString LogModel::spokenText(const contract::OutlineItem& item) const
 {
     const QString text = oneLine(textOfItem(*view_, item)).text;
-    const std::string_view type = item.string(fixwell::kFsckMessageType);
-    const bool isProblem = type == fixwell::kFsckError.text() || type == fixwell::kFsckFail.text();
+    const std::string_view type = item.string(contract::kFsckMessageType);
+    const bool isProblem = type == contract::kFsckError.text() || type == contract::kFsckFail.text();
     QString word;
     if (isProblem)
         word = spoken_.problem;
-    else if (type == fixwell::kFsckSuccess.text())
+    else if (type == contract::kFsckSuccess.text())
         word = spoken_.success;
     return word.isEmpty() ? text : word + QStringLiteral(": ") + text;
 }

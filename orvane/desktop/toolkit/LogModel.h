@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/OutlineView.h"
+#include "contract/toolkit/OutlineView.h"
 
 #include <QAbstractListModel>
 
@@ -9,16 +9,16 @@ namespace orvane::desktop {
 
 /// The text of a row as the module's cell shows it; none for a row that does not exist (any
 /// more), or while the view has no data source or no cell.
-fixwell::StyledText textOfItem(fixwell::OutlineView& view, const fixwell::OutlineItem& item);
-fixwell::StyledText textOfRow(fixwell::OutlineView& view, std::size_t row);
+contract::StyledText textOfItem(contract::OutlineView& view, const contract::OutlineItem& item);
+contract::StyledText textOfRow(contract::OutlineView& view, std::size_t row);
 
 /// The rows of an outline view without levels. Rows are asked for when they are shown: the model
 /// keeps their number alone, so a million rows cost as much as one. Main thread.
 class LogModel final : public QAbstractListModel {
 public:
     /// The view whose data source is asked; it must live until it is taken away with none.
-    void setView(fixwell::OutlineView* view);
-    fixwell::OutlineView* view() const { return view_; }
+    void setView(contract::OutlineView* view);
+    contract::OutlineView* view() const { return view_; }
 
     /// What is said before a row's text where its type is shown by its colour alone.
     struct SpokenTypes {
@@ -34,7 +34,7 @@ public:
     Change reload();
 
     /// The record in a row, as the view answers it now; none for a row that it does not have.
-    fixwell::OutlineItem itemAt(int row) const;
+    contract::OutlineItem itemAt(int row) const;
 
     int rowCount(const QModelIndex& parent = {}) const override;
     /// The row's plain text for Qt::DisplayRole, and with its type for Qt::AccessibleTextRole; the
@@ -43,17 +43,17 @@ public:
     Qt::ItemFlags flags(const QModelIndex& index) const override;
 
 private:
-    QString spokenText(const fixwell::OutlineItem& item) const;
+    QString spokenText(const contract::OutlineItem& item) const;
     std::size_t countRows() const;
     Change changeTo(int rows) const;
     bool holdsOldRows(int offset) const;
     void remember(int rows);
 
-    fixwell::OutlineView* view_ = nullptr;
+    contract::OutlineView* view_ = nullptr;
     SpokenTypes spoken_;
     int rows_ = 0;
-    fixwell::OutlineItem first_;  ///< as last loaded, to tell growth from another log
-    fixwell::OutlineItem last_;
+    contract::OutlineItem first_;  ///< as last loaded, to tell growth from another log
+    contract::OutlineItem last_;
 };
 
 }  // namespace orvane::desktop

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogPlace.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <algorithm>
 
@@ -11,7 +11,7 @@ namespace {
 // As in fixwell/messagelog: rows from this verbosity on come and go with the details.
 constexpr std::int64_t detailVerbosity = 1;
 
-bool isThere(const LogModel& model, int number, const fixwell::OutlineItem& item)
+bool isThere(const LogModel& model, int number, const contract::OutlineItem& item)
 {
     return number >= 0 && number < model.rowCount() && model.itemAt(number).isSameAs(item);
 }
@@ -34,7 +34,7 @@ LogPlace::LogPlace(const LogTable& table, const LogModel& model)
     }
     // Where nothing but details is in sight, the line that they belong to stands in for them.
     for (int row = first; row >= 0; --row)
-        if (model.itemAt(row).integer(fixwell::kFsckVerbosity) < detailVerbosity) {
+        if (model.itemAt(row).integer(contract::kFsckVerbosity) < detailVerbosity) {
             inSight_.push_back({rowAt(row), table.rowViewportPosition(first)});
             break;
         }

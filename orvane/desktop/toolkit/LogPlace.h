@@ -31,7 +31,7 @@ public:
 private:
     struct Row {
         int number;
-        fixwell::OutlineItem item;
+        contract::OutlineItem item;
     };
     struct SightedRow {
         Row row;

@@ -21,7 +21,7 @@ namespace {
 constexpr double roomForArrow = 16;
 constexpr double roomAtTheEnd = 4;
 
-bool allows(fixwell::DragOperation mask, fixwell::DragOperation operation)
+bool allows(contract::DragOperation mask, contract::DragOperation operation)
 {
     return (static_cast<std::uint32_t>(mask) & static_cast<std::uint32_t>(operation)) != 0;
 }
@@ -45,7 +45,7 @@ OutlinePeer::~OutlinePeer()
         table_->setHandlers({});
 }
 
-void OutlinePeer::setView(fixwell::OutlineView* view)
+void OutlinePeer::setView(contract::OutlineView* view)
 {
     view_ = view;
     model_.setView(view);
@@ -140,7 +140,7 @@ void OutlinePeer::scrollRowToVisible(std::size_t row)
     noteChange();
 }
 
-fixwell::Rect OutlinePeer::rectOfRow(std::size_t row) const
+contract::Rect OutlinePeer::rectOfRow(std::size_t row) const
 {
     if (row >= static_cast<std::size_t>(model_.rowCount()))
         return {};
@@ -149,19 +149,19 @@ fixwell::Rect OutlinePeer::rectOfRow(std::size_t row) const
             static_cast<double>(rect.width()), static_cast<double>(rect.height())};
 }
 
-fixwell::Rect OutlinePeer::frameOfCellAtColumnRow(std::size_t /*column*/, std::size_t row) const
+contract::Rect OutlinePeer::frameOfCellAtColumnRow(std::size_t /*column*/, std::size_t row) const
 {
-    fixwell::Rect frame = rectOfRow(row);
-    if (frame == fixwell::Rect())
+    contract::Rect frame = rectOfRow(row);
+    if (frame == contract::Rect())
         return frame;
     frame.x += roomForArrow;
     frame.width = std::max(0.0, frame.width - roomForArrow - roomAtTheEnd);
     return frame;
 }
 
-fixwell::Rect OutlinePeer::frameOfOutlineCellAtRow(std::size_t row) const
+contract::Rect OutlinePeer::frameOfOutlineCellAtRow(std::size_t row) const
 {
-    fixwell::Rect frame = rectOfRow(row);
+    contract::Rect frame = rectOfRow(row);
     frame.width = std::min(frame.width, roomForArrow);
     return frame;
 }
@@ -178,7 +178,7 @@ void OutlinePeer::sendKey(QKeyEvent& event)
         view_->keyDown({keyCodeOf(event.key()), modifierFlags(event.modifiers()), &event});
 }
 
-void OutlinePeer::keyDown(const fixwell::KeyEvent& event)
+void OutlinePeer::keyDown(const contract::KeyEvent& event)
 {
     if (event.native != nullptr)
         table_->handleKey(*static_cast<QKeyEvent*>(event.native));
@@ -196,7 +196,7 @@ void OutlinePeer::setNeedsDisplay(bool needsDisplay)
         table_->viewport()->update();
 }
 
-void OutlinePeer::setNeedsDisplayInRect(const fixwell::Rect& rect)
+void OutlinePeer::setNeedsDisplayInRect(const contract::Rect& rect)
 {
     table_->viewport()->update(QRectF(rect.x, rect.y, rect.width, rect.height).toAlignedRect());
 }
@@ -206,20 +206,20 @@ void OutlinePeer::setToolTip(std::string_view text)
     table_->setToolTip(toQtToolTip(text));
 }
 
-void OutlinePeer::setDraggingSourceOperationMask(fixwell::DragOperation mask, bool isLocal)
+void OutlinePeer::setDraggingSourceOperationMask(contract::DragOperation mask, bool isLocal)
 {
     (isLocal ? localMask_ : outsideMask_) = mask;
-    table_->setDraggable(allows(localMask_, fixwell::DragOperation::Copy) ||
-                         allows(outsideMask_, fixwell::DragOperation::Copy));
+    table_->setDraggable(allows(localMask_, contract::DragOperation::Copy) ||
+                         allows(outsideMask_, contract::DragOperation::Copy));
 }
 
 void OutlinePeer::drag()
 {
-    fixwell::OutlineViewDelegate* const source = view_ != nullptr ? view_->dataSource() : nullptr;
+    contract::OutlineViewDelegate* const source = view_ != nullptr ? view_->dataSource() : nullptr;
     if (source == nullptr ||
-        !allows(source->draggingSourceOperationMaskForLocal(false), fixwell::DragOperation::Copy))
+        !allows(source->draggingSourceOperationMaskForLocal(false), contract::DragOperation::Copy))
         return;
-    std::vector<fixwell::OutlineItem> items;
+    std::vector<contract::OutlineItem> items;
     for (const std::size_t row : selectedRowIndexes())
         items.push_back(view_->itemAtRow(row));
     MimePasteboard pasteboard;

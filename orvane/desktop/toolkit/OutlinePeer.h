@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/OutlineView.h"
+#include "contract/toolkit/OutlineView.h"
 #include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/LogPlace.h"
 #include "orvane/desktop/toolkit/LogTable.h"
@@ -16,7 +16,7 @@ namespace orvane::desktop {
 
 /// An outline view on the screen. A reload is noted, and done when the event loop comes to it: a
 /// burst of lines is then saved and shown together. The number of rows is right at once.
-class OutlinePeer final : public fixwell::OutlineViewPeer {
+class OutlinePeer final : public contract::OutlineViewPeer {
 public:
     /// `table` must live as long as this object. `beforeRows` is called before new rows are
     /// shown: what is shown must be on the disk first.
@@ -26,7 +26,7 @@ public:
     ~OutlinePeer() override;
 
     /// The module's view; it must live until it is taken away with none.
-    void setView(fixwell::OutlineView* view);
+    void setView(contract::OutlineView* view);
     /// Shows what is waiting.
     void flush();
     LogTable& table() { return *table_; }
@@ -39,20 +39,20 @@ public:
     std::size_t numberOfSelectedRows() const override;
     void scrollRowToVisible(std::size_t row) override;
     /// In the coordinates of the table's viewport; zero for a row that is not there.
-    fixwell::Rect rectOfRow(std::size_t row) const override;
-    fixwell::Rect frameOfCellAtColumnRow(std::size_t column, std::size_t row) const override;
-    fixwell::Rect frameOfOutlineCellAtRow(std::size_t row) const override;
-    void keyDown(const fixwell::KeyEvent& event) override;
+    contract::Rect rectOfRow(std::size_t row) const override;
+    contract::Rect frameOfCellAtColumnRow(std::size_t column, std::size_t row) const override;
+    contract::Rect frameOfOutlineCellAtRow(std::size_t row) const override;
+    void keyDown(const contract::KeyEvent& event) override;
     void selectAll() override;
     void setNeedsDisplay(bool needsDisplay) override;
-    void setNeedsDisplayInRect(const fixwell::Rect& rect) override;
+    void setNeedsDisplayInRect(const contract::Rect& rect) override;
     void setEnabled(bool isEnabled) override { table_->setEnabled(isEnabled); }
     bool isEnabled() const override { return table_->isEnabled(); }
     void setToolTip(std::string_view text) override;
     /// The log has no levels to indent.
     void setIndentationPerLevel(double /*points*/) override {}
-    void setDraggingSourceOperationMask(fixwell::DragOperation mask, bool isLocal) override;
-    fixwell::Scroller* verticalScroller() override { return &scroller_; }
+    void setDraggingSourceOperationMask(contract::DragOperation mask, bool isLocal) override;
+    contract::Scroller* verticalScroller() override { return &scroller_; }
 
 private:
     void noteChange();
@@ -64,15 +64,15 @@ private:
     std::function<void()> beforeRows_;
     LogModel model_;
     QtScroller scroller_;
-    fixwell::OutlineView* view_ = nullptr;
+    contract::OutlineView* view_ = nullptr;
     std::size_t rows_ = 0;
     bool mustReload_ = false;
     bool isWaiting_ = false;  ///< the event loop will come to `flush`
     LogPlace place_;          ///< of the reader, before the reload that is waiting
     std::optional<std::size_t> mustShow_;
     bool mustShowEnd_ = false;  ///< the row to be shown was the last one
-    fixwell::DragOperation localMask_ = fixwell::DragOperation::None;
-    fixwell::DragOperation outsideMask_ = fixwell::DragOperation::None;
+    contract::DragOperation localMask_ = contract::DragOperation::None;
+    contract::DragOperation outsideMask_ = contract::DragOperation::None;
 };
 
 }  // namespace orvane::desktop

@@ -23,7 +23,7 @@ constexpr double continuationChars = 4;  // further lines of a row stand in
 constexpr double partOfTitle = 0.55;     // of the header's width
 constexpr int phases = 3;
 
-LineLooks paperLooks(const fixwell::Font& defaultFont)
+LineLooks paperLooks(const contract::Font& defaultFont)
 {
     LineLooks looks;
     looks.defaultFont = defaultFont;
@@ -35,13 +35,13 @@ LineLooks paperLooks(const fixwell::Font& defaultFont)
 
 QFont headerFont()
 {
-    return scaledFont(fixwell::Font::system(headerPoints), 1);
+    return scaledFont(contract::Font::system(headerPoints), 1);
 }
 
 }  // namespace
 
-PrintJob::PrintJob(QPrinter& printer, std::vector<fixwell::StyledText> rows,
-                   const fixwell::Font& defaultFont, const fixwell::PrintInfo& info,
+PrintJob::PrintJob(QPrinter& printer, std::vector<contract::StyledText> rows,
+                   const contract::Font& defaultFont, const contract::PrintInfo& info,
                    PrintHeader header)
     : printer_(printer),
       rows_(std::move(rows)),
@@ -55,7 +55,7 @@ PrintJob::PrintJob(QPrinter& printer, std::vector<fixwell::StyledText> rows,
     }
     page_ = QRectF(QPointF(), printer_.pageLayout().paintRectPixels(printer_.resolution()).size());
     headerHeight_ = QFontMetricsF(headerFont(), &printer_).height() * headerLines;
-    fixwell::Font bold = looks_.defaultFont;
+    contract::Font bold = looks_.defaultFont;
     bold.isBold = true;
     lineHeight_ = QFontMetricsF(scaledFont(bold, 1), &printer_).height() * lineSpacing;
     width_ = page_.width();
@@ -114,7 +114,7 @@ void PrintJob::measure()
 
 void PrintJob::settleScale()
 {
-    if (info_.horizontalPagination == fixwell::Pagination::Fit)
+    if (info_.horizontalPagination == contract::Pagination::Fit)
         scale_ = std::clamp(page_.width() / widest_, smallestScale, 1.0);
     width_ = page_.width() / scale_;
     if (info_.isHorizontallyCentered)

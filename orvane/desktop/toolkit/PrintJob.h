@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Printing.h"
+#include "contract/toolkit/Printing.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include <QPainter>
@@ -29,8 +29,8 @@ class PrintJob {
 public:
     enum class State { Working, Done, Failed };
 
-    PrintJob(QPrinter& printer, std::vector<fixwell::StyledText> rows,
-             const fixwell::Font& defaultFont, const fixwell::PrintInfo& info, PrintHeader header);
+    PrintJob(QPrinter& printer, std::vector<contract::StyledText> rows,
+             const contract::Font& defaultFont, const contract::PrintInfo& info, PrintHeader header);
     PrintJob(const PrintJob&) = delete;
     PrintJob& operator=(const PrintJob&) = delete;
     /// Printing that has not come to its end is given up as by `cancel`.
@@ -60,8 +60,8 @@ private:
     void fail();
 
     QPrinter& printer_;
-    const std::vector<fixwell::StyledText> rows_;
-    const fixwell::PrintInfo info_;
+    const std::vector<contract::StyledText> rows_;
+    const contract::PrintInfo info_;
     const PrintHeader header_;
     LineLooks looks_;
     QPainter painter_;

@@ -30,7 +30,7 @@ QMessageBox* makeBox(QWidget* window, const std::string& message, const std::str
 
 }  // namespace
 
-class QtAlerts::Sheet final : public fixwell::Alert, public std::enable_shared_from_this<Sheet> {
+class QtAlerts::Sheet final : public contract::Alert, public std::enable_shared_from_this<Sheet> {
 public:
     Sheet(QWidget* window, const Text& text)
         : box_(makeBox(window, text.message, text.informative)),
@@ -54,15 +54,15 @@ public:
             box_->deleteLater();
     }
 
-    std::vector<fixwell::Button*> buttons() override
+    std::vector<contract::Button*> buttons() override
     {
-        std::vector<fixwell::Button*> all{&default_};
+        std::vector<contract::Button*> all{&default_};
         if (alternate_)
             all.push_back(alternate_.get());
         return all;
     }
 
-    void beginSheetModalForWindow(fixwell::Window* /*window*/,
+    void beginSheetModalForWindow(contract::Window* /*window*/,
                                   std::function<void(Alert&, long)> end) override
     {
         for (QtButton* button : {&default_, alternate_.get()})
@@ -111,7 +111,7 @@ private:
     std::function<void(Alert&, long)> end_;
 };
 
-std::shared_ptr<fixwell::Alert> QtAlerts::makeAlert(const fixwell::Alert::Text& text)
+std::shared_ptr<contract::Alert> QtAlerts::makeAlert(const contract::Alert::Text& text)
 {
     return std::make_shared<Sheet>(window_, text);
 }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Alert.h"
+#include "contract/toolkit/Alert.h"
 
 #include <QPointer>
 #include <QWidget>
@@ -13,7 +13,7 @@
 namespace orvane::desktop {
 
 /// Alerts as sheets: modal for their window alone, with plain text only.
-class QtAlerts final : public fixwell::Alerts {
+class QtAlerts final : public contract::Alerts {
 public:
     /// `errorText` explains an error code.
     explicit QtAlerts(std::function<std::string(std::int32_t)> errorText)
@@ -24,7 +24,7 @@ public:
     /// The window that sheets are shown on, whichever window a module names.
     void setWindow(QWidget* window) { window_ = window; }
 
-    std::shared_ptr<fixwell::Alert> makeAlert(const fixwell::Alert::Text& text) override;
+    std::shared_ptr<contract::Alert> makeAlert(const contract::Alert::Text& text) override;
     /// Returns at once; the sheet goes away with its button.
     void simpleModuleAlert(const std::string& title, const std::string& message,
                            std::int32_t error) override;

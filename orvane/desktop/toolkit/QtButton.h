@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Control.h"
+#include "contract/toolkit/Control.h"
 
 #include <QAbstractButton>
 
@@ -11,7 +11,7 @@
 namespace orvane::desktop {
 
 /// A push button or a check box. The widget must live as long as this object is used.
-class QtButton final : public fixwell::Button {
+class QtButton final : public contract::Button {
 public:
     using Pressed = std::function<void(QtButton& sender)>;
 
@@ -27,12 +27,12 @@ public:
     bool isEnabled() const override { return widget_.isEnabled(); }
     void setToolTip(std::string_view text) override;
     void setTitle(std::string_view title) override;
-    void setAction(fixwell::Selector action) override { action_ = action; }
+    void setAction(contract::Selector action) override { action_ = action; }
     void setIntegerValue(std::int64_t value) override { widget_.setChecked(value != 0); }
     void setKeyEquivalent(std::string_view key) override;
     void setTag(std::int64_t tag) override { tag_ = tag; }
 
-    fixwell::Selector action() const { return action_; }
+    contract::Selector action() const { return action_; }
     /// As the module gave it, without the escapes that the widget needs.
     const std::string& title() const { return title_; }
     const std::string& toolTip() const { return toolTip_; }

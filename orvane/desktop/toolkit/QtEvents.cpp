@@ -9,20 +9,20 @@ std::uint64_t modifierFlags(Qt::KeyboardModifiers modifiers)
 {
     std::uint64_t flags = 0;
     if (modifiers.testFlag(Qt::ShiftModifier))
-        flags |= fixwell::modifierShift;
+        flags |= contract::modifierShift;
     if (modifiers.testFlag(Qt::ControlModifier))
-        flags |= fixwell::modifierControl;
+        flags |= contract::modifierControl;
     if (modifiers.testFlag(Qt::AltModifier))
-        flags |= fixwell::modifierOption;
+        flags |= contract::modifierOption;
     return flags;
 }
 
 std::uint16_t keyCodeOf(int qtKey)
 {
     switch (qtKey) {
-        case Qt::Key_Backspace: return fixwell::keyDelete;
-        case Qt::Key_Delete: return fixwell::keyForwardDelete;
-        case Qt::Key_Clear: return fixwell::keyKeypadClear;
+        case Qt::Key_Backspace: return contract::keyDelete;
+        case Qt::Key_Delete: return contract::keyForwardDelete;
+        case Qt::Key_Clear: return contract::keyKeypadClear;
         default: return otherKey;
     }
 }

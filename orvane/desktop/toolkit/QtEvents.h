@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Event.h"
+#include "contract/toolkit/Event.h"
 
 #include <Qt>
 
@@ -13,7 +13,7 @@ std::uint16_t keyCodeOf(int qtKey);
 inline constexpr std::uint16_t otherKey = 0xFFFF;
 
 /// The keys that are held down now.
-class QtEvents final : public fixwell::Events {
+class QtEvents final : public contract::Events {
 public:
     std::uint64_t currentModifierFlags() const override;
 };

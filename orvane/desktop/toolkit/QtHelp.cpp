@@ -10,7 +10,7 @@ constexpr std::string_view geometryKey = "HelpWindow.geometry";
 constexpr std::string_view books = "help/";
 
 // English where the language has texts, but no book.
-std::filesystem::path bookDirectory(const fixwell::Bundle& bundle)
+std::filesystem::path bookDirectory(const contract::Bundle& bundle)
 {
     const auto translated = bundle.pathForResource(std::string(books) + languageOf(bundle));
     return translated.empty() ? bundle.pathForResource(std::string(books) + "en") : translated;
@@ -32,7 +32,7 @@ void QtHelp::makeWindow()
     window_->restoreGeometry(QByteArray::fromBase64(
         QByteArray::fromStdString(std::string(settings_.objectForKey(geometryKey).string()))));
     window_->setClosed([this](const QByteArray& geometry) {
-        settings_.setObjectForKey(fixwell::Value(geometry.toBase64().toStdString()), geometryKey);
+        settings_.setObjectForKey(contract::Value(geometry.toBase64().toStdString()), geometryKey);
     });
 }
 

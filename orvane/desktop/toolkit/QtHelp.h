@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
-#include "fixwell/host/foundation/UserDefaults.h"
-#include "fixwell/host/toolkit/Help.h"
+#include "contract/foundation/Bundle.h"
+#include "contract/foundation/UserDefaults.h"
+#include "contract/toolkit/Help.h"
 #include "orvane/desktop/toolkit/HelpWindow.h"
 
 #include <QPointer>
@@ -12,11 +12,11 @@ namespace orvane::desktop {
 
 /// The help book in a window of its own; no network and no browser is needed. The book is in the
 /// language of the bundle's texts, in `help/LANGUAGE`.
-class QtHelp final : public fixwell::HelpManager {
+class QtHelp final : public contract::HelpManager {
 public:
     /// `bundle` holds the book and the window's own few texts; `settings` keeps the window's size
     /// and place. Both outlive this object.
-    QtHelp(const fixwell::Bundle& bundle, fixwell::UserDefaults& settings)
+    QtHelp(const contract::Bundle& bundle, contract::UserDefaults& settings)
         : bundle_(bundle), settings_(settings)
     {
     }
@@ -33,8 +33,8 @@ public:
 private:
     void makeWindow();
 
-    const fixwell::Bundle& bundle_;
-    fixwell::UserDefaults& settings_;
+    const contract::Bundle& bundle_;
+    contract::UserDefaults& settings_;
     QPointer<HelpWindow> window_;
 };
 

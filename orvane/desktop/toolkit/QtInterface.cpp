@@ -11,12 +11,12 @@
 
 namespace orvane::desktop {
 
-LoadedInterface::LoadedInterface(std::unique_ptr<QWidget> root, fixwell::InterfaceOwner& owner,
+LoadedInterface::LoadedInterface(std::unique_ptr<QWidget> root, contract::InterfaceOwner& owner,
                                  const std::function<void()>& beforeRows)
     : root_(root.release()), owner_(&owner), beforeRows_(beforeRows)
 {
     adoptButtons();
-    for (const fixwell::Outlet& outlet : owner.outlets())
+    for (const contract::Outlet& outlet : owner.outlets())
         fill(outlet);
     limitSplitView();
 }
@@ -51,29 +51,29 @@ Widget* LoadedInterface::find(std::string_view name)
     return root_->findChild<Widget*>(toQt(name));
 }
 
-void LoadedInterface::fill(const fixwell::Outlet& outlet)
+void LoadedInterface::fill(const contract::Outlet& outlet)
 {
-    if (auto* const buttonPlace = std::get_if<fixwell::Button**>(&outlet.place)) {
+    if (auto* const buttonPlace = std::get_if<contract::Button**>(&outlet.place)) {
         if (QtButton* const found = button(outlet.name))
             **buttonPlace = found;
-    } else if (auto* const fieldPlace = std::get_if<fixwell::TextField**>(&outlet.place)) {
+    } else if (auto* const fieldPlace = std::get_if<contract::TextField**>(&outlet.place)) {
         if (auto* const label = find<QLabel>(outlet.name)) {
             auto field = std::make_unique<QtTextField>(*label);
             **fieldPlace = field.get();
             texts_.push_back(std::move(field));
         }
-    } else if (auto* const viewPlace = std::get_if<fixwell::TextView**>(&outlet.place)) {
+    } else if (auto* const viewPlace = std::get_if<contract::TextView**>(&outlet.place)) {
         if (auto* const edit = find<QPlainTextEdit>(outlet.name)) {
             auto view = std::make_unique<QtTextView>(*edit);
             **viewPlace = view.get();
             texts_.push_back(std::move(view));
         }
     } else if (auto* const tree = dynamic_cast<LogTable*>(find<QTableView>(outlet.name))) {
-        makeOutlineView(std::get<fixwell::OutlineView**>(outlet.place), *tree);
+        makeOutlineView(std::get<contract::OutlineView**>(outlet.place), *tree);
     }
 }
 
-void LoadedInterface::makeOutlineView(fixwell::OutlineView** place, LogTable& table)
+void LoadedInterface::makeOutlineView(contract::OutlineView** place, LogTable& table)
 {
     peer_ = std::make_unique<OutlinePeer>(table, beforeRows_);
     outlineView_ =
@@ -96,7 +96,7 @@ void LoadedInterface::makeOutlineView(fixwell::OutlineView** place, LogTable& ta
 void LoadedInterface::limitSplitView()
 {
     auto* const splitter = root_->findChild<QSplitter*>();
-    fixwell::SplitViewDelegate* const delegate = owner_->splitViewDelegate();
+    contract::SplitViewDelegate* const delegate = owner_->splitViewDelegate();
     if (splitter == nullptr || splitter->count() < 2 || delegate == nullptr)
         return;
     const double proposed = splitter->sizes().front();
@@ -131,7 +131,7 @@ void LoadedInterface::disconnect()
     outlineView_.reset();
 }
 
-bool QtInterface::loadInterface(std::string_view name, fixwell::InterfaceOwner& owner)
+bool QtInterface::loadInterface(std::string_view name, contract::InterfaceOwner& owner)
 {
     QString error;
     std::unique_ptr<QWidget> root;
@@ -148,7 +148,7 @@ bool QtInterface::loadInterface(std::string_view name, fixwell::InterfaceOwner& 
     return isLoaded;
 }
 
-void QtInterface::disconnect(fixwell::InterfaceOwner& owner)
+void QtInterface::disconnect(contract::InterfaceOwner& owner)
 {
     for (const auto& loaded : loaded_)
         if (loaded->belongsTo(owner))

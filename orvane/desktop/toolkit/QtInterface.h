@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
-#include "fixwell/host/toolkit/Interface.h"
+#include "contract/foundation/Bundle.h"
+#include "contract/toolkit/Interface.h"
 #include "orvane/desktop/toolkit/EmptyNote.h"
 #include "orvane/desktop/toolkit/OutlinePeer.h"
 #include "orvane/desktop/toolkit/QtButton.h"
@@ -26,7 +26,7 @@ class LoadedInterface {
 public:
     /// `root` is the widget that the interface file describes; this object owns it, wherever it
     /// is put in a window. The window must not be destroyed before the module.
-    LoadedInterface(std::unique_ptr<QWidget> root, fixwell::InterfaceOwner& owner,
+    LoadedInterface(std::unique_ptr<QWidget> root, contract::InterfaceOwner& owner,
                     const std::function<void()>& beforeRows);
     LoadedInterface(const LoadedInterface&) = delete;
     LoadedInterface& operator=(const LoadedInterface&) = delete;
@@ -43,55 +43,55 @@ public:
     }
     /// The module's view of its log, for the menus: copy, select all, delete, validation. None
     /// when the file has none, and after the module has gone.
-    fixwell::OutlineView* outlineView() { return outlineView_.get(); }
+    contract::OutlineView* outlineView() { return outlineView_.get(); }
     OutlinePeer* outlinePeer() { return peer_.get(); }
     /// What the log says while it is empty; none when it says nothing.
     EmptyNote* emptyNote() { return emptyNote_; }
 
     /// The module goes away: nothing is sent to it any more, and its view is destroyed.
     void disconnect();
-    bool belongsTo(const fixwell::InterfaceOwner& owner) const { return owner_ == &owner; }
+    bool belongsTo(const contract::InterfaceOwner& owner) const { return owner_ == &owner; }
 
 private:
     void adoptButtons();
-    void fill(const fixwell::Outlet& outlet);
+    void fill(const contract::Outlet& outlet);
     void limitSplitView();
-    void makeOutlineView(fixwell::OutlineView** place, LogTable& table);
+    void makeOutlineView(contract::OutlineView** place, LogTable& table);
     template <class Widget>
     Widget* find(std::string_view name);
 
     QPointer<QWidget> root_;
-    fixwell::InterfaceOwner* owner_;
+    contract::InterfaceOwner* owner_;
     const std::function<void()>& beforeRows_;
     std::function<void(std::string_view action)> beforeAction_;
     std::map<std::string, std::unique_ptr<QtButton>, std::less<>> buttons_;
-    std::vector<std::unique_ptr<fixwell::View>> texts_;
+    std::vector<std::unique_ptr<contract::View>> texts_;
     std::unique_ptr<OutlinePeer> peer_;
     QPointer<EmptyNote> emptyNote_;
-    std::unique_ptr<fixwell::OutlineView> outlineView_;
+    std::unique_ptr<contract::OutlineView> outlineView_;
 };
 
 /// Loads interface files, `NAME.ui`, as Qt Designer writes them. A widget's object name is the
 /// name of its outlet, a button's dynamic property `action` its first action, and the custom
 /// widget class of the log the name of the module's view class. Texts are looked up in the
 /// module's bundle. Main thread.
-class QtInterface final : public fixwell::InterfaceLoader {
+class QtInterface final : public contract::InterfaceLoader {
 public:
     /// `beforeRows` is called before new rows of a log are shown.
     explicit QtInterface(std::function<void()> beforeRows) : beforeRows_(std::move(beforeRows)) {}
 
     /// Where the interface file of the module that is made next lies; the bundle must live until
     /// then.
-    void setBundle(const fixwell::Bundle& bundle) { bundle_ = &bundle; }
+    void setBundle(const contract::Bundle& bundle) { bundle_ = &bundle; }
     /// The interface that was loaded last; none before, or when its file could not be read.
     LoadedInterface* latest() { return loaded_.empty() ? nullptr : loaded_.back().get(); }
 
-    bool loadInterface(std::string_view name, fixwell::InterfaceOwner& owner) override;
-    void disconnect(fixwell::InterfaceOwner& owner) override;
+    bool loadInterface(std::string_view name, contract::InterfaceOwner& owner) override;
+    void disconnect(contract::InterfaceOwner& owner) override;
 
 private:
     std::function<void()> beforeRows_;
-    const fixwell::Bundle* bundle_ = nullptr;
+    const contract::Bundle* bundle_ = nullptr;
     std::vector<std::unique_ptr<LoadedInterface>> loaded_;
 };
 

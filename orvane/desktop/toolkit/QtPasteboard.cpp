@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtPasteboard.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QClipboard>
@@ -19,28 +19,28 @@ QByteArray withoutControls(std::string_view text)
     result.reserve(text.size());
     while (!text.empty()) {
         const std::size_t end = std::min(text.find_first_of("\n\t"), text.size());
-        result += fixwell::printable(text.substr(0, end));
+        result += contract::printable(text.substr(0, end));
         result += text.substr(end, 1);
         text.remove_prefix(std::min(end + 1, text.size()));
     }
     return {result.data(), static_cast<qsizetype>(result.size())};
 }
 
-void put(QMimeData& data, std::string_view bytes, fixwell::PasteboardType type)
+void put(QMimeData& data, std::string_view bytes, contract::PasteboardType type)
 {
     const QByteArray raw(bytes.data(), static_cast<qsizetype>(bytes.size()));
     switch (type) {
-        case fixwell::PasteboardType::PlainString:
+        case contract::PasteboardType::PlainString:
             data.setText(QString::fromUtf8(withoutControls(bytes)));
             return;
-        case fixwell::PasteboardType::TabularText:
+        case contract::PasteboardType::TabularText:
             data.setData(QStringLiteral("text/tab-separated-values"), withoutControls(bytes));
             return;
-        case fixwell::PasteboardType::RTF:
+        case contract::PasteboardType::RTF:
             data.setData(QStringLiteral("text/rtf"), raw);
             data.setData(QStringLiteral("application/rtf"), raw);
             return;
-        case fixwell::PasteboardType::RTFD:
+        case contract::PasteboardType::RTFD:
             data.setData(QStringLiteral("application/x-rtfd"), raw);
             return;
     }
@@ -48,14 +48,14 @@ void put(QMimeData& data, std::string_view bytes, fixwell::PasteboardType type)
 
 }  // namespace
 
-void MimePasteboard::declareTypes(const std::vector<fixwell::PasteboardType>& types,
+void MimePasteboard::declareTypes(const std::vector<contract::PasteboardType>& types,
                                   const void* /*owner*/)
 {
     data_ = std::make_unique<QMimeData>();
     missing_ = types;
 }
 
-void MimePasteboard::setData(std::string_view data, fixwell::PasteboardType type)
+void MimePasteboard::setData(std::string_view data, contract::PasteboardType type)
 {
     const auto declared = std::find(missing_.begin(), missing_.end(), type);
     if (!data_ || declared == missing_.end())

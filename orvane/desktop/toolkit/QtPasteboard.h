@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Pasteboard.h"
+#include "contract/toolkit/Pasteboard.h"
 
 #include <QMimeData>
 
@@ -14,11 +14,11 @@ namespace orvane::desktop {
 
 /// Collects what a module puts on a pasteboard as MIME data: text/plain,
 /// text/tab-separated-values, text/rtf and application/rtf, application/x-rtfd.
-class MimePasteboard : public fixwell::Pasteboard {
+class MimePasteboard : public contract::Pasteboard {
 public:
-    void declareTypes(const std::vector<fixwell::PasteboardType>& types,
+    void declareTypes(const std::vector<contract::PasteboardType>& types,
                       const void* owner) override;
-    void setData(std::string_view data, fixwell::PasteboardType type) override;
+    void setData(std::string_view data, contract::PasteboardType type) override;
 
     /// What was collected; none when nothing was declared since the last call.
     std::unique_ptr<QMimeData> take() { return std::move(data_); }
@@ -29,7 +29,7 @@ protected:
 
 private:
     std::unique_ptr<QMimeData> data_;
-    std::vector<fixwell::PasteboardType> missing_;
+    std::vector<contract::PasteboardType> missing_;
 };
 
 /// The clipboard. Everything that was declared goes there together.

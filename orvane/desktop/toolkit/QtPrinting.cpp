@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtPrinting.h"
 
-#include "fixwell/host/foundation/Format.h"
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/Format.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/Text.h"
 
@@ -18,9 +18,9 @@ constexpr double paperMargin = 15;  // millimetres
 constexpr int progressSteps = 1000;
 
 // The records are shared with the history, not copied.
-std::vector<fixwell::StyledText> rowsOf(fixwell::OutlineView& view)
+std::vector<contract::StyledText> rowsOf(contract::OutlineView& view)
 {
-    std::vector<fixwell::StyledText> rows;
+    std::vector<contract::StyledText> rows;
     rows.reserve(view.numberOfRows());
     for (std::size_t row = 0; row < view.numberOfRows(); ++row)
         rows.push_back(textOfRow(view, row));
@@ -29,7 +29,7 @@ std::vector<fixwell::StyledText> rowsOf(fixwell::OutlineView& view)
 
 }  // namespace
 
-QtPrinting::QtPrinting(const fixwell::Bundle& texts, Failed failed)
+QtPrinting::QtPrinting(const contract::Bundle& texts, Failed failed)
     : texts_(texts), failed_(std::move(failed))
 {
     // A timer leaves the window its turn between two slices.
@@ -51,7 +51,7 @@ QString QtPrinting::text(std::string_view key) const
 QString QtPrinting::title() const
 {
     const std::string title = title_ ? title_() : std::string();
-    return title.empty() ? text("Log of checks and repairs") : toQt(fixwell::printable(title));
+    return title.empty() ? text("Log of checks and repairs") : toQt(contract::printable(title));
 }
 
 PrintHeader QtPrinting::header() const
@@ -59,11 +59,11 @@ PrintHeader QtPrinting::header() const
     return {
         title(), QLocale().toString(QDateTime::currentDateTime(), QLocale::ShortFormat),
         [this](int page, int pages) {
-            return toQt(fixwell::format(texts_.localizedString("Page %ld of %ld"), {page, pages}));
+            return toQt(contract::format(texts_.localizedString("Page %ld of %ld"), {page, pages}));
         }};
 }
 
-void QtPrinting::forget(const fixwell::OutlineView& view)
+void QtPrinting::forget(const contract::OutlineView& view)
 {
     if (view_ != &view)
         return;
@@ -71,8 +71,8 @@ void QtPrinting::forget(const fixwell::OutlineView& view)
     end(false);
 }
 
-void QtPrinting::runPrintOperation(fixwell::OutlineView& view, const fixwell::PrintInfo& info,
-                                   bool showsPanel, fixwell::Window* /*window*/)
+void QtPrinting::runPrintOperation(contract::OutlineView& view, const contract::PrintInfo& info,
+                                   bool showsPanel, contract::Window* /*window*/)
 {
     if (isPrinting())
         return;
@@ -95,11 +95,11 @@ void QtPrinting::runPrintOperation(fixwell::OutlineView& view, const fixwell::Pr
     panel->open();
 }
 
-void QtPrinting::start(std::shared_ptr<QPrinter> printer, const fixwell::PrintInfo& info)
+void QtPrinting::start(std::shared_ptr<QPrinter> printer, const contract::PrintInfo& info)
 {
     printer_ = std::move(printer);
-    const fixwell::Font font =
-        view_->dataCell() != nullptr ? view_->dataCell()->font() : fixwell::Font();
+    const contract::Font font =
+        view_->dataCell() != nullptr ? view_->dataCell()->font() : contract::Font();
     job_ = std::make_unique<PrintJob>(*printer_, rowsOf(*view_), font, info, header());
     // It shows itself when printing takes longer than a moment.
     progress_ =

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
-#include "fixwell/host/toolkit/Printing.h"
+#include "contract/foundation/Bundle.h"
+#include "contract/toolkit/Printing.h"
 #include "orvane/desktop/toolkit/PrintJob.h"
 
 #include <QPointer>
@@ -18,13 +18,13 @@ namespace orvane::desktop {
 
 /// Prints logs: the desktop's print panel, then the pages in slices, with a sheet that shows how
 /// far it is once that takes long, and can give it up. One log at a time. Main thread.
-class QtPrinting final : public fixwell::Printing {
+class QtPrinting final : public contract::Printing {
 public:
     /// Told when a log could not be printed.
     using Failed = std::function<void()>;
 
     /// `texts` outlives this object.
-    QtPrinting(const fixwell::Bundle& texts, Failed failed);
+    QtPrinting(const contract::Bundle& texts, Failed failed);
     ~QtPrinting() override;
 
     /// The window that sheets are shown on, whichever window a module names.
@@ -33,11 +33,11 @@ public:
     /// answers may be hostile.
     void setTitle(std::function<std::string()> title) { title_ = std::move(title); }
     /// A view goes away: what is being printed of it is given up.
-    void forget(const fixwell::OutlineView& view);
+    void forget(const contract::OutlineView& view);
 
-    fixwell::PrintInfo& sharedPrintInfo() override { return info_; }
-    void runPrintOperation(fixwell::OutlineView& view, const fixwell::PrintInfo& info,
-                           bool showsPanel, fixwell::Window* window) override;
+    contract::PrintInfo& sharedPrintInfo() override { return info_; }
+    void runPrintOperation(contract::OutlineView& view, const contract::PrintInfo& info,
+                           bool showsPanel, contract::Window* window) override;
 
     bool isPrinting() const { return job_ != nullptr; }
 
@@ -45,17 +45,17 @@ private:
     QString text(std::string_view key) const;
     QString title() const;
     PrintHeader header() const;
-    void start(std::shared_ptr<QPrinter> printer, const fixwell::PrintInfo& info);
+    void start(std::shared_ptr<QPrinter> printer, const contract::PrintInfo& info);
     void goOn();
     void end(bool hasFailed);
 
-    const fixwell::Bundle& texts_;
+    const contract::Bundle& texts_;
     Failed failed_;
     std::function<std::string()> title_;
-    fixwell::PrintInfo info_;
+    contract::PrintInfo info_;
     QPointer<QWidget> window_;
     QPointer<QWidget> panel_;
-    fixwell::OutlineView* view_ = nullptr;  ///< of the panel or the job
+    contract::OutlineView* view_ = nullptr;  ///< of the panel or the job
     std::shared_ptr<QPrinter> printer_;
     std::unique_ptr<PrintJob> job_;
     QPointer<QProgressDialog> progress_;

@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Control.h"
+#include "contract/toolkit/Control.h"
 
 #include <QScrollBar>
 
 namespace orvane::desktop {
 
 /// A scroll bar, which must live as long as this object is used.
-class QtScroller final : public fixwell::Scroller {
+class QtScroller final : public contract::Scroller {
 public:
     explicit QtScroller(const QScrollBar& bar) : bar_(bar) {}
 

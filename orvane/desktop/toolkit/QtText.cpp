@@ -23,7 +23,7 @@ void QtTextField::setToolTip(std::string_view text)
     label_.setToolTip(toQtToolTip(text));
 }
 
-void QtTextField::setAttributedStringValue(const fixwell::StyledText& text)
+void QtTextField::setAttributedStringValue(const contract::StyledText& text)
 {
     label_.setText(toQt(html(text, desktopFontScale())));
     label_.setAccessibleDescription(toQt(text.characters()));

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/toolkit/Control.h"
+#include "contract/toolkit/Control.h"
 
 #include <QLabel>
 #include <QPlainTextEdit>
@@ -10,7 +10,7 @@ namespace orvane::desktop {
 
 /// Text that is only read, with its fonts relative to the desktop's size. The label must live as
 /// long as this object is used.
-class QtTextField final : public fixwell::TextField {
+class QtTextField final : public contract::TextField {
 public:
     explicit QtTextField(QLabel& label);
 
@@ -18,7 +18,7 @@ public:
     void setEnabled(bool isEnabled) override { label_.setEnabled(isEnabled); }
     bool isEnabled() const override { return label_.isEnabled(); }
     void setToolTip(std::string_view text) override;
-    void setAttributedStringValue(const fixwell::StyledText& text) override;
+    void setAttributedStringValue(const contract::StyledText& text) override;
 
 private:
     QLabel& label_;
@@ -26,7 +26,7 @@ private:
 
 /// A place for plain messages that takes no room while there is none. The widget must live as
 /// long as this object is used.
-class QtTextView final : public fixwell::TextView {
+class QtTextView final : public contract::TextView {
 public:
     explicit QtTextView(QPlainTextEdit& widget);
 

@@ -10,12 +10,12 @@
 
 namespace orvane::desktop {
 
-std::string languageOf(const fixwell::Bundle& bundle)
+std::string languageOf(const contract::Bundle& bundle)
 {
     return bundle.localizedString("en");
 }
 
-void translateQt(const fixwell::Bundle& bundle)
+void translateQt(const contract::Bundle& bundle)
 {
     const std::string language = languageOf(bundle);
     if (language == "en")

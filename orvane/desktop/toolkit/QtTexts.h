@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
+#include "contract/foundation/Bundle.h"
 
 #include <string>
 
@@ -9,10 +9,10 @@ namespace orvane::desktop {
 
 /// The language of the bundle's texts as a code ("de"); "en" where they are not translated. It is
 /// the translation of "en".
-[[nodiscard]] std::string languageOf(const fixwell::Bundle& bundle);
+[[nodiscard]] std::string languageOf(const contract::Bundle& bundle);
 
 /// Qt's own texts, as in the dialogs for files and printing, come in the bundle's language from
 /// now on, where Qt's translations are installed. Main thread, with the application object there.
-void translateQt(const fixwell::Bundle& bundle);
+void translateQt(const contract::Bundle& bundle);
 
 }  // namespace orvane::desktop

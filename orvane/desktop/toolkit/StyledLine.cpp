@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/StyledLine.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Contrast.h"
 #include "orvane/desktop/toolkit/DesktopFont.h"
 #include "orvane/desktop/toolkit/Text.h"
@@ -14,11 +14,11 @@ namespace {
 // No screen shows more; laying out a line of a megabyte would take seconds.
 constexpr std::size_t keptBytesAtEachEnd = 4096;
 
-void append(StyledLine& line, std::string_view bytes, const fixwell::TextStyle* style)
+void append(StyledLine& line, std::string_view bytes, const contract::TextStyle* style)
 {
     std::string spaced(bytes);
     std::replace(spaced.begin(), spaced.end(), '\n', ' ');
-    const QString part = toQt(fixwell::printable(spaced));
+    const QString part = toQt(contract::printable(spaced));
     if (part.isEmpty())
         return;
     line.text += part;
@@ -40,22 +40,22 @@ void appendRuns(std::vector<StyledLine::Run>& runs, const StyledLine& line, qsiz
     }
 }
 
-Qt::TextElideMode elideMode(fixwell::LineBreak lineBreak)
+Qt::TextElideMode elideMode(contract::LineBreak lineBreak)
 {
     switch (lineBreak) {
-        case fixwell::LineBreak::TruncateHead: return Qt::ElideLeft;
-        case fixwell::LineBreak::TruncateTail: return Qt::ElideRight;
-        case fixwell::LineBreak::TruncateMiddle: return Qt::ElideMiddle;
+        case contract::LineBreak::TruncateHead: return Qt::ElideLeft;
+        case contract::LineBreak::TruncateTail: return Qt::ElideRight;
+        case contract::LineBreak::TruncateMiddle: return Qt::ElideMiddle;
         default: return Qt::ElideNone;
     }
 }
 
-fixwell::Font fontOf(const fixwell::TextStyle& style, const LineLooks& looks)
+contract::Font fontOf(const contract::TextStyle& style, const LineLooks& looks)
 {
     return style.font.value_or(looks.defaultFont);
 }
 
-QFont qtFont(const fixwell::Font& font, const LineLooks& looks)
+QFont qtFont(const contract::Font& font, const LineLooks& looks)
 {
     QFont result = scaledFont(font, looks.fontScale);
     // Spaced letters are never joined.
@@ -64,11 +64,11 @@ QFont qtFont(const fixwell::Font& font, const LineLooks& looks)
     return result;
 }
 
-QColor colorOf(const fixwell::TextStyle& style, const LineLooks& looks)
+QColor colorOf(const contract::TextStyle& style, const LineLooks& looks)
 {
     if (!style.color || looks.keepsTextColor)
         return looks.textColor;
-    const fixwell::Color& color = *style.color;
+    const contract::Color& color = *style.color;
     const auto part = [](double value) {
         return static_cast<float>(std::clamp(value, 0.0, 1.0));
     };
@@ -78,7 +78,7 @@ QColor colorOf(const fixwell::TextStyle& style, const LineLooks& looks)
 
 }  // namespace
 
-StyledLine oneLine(const fixwell::StyledText& text)
+StyledLine oneLine(const contract::StyledText& text)
 {
     const std::string_view all = text.characters();
     const std::size_t end = all.find_last_not_of('\n') + 1;
@@ -88,7 +88,7 @@ StyledLine oneLine(const fixwell::StyledText& text)
 
     StyledLine line;
     std::size_t at = 0;
-    for (const fixwell::StyledText::Run& run : text.runs()) {
+    for (const contract::StyledText::Run& run : text.runs()) {
         const std::size_t runEnd = at + run.length;
         if (at < headEnd)
             append(line, all.substr(at, std::min(runEnd, headEnd) - at), run.style);
@@ -129,9 +129,9 @@ StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double w
 
 QFont widestFont(const StyledLine& line, const LineLooks& looks)
 {
-    fixwell::Font widest = line.runs.empty() ? looks.defaultFont : fixwell::Font();
+    contract::Font widest = line.runs.empty() ? looks.defaultFont : contract::Font();
     for (const StyledLine::Run& run : line.runs) {
-        const fixwell::Font font = fontOf(*run.style, looks);
+        const contract::Font font = fontOf(*run.style, looks);
         widest.isBold = widest.isBold || font.isBold;
         widest.points = std::max(widest.points, font.points);
     }

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/StyledText.h"
+#include "contract/foundation/StyledText.h"
 
 #include <QFontMetricsF>
 #include <QPainter>
@@ -17,17 +17,17 @@ namespace orvane::desktop {
 struct StyledLine {
     struct Run {
         qsizetype length;
-        const fixwell::TextStyle* style;
+        const contract::TextStyle* style;
     };
 
     QString text;
     std::vector<Run> runs;
-    fixwell::LineBreak lineBreak = fixwell::LineBreak::Clip;
+    contract::LineBreak lineBreak = contract::LineBreak::Clip;
 };
 
 /// Line ends at the end are dropped, others become spaces; control characters become U+FFFD.
 /// Of a text too long for any screen the middle is left out.
-StyledLine oneLine(const fixwell::StyledText& text);
+StyledLine oneLine(const contract::StyledText& text);
 
 /// The line with an ellipsis where its paragraph style wants it, when it is wider than `width`.
 /// The measure is `metrics`; take those of the widest font in the line.
@@ -36,7 +36,7 @@ StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double w
 /// How a line is put on a screen or on paper.
 struct LineLooks {
     double fontScale = 1;       ///< of the points of the text
-    fixwell::Font defaultFont;  ///< for runs that name none
+    contract::Font defaultFont;  ///< for runs that name none
     QColor textColor;           ///< for runs that name none
     QColor background;          ///< colours are made readable on it
     bool joinsLetters = true;   ///< NO where the text is searched later: “fi” stays two letters

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/Text.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <QColor>
 
@@ -22,7 +22,7 @@ void appendEscaped(std::string& html, char32_t character)
         case '\'': html += "&#39;"; return;
         default: break;
     }
-    fixwell::appendUTF8(html, character);
+    contract::appendUTF8(html, character);
 }
 
 std::string points(double number)
@@ -35,7 +35,7 @@ std::string points(double number)
     return digits;
 }
 
-std::string spanStart(const fixwell::TextStyle& style, double fontScale)
+std::string spanStart(const contract::TextStyle& style, double fontScale)
 {
     std::string css;
     if (style.font) {
@@ -53,9 +53,9 @@ std::string spanStart(const fixwell::TextStyle& style, double fontScale)
     return "<span style=\"" + css + "\">";
 }
 
-std::string paragraphStart(const fixwell::TextStyle& style)
+std::string paragraphStart(const contract::TextStyle& style)
 {
-    const fixwell::ParagraphStyle paragraph = style.paragraph.value_or(fixwell::ParagraphStyle());
+    const contract::ParagraphStyle paragraph = style.paragraph.value_or(contract::ParagraphStyle());
     const auto pixels = [](double number) {
         return std::to_string(static_cast<int>(number)) + "px";
     };
@@ -89,12 +89,12 @@ QString toQtToolTip(std::string_view text)
            QStringLiteral("</p>");
 }
 
-std::string html(const fixwell::StyledText& text, double fontScale)
+std::string html(const contract::StyledText& text, double fontScale)
 {
     std::string result;
     bool isInParagraph = false;
     std::string_view rest = text.characters();
-    for (const fixwell::StyledText::Run& run : text.runs()) {
+    for (const contract::StyledText::Run& run : text.runs()) {
         std::string_view characters = rest.substr(0, run.length);
         rest.remove_prefix(run.length);
         const std::string span = spanStart(*run.style, fontScale);
@@ -106,7 +106,7 @@ std::string html(const fixwell::StyledText& text, double fontScale)
             const std::string_view line = characters.substr(0, end);
             result += span;
             // HTML 5 has no place for control characters.
-            fixwell::forEachCharacter(fixwell::printable(line), [&result](char32_t character) {
+            contract::forEachCharacter(contract::printable(line), [&result](char32_t character) {
                 appendEscaped(result, character);
             });
             // A paragraph without contents would have no height.

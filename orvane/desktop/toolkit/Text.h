@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/StyledText.h"
+#include "contract/foundation/StyledText.h"
 
 #include <QString>
 
@@ -24,6 +24,6 @@ QString toQtToolTip(std::string_view text);
 
 /// The text as a fragment of HTML, everything escaped: bold, colour and size (in points,
 /// multiplied by `fontScale`) of each run, and one paragraph for each line.
-std::string html(const fixwell::StyledText& text, double fontScale = 1);
+std::string html(const contract::StyledText& text, double fontScale = 1);
 
 }  // namespace orvane::desktop

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/DiskIcons.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <QPainter>
 #include <QPainterPath>
@@ -122,9 +122,9 @@ QIcon verdictIcon(std::string_view verdict)
     static const QIcon cross =
         drawn(sign(redColor, {{5.6, 5.6}, {10.4, 10.4}, {10.4, 5.6}, {5.6, 10.4}}));
     static const QIcon mark = drawn(sign(amberColor, {{8, 4.6}, {8, 8.8}, {8, 11.4}, {8, 11.5}}));
-    if (verdict == fixwell::kPLVerdictSound.text() || verdict == fixwell::kPLVerdictRepaired.text())
+    if (verdict == contract::kPLVerdictSound.text() || verdict == contract::kPLVerdictRepaired.text())
         return check;
-    return verdict == fixwell::kPLVerdictDamaged.text() ? cross : mark;
+    return verdict == contract::kPLVerdictDamaged.text() ? cross : mark;
 }
 
 }  // namespace orvane::desktop

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/DiskRow.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/support/disks/DiskTypes.h"
 
@@ -13,7 +13,7 @@ namespace {
 
 QString shown(const std::string& text)
 {
-    return toQt(fixwell::printable(text));
+    return toQt(contract::printable(text));
 }
 
 std::string_view kindText(std::int32_t type)
@@ -35,7 +35,7 @@ QString nameText(const DiskRow& row)
     const DiskFacts& facts = row.facts;
     const QString file = shown(facts.path.filename().native());
     const QString label = shown(row.label);
-    const bool isInImage = facts.storage == fixwell::DiskReference::Storage::FileRegion &&
+    const bool isInImage = facts.storage == contract::DiskReference::Storage::FileRegion &&
                            facts.type != diskType::diskImage;
     if (!label.isEmpty() && !isInImage && !file.isEmpty())
         return label + QStringLiteral(" (") + file + QLatin1Char(')');
@@ -76,7 +76,7 @@ QStringList toolTipOfCheck(const LastCheck& check, const Translator& texts)
     if (check.isPartial)
         lines += toQt(texts.text("not all of its volumes have been checked"));
     if (!check.part.empty())
-        lines += toQt(texts.sentence("on it: “%@”", {fixwell::printable(check.part)}));
+        lines += toQt(texts.sentence("on it: “%@”", {contract::printable(check.part)}));
     lines += toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(check.told.started)),
                                                          fromQt(verdictText(check.told, texts))}));
     if (!check.told.message.empty())
@@ -142,7 +142,7 @@ QString rowDetails(const DiskRow& row, const Translator& texts)
     if (row.facts.length != 0)
         parts += sizeText(row.facts.length);
     if (!row.facts.mountPoint.empty())
-        parts += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
+        parts += toQt(texts.sentence("mounted at %@", {contract::printable(row.facts.mountPoint)}));
     if (row.facts.hasSMARTError)
         parts += toQt(texts.text("its drive says that it is failing"));
     return parts.join(QStringLiteral(", "));
@@ -169,7 +169,7 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
     if (!row.filesystem.empty())
         lines.back() += QStringLiteral(", ") + shown(row.filesystem);
     if (!row.facts.mountPoint.empty())
-        lines += toQt(texts.sentence("mounted at %@", {fixwell::printable(row.facts.mountPoint)}));
+        lines += toQt(texts.sentence("mounted at %@", {contract::printable(row.facts.mountPoint)}));
     if (!row.note.empty())
         lines += shown(row.note);
     if (!row.activity.empty())

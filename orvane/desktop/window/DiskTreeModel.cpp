@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/DiskTreeModel.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskIcons.h"
 
@@ -12,17 +12,17 @@ namespace {
 
 bool isImageContents(const Disk& disk)
 {
-    return disk.facts().storage == fixwell::DiskReference::Storage::FileRegion &&
+    return disk.facts().storage == contract::DiskReference::Storage::FileRegion &&
            !disk.isOfflineDiskImage();
 }
 
 /// What is good is 0, and what is known to be bad is worse than what is not known.
 int badness(const Check& check)
 {
-    if (check.verdict == fixwell::kPLVerdictSound.text() ||
-        check.verdict == fixwell::kPLVerdictRepaired.text())
+    if (check.verdict == contract::kPLVerdictSound.text() ||
+        check.verdict == contract::kPLVerdictRepaired.text())
         return 0;
-    return check.verdict == fixwell::kPLVerdictDamaged.text() ? 2 : 1;
+    return check.verdict == contract::kPLVerdictDamaged.text() ? 2 : 1;
 }
 
 /// None while something is done to the disk: its verdict is not shown then.

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/ProgressArea.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QHBoxLayout>
@@ -80,7 +80,7 @@ void ProgressArea::showRange()
 
 void ProgressArea::setText(std::string_view text)
 {
-    text_ = toQt(fixwell::printable(text));
+    text_ = toQt(contract::printable(text));
     showText();
 }
 

@@ -4,7 +4,7 @@
 namespace orvane::desktop {
 
 // Every disk stands in the list once, so there is nothing to filter.
-std::vector<fixwell::OVDiskPointer> WindowController::allSelectedItemsFilterDuplicates(
+std::vector<contract::OVDiskPointer> WindowController::allSelectedItemsFilterDuplicates(
     bool /*flag*/, bool /*filtersDuplicates*/)
 {
     if (!selection_.empty())
@@ -45,7 +45,7 @@ void WindowController::setGlobalProgressText(std::string_view text)
     window_.progress().setText(text);
 }
 
-void WindowController::notifyWindowOfCompletion(const fixwell::Dictionary& report)
+void WindowController::notifyWindowOfCompletion(const contract::Dictionary& report)
 {
     if (events_.completed)
         events_.completed(report);

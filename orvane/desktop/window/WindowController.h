@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVWindowController.h"
-#include "fixwell/host/toolkit/Control.h"
+#include "contract/support/OVWindowController.h"
+#include "contract/toolkit/Control.h"
 #include "orvane/desktop/window/MainWindow.h"
 
 #include <functional>
@@ -10,21 +10,21 @@
 namespace orvane::desktop {
 
 /// What the modules see of the window. Main thread; the window must outlive it.
-class WindowController final : public fixwell::OVWindowController, public fixwell::Window {
+class WindowController final : public contract::OVWindowController, public contract::Window {
 public:
     struct Events {
         std::function<void(bool isLocked)> lockChanged;
-        std::function<void(const fixwell::Dictionary& report)> completed;
+        std::function<void(const contract::Dictionary& report)> completed;
     };
 
     explicit WindowController(MainWindow& window) : window_(window) {}
     void setEvents(Events events) { events_ = std::move(events); }
 
-    using Disks = std::vector<fixwell::OVDiskPointer>;
+    using Disks = std::vector<contract::OVDiskPointer>;
     /// The modules see these as the selection, whatever the list shows, until none are given.
     void setSelection(Disks disks) { selection_ = std::move(disks); }
 
-    std::vector<fixwell::OVDiskPointer> allSelectedItemsFilterDuplicates(
+    std::vector<contract::OVDiskPointer> allSelectedItemsFilterDuplicates(
         bool flag, bool filtersDuplicates) override;
     void setInterfaceLock() override { setLocked(true); }
     void resetInterfaceLock() override { setLocked(false); }
@@ -36,7 +36,7 @@ public:
     void startGlobalProgressBarAnimation(const void* /*sender*/) override {}
     void setGlobalProgressBarValue(double percent) override;
     void setGlobalProgressText(std::string_view text) override;
-    void notifyWindowOfCompletion(const fixwell::Dictionary& report) override;
+    void notifyWindowOfCompletion(const contract::Dictionary& report) override;
     bool isMainWindow() const override { return window_.hasAttention(); }
 
 private:

@@ -10,12 +10,12 @@
 namespace orvane {
 namespace {
 
-using fixwell::Array;
-using fixwell::Value;
+using contract::Array;
+using contract::Value;
 
-fixwell::DiskReferencePointer referenceTo(const DiskFacts& facts)
+contract::DiskReferencePointer referenceTo(const DiskFacts& facts)
 {
-    fixwell::DiskReference reference;
+    contract::DiskReference reference;
     reference.storage = facts.storage;
     reference.path = facts.path;
     reference.offset = facts.offset;
@@ -25,7 +25,7 @@ fixwell::DiskReferencePointer referenceTo(const DiskFacts& facts)
     reference.filesystem = facts.filesystem;
     reference.mountPoint = facts.mountPoint;
     reference.isWhole = facts.isWhole;
-    return std::make_shared<const fixwell::DiskReference>(std::move(reference));
+    return std::make_shared<const contract::DiskReference>(std::move(reference));
 }
 
 }  // namespace
@@ -84,19 +84,19 @@ void Disk::setContents(std::shared_ptr<Disk> contents)
         contents_->image_ = weak_from_this();
 }
 
-std::shared_ptr<fixwell::OVDisk> Disk::parentDisk() const
+std::shared_ptr<contract::OVDisk> Disk::parentDisk() const
 {
     const auto parent = parent_.lock();
     const auto image = parent ? parent->image_.lock() : nullptr;
     return image ? image : parent;
 }
 
-std::vector<std::shared_ptr<fixwell::OVDisk>> Disk::children() const
+std::vector<std::shared_ptr<contract::OVDisk>> Disk::children() const
 {
     return {children_.begin(), children_.end()};
 }
 
-const fixwell::OVFilesystem* Disk::filesystem() const
+const contract::OVFilesystem* Disk::filesystem() const
 {
     return filesystem_.get();
 }

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/UTF8.h"
-#include "fixwell/host/support/OVDisk.h"
+#include "contract/foundation/UTF8.h"
+#include "contract/support/OVDisk.h"
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/disks/DiskFilesystem.h"
 #include "orvane/support/disks/HistoryKeeper.h"
@@ -16,7 +16,7 @@ namespace orvane {
 
 /// A disk of the host: facts, and where its history is kept. Main thread only, except that any
 /// thread may make one and hand it over.
-class Disk final : public fixwell::OVDisk, public std::enable_shared_from_this<Disk> {
+class Disk final : public contract::OVDisk, public std::enable_shared_from_this<Disk> {
 public:
     /// What every disk needs of the host. All must outlive the disks.
     struct Surroundings {
@@ -43,7 +43,7 @@ public:
 
     std::string diskIdentifier() const override { return facts_.identifier; }
     /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.
-    std::string displayName() const override { return fixwell::printable(facts_.displayName); }
+    std::string displayName() const override { return contract::printable(facts_.displayName); }
     std::int32_t diskType() const override { return facts_.type; }
     std::int64_t diskNumber() const override { return facts_.number; }
     bool isWhole() const override { return facts_.isWhole; }
@@ -66,12 +66,12 @@ public:
     bool permissionsEnabled() const override;
     /// It is the root of a system whose package database the library knows.
     bool canRepairPermissions() const override;
-    const fixwell::OVFilesystem* filesystem() const override;
-    fixwell::DiskReferencePointer theKRDisk() const override { return reference_; }
+    const contract::OVFilesystem* filesystem() const override;
+    contract::DiskReferencePointer theKRDisk() const override { return reference_; }
 
-    fixwell::Array fsckHistory() const override;
-    fixwell::Array fsckHistoryNoChildren() const override;
-    void setFsckHistory(const fixwell::Array& history) override;
+    contract::Array fsckHistory() const override;
+    contract::Array fsckHistoryNoChildren() const override;
+    void setFsckHistory(const contract::Array& history) override;
     bool clearFsckHistory() override;
 
 private:
@@ -82,13 +82,13 @@ private:
     bool hasGone_ = false;
     Surroundings surroundings_;
     std::unique_ptr<DiskFilesystem> filesystem_;  ///< none where there is no file system
-    fixwell::DiskReferencePointer reference_;
+    contract::DiskReferencePointer reference_;
     std::weak_ptr<Disk> parent_;
     std::vector<std::shared_ptr<Disk>> children_;
     std::shared_ptr<Disk> contents_;
     std::weak_ptr<Disk> image_;  ///< of a disk that is the contents of one
 
-    mutable fixwell::Array own_;
+    mutable contract::Array own_;
     mutable std::uint64_t ownRevision_ = 0;  ///< of the keeper, when it was asked
     mutable MergedHistory merged_;
 };

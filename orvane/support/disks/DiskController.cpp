@@ -7,11 +7,11 @@
 namespace orvane {
 namespace {
 
-using fixwell::OVDiskPointer;
+using contract::OVDiskPointer;
 
 bool isOfImage(const Disk& disk)
 {
-    return disk.facts().storage == fixwell::DiskReference::Storage::FileRegion;
+    return disk.facts().storage == contract::DiskReference::Storage::FileRegion;
 }
 
 bool isVolume(const Disk& disk)
@@ -43,7 +43,7 @@ DiskTree treeOf(const Disk& disk)
     return tree;
 }
 
-DiskFacts factsOf(const fixwell::DiskReference& reference)
+DiskFacts factsOf(const contract::DiskReference& reference)
 {
     DiskFacts facts;
     facts.identifier = reference.identifier;
@@ -68,7 +68,7 @@ std::vector<std::shared_ptr<Disk>> withParts(const std::shared_ptr<Disk>& disk)
     return all;
 }
 
-DiskController::DiskController(fixwell::NotificationCenter& center, Disk::Surroundings surroundings)
+DiskController::DiskController(contract::NotificationCenter& center, Disk::Surroundings surroundings)
     : center_(center), surroundings_(std::move(surroundings))
 {
 }
@@ -140,10 +140,10 @@ void DiskController::bringUpToDate(const std::shared_ptr<Disk>& image, const Dis
     if (facts == image->facts())
         return;
     image->setFacts(facts);
-    post(fixwell::OVDiskChangedNotification, image);
+    post(contract::OVDiskChangedNotification, image);
 }
 
-void DiskController::post(fixwell::Name name, const std::shared_ptr<Disk>& disk)
+void DiskController::post(contract::Name name, const std::shared_ptr<Disk>& disk)
 {
     center_.post({name, disk, {}});
 }
@@ -151,7 +151,7 @@ void DiskController::post(fixwell::Name name, const std::shared_ptr<Disk>& disk)
 void DiskController::appear(const std::shared_ptr<Disk>& disk)
 {
     for (const auto& part : withParts(disk))
-        post(fixwell::OVDiskAppearedNotification, part);
+        post(contract::OVDiskAppearedNotification, part);
 }
 
 // Of a disk that is worked on, everything above and below it is.
@@ -174,7 +174,7 @@ void DiskController::tellGone(const std::shared_ptr<Disk>& top)
     for (const auto& disk : gone)
         if (!disk->hasGone()) {
             disk->setGone();
-            post(fixwell::OVDiskEjectedNotification, disk);
+            post(contract::OVDiskEjectedNotification, disk);
         }
 }
 
@@ -278,8 +278,8 @@ void DiskController::update(const std::shared_ptr<Disk>& disk, const DiskTree& t
     disk->setParts(std::move(all));
 
     if (isOther)
-        post(wasMounted && !disk->isMounted() ? fixwell::OVDiskUnmountedNotification
-                                              : fixwell::OVDiskChangedNotification,
+        post(wasMounted && !disk->isMounted() ? contract::OVDiskUnmountedNotification
+                                              : contract::OVDiskChangedNotification,
              disk);
     for (const auto& part : parts.gone)
         tellGone(part);
@@ -295,7 +295,7 @@ OVDiskPointer DiskController::diskWithIdentifier(std::string_view identifier)
     return diskNamed(identifier);
 }
 
-std::shared_ptr<Disk> DiskController::diskReferredTo(const fixwell::DiskReferencePointer& reference)
+std::shared_ptr<Disk> DiskController::diskReferredTo(const contract::DiskReferencePointer& reference)
 {
     if (!reference)
         return nullptr;
@@ -312,12 +312,12 @@ void DiskController::forgetAsked()
     askedReference_.reset();
 }
 
-OVDiskPointer DiskController::diskWithKRDisk(const fixwell::DiskReferencePointer& disk)
+OVDiskPointer DiskController::diskWithKRDisk(const contract::DiskReferencePointer& disk)
 {
     return diskReferredTo(disk);
 }
 
-OVDiskPointer DiskController::findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk)
+OVDiskPointer DiskController::findOrCreateOVDisk(const contract::DiskReferencePointer& disk)
 {
     if (!disk)
         return nullptr;
@@ -368,8 +368,8 @@ void DiskController::ejectDisk(const OVDiskPointer& disk, bool /*synchronous*/)
     }
 }
 
-void DiskController::notifyFrontmostModulesOnly(fixwell::Name name,
-                                                const fixwell::Notification& notification)
+void DiskController::notifyFrontmostModulesOnly(contract::Name name,
+                                                const contract::Notification& notification)
 {
     if (hooks_.notifyFrontmost)
         hooks_.notifyFrontmost(name, notification);

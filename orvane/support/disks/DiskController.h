@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVDiskController.h"
+#include "contract/support/OVDiskController.h"
 #include "orvane/support/Failure.h"
 #include "orvane/support/disks/Disk.h"
 
@@ -16,19 +16,19 @@ namespace orvane {
 
 /// The disks that the host knows: those of the system, the image files that the user has named,
 /// and the attached contents of images. Main thread only; posts what happens to the disks.
-class DiskController final : public fixwell::OVDiskController {
+class DiskController final : public contract::OVDiskController {
 public:
     /// What reaches outside. An empty function is an operation that cannot be done here.
     struct Hooks {
         std::function<Outcome<>(const Disk& disk)> mount;
         std::function<Outcome<>(const Disk& disk)> eject;
         /// How notifyFrontmostModulesOnly delivers.
-        std::function<void(fixwell::Name name, const fixwell::Notification&)> notifyFrontmost;
+        std::function<void(contract::Name name, const contract::Notification&)> notifyFrontmost;
         WarningSink warn;
     };
 
     /// The notification centre must outlive this object.
-    DiskController(fixwell::NotificationCenter& center, Disk::Surroundings surroundings);
+    DiskController(contract::NotificationCenter& center, Disk::Surroundings surroundings);
 
     Hooks& hooks() { return hooks_; }
 
@@ -56,27 +56,27 @@ public:
     /// Forgets, without a further word, what has gone while it was held; NO when nothing has.
     bool release();
 
-    fixwell::OVDiskPointer diskWithIdentifier(std::string_view identifier) override;
-    fixwell::OVDiskPointer diskWithKRDisk(const fixwell::DiskReferencePointer& disk) override;
-    fixwell::OVDiskPointer findOrCreateOVDisk(const fixwell::DiskReferencePointer& disk) override;
+    contract::OVDiskPointer diskWithIdentifier(std::string_view identifier) override;
+    contract::OVDiskPointer diskWithKRDisk(const contract::DiskReferencePointer& disk) override;
+    contract::OVDiskPointer findOrCreateOVDisk(const contract::DiskReferencePointer& disk) override;
     /// The main thread sees an attached image here first, so an unknown disk is adopted.
-    std::vector<fixwell::OVDiskPointer> viewablePartitions(
-        const fixwell::OVDiskPointer& disk) override;
+    std::vector<contract::OVDiskPointer> viewablePartitions(
+        const contract::OVDiskPointer& disk) override;
     /// A module asks for this after every job that failed. Only what was mounted when the disks
     /// were last held is: a volume that was at rest, and is perhaps damaged, stays so.
-    void mountDisk(const fixwell::OVDiskPointer& disk, bool includeChildren,
+    void mountDisk(const contract::OVDiskPointer& disk, bool includeChildren,
                    bool synchronous) override;
-    void ejectDisk(const fixwell::OVDiskPointer& disk, bool synchronous) override;
-    void notifyFrontmostModulesOnly(fixwell::Name name,
-                                    const fixwell::Notification& notification) override;
+    void ejectDisk(const contract::OVDiskPointer& disk, bool synchronous) override;
+    void notifyFrontmostModulesOnly(contract::Name name,
+                                    const contract::Notification& notification) override;
 
 private:
     struct PartsReadAgain;
 
     PartsReadAgain readAgain(const Disk& disk, const std::vector<DiskTree>& trees) const;
     std::shared_ptr<Disk> add(const DiskFacts& facts);
-    void post(fixwell::Name name, const std::shared_ptr<Disk>& disk);
-    std::shared_ptr<Disk> diskReferredTo(const fixwell::DiskReferencePointer& reference);
+    void post(contract::Name name, const std::shared_ptr<Disk>& disk);
+    std::shared_ptr<Disk> diskReferredTo(const contract::DiskReferencePointer& reference);
     void forgetAsked();
     void appear(const std::shared_ptr<Disk>& disk);
     bool isHeld(const std::shared_ptr<Disk>& disk) const;
@@ -86,7 +86,7 @@ private:
     void bringUpToDate(const std::shared_ptr<Disk>& image, const DiskFacts& contents);
     void warn(const Outcome<>& outcome);
 
-    fixwell::NotificationCenter& center_;
+    contract::NotificationCenter& center_;
     Disk::Surroundings surroundings_;
     Hooks hooks_;
     std::vector<std::shared_ptr<Disk>> roots_;
@@ -95,7 +95,7 @@ private:
 
     // The disk of the job at hand: the library asks for it with every line of output.
     std::shared_ptr<Disk> asked_;
-    fixwell::DiskReferencePointer askedReference_;
+    contract::DiskReferencePointer askedReference_;
 };
 
 /// The disk and everything below it, each before its children.

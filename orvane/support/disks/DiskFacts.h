@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/pellar/DiskReference.h"
+#include "contract/pellar/DiskReference.h"
 #include "orvane/support/disks/DiskTypes.h"
 
 #include <cstdint>
@@ -25,7 +25,7 @@ struct DiskFacts {
     /// Stands in the list of volumes that the user may work on.
     bool isShown = true;
 
-    fixwell::DiskReference::Storage storage = fixwell::DiskReference::Storage::BlockDevice;
+    contract::DiskReference::Storage storage = contract::DiskReference::Storage::BlockDevice;
     std::filesystem::path path;  ///< of the device node or the image file
     std::uint64_t offset = 0;    ///< bytes
     std::uint64_t length = 0;    ///< bytes; what the partition map states, even beyond the end

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVDisk.h"
+#include "contract/support/OVDisk.h"
 
 #include <functional>
 #include <string>
@@ -22,7 +22,7 @@ using CapabilityLookup = std::function<FilesystemCapabilities(std::string_view f
 
 /// A file system type with what can be done for it, asked anew each time: a tool may be installed
 /// while the program runs.
-class DiskFilesystem final : public fixwell::OVFilesystem {
+class DiskFilesystem final : public contract::OVFilesystem {
 public:
     DiskFilesystem(std::string type, CapabilityLookup capabilities)
         : type_(std::move(type)), capabilities_(std::move(capabilities))

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/DiskLookup.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/support/images/ImageContents.h"
 #include "orvane/support/images/ImageDisks.h"
 
@@ -28,7 +28,7 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::find(std::string_view name)
 
 Failure DiskLookup::cannotUse(std::string_view object, std::string_view reason) const
 {
-    return {translator_.sentence("cannot use ‘%@’: %@", {fixwell::printable(object), reason})};
+    return {translator_.sentence("cannot use ‘%@’: %@", {contract::printable(object), reason})};
 }
 
 Outcome<std::shared_ptr<Disk>> DiskLookup::findByTag(std::string_view tag, std::string_view value)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
 
 #include <chrono>
 #include <cstddef>
@@ -47,11 +47,11 @@ public:
 
     /// The list that the disk's records are appended to: the same for one volume until `revision`
     /// grows.
-    virtual fixwell::Array historyOf(const DiskFacts& disk) = 0;
+    virtual contract::Array historyOf(const DiskFacts& disk) = 0;
     virtual std::uint64_t revision() const = 0;
     /// Valid until the history changes.
     virtual const RecordTimes& timesOf(const DiskFacts& disk) = 0;
-    virtual void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) = 0;
+    virtual void replaceHistoryOf(const DiskFacts& disk, const contract::Array& history) = 0;
     /// Empties the list; NO when it was empty.
     virtual bool clearHistoryOf(const DiskFacts& disk) = 0;
 };

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/MergedHistory.h"
 
-#include "fixwell/host/foundation/Dictionary.h"
+#include "contract/foundation/Dictionary.h"
 
 #include <algorithm>
 #include <iterator>
@@ -9,8 +9,8 @@
 
 namespace orvane {
 
-using fixwell::Array;
-using fixwell::Value;
+using contract::Array;
+using contract::Value;
 
 namespace {
 

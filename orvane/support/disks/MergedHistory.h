@@ -21,24 +21,24 @@ public:
     /// only one history has any, that one, and no list where none has. What came at the same time
     /// goes on with the history that the last record was of, because one job runs at a time. A
     /// history that was cleared or replaced begins a new list.
-    fixwell::Array of(const std::vector<fixwell::Array>& histories, const TimesLookup& timesOf);
+    contract::Array of(const std::vector<contract::Array>& histories, const TimesLookup& timesOf);
 
 private:
     /// A history as far as it was taken over: enough to see that it has only grown since.
     struct Part {
-        fixwell::Array history;
+        contract::Array history;
         std::size_t size = 0;
-        fixwell::Value first;
-        fixwell::Value last;
+        contract::Value first;
+        contract::Value last;
 
-        bool hasOnlyGrown(const fixwell::Array& now) const;
-        void take(std::size_t end, const fixwell::Array& merged);
+        bool hasOnlyGrown(const contract::Array& now) const;
+        void take(std::size_t end, const contract::Array& merged);
     };
 
-    bool canGoOn(const std::vector<fixwell::Array>& histories) const;
+    bool canGoOn(const std::vector<contract::Array>& histories) const;
     void takeNew(const TimesLookup& timesOf);
 
-    fixwell::Array merged_;
+    contract::Array merged_;
     std::vector<Part> parts_;
     std::size_t newest_ = 0;  ///< the part that the last record is of
 };

@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/history/DiskHistories.h"
 
-#include "fixwell/host/foundation/Dictionary.h"
+#include "contract/foundation/Dictionary.h"
 #include "orvane/support/history/HistoryKey.h"
 
 #include <algorithm>
 
 namespace orvane {
 
-using fixwell::Array;
+using contract::Array;
 
 namespace {
 
@@ -186,7 +186,7 @@ bool DiskHistories::hasOnlyGrown(const History& history)
 {
     if (history.savedCount == 0)
         return true;
-    const fixwell::Value record = history.records.at(history.savedCount - 1);
+    const contract::Value record = history.records.at(history.savedCount - 1);
     return record.dictionary().isSameAs(history.lastSaved.dictionary());
 }
 

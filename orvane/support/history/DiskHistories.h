@@ -35,9 +35,9 @@ public:
     /// Returns when every list is complete. NO when all were.
     bool loadAll();
 
-    fixwell::Array historyOf(const DiskFacts& disk) override;
+    contract::Array historyOf(const DiskFacts& disk) override;
     const RecordTimes& timesOf(const DiskFacts& disk) override;
-    void replaceHistoryOf(const DiskFacts& disk, const fixwell::Array& history) override;
+    void replaceHistoryOf(const DiskFacts& disk, const contract::Array& history) override;
     /// YES also where there were runs without records.
     bool clearHistoryOf(const DiskFacts& disk) override;
     std::uint64_t revision() const override { return revision_; }
@@ -62,22 +62,22 @@ public:
 private:
     /// The records before those that are in the list already.
     struct Older {
-        fixwell::Array records;
+        contract::Array records;
         RecordTimes times;
         HistoryStore::Range left;
     };
 
     struct History {
-        fixwell::Array records;
+        contract::Array records;
         RecordTimes times;
         std::size_t savedCount = 0;
-        fixwell::Value lastSaved;
+        contract::Value lastSaved;
         std::optional<Older> older = std::nullopt;
     };
 
     struct Cleared {
         std::string key;
-        fixwell::Array records;
+        contract::Array records;
         RecordTimes times;
         std::vector<Run> runs;
         std::uint64_t clearing;

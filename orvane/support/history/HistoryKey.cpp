@@ -7,7 +7,7 @@ std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID)
 {
     if (disk.uuid.empty())
         return "disk:" + disk.identifier + "@" + std::to_string(disk.offset);
-    const bool isInImage = disk.storage == fixwell::DiskReference::Storage::FileRegion;
+    const bool isInImage = disk.storage == contract::DiskReference::Storage::FileRegion;
     if (isInImage || sharesUUID)
         return "uuid:" + disk.uuid + "@" + disk.identifier;
     return "uuid:" + disk.uuid;

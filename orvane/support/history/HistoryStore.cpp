@@ -7,7 +7,7 @@
 
 namespace orvane {
 
-using fixwell::Array;
+using contract::Array;
 
 HistoryStore::Tables::Tables(Database& database, const Limits& limits)
     : volumes(database, "volumes", "key"), records(database, limits.recordsOfVolume), runs(database)

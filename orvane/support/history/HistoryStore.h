@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
 #include "orvane/support/Failure.h"
 #include "orvane/support/history/Checkpointer.h"
 #include "orvane/support/history/Database.h"
@@ -40,11 +40,11 @@ public:
     /// All that the volume has.
     [[nodiscard]] Range recordsOf(std::string_view key);
     /// Appends those of the records that are still there, oldest first, and their times.
-    void load(Range records, const fixwell::Array& history, RecordTimes& times);
-    void load(Range records, const fixwell::Array& history);
+    void load(Range records, const contract::Array& history, RecordTimes& times);
+    void load(Range records, const contract::Array& history);
     /// Appends the records from `firstNew` on to the volume's, with their times; where none are
     /// given, with the present one. All of them or, when it answers NO, none: try again later.
-    [[nodiscard]] bool append(std::string_view key, const fixwell::Array& history,
+    [[nodiscard]] bool append(std::string_view key, const contract::Array& history,
                               std::size_t firstNew, const RecordTimes& times = {});
     /// The volume's records and its runs.
     [[nodiscard]] bool clear(std::string_view key);

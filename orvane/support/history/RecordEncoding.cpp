@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/history/RecordEncoding.h"
 
-#include "fixwell/host/pellar/MessageKeys.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/support/settings/ValueJSON.h"
 
 #include <algorithm>
@@ -10,19 +10,19 @@
 namespace orvane {
 namespace {
 
-using fixwell::Dictionary;
-using fixwell::Kind;
-using fixwell::Name;
-using fixwell::Value;
+using contract::Dictionary;
+using contract::Kind;
+using contract::Name;
+using contract::Value;
 
 // The log's own keys, which the module adds to a library message.
 const Name originKey{"kOV_typeOfOutputKey"};
 const Name finalTextKey{"kOV_finalAttributedString_type"};
 const std::array<Value, 3> origins{Name{"kOV_typeOfOutput_string"}, Name{"kOV_typeOfOutput_dict"},
                                    Name{"kOV_typeOfOutput_OV_addition"}};
-const std::array<Name, 6> types{fixwell::kFsckVerify, fixwell::kFsckRepair,
-                                fixwell::kFsckError,  fixwell::kFsckSuccess,
-                                fixwell::kFsckFail,   fixwell::kFsckProgress};
+const std::array<Name, 6> types{contract::kFsckVerify, contract::kFsckRepair,
+                                contract::kFsckError,  contract::kFsckSuccess,
+                                contract::kFsckFail,   contract::kFsckProgress};
 
 bool isOrigin(const Value& value)
 {
@@ -39,13 +39,13 @@ RecordSlot slotFor(Name key, const Value& value)
     const Kind kind = value.kind();
     if (key == finalTextKey && isInOneStyle(value))
         return RecordSlot::Text;
-    if (key == fixwell::kFsckVerbosity && kind == Kind::Integer)
+    if (key == contract::kFsckVerbosity && kind == Kind::Integer)
         return RecordSlot::Verbosity;
     if (key == originKey && kind == Kind::String && isOrigin(value))
         return RecordSlot::Origin;
-    if (key == fixwell::kFsckMessageType && kind == Kind::String)
+    if (key == contract::kFsckMessageType && kind == Kind::String)
         return RecordSlot::Type;
-    if (key == fixwell::kFsckMessageString && kind == Kind::String)
+    if (key == contract::kFsckMessageString && kind == Kind::String)
         return RecordSlot::Message;
     return RecordSlot::Extra;
 }
@@ -171,9 +171,9 @@ Dictionary recordFrom(const RecordColumns& columns, const RecordShape& shape)
             case RecordSlot::Message: record.set(entry.key, columns.message); break;
             case RecordSlot::Text:
                 record.set(entry.key,
-                           fixwell::StyledText::make(columns.text, columns.style != nullptr
+                           contract::StyledText::make(columns.text, columns.style != nullptr
                                                                        ? *columns.style
-                                                                       : fixwell::TextStyle()));
+                                                                       : contract::TextStyle()));
                 break;
             case RecordSlot::Origin: record.set(entry.key, entry.origin); break;
             case RecordSlot::Extra: record.set(entry.key, extras.next()); break;

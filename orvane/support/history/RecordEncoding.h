@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/StyledText.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/StyledText.h"
 
 #include <cstdint>
 #include <optional>
@@ -26,14 +26,14 @@ enum class RecordSlot : char {
 /// shapes are few, so a record names its shape, and what the shape says need not be stored.
 struct RecordShape {
     struct Entry {
-        fixwell::Name key;
+        contract::Name key;
         RecordSlot slot;
-        fixwell::Value origin;  ///< for the slot Origin
+        contract::Value origin;  ///< for the slot Origin
     };
     std::vector<Entry> entries;
 
-    [[nodiscard]] static RecordShape of(const fixwell::Dictionary& record);
-    [[nodiscard]] bool fits(const fixwell::Dictionary& record) const;
+    [[nodiscard]] static RecordShape of(const contract::Dictionary& record);
+    [[nodiscard]] bool fits(const contract::Dictionary& record) const;
     [[nodiscard]] std::string toJSON() const;
     /// None for text that is no shape.
     [[nodiscard]] static std::optional<RecordShape> fromJSON(std::string_view text);
@@ -45,15 +45,15 @@ struct RecordColumns {
     std::int64_t verbosity = 0;
     std::string_view message;
     std::string_view text;
-    const fixwell::TextStyle* style = nullptr;
+    const contract::TextStyle* style = nullptr;
     std::string_view extra;
 };
 
 /// Takes the record apart; `extra` is given room in `room`.
-[[nodiscard]] RecordColumns columnsOf(const fixwell::Dictionary& record, const RecordShape& shape,
+[[nodiscard]] RecordColumns columnsOf(const contract::Dictionary& record, const RecordShape& shape,
                                       std::string& room);
 /// The record again: the same keys in the same order with values of the same kinds.
-[[nodiscard]] fixwell::Dictionary recordFrom(const RecordColumns& columns,
+[[nodiscard]] contract::Dictionary recordFrom(const RecordColumns& columns,
                                              const RecordShape& shape);
 
 }  // namespace orvane

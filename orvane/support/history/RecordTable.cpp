@@ -73,7 +73,7 @@ RecordRange RecordTable::recordsOf(std::int64_t volume)
     return first != noRecord ? RecordRange{first, behindNewest(volume)} : RecordRange();
 }
 
-bool RecordTable::read(RecordRange records, const fixwell::Array& history, RecordTimes& times)
+bool RecordTable::read(RecordRange records, const contract::Array& history, RecordTimes& times)
 {
     read_.bind(1, records.next);
     read_.bind(2, records.end);
@@ -90,7 +90,7 @@ bool RecordTable::read(RecordRange records, const fixwell::Array& history, Recor
     return step == Statement::Step::Done;
 }
 
-bool RecordTable::append(std::int64_t volume, const fixwell::Array& history, std::size_t firstNew,
+bool RecordTable::append(std::int64_t volume, const contract::Array& history, std::size_t firstNew,
                          const RecordTimes& times, Time now)
 {
     if (!makeRoom(volume, static_cast<std::int64_t>(history.size() - firstNew)))
@@ -110,7 +110,7 @@ bool RecordTable::append(std::int64_t volume, const fixwell::Array& history, std
     return true;
 }
 
-bool RecordTable::insert(std::int64_t id, const fixwell::Dictionary& record, std::int64_t time)
+bool RecordTable::insert(std::int64_t id, const contract::Dictionary& record, std::int64_t time)
 {
     const auto* const shape = vocabulary_.shapeOf(record);
     if (shape == nullptr)

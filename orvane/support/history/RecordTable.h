@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Array.h"
+#include "contract/foundation/Array.h"
 #include "orvane/support/disks/HistoryKeeper.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/RecordVocabulary.h"
@@ -35,10 +35,10 @@ public:
     [[nodiscard]] RecordRange recordsOf(std::int64_t volume);
     /// Appends those of the records that are still there to the history, oldest first, and their
     /// times to `times`.
-    [[nodiscard]] bool read(RecordRange records, const fixwell::Array& history, RecordTimes& times);
+    [[nodiscard]] bool read(RecordRange records, const contract::Array& history, RecordTimes& times);
     /// Appends the history's records from `firstNew` on to the volume's; where there are no
     /// times, with `now`. Within a transaction.
-    [[nodiscard]] bool append(std::int64_t volume, const fixwell::Array& history,
+    [[nodiscard]] bool append(std::int64_t volume, const contract::Array& history,
                               std::size_t firstNew, const RecordTimes& times, Time now);
     [[nodiscard]] bool removeAll(std::int64_t volume);
     /// At the end: what cannot be dropped now will be when the volume is appended to again.
@@ -50,7 +50,7 @@ private:
     std::int64_t oldest(std::int64_t volume);
     std::int64_t behindNewest(std::int64_t volume);
     std::int64_t endOfRunAt(std::int64_t record, std::int64_t next);
-    bool insert(std::int64_t id, const fixwell::Dictionary& record, std::int64_t time);
+    bool insert(std::int64_t id, const contract::Dictionary& record, std::int64_t time);
     bool makeRoom(std::int64_t volume, std::int64_t added);
     bool dropSurplus(std::int64_t volume, std::int64_t most);
     bool remove(std::int64_t first, std::int64_t end);

@@ -9,7 +9,7 @@
 namespace orvane {
 namespace {
 
-fixwell::TextStyle readStyle(const std::string& text)
+contract::TextStyle readStyle(const std::string& text)
 {
     try {
         return styleFromJSON(parsedJSON(text));
@@ -26,7 +26,7 @@ RecordVocabulary::RecordVocabulary(Database& database)
 }
 
 // The shape that fitted last fits most often, so it is kept in front.
-const RecordVocabulary::NumberedShape* RecordVocabulary::shapeOf(const fixwell::Dictionary& record)
+const RecordVocabulary::NumberedShape* RecordVocabulary::shapeOf(const contract::Dictionary& record)
 {
     const auto known = std::find_if(shapesWritten_.begin(), shapesWritten_.end(),
                                     [&](const auto& one) { return one.shape.fits(record); });
@@ -45,7 +45,7 @@ const RecordVocabulary::NumberedShape* RecordVocabulary::shapeOf(const fixwell::
     return &shapesWritten_.front();
 }
 
-std::int64_t RecordVocabulary::numberOf(const fixwell::TextStyle* style)
+std::int64_t RecordVocabulary::numberOf(const contract::TextStyle* style)
 {
     if (const auto known = stylesWritten_.find(style); known != stylesWritten_.end())
         return known->second;
@@ -55,12 +55,12 @@ std::int64_t RecordVocabulary::numberOf(const fixwell::TextStyle* style)
     return number;
 }
 
-const fixwell::TextStyle* RecordVocabulary::style(std::int64_t number)
+const contract::TextStyle* RecordVocabulary::style(std::int64_t number)
 {
     if (const auto known = stylesRead_.find(number); known != stylesRead_.end())
         return &known->second;
     const auto text = styles_.text(number);
-    return &stylesRead_.emplace(number, text ? readStyle(*text) : fixwell::TextStyle())
+    return &stylesRead_.emplace(number, text ? readStyle(*text) : contract::TextStyle())
                 .first->second;
 }
 

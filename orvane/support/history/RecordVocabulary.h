@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Dictionary.h"
+#include "contract/foundation/Dictionary.h"
 #include "orvane/support/history/InternTable.h"
 #include "orvane/support/history/RecordEncoding.h"
 
@@ -24,12 +24,12 @@ public:
     explicit RecordVocabulary(Database& database);
 
     /// The shape that fits the record, until the next call; null when it could not be written.
-    [[nodiscard]] const NumberedShape* shapeOf(const fixwell::Dictionary& record);
+    [[nodiscard]] const NumberedShape* shapeOf(const contract::Dictionary& record);
     /// 0 when it could not be written.
-    [[nodiscard]] std::int64_t numberOf(const fixwell::TextStyle* style);
+    [[nodiscard]] std::int64_t numberOf(const contract::TextStyle* style);
 
     // What was written under these numbers; an empty one when that is unreadable.
-    [[nodiscard]] const fixwell::TextStyle* style(std::int64_t number);
+    [[nodiscard]] const contract::TextStyle* style(std::int64_t number);
     [[nodiscard]] const RecordShape& shape(std::int64_t number);
 
     /// After a transaction that failed: what was written in it is not in the tables.
@@ -40,8 +40,8 @@ private:
     InternTable shapes_;
 
     std::deque<NumberedShape> shapesWritten_;
-    std::unordered_map<const fixwell::TextStyle*, std::int64_t> stylesWritten_;
-    std::map<std::int64_t, fixwell::TextStyle> stylesRead_;
+    std::unordered_map<const contract::TextStyle*, std::int64_t> stylesWritten_;
+    std::map<std::int64_t, contract::TextStyle> stylesRead_;
     std::map<std::int64_t, RecordShape> shapesRead_;
 };
 

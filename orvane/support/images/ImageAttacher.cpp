@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/images/ImageAttacher.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <utility>
 
 namespace orvane {
 namespace {
 
-const fixwell::Name attachmentKey{"orvane-attachment"};
+const contract::Name attachmentKey{"orvane-attachment"};
 
 }  // namespace
 
@@ -17,8 +17,8 @@ ImageAttacher::ImageAttacher(Disk::Surroundings surroundings, Translator transla
 {
 }
 
-fixwell::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path& image,
-                                                     fixwell::Dictionary& result)
+contract::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path& image,
+                                                     contract::Dictionary& result)
 {
     const auto reading = ImageReading::start(image, {}, reader_);
     {
@@ -31,24 +31,24 @@ fixwell::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path
     const std::lock_guard guard(lock_);
     readings_.erase(reading);
     if (state == ImageReading::State::GivenUp)
-        return note(image, translator_.text("it was stopped"), fixwell::kPLErrorCancelled);
+        return note(image, translator_.text("it was stopped"), contract::kPLErrorCancelled);
     if (state == ImageReading::State::Reading)
         return note(image, translator_.text("the file does not answer"),
-                    fixwell::kPLErrorCannotOpen);
+                    contract::kPLErrorCannotOpen);
     const ImageReading::Result read = *reading->result();
     if (failed(read))
-        return note(image, translator_.text(failureMessage(read)), fixwell::kPLErrorCannotOpen);
+        return note(image, translator_.text(failureMessage(read)), contract::kPLErrorCannotOpen);
     lastErrors_.erase(image.native());
     attached_.emplace(++attachments_, std::get<ReadImage>(read).disks);
-    result = fixwell::Dictionary::of({{attachmentKey, attachments_}});
-    return fixwell::kPLNoError;
+    result = contract::Dictionary::of({{attachmentKey, attachments_}});
+    return contract::kPLNoError;
 }
 
 // With the lock held.
-fixwell::ErrorCode ImageAttacher::note(const std::filesystem::path& image, std::string_view reason,
-                                       fixwell::ErrorCode code)
+contract::ErrorCode ImageAttacher::note(const std::filesystem::path& image, std::string_view reason,
+                                       contract::ErrorCode code)
 {
-    const std::string name = fixwell::printable(image.filename().native());
+    const std::string name = contract::printable(image.filename().native());
     lastErrors_[image.native()] = translator_.sentence("cannot attach ‘%@’: %@", {name, reason});
     return code;
 }
@@ -67,7 +67,7 @@ void ImageAttacher::resumeAttachments()
     isStopped_ = false;
 }
 
-fixwell::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(const fixwell::Dictionary& result)
+contract::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(const contract::Dictionary& result)
 {
     const std::lock_guard guard(lock_);
     const auto found = attached_.extract(result.integer(attachmentKey));

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/HostServices.h"
+#include "contract/support/HostServices.h"
 #include "orvane/support/disks/Disk.h"
 #include "orvane/support/images/ImageReading.h"
 #include "orvane/support/texts/Translator.h"
@@ -23,15 +23,15 @@ namespace orvane {
 ///
 /// The disks that come out of it become known to the disk controller when the main thread first
 /// asks for their volumes, and are forgotten when they are ejected.
-class ImageAttacher final : public fixwell::ImageAttachment {
+class ImageAttacher final : public contract::ImageAttachment {
 public:
     ImageAttacher(Disk::Surroundings surroundings, Translator translator);
 
     /// kPLErrorCannotOpen when the file cannot be opened, is empty, is no disk image, or does not
     /// answer for half a minute; kPLErrorCancelled after `stopAttachments`.
-    [[nodiscard]] fixwell::ErrorCode AttachImageWithURL(const std::filesystem::path& image,
-                                                        fixwell::Dictionary& result) override;
-    fixwell::OVDiskPointer TopLevelPLDiskForImageDict(const fixwell::Dictionary& result) override;
+    [[nodiscard]] contract::ErrorCode AttachImageWithURL(const std::filesystem::path& image,
+                                                        contract::Dictionary& result) override;
+    contract::OVDiskPointer TopLevelPLDiskForImageDict(const contract::Dictionary& result) override;
 
     /// Attachments that are under way end at once, and no others begin before
     /// `resumeAttachments`.
@@ -47,8 +47,8 @@ public:
     [[nodiscard]] std::string lastError(const std::filesystem::path& image) const;
 
 private:
-    fixwell::ErrorCode note(const std::filesystem::path& image, std::string_view reason,
-                            fixwell::ErrorCode code);
+    contract::ErrorCode note(const std::filesystem::path& image, std::string_view reason,
+                            contract::ErrorCode code);
 
     const Disk::Surroundings surroundings_;
     const Translator translator_;

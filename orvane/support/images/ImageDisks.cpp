@@ -17,7 +17,7 @@ DiskFacts partOfImage(const OpenImage& image, const ImageVolume& volume)
     DiskFacts facts;
     facts.identifier = numbered(image.path, number);
     facts.number = number;
-    facts.storage = fixwell::DiskReference::Storage::FileRegion;
+    facts.storage = contract::DiskReference::Storage::FileRegion;
     facts.path = image.path;
     facts.offset = volume.partition.range.offset;
     facts.length = volume.partition.range.length;
@@ -54,7 +54,7 @@ DiskFacts factsOfImage(const OpenImage& image)
     facts.identifier = image.path.native();
     facts.displayName = image.path.filename();
     facts.type = diskType::diskImage;
-    facts.storage = fixwell::DiskReference::Storage::FileRegion;
+    facts.storage = contract::DiskReference::Storage::FileRegion;
     facts.path = image.path;
     facts.length = image.length;
     facts.isWritable = image.isWritable;

@@ -13,8 +13,8 @@ namespace {
 std::string_view nameOf(int level)
 {
     switch (level) {
-        case fixwell::OVLog::mismatch: return "mismatch ";
-        case fixwell::OVLog::error: return "notice ";
+        case contract::OVLog::mismatch: return "mismatch ";
+        case contract::OVLog::error: return "notice ";
         default: return "trace ";
     }
 }

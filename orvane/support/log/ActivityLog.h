@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVLog.h"
+#include "contract/support/OVLog.h"
 #include "orvane/support/log/LogText.h"
 #include "orvane/support/log/RotatingFile.h"
 
@@ -10,7 +10,7 @@ namespace orvane {
 /// The host's two logs as files: the developers' `fixwell.log`, written line by line, and the
 /// user's `activity.log`, which is buffered because a checking tool can say a million lines.
 /// Main thread only.
-class ActivityLog final : public fixwell::OVLog {
+class ActivityLog final : public contract::OVLog {
 public:
     struct Options {
         std::filesystem::path directory;  ///< empty: nothing is kept

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/log/LogText.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 #include <array>
@@ -49,7 +49,7 @@ void appendLogText(std::string& log, std::string_view text)
         if (isPlain(line))
             log += line;
         else
-            log += fixwell::printable(line);
+            log += contract::printable(line);
         text.remove_prefix(length);
         if (!text.empty()) {
             log += '\n';

@@ -5,13 +5,13 @@
 
 namespace orvane {
 
-void Notifications::addObserver(const void* observer, fixwell::Name name, Handler handler)
+void Notifications::addObserver(const void* observer, contract::Name name, Handler handler)
 {
     registrations_.push_back(
         std::make_shared<Registration>(Registration{observer, name, std::move(handler)}));
 }
 
-void Notifications::removeObserver(const void* observer, fixwell::Name name)
+void Notifications::removeObserver(const void* observer, contract::Name name)
 {
     std::erase_if(registrations_, [&](const std::shared_ptr<Registration>& registration) {
         const bool isMeant = registration->observer == observer && registration->name == name;
@@ -21,7 +21,7 @@ void Notifications::removeObserver(const void* observer, fixwell::Name name)
     });
 }
 
-void Notifications::post(const fixwell::Notification& notification)
+void Notifications::post(const contract::Notification& notification)
 {
     std::vector<std::shared_ptr<Registration>> receivers;
     for (const auto& registration : registrations_)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/NotificationCenter.h"
+#include "contract/foundation/NotificationCenter.h"
 
 #include <memory>
 #include <vector>
@@ -11,16 +11,16 @@ namespace orvane {
 /// The host's notification centre. Main thread only. An observer that is added in the middle of
 /// a delivery hears of the next notification; one that is removed hears nothing more. A handler
 /// may post.
-class Notifications final : public fixwell::NotificationCenter {
+class Notifications final : public contract::NotificationCenter {
 public:
-    void addObserver(const void* observer, fixwell::Name name, Handler handler) override;
-    void removeObserver(const void* observer, fixwell::Name name) override;
-    void post(const fixwell::Notification& notification) override;
+    void addObserver(const void* observer, contract::Name name, Handler handler) override;
+    void removeObserver(const void* observer, contract::Name name) override;
+    void post(const contract::Notification& notification) override;
 
 private:
     struct Registration {
         const void* observer;
-        fixwell::Name name;
+        contract::Name name;
         Handler handler;
         bool isInForce = true;
     };

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
+#include "contract/foundation/RunLoop.h"
 
 namespace orvane {
 
@@ -15,7 +15,7 @@ public:
 
     /// The worker's own thread. `UntilDone` returns when the task has run, or when it never will
     /// because the program ends.
-    virtual void perform(fixwell::RunLoop::Task task, fixwell::RunLoop::Wait wait) = 0;
+    virtual void perform(contract::RunLoop::Task task, contract::RunLoop::Wait wait) = 0;
 
     /// Makes `outbox` the calling thread's for as long as this object lives.
     class Scope {

@@ -18,15 +18,15 @@ struct Ticket {
 
 }  // namespace
 
-fixwell::RunLoop::Task Rendezvous::taskFor(const std::shared_ptr<Rendezvous>& rendezvous,
-                                           fixwell::RunLoop::Task task)
+contract::RunLoop::Task Rendezvous::taskFor(const std::shared_ptr<Rendezvous>& rendezvous,
+                                           contract::RunLoop::Task task)
 {
     return [ticket = std::make_shared<Ticket>(rendezvous), task = std::move(task)] {
         ticket->rendezvous->run(task);
     };
 }
 
-void Rendezvous::run(const fixwell::RunLoop::Task& task)
+void Rendezvous::run(const contract::RunLoop::Task& task)
 {
     {
         const std::lock_guard guard(lock_);

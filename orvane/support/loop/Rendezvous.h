@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/RunLoop.h"
+#include "contract/foundation/RunLoop.h"
 
 #include <condition_variable>
 #include <memory>
@@ -14,8 +14,8 @@ namespace orvane {
 class Rendezvous {
 public:
     /// The task to hand over. Destroying it unrun abandons the rendezvous.
-    static fixwell::RunLoop::Task taskFor(const std::shared_ptr<Rendezvous>& rendezvous,
-                                          fixwell::RunLoop::Task task);
+    static contract::RunLoop::Task taskFor(const std::shared_ptr<Rendezvous>& rendezvous,
+                                          contract::RunLoop::Task task);
 
     /// Returns when the task has run or was abandoned.
     void wait();
@@ -25,7 +25,7 @@ public:
 private:
     enum class State { Pending, Running, Over };
 
-    void run(const fixwell::RunLoop::Task& task);
+    void run(const contract::RunLoop::Task& task);
 
     std::mutex lock_;
     std::condition_variable changed_;

@@ -15,9 +15,9 @@ class WorkerThreads::Worker final : public Outbox {
 public:
     explicit Worker(WorkerThreads& o) : owner(o) {}
 
-    void perform(fixwell::RunLoop::Task task, fixwell::RunLoop::Wait wait) override
+    void perform(contract::RunLoop::Task task, contract::RunLoop::Wait wait) override
     {
-        if (wait == fixwell::RunLoop::Wait::No) {
+        if (wait == contract::RunLoop::Wait::No) {
             owner.perform(*this, std::move(task));
             return;
         }
@@ -30,7 +30,7 @@ public:
         meeting->wait();
     }
 
-    void run(const fixwell::RunLoop::Task& task)
+    void run(const contract::RunLoop::Task& task)
     {
         {
             const Scope scope(*this);
@@ -42,7 +42,7 @@ public:
     WorkerThreads& owner;
     std::thread thread;
     // All guarded by the owner's lock.
-    std::vector<fixwell::RunLoop::Task> heldBack;
+    std::vector<contract::RunLoop::Task> heldBack;
     std::shared_ptr<Rendezvous> rendezvous;  ///< the one it waited at last
     bool isFirst = false;                    ///< nothing needs to be held back
     bool isOver = false;
@@ -65,7 +65,7 @@ WorkerThreads::~WorkerThreads()
             worker->thread.join();
 }
 
-void WorkerThreads::detachNewThread(fixwell::RunLoop::Task task)
+void WorkerThreads::detachNewThread(contract::RunLoop::Task task)
 {
     joinEnded();
     Worker* worker = nullptr;
@@ -83,7 +83,7 @@ void WorkerThreads::detachNewThread(fixwell::RunLoop::Task task)
     }
 }
 
-void WorkerThreads::perform(Worker& worker, fixwell::RunLoop::Task task)
+void WorkerThreads::perform(Worker& worker, contract::RunLoop::Task task)
 {
     const std::lock_guard guard(lock_);
     if (isClosing_) {
@@ -114,7 +114,7 @@ void WorkerThreads::hasEnded(Worker& worker)
 void WorkerThreads::passOnFrom(Worker& worker)
 {
     worker.isFirst = true;
-    for (fixwell::RunLoop::Task& task : worker.heldBack)
+    for (contract::RunLoop::Task& task : worker.heldBack)
         if (!isClosing_)
             loop_.post(std::move(task));
     worker.heldBack.clear();

@@ -17,7 +17,7 @@ namespace orvane {
 ///
 /// Destroying this object (on the main thread, before the loop) waits for the workers; what they
 /// still hand over is dropped, and a worker that sleeps or waits for the main thread is woken.
-class WorkerThreads final : public fixwell::Threads {
+class WorkerThreads final : public contract::Threads {
 public:
     explicit WorkerThreads(HostLoop& loop);
     WorkerThreads(const WorkerThreads&) = delete;
@@ -25,7 +25,7 @@ public:
     ~WorkerThreads() override;
 
     /// Where the system gives no more threads, the task runs before this returns.
-    void detachNewThread(fixwell::RunLoop::Task task) override;
+    void detachNewThread(contract::RunLoop::Task task) override;
     /// Returns at once when the host attaches disk images synchronously: every disk of the image
     /// is there when the attachment has returned.
     void sleepUntil(Date date) override;
@@ -36,7 +36,7 @@ public:
 private:
     class Worker;
 
-    void perform(Worker& worker, fixwell::RunLoop::Task task);
+    void perform(Worker& worker, contract::RunLoop::Task task);
     void hasEnded(Worker& worker);
     void passOnFrom(Worker& worker);
     void joinEnded();

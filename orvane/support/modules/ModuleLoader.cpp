@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/modules/ModuleLoader.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
@@ -31,7 +31,7 @@ Failure linkerFailure(const std::filesystem::path& library)
 {
     const char* const reason = ::dlerror();
     return cannot(attempt, library.native(),
-                  fixwell::printable(reason != nullptr ? reason : "unknown reason"));
+                  contract::printable(reason != nullptr ? reason : "unknown reason"));
 }
 
 /// A file in the open directory, which others cannot change. `shown`: its path, for messages.
@@ -78,7 +78,7 @@ Outcome<Description> readDescription(const FileDescriptor& file, const std::file
     return Description{text("name", ""), text("library", ""), text("table", "FXW")};
 }
 
-Outcome<const fixwell::ModuleEntry*> openLibrary(FileDescriptor file,
+Outcome<const contract::ModuleEntry*> openLibrary(FileDescriptor file,
                                                  const std::filesystem::path& shown)
 {
     void* const code =
@@ -90,17 +90,17 @@ Outcome<const fixwell::ModuleEntry*> openLibrary(FileDescriptor file,
     static std::vector<FileDescriptor> loaded;
     loaded.push_back(std::move(file));
     const auto entryFunction =
-        reinterpret_cast<fixwell::ModuleEntryFunction>(::dlsym(code, fixwell::moduleEntryName));
+        reinterpret_cast<contract::ModuleEntryFunction>(::dlsym(code, contract::moduleEntryName));
     if (entryFunction == nullptr)
         return linkerFailure(shown);
-    const fixwell::ModuleEntry* const entry = entryFunction();
+    const contract::ModuleEntry* const entry = entryFunction();
     if (entry == nullptr)
         return cannot(attempt, shown.native(), "it gives no module entry");
-    if (entry->contractVersion != fixwell::moduleContractVersion)
+    if (entry->contractVersion != contract::moduleContractVersion)
         return cannot(attempt, shown.native(),
                       fmt::format("it was built for version {} of the module contract, and this "
                                   "program has version {}",
-                                  entry->contractVersion, fixwell::moduleContractVersion));
+                                  entry->contractVersion, contract::moduleContractVersion));
     return entry;
 }
 
@@ -128,19 +128,19 @@ Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle)
         return std::get<Failure>(entry);
     return LoadedModule{description.name,
                         std::make_unique<ModuleBundle>(pathOf(directory), description.defaultTable),
-                        std::get<const fixwell::ModuleEntry*>(entry)};
+                        std::get<const contract::ModuleEntry*>(entry)};
 }
 
-bool shouldRun(const LoadedModule& module, fixwell::HostServices& host)
+bool shouldRun(const LoadedModule& module, contract::HostServices& host)
 {
     return module.entry->shouldRunOnThisConfig(host, *module.bundle);
 }
 
-Outcome<std::unique_ptr<fixwell::OVModule>> makeModule(const LoadedModule& module,
-                                                       fixwell::HostServices& host,
-                                                       fixwell::ModuleSite& site)
+Outcome<std::unique_ptr<contract::OVModule>> makeModule(const LoadedModule& module,
+                                                       contract::HostServices& host,
+                                                       contract::ModuleSite& site)
 {
-    std::unique_ptr<fixwell::OVModule> made(module.entry->make(host, site));
+    std::unique_ptr<contract::OVModule> made(module.entry->make(host, site));
     if (!made)
         return cannot("start the module", module.name, "it could not be made");
     // It has been initialised: an entry gives no module that cannot be used.

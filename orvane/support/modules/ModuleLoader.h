@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/ModuleEntry.h"
+#include "contract/support/ModuleEntry.h"
 #include "orvane/support/Failure.h"
 #include "orvane/support/texts/ModuleBundle.h"
 
@@ -16,7 +16,7 @@ namespace orvane {
 struct LoadedModule {
     std::string name;
     std::unique_ptr<ModuleBundle> bundle;
-    const fixwell::ModuleEntry* entry = nullptr;
+    const contract::ModuleEntry* entry = nullptr;
 };
 
 /// Loads the bundle's library: {"name": "Fixwell", "library": "fixwell.so"} in its `module.json`
@@ -28,12 +28,12 @@ struct LoadedModule {
 [[nodiscard]] Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle);
 
 /// Whether the module may run here; it says NO where its own switch in the settings is off.
-[[nodiscard]] bool shouldRun(const LoadedModule& module, fixwell::HostServices& host);
+[[nodiscard]] bool shouldRun(const LoadedModule& module, contract::HostServices& host);
 
 /// A module, made and initialized, with its notifications registered. Host and site must outlive
 /// it.
-[[nodiscard]] Outcome<std::unique_ptr<fixwell::OVModule>> makeModule(const LoadedModule& module,
-                                                                     fixwell::HostServices& host,
-                                                                     fixwell::ModuleSite& site);
+[[nodiscard]] Outcome<std::unique_ptr<contract::OVModule>> makeModule(const LoadedModule& module,
+                                                                     contract::HostServices& host,
+                                                                     contract::ModuleSite& site);
 
 }  // namespace orvane

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/UserDefaults.h"
-#include "fixwell/host/support/OVPreferences.h"
+#include "contract/foundation/UserDefaults.h"
+#include "contract/support/OVPreferences.h"
 
 #include <filesystem>
 
@@ -12,16 +12,16 @@ namespace orvane {
 [[nodiscard]] bool isMountedReadOnly(const std::filesystem::path& path);
 
 /// The preferences, kept in the stored settings, which must outlive this object.
-class Preferences final : public fixwell::OVPreferences {
+class Preferences final : public contract::OVPreferences {
 public:
-    explicit Preferences(fixwell::UserDefaults& settings) : settings_(settings) {}
+    explicit Preferences(contract::UserDefaults& settings) : settings_(settings) {}
 
     bool showDetailsInFixwell() const override;
     void setShowDetailsInFixwell(bool shows) override;
     bool rootVolumeIsReadOnly() const override { return isMountedReadOnly("/"); }
 
 private:
-    fixwell::UserDefaults& settings_;
+    contract::UserDefaults& settings_;
 };
 
 }  // namespace orvane

@@ -38,18 +38,18 @@ SettingsFile::SettingsFile(std::filesystem::path file, WarningSink warn)
     read();
 }
 
-fixwell::Value SettingsFile::objectForKey(std::string_view key) const
+contract::Value SettingsFile::objectForKey(std::string_view key) const
 {
     const auto found = settings_.find(key);
     if (found == settings_.end())
         return {};
-    const bool isText = found->second.kind() == fixwell::Kind::String;
+    const bool isText = found->second.kind() == contract::Kind::String;
     if (const auto truth = isText ? truthValue(found->second.string()) : std::nullopt)
         return *truth;
     return found->second;
 }
 
-void SettingsFile::setObjectForKey(const fixwell::Value& value, std::string_view key)
+void SettingsFile::setObjectForKey(const contract::Value& value, std::string_view key)
 {
     read();
     if (value.isNone())

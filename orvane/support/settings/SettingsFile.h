@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/UserDefaults.h"
+#include "contract/foundation/UserDefaults.h"
 #include "orvane/support/Failure.h"
 
 #include <filesystem>
@@ -15,18 +15,18 @@ namespace orvane {
 /// A file that cannot be read as settings is kept aside as NAME.broken; one that may not be read
 /// or written is left alone. Either is said once through the warning sink, and the settings then
 /// hold for this run.
-class SettingsFile final : public fixwell::UserDefaults {
+class SettingsFile final : public contract::UserDefaults {
 public:
     /// An empty path keeps the settings in memory.
     SettingsFile(std::filesystem::path file, WarningSink warn);
 
-    fixwell::Value objectForKey(std::string_view key) const override;
+    contract::Value objectForKey(std::string_view key) const override;
     /// Written at once. Reads the file again first, so that another program's change to another
     /// key is kept.
-    void setObjectForKey(const fixwell::Value& value, std::string_view key) override;
+    void setObjectForKey(const contract::Value& value, std::string_view key) override;
 
 private:
-    using Settings = std::map<std::string, fixwell::Value, std::less<>>;
+    using Settings = std::map<std::string, contract::Value, std::less<>>;
 
     void read();
     void setAside();

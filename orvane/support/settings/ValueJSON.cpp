@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/settings/ValueJSON.h"
 
-#include "fixwell/host/foundation/Array.h"
-#include "fixwell/host/foundation/Dictionary.h"
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/Array.h"
+#include "contract/foundation/Dictionary.h"
+#include "contract/foundation/UTF8.h"
 
 #include <charconv>
 #include <cmath>
@@ -12,12 +12,12 @@
 namespace orvane {
 namespace {
 
-using fixwell::Array;
-using fixwell::Dictionary;
-using fixwell::Kind;
-using fixwell::StyledText;
-using fixwell::TextStyle;
-using fixwell::Value;
+using contract::Array;
+using contract::Dictionary;
+using contract::Kind;
+using contract::StyledText;
+using contract::TextStyle;
+using contract::Value;
 using nlohmann::json;
 
 bool isUTF8(std::string_view text)
@@ -25,7 +25,7 @@ bool isUTF8(std::string_view text)
     constexpr std::string_view replacement = "\xEF\xBF\xBD";
     while (!text.empty()) {
         const std::string_view before = text;
-        if (fixwell::takeCharacter(text) == 0xFFFD && !before.starts_with(replacement))
+        if (contract::takeCharacter(text) == 0xFFFD && !before.starts_with(replacement))
             return false;
     }
     return true;
@@ -124,7 +124,7 @@ Value dictionaryFrom(const json& entries)
 {
     const Dictionary dictionary = Dictionary::make();
     for (const json& entry : entries)
-        dictionary.set(fixwell::Name(stringFromJSON(entry.at(0))), valueFromJSON(entry.at(1)));
+        dictionary.set(contract::Name(stringFromJSON(entry.at(0))), valueFromJSON(entry.at(1)));
     return dictionary;
 }
 
@@ -218,12 +218,12 @@ TextStyle styleFromJSON(const json& object)
 {
     TextStyle style;
     if (const auto font = object.find("font"); font != object.end())
-        style.font = fixwell::Font{font->at(0).get<bool>(), font->at(1).get<double>()};
+        style.font = contract::Font{font->at(0).get<bool>(), font->at(1).get<double>()};
     if (const auto color = object.find("color"); color != object.end())
-        style.color = fixwell::Color{color->at(0), color->at(1), color->at(2), color->at(3)};
+        style.color = contract::Color{color->at(0), color->at(1), color->at(2), color->at(3)};
     if (const auto paragraph = object.find("paragraph"); paragraph != object.end())
         style.paragraph =
-            fixwell::ParagraphStyle{static_cast<fixwell::LineBreak>(paragraph->at(0).get<int>()),
+            contract::ParagraphStyle{static_cast<contract::LineBreak>(paragraph->at(0).get<int>()),
                                     paragraph->at(1), paragraph->at(2), paragraph->at(3)};
     return style;
 }

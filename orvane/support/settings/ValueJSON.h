@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/StyledText.h"
-#include "fixwell/host/foundation/Value.h"
+#include "contract/foundation/StyledText.h"
+#include "contract/foundation/Value.h"
 
 #include <nlohmann/json.hpp>
 
@@ -22,11 +22,11 @@ namespace orvane {
 /// Discarded when it is no JSON, or nested deeper than anything that is written by us.
 [[nodiscard]] nlohmann::json parsedJSON(std::string_view text);
 
-[[nodiscard]] nlohmann::json jsonFromValue(const fixwell::Value& value);
+[[nodiscard]] nlohmann::json jsonFromValue(const contract::Value& value);
 /// No value for null and for what jsonFromValue never writes.
-[[nodiscard]] fixwell::Value valueFromJSON(const nlohmann::json& json);
+[[nodiscard]] contract::Value valueFromJSON(const nlohmann::json& json);
 
-[[nodiscard]] nlohmann::json jsonFromStyle(const fixwell::TextStyle& style);
-[[nodiscard]] fixwell::TextStyle styleFromJSON(const nlohmann::json& json);
+[[nodiscard]] nlohmann::json jsonFromStyle(const contract::TextStyle& style);
+[[nodiscard]] contract::TextStyle styleFromJSON(const nlohmann::json& json);
 
 }  // namespace orvane

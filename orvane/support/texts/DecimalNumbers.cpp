@@ -63,9 +63,9 @@ std::string grouped(std::string_view digits, std::string_view separator)
     return text;
 }
 
-std::string plainDigits(const fixwell::Value& number)
+std::string plainDigits(const contract::Value& number)
 {
-    if (number.kind() != fixwell::Kind::Real)
+    if (number.kind() != contract::Kind::Real)
         return fmt::format("{}", number.integer());
     std::string digits = fmt::format("{:.3f}", number.real());
     digits.erase(digits.find_last_not_of('0') + 1);
@@ -76,9 +76,9 @@ std::string plainDigits(const fixwell::Value& number)
 
 }  // namespace
 
-std::string decimalText(const fixwell::Value& number, std::string_view language)
+std::string decimalText(const contract::Value& number, std::string_view language)
 {
-    if (number.kind() == fixwell::Kind::Real && !std::isfinite(number.real()))
+    if (number.kind() == contract::Kind::Real && !std::isfinite(number.real()))
         return fmt::format("{}", number.real());
     const Separators separators = separatorsOf(language);
     std::string_view digits;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Value.h"
+#include "contract/foundation/Value.h"
 
 #include <string>
 #include <string_view>
@@ -12,6 +12,6 @@ namespace orvane {
 /// thousands, with at most three decimals. The separators are those of the Unicode CLDR for the
 /// common languages, and English ones for any other; the system's locales are not asked, because
 /// a rescue system has none. Anything but a number reads as 0.
-[[nodiscard]] std::string decimalText(const fixwell::Value& number, std::string_view language);
+[[nodiscard]] std::string decimalText(const contract::Value& number, std::string_view language);
 
 }  // namespace orvane

@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Bundle.h"
+#include "contract/foundation/Bundle.h"
 #include "orvane/support/texts/Catalogue.h"
 
 namespace orvane {
 
 /// A directory with resources, and with its string tables in `locale`: a module's bundle or the
 /// host's own. Unlike the contract asks, any thread may ask for texts.
-class ModuleBundle final : public fixwell::Bundle {
+class ModuleBundle final : public contract::Bundle {
 public:
     ModuleBundle(std::filesystem::path directory, std::string defaultTable);
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/foundation/Format.h"
+#include "contract/foundation/Format.h"
 
 #include <functional>
 #include <initializer_list>
@@ -24,9 +24,9 @@ struct Translator {
 
     /// The translated format filled with arguments (fixwell/host/foundation/Format.h).
     std::string sentence(std::string_view key,
-                         std::initializer_list<fixwell::FormatArgument> arguments) const
+                         std::initializer_list<contract::FormatArgument> arguments) const
     {
-        return fixwell::format(text(key), arguments);
+        return contract::format(text(key), arguments);
     }
 };
 

@@ -27,16 +27,16 @@ std::string durationText(double seconds, const Translator& translator)
         return translator.text("less than a minute");
     if (minutes < 75) {
         const long shown = roundedTo(minutes < 12.5 ? 1 : 5, minutes);
-        return fixwell::format(translator.plural("about %ld minute", "about %ld minutes", shown),
+        return contract::format(translator.plural("about %ld minute", "about %ld minutes", shown),
                                {shown});
     }
     if (minutes < 36 * 60) {
         const long shown = roundedTo(1, minutes / 60);
-        return fixwell::format(translator.plural("about %ld hour", "about %ld hours", shown),
+        return contract::format(translator.plural("about %ld hour", "about %ld hours", shown),
                                {shown});
     }
     const long shown = roundedTo(1, minutes / 60 / 24);
-    return fixwell::format(translator.plural("about %ld day", "about %ld days", shown), {shown});
+    return contract::format(translator.plural("about %ld day", "about %ld days", shown), {shown});
 }
 
 TimeEstimator::TimeEstimator(std::function<Date()> now, Translator translator)

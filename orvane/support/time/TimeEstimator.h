@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "fixwell/host/support/OVTimeEstimator.h"
+#include "contract/support/OVTimeEstimator.h"
 #include "orvane/support/texts/Translator.h"
 
 #include <functional>
@@ -16,9 +16,9 @@ namespace orvane {
 /// Estimates what is left of a job from what it took so far. Says nothing in the first two seconds
 /// and below one percent, where any number would be a guess. A burst or a pause of progress moves
 /// the estimate slowly.
-class TimeEstimator final : public fixwell::OVTimeEstimator {
+class TimeEstimator final : public contract::OVTimeEstimator {
 public:
-    using Date = fixwell::Threads::Date;
+    using Date = contract::Threads::Date;
 
     TimeEstimator(std::function<Date()> now, Translator translator);
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DiskRequest.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 
@@ -89,7 +89,7 @@ std::optional<Refusal> objectionTo(DiskAction action, const Disk& disk)
 {
     if (disk.hasGone())
         return because(Refusal::Kind::HasGone);
-    if (disk.facts().storage != fixwell::DiskReference::Storage::BlockDevice)
+    if (disk.facts().storage != contract::DiskReference::Storage::BlockDevice)
         return because(action == DiskAction::Detach ? Refusal::Kind::IsNoLoop
                                                     : Refusal::Kind::IsImage);
     const auto whole = wholeOf(disk);
@@ -119,7 +119,7 @@ DiskRequest requestToAttach(const std::filesystem::path& image)
 {
     return {DiskAction::Attach,
             image.native(),
-            fixwell::printable((image.has_filename() ? image.filename() : image).native()),
+            contract::printable((image.has_filename() ? image.filename() : image).native()),
             {{DiskStep::Kind::Attach, image.native()}}};
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/Refusal.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 
 #include <algorithm>
 #include <array>
@@ -51,7 +51,7 @@ Kind kindOfNoReply(std::string_view text)
 
 Refusal refusalOf(std::string_view errorName, std::string_view errorText)
 {
-    const std::string text = fixwell::printable(errorText);
+    const std::string text = contract::printable(errorText);
     if (errorName == "org.freedesktop.DBus.Error.NoReply")
         return {kindOfNoReply(errorText), text};
     const auto* const known =
@@ -59,7 +59,7 @@ Refusal refusalOf(std::string_view errorName, std::string_view errorText)
                      [&](const KnownError& error) { return errorName.starts_with(error.prefix); });
     if (known != knownErrors.end())
         return {known->kind, known->kind == Kind::Busy ? std::string() : text};
-    return {Kind::Other, text.empty() ? fixwell::printable(errorName) : text};
+    return {Kind::Other, text.empty() ? contract::printable(errorName) : text};
 }
 
 bool isLeftToOthers(const Refusal& refusal)

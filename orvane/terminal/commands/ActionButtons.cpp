@@ -32,7 +32,7 @@ std::string damagedMapSentence(Session& session, const NamedDisk& image)
 std::string unavailableSentence(Session& session, const TerminalButton& button,
                                 const NamedDisk& disk)
 {
-    return fixwell::format(
+    return contract::format(
         "%@: %@: %@", {disk.name, button.title(), unavailableReason(session, button, *disk.disk)});
 }
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/ImageDevices.h"
 #include "orvane/support/udisks/MountedAt.h"

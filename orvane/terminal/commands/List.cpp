@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/jobs/LastRuns.h"
 #include "orvane/support/disks/DiskTypes.h"
 #include "orvane/terminal/commands/ActionButtons.h"

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "orvane/jobs/UnreachedImage.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/ActionButtons.h"
@@ -71,7 +71,7 @@ bool wasUnderstood(const NamedDisk& named, Session& session)
     const auto& outcomes = session.jobs().outcomes();
     return std::any_of(outcomes.begin(), outcomes.end(), [&named](const auto& outcome) {
         return DiskNames::isWithin(outcome.first, named.disk->facts().identifier) &&
-               outcome.second.errorCode != fixwell::kPLErrorUnsupported;
+               outcome.second.errorCode != contract::kPLErrorUnsupported;
     });
 }
 

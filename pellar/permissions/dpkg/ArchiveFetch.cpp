@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/dpkg/ArchiveFetch.h"
 
-#include "fixwell/host/foundation/UTF8.h"
+#include "contract/foundation/UTF8.h"
 #include "pellar/permissions/Lines.h"
 #include "pellar/permissions/PackagedFile.h"
 #include "pellar/permissions/TemporaryDirectory.h"
@@ -48,7 +48,7 @@ public:
         constexpr int mostComplaints = 10;
         const bool isComplaint = line.starts_with("W: ") || line.starts_with("E: ");
         if (isComplaint && tell_ && told_++ < mostComplaints)
-            tell_("apt: " + fixwell::printable(std::string(line)));
+            tell_("apt: " + contract::printable(std::string(line)));
     }
     void progressLine(std::string_view) override {}
     void lineLimitReached() override {}

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/permissions/Reference.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
 #include "pellar/process/StopSwitch.h"
+#include "pellar/texts/Sentence.h"
 
 #include <functional>
 #include <variant>

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/Sentence.h"
 #include "pellar/permissions/RootFiles.h"
 #include "pellar/permissions/TemporaryDirectory.h"
+#include "pellar/texts/Sentence.h"
 
 #include <string>
 #include <variant>

@@ -44,7 +44,7 @@ TEST(Alerts, TheAnswerIsTheTagOfTheButtonAndComesOnceAndLater)
             alert->buttons().at(1)->setKeyEquivalent("\r");
         }
         std::vector<long> answers;
-        alert->beginSheetModalForWindow(nullptr, [&](fixwell::Alert&, long answer) {
+        alert->beginSheetModalForWindow(nullptr, [&](contract::Alert&, long answer) {
             answers.push_back(answer);
             alert.reset();
         });

@@ -84,7 +84,7 @@ TEST_F(Interface, AnEmptyLogSaysWhatToDo)
     addRow("one");
     reload();
     EXPECT_FALSE(note->isVisible());
-    disk->history = fixwell::Array::make();
+    disk->history = contract::Array::make();
     selectDisk();
     reload();
     EXPECT_TRUE(note->isVisible());
@@ -126,7 +126,7 @@ TEST_F(Interface, NothingIsSentToAModuleThatHasGone)
 
 TEST_F(Interface, LooksAsItShouldInLightAndDark)
 {
-    using fixwell::Color;
+    using contract::Color;
     const Color red{1, 0, 0, 1};
     const Color green{0, 0.8, 0.2, 1};
     addRow("Verifying volume “USB”", -1);
@@ -134,7 +134,7 @@ TEST_F(Interface, LooksAsItShouldInLightAndDark)
     addRow("Inode 12, i_blocks is 24, should be 8. This line is long: " + std::string(200, 'x') +
                " and this is its end.",
            0, {{}, red, {}});
-    addRow("The volume “USB” appears to be OK.", -1, {fixwell::Font::boldSystem(11), green, {}});
+    addRow("The volume “USB” appears to be OK.", -1, {contract::Font::boldSystem(11), green, {}});
     reload();
     table().selectRow(1);
     const QPalette before = QApplication::palette();

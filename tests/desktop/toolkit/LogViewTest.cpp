@@ -43,7 +43,7 @@ TEST_F(LogView, SelectionStaysWhileTheLogGrowsAndGoesWithTheLog)
     addRow("three");
     reload();
     EXPECT_EQ(view->selectedRowIndexes(), std::vector<std::size_t>{1});
-    disk->history = fixwell::Array::make();
+    disk->history = contract::Array::make();
     for (const char* text : {"a", "b", "c", "d"})
         addRow(text);
     selectDisk();
@@ -65,8 +65,8 @@ TEST_F(LogView, ALogOpensAtItsEndAndStaysWhereItIsWhenOlderRowsComeInFront)
     };
     const QString before = rowInSight();
 
-    const fixwell::Array newest = disk->history;
-    disk->history = fixwell::Array::make();
+    const contract::Array newest = disk->history;
+    disk->history = contract::Array::make();
     for (int i = 0; i < 100; ++i)
         addRow("row " + std::to_string(i));
     disk->history.append(newest);
@@ -100,7 +100,7 @@ TEST_F(LogView, WhoReadsAtTheEndIsShownEveryNewEnd)
 TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
 {
     const auto other = std::make_shared<fixwell::testing::FakeDisk>("loop1");
-    other->history = fixwell::Array::make();
+    other->history = contract::Array::make();
     for (int i = 0; i < 200; ++i) {
         addRow("one " + std::to_string(i), i % 4 == 0 ? 0 : 1);
         std::swap(disk->history, other->history);
@@ -152,8 +152,8 @@ TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
 TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
 {
     for (int i = 0; i < 1'000'000; ++i)
-        disk->history.append(fixwell::Dictionary::of(
-            {{fixwell::kOV_finalAttributedString_type, fixwell::StyledText::make("line\n")}}));
+        disk->history.append(contract::Dictionary::of(
+            {{contract::kOV_finalAttributedString_type, contract::StyledText::make("line\n")}}));
     reload();
     view->selectAll(nullptr);
     EXPECT_EQ(view->numberOfSelectedRows(), 1'000'000U);
@@ -173,7 +173,7 @@ TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
 TEST_F(LogView, DeletingKeysClearTheHistoryOnlyWhenEverythingIsSelected)
 {
     for (const int key : {Qt::Key_Backspace, Qt::Key_Delete, Qt::Key_Clear}) {
-        disk->history = fixwell::Array::make();
+        disk->history = contract::Array::make();
         addRow("one");
         addRow("two");
         selectDisk();
@@ -190,7 +190,7 @@ TEST_F(LogView, DeletingKeysClearTheHistoryOnlyWhenEverythingIsSelected)
 TEST_F(LogView, CopiedRowsGoToTheClipboardInEveryFormat)
 {
     addRow("<one> \x1b]0;title\x07{\\rtf \xE2\x80\xAE", -1);
-    addRow("two", 0, {{}, fixwell::Color{1, 0, 0, 1}, {}});
+    addRow("two", 0, {{}, contract::Color{1, 0, 0, 1}, {}});
     reload();
     host.qtPasteboard.setHTMLSource([this] { return interface->outlinePeer()->selectionHTML(); });
     view->selectAll(nullptr);

@@ -14,8 +14,8 @@
 namespace orvane::desktop {
 namespace {
 
-using fixwell::Color;
-using fixwell::StyledText;
+using contract::Color;
+using contract::StyledText;
 
 constexpr int longestWait = 60'000;  // milliseconds
 
@@ -44,12 +44,12 @@ protected:
         printer.setOutputFormat(QPrinter::PdfFormat);
         printer.setPageSize(QPageSize(QPageSize::A4));
         printer.setOutputFileName(toQt(file));
-        fixwell::PrintInfo info;
-        info.horizontalPagination = fixwell::Pagination::Fit;
+        contract::PrintInfo info;
+        info.horizontalPagination = contract::Pagination::Fit;
         info.isHorizontallyCentered = false;
         info.isVerticallyCentered = false;
         PrintJob job(
-            printer, rows, fixwell::Font::system(11), info,
+            printer, rows, contract::Font::system(11), info,
             {QStringLiteral("USB <b>stick"), QStringLiteral("today"), [](int page, int pages) {
                  return QStringLiteral("Page %1 of %2").arg(page).arg(pages);
              }});
@@ -94,7 +94,7 @@ TEST_F(PrintTest, EveryWordOfALongLineIsOnThePaperAndColoursAreKept)
     for (int i = 0; i < 60; ++i)
         words += "w" + std::to_string(100 + i) + " ";
     ASSERT_GE(words.size(), 300U);
-    rows.push_back(StyledText::make("Verifying\n", {fixwell::Font::boldSystem(11), {}, {}}));
+    rows.push_back(StyledText::make("Verifying\n", {contract::Font::boldSystem(11), {}, {}}));
     rows.push_back(StyledText::make(words + "\n"));
     rows.push_back(StyledText::make(std::string(700, 'x') + "END\n", {{}, Color{1, 0, 0, 1}, {}}));
     rows.push_back(StyledText::make("a fine end of it all\n", {{}, Color{0, 0.8, 0.2, 1}, {}}));

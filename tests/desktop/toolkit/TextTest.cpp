@@ -11,10 +11,10 @@
 namespace orvane::desktop {
 namespace {
 
-using fixwell::Color;
-using fixwell::Font;
-using fixwell::StyledText;
-using fixwell::TextStyle;
+using contract::Color;
+using contract::Font;
+using contract::StyledText;
+using contract::TextStyle;
 
 qsizetype lengthOfRuns(const StyledLine& line)
 {
@@ -76,8 +76,8 @@ TEST(StyledLine, FittedLineKeepsBothEndsInTheirStyles)
 {
     const StyledText text = StyledText::make(std::string(200, 'a'), {Font::boldSystem(11), {}, {}});
     text.append(StyledText::make(std::string(200, 'b'), {Font::system(11), {}, {}}));
-    fixwell::ParagraphStyle middle;
-    middle.lineBreak = fixwell::LineBreak::TruncateMiddle;
+    contract::ParagraphStyle middle;
+    middle.lineBreak = contract::LineBreak::TruncateMiddle;
     text.addAttributes({{}, {}, middle});
     const StyledLine line = oneLine(text);
     const QFontMetricsF metrics(widestFont(line, {}));

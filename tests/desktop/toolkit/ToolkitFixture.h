@@ -21,7 +21,7 @@
 namespace orvane::desktop {
 
 /// The directory of the interface file, and texts in a language of its own.
-struct TestBundle final : fixwell::Bundle {
+struct TestBundle final : contract::Bundle {
     std::string localizedString(std::string_view key, std::string_view,
                                 std::string_view) const override
     {
@@ -35,7 +35,7 @@ struct TestBundle final : fixwell::Bundle {
 };
 
 /// A fake host, except for its screen.
-struct ScreenHost final : fixwell::HostServices {
+struct ScreenHost final : contract::HostServices {
     fixwell::testing::FakeHost fake;
     TestBundle bundle;
     QtAlerts qtAlerts{[](std::int32_t code) {
@@ -54,30 +54,30 @@ struct ScreenHost final : fixwell::HostServices {
 
     ScreenHost() { qtInterface.setBundle(bundle); }
 
-    fixwell::OVPreferences& sharedPreferences() override { return fake; }
-    fixwell::OVDiskController& sharedDiskController() override { return fake; }
-    fixwell::OVLog& log() override { return fake; }
-    fixwell::NotificationCenter& defaultCenter() override { return fake; }
-    fixwell::RunLoop& mainRunLoop() override { return fake; }
-    fixwell::Threads& threads() override { return fake; }
-    fixwell::UserDefaults& standardUserDefaults() override { return fake; }
-    fixwell::Bundle& hostBundle() override { return fake; }
-    fixwell::ImageAttachment& imageAttachment() override { return fake; }
-    fixwell::Alerts& alerts() override { return qtAlerts; }
-    fixwell::Events& events() override { return qtEvents; }
-    fixwell::HelpManager& sharedHelpManager() override { return fake; }
+    contract::OVPreferences& sharedPreferences() override { return fake; }
+    contract::OVDiskController& sharedDiskController() override { return fake; }
+    contract::OVLog& log() override { return fake; }
+    contract::NotificationCenter& defaultCenter() override { return fake; }
+    contract::RunLoop& mainRunLoop() override { return fake; }
+    contract::Threads& threads() override { return fake; }
+    contract::UserDefaults& standardUserDefaults() override { return fake; }
+    contract::Bundle& hostBundle() override { return fake; }
+    contract::ImageAttachment& imageAttachment() override { return fake; }
+    contract::Alerts& alerts() override { return qtAlerts; }
+    contract::Events& events() override { return qtEvents; }
+    contract::HelpManager& sharedHelpManager() override { return fake; }
     QtInterface& interfaceLoader() override { return qtInterface; }
-    fixwell::Pasteboard& generalPasteboard() override { return qtPasteboard; }
-    fixwell::Printing& printing() override { return qtPrinting; }
-    std::unique_ptr<fixwell::OVTimeEstimator> makeTimeEstimator() override
+    contract::Pasteboard& generalPasteboard() override { return qtPasteboard; }
+    contract::Printing& printing() override { return qtPrinting; }
+    std::unique_ptr<contract::OVTimeEstimator> makeTimeEstimator() override
     {
         return fake.makeTimeEstimator();
     }
-    std::string OVLocalizedErrorString(fixwell::ErrorCode code) override
+    std::string OVLocalizedErrorString(contract::ErrorCode code) override
     {
         return fake.OVLocalizedErrorString(code);
     }
-    std::string decimalString(const fixwell::Value& number) override
+    std::string decimalString(const contract::Value& number) override
     {
         return fake.decimalString(number);
     }
@@ -88,14 +88,14 @@ class ToolkitTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        module = std::make_unique<fixwell::OVFXW>(host, host.fake);
+        module = std::make_unique<contract::OVFXW>(host, host.fake);
         ASSERT_TRUE(module->init());
         module->registerForNotifications();
         interface = host.qtInterface.latest();
         ASSERT_NE(interface, nullptr);
         view = interface->outlineView();
         ASSERT_NE(view, nullptr);
-        disk->history = fixwell::Array::make();
+        disk->history = contract::Array::make();
         host.fake.disks.push_back(disk);
         host.fake.selection = {disk};
         interface->widget().resize(640, 560);
@@ -106,20 +106,20 @@ protected:
 
     void selectDisk()
     {
-        module->selectionDidChange({fixwell::OVDiskChangedNotification, nullptr, {}});
+        module->selectionDidChange({contract::OVDiskChangedNotification, nullptr, {}});
         settle();
     }
 
     void addRow(std::string_view text, std::int64_t verbosity = 0,
-                const fixwell::TextStyle& style = {})
+                const contract::TextStyle& style = {})
     {
-        fixwell::TextStyle complete = style;
+        contract::TextStyle complete = style;
         if (!complete.font)
-            complete.font = fixwell::Font{verbosity < 0, 11};
-        disk->history.append(fixwell::Dictionary::of(
-            {{fixwell::kFsckVerbosity, verbosity},
-             {fixwell::kOV_finalAttributedString_type,
-              fixwell::StyledText::make(std::string(text) + "\n", complete)}}));
+            complete.font = contract::Font{verbosity < 0, 11};
+        disk->history.append(contract::Dictionary::of(
+            {{contract::kFsckVerbosity, verbosity},
+             {contract::kOV_finalAttributedString_type,
+              contract::StyledText::make(std::string(text) + "\n", complete)}}));
     }
 
     void reload()
@@ -135,9 +135,9 @@ protected:
     ScreenHost host;
     std::shared_ptr<fixwell::testing::FakeDisk> disk =
         std::make_shared<fixwell::testing::FakeDisk>("loop0");
-    std::unique_ptr<fixwell::OVFXW> module;
+    std::unique_ptr<contract::OVFXW> module;
     LoadedInterface* interface = nullptr;
-    fixwell::OutlineView* view = nullptr;
+    contract::OutlineView* view = nullptr;
 };
 
 }  // namespace orvane::desktop

@@ -210,9 +210,9 @@ void DiskImage::seal(std::uint64_t headerPlace) const
     put(headerPlace * 512, header);
 }
 
-fixwell::DiskReferencePointer wholeDisk(const std::filesystem::path& path)
+contract::DiskReferencePointer wholeDisk(const std::filesystem::path& path)
 {
-    auto disk = std::make_shared<fixwell::DiskReference>(*reference(path, ""));
+    auto disk = std::make_shared<contract::DiskReference>(*reference(path, ""));
     disk->isWhole = true;
     return disk;
 }

@@ -80,6 +80,6 @@ private:
 };
 
 /// The reference to a whole disk.
-fixwell::DiskReferencePointer wholeDisk(const std::filesystem::path& path);
+contract::DiskReferencePointer wholeDisk(const std::filesystem::path& path);
 
 }  // namespace pellar::test

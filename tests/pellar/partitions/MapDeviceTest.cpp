@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 #include "tests/support/LoopDevice.h"
 
@@ -49,8 +49,8 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
     const orvane::test::LoopDevice device(disk.path());
     if (device.name().empty())
         GTEST_SKIP() << "the system gives no loop device";
-    auto reference = std::make_shared<fixwell::DiskReference>(*test::wholeDisk(device.name()));
-    reference->storage = fixwell::DiskReference::Storage::BlockDevice;
+    auto reference = std::make_shared<contract::DiskReference>(*test::wholeDisk(device.name()));
+    reference->storage = contract::DiskReference::Storage::BlockDevice;
     reference->length = 0;
     ManagerOptions options;
     options.savedSectorsDirectory = workshop.path("saved");
@@ -61,9 +61,9 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
         const Mounted mounted(device.name() + "p1", workshop.path("mount"));
         if (mounted) {
             bench.finish(bench.tool->beginPartitionMapRepairForDisk(reference));
-            EXPECT_EQ(bench.listener.error, fixwell::kPLErrorDiskInUse) << bench.listener.message;
+            EXPECT_EQ(bench.listener.error, contract::kPLErrorDiskInUse) << bench.listener.message;
             bench.finish(bench.tool->beginPartitionMapVerifyForDisk(reference));
-            EXPECT_EQ(bench.listener.error, kPLErrorMapDamaged) << bench.listener.message;
+            EXPECT_EQ(bench.listener.error, contract::kPLErrorMapDamaged) << bench.listener.message;
         } else {
             ADD_FAILURE() << "a partition could not be mounted, so its use is not tested";
         }

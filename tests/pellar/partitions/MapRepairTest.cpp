@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/process/FileDescriptor.h"
@@ -36,11 +36,11 @@ struct MapBench : test::Bench {
     {
     }
 
-    fixwell::ErrorCode verifyMap(const fs::path& disk)
+    contract::ErrorCode verifyMap(const fs::path& disk)
     {
         return finish(tool->beginPartitionMapVerifyForDisk(test::wholeDisk(disk)));
     }
-    fixwell::ErrorCode repairMap(const fs::path& disk)
+    contract::ErrorCode repairMap(const fs::path& disk)
     {
         return finish(tool->beginPartitionMapRepairForDisk(test::wholeDisk(disk)));
     }
@@ -150,10 +150,10 @@ TEST(MapRepair, RestoresWhatIsThereTwiceAndNothingElse)
         c.damage(disk);
         const Bytes damaged = disk.bytes();
         MapBench bench(workshop.path("saved"));
-        ASSERT_EQ(bench.verifyMap(disk.path()), fixwell::kPLNoError);
-        EXPECT_EQ(bench.listener.error, kPLErrorMapDamaged) << c.because;
+        ASSERT_EQ(bench.verifyMap(disk.path()), contract::kPLNoError);
+        EXPECT_EQ(bench.listener.error, contract::kPLErrorMapDamaged) << c.because;
         EXPECT_TRUE(disk.bytes() == damaged) << c.because << ": a verification has written";
-        ASSERT_EQ(bench.repairMap(disk.path()), fixwell::kPLNoError);
+        ASSERT_EQ(bench.repairMap(disk.path()), contract::kPLNoError);
         EXPECT_EQ(bench.listener.verdict, "repaired") << c.because << bench.listener.message;
 
         const Bytes after = disk.bytes();
@@ -224,9 +224,9 @@ TEST(MapRepair, TouchesNothingThatAPersonHasToDecide)
         const Bytes damaged = disk.bytes();
         MapBench bench(workshop.path("saved"));
         bench.verifyMap(disk.path());
-        EXPECT_EQ(bench.listener.error, kPLErrorMapNeedsPerson) << c.because;
+        EXPECT_EQ(bench.listener.error, contract::kPLErrorMapNeedsPerson) << c.because;
         bench.repairMap(disk.path());
-        EXPECT_EQ(bench.listener.error, kPLErrorMapNotRepaired) << c.because;
+        EXPECT_EQ(bench.listener.error, contract::kPLErrorMapNotRepaired) << c.because;
         EXPECT_TRUE(disk.bytes() == damaged) << c.because;
         EXPECT_FALSE(fs::exists(workshop.path("saved"))) << c.because << ": nothing to be kept";
     }
@@ -298,20 +298,20 @@ TEST(MapRepair, ADiskThatIsInUseIsOnlyRead)
     ASSERT_EQ(::flock(other.get(), LOCK_EX | LOCK_NB), 0);
     MapBench bench(workshop.path("saved"));
     bench.repairMap(disk.path());
-    EXPECT_EQ(bench.listener.error, fixwell::kPLErrorDiskInUse);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorDiskInUse);
     EXPECT_TRUE(disk.bytes() == damaged);
     bench.verifyMap(disk.path());
-    EXPECT_EQ(bench.listener.error, kPLErrorMapDamaged);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorMapDamaged);
 }
 
 TEST(MapRepair, CapabilityAnswersWithoutAJob)
 {
     const test::Workshop workshop;
     const MapBench bench(workshop.path("saved"));
-    const auto can = [&](const fixwell::DiskReferencePointer& disk) {
-        fixwell::ErrorCode error = 1;
+    const auto can = [&](const contract::DiskReferencePointer& disk) {
+        contract::ErrorCode error = 1;
         const bool answer = bench.tool->canRepairPartitionMapForDisk(disk, &error);
-        EXPECT_EQ(error, fixwell::kPLNoError);
+        EXPECT_EQ(error, contract::kPLNoError);
         return answer;
     };
     const DiskImage gpt = DiskImage::gpt(workshop, "gpt");

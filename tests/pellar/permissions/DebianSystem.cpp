@@ -135,20 +135,20 @@ void DebianSystem::writeIndex() const
     write("var/lib/apt/lists/example_main_Packages", index);
 }
 
-fixwell::DiskReferencePointer DebianSystem::disk() const
+contract::DiskReferencePointer DebianSystem::disk() const
 {
     return mountedAt(path());
 }
 
-fixwell::DiskReferencePointer mountedAt(const fs::path& root)
+contract::DiskReferencePointer mountedAt(const fs::path& root)
 {
-    fixwell::DiskReference disk;
+    contract::DiskReference disk;
     disk.path = "/dev/null";
     disk.identifier = "disk";
     disk.name = "Disk";
     disk.filesystem = "ext4";
     disk.mountPoint = root;
-    return std::make_shared<const fixwell::DiskReference>(std::move(disk));
+    return std::make_shared<const contract::DiskReference>(std::move(disk));
 }
 
 PermissionBench::PermissionBench(const fs::path& store)
@@ -160,12 +160,12 @@ PermissionBench::PermissionBench(const fs::path& store)
 {
 }
 
-fixwell::ErrorCode PermissionBench::verifyPermissions(const fixwell::DiskReferencePointer& disk)
+contract::ErrorCode PermissionBench::verifyPermissions(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginPermissionsVerifyForDisk(disk));
 }
 
-fixwell::ErrorCode PermissionBench::repairPermissions(const fixwell::DiskReferencePointer& disk)
+contract::ErrorCode PermissionBench::repairPermissions(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginPermissionsRepairForDisk(disk));
 }
@@ -173,7 +173,7 @@ fixwell::ErrorCode PermissionBench::repairPermissions(const fixwell::DiskReferen
 std::string PermissionBench::problems() const
 {
     std::string all;
-    for (const std::string& line : listener.textsOf(fixwell::kFsckError))
+    for (const std::string& line : listener.textsOf(contract::kFsckError))
         all += line + '\n';
     return all;
 }
@@ -181,9 +181,9 @@ std::string PermissionBench::problems() const
 std::string PermissionBench::remarks() const
 {
     std::string all;
-    for (const fixwell::Dictionary& message : listener.dictionaries)
-        if (!message.has(fixwell::kFsckMessageType))
-            all += std::string(message.string(fixwell::kFsckMessageString)) + "\n";
+    for (const contract::Dictionary& message : listener.dictionaries)
+        if (!message.has(contract::kFsckMessageType))
+            all += std::string(message.string(contract::kFsckMessageString)) + "\n";
     return all;
 }
 

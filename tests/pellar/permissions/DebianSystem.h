@@ -46,7 +46,7 @@ public:
     std::filesystem::path path(std::string_view name = {}) const;
     std::filesystem::path archiveOf(const std::string& name) const;
     std::filesystem::path store() const { return workshop_.path("store"); }
-    fixwell::DiskReferencePointer disk() const;
+    contract::DiskReferencePointer disk() const;
 
 private:
     Workshop workshop_;
@@ -58,8 +58,8 @@ struct PermissionBench : Bench {
     explicit PermissionBench(const DebianSystem& installed) : PermissionBench(installed.store()) {}
     explicit PermissionBench(const std::filesystem::path& store);
 
-    fixwell::ErrorCode verifyPermissions(const fixwell::DiskReferencePointer& disk);
-    fixwell::ErrorCode repairPermissions(const fixwell::DiskReferencePointer& disk);
+    contract::ErrorCode verifyPermissions(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode repairPermissions(const contract::DiskReferencePointer& disk);
     /// The problems of all runs so far, with line ends.
     std::string problems() const;
     /// The numbers and other lines that are always shown.
@@ -67,6 +67,6 @@ struct PermissionBench : Bench {
 };
 
 /// A mounted volume, as the host would name it.
-fixwell::DiskReferencePointer mountedAt(const std::filesystem::path& root);
+contract::DiskReferencePointer mountedAt(const std::filesystem::path& root);
 
 }  // namespace pellar::test

@@ -2,7 +2,7 @@
 // Jobs on the permissions of installed files, on systems made for the purpose. Needs root: the
 // owners do.
 
-#include "pellar/ErrorCodes.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/RootDirectory.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
@@ -143,7 +143,7 @@ TEST_F(PermissionJob, WhatIsKeptIsBoundToTheArchiveAndToTheRunningSystem)
     EXPECT_EQ(withoutSource(), 0U) << "kept";
     PermissionBench foreign(*system_);
     EXPECT_EQ(foreign.verifyPermissions(system_->disk()), 0);
-    EXPECT_EQ(foreign.listener.error, kPLErrorNoReferences) << "not for a system that is mounted";
+    EXPECT_EQ(foreign.listener.error, contract::kPLErrorNoReferences) << "not for a system that is mounted";
     fs::permissions(system_->store(), fs::perms::all);
     EXPECT_EQ(withoutSource(), all) << "others could write to the store";
     fs::permissions(system_->store(), fs::perms::owner_all);
@@ -285,7 +285,7 @@ TEST_F(PermissionJob, APlantedLinkIsNotFollowed)
     EXPECT_TRUE(contains(bench.problems(), "“var/lib/games/list” is a symbolic link"))
         << bench.problems();
     EXPECT_TRUE(contains(bench.remarks(), "2 files could not be reached")) << bench.remarks();
-    EXPECT_EQ(bench.listener.error, kPLErrorPermissionsNotRepaired);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorPermissionsNotRepaired);
 }
 
 TEST_F(PermissionJob, AnotherNameOfSomebodyElsesFileIsLeftAlone)
@@ -306,7 +306,7 @@ TEST_F(PermissionJob, WhatNobodyKnowsIsNotPassedAsRight)
     PermissionBench bench(*system_);
     EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
     EXPECT_EQ(bench.listener.verdict, "inconclusive");
-    EXPECT_EQ(bench.listener.error, kPLErrorNoReferences);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorNoReferences);
     EXPECT_TRUE(contains(bench.remarks(), "9 files were not compared")) << bench.remarks();
 }
 
@@ -358,7 +358,7 @@ TEST_F(PermissionJob, ADamagedArchiveIsNoSource)
     fs::resize_file(system_->archiveOf("games"), fs::file_size(system_->archiveOf("games")) - 60);
     PermissionBench bench(*system_);
     EXPECT_EQ(bench.verifyPermissions(system_->disk()), 0);
-    EXPECT_EQ(bench.listener.error, kPLErrorNoReferences) << bench.remarks();
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorNoReferences) << bench.remarks();
 }
 
 TEST_F(PermissionJob, StopsBetweenTwoFiles)
@@ -369,7 +369,7 @@ TEST_F(PermissionJob, StopsBetweenTwoFiles)
     bench.tool->cancelCurrentOperation();
     ASSERT_TRUE(bench.loop.runUntil([&] { return bench.listener.finished == 1; }));
     const bool wasStopped = bench.listener.verdict == "stopped";
-    EXPECT_TRUE(wasStopped ? bench.listener.error == fixwell::kPLErrorCancelled
+    EXPECT_TRUE(wasStopped ? bench.listener.error == contract::kPLErrorCancelled
                            : bench.listener.verdict == "repaired");
     EXPECT_EQ(bench.listener.started, 1);
     EXPECT_EQ(bench.listener.callsAfterFinished, 0);
@@ -381,8 +381,8 @@ TEST_F(PermissionJob, AVolumeThatIsNoSystemIsRefused)
     PermissionBench bench(workshop.path("store"));
     fs::create_directory(workshop.path("empty"));
     EXPECT_EQ(bench.verifyPermissions(test::mountedAt(workshop.path("empty"))),
-              fixwell::kPLErrorUnsupported);
-    EXPECT_EQ(bench.verifyPermissions(test::mountedAt({})), fixwell::kPLErrorUnsupported);
+              contract::kPLErrorUnsupported);
+    EXPECT_EQ(bench.verifyPermissions(test::mountedAt({})), contract::kPLErrorUnsupported);
     EXPECT_EQ(installedSystemAt(system_->path()), PackageDatabase::Dpkg);
     EXPECT_EQ(installedSystemAt("/nowhere"), PackageDatabase::None);
 }

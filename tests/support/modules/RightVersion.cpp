@@ -1,31 +1,31 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/host/support/ModuleEntry.h"
+#include "contract/support/ModuleEntry.h"
 
 namespace {
 
-class EmptyModule final : public fixwell::OVModule {
+class EmptyModule final : public contract::OVModule {
 public:
     using OVModule::OVModule;
     std::string displayName() const override { return "Empty"; }
-    fixwell::Value tabOrder() const override { return 1; }
+    contract::Value tabOrder() const override { return 1; }
     std::string dataType() const override { return "EMPTY"; }
 };
 
-bool shouldRun(fixwell::HostServices&, fixwell::Bundle& bundle)
+bool shouldRun(contract::HostServices&, contract::Bundle& bundle)
 {
     return bundle.localizedString("key") == "key";
 }
 
-fixwell::OVModule* make(fixwell::HostServices& host, fixwell::ModuleSite& site)
+contract::OVModule* make(contract::HostServices& host, contract::ModuleSite& site)
 {
     return std::make_unique<EmptyModule>(host, site).release();
 }
 
-constexpr fixwell::ModuleEntry entry{fixwell::moduleContractVersion, shouldRun, make};
+constexpr contract::ModuleEntry entry{contract::moduleContractVersion, shouldRun, make};
 
 }  // namespace
 
-extern "C" const fixwell::ModuleEntry* OVModuleEntry()
+extern "C" const contract::ModuleEntry* OVModuleEntry()
 {
     return &entry;
 }

@@ -1,0 +1,39 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "contract/foundation/Name.h"
+
+namespace contract {
+
+// The keys of a message dictionary; the log's records carry the same.
+
+inline const Name kFsckMessageType{"fsck_msg_type"};
+/// May hold the placeholders "%1$@", "%2$@", ... that the parameters fill.
+inline const Name kFsckMessageString{"fsck_msg_string"};
+inline const Name kFsckVerbosity{"fsck_verbosity"};
+inline const Name kFsckParameters{"parameters"};
+
+// The message types.
+
+inline const Name kFsckVerify{"VERIFY"};      ///< a step of a verification
+inline const Name kFsckRepair{"REPAIR"};      ///< a step of a repair
+inline const Name kFsckError{"ERROR"};        ///< a problem that was found
+inline const Name kFsckSuccess{"SUCCESS"};    ///< a good result
+inline const Name kFsckFail{"FAIL"};          ///< a failed operation, or a warning
+inline const Name kFsckProgress{"PROGRESS"};  ///< the first parameter is the percentage done
+
+// The keys of a result dictionary, which a finished job hands over beside its error code.
+
+/// One of the verdicts below.
+inline const Name kPLVerdict{"kPLVerdict"};
+/// One sentence that names the attempt, the disk and the outcome.
+inline const Name kPLMessage{"kPLMessage"};
+
+inline const Name kPLVerdictSound{"sound"};
+inline const Name kPLVerdictDamaged{"damaged"};            ///< damage is left
+inline const Name kPLVerdictRepaired{"repaired"};          ///< damage was found, none is left
+inline const Name kPLVerdictInconclusive{"inconclusive"};  ///< it could not be known
+inline const Name kPLVerdictFailed{"failed"};              ///< the check did not run to an answer
+inline const Name kPLVerdictStopped{"stopped"};            ///< by the user
+
+}  // namespace contract
