@@ -116,7 +116,7 @@ void compareWithGrep()
 /// A history as a long check leaves it: one row in eight is shown without details.
 contract::Array makeHistory(std::size_t records)
 {
-    using namespace contract;
+    using namespace fixwell;
     const Array history = Array::make();
     for (std::size_t i = 0; i < records; ++i)
         history.append(Dictionary::of(

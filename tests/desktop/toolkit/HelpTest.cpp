@@ -119,9 +119,9 @@ TEST(HelpBook, ExplainsEveryReasonInTheWordsOfTheButtons)
         setLanguage(language);
         const std::string page = oneLine(HelpBook::plainText(
             QStringLiteral(HELP_BOOKS "/help/") + language + QStringLiteral("/unavailable.html")));
-        for (int reason = contract::FXWReasonIgnoresOwnership;
-             reason <= contract::FXWReasonNotWritable; ++reason) {
-            const std::string said = module.localizedString(contract::reasonText(reason, false));
+        for (int reason = fixwell::FXWReasonIgnoresOwnership;
+             reason <= fixwell::FXWReasonNotWritable; ++reason) {
+            const std::string said = module.localizedString(fixwell::reasonText(reason, false));
             EXPECT_NE(page.find(said), std::string::npos) << language << ": " << said;
         }
         for (const char* const button : {"Verify Disk", "Repair Disk", "Stop Verify"})

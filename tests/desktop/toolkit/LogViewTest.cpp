@@ -153,7 +153,7 @@ TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
 {
     for (int i = 0; i < 1'000'000; ++i)
         disk->history.append(contract::Dictionary::of(
-            {{contract::kOV_finalAttributedString_type, contract::StyledText::make("line\n")}}));
+            {{fixwell::kOV_finalAttributedString_type, contract::StyledText::make("line\n")}}));
     reload();
     view->selectAll(nullptr);
     EXPECT_EQ(view->numberOfSelectedRows(), 1'000'000U);

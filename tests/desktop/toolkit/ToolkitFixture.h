@@ -88,7 +88,7 @@ class ToolkitTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        module = std::make_unique<contract::OVFXW>(host, host.fake);
+        module = std::make_unique<fixwell::OVFXW>(host, host.fake);
         ASSERT_TRUE(module->init());
         module->registerForNotifications();
         interface = host.qtInterface.latest();
@@ -118,7 +118,7 @@ protected:
             complete.font = contract::Font{verbosity < 0, 11};
         disk->history.append(contract::Dictionary::of(
             {{contract::kFsckVerbosity, verbosity},
-             {contract::kOV_finalAttributedString_type,
+             {fixwell::kOV_finalAttributedString_type,
               contract::StyledText::make(std::string(text) + "\n", complete)}}));
     }
 
@@ -135,7 +135,7 @@ protected:
     ScreenHost host;
     std::shared_ptr<fixwell::testing::FakeDisk> disk =
         std::make_shared<fixwell::testing::FakeDisk>("loop0");
-    std::unique_ptr<contract::OVFXW> module;
+    std::unique_ptr<fixwell::OVFXW> module;
     LoadedInterface* interface = nullptr;
     contract::OutlineView* view = nullptr;
 };
