@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/foundation/UserDefaults.h"
 #include "contract/support/OVPreferences.h"
 
 #include <filesystem>

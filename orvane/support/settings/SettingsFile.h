@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/foundation/UserDefaults.h"
+#include "contract/support/OVPreferences.h"
 #include "orvane/support/Failure.h"
 
 #include <filesystem>

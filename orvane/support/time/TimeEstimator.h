@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/support/OVTimeEstimator.h"
+#include "contract/support/OVWindowController.h"
 #include "orvane/support/texts/Translator.h"
 
 #include <functional>

@@ -1,10 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/messagelog/ParameterSubstitution.h"
+#include "fixwell/messagelog/MessageRecord.h"
 
 #include "contract/foundation/Dictionary.h"
 #include "contract/foundation/Format.h"
 
 namespace fixwell {
+
+TextStyle messageStyle(const Dictionary& record, const Color& errorColor, const Color& passColor)
+{
+    TextStyle style;
+    style.font = verbosityOf(record) < verbosity::main ? Font::boldSystem(messageFontPoints)
+                                                       : Font::system(messageFontPoints);
+    const std::string_view type = record.string(kFsckMessageType);
+    if (type == kFsckError.text() || type == kFsckFail.text())
+        style.color = errorColor;
+    else if (type == kFsckSuccess.text())
+        style.color = passColor;
+    return style;
+}
+
 namespace {
 
 void replaceAll(std::string& text, std::string_view placeholder, std::string_view replacement)

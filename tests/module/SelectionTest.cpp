@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "contract/toolkit/ControlNames.h"
 #include "tests/module/ModuleTest.h"
 
 namespace fixwell {
@@ -21,30 +22,13 @@ TEST_F(OVFXWTest, SwitchDecidesWhetherTheModuleRuns)
     }
 }
 
-TEST_F(OVFXWTest, TellsTheHostWhoItIs)
-{
-    host.translations["/Fixwell"] = "Fixgut";
-    EXPECT_EQ(module->displayName(), "Fixgut");
-    EXPECT_EQ(module->tabOrder().integer(), 20);
-    EXPECT_EQ(module->dataType(), "FXW");
-    EXPECT_TRUE(host.has("load interface FXW"));
-}
-
 TEST_F(OVFXWTest, StartsFromThePreferencesWithAllActionsOff)
 {
     host.showsDetails = true;
     makeModule();
-    EXPECT_EQ(button("showDetailsButton").value, 1);
-    for (const char* name : {"verifyDiskButton", "repairDiskButton", "verifyPermissionsButton",
-                             "repairPermissionsButton"})
+    EXPECT_EQ(button(outlet::showDetails).value, 1);
+    for (const std::string_view name : outlet::actions)
         EXPECT_FALSE(button(name).enabled) << name;
-    EXPECT_EQ(host.outlinePeer.indentation, 35.0);
-    EXPECT_TRUE(module->outlineViewShouldExpandItem({}));
-
-    const auto runs = host.instructionalTextField.text.runs();
-    ASSERT_EQ(runs.size(), 2U) << "two paragraphs in two looks";
-    EXPECT_EQ(host.instructionalTextField.text.characters().find("\n\nIf you have"),
-              runs[0].length);
 }
 
 TEST_F(OVFXWTest, WorksWithoutItsInterfaceFile)
@@ -57,23 +41,6 @@ TEST_F(OVFXWTest, WorksWithoutItsInterfaceFile)
     finish(disk);
     EXPECT_TRUE(host.has("verify a"));
     EXPECT_TRUE(host.has("report"));
-}
-
-TEST_F(OVFXWTest, HoldsTheDividerAndOpensItsHelp)
-{
-    for (const double proposed : {0.0, 100.0, 1000.0}) {
-        EXPECT_EQ(module->splitViewConstrainMinCoordinateOfSubviewAt(proposed, 0), 80.0);
-        EXPECT_EQ(module->splitViewConstrainMaxCoordinateOfSubviewAt(proposed, 0), 210.0);
-    }
-    EXPECT_TRUE(module->perform("helpButtonAction:", nullptr));
-    EXPECT_TRUE(host.has("help ovhelp11868"));
-    EXPECT_FALSE(module->perform("eraseDisk:", nullptr)) << "no such action";
-}
-
-TEST_F(OVFXWTest, KeepsOneRepairTool)
-{
-    EXPECT_EQ(&module->repairDiskTool(), &module->repairDiskTool());
-    EXPECT_EQ(host.count("make repair tool"), 1);
 }
 
 TEST_F(OVFXWTest, LeavesNothingOfItselfBehind)
