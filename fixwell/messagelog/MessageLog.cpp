@@ -92,6 +92,20 @@ void OVFXW::appendMessage(std::string_view text, std::optional<Name> type, std::
     addObjectAndUpdateView(disk->fsckHistoryNoChildren(), record, level < verbosity::detail);
 }
 
+void OVFXW::createStartupObject(std::string_view text, const OVDiskPointer& disk)
+{
+    if (!disk)
+        return;
+    const StyledText line = StyledText::make(text, {Font::boldSystem(messageFontPoints), {}, {}});
+    line.append(StyledText::make("\n"));
+    const Dictionary record = Dictionary::of({{kFsckMessageString, text},
+                                              {kOV_finalAttributedString_type, line},
+                                              {kFsckVerbosity, verbosity::heading}});
+    if (!disk->fsckHistoryNoChildren())
+        disk->setFsckHistory(Array::make());
+    addObjectAndUpdateView(disk->fsckHistoryNoChildren(), record, true);
+}
+
 StyledText OVFXW::attributedStringForContext(const Dictionary& record,
                                              std::optional<std::string_view> string)
 {
