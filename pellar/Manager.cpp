@@ -22,7 +22,15 @@ std::unique_ptr<contract::PLRepairDisk> Manager::makeRepairDisk()
 {
     if (delegate_ == nullptr)
         return nullptr;
-    return std::make_unique<RepairDisk>(loop_, texts_, options_, *delegate_);
+    auto tool = std::make_unique<RepairDisk>(loop_, texts_, options_, *delegate_);
+    latest_ = tool->liveness();
+    return tool;
+}
+
+void Manager::cancelAgain()
+{
+    if (const auto tool = latest_.lock())
+        (*tool)->cancelCurrentOperation();
 }
 
 bool Manager::canVerify(std::string_view filesystemType) const

@@ -13,6 +13,8 @@
 
 namespace pellar {
 
+class RepairDisk;
+
 /// The library as one module sees it. Main thread; outlives the tools made with it, as the run
 /// loop and the texts outlive the manager.
 class Manager final : public contract::PLManager {
@@ -22,6 +24,10 @@ public:
     void setDelegate(contract::PLAsyncDelegate* delegate) override { delegate_ = delegate; }
     /// Null when there is no delegate yet.
     std::unique_ptr<contract::PLRepairDisk> makeRepairDisk() override;
+
+    /// Presses the running job of the tool that was made last harder to end; nothing happens when
+    /// none runs.
+    void cancelAgain();
 
     /// There is an installed tool that can verify (repair) this kind of file system, by
     /// libblkid's name of it. Looks in a few directories.
@@ -44,6 +50,7 @@ private:
     const Texts& texts_;
     const ManagerOptions options_;
     contract::PLAsyncDelegate* delegate_ = nullptr;  // not owned
+    std::weak_ptr<RepairDisk*> latest_;
 };
 
 }  // namespace pellar

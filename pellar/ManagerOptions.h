@@ -13,6 +13,8 @@
 
 namespace pellar {
 
+class JobObserver;
+
 /// Whether the archives of packages of the running system are fetched over the network, where
 /// nothing else says what permissions their files have.
 struct ArchiveFetching {
@@ -47,6 +49,7 @@ struct ManagerOptions {
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;
     PrivilegedScripts privileged;
+    JobObserver* observer = nullptr;  ///< outlives the manager; none when null
 };
 
 }  // namespace pellar

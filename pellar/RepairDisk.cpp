@@ -2,6 +2,7 @@
 #include "pellar/RepairDisk.h"
 
 #include "contract/foundation/UTF8.h"
+#include "pellar/jobs/JobObserver.h"
 #include "pellar/jobs/JobScript.h"
 #include "pellar/jobs/LiveScript.h"
 #include "pellar/jobs/MapScript.h"
@@ -62,32 +63,32 @@ RepairDisk::RepairDisk(contract::RunLoop& loop, const Texts& texts, const Manage
 
 ErrorCode RepairDisk::beginStoragesystemFilesystemVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Operation::Verify);
+    return begin(disk, Subject::Filesystem, Operation::Verify);
 }
 
 ErrorCode RepairDisk::beginStoragesystemFilesystemRepairForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Operation::Repair);
+    return begin(disk, Subject::Filesystem, Operation::Repair);
 }
 
 ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return beginPermissions(disk, Operation::Verify);
+    return begin(disk, Subject::Permissions, Operation::Verify);
 }
 
 ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer& disk)
 {
-    return beginPermissions(disk, Operation::Repair);
+    return begin(disk, Subject::Permissions, Operation::Repair);
 }
 
 ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return beginPartitionMap(disk, Operation::Verify);
+    return begin(disk, Subject::PartitionMap, Operation::Verify);
 }
 
 ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer& disk)
 {
-    return beginPartitionMap(disk, Operation::Repair);
+    return begin(disk, Subject::PartitionMap, Operation::Repair);
 }
 
 bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
@@ -115,11 +116,26 @@ bool RepairDisk::canVerifyStoragesystemFilesystemForDisk(const DiskReferencePoin
 
 void RepairDisk::cancelCurrentOperation()
 {
+    if (options_.observer != nullptr)
+        options_.observer->stopWasAsked();
     if (job_)
         job_->stop();
 }
 
-ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Operation operation)
+ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Subject subject, Operation operation)
+{
+    JobObserver* const observer = options_.observer;
+    if (observer != nullptr)
+        observer->jobWillBegin(disk, subject, operation);
+    const ErrorCode error = subject == Subject::Filesystem    ? beginFilesystem(disk, operation)
+                            : subject == Subject::Permissions ? beginPermissions(disk, operation)
+                                                              : beginPartitionMap(disk, operation);
+    if (observer != nullptr && error != contract::kPLNoError)
+        observer->jobDidNotBegin(disk, error);
+    return error;
+}
+
+ErrorCode RepairDisk::beginFilesystem(const DiskReferencePointer& disk, Operation operation)
 {
     if (const ErrorCode error = refusal(disk, operation))
         return error;
@@ -262,9 +278,8 @@ ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operat
 
 void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)
 {
-    EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] {
-                               job_.reset();
-                           }};
+    EventReceiver receiver{&delegate_, disk, options_.commandTrace, [this] { job_.reset(); },
+                           options_.observer};
     job_ = std::make_unique<Job>(makeScript, std::move(receiver), loop_);
 }
 

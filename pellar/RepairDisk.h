@@ -42,8 +42,14 @@ public:
 
     void cancelCurrentOperation() override;
 
+    /// Points here as long as the tool is there.
+    std::weak_ptr<RepairDisk*> liveness() const { return self_; }
+
 private:
-    contract::ErrorCode begin(const contract::DiskReferencePointer& disk, Operation operation);
+    contract::ErrorCode begin(const contract::DiskReferencePointer& disk, Subject subject,
+                              Operation operation);
+    contract::ErrorCode beginFilesystem(const contract::DiskReferencePointer& disk,
+                                        Operation operation);
     contract::ErrorCode beginMounted(const contract::DiskReferencePointer& disk, Operation operation,
                                     contract::ErrorCode error);
     contract::ErrorCode beginPartitionMap(const contract::DiskReferencePointer& disk,
@@ -65,6 +71,7 @@ private:
     const ManagerOptions& options_;
     contract::PLAsyncDelegate& delegate_;
     std::unique_ptr<Job> job_;
+    const std::shared_ptr<RepairDisk*> self_ = std::make_shared<RepairDisk*>(this);
 };
 
 }  // namespace pellar

@@ -87,7 +87,7 @@ SupportOptions DesktopSession::supportOptions()
                                       library_.canVerifyLive(type)};
     };
     options.errorText = [this](contract::ErrorCode code) {
-        return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
+        return jobs_.withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.historyCompleted = [this] {
         reloadLog();
@@ -159,8 +159,10 @@ void DesktopSession::connectWindow()
 void DesktopSession::loadModules()
 {
     std::string switchedOff;
+    pellar::ManagerOptions options = libraryOptions();
+    options.observer = &jobs_;
     for (const std::filesystem::path& bundle : findModuleBundles(options_.moduleDirectories)) {
-        auto tab = ModuleTab::load(bundle, {host_, controller_, jobs_, libraryOptions()});
+        auto tab = ModuleTab::load(bundle, {host_, controller_, options});
         if (failed(tab))
             warn(failureMessage(tab));
         else if (std::get<std::unique_ptr<ModuleTab>>(tab))

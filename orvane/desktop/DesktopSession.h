@@ -4,7 +4,6 @@
 #include "orvane/desktop/DesktopHost.h"
 #include "orvane/desktop/DiskScan.h"
 #include "orvane/desktop/ImageOpener.h"
-#include "orvane/desktop/JobLedger.h"
 #include "orvane/desktop/ModuleTab.h"
 #include "orvane/desktop/session/DesktopNotifier.h"
 #include "orvane/desktop/session/SleepInhibitor.h"
@@ -12,6 +11,7 @@
 #include "orvane/desktop/window/MainWindow.h"
 #include "orvane/desktop/window/Menus.h"
 #include "orvane/desktop/window/WindowController.h"
+#include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskWatch.h"
 #include "orvane/support/modules/ModuleSearch.h"
 

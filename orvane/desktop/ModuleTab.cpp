@@ -25,8 +25,7 @@ ModuleTab::ModuleTab(const Surroundings& surroundings, LoadedModule loaded)
       window_(surroundings.window),
       loaded_(std::move(loaded)),
       libraryTexts_(host_.hostBundle().catalogue()),
-      library_(host_.mainRunLoop(), libraryTexts_, surroundings.libraryOptions),
-      observedLibrary_(library_, surroundings.jobs)
+      library_(host_.mainRunLoop(), libraryTexts_, surroundings.libraryOptions)
 {
     libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
 }
@@ -47,7 +46,7 @@ Outcome<> ModuleTab::makeModule()
     module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
     if (LoadedInterface* const latest = host_.interfaceLoader().latest(); latest != before)
         interface_ = latest;
-    observedLibrary_.setDelegate(module_->asyncDelegate());
+    library_.setDelegate(module_->asyncDelegate());
     return Done{};
 }
 

@@ -4,7 +4,6 @@
 #include "orvane/desktop/DesktopHost.h"
 #include "orvane/desktop/window/WindowController.h"
 #include "orvane/jobs/LibraryTexts.h"
-#include "orvane/jobs/ObservedManager.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "pellar/Manager.h"
 
@@ -20,7 +19,6 @@ public:
     struct Surroundings {
         DesktopHost& host;
         WindowController& window;
-        JobObserver& jobs;
         pellar::ManagerOptions libraryOptions;
     };
 
@@ -48,7 +46,7 @@ public:
     /// Presses the module's Stop button; NO when there is nothing that can be stopped now.
     bool stopJob();
     /// Presses the job that is being stopped harder.
-    void stopHarder() { observedLibrary_.cancelAgain(); }
+    void stopHarder() { library_.cancelAgain(); }
 
 private:
     Outcome<> makeModule();
@@ -58,14 +56,13 @@ private:
     contract::OVDiskPointer workingDisk() const override;
     contract::Window& window() override { return window_; }
     contract::Bundle& bundle() override { return *loaded_.bundle; }
-    contract::PLManager& pl() override { return observedLibrary_; }
+    contract::PLManager& pl() override { return library_; }
 
     DesktopHost& host_;
     WindowController& window_;
     LoadedModule loaded_;
     LibraryTexts libraryTexts_;
     pellar::Manager library_;
-    ObservedManager observedLibrary_;
     std::unique_ptr<contract::OVModule> module_;
     LoadedInterface* interface_ = nullptr;  ///< of the host's loader
     bool isActive_ = false;

@@ -57,7 +57,7 @@ void DesktopSession::stopAndClose()
     loop_.post([this] {
         if (!controller_.interfaceLock())
             window_.close();
-        else if (jobs_.isJobRunning())
+        else if (jobs_.currentRun() != nullptr)
             stopJob();
     });
 }

@@ -4,8 +4,7 @@
 
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/jobs/HostReasons.h"
-#include "orvane/jobs/LastRuns.h"
+#include "orvane/jobs/UnavailableReason.h"
 
 #include <array>
 
@@ -69,7 +68,7 @@ std::string DesktopSession::activityOn(const Disk& disk)
     const StartedRun* const run = jobs_.currentRun();
     if (run == nullptr || run->identifier != disk.facts().identifier)
         return {};
-    return text(writes(run->operation) ? "repairing…" : "verifying…");
+    return text(run->isRepair() ? "repairing…" : "verifying…");
 }
 
 // The reasons are posted, because the module says what it has to say in the meantime; and once for
@@ -126,7 +125,7 @@ std::string DesktopSession::reasonFor(const Disk& disk, std::string_view button)
     QtButton* const control = moduleButton(std::string(button).c_str());
     if (control == nullptr || !reasonOfModule(*control).empty())
         return {};
-    std::string reason = orvane::reasonOfHost(disk, library_, host_.translator());
+    std::string reason = whyUnavailable(disk, library_, host_.translator());
     if (reason.empty() && disk.facts().type == diskType::whole && isForPermissions(button))
         reason = text("Not available because a whole disk has no permissions; its volumes have.");
     else if (reason.empty() && disk.facts().type == diskType::whole)
@@ -175,7 +174,7 @@ std::string DesktopSession::emptyText()
         return {};
     if (disks.size() == 1)
         if (const std::string why =
-                orvane::reasonOfHost(*disks.front(), library_, host_.translator());
+                whyUnavailable(*disks.front(), library_, host_.translator());
             !why.empty())
             return why;
     const QtButton* const verify = moduleButton("verifyDiskButton");

@@ -4,7 +4,7 @@
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/DesktopEntry.h"
 #include "orvane/desktop/DesktopSession.h"
-#include "orvane/jobs/UnreachedImage.h"
+#include "orvane/jobs/UnavailableReason.h"
 
 #include <QApplication>
 
@@ -14,7 +14,7 @@ namespace orvane::desktop {
 
 JobLedger::Events DesktopSession::ledgerEvents()
 {
-    return {[this](const StartedRun& run) { runBegan(run); },
+    return {[this](const StartedRun& run, const contract::DiskReferencePointer&) { runBegan(run); },
             [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
             [this] {
                 stopAsked();
@@ -33,7 +33,7 @@ DesktopNotifier::Options DesktopSession::notifierOptions()
 // The repair does not wait for the lock, which only makes it less likely to be cut off.
 void DesktopSession::runBegan(const StartedRun& run)
 {
-    if (writes(run.operation))
+    if (run.isRepair())
         wakefulness_.hold(
             host_.translator().sentence("Repairing “%@”", {contract::printable(run.disk)}));
     else
@@ -51,7 +51,7 @@ void DesktopSession::runBegan(const StartedRun& run)
 void DesktopSession::stopAsked()
 {
     job_.isStopAsked = true;
-    if (!jobs_.isJobRunning())
+    if (jobs_.currentRun() == nullptr)
         host_.imageAttachment().stopAttachments();
 }
 
@@ -116,7 +116,7 @@ std::vector<std::string> DesktopSession::keepUnreachedImages()
             continue;
         sentences.push_back(whyUnreached(host_, *disk, disk->displayName()));
         const bool isRepair = job_.action.starts_with("repair");
-        keepUnreached(host_, *disk, isRepair ? Operation::RepairDisk : Operation::VerifyDisk,
+        keepUnreached(host_, *disk, isRepair ? pellar::Operation::Repair : pellar::Operation::Verify,
                       sentences.back());
     }
     return sentences;

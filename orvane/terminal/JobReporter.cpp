@@ -3,34 +3,19 @@
 
 namespace orvane {
 
-void JobReporter::jobWillBegin(const contract::DiskReferencePointer& disk, Operation operation)
+void JobReporter::began(const StartedRun& run, const contract::DiskReferencePointer& disk)
 {
     flush();
-    current_ = names_.nameOf(disk->identifier);
-    runs_.begin(disk, operation);
-    isInFlight_ = true;
-    reporter_.started(current_, nameOf(operation), window_.status());
+    current_ = names_.nameOf(run.identifier);
+    reporter_.started(current_, actionName(run.subject, run.operation), window_.status());
     hooks_.follow(disk);
 }
 
-// The module's row with the reason is still to come, so the end is not said here.
-void JobReporter::jobDidNotBegin(const contract::DiskReferencePointer& disk,
-                                 contract::ErrorCode error)
+// The module's last rows are still to come, so the end is not said here.
+void JobReporter::ended(const StartedRun& run, const RunEnd& end)
 {
-    settle(disk->identifier, runs_.refuse(error));
-}
-
-void JobReporter::jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
-                                const contract::Dictionary& result)
-{
-    settle(disk->identifier, runs_.finish(error, result));
-}
-
-void JobReporter::settle(const std::string& identifier, RunEnd outcome)
-{
-    isInFlight_ = false;
-    unsaid_ = outcome;
-    outcomes_[identifier] = std::move(outcome);
+    unsaid_ = end;
+    outcomes_[run.identifier] = end;
 }
 
 void JobReporter::flush()

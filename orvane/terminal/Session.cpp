@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
-#include "orvane/jobs/HostReasons.h"
+#include "orvane/jobs/UnavailableReason.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -42,12 +42,16 @@ Session::Session(const Request& request, Reporter& reporter)
       libraryTexts_(hostTexts_),
       library_(loop_, libraryTexts_, libraryOptions(request)),
       host_(supportOptions(request), loop_, interface_, alerts_, reporter, request.showsDetails),
-      jobs_(reporter, window_, names_, host_, jobHooks()),
-      observedLibrary_(library_, jobs_)
+      jobs_(reporter, window_, names_, jobHooks()),
+      ledger_(host_, {[this](const StartedRun& run, const contract::DiskReferencePointer& disk) {
+                          jobs_.began(run, disk);
+                      },
+                      [this](const StartedRun& run, const RunEnd& end) { jobs_.ended(run, end); },
+                      {}})
 {
     window_.setEvents({
         [this] {
-            if (jobs_.isInFlight())
+            if (ledger_.currentRun() != nullptr)
                 reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status());
         },
         [this](const contract::Dictionary& report) {
@@ -76,7 +80,7 @@ SupportOptions Session::supportOptions(const Request& request)
                                       library_.canVerifyLive(type)};
     };
     options.errorText = [this](contract::ErrorCode code) {
-        return jobs_.runs().withDevice(code, pellar::errorText(code, libraryTexts_));
+        return ledger_.withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.warn = [this](const std::string& sentence) {
         reporter_.warning(sentence);
@@ -92,6 +96,7 @@ pellar::ManagerOptions Session::libraryOptions(const Request& request)
     options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },
                                libraryTexts_.text("With --fetch-archives the archives of these "
                                                   "packages are fetched over the network.")};
+    options.observer = &ledger_;
     if (tracesCommands_)
         options.commandTrace = [this](std::string_view line) {
             trace(line);
@@ -161,7 +166,7 @@ Outcome<> Session::loadModule()
     if (failed(made))
         return Failure{failureMessage(made)};
     module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
-    observedLibrary_.setDelegate(module_->asyncDelegate());
+    library_.setDelegate(module_->asyncDelegate());
     return Done{};
 }
 
@@ -201,7 +206,7 @@ void Session::detach(const DiskPointer& topLevelDisk)
 
 std::string Session::reasonOfHost(const Disk& disk)
 {
-    return orvane::reasonOfHost(disk, library_, host_.translator());
+    return whyUnavailable(disk, library_, host_.translator());
 }
 
 std::string Session::reasonAgainstPartitionMap(const DiskPointer& disk) const
@@ -261,7 +266,7 @@ void Session::interrupt()
     const bool isFirst = !isStopping_;
     isStopping_ = true;
     if (!isFirst)
-        observedLibrary_.cancelAgain();
+        library_.cancelAgain();
     else if (!pressStop())
         host_.imageAttachment().stopAttachments();
 }

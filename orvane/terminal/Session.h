@@ -2,7 +2,6 @@
 #pragma once
 
 #include "orvane/jobs/LibraryTexts.h"
-#include "orvane/jobs/ObservedManager.h"
 #include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "orvane/terminal/CommandLine.h"
@@ -70,7 +69,7 @@ private:
     contract::OVDiskPointer workingDisk() const override { return nullptr; }
     contract::Window& window() override { return window_; }
     contract::Bundle& bundle() override { return *loaded_.bundle; }
-    contract::PLManager& pl() override { return observedLibrary_; }
+    contract::PLManager& pl() override { return library_; }
 
     SupportOptions supportOptions(const Request& request);
     pellar::ManagerOptions libraryOptions(const Request& request);
@@ -95,7 +94,7 @@ private:
     pellar::Manager library_;
     TerminalHost host_;
     JobReporter jobs_;
-    ObservedManager observedLibrary_;
+    JobLedger ledger_;
     LoadedModule loaded_;
     std::unique_ptr<contract::OVModule> module_;
     bool isStopping_ = false;

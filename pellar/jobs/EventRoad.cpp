@@ -2,6 +2,7 @@
 #include "pellar/jobs/EventRoad.h"
 
 #include "contract/pellar/MessageKeys.h"
+#include "pellar/jobs/JobObserver.h"
 
 #include <condition_variable>
 #include <mutex>
@@ -120,6 +121,8 @@ void EventRoad::deliver(Shared& shared, std::vector<Event>& events)
                 to.trace(trace->line);
         } else if (const auto* const finished = std::get_if<Finished>(&event)) {
             to.ended();
+            if (to.observer != nullptr)
+                to.observer->jobWillFinish(to.disk, finished->mainError, finished->result);
             to.delegate->plAsyncFinishedForDisk(to.disk, finished->mainError, finished->detailError,
                                                 finished->result);
             return;

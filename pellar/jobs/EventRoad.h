@@ -14,6 +14,8 @@
 
 namespace pellar {
 
+class JobObserver;
+
 /// Where a job's events arrive, on the main thread.
 struct EventReceiver {
     contract::PLAsyncDelegate* delegate = nullptr;  ///< not owned
@@ -22,6 +24,7 @@ struct EventReceiver {
     /// The job is over; called just before the delegate hears so, so that the delegate may begin
     /// the next one. It may destroy the road.
     std::function<void()> ended;
+    JobObserver* observer = nullptr;  ///< hears of the end just before the delegate; or null
 };
 
 /// The road from a job's thread to the main thread. Events travel in batches, and only a few

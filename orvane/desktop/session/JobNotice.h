@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/desktop/session/FinishedRun.h"
+#include "orvane/jobs/JobLedger.h"
 #include "orvane/support/texts/Translator.h"
 
 #include <chrono>
@@ -10,6 +10,11 @@
 #include <vector>
 
 namespace orvane::desktop {
+
+struct FinishedRun {
+    StartedRun run;
+    RunEnd end;
+};
 
 /// What the desktop is asked to show.
 struct Notice {

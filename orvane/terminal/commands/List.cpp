@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/UTF8.h"
-#include "orvane/jobs/LastRuns.h"
+#include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskTypes.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/pellar/ErrorCodes.h"
-#include "orvane/jobs/UnreachedImage.h"
+#include "orvane/jobs/JobLedger.h"
+#include "orvane/jobs/UnavailableReason.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
@@ -58,9 +59,10 @@ int settle(const NamedDisk& named, const ActionButton& action, Session& session,
         why = session.host().translator().sentence(
             "“%@” was not checked: the question was not answered with yes", {named.name});
     else if (named.disk->isOfflineDiskImage())
-        keepUnreached(
-            session.host(), *named.disk,
-            action.command == Command::Repair ? Operation::RepairDisk : Operation::VerifyDisk, why);
+        keepUnreached(session.host(), *named.disk,
+                      action.command == Command::Repair ? pellar::Operation::Repair
+                                                        : pellar::Operation::Verify,
+                      why);
     reporter.failure(named.name, why);
     return exitUnchecked;
 }

@@ -14,9 +14,9 @@ namespace {
 using namespace std::chrono_literals;
 
 FinishedRun finished(const std::string& disk, const std::string& verdict,
-                     const std::string& message = "", Operation operation = Operation::VerifyDisk)
+                     const std::string& message = "", pellar::Operation operation = pellar::Operation::Verify)
 {
-    return {{operation, disk}, {verdict, 0, message}};
+    return {{pellar::Subject::Filesystem, operation, disk}, {verdict, 0, message}};
 }
 
 TEST(JobNotice, OnlyALongJobThatNobodyWatchedIsNews)
@@ -42,7 +42,7 @@ TEST(JobNotice, SaysWhatWasDoneOnWhatAndHowItWent)
                "Verification of “data”",
                "The volume “data” appears to be OK.",
                "one disk"},
-          Case{{finished("data", "repaired", "", Operation::RepairDisk)},
+          Case{{finished("data", "repaired", "", pellar::Operation::Repair)},
                "Repair of “data”",
                "data: repaired",
                "a tool that says nothing more"},

@@ -1,0 +1,157 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/jobs/JobLedger.h"
+
+#include "contract/foundation/StyledText.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
+#include "pellar/volumes/DiskUse.h"
+
+#include <sys/stat.h>
+
+#include <algorithm>
+#include <chrono>
+#include <utility>
+
+namespace orvane {
+namespace {
+
+std::chrono::system_clock::time_point now()
+{
+    return std::chrono::system_clock::now();
+}
+
+std::string failedVerdict()
+{
+    return std::string(contract::kPLVerdictFailed.text());
+}
+
+bool hasAnswer(const Run& run)
+{
+    if (!run.end)
+        return false;
+    const std::string& verdict = run.end->verdict;
+    return verdict == contract::kPLVerdictSound.text() ||
+           verdict == contract::kPLVerdictDamaged.text() ||
+           verdict == contract::kPLVerdictRepaired.text();
+}
+
+// As the modules make the heading of an error (fixwell/messagelog).
+contract::Dictionary headingOfError(const std::string& sentence)
+{
+    constexpr int heading = -1;
+    constexpr double points = 11;
+    const contract::Color red{1, 0, 0, 1};
+    return contract::Dictionary::of(
+        {{contract::kFsckMessageType, contract::kFsckFail},
+         {contract::kFsckMessageString, std::string_view(sentence)},
+         {contract::kFsckVerbosity, heading},
+         {contract::Name("kOV_finalAttributedString_type"),
+          contract::StyledText::make(sentence + "\n",
+                                    {contract::Font::boldSystem(points), red, {}})}});
+}
+
+}  // namespace
+
+std::string_view actionName(pellar::Subject subject, pellar::Operation operation)
+{
+    const bool isRepair = operation == pellar::Operation::Repair;
+    switch (subject) {
+        case pellar::Subject::Filesystem: return isRepair ? "repair" : "verify";
+        case pellar::Subject::Permissions:
+            return isRepair ? "repair-permissions" : "verify-permissions";
+        case pellar::Subject::PartitionMap:
+            return isRepair ? "repair-partition-map" : "verify-partition-map";
+    }
+    return {};
+}
+
+void JobLedger::jobWillBegin(const contract::DiskReferencePointer& reference,
+                             pellar::Subject subject, pellar::Operation operation)
+{
+    // What was said until now has its time before this run's.
+    host_.histories().saveNew();
+    const bool isOfImage =
+        reference && reference->storage == contract::DiskReference::Storage::FileRegion;
+    image_ = isOfImage ? reference->path : std::filesystem::path();
+    const auto disk =
+        std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
+    number_ = disk ? host_.historyStore().beginRun(host_.histories().keyOf(disk->facts()),
+                                                   actionName(subject, operation), now())
+                   : 0;
+    run_ = {subject, operation, reference ? reference->name : std::string(),
+            reference ? reference->identifier : std::string()};
+    isRunning_ = true;
+    events_.began(run_, reference);
+}
+
+void JobLedger::jobDidNotBegin(const contract::DiskReferencePointer& /*disk*/,
+                               contract::ErrorCode error)
+{
+    end({failedVerdict(), error, host_.OVLocalizedErrorString(error)});
+}
+
+// Where the result names no verdict, the error decides.
+void JobLedger::jobWillFinish(const contract::DiskReferencePointer& /*disk*/,
+                              contract::ErrorCode error, const contract::Dictionary& result)
+{
+    std::string verdict(result.string(contract::kPLVerdict));
+    if (verdict.empty())
+        verdict = error == 0 ? std::string(contract::kPLVerdictSound.text()) : failedVerdict();
+    end({verdict, error, std::string(result.string(contract::kPLMessage))});
+}
+
+void JobLedger::stopWasAsked()
+{
+    if (events_.stopAsked)
+        events_.stopAsked();
+}
+
+void JobLedger::end(const RunEnd& end)
+{
+    if (const std::int64_t number = std::exchange(number_, 0); number != 0)
+        host_.historyStore().endRun(number, end, now());
+    isRunning_ = false;
+    events_.ended(run_, end);
+}
+
+std::string JobLedger::withDevice(contract::ErrorCode error, std::string text) const
+{
+    const bool isInUse = error == contract::kPLErrorDiskInUse ||
+                         error == contract::kOVErrorDiskInUse ||
+                         error == contract::kOVErrorCannotRepairInUse;
+    struct stat status = {};
+    if (!isInUse || image_.empty() || ::stat(image_.c_str(), &status) != 0)
+        return text;
+    const std::string device =
+        pellar::loopDeviceOn(status.st_dev, status.st_ino, pellar::SystemPaths());
+    return device.empty()
+               ? text
+               : text + " " + host_.translator().sentence("The image is attached as %@.", {device});
+}
+
+std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key)
+{
+    auto last = store.lastRun(key);
+    if (!last || hasAnswer(*last))
+        return last ? std::optional(LastRuns{*std::move(last), std::nullopt}) : std::nullopt;
+    const auto runs = store.runs(key);
+    const auto told = std::find_if(runs.rbegin(), runs.rend(), hasAnswer);
+    if (told == runs.rend())
+        return LastRuns{*std::move(last), std::nullopt};
+    return LastRuns{*told, std::move(last)};
+}
+
+void keepUnreached(SupportHost& host, Disk& image, pellar::Operation operation,
+                   const std::string& sentence)
+{
+    HistoryStore& store = host.historyStore();
+    const auto time = now();
+    const std::int64_t run =
+        store.beginRun(host.histories().keyOf(image.facts()),
+                       actionName(pellar::Subject::Filesystem, operation), time);
+    store.endRun(run, {failedVerdict(), contract::kPLErrorCannotOpen, sentence}, time);
+    image.fsckHistoryNoChildren().append(headingOfError(sentence));
+    host.histories().saveNew();
+}
+
+}  // namespace orvane
