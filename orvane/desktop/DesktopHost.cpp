@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopHost.h"
 
-#include "orvane/desktop/toolkit/QtTexts.h"
+#include "orvane/desktop/toolkit/Text.h"
 
 namespace orvane::desktop {
 
@@ -24,6 +24,15 @@ void DesktopHost::setWindow(QWidget* window)
 {
     alerts_.setWindow(window);
     printing_.setWindow(window);
+}
+
+void DesktopHost::showSheet(const std::string& title, const std::vector<std::string>& sentences)
+{
+    std::string text;
+    for (const std::string& sentence : sentences)
+        text += (text.empty() ? "" : "\n") + sentence;
+    if (!text.empty())
+        alerts_.simpleModuleAlert(title, text, 0);
 }
 
 }  // namespace orvane::desktop

@@ -2,15 +2,19 @@
 #pragma once
 
 #include "orvane/desktop/QtLoop.h"
+#include "orvane/desktop/toolkit/Help.h"
 #include "orvane/desktop/toolkit/QtAlerts.h"
-#include "orvane/desktop/toolkit/QtEvents.h"
-#include "orvane/desktop/toolkit/QtHelp.h"
+#include "orvane/desktop/toolkit/QtControls.h"
 #include "orvane/desktop/toolkit/QtInterface.h"
 #include "orvane/desktop/toolkit/QtPasteboard.h"
 #include "orvane/desktop/toolkit/QtPrinting.h"
 #include "orvane/support/SupportHost.h"
 
 namespace orvane::desktop {
+
+/// The name of the program's desktop file (without its ending) and of its icon, by which the
+/// desktop knows the window (packaging/desktop).
+inline constexpr const char* desktopEntry = "org.orvane.Orvane";
 
 /// The host on a desktop: the shared services, and the toolkit on Qt. Main thread.
 class DesktopHost final : public SupportHost {
@@ -20,6 +24,9 @@ public:
 
     /// The window that sheets are shown on.
     void setWindow(QWidget* window);
+    /// Shows the sentences on one sheet, below a title that may be empty; nothing where there is
+    /// none.
+    void showSheet(const std::string& title, const std::vector<std::string>& sentences);
 
     QtAlerts& alerts() override { return alerts_; }
     contract::Events& events() override { return events_; }

@@ -1,38 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
-#include "orvane/desktop/toolkit/Text.h"
-#include "orvane/desktop/window/WindowState.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "pellar/texts/ErrorTexts.h"
 
-#include <QFile>
-#include <QLabel>
-
-#include <algorithm>
-#include <array>
 #include <cstdio>
+#include <utility>
 
 namespace orvane::desktop {
-namespace {
-
-constexpr std::array<contract::Name const*, 4> diskNotifications{
-    &contract::OVDiskAppearedNotification, &contract::OVDiskUnmountedNotification,
-    &contract::OVDiskChangedNotification, &contract::OVDiskEjectedNotification};
-
-// Of the report that a module gives when its job is over (fixwell/history/CompletionReport.h).
-const contract::Name reportResultKey{"kOVOP_ResultKey"};
-constexpr std::string_view reportOfFailure = "kOVOP_FailKey";
-
-}  // namespace
-
-std::string DesktopSession::joined(const std::vector<std::string>& sentences)
-{
-    std::string text;
-    for (const std::string& sentence : sentences)
-        text += (text.empty() ? "" : "\n") + sentence;
-    return text;
-}
 
 DesktopSession::DesktopSession(SessionOptions options)
     : options_(std::move(options)),
@@ -41,28 +16,26 @@ DesktopSession::DesktopSession(SessionOptions options)
       library_(loop_, libraryTexts_, libraryOptions()),
       host_(supportOptions(), loop_),
       window_(host_.translator()),
-      disks_(host_.sharedDiskController(), diskStates(), host_.translator()),
       controller_(window_),
-      jobs_(host_, ledgerEvents()),
-      images_(host_, {[this](const Disk& disk) { window_.disks().select(disk); },
-                      [this](const std::vector<std::string>& sentences) {
-                          host_.alerts().simpleModuleAlert(text("Not everything could be opened."),
-                                                           joined(sentences), 0);
-                      },
-                      [this] {
-                          window_.disks().synchronize();
-                          refreshHints();
-                      }}),
-      scan_(loop_, [this](const std::vector<DiskTree>& disks) { disksRead(disks); })
+      ledger_(host_, ledgerEvents()),
+      tabs_(host_, window_, controller_),
+      disks_(host_, loop_, window_.disks(), ledger_, options_.disksToOpen,
+             options_.scansSystemDisks,
+             {[this] { selectionChanged(); }, [this] { hints_.refresh(); }}),
+      hints_(host_, window_, controller_, tabs_, library_),
+      closer_(host_, window_, controller_, tabs_, ledger_, options_.closed),
+      jobs_({host_, window_, controller_, tabs_, disks_, ledger_, closer_}, options_.buses,
+            options_.longestGlanceAway, [this] { update(); }),
+      commands_({host_, window_, controller_, tabs_, disks_, library_}, [this] { update(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
-    // Before the modules do: the list must have changed when they ask it for the selection.
-    observeDisks();
+    // After the list of disks, which must have changed when the modules ask for the selection.
     loadModules();
+    connectHost();
     connectWindow();
-    restoreWindow(window_, host_.standardUserDefaults());
-    updateTabs();
+    window_.restoreLayout(host_.standardUserDefaults());
+    update();
 }
 
 DesktopSession::~DesktopSession()
@@ -72,8 +45,6 @@ DesktopSession::~DesktopSession()
     controller_.setEvents({});
     // The modules go before what they were given, their running job with them.
     tabs_.clear();
-    for (const contract::Name* const name : diskNotifications)
-        host_.defaultCenter().removeObserver(this, *name);
     host_.histories().saveNew();
 }
 
@@ -87,10 +58,10 @@ SupportOptions DesktopSession::supportOptions()
                                       library_.canVerifyLive(type)};
     };
     options.errorText = [this](contract::ErrorCode code) {
-        return jobs_.withDevice(code, pellar::errorText(code, libraryTexts_));
+        return ledger_.withDevice(code, pellar::errorText(code, libraryTexts_));
     };
     options.historyCompleted = [this] {
-        reloadLog();
+        tabs_.reloadLog();
     };
     options.warn = [this](const std::string& sentence) {
         warn(sentence);
@@ -102,142 +73,92 @@ pellar::ManagerOptions DesktopSession::libraryOptions()
 {
     pellar::ManagerOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
     options.outputLimits = options_.outputLimits;
-    options.archiveFetching = {[this] { return fetchesArchives(); },
+    options.archiveFetching = {[this] { return fetchesArchives(host_); },
                                libraryTexts_.text("The archives of these packages are downloaded "
                                                   "when “Download Package Archives” is switched "
                                                   "on in the Edit menu.")};
     return options;
 }
 
-void DesktopSession::observeDisks()
+JobLedger::Events DesktopSession::ledgerEvents()
 {
-    for (const contract::Name* const name : diskNotifications)
-        host_.defaultCenter().addObserver(this, *name, [this](const contract::Notification&) {
-            window_.disks().synchronize();
-            refreshHints();
-        });
-    host_.sharedDiskController().hooks().notifyFrontmost =
-        [this](contract::Name, const contract::Notification& notification) {
-            if (ModuleTab* const tab = activeTab())
-                tab->deliver(notification);
-            window_.disks().synchronize();
-            refreshHints();
-            // What the user clears later is another step.
-            loop_.post([this] { host_.histories().closeClearing(); });
-        };
-}
-
-void DesktopSession::connectWindow()
-{
-    window_.disks().show(disks_, [this] { selectionChanged(); });
-    addMenus(window_, menus(), host_.translator());
-    window_.setEvents({
-        [this] { return mayClose(); },
-        [this](const std::vector<std::filesystem::path>& files) {
-            images_.open({files.begin(), files.end()});
-        },
-        [this] { return !controller_.interfaceLock(); },
-        [this] { updateTabs(); },
-        [this] { windowAppeared(); },
-    });
-    host_.generalPasteboard().setHTMLSource([this] { return selectionHTML(); });
-    host_.printing().setTitle([this] {
-        std::string names;
-        for (const auto& disk : window_.disks().selectedDisks())
-            names += (names.empty() ? "" : ", ") + disk->displayName();
-        return names;
-    });
-    controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
-                           [this](const contract::Dictionary& report) {
-                               job_.hasFailed = report.string(reportResultKey) == reportOfFailure;
-                           }});
-    window_.disks().setContextMenuPolicy(Qt::CustomContextMenu);
-    QObject::connect(&window_.disks(), &QWidget::customContextMenuRequested, &window_,
-                     [this](const QPoint& place) { showDiskMenu(place); });
+    return {[this](const StartedRun& run, const contract::DiskReferencePointer& /*disk*/) {
+                jobs_.runBegan(run);
+            },
+            [this](const StartedRun& run, const RunEnd& end) { jobs_.runEnded(run, end); },
+            [this] {
+                jobs_.stopAsked();
+            }};
 }
 
 void DesktopSession::loadModules()
 {
-    std::string switchedOff;
     pellar::ManagerOptions options = libraryOptions();
-    options.observer = &jobs_;
-    for (const std::filesystem::path& bundle : findModuleBundles(options_.moduleDirectories)) {
-        auto tab = ModuleTab::load(bundle, {host_, controller_, options});
-        if (failed(tab))
-            warn(failureMessage(tab));
-        else if (std::get<std::unique_ptr<ModuleTab>>(tab))
-            addTab(std::get<std::unique_ptr<ModuleTab>>(std::move(tab)));
-        else
-            switchedOff += (switchedOff.empty() ? "" : ", ") + bundle.stem().string();
-    }
-    if (!tabs_.empty())
-        return;
-    const std::string why =
-        switchedOff.empty()
-            ? text("No module is installed that could work on disks.")
-            : host_.translator().sentence("%@ is switched off in the settings.", {switchedOff});
-    auto* const label = new QLabel(toQt(why));
-    label->setTextFormat(Qt::PlainText);
-    label->setAlignment(Qt::AlignCenter);
-    label->setWordWrap(true);
-    window_.tabs().addTab(label, toQtTitle(text("No Modules")));
+    options.observer = &ledger_;
+    tabs_.load(findModuleBundles(options_.moduleDirectories), options,
+               [this](const std::string& sentence) { warn(sentence); });
 }
 
-void DesktopSession::addTab(std::unique_ptr<ModuleTab> tab)
+void DesktopSession::connectHost()
 {
-    const auto order = [](const std::unique_ptr<ModuleTab>& other) {
-        return other->module().tabOrder().integer();
-    };
-    const auto place = std::find_if(tabs_.begin(), tabs_.end(),
-                                    [&](const auto& other) { return order(other) > order(tab); });
-    QWidget* const page =
-        tab->interface() != nullptr ? &tab->interface()->widget() : new QWidget(&window_);
-    window_.tabs().insertTab(static_cast<int>(place - tabs_.begin()), page,
-                             toQtTitle(tab->module().displayName()));
-    if (tab->interface() != nullptr)
-        tab->interface()->setBeforeAction(
-            [this](std::string_view action) { lastAction_ = action; });
-    tabs_.insert(place, std::move(tab));
+    host_.sharedDiskController().hooks().notifyFrontmost =
+        [this](contract::Name, const contract::Notification& notification) {
+            if (ModuleTab* const tab = tabs_.active())
+                tab->deliver(notification);
+            window_.disks().synchronize();
+            hints_.refresh();
+            // What the user clears later is another step.
+            loop_.post([this] { host_.histories().closeClearing(); });
+        };
+    host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
+    host_.printing().setTitle([this] {
+        std::string names;
+        for (const auto& disk : disks_.selected())
+            names += (names.empty() ? "" : ", ") + disk->displayName();
+        return names;
+    });
 }
 
-ModuleTab* DesktopSession::activeTab()
+void DesktopSession::connectWindow()
 {
-    const auto current = static_cast<std::size_t>(window_.tabs().currentIndex());
-    return current < tabs_.size() ? tabs_[current].get() : nullptr;
+    commands_.addMenus();
+    window_.setEvents({
+        [this] { return closer_.mayClose(); },
+        [this](const std::vector<std::filesystem::path>& files) {
+            disks_.open({files.begin(), files.end()});
+        },
+        [this] { return !controller_.interfaceLock(); },
+        [this] { update(); },
+        [this] { windowAppeared(); },
+    });
+    controller_.setEvents({[this](bool isLocked) {
+                               jobs_.lockChanged(isLocked);
+                               if (isLocked)
+                                   hints_.refresh();
+                               else
+                                   closer_.jobEnded();
+                           },
+                           [this](const contract::Dictionary& report) { jobs_.reported(report); }});
 }
 
-// Which tab is shown is settled first: a module that hears of the selection asks.
-void DesktopSession::updateTabs()
+void DesktopSession::update()
 {
-    for (const auto& tab : tabs_)
-        tab->setActive(tab.get() == activeTab());
-    if (ModuleTab* const tab = activeTab())
-        tab->tellOfSelection();
-    refreshHints();
+    tabs_.update();
+    hints_.refresh();
 }
 
 void DesktopSession::selectionChanged()
 {
-    for (std::size_t i = 0; i < tabs_.size(); ++i)
-        window_.tabs().setTabEnabled(static_cast<int>(i), tabs_[i]->isOffered());
-    updateTabs();
-    for (const auto& disk : window_.disks().selectedDisks())
-        images_.refresh(*disk);
-}
-
-void DesktopSession::show()
-{
-    window_.show();
+    tabs_.offer();
+    update();
+    disks_.refresh(disks_.selected());
 }
 
 void DesktopSession::windowAppeared()
 {
     hasAppeared_ = true;
     showWarnings();
-    watchSystemDisks();
-    openNamed(true);
-    if (!options_.scansSystemDisks)
-        openNamed(false);
+    disks_.start();
 }
 
 void DesktopSession::warn(const std::string& sentence)
@@ -250,13 +171,7 @@ void DesktopSession::warn(const std::string& sentence)
 
 void DesktopSession::showWarnings()
 {
-    showFailures(std::exchange(warnings_, {}));
-}
-
-void DesktopSession::showFailures(const std::vector<std::string>& sentences)
-{
-    if (!sentences.empty())
-        host_.alerts().simpleModuleAlert("", joined(sentences), 0);
+    host_.showSheet("", std::exchange(warnings_, {}));
 }
 
 }  // namespace orvane::desktop

@@ -1,16 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/desktop/DesktopEntry.h"
 #include "orvane/desktop/DesktopSession.h"
-#include "orvane/desktop/TerminationSignals.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/ProgramStart.h"
+#include "orvane/support/loop/EndingSignals.h"
 #include "orvane/support/texts/Language.h"
 
 #include <QApplication>
 #include <QIcon>
+#include <QSocketNotifier>
 
 #include <cstdio>
 #include <exception>
+#include <functional>
 #include <optional>
 #include <string_view>
 
@@ -67,6 +68,28 @@ bool asksForText(int argc, char** argv)
                 return true;
     return false;
 }
+
+/// Calls back from the event loop for each signal that would end the program. Made before any
+/// thread is started.
+class TerminationSignals {
+public:
+    /// From here on, with the application object there, each signal calls `received`.
+    void watch(std::function<void()> received)
+    {
+        if (signals_.descriptor() < 0)
+            return;
+        notifier_.emplace(signals_.descriptor(), QSocketNotifier::Read);
+        QObject::connect(&*notifier_, &QSocketNotifier::activated, &*notifier_,
+                         [this, received = std::move(received)] {
+                             while (signals_.take())
+                                 received();
+                         });
+    }
+
+private:
+    EndingSignals signals_;
+    std::optional<QSocketNotifier> notifier_;
+};
 
 int run(int argc, char** argv)
 {

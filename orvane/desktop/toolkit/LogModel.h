@@ -7,10 +7,14 @@
 
 namespace orvane::desktop {
 
-/// The text of a row as the module's cell shows it; none for a row that does not exist (any
-/// more), or while the view has no data source or no cell.
+/// The text of a record as the module's cell shows it; none for no record, or while the view has no
+/// data source or no cell.
 contract::StyledText textOfItem(contract::OutlineView& view, const contract::OutlineItem& item);
+/// The text of the record in a row; none for a row that does not exist (any more).
 contract::StyledText textOfRow(contract::OutlineView& view, std::size_t row);
+
+/// A row that comes and goes with the details.
+bool isDetail(const contract::OutlineItem& item);
 
 /// The rows of an outline view without levels. Rows are asked for when they are shown: the model
 /// keeps their number alone, so a million rows cost as much as one. Main thread.

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtAlerts.h"
 
-#include "orvane/desktop/toolkit/QtButton.h"
+#include "orvane/desktop/toolkit/QtControls.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QApplication>

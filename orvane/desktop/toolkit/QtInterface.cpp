@@ -1,15 +1,139 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtInterface.h"
 
-#include "orvane/desktop/toolkit/FittingPane.h"
-#include "orvane/desktop/toolkit/InterfaceFile.h"
+#include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QAbstractButton>
+#include <QEvent>
+#include <QFile>
+#include <QLabel>
+#include <QScrollArea>
 #include <QSplitter>
+#include <QUiLoader>
 
+#include <filesystem>
 #include <variant>
 
 namespace orvane::desktop {
+namespace {
+
+// Dynamic properties of the widgets of an interface file.
+constexpr const char* actionProperty = "action";        // of buttons, in the file
+constexpr const char* emptyNoteProperty = "emptyNote";  // of a LogTable, in the file
+constexpr const char* problemProperty = "problemWord";  // likewise: spoken for a red row
+constexpr const char* successProperty = "successWord";  // likewise: for a green one
+constexpr const char* viewClassProperty = "viewClass";  // of a LogTable, set by the loader
+
+class Loader final : public QUiLoader {
+public:
+    QWidget* createWidget(const QString& className, QWidget* parent, const QString& name) override
+    {
+        if (availableWidgets().contains(className))
+            return QUiLoader::createWidget(className, parent, name);
+        auto* const table = new LogTable(parent);
+        table->setObjectName(name);
+        table->setProperty(viewClassProperty, className);
+        return table;
+    }
+};
+
+QString translated(const QString& text, const contract::Bundle& texts)
+{
+    return text.isEmpty() ? text : toQt(texts.localizedString(fromQt(text)));
+}
+
+void translate(QWidget& widget, const contract::Bundle& texts)
+{
+    if (auto* const button = qobject_cast<QAbstractButton*>(&widget)) {
+        const QKeySequence shortcut = button->shortcut();
+        button->setText(translated(button->text(), texts));
+        if (!button->text().contains(u'&'))
+            button->setShortcut(shortcut);
+    } else if (auto* const label = qobject_cast<QLabel*>(&widget)) {
+        label->setText(translated(label->text(), texts));
+    }
+    for (const char* const name : {emptyNoteProperty, problemProperty, successProperty})
+        if (const QVariant text = widget.property(name); text.isValid())
+            widget.setProperty(name, translated(text.toString(), texts));
+    // The tool tip becomes HTML, which must not be read out.
+    if (widget.accessibleDescription().isEmpty())
+        widget.setAccessibleDescription(widget.toolTip());
+    widget.setToolTip(toQtToolTip(fromQt(translated(widget.toolTip(), texts))));
+    widget.setAccessibleName(translated(widget.accessibleName(), texts));
+    widget.setAccessibleDescription(translated(widget.accessibleDescription(), texts));
+}
+
+/// Makes the widgets of a file of Qt Designer, with their texts as the bundle translates them. A
+/// custom widget class of a name that Qt does not know becomes a LogTable. None when the file
+/// cannot be read; then `error` says why.
+std::unique_ptr<QWidget> loadInterfaceFile(const std::filesystem::path& file,
+                                           const contract::Bundle& texts, QString& error)
+{
+    QFile contents(QString::fromStdString(file.string()));
+    if (!contents.open(QIODevice::ReadOnly)) {
+        error = contents.errorString();
+        return nullptr;
+    }
+    Loader loader;
+    loader.setLanguageChangeEnabled(false);
+    std::unique_ptr<QWidget> root(loader.load(&contents));
+    if (!root) {
+        error = loader.errorString();
+        return nullptr;
+    }
+    translate(*root, texts);
+    for (QWidget* widget : root->findChildren<QWidget*>())
+        translate(*widget, texts);
+    return root;
+}
+
+/// Keeps the first pane of a split view as high as the text that scrolls in it, within the pane's
+/// limits, until the user moves the divider. Belongs to the split view, which outlives it.
+class FittingPane final : public QObject {
+public:
+    /// `text` lies in the first pane.
+    FittingPane(QSplitter& splitter, QScrollArea& text)
+        : QObject(&splitter), splitter_(splitter), text_(text)
+    {
+        text.installEventFilter(this);
+        text.widget()->installEventFilter(this);
+        connect(&splitter, &QSplitter::splitterMoved, this, [this] { wasMoved_ = true; });
+    }
+
+protected:
+    bool eventFilter(QObject* /*watched*/, QEvent* event) override
+    {
+        // The height that is needed depends on the width, and on the text and its font.
+        if (event->type() == QEvent::Resize || event->type() == QEvent::LayoutRequest)
+            fit();
+        return false;
+    }
+
+private:
+    void fit()
+    {
+        const QList<int> sizes = splitter_.sizes();
+        // Giving the pane another height is a reason to ask again.
+        if (wasMoved_ || isFitting_ || sizes.size() < 2 || !splitter_.isVisible())
+            return;
+        const int beside = splitter_.widget(0)->height() - text_.viewport()->height();
+        const int wanted = text_.widget()->heightForWidth(text_.viewport()->width()) + beside;
+        const QWidget& pane = *splitter_.widget(0);
+        const int height = qBound(pane.minimumHeight(), wanted, pane.maximumHeight());
+        isFitting_ = true;
+        if (height != sizes[0])
+            splitter_.setSizes({height, sizes[0] + sizes[1] - height});
+        isFitting_ = false;
+    }
+
+    QSplitter& splitter_;
+    QScrollArea& text_;
+    bool wasMoved_ = false;
+    bool isFitting_ = false;
+};
+
+}  // namespace
 
 LoadedInterface::LoadedInterface(std::unique_ptr<QWidget> root, contract::InterfaceOwner& owner,
                                  const std::function<void()>& beforeRows)

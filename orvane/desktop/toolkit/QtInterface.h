@@ -3,10 +3,9 @@
 
 #include "contract/foundation/Bundle.h"
 #include "contract/toolkit/Interface.h"
-#include "orvane/desktop/toolkit/EmptyNote.h"
+#include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/OutlinePeer.h"
-#include "orvane/desktop/toolkit/QtButton.h"
-#include "orvane/desktop/toolkit/QtText.h"
+#include "orvane/desktop/toolkit/QtControls.h"
 
 #include <QPointer>
 #include <QWidget>

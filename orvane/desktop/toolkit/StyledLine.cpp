@@ -2,9 +2,11 @@
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include "contract/foundation/UTF8.h"
-#include "orvane/desktop/toolkit/Contrast.h"
-#include "orvane/desktop/toolkit/DesktopFont.h"
+#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
+
+#include <QApplication>
+#include <QFontInfo>
 
 #include <algorithm>
 
@@ -77,6 +79,21 @@ QColor colorOf(const contract::TextStyle& style, const LineLooks& looks)
 }
 
 }  // namespace
+
+double desktopFontScale()
+{
+    // A font that was set in pixels has no point size of its own; QFontInfo knows one.
+    return QFontInfo(QApplication::font()).pointSizeF() / moduleTextPoints;
+}
+
+QFont scaledFont(const contract::Font& font, double scale)
+{
+    QFont result = QApplication::font();
+    const double size = font.points > 0 ? font.points : moduleTextPoints;
+    result.setPointSizeF(size * scale);
+    result.setBold(font.isBold);
+    return result;
+}
 
 StyledLine oneLine(const contract::StyledText& text)
 {
@@ -206,6 +223,17 @@ double wrappedHeight(const StyledLine& line, const LineLooks& looks, double widt
     QTextLayout layout(line.text, widestFont(line, looks));
     layOut(layout, line, looks, QTextOption::WrapAtWordBoundaryOrAnywhere, width);
     return layout.boundingRect().height();
+}
+
+void drawRowBackground(QPainter& painter, const QStyleOptionViewItem& option)
+{
+    QStyleOptionViewItem background = option;
+    background.text.clear();
+    background.icon = {};
+    background.features &= ~QStyleOptionViewItem::HasDecoration;
+    const QStyle* const style =
+        option.widget != nullptr ? option.widget->style() : QApplication::style();
+    style->drawControl(QStyle::CE_ItemViewItem, &background, &painter, option.widget);
 }
 
 }  // namespace orvane::desktop

@@ -3,15 +3,26 @@
 
 #include "contract/foundation/StyledText.h"
 
+#include <QFont>
 #include <QFontMetricsF>
 #include <QPainter>
 #include <QPalette>
 #include <QString>
+#include <QStyleOptionViewItem>
 #include <QTextLayout>
 
 #include <vector>
 
 namespace orvane::desktop {
+
+/// The size, in points, at which modules want their ordinary text: the desktop's own size.
+inline constexpr double moduleTextPoints = 11;
+
+/// What a module's points are multiplied by to become the desktop's.
+double desktopFontScale();
+
+/// The application's font in the weight that `font` asks for, and in its size times `scale`.
+QFont scaledFont(const contract::Font& font, double scale);
 
 /// A styled text as one line: what a row of the log shows.
 struct StyledLine {
@@ -54,5 +65,8 @@ void drawWrapped(QPainter& painter, const QRectF& rect, const StyledLine& line,
                  const LineLooks& looks);
 /// How high that is.
 double wrappedHeight(const StyledLine& line, const LineLooks& looks, double width);
+
+/// A row of a view without its text and its icon: selected or not, as the style has it.
+void drawRowBackground(QPainter& painter, const QStyleOptionViewItem& option);
 
 }  // namespace orvane::desktop

@@ -4,6 +4,10 @@
 #include "contract/foundation/UTF8.h"
 
 #include <QColor>
+#include <QCoreApplication>
+#include <QLibraryInfo>
+#include <QLocale>
+#include <QTranslator>
 
 #include <algorithm>
 #include <cstdio>
@@ -119,6 +123,24 @@ std::string html(const contract::StyledText& text, double fontScale)
         }
     }
     return isInParagraph ? result + "</p>" : result;
+}
+
+std::string languageOf(const contract::Bundle& bundle)
+{
+    return bundle.localizedString("en");
+}
+
+void translateQt(const contract::Bundle& bundle)
+{
+    const std::string language = languageOf(bundle);
+    if (language == "en")
+        return;
+    auto translator = std::make_unique<QTranslator>();
+    if (!translator->load(QLocale(toQt(language)), QStringLiteral("qtbase"), QStringLiteral("_"),
+                          QLibraryInfo::path(QLibraryInfo::TranslationsPath)))
+        return;
+    translator->setParent(QCoreApplication::instance());
+    QCoreApplication::installTranslator(translator.release());
 }
 
 }  // namespace orvane::desktop

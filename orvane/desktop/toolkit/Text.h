@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/foundation/Bundle.h"
 #include "contract/foundation/StyledText.h"
 
 #include <QString>
@@ -25,5 +26,13 @@ QString toQtToolTip(std::string_view text);
 /// The text as a fragment of HTML, everything escaped: bold, colour and size (in points,
 /// multiplied by `fontScale`) of each run, and one paragraph for each line.
 std::string html(const contract::StyledText& text, double fontScale = 1);
+
+/// The language of the bundle's texts as a code ("de"); "en" where they are not translated. It is
+/// the translation of "en".
+[[nodiscard]] std::string languageOf(const contract::Bundle& bundle);
+
+/// Qt's own texts, as in the dialogs for files and printing, come in the bundle's language from
+/// now on, where Qt's translations are installed. Main thread, with the application object there.
+void translateQt(const contract::Bundle& bundle);
 
 }  // namespace orvane::desktop

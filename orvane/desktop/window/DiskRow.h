@@ -1,12 +1,52 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/desktop/window/LastCheck.h"
+#include "orvane/support/disks/Disk.h"
+#include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/texts/Translator.h"
 
+#include <QDateTime>
+#include <QIcon>
 #include <QString>
 
+#include <functional>
+#include <optional>
+#include <string>
+#include <string_view>
+
 namespace orvane::desktop {
+
+/// One action on a disk.
+struct Check {
+    std::string verdict;  ///< one of the library's verdicts; empty when it was cut off
+    std::string message;  ///< one sentence; may be empty
+    QDateTime started;
+};
+
+/// What is kept of the last actions on a disk, or on the part of it that is worst off.
+struct LastCheck {
+    Check told;                  ///< that came to an answer, where one did
+    std::optional<Check> later;  ///< after it, and without an answer
+    std::string part = {};       ///< the name of the part; empty for the disk itself
+    /// Parts have not been checked, though nothing bad is known.
+    bool isPartial = false;
+};
+
+/// What the list knows of a disk beyond its facts. Main thread.
+struct DiskStates {
+    /// None when the disk was never checked.
+    std::function<std::optional<LastCheck>(const Disk& disk)> lastCheck;
+    /// What a job is doing to the disk at this moment ("verifying…"); empty when none is.
+    std::function<std::string(const Disk& disk)> activity;
+    /// What is out of the ordinary about it, in a few words; mostly empty.
+    std::function<std::string(const Disk& disk)> note;
+};
+
+/// By the kind of disk.
+[[nodiscard]] QIcon diskIcon(const DiskFacts& facts);
+
+/// A mark for one of the library's verdicts; the text beside it says the same.
+[[nodiscard]] QIcon verdictIcon(std::string_view verdict);
 
 /// The columns of the disk list.
 enum class DiskColumn { Name, Verdict, Size, Format, MountPoint, LastCheck };

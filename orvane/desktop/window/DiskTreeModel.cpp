@@ -3,7 +3,7 @@
 
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/desktop/window/DiskIcons.h"
+#include "orvane/desktop/window/DiskRow.h"
 
 #include <algorithm>
 

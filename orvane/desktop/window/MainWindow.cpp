@@ -1,19 +1,32 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/MainWindow.h"
 
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QApplication>
 #include <QCloseEvent>
 #include <QDropEvent>
 #include <QFile>
+#include <QHBoxLayout>
 #include <QMimeData>
 #include <QTimer>
 #include <QUrl>
 #include <QVBoxLayout>
 
+#include <algorithm>
+#include <cmath>
+
 namespace orvane::desktop {
 namespace {
+
+void keepRoomWhenHidden(QWidget& widget)
+{
+    QSizePolicy policy = widget.sizePolicy();
+    policy.setRetainSizeWhenHidden(true);
+    widget.setSizePolicy(policy);
+    widget.hide();
+}
 
 constexpr QSize firstSize{1120, 720};
 
@@ -26,7 +39,97 @@ std::vector<std::filesystem::path> localFiles(const QMimeData* data)
     return files;
 }
 
+constexpr std::string_view geometryKey = "MainWindow.geometry";
+constexpr std::string_view splitterKey = "MainWindow.splitter";
+
+QByteArray stored(const contract::UserDefaults& settings, std::string_view key)
+{
+    const contract::Value value = settings.objectForKey(key);
+    return QByteArray::fromBase64(QByteArray::fromStdString(std::string(value.string())));
+}
+
+void store(contract::UserDefaults& settings, std::string_view key, const QByteArray& bytes)
+{
+    const std::string text = bytes.toBase64().toStdString();
+    if (settings.objectForKey(key).string() != text)
+        settings.setObjectForKey(contract::Value(text), key);
+}
+
 }  // namespace
+
+ProgressArea::ProgressArea(const QString& accessibleName, QWidget* parent)
+    : QWidget(parent), bar_(new QProgressBar(this)), label_(new QLabel(this))
+{
+    bar_->setObjectName(QStringLiteral("progressBar"));
+    bar_->setAccessibleName(accessibleName);
+    bar_->setTextVisible(false);
+    label_->setObjectName(QStringLiteral("statusLine"));
+    label_->setTextFormat(Qt::PlainText);
+    label_->setTextInteractionFlags(Qt::TextSelectableByMouse);
+    label_->setMinimumWidth(1);
+    label_->setSizePolicy(QSizePolicy::Ignored, QSizePolicy::Fixed);
+
+    auto* const layout = new QHBoxLayout(this);
+    layout->setContentsMargins(12, 6, 12, 6);
+    layout->setSpacing(12);
+    layout->addWidget(label_, 3);
+    layout->addWidget(bar_, 2);
+    keepRoomWhenHidden(*bar_);
+    keepRoomWhenHidden(*label_);
+}
+
+void ProgressArea::setBarActive(bool isActive)
+{
+    isBarActive_ = isActive;
+    bar_->setVisible(isActive);
+    showRange();
+}
+
+void ProgressArea::setTextActive(bool isActive)
+{
+    label_->setVisible(isActive);
+}
+
+void ProgressArea::setIndeterminate(bool isIndeterminate)
+{
+    isIndeterminate_ = isIndeterminate;
+    showRange();
+}
+
+void ProgressArea::setPercent(double percent)
+{
+    tenths_ = std::isfinite(percent)
+                  ? static_cast<int>(std::lround(std::clamp(percent, 0.0, 100.0) * 10))
+                  : 0;
+    showRange();
+}
+
+// A bar without a range is animated for as long as it lives, also while it is hidden.
+void ProgressArea::showRange()
+{
+    const bool isMoving = isIndeterminate_ && isBarActive_;
+    bar_->setRange(0, isMoving ? 0 : 1000);
+    if (!isMoving)
+        bar_->setValue(tenths_);
+}
+
+void ProgressArea::setText(std::string_view text)
+{
+    text_ = toQt(contract::printable(text));
+    showText();
+}
+
+void ProgressArea::showText()
+{
+    label_->setText(label_->fontMetrics().elidedText(text_, Qt::ElideMiddle, label_->width()));
+    label_->setToolTip(toQtToolTip(fromQt(text_)));
+}
+
+void ProgressArea::resizeEvent(QResizeEvent* event)
+{
+    QWidget::resizeEvent(event);
+    showText();
+}
 
 MainWindow::MainWindow(const Translator& texts)
     : disks_(new DiskList(texts)),
@@ -116,6 +219,18 @@ void MainWindow::paintEvent(QPaintEvent* event)
         if (events_.appeared)
             events_.appeared();
     });
+}
+
+void MainWindow::restoreLayout(const contract::UserDefaults& settings)
+{
+    restoreGeometry(stored(settings, geometryKey));
+    splitter_->restoreState(stored(settings, splitterKey));
+}
+
+void MainWindow::saveLayout(contract::UserDefaults& settings) const
+{
+    store(settings, geometryKey, saveGeometry());
+    store(settings, splitterKey, splitter_->saveState());
 }
 
 }  // namespace orvane::desktop

@@ -1,18 +1,52 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/support/OVPreferences.h"
 #include "orvane/desktop/window/DiskList.h"
-#include "orvane/desktop/window/ProgressArea.h"
 
+#include <QLabel>
 #include <QMainWindow>
+#include <QProgressBar>
 #include <QSplitter>
 #include <QTabWidget>
+#include <QWidget>
 
 #include <filesystem>
 #include <functional>
+#include <string_view>
 #include <vector>
 
 namespace orvane::desktop {
+
+/// The window's status line, and beside it the progress bar. Both keep their room when they are
+/// not in use, so that nothing in the window jumps.
+class ProgressArea final : public QWidget {
+public:
+    ProgressArea(const QString& accessibleName, QWidget* parent);
+
+    void setBarActive(bool isActive);
+    void setTextActive(bool isActive);
+    void setIndeterminate(bool isIndeterminate);
+    /// From 0 to 100.
+    void setPercent(double percent);
+    /// Any bytes; shown as one line of plain text.
+    void setText(std::string_view text);
+    QString text() const { return text_; }
+
+protected:
+    void resizeEvent(QResizeEvent* event) override;
+
+private:
+    void showText();
+    void showRange();
+
+    QProgressBar* bar_;
+    QLabel* label_;
+    QString text_;
+    bool isBarActive_ = false;
+    bool isIndeterminate_ = true;
+    int tenths_ = 0;
+};
 
 /// The host's window: the disks on the left, the modules' tabs on the right, progress below.
 /// Knows how they lie, not what they do. Main thread.
@@ -44,6 +78,11 @@ public:
     /// for an answer. A window behind another program's keeps it, so that a button is ready when
     /// the click that brings the window to the front falls on it; so does one beside its help.
     bool hasAttention() const;
+
+    /// Where the window stood, and how it was divided, is kept in the settings from one start to
+    /// the next. What cannot be read is left as it is.
+    void restoreLayout(const contract::UserDefaults& settings);
+    void saveLayout(contract::UserDefaults& settings) const;
 
 protected:
     void changeEvent(QEvent* event) override;

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/session/DesktopNotifier.h"
-#include "orvane/desktop/session/JobNotice.h"
 #include "tests/desktop/session/FakeServices.h"
 #include "tests/desktop/session/PrivateBus.h"
 

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/availability/ButtonDecision.h"
-#include "orvane/desktop/toolkit/QtHelp.h"
+#include "orvane/desktop/toolkit/Help.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/support/texts/ModuleBundle.h"

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/ColorScheme.h"
-#include "orvane/desktop/toolkit/Contrast.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 #include "orvane/desktop/toolkit/Text.h"
 

@@ -4,7 +4,7 @@
 #include "fixwell/messagelog/MessageRecord.h"
 #include "fixwell/module/OVFXW.h"
 #include "orvane/desktop/toolkit/QtAlerts.h"
-#include "orvane/desktop/toolkit/QtEvents.h"
+#include "orvane/desktop/toolkit/QtControls.h"
 #include "orvane/desktop/toolkit/QtInterface.h"
 #include "orvane/desktop/toolkit/QtPasteboard.h"
 #include "orvane/desktop/toolkit/QtPrinting.h"

@@ -2,13 +2,74 @@
 #pragma once
 
 #include "contract/toolkit/Control.h"
+#include "contract/toolkit/Event.h"
 
 #include <QAbstractButton>
+#include <QLabel>
+#include <QPlainTextEdit>
+#include <QScrollBar>
+#include <Qt>
 
 #include <functional>
 #include <string>
 
 namespace orvane::desktop {
+
+std::uint64_t modifierFlags(Qt::KeyboardModifiers modifiers);
+/// The module's code for a key; `otherKey` for those that modules do not tell apart.
+std::uint16_t keyCodeOf(int qtKey);
+inline constexpr std::uint16_t otherKey = 0xFFFF;
+
+/// The keys that are held down now.
+class QtEvents final : public contract::Events {
+public:
+    std::uint64_t currentModifierFlags() const override;
+};
+
+/// A scroll bar, which must live as long as this object is used.
+class QtScroller final : public contract::Scroller {
+public:
+    explicit QtScroller(const QScrollBar& bar) : bar_(bar) {}
+
+    /// 1.0 also when everything fits: the end is in sight.
+    double value() const override
+    {
+        const int range = bar_.maximum() - bar_.minimum();
+        return range > 0 ? static_cast<double>(bar_.value() - bar_.minimum()) / range : 1.0;
+    }
+
+private:
+    const QScrollBar& bar_;
+};
+
+/// Text that is only read, with its fonts relative to the desktop's size. The label must live as
+/// long as this object is used.
+class QtTextField final : public contract::TextField {
+public:
+    explicit QtTextField(QLabel& label);
+
+    void setNeedsDisplay(bool needsDisplay) override;
+    void setEnabled(bool isEnabled) override { label_.setEnabled(isEnabled); }
+    bool isEnabled() const override { return label_.isEnabled(); }
+    void setToolTip(std::string_view text) override;
+    void setAttributedStringValue(const contract::StyledText& text) override;
+
+private:
+    QLabel& label_;
+};
+
+/// A place for plain messages that takes no room while there is none. The widget must live as
+/// long as this object is used.
+class QtTextView final : public contract::TextView {
+public:
+    explicit QtTextView(QPlainTextEdit& widget);
+
+    void setNeedsDisplay(bool needsDisplay) override;
+    void setString(std::string_view text) override;
+
+private:
+    QPlainTextEdit& widget_;
+};
 
 /// A push button or a check box. The widget must live as long as this object is used.
 class QtButton final : public contract::Button {

@@ -1,13 +1,83 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/desktop/toolkit/QtButton.h"
+#include "orvane/desktop/toolkit/QtControls.h"
 
+#include "orvane/desktop/toolkit/StyledLine.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QGuiApplication>
 #include <QPushButton>
 
 #include <utility>
 
 namespace orvane::desktop {
+
+std::uint64_t modifierFlags(Qt::KeyboardModifiers modifiers)
+{
+    std::uint64_t flags = 0;
+    if (modifiers.testFlag(Qt::ShiftModifier))
+        flags |= contract::modifierShift;
+    if (modifiers.testFlag(Qt::ControlModifier))
+        flags |= contract::modifierControl;
+    if (modifiers.testFlag(Qt::AltModifier))
+        flags |= contract::modifierOption;
+    return flags;
+}
+
+std::uint16_t keyCodeOf(int qtKey)
+{
+    switch (qtKey) {
+        case Qt::Key_Backspace: return contract::keyDelete;
+        case Qt::Key_Delete: return contract::keyForwardDelete;
+        case Qt::Key_Clear: return contract::keyKeypadClear;
+        default: return otherKey;
+    }
+}
+
+std::uint64_t QtEvents::currentModifierFlags() const
+{
+    return modifierFlags(QGuiApplication::keyboardModifiers());
+}
+
+QtTextField::QtTextField(QLabel& label) : label_(label)
+{
+    label_.setTextFormat(Qt::RichText);
+    label_.setTextInteractionFlags(Qt::TextSelectableByMouse | Qt::TextSelectableByKeyboard);
+}
+
+void QtTextField::setNeedsDisplay(bool needsDisplay)
+{
+    if (needsDisplay)
+        label_.update();
+}
+
+void QtTextField::setToolTip(std::string_view text)
+{
+    label_.setToolTip(toQtToolTip(text));
+}
+
+void QtTextField::setAttributedStringValue(const contract::StyledText& text)
+{
+    label_.setText(toQt(html(text, desktopFontScale())));
+    label_.setAccessibleDescription(toQt(text.characters()));
+}
+
+QtTextView::QtTextView(QPlainTextEdit& widget) : widget_(widget)
+{
+    widget_.setReadOnly(true);
+    widget_.setVisible(!widget_.document()->isEmpty());
+}
+
+void QtTextView::setNeedsDisplay(bool needsDisplay)
+{
+    if (needsDisplay)
+        widget_.viewport()->update();
+}
+
+void QtTextView::setString(std::string_view text)
+{
+    widget_.setPlainText(toQt(text));
+    widget_.setVisible(!text.empty());
+}
 
 QtButton::QtButton(QAbstractButton& widget, Pressed pressed)
     : widget_(widget),

@@ -7,8 +7,12 @@
 #include "orvane/support/modules/ModuleLoader.h"
 #include "pellar/Manager.h"
 
+#include <array>
+#include <filesystem>
 #include <memory>
 #include <string>
+#include <string_view>
+#include <vector>
 
 namespace orvane::desktop {
 
@@ -19,7 +23,7 @@ public:
     struct Surroundings {
         DesktopHost& host;
         WindowController& window;
-        pellar::ManagerOptions libraryOptions;
+        const pellar::ManagerOptions& libraryOptions;
     };
 
     /// Loads the bundle's module, unless it is switched off in the settings: then there is no tab.
@@ -66,6 +70,59 @@ private:
     std::unique_ptr<contract::OVModule> module_;
     LoadedInterface* interface_ = nullptr;  ///< of the host's loader
     bool isActive_ = false;
+};
+
+/// The buttons with which a module verifies and repairs, by their outlets.
+inline constexpr std::array actionButtons{"verifyDiskButton", "repairDiskButton",
+                                          "verifyPermissionsButton", "repairPermissionsButton"};
+
+/// The modules' tabs, in the order of the window's. Main thread.
+class ModuleTabs {
+public:
+    /// All outlive the tabs.
+    ModuleTabs(DesktopHost& host, MainWindow& window, WindowController& controller)
+        : host_(host), window_(window), controller_(controller)
+    {
+    }
+
+    /// Loads the modules of the bundles, and tells of each that cannot be loaded. Where none is
+    /// left, a tab says so.
+    void load(const std::vector<std::filesystem::path>& bundles,
+              const pellar::ManagerOptions& libraryOptions, const WarningSink& warn);
+    /// The modules end, their running job with them.
+    void clear() { tabs_.clear(); }
+
+    /// The tab that is shown; none when there is no module.
+    ModuleTab* active();
+    /// Settles which tab is shown, and has its module look at what is selected.
+    void update();
+    /// Enables the tabs that are offered for what is selected.
+    void offer();
+    /// Stops the job that runs, by its Stop button or, where that cannot be pressed, by itself.
+    void stopJob();
+    void stopHarder();
+
+    // Of the tab that is shown; none when there is no such thing.
+
+    LoadedInterface* interface();
+    QtButton* button(std::string_view outlet);
+    contract::OutlineView* log();
+    /// Shows the log as it is now.
+    void reloadLog();
+    std::string selectedLogHTML();
+
+    /// The selector that was sent to a module last.
+    const std::string& lastAction() const { return lastAction_; }
+
+private:
+    void add(std::unique_ptr<ModuleTab> tab);
+    void addEmptyTab(const std::string& switchedOff);
+
+    DesktopHost& host_;
+    MainWindow& window_;
+    WindowController& controller_;
+    std::vector<std::unique_ptr<ModuleTab>> tabs_;
+    std::string lastAction_;
 };
 
 }  // namespace orvane::desktop

@@ -1,14 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/desktop/toolkit/HelpWindow.h"
+#include "orvane/desktop/toolkit/Help.h"
 
 #include "contract/foundation/Format.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QAction>
+#include <QFile>
 #include <QFileInfo>
+#include <QRegularExpression>
 #include <QShortcut>
 #include <QStatusBar>
 #include <QStyle>
+#include <QTextDocument>
 #include <QToolBar>
 #include <QToolButton>
 #include <QUrl>
@@ -16,10 +19,63 @@
 namespace orvane::desktop {
 namespace {
 
+QString readPage(const QString& page)
+{
+    QFile file(page);
+    return !page.isEmpty() && file.open(QIODevice::ReadOnly) ? QString::fromUtf8(file.readAll())
+                                                             : QString();
+}
+
 constexpr QSize firstSize(720, 620);
 constexpr int pageMargin = 16;  // pixels
 
+constexpr std::string_view geometryKey = "HelpWindow.geometry";
+constexpr std::string_view books = "help/";
+
+// English where the language has texts, but no book.
+std::filesystem::path bookDirectory(const contract::Bundle& bundle)
+{
+    const auto translated = bundle.pathForResource(std::string(books) + languageOf(bundle));
+    return translated.empty() ? bundle.pathForResource(std::string(books) + "en") : translated;
+}
+
 }  // namespace
+
+QString HelpBook::page(const QString& name) const
+{
+    // Without a directory, the name would be looked for wherever the program was started.
+    return directory_.empty() ? QString() : QFile::decodeName((directory_ / fromQt(name)).c_str());
+}
+
+QString HelpBook::pageWith(std::string_view anchor) const
+{
+    if (!anchor.empty()) {
+        const QString mark = QStringLiteral("<a name=\"%1\">").arg(toQt(anchor));
+        for (const QString& candidate : pages())
+            if (readPage(candidate).contains(mark))
+                return candidate;
+    }
+    return contents();
+}
+
+QStringList HelpBook::pages() const
+{
+    const QString text = readPage(contents());
+    if (text.isEmpty())
+        return {};
+    QStringList found{contents()};
+    static const QRegularExpression link(QStringLiteral("<li><a href=\"([a-z]+\\.html)\">"));
+    for (const QRegularExpressionMatch& match : link.globalMatch(text))
+        found += page(match.captured(1));
+    return found;
+}
+
+QString HelpBook::plainText(const QString& page)
+{
+    QTextDocument document;
+    document.setHtml(readPage(page));
+    return document.toPlainText();
+}
 
 HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts)
     : book_(std::move(book)),
@@ -156,6 +212,34 @@ void HelpWindow::closeEvent(QCloseEvent* event)
     if (closed_)
         closed_(saveGeometry());
     QMainWindow::closeEvent(event);
+}
+
+QtHelp::~QtHelp()
+{
+    delete window_;
+}
+
+void QtHelp::makeWindow()
+{
+    window_ = new HelpWindow(HelpBook(bookDirectory(bundle_)), bundle_);
+    window_->setAttribute(Qt::WA_DeleteOnClose);
+    // The program ends with its main window, whatever help is open.
+    window_->setAttribute(Qt::WA_QuitOnClose, false);
+    window_->restoreGeometry(QByteArray::fromBase64(
+        QByteArray::fromStdString(std::string(settings_.objectForKey(geometryKey).string()))));
+    window_->setClosed([this](const QByteArray& geometry) {
+        settings_.setObjectForKey(contract::Value(geometry.toBase64().toStdString()), geometryKey);
+    });
+}
+
+void QtHelp::openHelpAnchor(std::string_view anchor)
+{
+    if (!window_)
+        makeWindow();
+    window_->show();
+    window_->open(anchor);
+    window_->raise();
+    window_->activateWindow();
 }
 
 }  // namespace orvane::desktop

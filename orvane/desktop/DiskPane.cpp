@@ -1,0 +1,247 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/DiskPane.h"
+
+#include "orvane/support/settings/XDGPaths.h"
+
+#include <algorithm>
+#include <array>
+#include <iterator>
+#include <system_error>
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr std::array<contract::Name const*, 4> diskNotifications{
+    &contract::OVDiskAppearedNotification, &contract::OVDiskUnmountedNotification,
+    &contract::OVDiskChangedNotification, &contract::OVDiskEjectedNotification};
+
+std::vector<DiskTree> readDisks(DiskReader& reader)
+{
+    DiskSources sources;
+    sources.homeDirectory = environmentValue("HOME").value_or("");
+    return reader.read(sources);
+}
+
+Check checkOf(const Run& run)
+{
+    const auto started =
+        std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
+    return {run.verdict(), run.end ? run.end->message : "",
+            QDateTime::fromMSecsSinceEpoch(started.count())};
+}
+
+}  // namespace
+
+void DiskScan::start()
+{
+    if (std::exchange(isScanning_, true)) {
+        mustScanAgain_ = true;
+        return;
+    }
+    const auto scan = [&loop = loop_, &reader = reader_, scan = liveness_] {
+        loop.post([scan, disks = readDisks(reader)] {
+            if (*scan != nullptr)
+                (*scan)->finish(disks);
+        });
+    };
+    try {
+        thread_ = std::jthread(scan);
+    } catch (const std::system_error&) {
+        finish(readDisks(reader_));
+    }
+}
+
+void DiskScan::finish(const std::vector<DiskTree>& disks)
+{
+    isScanning_ = false;
+    const bool mustScanAgain = std::exchange(mustScanAgain_, false);
+    finished_(disks);
+    if (mustScanAgain)
+        start();
+}
+
+DiskPane::DiskPane(DesktopHost& host, HostLoop& loop, DiskList& list, const JobLedger& ledger,
+                   std::vector<std::string> named, bool scansSystemDisks, Events events)
+    : host_(host),
+      list_(list),
+      ledger_(ledger),
+      named_(std::move(named)),
+      scansSystemDisks_(scansSystemDisks),
+      events_(std::move(events)),
+      model_(host.sharedDiskController(), states(), host.translator()),
+      images_(host, {[this](const Disk& disk) { list_.select(disk); },
+                     [this](const std::vector<std::string>& sentences) {
+                         host_.showSheet(
+                             host_.translator().text("Not everything could be opened."), sentences);
+                     },
+                     [this] { synchronize(); }}),
+      scan_(loop, [this](const std::vector<DiskTree>& disks) { adoptDisks(disks); }),
+      watch_(loop, [this] { scan_.start(); })
+{
+    list_.show(model_, [this] { events_.selectionChanged(); });
+    for (const contract::Name* const name : diskNotifications)
+        host_.defaultCenter().addObserver(this, *name,
+                                          [this](const contract::Notification&) { synchronize(); });
+}
+
+DiskPane::~DiskPane()
+{
+    for (const contract::Name* const name : diskNotifications)
+        host_.defaultCenter().removeObserver(this, *name);
+}
+
+void DiskPane::synchronize()
+{
+    list_.synchronize();
+    events_.changed();
+}
+
+// Watched before they are read, so that nothing is missed in between. Without the watch the
+// command to rescan is still there, so nobody is bothered with a sheet.
+void DiskPane::start()
+{
+    if (scansSystemDisks_) {
+        if (const auto watching = watch_.start(); failed(watching))
+            host_.log().ov_log(contract::OVLog::error, 0, failureMessage(watching));
+        scan_.start();
+    }
+    openNamed(true);
+    if (!scansSystemDisks_)
+        openNamed(false);
+}
+
+// A label means nothing before the disks have been read. Image files need not wait for that.
+void DiskPane::adoptDisks(const std::vector<DiskTree>& disks)
+{
+    host_.sharedDiskController().synchronize(disks);
+    if (!std::exchange(hasReadDisks_, true))
+        openNamed(false);
+}
+
+void DiskPane::openNamed(bool areFiles)
+{
+    std::vector<std::string> names;
+    std::copy_if(named_.begin(), named_.end(), std::back_inserter(names),
+                 [=](const std::string& name) {
+                     std::error_code ignored;
+                     return std::filesystem::is_regular_file(name, ignored) == areFiles;
+                 });
+    images_.open(names);
+}
+
+void DiskPane::rescan()
+{
+    images_.refreshAll();
+    scan_.start();
+}
+
+void DiskPane::refresh(const std::vector<std::shared_ptr<Disk>>& disks)
+{
+    for (const auto& disk : disks)
+        images_.refresh(*disk);
+}
+
+void DiskPane::hold(const std::vector<contract::OVDiskPointer>& others)
+{
+    auto disks = selected();
+    for (const auto& disk : others)
+        if (auto other = std::dynamic_pointer_cast<Disk>(disk))
+            disks.push_back(std::move(other));
+    host_.sharedDiskController().hold(std::move(disks));
+}
+
+void DiskPane::release()
+{
+    if (host_.sharedDiskController().release()) {
+        list_.synchronize();
+        events_.selectionChanged();
+    }
+    const auto disks = selected();
+    const bool mayHaveWritten = std::any_of(disks.begin(), disks.end(), [](const auto& disk) {
+        return !ImageOpener::canEject(*disk);
+    });
+    // A label or a size may be another one, and no event need have told what a repair has written.
+    if (mayHaveWritten && scansSystemDisks_)
+        scan_.start();
+}
+
+DiskStates DiskPane::states()
+{
+    return {[this](const Disk& disk) { return lastCheckOf(disk); },
+            [this](const Disk& disk) { return activityOn(disk); },
+            [this](const Disk& disk) {
+                return images_.noteOn(disk);
+            }};
+}
+
+std::optional<LastCheck> DiskPane::lastCheckOf(const Disk& disk)
+{
+    auto runs = lastRunsOf(host_.historyStore(), host_.histories().keyOf(disk.facts()));
+    // The run that is under way has no end yet, and is told as what it is.
+    const bool isAtWork = !activityOn(disk).empty();
+    if (!runs || (isAtWork && !runs->told.end))
+        return std::nullopt;
+    LastCheck check{checkOf(runs->told), std::nullopt};
+    if (runs->later && !isAtWork)
+        check.later = checkOf(*runs->later);
+    return check;
+}
+
+std::string DiskPane::activityOn(const Disk& disk)
+{
+    const StartedRun* const run = ledger_.currentRun();
+    if (run == nullptr || run->identifier != disk.facts().identifier)
+        return {};
+    return host_.translator().text(run->isRepair() ? "repairing…" : "verifying…");
+}
+
+std::vector<DiskRequest> DiskPane::requestsFor(DiskAction action) const
+{
+    std::vector<DiskRequest> requests;
+    for (const auto& disk : selected())
+        if (isPossible(action, *disk))
+            requests.push_back(requestFor(action, *disk));
+    std::erase_if(requests, [this](const DiskRequest& request) {
+        return host_.diskOperations().isUnderWay(request.identifier);
+    });
+    return requests;
+}
+
+bool DiskPane::canDo(DiskAction action) const
+{
+    const auto disks = selected();
+    const bool holdsImage = std::any_of(
+        disks.begin(), disks.end(), [](const auto& disk) { return ImageOpener::canEject(*disk); });
+    return (action == DiskAction::Eject && holdsImage) || !requestsFor(action).empty();
+}
+
+// The list follows by itself; read anew all the same, for where the system cannot be watched.
+void DiskPane::carryOut(std::vector<DiskRequest> requests)
+{
+    host_.diskOperations().start(std::move(requests),
+                                 [this](const std::vector<std::string>& failures) {
+                                     host_.showSheet("", failures);
+                                     if (scansSystemDisks_)
+                                         scan_.start();
+                                 });
+}
+
+void DiskPane::attachAsDevices(const std::vector<std::string>& images)
+{
+    std::vector<DiskRequest> requests;
+    for (const std::string& image : images)
+        requests.push_back(requestToAttach(image));
+    carryOut(std::move(requests));
+}
+
+void DiskPane::doToSelection(DiskAction action)
+{
+    if (auto requests = requestsFor(action); !requests.empty())
+        carryOut(std::move(requests));
+    if (action == DiskAction::Eject)
+        for (const auto& disk : selected())
+            images_.eject(*disk);
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,259 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/MenuCommands.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QFile>
+#include <QFileDialog>
+#include <QMenu>
+#include <QMenuBar>
+
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
+constexpr const char* diskMenu = "diskMenu";
+const MenuCommand line{};
+
+}  // namespace
+
+bool fetchesArchives(SupportHost& host)
+{
+    return host.standardUserDefaults().objectForKey(fetchesArchivesKey).boolean();
+}
+
+void MenuCommands::addMenus()
+{
+    desktop::addMenus(at_.window, menus(), at_.host.translator());
+    DiskList& list = at_.disks.list();
+    list.setContextMenuPolicy(Qt::CustomContextMenu);
+    QObject::connect(
+        &list, &QWidget::customContextMenuRequested, &at_.window,
+        [&list, menu = at_.window.menuBar()->findChild<QMenu*>(QLatin1String(diskMenu))](
+            const QPoint& place) { menu->popup(list.viewport()->mapToGlobal(place)); });
+}
+
+std::vector<Menu> MenuCommands::menus()
+{
+    return {{"&File", fileCommands()},
+            {"&Edit", editCommands()},
+            {"Dis&k",
+             {buttonCommand("verifyDisk", "&Verify Disk", "verifyDiskButton"),
+              buttonCommand("repairDisk", "&Repair Disk", "repairDiskButton"), line,
+              mapCommand("verifyMap", "Verify Partition &Map", "verifyDiskButton"),
+              mapCommand("repairMap", "Repair &Partition Map", "repairDiskButton")},
+             diskMenu},
+            {"&View", {detailsCommand()}},
+            {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
+                            at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
+                        }}}}};
+}
+
+std::vector<MenuCommand> MenuCommands::fileCommands()
+{
+    const auto isFree = [this] {
+        return !isLocked();
+    };
+    const auto open = [this] {
+        chooseImages("Open Image", [this](const auto& names) { at_.disks.open(names); });
+    };
+    const auto attach = [this] {
+        chooseImages("Attach Image as Device",
+                     [this](const auto& names) { at_.disks.attachAsDevices(names); });
+    };
+    const auto canPrint = [this] {
+        return at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
+    };
+    return {
+        {"openImage", "&Open Image…", QKeySequence::Open, open, isFree},
+        {"attachImage", "&Attach Image as Device…", {}, attach, isFree},
+        {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { at_.disks.rescan(); }, isFree},
+        diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
+        diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U), DiskAction::Unmount),
+        diskCommand("eject", "&Eject", QKeySequence(Qt::CTRL | Qt::Key_E), DiskAction::Eject),
+        line,
+        {"print", "&Print…", QKeySequence::Print, [this] { print(); }, canPrint},
+        line,
+        {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {
+             at_.window.close();
+         }}};
+}
+
+std::vector<MenuCommand> MenuCommands::editCommands()
+{
+    const auto edits = [this](contract::Selector action) {
+        return [this, action] {
+            return canEdit(action);
+        };
+    };
+    const auto canSelect = [this] {
+        return isInDiskList() || canEdit("selectAll:");
+    };
+    const auto canUndo = [this] {
+        return !isLocked() && at_.host.histories().hasCleared();
+    };
+    const auto fetches = [this] {
+        return fetchesArchives(at_.host);
+    };
+    const auto switchFetching = [this] {
+        at_.host.standardUserDefaults().setObjectForKey(!fetchesArchives(at_.host),
+                                                        fetchesArchivesKey);
+    };
+    const auto copy = [this] {
+        at_.tabs.log()->copy(&at_.window);
+    };
+    const auto remove = [this] {
+        at_.tabs.log()->delete_(&at_.window);
+    };
+    return {
+        {"copy", "&Copy", QKeySequence::Copy, copy, edits("copy:")},
+        {"selectAll", "Select &All", QKeySequence::SelectAll, [this] { selectAll(); }, canSelect},
+        // The key itself belongs to the log, which sees it first.
+        {"delete", "&Delete", {}, remove, edits("delete:")},
+        {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
+         canUndo},
+        line,
+        {"fetchArchives", "Download &Package Archives", {}, switchFetching, {}, fetches}};
+}
+
+MenuCommand MenuCommands::detailsCommand()
+{
+    const auto button = [this] {
+        return at_.tabs.button("showDetailsButton");
+    };
+    return {"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
+            [button] { button()->press(); },
+            [button] { return button() != nullptr && button()->isEnabled(); },
+            [button] {
+                return button() != nullptr && button()->isChecked();
+            }};
+}
+
+MenuCommand MenuCommands::diskCommand(const char* objectName, std::string_view title,
+                                      QKeySequence shortcut, DiskAction action)
+{
+    // While a job runs, the disks are its own.
+    return {objectName, title, std::move(shortcut),
+            [this, action] { at_.disks.doToSelection(action); },
+            [this, action] {
+                return !isLocked() && at_.disks.canDo(action);
+            }};
+}
+
+MenuCommand MenuCommands::buttonCommand(const char* objectName, std::string_view title,
+                                        const char* button)
+{
+    return {objectName,
+            title,
+            {},
+            [this, button] { at_.tabs.button(button)->press(); },
+            [this, button] {
+                const QtButton* const control = at_.tabs.button(button);
+                return !isLocked() && control != nullptr && control->isEnabled();
+            }};
+}
+
+MenuCommand MenuCommands::mapCommand(const char* objectName, std::string_view title,
+                                     const char* button)
+{
+    return {objectName,
+            title,
+            {},
+            [this, button] { treatMap(button); },
+            [this] {
+                return diskWithMap() != nullptr;
+            }};
+}
+
+void MenuCommands::chooseImages(
+    std::string_view title, const std::function<void(const std::vector<std::string>&)>& chosen)
+{
+    const Translator& texts = at_.host.translator();
+    auto* const dialog = new QFileDialog(&at_.window, toQt(texts.text(title)));
+    dialog->setAttribute(Qt::WA_DeleteOnClose);
+    dialog->setFileMode(QFileDialog::ExistingFiles);
+    dialog->setNameFilters(
+        {toQt(texts.text("Disk images")) + QStringLiteral(" (*.img *.raw *.iso *.bin)"),
+         toQt(texts.text("All files")) + QStringLiteral(" (*)")});
+    QObject::connect(dialog, &QFileDialog::filesSelected, &at_.window,
+                     [chosen](const QStringList& files) {
+                         std::vector<std::string> names;
+                         for (const QString& file : files)
+                             names.push_back(QFile::encodeName(file).toStdString());
+                         chosen(names);
+                     });
+    dialog->open();
+}
+
+void MenuCommands::print()
+{
+    completeLog();
+    at_.tabs.active()->module().printModuleSpecific(&at_.window);
+}
+
+bool MenuCommands::canEdit(contract::Selector action)
+{
+    return at_.tabs.log() != nullptr && at_.tabs.log()->validateMenuItem({action});
+}
+
+// Who takes the whole log wants the oldest rows, too.
+void MenuCommands::completeLog()
+{
+    if (at_.host.histories().loadAll())
+        at_.tabs.reloadLog();
+}
+
+// The list and the log both have rows; the one that the user is in is meant. Asked of the window,
+// which knows it also while its menu is open.
+bool MenuCommands::isInDiskList() const
+{
+    return at_.window.focusWidget() == &at_.disks.list();
+}
+
+void MenuCommands::selectAll()
+{
+    if (isInDiskList()) {
+        at_.disks.list().selectAll();
+        return;
+    }
+    completeLog();
+    at_.tabs.log()->selectAll(&at_.window);
+}
+
+void MenuCommands::undoClearing()
+{
+    at_.host.histories().restoreCleared();
+    at_.disks.list().synchronize();
+    update_();
+}
+
+// The whole disk that is selected, or that is in the selected image, where a map can be treated.
+std::shared_ptr<Disk> MenuCommands::diskWithMap()
+{
+    const auto disks = at_.disks.selected();
+    if (disks.size() != 1 || isLocked() || at_.tabs.active() == nullptr)
+        return nullptr;
+    const auto whole =
+        disks.front()->isOfflineDiskImage() ? disks.front()->contents() : disks.front();
+    const bool hasMap = whole && whole->isWhole() && !whole->hasGone() &&
+                        at_.library.reasonAgainstPartitionMap(*whole->theKRDisk()).empty();
+    return hasMap ? whole : nullptr;
+}
+
+// The module takes the map of what is selected as a whole disk, as it does with a device; of an
+// image it takes the volumes.
+void MenuCommands::treatMap(const char* button)
+{
+    at_.controller.setSelection({diskWithMap()});
+    at_.tabs.active()->tellOfSelection();
+    if (QtButton* const control = at_.tabs.button(button))
+        control->press();
+    if (isLocked())
+        return;  // until the job is over
+    at_.controller.setSelection({});
+    update_();
+}
+
+}  // namespace orvane::desktop

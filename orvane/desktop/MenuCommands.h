@@ -1,0 +1,68 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/DiskPane.h"
+#include "orvane/desktop/ModuleTabs.h"
+#include "orvane/desktop/window/Menus.h"
+
+#include <functional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace orvane::desktop {
+
+/// Whether the user agrees that archives of packages are fetched over the network.
+[[nodiscard]] bool fetchesArchives(SupportHost& host);
+
+/// What the window's menus do. Main thread.
+class MenuCommands {
+public:
+    /// All outlive this object.
+    struct Surroundings {
+        DesktopHost& host;
+        MainWindow& window;
+        WindowController& controller;
+        ModuleTabs& tabs;
+        DiskPane& disks;
+        const pellar::Manager& library;
+    };
+
+    /// `update` shows what a command has changed.
+    MenuCommands(const Surroundings& surroundings, std::function<void()> update)
+        : at_(surroundings), update_(std::move(update))
+    {
+    }
+    MenuCommands(const MenuCommands&) = delete;
+    MenuCommands& operator=(const MenuCommands&) = delete;
+
+    /// Gives the window its menus, and the list of disks one of them as its own.
+    void addMenus();
+
+private:
+    std::vector<Menu> menus();
+    std::vector<MenuCommand> fileCommands();
+    std::vector<MenuCommand> editCommands();
+    MenuCommand detailsCommand();
+    MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
+                            DiskAction action);
+    MenuCommand buttonCommand(const char* objectName, std::string_view title, const char* button);
+    MenuCommand mapCommand(const char* objectName, std::string_view title, const char* button);
+
+    bool isLocked() const { return at_.controller.interfaceLock(); }
+    void chooseImages(std::string_view title,
+                      const std::function<void(const std::vector<std::string>&)>& chosen);
+    void print();
+    bool canEdit(contract::Selector action);
+    void completeLog();
+    bool isInDiskList() const;
+    void selectAll();
+    void undoClearing();
+    std::shared_ptr<Disk> diskWithMap();
+    void treatMap(const char* button);
+
+    const Surroundings at_;
+    const std::function<void()> update_;
+};
+
+}  // namespace orvane::desktop

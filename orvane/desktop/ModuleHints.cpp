@@ -1,0 +1,138 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/ModuleHints.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+#include "orvane/jobs/UnavailableReason.h"
+
+#include <algorithm>
+#include <iterator>
+#include <utility>
+
+namespace orvane::desktop {
+namespace {
+
+// The module puts its reason behind what the button does.
+std::string reasonOfModule(const QtButton& button)
+{
+    const std::string& toolTip = button.toolTip();
+    const std::size_t at = toolTip.find("\n\n");
+    return at == std::string::npos ? std::string() : toolTip.substr(at + 2);
+}
+
+bool isForPermissions(std::string_view button)
+{
+    return button.find("Permissions") != std::string_view::npos;
+}
+
+}  // namespace
+
+// The reasons are posted, because the module says what it has to say in the meantime; and once for
+// all that happens in one turn.
+void ModuleHints::refresh()
+{
+    tellEmptyText();
+    if (std::exchange(isAwaited_, true))
+        return;
+    host_.mainRunLoop().post([this] {
+        isAwaited_ = false;
+        tellReasons();
+        tellEmptyText();
+    });
+}
+
+void ModuleHints::tellEmptyText()
+{
+    LoadedInterface* const controls = tabs_.interface();
+    if (controls != nullptr && controls->emptyNote() != nullptr)
+        controls->emptyNote()->tell(toQt(emptyText()));
+}
+
+void ModuleHints::tellReasons()
+{
+    if (!window_.hasAttention() || tabs_.active() == nullptr)
+        return;
+    const auto disks = window_.disks().selectedDisks();
+    const bool isLocked = controller_.interfaceLock();
+    const auto reasons = !isLocked && disks.size() > 1 ? reasonsByDisk()
+                                                       : std::map<std::string, std::string>();
+    for (const char* const name : actionButtons)
+        if (QtButton* const button = tabs_.button(name)) {
+            if (isLocked)
+                button->setReason(text("Not available while a job runs."));
+            else if (disks.empty())
+                button->setReason(text("Select a disk first."));
+            else if (disks.size() == 1)
+                button->setReason(reasonFor(*disks.front(), name));
+            else if (const auto found = reasons.find(name); found != reasons.end())
+                button->setReason(found->second);
+        }
+    if (QtButton* const clear = tabs_.button("clearHistoryButton"))
+        clear->setReason(text(isLocked ? "Not available while a job runs."
+                                       : "There is no history to clear."));
+}
+
+// Why the button is grey for the disk that is selected, where the module gives no reason.
+std::string ModuleHints::reasonFor(const Disk& disk, std::string_view button)
+{
+    QtButton* const control = tabs_.button(button);
+    if (control == nullptr || !reasonOfModule(*control).empty())
+        return {};
+    std::string reason = whyUnavailable(disk, library_, host_.translator());
+    if (reason.empty() && disk.facts().type == diskType::whole && isForPermissions(button))
+        reason = text("Not available because a whole disk has no permissions; its volumes have.");
+    else if (reason.empty() && disk.facts().type == diskType::whole)
+        reason = library_.reasonAgainstPartitionMap(*disk.theKRDisk());
+    return reason.empty() ? text("Not available for this disk.") : reason;
+}
+
+// For several disks a module says that it is because of one of them. Each is asked about alone.
+std::map<std::string, std::string> ModuleHints::reasonsByDisk()
+{
+    constexpr std::size_t mostAsked = 32;
+    std::map<std::string, std::string> reasons;
+    const auto isGrey = [this](const char* name) {
+        QtButton* const button = tabs_.button(name);
+        return button != nullptr && !button->isEnabled();
+    };
+    std::vector<const char*> grey;
+    std::copy_if(actionButtons.begin(), actionButtons.end(), std::back_inserter(grey), isGrey);
+    const auto disks = window_.disks().selectedDisks();
+    if (grey.empty() || disks.size() > mostAsked)
+        return reasons;
+    for (const auto& disk : disks) {
+        controller_.setSelection({disk});
+        tabs_.active()->tellOfSelection();
+        for (const char* const name : grey) {
+            if (!isGrey(name))
+                continue;
+            const std::string own = reasonOfModule(*tabs_.button(name));
+            const std::string why = own.empty() ? reasonFor(*disk, name) : own;
+            reasons[name] += (reasons[name].empty() ? "" : "\n") +
+                             host_.translator().sentence("“%@”: %@", {disk->displayName(), why});
+        }
+    }
+    controller_.setSelection({});
+    tabs_.active()->tellOfSelection();
+    return reasons;
+}
+
+// Nothing where the module's own words fit: when no disk is selected.
+std::string ModuleHints::emptyText()
+{
+    const auto disks = window_.disks().selectedDisks();
+    if (controller_.interfaceLock())
+        return text("A job runs. There is no history of what is selected.");
+    if (disks.empty())
+        return {};
+    if (disks.size() == 1)
+        if (const std::string why = whyUnavailable(*disks.front(), library_, host_.translator());
+            !why.empty())
+            return why;
+    const QtButton* const verify = tabs_.button("verifyDiskButton");
+    if (verify == nullptr || !verify->isEnabled())
+        return text("There is no history of what is selected.");
+    return host_.translator().sentence(
+        "There is no history of what is selected. Click %@ to check it.", {verify->title()});
+}
+
+}  // namespace orvane::desktop

@@ -1,0 +1,44 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/desktop/ModuleTabs.h"
+
+#include <map>
+#include <string>
+#include <string_view>
+
+namespace orvane::desktop {
+
+/// What the window says beside the modules: why a button is grey, and why a log is empty. Main
+/// thread.
+class ModuleHints {
+public:
+    /// All outlive this object.
+    ModuleHints(DesktopHost& host, MainWindow& window, WindowController& controller,
+                ModuleTabs& tabs, const pellar::Manager& library)
+        : host_(host), window_(window), controller_(controller), tabs_(tabs), library_(library)
+    {
+    }
+    ModuleHints(const ModuleHints&) = delete;
+    ModuleHints& operator=(const ModuleHints&) = delete;
+
+    /// After whatever changes what can be done, or what there is to be seen.
+    void refresh();
+
+private:
+    void tellEmptyText();
+    void tellReasons();
+    std::string reasonFor(const Disk& disk, std::string_view button);
+    std::map<std::string, std::string> reasonsByDisk();
+    std::string emptyText();
+    std::string text(std::string_view key) { return host_.translator().text(key); }
+
+    DesktopHost& host_;
+    MainWindow& window_;
+    WindowController& controller_;
+    ModuleTabs& tabs_;
+    const pellar::Manager& library_;
+    bool isAwaited_ = false;
+};
+
+}  // namespace orvane::desktop

@@ -1,0 +1,206 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/ModuleTabs.h"
+
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QLabel>
+
+#include <algorithm>
+
+namespace orvane::desktop {
+
+Outcome<std::unique_ptr<ModuleTab>> ModuleTab::load(const std::filesystem::path& bundle,
+                                                    const Surroundings& surroundings)
+{
+    auto loaded = loadModule(bundle);
+    if (failed(loaded))
+        return Failure{failureMessage(loaded)};
+    auto tab = std::make_unique<ModuleTab>(surroundings, std::get<LoadedModule>(std::move(loaded)));
+    if (!shouldRun(tab->loaded_, surroundings.host))
+        return std::unique_ptr<ModuleTab>();
+    if (const auto made = tab->makeModule(); failed(made))
+        return Failure{failureMessage(made)};
+    return tab;
+}
+
+ModuleTab::ModuleTab(const Surroundings& surroundings, LoadedModule loaded)
+    : host_(surroundings.host),
+      window_(surroundings.window),
+      loaded_(std::move(loaded)),
+      libraryTexts_(host_.hostBundle().catalogue()),
+      library_(host_.mainRunLoop(), libraryTexts_, surroundings.libraryOptions)
+{
+    libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
+}
+
+ModuleTab::~ModuleTab()
+{
+    if (interface_ != nullptr && interface_->outlineView() != nullptr)
+        host_.printing().forget(*interface_->outlineView());
+}
+
+Outcome<> ModuleTab::makeModule()
+{
+    const LoadedInterface* const before = host_.interfaceLoader().latest();
+    host_.interfaceLoader().setBundle(*loaded_.bundle);
+    auto made = orvane::makeModule(loaded_, host_, *this);
+    if (failed(made))
+        return Failure{failureMessage(made)};
+    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
+    if (LoadedInterface* const latest = host_.interfaceLoader().latest(); latest != before)
+        interface_ = latest;
+    library_.setDelegate(module_->asyncDelegate());
+    return Done{};
+}
+
+contract::OVDiskPointer ModuleTab::workingDisk() const
+{
+    const auto selected = window_.allSelectedItemsFilterDuplicates(false, true);
+    return selected.empty() ? nullptr : selected.front();
+}
+
+void ModuleTab::tellOfSelection()
+{
+    module_->windowChangedNotication({contract::OVDiskChangedNotification, nullptr, {}});
+}
+
+void ModuleTab::deliver(const contract::Notification& notification)
+{
+    module_->diskChangedHandler(&notification);
+}
+
+bool ModuleTab::isOffered()
+{
+    const auto selected = window_.allSelectedItemsFilterDuplicates(false, true);
+    return selected.empty() ||
+           std::any_of(selected.begin(), selected.end(), [this](const auto& disk) {
+               return module_->displayPanelForDiskTypeAndDisk(disk->diskType(), disk);
+           });
+}
+
+bool ModuleTab::stopJob()
+{
+    if (interface_ == nullptr)
+        return false;
+    for (const char* const name : actionButtons) {
+        QtButton* const button = interface_->button(name);
+        if (button != nullptr && button->action() == "stopAction:" && button->isEnabled()) {
+            button->press();
+            return true;
+        }
+    }
+    return false;
+}
+
+void ModuleTabs::load(const std::vector<std::filesystem::path>& bundles,
+                      const pellar::ManagerOptions& libraryOptions, const WarningSink& warn)
+{
+    std::string switchedOff;
+    for (const std::filesystem::path& bundle : bundles) {
+        auto tab = ModuleTab::load(bundle, {host_, controller_, libraryOptions});
+        if (failed(tab))
+            warn(failureMessage(tab));
+        else if (std::get<std::unique_ptr<ModuleTab>>(tab))
+            add(std::get<std::unique_ptr<ModuleTab>>(std::move(tab)));
+        else
+            switchedOff += (switchedOff.empty() ? "" : ", ") + bundle.stem().string();
+    }
+    if (tabs_.empty())
+        addEmptyTab(switchedOff);
+}
+
+void ModuleTabs::addEmptyTab(const std::string& switchedOff)
+{
+    const Translator& texts = host_.translator();
+    auto* const label = new QLabel(
+        toQt(switchedOff.empty()
+                 ? texts.text("No module is installed that could work on disks.")
+                 : texts.sentence("%@ is switched off in the settings.", {switchedOff})));
+    label->setTextFormat(Qt::PlainText);
+    label->setAlignment(Qt::AlignCenter);
+    label->setWordWrap(true);
+    window_.tabs().addTab(label, toQtTitle(texts.text("No Modules")));
+}
+
+void ModuleTabs::add(std::unique_ptr<ModuleTab> tab)
+{
+    const auto order = [](const std::unique_ptr<ModuleTab>& other) {
+        return other->module().tabOrder().integer();
+    };
+    const auto place = std::find_if(tabs_.begin(), tabs_.end(),
+                                    [&](const auto& other) { return order(other) > order(tab); });
+    QWidget* const page =
+        tab->interface() != nullptr ? &tab->interface()->widget() : new QWidget(&window_);
+    window_.tabs().insertTab(static_cast<int>(place - tabs_.begin()), page,
+                             toQtTitle(tab->module().displayName()));
+    if (tab->interface() != nullptr)
+        tab->interface()->setBeforeAction(
+            [this](std::string_view action) { lastAction_ = action; });
+    tabs_.insert(place, std::move(tab));
+}
+
+ModuleTab* ModuleTabs::active()
+{
+    const auto current = static_cast<std::size_t>(window_.tabs().currentIndex());
+    return current < tabs_.size() ? tabs_[current].get() : nullptr;
+}
+
+// Which tab is shown is settled first: a module that hears of the selection asks.
+void ModuleTabs::update()
+{
+    for (const auto& tab : tabs_)
+        tab->setActive(tab.get() == active());
+    if (ModuleTab* const tab = active())
+        tab->tellOfSelection();
+}
+
+void ModuleTabs::offer()
+{
+    for (std::size_t i = 0; i < tabs_.size(); ++i)
+        window_.tabs().setTabEnabled(static_cast<int>(i), tabs_[i]->isOffered());
+}
+
+void ModuleTabs::stopJob()
+{
+    const bool isStopped = std::any_of(tabs_.begin(), tabs_.end(),
+                                       [](const auto& tab) { return tab->stopJob(); });
+    if (!isStopped)
+        stopHarder();
+}
+
+void ModuleTabs::stopHarder()
+{
+    for (const auto& tab : tabs_)
+        tab->stopHarder();
+}
+
+LoadedInterface* ModuleTabs::interface()
+{
+    ModuleTab* const tab = active();
+    return tab != nullptr ? tab->interface() : nullptr;
+}
+
+QtButton* ModuleTabs::button(std::string_view outlet)
+{
+    LoadedInterface* const controls = interface();
+    return controls != nullptr ? controls->button(outlet) : nullptr;
+}
+
+contract::OutlineView* ModuleTabs::log()
+{
+    LoadedInterface* const controls = interface();
+    return controls != nullptr ? controls->outlineView() : nullptr;
+}
+
+void ModuleTabs::reloadLog()
+{
+    if (log() != nullptr)
+        interface()->outlinePeer()->reloadData();
+}
+
+std::string ModuleTabs::selectedLogHTML()
+{
+    return log() != nullptr ? interface()->outlinePeer()->selectionHTML() : std::string();
+}
+
+}  // namespace orvane::desktop
