@@ -21,12 +21,15 @@ DesktopSession::DesktopSession(SessionOptions options)
       tabs_(host_, window_, controller_),
       disks_(host_, loop_, window_.disks(), ledger_, options_.disksToOpen,
              options_.scansSystemDisks,
-             {[this] { selectionChanged(); }, [this] { hints_.refresh(); }}),
-      hints_(host_, window_, controller_, tabs_, library_),
-      closer_(host_, window_, controller_, tabs_, ledger_, options_.closed),
-      jobs_({host_, window_, controller_, tabs_, disks_, ledger_, closer_}, options_.buses,
-            options_.longestGlanceAway, [this] { update(); }),
-      commands_({host_, window_, controller_, tabs_, disks_, library_}, [this] { update(); })
+             {[this] { selectionChanged(); },
+              [this] {
+                  hints_.refresh();
+              }}),
+      hints_(parts(), library_),
+      closer_(parts(), options_.closed),
+      jobs_(parts(), disks_, closer_, options_.buses, options_.longestGlanceAway,
+            [this] { update(); }),
+      commands_(parts(), disks_, library_, [this] { update(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
@@ -138,7 +141,9 @@ void DesktopSession::connectWindow()
                                else
                                    closer_.jobEnded();
                            },
-                           [this](const contract::Dictionary& report) { jobs_.reported(report); }});
+                           [this](const contract::Dictionary& report) {
+                               jobs_.reported(report);
+                           }});
 }
 
 void DesktopSession::update()

@@ -46,6 +46,7 @@ public:
     ModuleTab* activeTab() { return tabs_.active(); }
 
 private:
+    SessionParts parts() { return {host_, window_, controller_, tabs_, ledger_}; }
     SupportOptions supportOptions();
     pellar::ManagerOptions libraryOptions();
     JobLedger::Events ledgerEvents();

@@ -72,10 +72,12 @@ DiskPane::DiskPane(DesktopHost& host, HostLoop& loop, DiskList& list, const JobL
       model_(host.sharedDiskController(), states(), host.translator()),
       images_(host, {[this](const Disk& disk) { list_.select(disk); },
                      [this](const std::vector<std::string>& sentences) {
-                         host_.showSheet(
-                             host_.translator().text("Not everything could be opened."), sentences);
+                         host_.showSheet(host_.translator().text("Not everything could be opened."),
+                                         sentences);
                      },
-                     [this] { synchronize(); }}),
+                     [this] {
+                         synchronize();
+                     }}),
       scan_(loop, [this](const std::vector<DiskTree>& disks) { adoptDisks(disks); }),
       watch_(loop, [this] { scan_.start(); })
 {
@@ -158,9 +160,8 @@ void DiskPane::release()
         events_.selectionChanged();
     }
     const auto disks = selected();
-    const bool mayHaveWritten = std::any_of(disks.begin(), disks.end(), [](const auto& disk) {
-        return !ImageOpener::canEject(*disk);
-    });
+    const bool mayHaveWritten = std::any_of(
+        disks.begin(), disks.end(), [](const auto& disk) { return !ImageOpener::canEject(*disk); });
     // A label or a size may be another one, and no event need have told what a repair has written.
     if (mayHaveWritten && scansSystemDisks_)
         scan_.start();

@@ -17,9 +17,12 @@ constexpr std::string_view reportOfFailure = "kOVOP_FailKey";
 
 }  // namespace
 
-JobWatch::JobWatch(const Surroundings& surroundings, const SessionBuses& buses,
-                   std::chrono::milliseconds glance, std::function<void()> updated)
-    : at_(surroundings),
+JobWatch::JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& closer,
+                   const SessionBuses& buses, std::chrono::milliseconds glance,
+                   std::function<void()> updated)
+    : at_(parts),
+      disks_(disks),
+      closer_(closer),
       longestGlanceAway_(glance),
       updated_(std::move(updated)),
       wakefulness_(buses.system),
@@ -42,9 +45,9 @@ void JobWatch::lockChanged(bool isLocked)
 
 void JobWatch::begin()
 {
-    job_ = {at_.tabs.lastAction(), at_.disks.selected()};
+    job_ = {at_.tabs.lastAction(), disks_.selected()};
     // What the modules see as selected when the window is locked is what the job works on.
-    at_.disks.hold(at_.controller.allSelectedItemsFilterDuplicates(false, true));
+    disks_.hold(at_.controller.allSelectedItemsFilterDuplicates(false, true));
 }
 
 void JobWatch::reported(const contract::Dictionary& report)
@@ -61,9 +64,9 @@ void JobWatch::runBegan(const StartedRun& run)
     else
         wakefulness_.release();
     job_.reached.insert(run.identifier);
-    at_.disks.list().synchronize();
-    if (at_.closer.isEnding())
-        at_.closer.stopAndClose();
+    disks_.list().synchronize();
+    if (closer_.isEnding())
+        closer_.stopAndClose();
     else if (job_.isStopAsked)
         at_.host.mainRunLoop().post([this] { at_.tabs.stopJob(); });
 }
@@ -71,7 +74,7 @@ void JobWatch::runBegan(const StartedRun& run)
 void JobWatch::runEnded(const StartedRun& run, const RunEnd& end)
 {
     job_.runs.push_back({run, end});
-    at_.disks.list().synchronize();
+    disks_.list().synchronize();
 }
 
 // While the job's images are attached, the module has no tool to stop: it has forgotten what it
@@ -90,7 +93,7 @@ void JobWatch::end()
     const auto length = std::chrono::steady_clock::now() - job_.start;
     const auto runs = std::exchange(job_.runs, {});
     const bool isActive = QApplication::activeWindow() != nullptr;
-    if (!runs.empty() && !at_.closer.isEnding() &&
+    if (!runs.empty() && !closer_.isEnding() &&
         isWorthANotice(length, isActive, longestGlanceAway_))
         notifier_.show(noticeOf(runs, at_.host.translator()));
     // Posted, because the module has not finished with the job when it gives the window free.
@@ -101,14 +104,14 @@ void JobWatch::lookBack()
 {
     if (at_.controller.interfaceLock())
         return;  // the next job has begun
-    at_.disks.release();
+    disks_.release();
     at_.controller.setSelection({});
-    const bool isGivenUp = job_.isStopAsked || at_.closer.isEnding();
+    const bool isGivenUp = job_.isStopAsked || closer_.isEnding();
     auto sentences = isGivenUp ? std::vector<std::string>() : keepUnreachedImages();
     if (job_.hasFailed && !job_.isStopAsked && sentences.empty() && job_.reached.empty())
         sentences.push_back(text("Nothing that is selected could be checked."));
-    at_.disks.refresh(job_.disks);
-    at_.disks.list().synchronize();
+    disks_.refresh(job_.disks);
+    disks_.list().synchronize();
     updated_();
     at_.host.showSheet(text("Not everything could be checked."), sentences);
 }

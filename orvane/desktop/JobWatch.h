@@ -19,21 +19,12 @@ namespace orvane::desktop {
 /// job is all that is done while the window is locked, be it on one disk or on many. Main thread.
 class JobWatch {
 public:
-    /// All outlive this object.
-    struct Surroundings {
-        DesktopHost& host;
-        MainWindow& window;
-        WindowController& controller;
-        ModuleTabs& tabs;
-        DiskPane& disks;
-        const JobLedger& ledger;
-        WindowCloser& closer;
-    };
-
-    /// The desktop is told of the end of a job that took longer than `glance`. `updated` is called
-    /// when the window has been brought up to date after a job.
-    JobWatch(const Surroundings& surroundings, const SessionBuses& buses,
-             std::chrono::milliseconds glance, std::function<void()> updated);
+    /// The disks and the closer outlive this object. The desktop is told of the end of a job that
+    /// took longer than `glance`. `updated` is called when the window has been brought up to date
+    /// after a job.
+    JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& closer,
+             const SessionBuses& buses, std::chrono::milliseconds glance,
+             std::function<void()> updated);
     JobWatch(const JobWatch&) = delete;
     JobWatch& operator=(const JobWatch&) = delete;
 
@@ -66,7 +57,9 @@ private:
         bool hasFailed = false;  ///< by the module's own report
     };
 
-    const Surroundings at_;
+    const SessionParts at_;
+    DiskPane& disks_;
+    WindowCloser& closer_;
     const std::chrono::milliseconds longestGlanceAway_;
     const std::function<void()> updated_;
     SleepInhibitor wakefulness_;

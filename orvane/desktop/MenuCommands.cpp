@@ -27,7 +27,7 @@ bool fetchesArchives(SupportHost& host)
 void MenuCommands::addMenus()
 {
     desktop::addMenus(at_.window, menus(), at_.host.translator());
-    DiskList& list = at_.disks.list();
+    DiskList& list = disks_.list();
     list.setContextMenuPolicy(Qt::CustomContextMenu);
     QObject::connect(
         &list, &QWidget::customContextMenuRequested, &at_.window,
@@ -57,11 +57,11 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
         return !isLocked();
     };
     const auto open = [this] {
-        chooseImages("Open Image", [this](const auto& names) { at_.disks.open(names); });
+        chooseImages("Open Image", [this](const auto& names) { disks_.open(names); });
     };
     const auto attach = [this] {
         chooseImages("Attach Image as Device",
-                     [this](const auto& names) { at_.disks.attachAsDevices(names); });
+                     [this](const auto& names) { disks_.attachAsDevices(names); });
     };
     const auto canPrint = [this] {
         return at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
@@ -69,7 +69,7 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
     return {
         {"openImage", "&Open Image…", QKeySequence::Open, open, isFree},
         {"attachImage", "&Attach Image as Device…", {}, attach, isFree},
-        {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { at_.disks.rescan(); }, isFree},
+        {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }, isFree},
         diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
         diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U), DiskAction::Unmount),
         diskCommand("eject", "&Eject", QKeySequence(Qt::CTRL | Qt::Key_E), DiskAction::Eject),
@@ -123,7 +123,9 @@ MenuCommand MenuCommands::detailsCommand()
     const auto button = [this] {
         return at_.tabs.button("showDetailsButton");
     };
-    return {"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
+    return {"showDetails",
+            "Show &Details",
+            QKeySequence(Qt::CTRL | Qt::Key_D),
             [button] { button()->press(); },
             [button] { return button() != nullptr && button()->isEnabled(); },
             [button] {
@@ -136,9 +138,9 @@ MenuCommand MenuCommands::diskCommand(const char* objectName, std::string_view t
 {
     // While a job runs, the disks are its own.
     return {objectName, title, std::move(shortcut),
-            [this, action] { at_.disks.doToSelection(action); },
+            [this, action] { disks_.doToSelection(action); },
             [this, action] {
-                return !isLocked() && at_.disks.canDo(action);
+                return !isLocked() && disks_.canDo(action);
             }};
 }
 
@@ -167,8 +169,8 @@ MenuCommand MenuCommands::mapCommand(const char* objectName, std::string_view ti
             }};
 }
 
-void MenuCommands::chooseImages(
-    std::string_view title, const std::function<void(const std::vector<std::string>&)>& chosen)
+void MenuCommands::chooseImages(std::string_view title,
+                                const std::function<void(const std::vector<std::string>&)>& chosen)
 {
     const Translator& texts = at_.host.translator();
     auto* const dialog = new QFileDialog(&at_.window, toQt(texts.text(title)));
@@ -209,13 +211,13 @@ void MenuCommands::completeLog()
 // which knows it also while its menu is open.
 bool MenuCommands::isInDiskList() const
 {
-    return at_.window.focusWidget() == &at_.disks.list();
+    return at_.window.focusWidget() == &disks_.list();
 }
 
 void MenuCommands::selectAll()
 {
     if (isInDiskList()) {
-        at_.disks.list().selectAll();
+        disks_.list().selectAll();
         return;
     }
     completeLog();
@@ -225,20 +227,20 @@ void MenuCommands::selectAll()
 void MenuCommands::undoClearing()
 {
     at_.host.histories().restoreCleared();
-    at_.disks.list().synchronize();
+    disks_.list().synchronize();
     update_();
 }
 
 // The whole disk that is selected, or that is in the selected image, where a map can be treated.
 std::shared_ptr<Disk> MenuCommands::diskWithMap()
 {
-    const auto disks = at_.disks.selected();
+    const auto disks = disks_.selected();
     if (disks.size() != 1 || isLocked() || at_.tabs.active() == nullptr)
         return nullptr;
     const auto whole =
         disks.front()->isOfflineDiskImage() ? disks.front()->contents() : disks.front();
     const bool hasMap = whole && whole->isWhole() && !whole->hasGone() &&
-                        at_.library.reasonAgainstPartitionMap(*whole->theKRDisk()).empty();
+                        library_.reasonAgainstPartitionMap(*whole->theKRDisk()).empty();
     return hasMap ? whole : nullptr;
 }
 

@@ -18,19 +18,10 @@ namespace orvane::desktop {
 /// What the window's menus do. Main thread.
 class MenuCommands {
 public:
-    /// All outlive this object.
-    struct Surroundings {
-        DesktopHost& host;
-        MainWindow& window;
-        WindowController& controller;
-        ModuleTabs& tabs;
-        DiskPane& disks;
-        const pellar::Manager& library;
-    };
-
-    /// `update` shows what a command has changed.
-    MenuCommands(const Surroundings& surroundings, std::function<void()> update)
-        : at_(surroundings), update_(std::move(update))
+    /// The disks and the library outlive this object. `update` shows what a command has changed.
+    MenuCommands(const SessionParts& parts, DiskPane& disks, const pellar::Manager& library,
+                 std::function<void()> update)
+        : at_(parts), disks_(disks), library_(library), update_(std::move(update))
     {
     }
     MenuCommands(const MenuCommands&) = delete;
@@ -61,7 +52,9 @@ private:
     std::shared_ptr<Disk> diskWithMap();
     void treatMap(const char* button);
 
-    const Surroundings at_;
+    const SessionParts at_;
+    DiskPane& disks_;
+    const pellar::Manager& library_;
     const std::function<void()> update_;
 };
 

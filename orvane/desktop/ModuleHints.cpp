@@ -33,7 +33,7 @@ void ModuleHints::refresh()
     tellEmptyText();
     if (std::exchange(isAwaited_, true))
         return;
-    host_.mainRunLoop().post([this] {
+    at_.host.mainRunLoop().post([this] {
         isAwaited_ = false;
         tellReasons();
         tellEmptyText();
@@ -42,21 +42,21 @@ void ModuleHints::refresh()
 
 void ModuleHints::tellEmptyText()
 {
-    LoadedInterface* const controls = tabs_.interface();
+    LoadedInterface* const controls = at_.tabs.interface();
     if (controls != nullptr && controls->emptyNote() != nullptr)
         controls->emptyNote()->tell(toQt(emptyText()));
 }
 
 void ModuleHints::tellReasons()
 {
-    if (!window_.hasAttention() || tabs_.active() == nullptr)
+    if (!at_.window.hasAttention() || at_.tabs.active() == nullptr)
         return;
-    const auto disks = window_.disks().selectedDisks();
-    const bool isLocked = controller_.interfaceLock();
-    const auto reasons = !isLocked && disks.size() > 1 ? reasonsByDisk()
-                                                       : std::map<std::string, std::string>();
+    const auto disks = at_.window.disks().selectedDisks();
+    const bool isLocked = at_.controller.interfaceLock();
+    const auto reasons =
+        !isLocked && disks.size() > 1 ? reasonsByDisk() : std::map<std::string, std::string>();
     for (const char* const name : actionButtons)
-        if (QtButton* const button = tabs_.button(name)) {
+        if (QtButton* const button = at_.tabs.button(name)) {
             if (isLocked)
                 button->setReason(text("Not available while a job runs."));
             else if (disks.empty())
@@ -66,18 +66,18 @@ void ModuleHints::tellReasons()
             else if (const auto found = reasons.find(name); found != reasons.end())
                 button->setReason(found->second);
         }
-    if (QtButton* const clear = tabs_.button("clearHistoryButton"))
-        clear->setReason(text(isLocked ? "Not available while a job runs."
-                                       : "There is no history to clear."));
+    if (QtButton* const clear = at_.tabs.button("clearHistoryButton"))
+        clear->setReason(
+            text(isLocked ? "Not available while a job runs." : "There is no history to clear."));
 }
 
 // Why the button is grey for the disk that is selected, where the module gives no reason.
 std::string ModuleHints::reasonFor(const Disk& disk, std::string_view button)
 {
-    QtButton* const control = tabs_.button(button);
+    QtButton* const control = at_.tabs.button(button);
     if (control == nullptr || !reasonOfModule(*control).empty())
         return {};
-    std::string reason = whyUnavailable(disk, library_, host_.translator());
+    std::string reason = whyUnavailable(disk, library_, at_.host.translator());
     if (reason.empty() && disk.facts().type == diskType::whole && isForPermissions(button))
         reason = text("Not available because a whole disk has no permissions; its volumes have.");
     else if (reason.empty() && disk.facts().type == diskType::whole)
@@ -91,47 +91,47 @@ std::map<std::string, std::string> ModuleHints::reasonsByDisk()
     constexpr std::size_t mostAsked = 32;
     std::map<std::string, std::string> reasons;
     const auto isGrey = [this](const char* name) {
-        QtButton* const button = tabs_.button(name);
+        QtButton* const button = at_.tabs.button(name);
         return button != nullptr && !button->isEnabled();
     };
     std::vector<const char*> grey;
     std::copy_if(actionButtons.begin(), actionButtons.end(), std::back_inserter(grey), isGrey);
-    const auto disks = window_.disks().selectedDisks();
+    const auto disks = at_.window.disks().selectedDisks();
     if (grey.empty() || disks.size() > mostAsked)
         return reasons;
     for (const auto& disk : disks) {
-        controller_.setSelection({disk});
-        tabs_.active()->tellOfSelection();
+        at_.controller.setSelection({disk});
+        at_.tabs.active()->tellOfSelection();
         for (const char* const name : grey) {
             if (!isGrey(name))
                 continue;
-            const std::string own = reasonOfModule(*tabs_.button(name));
+            const std::string own = reasonOfModule(*at_.tabs.button(name));
             const std::string why = own.empty() ? reasonFor(*disk, name) : own;
             reasons[name] += (reasons[name].empty() ? "" : "\n") +
-                             host_.translator().sentence("“%@”: %@", {disk->displayName(), why});
+                             at_.host.translator().sentence("“%@”: %@", {disk->displayName(), why});
         }
     }
-    controller_.setSelection({});
-    tabs_.active()->tellOfSelection();
+    at_.controller.setSelection({});
+    at_.tabs.active()->tellOfSelection();
     return reasons;
 }
 
 // Nothing where the module's own words fit: when no disk is selected.
 std::string ModuleHints::emptyText()
 {
-    const auto disks = window_.disks().selectedDisks();
-    if (controller_.interfaceLock())
+    const auto disks = at_.window.disks().selectedDisks();
+    if (at_.controller.interfaceLock())
         return text("A job runs. There is no history of what is selected.");
     if (disks.empty())
         return {};
     if (disks.size() == 1)
-        if (const std::string why = whyUnavailable(*disks.front(), library_, host_.translator());
+        if (const std::string why = whyUnavailable(*disks.front(), library_, at_.host.translator());
             !why.empty())
             return why;
-    const QtButton* const verify = tabs_.button("verifyDiskButton");
+    const QtButton* const verify = at_.tabs.button("verifyDiskButton");
     if (verify == nullptr || !verify->isEnabled())
         return text("There is no history of what is selected.");
-    return host_.translator().sentence(
+    return at_.host.translator().sentence(
         "There is no history of what is selected. Click %@ to check it.", {verify->title()});
 }
 

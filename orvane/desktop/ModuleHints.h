@@ -13,10 +13,9 @@ namespace orvane::desktop {
 /// thread.
 class ModuleHints {
 public:
-    /// All outlive this object.
-    ModuleHints(DesktopHost& host, MainWindow& window, WindowController& controller,
-                ModuleTabs& tabs, const pellar::Manager& library)
-        : host_(host), window_(window), controller_(controller), tabs_(tabs), library_(library)
+    /// The library outlives this object.
+    ModuleHints(const SessionParts& parts, const pellar::Manager& library)
+        : at_(parts), library_(library)
     {
     }
     ModuleHints(const ModuleHints&) = delete;
@@ -31,12 +30,9 @@ private:
     std::string reasonFor(const Disk& disk, std::string_view button);
     std::map<std::string, std::string> reasonsByDisk();
     std::string emptyText();
-    std::string text(std::string_view key) { return host_.translator().text(key); }
+    std::string text(std::string_view key) { return at_.host.translator().text(key); }
 
-    DesktopHost& host_;
-    MainWindow& window_;
-    WindowController& controller_;
-    ModuleTabs& tabs_;
+    const SessionParts at_;
     const pellar::Manager& library_;
     bool isAwaited_ = false;
 };

@@ -162,8 +162,8 @@ void ModuleTabs::offer()
 
 void ModuleTabs::stopJob()
 {
-    const bool isStopped = std::any_of(tabs_.begin(), tabs_.end(),
-                                       [](const auto& tab) { return tab->stopJob(); });
+    const bool isStopped =
+        std::any_of(tabs_.begin(), tabs_.end(), [](const auto& tab) { return tab->stopJob(); });
     if (!isStopped)
         stopHarder();
 }

@@ -3,6 +3,7 @@
 
 #include "orvane/desktop/DesktopHost.h"
 #include "orvane/desktop/window/WindowController.h"
+#include "orvane/jobs/JobLedger.h"
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "pellar/Manager.h"
@@ -123,6 +124,15 @@ private:
     WindowController& controller_;
     std::vector<std::unique_ptr<ModuleTab>> tabs_;
     std::string lastAction_;
+};
+
+/// What the parts of a session work with; all outlive them.
+struct SessionParts {
+    DesktopHost& host;
+    MainWindow& window;
+    WindowController& controller;
+    ModuleTabs& tabs;
+    const JobLedger& ledger;
 };
 
 }  // namespace orvane::desktop

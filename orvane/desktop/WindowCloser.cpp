@@ -9,12 +9,12 @@ namespace orvane::desktop {
 
 bool WindowCloser::mayClose()
 {
-    if (controller_.interfaceLock()) {
+    if (at_.controller.interfaceLock()) {
         if (!isEnding_)
             askWhetherToStop();
         return false;
     }
-    window_.saveLayout(host_.standardUserDefaults());
+    at_.window.saveLayout(at_.host.standardUserDefaults());
     if (closed_)
         closed_();
     return true;
@@ -27,15 +27,15 @@ void WindowCloser::askWhetherToStop()
         question_->raise();
         return;
     }
-    const Translator& texts = host_.translator();
+    const Translator& texts = at_.host.translator();
     question_ = new QMessageBox(QMessageBox::Warning, toQt("Orvane"),
                                 toQt(texts.text("A disk is still being verified or repaired.")),
-                                QMessageBox::NoButton, &window_);
+                                QMessageBox::NoButton, &at_.window);
     question_->setObjectName(QStringLiteral("closingQuestion"));
     question_->setTextFormat(Qt::PlainText);
     question_->setInformativeText(
         toQt(texts.text("The job must be stopped before the window can be closed. A repair that is "
-                  "stopped may leave damage behind.")));
+                        "stopped may leave damage behind.")));
     question_->setWindowModality(Qt::WindowModal);
     question_->setAttribute(Qt::WA_DeleteOnClose);
     QPushButton* const stop =
@@ -44,7 +44,7 @@ void WindowCloser::askWhetherToStop()
         question_->addButton(toQtTitle(texts.text("Keep Open")), QMessageBox::RejectRole);
     question_->setDefaultButton(keep);
     question_->setEscapeButton(keep);
-    QObject::connect(stop, &QPushButton::clicked, &window_, [this] { stopAndClose(); });
+    QObject::connect(stop, &QPushButton::clicked, &at_.window, [this] { stopAndClose(); });
     question_->open();
 }
 
@@ -53,18 +53,18 @@ void WindowCloser::askWhetherToStop()
 void WindowCloser::stopAndClose()
 {
     isEnding_ = true;
-    host_.mainRunLoop().post([this] {
-        if (!controller_.interfaceLock())
-            window_.close();
-        else if (ledger_.currentRun() != nullptr)
-            tabs_.stopJob();
+    at_.host.mainRunLoop().post([this] {
+        if (!at_.controller.interfaceLock())
+            at_.window.close();
+        else if (at_.ledger.currentRun() != nullptr)
+            at_.tabs.stopJob();
     });
 }
 
 void WindowCloser::end()
 {
     if (isEnding_)
-        tabs_.stopHarder();
+        at_.tabs.stopHarder();
     stopAndClose();
 }
 
@@ -74,7 +74,7 @@ void WindowCloser::jobEnded()
     if (question_ != nullptr)
         question_->close();
     if (isEnding_)
-        host_.mainRunLoop().post([this] { window_.close(); });
+        at_.host.mainRunLoop().post([this] { at_.window.close(); });
 }
 
 }  // namespace orvane::desktop

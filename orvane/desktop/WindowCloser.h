@@ -2,7 +2,6 @@
 #pragma once
 
 #include "orvane/desktop/ModuleTabs.h"
-#include "orvane/jobs/JobLedger.h"
 
 #include <QMessageBox>
 #include <QPointer>
@@ -14,15 +13,9 @@ namespace orvane::desktop {
 /// How the window is closed while a job runs, and when none does. Main thread.
 class WindowCloser {
 public:
-    /// All but `closed`, which is told that the window is closed for good, outlive this object.
-    WindowCloser(DesktopHost& host, MainWindow& window, WindowController& controller,
-                 ModuleTabs& tabs, const JobLedger& ledger, std::function<void()> closed)
-        : host_(host),
-          window_(window),
-          controller_(controller),
-          tabs_(tabs),
-          ledger_(ledger),
-          closed_(std::move(closed))
+    /// `closed` is told that the window is closed for good.
+    WindowCloser(const SessionParts& parts, std::function<void()> closed)
+        : at_(parts), closed_(std::move(closed))
     {
     }
     WindowCloser(const WindowCloser&) = delete;
@@ -42,11 +35,7 @@ public:
 private:
     void askWhetherToStop();
 
-    DesktopHost& host_;
-    MainWindow& window_;
-    WindowController& controller_;
-    ModuleTabs& tabs_;
-    const JobLedger& ledger_;
+    const SessionParts at_;
     const std::function<void()> closed_;
     QPointer<QMessageBox> question_;
     bool isEnding_ = false;

@@ -47,7 +47,7 @@ contract::Dictionary headingOfError(const std::string& sentence)
          {contract::kFsckVerbosity, heading},
          {contract::Name("kOV_finalAttributedString_type"),
           contract::StyledText::make(sentence + "\n",
-                                    {contract::Font::boldSystem(points), red, {}})}});
+                                     {contract::Font::boldSystem(points), red, {}})}});
 }
 
 }  // namespace

@@ -18,8 +18,8 @@ public:
     /// A stop was asked for. There may be no job yet.
     virtual void stopWasAsked() {}
     /// Before the delegate hears of it. `result` has the result keys.
-    virtual void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
-                               const contract::Dictionary& result) = 0;
+    virtual void jobWillFinish(const contract::DiskReferencePointer& disk,
+                               contract::ErrorCode error, const contract::Dictionary& result) = 0;
 
 protected:
     ~JobObserver() = default;

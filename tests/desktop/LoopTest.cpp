@@ -75,22 +75,5 @@ TEST(QtLoop, ANestedEventLoopGoesOnWithTheTasksBehind)
     EXPECT_TRUE(QTest::qWaitFor([&] { return runsOn; }, longestWait));
 }
 
-TEST(QtLoop, AThreadThatWaitsIsLetGoWhenTheLoopEnds)
-{
-    auto loop = std::make_unique<QtLoop>();
-    std::atomic<bool> isAbout = false;
-    std::atomic<bool> wasLetGo = false;
-    std::jthread other([&] {
-        isAbout = true;
-        loop->performOnMainThread([] { FAIL() << "nobody runs the loop"; }, Wait::UntilDone);
-        wasLetGo = true;
-    });
-    while (!isAbout || !loop->hasTasks())
-        std::this_thread::yield();
-    loop.reset();
-    other.join();
-    EXPECT_TRUE(wasLetGo);
-}
-
 }  // namespace
 }  // namespace orvane::desktop::test

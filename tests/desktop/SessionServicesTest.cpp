@@ -21,17 +21,11 @@ protected:
 
     void openWithServices(const std::string& image)
     {
-        SessionOptions options;
-        options.paths = {directory_ / "config", directory_ / "state", directory_ / "cache",
-                         directory_ / "data"};
-        options.disksToOpen = {image};
-        options.scansSystemDisks = false;
-        options.buses = {bus_.lookup("session"), bus_.lookup("system")};
-        options.longestGlanceAway = std::chrono::milliseconds(0);
-        session_ = std::make_unique<DesktopSession>(std::move(options));
-        session_->show();
-        ASSERT_TRUE(
-            waitUntil([&] { return session_->host().sharedDiskController().roots().size() == 2; }));
+        SessionOptions wanted = options({image});
+        wanted.buses = {bus_.lookup("session"), bus_.lookup("system")};
+        wanted.longestGlanceAway = std::chrono::milliseconds(0);
+        openWith(std::move(wanted));
+        ASSERT_TRUE(waitUntil([&] { return !cell(image, DiskColumn::Name).empty(); }));
         select(image);
     }
 
@@ -44,22 +38,17 @@ TEST_F(SessionServicesTest, OnlyARepairKeepsTheMachineAwakeAndOnlyUntilItsEnd)
 {
     useEndlessTool();
     openWithServices(makeImage("a <b>"));
-    struct Case {
-        const char* button;
-        std::vector<QStringList> asked;
-    };
-    for (const Case& c : {Case{"verifyDiskButton", {}},
-                          Case{"repairDiskButton",
-                               {{QStringLiteral("sleep:shutdown:idle"), QStringLiteral("Orvane"),
-                                 QStringLiteral("Repairing “a <b>”"), QStringLiteral("block")}}}}) {
-        button(c.button).press();
+    for (const char* const name : {"verifyDiskButton", "repairDiskButton"}) {
+        const bool isRepair = name == std::string_view("repairDiskButton");
+        button(name).press();
         ASSERT_TRUE(waitUntil([&] { return logHolds("Pass 1") || logHolds("ing volume"); }));
-        EXPECT_TRUE(waitUntil([&] { return logind_->held() == int(c.asked.size()); })) << c.button;
-        EXPECT_EQ(logind_->asked, c.asked) << c.button;
-        button(c.button).press();
+        EXPECT_TRUE(waitUntil([&] { return logind_->held() == (isRepair ? 1 : 0); })) << name;
+        EXPECT_EQ(logind_->asked.size(), isRepair ? 1U : 0U) << name;
+        button(name).press();
         ASSERT_TRUE(waitForJob());
-        EXPECT_TRUE(waitUntil([&] { return logind_->held() == 0; })) << c.button;
+        EXPECT_TRUE(waitUntil([&] { return logind_->held() == 0; })) << name;
     }
+    EXPECT_EQ(logind_->asked.front().value(2), QStringLiteral("Repairing “a <b>”"));
 }
 
 TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWindow)
@@ -70,22 +59,17 @@ TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWi
             window().activateWindow();
         else
             window().hide();
-        ASSERT_TRUE(waitUntil(
-            [&] { return (QApplication::activeWindow() != nullptr) == isWatched; }));
+        ASSERT_TRUE(
+            waitUntil([&] { return (QApplication::activeWindow() != nullptr) == isWatched; }));
         button("verifyDiskButton").press();
         ASSERT_TRUE(waitForJob());
-        if (QMessageBox* const box = sheet())
-            box->close();
+        takeSheet();
     };
     verify(true);
     verify(false);
     ASSERT_TRUE(waitUntil([&] { return !notifications_->shown.empty(); }));
     ASSERT_EQ(notifications_->shown.size(), 1U) << "the first was watched";
-    const auto& shown = notifications_->shown.front();
-    EXPECT_EQ(shown.title, QStringLiteral("Verification of “a <b>”"));
-    EXPECT_TRUE(shown.body.contains(QStringLiteral("a &lt;b&gt;"))) << qPrintable(shown.body);
-    EXPECT_FALSE(shown.body.contains(QLatin1Char('<'))) << qPrintable(shown.body);
-
+    EXPECT_EQ(notifications_->shown.front().title, QStringLiteral("Verification of “a <b>”"));
     window().showMinimized();
     EXPECT_TRUE(waitUntil([&] {
         emit notifications_->ActionInvoked(7, QStringLiteral("default"));

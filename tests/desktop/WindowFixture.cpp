@@ -6,7 +6,6 @@
 
 #include <QAbstractButton>
 #include <QApplication>
-#include <QPainter>
 #include <QTest>
 
 #include <cstdlib>
@@ -65,19 +64,29 @@ void WindowFixture::TearDown()
     ::unsetenv("FIXWELL_TOOL_PATH");
 }
 
-void WindowFixture::open(const std::vector<std::string>& images)
+SessionOptions WindowFixture::options(const std::vector<std::string>& names)
 {
     SessionOptions options;
     options.paths = {directory_ / "config", directory_ / "state", directory_ / "cache",
                      directory_ / "data"};
-    options.disksToOpen = images;
+    options.disksToOpen = names;
     options.scansSystemDisks = false;
     options.closed = [this] {
         wasClosed_ = true;
     };
+    return options;
+}
+
+void WindowFixture::openWith(SessionOptions options)
+{
     wasClosed_ = false;
     session_ = std::make_unique<DesktopSession>(std::move(options));
     session_->show();
+}
+
+void WindowFixture::open(const std::vector<std::string>& images)
+{
+    openWith(options(images));
     // An image is known with what is in it.
     ASSERT_TRUE(waitUntil([&] {
         return session_->host().sharedDiskController().roots().size() == 2 * images.size();
@@ -93,9 +102,16 @@ bool WindowFixture::waitUntil(const std::function<bool()>& isDone)
 bool WindowFixture::waitForJob()
 {
     return waitUntil([this] {
-        return button("verifyDiskButton").title() == "Verify Disk" &&
-               button("repairDiskButton").title() == "Repair Disk";
+        return button("verifyDiskButton").action() == "verifyDisk:" &&
+               button("repairDiskButton").action() == "repairDisk:";
     });
+}
+
+void WindowFixture::run(const char* name, const std::string& image)
+{
+    select(image);
+    button(name).press();
+    ASSERT_TRUE(waitForJob());
 }
 
 QModelIndex WindowFixture::row(const std::string& image)
@@ -139,9 +155,8 @@ QtButton& WindowFixture::button(const char* name)
 
 std::vector<std::string> WindowFixture::logRows()
 {
-    OutlinePeer& peer = *session_->activeTab()->interface()->outlinePeer();
-    peer.flush();
-    const QAbstractItemModel& model = *peer.table().model();
+    session_->activeTab()->interface()->outlinePeer()->flush();
+    const QAbstractItemModel& model = *log().model();
     std::vector<std::string> rows;
     for (int row = 0; row < model.rowCount(); ++row)
         rows.push_back(fromQt(model.index(row, 0).data(Qt::DisplayRole).toString()));
@@ -169,6 +184,15 @@ QMessageBox* WindowFixture::sheet()
     return nullptr;
 }
 
+std::string WindowFixture::takeSheet()
+{
+    QMessageBox* const box = sheet();
+    if (box == nullptr)
+        return {};
+    box->close();
+    return fromQt(box->text() + QLatin1Char('\n') + box->informativeText());
+}
+
 void WindowFixture::press(QMessageBox& box, const QString& title)
 {
     for (QAbstractButton* button : box.buttons())
@@ -177,17 +201,6 @@ void WindowFixture::press(QMessageBox& box, const QString& title)
             return;
         }
     FAIL() << "the sheet has no button " << fromQt(title);
-}
-
-void WindowFixture::takePicture(const std::string& name)
-{
-    fs::create_directories(SCREENSHOT_DIRECTORY);
-    QPixmap picture = window().grab();
-    if (QMessageBox* const box = sheet()) {
-        const QPoint corner = box->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
-        QPainter(&picture).drawPixmap(corner, box->grab());
-    }
-    EXPECT_TRUE(picture.save(toQt(SCREENSHOT_DIRECTORY "/" + name + ".png")));
 }
 
 }  // namespace orvane::desktop::test

@@ -27,6 +27,9 @@ protected:
     /// A checking tool that runs until it is told to end takes the place of e2fsck.
     void useEndlessTool();
 
+    SessionOptions options(const std::vector<std::string>& names);
+    /// Opens the window without waiting for its disks.
+    void openWith(SessionOptions options);
     /// Opens the window, and waits until the images are in the list.
     void open(const std::vector<std::string>& images);
     /// Makes an image, opens the window with it and selects it; its file name.
@@ -37,19 +40,23 @@ protected:
     [[nodiscard]] static bool waitUntil(const std::function<bool()>& isDone);
     [[nodiscard]] bool waitForJob();
     void select(const std::string& image);
+    /// Selects the image, and presses the button until the job is over.
+    void run(const char* name, const std::string& image);
     QtButton& button(const char* name);
+    LogTable& log() { return session_->activeTab()->interface()->outlinePeer()->table(); }
     std::vector<std::string> logRows();
     bool logHolds(const std::string& text);
     /// What the disk list says about the image.
     std::string cell(const std::string& image, DiskColumn column);
+    std::string verdict(const std::string& image) { return cell(image, DiskColumn::Verdict); }
     /// The second line of its row.
     std::string details(const std::string& image);
     QAction& command(const char* name);
     /// The sheet that is open; none when there is none.
     QMessageBox* sheet();
+    /// What it says; also closes it.
+    std::string takeSheet();
     static void press(QMessageBox& box, const QString& button);
-    /// Keeps a picture of the window with the build.
-    void takePicture(const std::string& name);
 
     DesktopSession& session() { return *session_; }
     MainWindow& window() { return session_->window(); }

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/texts/Language.h"
-#include "tests/desktop/OtherWindow.h"
 
 #include <gtest/gtest.h>
 
@@ -17,7 +16,5 @@ int main(int argc, char** argv)
     testing::InitGoogleTest(&argc, argv);
     const QApplication application(argc, argv);
     QApplication::setQuitOnLastWindowClosed(false);
-    if (argc > 1 && argv[1] == orvane::desktop::test::otherWindow)
-        return orvane::desktop::test::runOtherWindow(argc, argv);
     return RUN_ALL_TESTS();
 }

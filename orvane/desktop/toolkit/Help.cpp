@@ -77,14 +77,20 @@ QString HelpBook::plainText(const QString& page)
     return document.toPlainText();
 }
 
-HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts)
+HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts,
+                       contract::UserDefaults& settings)
     : book_(std::move(book)),
       texts_(texts),
+      settings_(settings),
       browser_(new QTextBrowser(this)),
       findField_(new QLineEdit(this))
 {
     setWindowTitle(text("Orvane Help"));
+    setAttribute(Qt::WA_DeleteOnClose);
+    // The program ends with its main window, whatever help is open.
+    setAttribute(Qt::WA_QuitOnClose, false);
     resize(firstSize);
+    restoreGeometry(storedBytes(settings_, geometryKey));
     browser_->setAccessibleName(windowTitle());
     browser_->setFrameShape(QFrame::NoFrame);
     browser_->document()->setDocumentMargin(pageMargin);
@@ -161,7 +167,7 @@ void HelpWindow::open(std::string_view anchor)
     if (!QFileInfo(page).isReadable()) {
         browser_->setPlainText(
             toQt(contract::format(texts_.localizedString("The help book %@ cannot be read."),
-                                 {page.isEmpty() ? std::string("index.html") : fromQt(page)})));
+                                  {page.isEmpty() ? std::string("index.html") : fromQt(page)})));
         return;
     }
     QUrl place = QUrl::fromLocalFile(page);
@@ -209,8 +215,7 @@ void HelpWindow::find(Direction direction)
 
 void HelpWindow::closeEvent(QCloseEvent* event)
 {
-    if (closed_)
-        closed_(saveGeometry());
+    storeBytes(settings_, geometryKey, saveGeometry());
     QMainWindow::closeEvent(event);
 }
 
@@ -219,23 +224,10 @@ QtHelp::~QtHelp()
     delete window_;
 }
 
-void QtHelp::makeWindow()
-{
-    window_ = new HelpWindow(HelpBook(bookDirectory(bundle_)), bundle_);
-    window_->setAttribute(Qt::WA_DeleteOnClose);
-    // The program ends with its main window, whatever help is open.
-    window_->setAttribute(Qt::WA_QuitOnClose, false);
-    window_->restoreGeometry(QByteArray::fromBase64(
-        QByteArray::fromStdString(std::string(settings_.objectForKey(geometryKey).string()))));
-    window_->setClosed([this](const QByteArray& geometry) {
-        settings_.setObjectForKey(contract::Value(geometry.toBase64().toStdString()), geometryKey);
-    });
-}
-
 void QtHelp::openHelpAnchor(std::string_view anchor)
 {
     if (!window_)
-        makeWindow();
+        window_ = new HelpWindow(HelpBook(bookDirectory(bundle_)), bundle_, settings_);
     window_->show();
     window_->open(anchor);
     window_->raise();

@@ -13,7 +13,6 @@
 #include <QTextBrowser>
 
 #include <filesystem>
-#include <functional>
 #include <string_view>
 
 namespace orvane::desktop {
@@ -43,17 +42,12 @@ private:
 /// its pages. A link that leads out of the book is not followed. Main thread.
 class HelpWindow final : public QMainWindow {
 public:
-    /// `texts` outlives the window.
-    HelpWindow(HelpBook book, const contract::Bundle& texts);
+    /// `texts` and `settings`, which keep the window's size and place, outlive the window.
+    HelpWindow(HelpBook book, const contract::Bundle& texts, contract::UserDefaults& settings);
 
     /// Shows the page where the anchor stands; an empty one is the contents. A book that cannot
     /// be read is said so in the window.
     void open(std::string_view anchor);
-    /// Told of the geometry when the window is closed.
-    void setClosed(std::function<void(const QByteArray& geometry)> closed)
-    {
-        closed_ = std::move(closed);
-    }
 
 protected:
     void closeEvent(QCloseEvent* event) override;
@@ -71,9 +65,9 @@ private:
 
     const HelpBook book_;
     const contract::Bundle& texts_;
+    contract::UserDefaults& settings_;
     QTextBrowser* browser_;
     QLineEdit* findField_;
-    std::function<void(const QByteArray&)> closed_;
 };
 
 /// The help book in a window of its own; no network and no browser is needed. The book is in the
@@ -97,8 +91,6 @@ public:
     HelpWindow* window() { return window_; }
 
 private:
-    void makeWindow();
-
     const contract::Bundle& bundle_;
     contract::UserDefaults& settings_;
     QPointer<HelpWindow> window_;

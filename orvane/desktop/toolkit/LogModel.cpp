@@ -123,7 +123,8 @@ QString LogModel::spokenText(const contract::OutlineItem& item) const
 {
     const QString text = oneLine(textOfItem(*view_, item)).text;
     const std::string_view type = item.string(contract::kFsckMessageType);
-    const bool isProblem = type == contract::kFsckError.text() || type == contract::kFsckFail.text();
+    const bool isProblem =
+        type == contract::kFsckError.text() || type == contract::kFsckFail.text();
     QString word;
     if (isProblem)
         word = spoken_.problem;

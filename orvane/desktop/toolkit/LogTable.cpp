@@ -11,8 +11,8 @@
 #include <QHelpEvent>
 #include <QMouseEvent>
 #include <QPainter>
-#include <QStyledItemDelegate>
 #include <QScrollBar>
+#include <QStyledItemDelegate>
 #include <QToolTip>
 
 #include <algorithm>
@@ -55,10 +55,10 @@ bool isSentence(const QModelIndex& index)
     return !isDetail(static_cast<const LogModel*>(index.model())->itemAt(index.row()));
 }
 
-/// For a LogModel. Paints a row of the log: the text of the module's cell, in the frame that the module's view
-/// gives, in colours that are readable on the desktop's palette. What is shown without details
-/// are sentences to be read, and take as many lines as they need; the lines that tools print
-/// among the details are cut as the module says, and are whole in a tooltip.
+/// For a LogModel. Paints a row of the log: the text of the module's cell, in the frame that the
+/// module's view gives, in colours that are readable on the desktop's palette. What is shown
+/// without details are sentences to be read, and take as many lines as they need; the lines that
+/// tools print among the details are cut as the module says, and are whole in a tooltip.
 class LogDelegate final : public QStyledItemDelegate {
 public:
     using QStyledItemDelegate::QStyledItemDelegate;
@@ -180,27 +180,26 @@ int LogTable::pixelsToEnd() const
 }
 
 // Rows that come into sight may need more room, and move what should be there.
-void LogTable::scrollToPixelsBeforeEnd(int pixels)
+template <class Place>
+void LogTable::settleAt(Place place)
 {
     for (int tries = 0; tries < mostTries; ++tries) {
         executeDelayedItemsLayout();
         updateGeometries();
-        verticalScrollBar()->setValue(verticalScrollBar()->maximum() - pixels);
+        verticalScrollBar()->setValue(place());
         if (!fitRowsInSight())
             return;
     }
 }
 
+void LogTable::scrollToPixelsBeforeEnd(int pixels)
+{
+    settleAt([&] { return verticalScrollBar()->maximum() - pixels; });
+}
+
 void LogTable::putRowAt(int row, int top)
 {
-    for (int tries = 0; tries < mostTries; ++tries) {
-        executeDelayedItemsLayout();
-        updateGeometries();
-        verticalScrollBar()->setValue(verticalScrollBar()->value() + rowViewportPosition(row) -
-                                      top);
-        if (!fitRowsInSight())
-            return;
-    }
+    settleAt([&] { return verticalScrollBar()->value() + rowViewportPosition(row) - top; });
 }
 
 bool LogTable::fitRowsInSight()

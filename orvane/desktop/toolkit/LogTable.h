@@ -65,6 +65,8 @@ protected:
 private:
     void adoptFont();
     bool fitRowsInSight();
+    template <class Place>
+    void settleAt(Place place);
 
     Handlers handlers_;
     bool isDraggable_ = true;

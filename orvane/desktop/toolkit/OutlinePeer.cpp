@@ -268,12 +268,6 @@ void OutlinePeer::selectAll()
     table_->selectAll();
 }
 
-void OutlinePeer::setNeedsDisplay(bool needsDisplay)
-{
-    if (needsDisplay)
-        table_->viewport()->update();
-}
-
 void OutlinePeer::setNeedsDisplayInRect(const contract::Rect& rect)
 {
     table_->viewport()->update(QRectF(rect.x, rect.y, rect.width, rect.height).toAlignedRect());

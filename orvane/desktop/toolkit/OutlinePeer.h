@@ -86,7 +86,7 @@ public:
     contract::Rect frameOfOutlineCellAtRow(std::size_t row) const override;
     void keyDown(const contract::KeyEvent& event) override;
     void selectAll() override;
-    void setNeedsDisplay(bool needsDisplay) override;
+    void setNeedsDisplay(bool needsDisplay) override { redraw(*table_->viewport(), needsDisplay); }
     void setNeedsDisplayInRect(const contract::Rect& rect) override;
     void setEnabled(bool isEnabled) override { table_->setEnabled(isEnabled); }
     bool isEnabled() const override { return table_->isEnabled(); }

@@ -44,12 +44,6 @@ QtTextField::QtTextField(QLabel& label) : label_(label)
     label_.setTextInteractionFlags(Qt::TextSelectableByMouse | Qt::TextSelectableByKeyboard);
 }
 
-void QtTextField::setNeedsDisplay(bool needsDisplay)
-{
-    if (needsDisplay)
-        label_.update();
-}
-
 void QtTextField::setToolTip(std::string_view text)
 {
     label_.setToolTip(toQtToolTip(text));
@@ -65,12 +59,6 @@ QtTextView::QtTextView(QPlainTextEdit& widget) : widget_(widget)
 {
     widget_.setReadOnly(true);
     widget_.setVisible(!widget_.document()->isEmpty());
-}
-
-void QtTextView::setNeedsDisplay(bool needsDisplay)
-{
-    if (needsDisplay)
-        widget_.viewport()->update();
 }
 
 void QtTextView::setString(std::string_view text)
@@ -90,12 +78,6 @@ QtButton::QtButton(QAbstractButton& widget, Pressed pressed)
 QtButton::~QtButton()
 {
     QObject::disconnect(clicks_);
-}
-
-void QtButton::setNeedsDisplay(bool needsDisplay)
-{
-    if (needsDisplay)
-        widget_.update();
 }
 
 void QtButton::setToolTip(std::string_view text)

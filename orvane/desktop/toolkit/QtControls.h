@@ -42,13 +42,20 @@ private:
     const QScrollBar& bar_;
 };
 
+/// What a view does with `setNeedsDisplay`.
+inline void redraw(QWidget& widget, bool isNeeded)
+{
+    if (isNeeded)
+        widget.update();
+}
+
 /// Text that is only read, with its fonts relative to the desktop's size. The label must live as
 /// long as this object is used.
 class QtTextField final : public contract::TextField {
 public:
     explicit QtTextField(QLabel& label);
 
-    void setNeedsDisplay(bool needsDisplay) override;
+    void setNeedsDisplay(bool needsDisplay) override { redraw(label_, needsDisplay); }
     void setEnabled(bool isEnabled) override { label_.setEnabled(isEnabled); }
     bool isEnabled() const override { return label_.isEnabled(); }
     void setToolTip(std::string_view text) override;
@@ -64,7 +71,7 @@ class QtTextView final : public contract::TextView {
 public:
     explicit QtTextView(QPlainTextEdit& widget);
 
-    void setNeedsDisplay(bool needsDisplay) override;
+    void setNeedsDisplay(bool needsDisplay) override { redraw(*widget_.viewport(), needsDisplay); }
     void setString(std::string_view text) override;
 
 private:
@@ -82,7 +89,7 @@ public:
     QtButton& operator=(const QtButton&) = delete;
     ~QtButton() override;
 
-    void setNeedsDisplay(bool needsDisplay) override;
+    void setNeedsDisplay(bool needsDisplay) override { redraw(widget_, needsDisplay); }
     /// A button that works has no reason not to.
     void setEnabled(bool isEnabled) override;
     bool isEnabled() const override { return widget_.isEnabled(); }

@@ -169,10 +169,15 @@ void LoadedInterface::adoptButtons()
     }
 }
 
-template <class Widget>
-Widget* LoadedInterface::find(std::string_view name)
+template <class Control, class Widget, class Outlet>
+void LoadedInterface::fillText(Outlet** place, std::string_view name)
 {
-    return root_->findChild<Widget*>(toQt(name));
+    auto* const widget = root_->findChild<Widget*>(toQt(name));
+    if (widget == nullptr)
+        return;
+    auto control = std::make_unique<Control>(*widget);
+    *place = control.get();
+    texts_.push_back(std::move(control));
 }
 
 void LoadedInterface::fill(const contract::Outlet& outlet)
@@ -181,19 +186,12 @@ void LoadedInterface::fill(const contract::Outlet& outlet)
         if (QtButton* const found = button(outlet.name))
             **buttonPlace = found;
     } else if (auto* const fieldPlace = std::get_if<contract::TextField**>(&outlet.place)) {
-        if (auto* const label = find<QLabel>(outlet.name)) {
-            auto field = std::make_unique<QtTextField>(*label);
-            **fieldPlace = field.get();
-            texts_.push_back(std::move(field));
-        }
+        fillText<QtTextField, QLabel>(*fieldPlace, outlet.name);
     } else if (auto* const viewPlace = std::get_if<contract::TextView**>(&outlet.place)) {
-        if (auto* const edit = find<QPlainTextEdit>(outlet.name)) {
-            auto view = std::make_unique<QtTextView>(*edit);
-            **viewPlace = view.get();
-            texts_.push_back(std::move(view));
-        }
-    } else if (auto* const tree = dynamic_cast<LogTable*>(find<QTableView>(outlet.name))) {
-        makeOutlineView(std::get<contract::OutlineView**>(outlet.place), *tree);
+        fillText<QtTextView, QPlainTextEdit>(*viewPlace, outlet.name);
+    } else if (auto* const table =
+                   dynamic_cast<LogTable*>(root_->findChild<QTableView*>(toQt(outlet.name)))) {
+        makeOutlineView(std::get<contract::OutlineView**>(outlet.place), *table);
     }
 }
 

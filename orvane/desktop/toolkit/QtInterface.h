@@ -56,8 +56,8 @@ private:
     void fill(const contract::Outlet& outlet);
     void limitSplitView();
     void makeOutlineView(contract::OutlineView** place, LogTable& table);
-    template <class Widget>
-    Widget* find(std::string_view name);
+    template <class Control, class Widget, class Outlet>
+    void fillText(Outlet** place, std::string_view name);
 
     QPointer<QWidget> root_;
     contract::InterfaceOwner* owner_;

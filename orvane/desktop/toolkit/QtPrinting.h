@@ -35,7 +35,8 @@ public:
     enum class State { Working, Done, Failed };
 
     PrintJob(QPrinter& printer, std::vector<contract::StyledText> rows,
-             const contract::Font& defaultFont, const contract::PrintInfo& info, PrintHeader header);
+             const contract::Font& defaultFont, const contract::PrintInfo& info,
+             PrintHeader header);
     PrintJob(const PrintJob&) = delete;
     PrintJob& operator=(const PrintJob&) = delete;
     /// Printing that has not come to its end is given up as by `cancel`.

@@ -46,11 +46,11 @@ StyledLine fitted(const StyledLine& line, const QFontMetricsF& metrics, double w
 
 /// How a line is put on a screen or on paper.
 struct LineLooks {
-    double fontScale = 1;       ///< of the points of the text
+    double fontScale = 1;        ///< of the points of the text
     contract::Font defaultFont;  ///< for runs that name none
-    QColor textColor;           ///< for runs that name none
-    QColor background;          ///< colours are made readable on it
-    bool joinsLetters = true;   ///< NO where the text is searched later: “fi” stays two letters
+    QColor textColor;            ///< for runs that name none
+    QColor background;           ///< colours are made readable on it
+    bool joinsLetters = true;  ///< NO where the text is searched later: “fi” stays two letters
     bool keepsTextColor = false;  ///< as for selected rows: `textColor` for everything
 };
 

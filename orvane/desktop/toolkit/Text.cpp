@@ -125,6 +125,19 @@ std::string html(const contract::StyledText& text, double fontScale)
     return isInParagraph ? result + "</p>" : result;
 }
 
+QByteArray storedBytes(const contract::UserDefaults& settings, std::string_view key)
+{
+    const contract::Value value = settings.objectForKey(key);
+    return QByteArray::fromBase64(QByteArray::fromStdString(std::string(value.string())));
+}
+
+void storeBytes(contract::UserDefaults& settings, std::string_view key, const QByteArray& bytes)
+{
+    const std::string text = bytes.toBase64().toStdString();
+    if (settings.objectForKey(key).string() != text)
+        settings.setObjectForKey(contract::Value(text), key);
+}
+
 std::string languageOf(const contract::Bundle& bundle)
 {
     return bundle.localizedString("en");

@@ -3,7 +3,9 @@
 
 #include "contract/foundation/Bundle.h"
 #include "contract/foundation/StyledText.h"
+#include "contract/foundation/UserDefaults.h"
 
+#include <QByteArray>
 #include <QString>
 
 #include <string>
@@ -26,6 +28,11 @@ QString toQtToolTip(std::string_view text);
 /// The text as a fragment of HTML, everything escaped: bold, colour and size (in points,
 /// multiplied by `fontScale`) of each run, and one paragraph for each line.
 std::string html(const contract::StyledText& text, double fontScale = 1);
+
+/// Bytes that are kept in the settings as text, such as a window's geometry; empty when there are
+/// none. Written only where they differ.
+[[nodiscard]] QByteArray storedBytes(const contract::UserDefaults& settings, std::string_view key);
+void storeBytes(contract::UserDefaults& settings, std::string_view key, const QByteArray& bytes);
 
 /// The language of the bundle's texts as a code ("de"); "en" where they are not translated. It is
 /// the translation of "en".

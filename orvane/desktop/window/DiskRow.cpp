@@ -206,7 +206,8 @@ QIcon verdictIcon(std::string_view verdict)
     static const QIcon cross =
         drawn(sign(redColor, {{5.6, 5.6}, {10.4, 10.4}, {10.4, 5.6}, {5.6, 10.4}}));
     static const QIcon mark = drawn(sign(amberColor, {{8, 4.6}, {8, 8.8}, {8, 11.4}, {8, 11.5}}));
-    if (verdict == contract::kPLVerdictSound.text() || verdict == contract::kPLVerdictRepaired.text())
+    if (verdict == contract::kPLVerdictSound.text() ||
+        verdict == contract::kPLVerdictRepaired.text())
         return check;
     return verdict == contract::kPLVerdictDamaged.text() ? cross : mark;
 }

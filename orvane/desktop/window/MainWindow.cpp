@@ -42,19 +42,6 @@ std::vector<std::filesystem::path> localFiles(const QMimeData* data)
 constexpr std::string_view geometryKey = "MainWindow.geometry";
 constexpr std::string_view splitterKey = "MainWindow.splitter";
 
-QByteArray stored(const contract::UserDefaults& settings, std::string_view key)
-{
-    const contract::Value value = settings.objectForKey(key);
-    return QByteArray::fromBase64(QByteArray::fromStdString(std::string(value.string())));
-}
-
-void store(contract::UserDefaults& settings, std::string_view key, const QByteArray& bytes)
-{
-    const std::string text = bytes.toBase64().toStdString();
-    if (settings.objectForKey(key).string() != text)
-        settings.setObjectForKey(contract::Value(text), key);
-}
-
 }  // namespace
 
 ProgressArea::ProgressArea(const QString& accessibleName, QWidget* parent)
@@ -223,14 +210,14 @@ void MainWindow::paintEvent(QPaintEvent* event)
 
 void MainWindow::restoreLayout(const contract::UserDefaults& settings)
 {
-    restoreGeometry(stored(settings, geometryKey));
-    splitter_->restoreState(stored(settings, splitterKey));
+    restoreGeometry(storedBytes(settings, geometryKey));
+    splitter_->restoreState(storedBytes(settings, splitterKey));
 }
 
 void MainWindow::saveLayout(contract::UserDefaults& settings) const
 {
-    store(settings, geometryKey, saveGeometry());
-    store(settings, splitterKey, splitter_->saveState());
+    storeBytes(settings, geometryKey, saveGeometry());
+    storeBytes(settings, splitterKey, splitter_->saveState());
 }
 
 }  // namespace orvane::desktop

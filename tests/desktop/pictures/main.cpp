@@ -8,6 +8,7 @@
 #include "tests/support/ToolRun.h"
 
 #include <QApplication>
+#include <QPainter>
 #include <QTest>
 #include <QToolTip>
 
@@ -25,18 +26,44 @@ std::string look()
 
 class Pictures : public WindowFixture {
 protected:
-    // Whatever the language.
-    void verify(const std::string& image)
+    void openInOneSize(const std::vector<std::string>& images)
+    {
+        open(images);
+        window().resize(1180, 600);
+        window().splitter().setSizes({420, 760});
+    }
+
+    void finishJob()
+    {
+        ASSERT_TRUE(waitForJob());
+        QTest::qWait(100);
+        takeSheet();
+        QTest::qWait(50);
+    }
+
+    void treat(const char* name, const std::string& image)
     {
         select(image);
-        button("verifyDiskButton").press();
-        ASSERT_TRUE(waitUntil([&] {
-            return button("verifyDiskButton").action() == "verifyDisk:" &&
-                   !cell(image, DiskColumn::Verdict).empty();
-        }));
-        if (QMessageBox* const box = sheet())
-            box->close();
-        QTest::qWait(50);
+        button(name).press();
+        finishJob();
+    }
+
+    /// Keeps a picture of the window with the build.
+    void takePicture(const std::string& name)
+    {
+        QPixmap picture = window().grab();
+        if (QMessageBox* const box = sheet()) {
+            const QPoint corner = box->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
+            QPainter(&picture).drawPixmap(corner, box->grab());
+        }
+        save(picture, name);
+    }
+
+    static void save(const QPixmap& picture, const std::string& name)
+    {
+        std::filesystem::create_directories(SCREENSHOT_DIRECTORY);
+        EXPECT_TRUE(picture.save(
+            QString::fromStdString(SCREENSHOT_DIRECTORY "/" + look() + name + ".png")));
     }
 };
 
@@ -44,18 +71,15 @@ TEST_F(Pictures, OfADamagedDiskThatWasVerified)
 {
     const std::string sound = makeImage("Photos");
     const std::string damaged = makeDamagedImage("Letters");
-    open({sound, damaged});
-    window().resize(1180, 600);
-    window().splitter().setSizes({420, 760});
-    takePicture(look() + "-empty");
-    verify(sound);
-    verify(damaged);
-    takePicture(look());
+    openInOneSize({sound, damaged});
+    takePicture("-empty");
+    treat("verifyDiskButton", sound);
+    treat("verifyDiskButton", damaged);
+    takePicture("");
     session().host().sharedHelpManager().openHelpAnchor("ovhelp11868");
     QTest::qWait(50);
     QWidget& help = *session().host().sharedHelpManager().window();
-    EXPECT_TRUE(
-        help.grab().save(QString::fromStdString(SCREENSHOT_DIRECTORY "/" + look() + "-help.png")));
+    save(help.grab(), "-help");
     EXPECT_LE(window().minimumSizeHint().width(), 1180) << "it has room on a small screen";
 }
 
@@ -66,26 +90,20 @@ TEST_F(Pictures, OfWhatIsOutOfTheOrdinary)
     const std::string map = makePartitionedImage("Camera");
     std::fstream(map) << std::string(1024, '\0');
     const std::string gone = makeImage("Letters");
-    open({sound, map, gone});
-    window().resize(1180, 600);
-    window().splitter().setSizes({420, 760});
-    verify(sound);
-    verify(map);
+    openInOneSize({sound, map, gone});
+    treat("verifyDiskButton", sound);
+    treat("verifyDiskButton", map);
     std::filesystem::remove(gone);
     select(gone);
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; }));
     QTest::qWait(50);
-    takePicture(look() + "-gone");
+    takePicture("-gone");
     sheet()->close();
     select(map);
     command("verifyMap").trigger();
-    ASSERT_TRUE(waitUntil([&] { return button("verifyDiskButton").action() == "verifyDisk:"; }));
-    QTest::qWait(50);
-    if (QMessageBox* const box = sheet())
-        box->close();
-    QTest::qWait(50);
-    takePicture(look() + "-map");
+    finishJob();
+    takePicture("-map");
     window().disks().selectAll();
     QTest::qWait(50);
     QWidget& grey = button("repairPermissionsButton").widget();
@@ -93,33 +111,23 @@ TEST_F(Pictures, OfWhatIsOutOfTheOrdinary)
     QTest::qWait(100);
     for (QWidget* const widget : QApplication::topLevelWidgets())
         if (widget->isVisible() && widget->inherits("QTipLabel"))
-            widget->grab().save(
-                QString::fromStdString(SCREENSHOT_DIRECTORY "/" + look() + "-grey.png"));
+            save(widget->grab(), "-grey");
     QToolTip::hideText();
     close();
 
     useEndlessTool();
-    open({sound, map});
-    window().resize(1180, 600);
-    window().splitter().setSizes({420, 760});
+    openInOneSize({sound, map});
     select(sound);
     button("clearHistoryButton").press();
     command("undoClear").trigger();
+    const std::string before = verdict(sound);
     button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] {
-        return session()
-                   .host()
-                   .historyStore()
-                   .runs(session().host().histories().keyOf(
-                       session().host().sharedDiskController().diskNamed(sound + "#0")->facts()))
-                   .size() == 2;
-    }));
+    ASSERT_TRUE(waitUntil([&] { return verdict(sound) != before; }));
     QTest::qWait(300);
-    takePicture(look() + "-working");
+    takePicture("-working");
     button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return button("verifyDiskButton").action() == "verifyDisk:"; }));
-    QTest::qWait(100);
-    takePicture(look() + "-stopped");
+    finishJob();
+    takePicture("-stopped");
 }
 
 TEST_F(Pictures, OfARepairWhoseLogIsLong)
@@ -132,14 +140,10 @@ TEST_F(Pictures, OfARepairWhoseLogIsLong)
     EXPECT_EQ(orvane::test::runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
     open({image});
     window().resize(820, 560);
-    verify(image);
+    treat("verifyDiskButton", image);
     button("showDetailsButton").press();
-    button("repairDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return button("repairDiskButton").action() == "repairDisk:"; }));
-    if (QMessageBox* const box = sheet())
-        box->close();
-    QTest::qWait(100);
-    takePicture(look() + "-repaired");
+    treat("repairDiskButton", image);
+    takePicture("-repaired");
 }
 
 }  // namespace

@@ -5,6 +5,7 @@
 #include "tests/desktop/toolkit/ToolkitFixture.h"
 
 #include <QFile>
+#include <QMessageBox>
 #include <QScrollArea>
 #include <QSplitter>
 #include <QTest>
@@ -33,28 +34,38 @@ TEST_F(Interface, EveryOutletIsFilledAndEveryControlCanBeHeard)
     EXPECT_TRUE(instructions->text().contains(QStringLiteral("click Verify Disk")));
 }
 
-TEST_F(Interface, AClickReachesTheModuleAndAJobTurnsTheButtonIntoStop)
+// What the buttons say is the module's; that it reaches the widgets, and clicks the module, is not.
+TEST_F(Interface, ButtonsShowWhatTheModuleSaysAndClicksReachIt)
 {
-    QtButton& verify = *interface->button("verifyDiskButton");
-    const QKeySequence shortcut = verify.widget().shortcut();
-    ASSERT_TRUE(verify.isEnabled()) << verify.toolTip();
-    verify.press();
-    settle();
-    EXPECT_EQ(verify.title(), "Stop Verify");
-    EXPECT_EQ(verify.action(), "stopAction:");
-    EXPECT_EQ(verify.widget().shortcut(), shortcut) << "the key stays with the button";
-    EXPECT_TRUE(host.fake.isLocked);
-}
-
-TEST_F(Interface, DividerStandsBetweenTheLimitsOfTheModule)
-{
-    auto& splitter = *interface->widget().findChild<QSplitter*>();
-    for (const int wanted : {0, 150, 1000}) {
-        splitter.setSizes({wanted, splitter.height() - wanted});
-        settle();
-        EXPECT_GE(splitter.widget(0)->height(), 80);
-        EXPECT_LE(splitter.widget(0)->height(), 210);
+    QAbstractButton& verify = interface->button("verifyDiskButton")->widget();
+    QAbstractButton& permissions = interface->button("verifyPermissionsButton")->widget();
+    disk->mount.reset();
+    disk->permissionsRepairable = false;
+    selectDisk();
+    EXPECT_TRUE(verify.isEnabled());
+    EXPECT_FALSE(permissions.isEnabled());
+    EXPECT_TRUE(permissions.toolTip().contains(
+        QStringLiteral("Not available because the selected disk is not mounted.")));
+    disk->boot = true;
+    disk->fileSystem.verifiesLive = true;
+    selectDisk();
+    const QKeySequence shortcut = verify.shortcut();
+    host.qtAlerts.setWindow(&interface->widget());
+    for (const bool isAltHeld : {false, true}) {
+        QTest::mouseClick(&verify, Qt::LeftButton, isAltHeld ? Qt::AltModifier : Qt::NoModifier);
+        EXPECT_EQ(host.fake.isLocked, isAltHeld) << "Alt skips the question about the startup disk";
+        auto* const question = interface->widget().findChild<QMessageBox*>();
+        ASSERT_EQ(question != nullptr, !isAltHeld);
+        if (question != nullptr) {
+            QTest::keyClick(question, Qt::Key_Escape);
+            EXPECT_TRUE(QTest::qWaitFor(
+                [&] { return interface->widget().findChild<QMessageBox*>() == nullptr; }));
+        }
     }
+    EXPECT_EQ(verify.text().remove(u'&'), QStringLiteral("Stop Verify"));
+    EXPECT_EQ(verify.shortcut(), shortcut) << "the key stays with the button";
+    QTest::mouseClick(&verify, Qt::LeftButton);
+    EXPECT_FALSE(verify.isEnabled()) << "it is being stopped";
 }
 
 TEST_F(Interface, InstructionsHaveJustTheRoomTheyNeedUntilTheUserMovesTheDivider)
@@ -122,29 +133,6 @@ TEST_F(Interface, NothingIsSentToAModuleThatHasGone)
     EXPECT_EQ(table().model()->rowCount(), 0);
     interface->button("showDetailsButton")->press();
     interface->widget().grab();
-}
-
-TEST_F(Interface, LooksAsItShouldInLightAndDark)
-{
-    using contract::Color;
-    const Color red{1, 0, 0, 1};
-    const Color green{0, 0.8, 0.2, 1};
-    addRow("Verifying volume “USB”", -1);
-    addRow("Checking file system on /dev/loop0");
-    addRow("Inode 12, i_blocks is 24, should be 8. This line is long: " + std::string(200, 'x') +
-               " and this is its end.",
-           0, {{}, red, {}});
-    addRow("The volume “USB” appears to be OK.", -1, {contract::Font::boldSystem(11), green, {}});
-    reload();
-    table().selectRow(1);
-    const QPalette before = QApplication::palette();
-    EXPECT_TRUE(interface->widget().grab().save(QStringLiteral(SCREENSHOTS "/light.png")));
-    QPalette dark(QColor(0x35, 0x35, 0x35), QColor(0x2b, 0x2b, 0x2b));
-    dark.setColor(QPalette::Base, QColor(0x1e, 0x1e, 0x1e));
-    QApplication::setPalette(dark);
-    settle();
-    EXPECT_TRUE(interface->widget().grab().save(QStringLiteral(SCREENSHOTS "/dark.png")));
-    QApplication::setPalette(before);
 }
 
 }  // namespace

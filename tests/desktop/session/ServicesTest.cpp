@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/session/DesktopNotifier.h"
+#include "orvane/desktop/session/SleepInhibitor.h"
 #include "tests/desktop/session/FakeServices.h"
 #include "tests/desktop/session/PrivateBus.h"
 
@@ -13,7 +14,8 @@ namespace {
 using namespace std::chrono_literals;
 
 FinishedRun finished(const std::string& disk, const std::string& verdict,
-                     const std::string& message = "", pellar::Operation operation = pellar::Operation::Verify)
+                     const std::string& message = "",
+                     pellar::Operation operation = pellar::Operation::Verify)
 {
     return {{pellar::Subject::Filesystem, operation, disk}, {verdict, 0, message}};
 }
@@ -63,7 +65,7 @@ TEST(JobNotice, SaysWhatWasDoneOnWhatAndHowItWent)
     }
 }
 
-class DesktopNotifierTest : public testing::Test {
+class ServicesTest : public testing::Test {
 protected:
     void SetUp() override
     {
@@ -80,7 +82,7 @@ protected:
     int clicks_ = 0;
 };
 
-TEST_F(DesktopNotifierTest, ANoticeArrivesAndItsClickComesBack)
+TEST_F(ServicesTest, ANoticeArrivesAndItsClickComesBack)
 {
     FakeNotifications server(bus_.connection("server"));
     DesktopNotifier notifier({bus_.lookup("program"), "org.orvane.Orvane", "Show", [this] {
@@ -108,24 +110,54 @@ TEST_F(DesktopNotifierTest, ANoticeArrivesAndItsClickComesBack)
     EXPECT_EQ(clicks_, 1) << "the others came before";
 }
 
-TEST_F(DesktopNotifierTest, WithoutAServerOrABusNothingHappens)
+TEST_F(ServicesTest, AServerMayComeLaterOrNever)
 {
-    DesktopNotifier alone({bus_.lookup("program"), "e", "Show", [this] {
-                               ++clicks_;
-                           }});
+    const auto options = [this](const BusLookup& bus) {
+        return DesktopNotifier::Options{bus, "e", "Show", [this] {
+                                            ++clicks_;
+                                        }};
+    };
+    DesktopNotifier nowhere(options(SessionBuses().session));
+    nowhere.show({"Title", "Body"});
+    DesktopNotifier alone(options(bus_.lookup("program")));
     alone.show({"Title", "Body"});
     QTest::qWait(100);
-    DesktopNotifier nowhere({SessionBuses().session, "e", "Show", [this] {
-                                 ++clicks_;
-                             }});
-    nowhere.show({"Title", "Body"});
-    QTest::qWait(10);
-    EXPECT_EQ(clicks_, 0);
-
     FakeNotifications late(bus_.connection("server"));
     alone.show({"Title", "Body"});
-    EXPECT_TRUE(waitUntil([&] { return late.shown.size() == 1; })) << "a server may come later";
+    EXPECT_TRUE(waitUntil([&] { return late.shown.size() == 1; }));
     EXPECT_EQ(late.shown.front().replaced, 0U);
+    SleepInhibitor awake(bus_.lookup("program"));
+    awake.hold("Repairing “a”");
+    QTest::qWait(100);
+    EXPECT_FALSE(awake.isHeld()) << "there is no logind";
+}
+
+TEST_F(ServicesTest, TheLockLastsUntilItIsGivenBack)
+{
+    FakeLogind logind(bus_.connection("logind"));
+    SleepInhibitor awake(bus_.lookup("program"));
+    awake.hold("Repairing “a”");
+    EXPECT_TRUE(waitUntil([&] { return awake.isHeld(); }));
+    ASSERT_EQ(logind.asked.size(), 1U);
+    EXPECT_EQ(logind.asked.front(),
+              (QStringList{QStringLiteral("sleep:shutdown:idle"), QStringLiteral("Orvane"),
+                           QStringLiteral("Repairing “a”"), QStringLiteral("block")}));
+    awake.hold("Repairing “b”");
+    EXPECT_TRUE(waitUntil([&] { return logind.asked.size() == 2 && logind.held() == 1; }))
+        << "the next disk's takes the place of the first";
+    EXPECT_TRUE(awake.isHeld());
+    awake.release();
+    EXPECT_TRUE(waitUntil([&] { return logind.held() == 0; }));
+}
+
+TEST_F(ServicesTest, ALockThatComesTooLateIsGivenBackAtOnce)
+{
+    FakeLogind logind(bus_.connection("logind"));
+    SleepInhibitor awake(bus_.lookup("program"));
+    awake.hold("Repairing “a”");
+    awake.release();
+    EXPECT_TRUE(waitUntil([&] { return logind.asked.size() == 1 && logind.held() == 0; }));
+    EXPECT_FALSE(awake.isHeld());
 }
 
 }  // namespace
