@@ -100,7 +100,7 @@ void DiskPane::synchronize()
 }
 
 // Watched before they are read, so that nothing is missed in between. Without the watch the
-// command to rescan is still there, so nobody is bothered with a sheet.
+// command to rescan is still there, so no sheet says it.
 void DiskPane::start()
 {
     if (scansSystemDisks_) {

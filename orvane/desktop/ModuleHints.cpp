@@ -26,8 +26,8 @@ bool isForPermissions(std::string_view button)
 
 }  // namespace
 
-// The reasons are posted, because the module says what it has to say in the meantime; and once for
-// all that happens in one turn.
+// The reasons are posted, because the module says its own first; and told once for all that
+// happens in one turn.
 void ModuleHints::refresh()
 {
     tellEmptyText();

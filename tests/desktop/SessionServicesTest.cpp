@@ -48,7 +48,9 @@ TEST_F(SessionServicesTest, OnlyARepairKeepsTheMachineAwakeAndOnlyUntilItsEnd)
         ASSERT_TRUE(waitForJob());
         EXPECT_TRUE(waitUntil([&] { return logind_->held() == 0; })) << name;
     }
-    EXPECT_EQ(logind_->asked.front().value(2), QStringLiteral("Repairing “a <b>”"));
+    EXPECT_EQ(logind_->asked.front(),
+              (QStringList{QStringLiteral("sleep:shutdown:idle"), QStringLiteral("Orvane"),
+                           QStringLiteral("Repairing “a <b>”"), QStringLiteral("block")}));
 }
 
 TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWindow)

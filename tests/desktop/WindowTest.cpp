@@ -133,7 +133,7 @@ TEST_F(WindowTest, ClosingDuringARepairAsks)
     EXPECT_FALSE(window().isVisible());
 }
 
-// As the system asks when it is shut down: nobody is there to answer a question.
+// As the system asks when it is shut down: no user is there to answer a question.
 TEST_F(WindowTest, AProgramThatIsToldToEndStopsItsJobUnasked)
 {
     useEndlessTool();

@@ -212,7 +212,7 @@ struct FakeRepairDisk final : PLRepairDisk {
 };
 
 /// A whole host in miniature, with a journal of what the module asked it to do.
-struct FakeHost final : HostServices,
+struct FakeHost : HostServices,
                         ModuleSite,
                         OVPreferences,
                         OVDiskController,

@@ -27,7 +27,7 @@ struct Notice {
     std::string body;   ///< markup, with everything of ours escaped
 };
 
-/// Nobody is called back for what took no longer.
+/// The end of a job that took no longer is no news.
 inline constexpr std::chrono::seconds longestGlanceAway{10};
 
 /// Whether a job's end is news to the user: who looks at the window has seen it.

@@ -175,7 +175,7 @@ void HelpWindow::open(std::string_view anchor)
     browser_->setSource(place);
 }
 
-// Nobody is sent to the network by a click that looks like turning a page.
+// A click that looks like turning a page must not lead to the network.
 void HelpWindow::follow(const QUrl& link)
 {
     const QUrl place = browser_->source().resolved(link);

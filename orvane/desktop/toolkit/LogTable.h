@@ -51,7 +51,7 @@ public:
     /// Scrolls until the row's top is so many pixels below that of the viewport, or as near as the
     /// ends allow.
     void putRowAt(int row, int top);
-    /// What a table does with a key that nobody else wants.
+    /// What a table does with a key of its own.
     void handleKey(QKeyEvent& event) { QTableView::keyPressEvent(&event); }
 
 protected:

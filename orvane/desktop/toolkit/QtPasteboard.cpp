@@ -12,7 +12,7 @@
 namespace orvane::desktop {
 namespace {
 
-// Whoever pastes into a terminal must not have a disk's label press keys there.
+// Pasted into a terminal, a disk's label must not press keys there.
 QByteArray withoutControls(std::string_view text)
 {
     std::string result;

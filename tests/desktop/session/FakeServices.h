@@ -69,7 +69,7 @@ public:
 
     std::vector<QStringList> asked;
 
-    /// How many locks are held by somebody.
+    /// How many locks have a holder.
     int held() const
     {
         int count = 0;

@@ -53,7 +53,7 @@ TEST_F(Interface, ButtonsShowWhatTheModuleSaysAndClicksReachIt)
     host.qtAlerts.setWindow(&interface->widget());
     for (const bool isAltHeld : {false, true}) {
         QTest::mouseClick(&verify, Qt::LeftButton, isAltHeld ? Qt::AltModifier : Qt::NoModifier);
-        EXPECT_EQ(host.fake.isLocked, isAltHeld) << "Alt skips the question about the startup disk";
+        EXPECT_EQ(host.isLocked, isAltHeld) << "Alt skips the question about the startup disk";
         auto* const question = interface->widget().findChild<QMessageBox*>();
         ASSERT_EQ(question != nullptr, !isAltHeld);
         if (question != nullptr) {

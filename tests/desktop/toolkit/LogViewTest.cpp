@@ -89,8 +89,8 @@ TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
         addRow("two " + std::to_string(i), i % 4 == 0 ? 0 : 1);
         std::swap(disk->history, other->history);
     }
-    host.fake.disks.push_back(other);
-    host.fake.selection = {disk, other};
+    host.disks.push_back(other);
+    host.selection = {disk, other};
     interface->button("showDetailsButton")->press();
     selectDisk();
     const auto rowOf = [this](const QString& text) {

@@ -35,9 +35,8 @@ struct TestBundle final : contract::Bundle {
 };
 
 /// A fake host, except for its screen.
-struct ScreenHost final : contract::HostServices {
-    fixwell::testing::FakeHost fake;
-    TestBundle bundle;
+struct ScreenHost final : fixwell::testing::FakeHost {
+    TestBundle texts;
     QtAlerts qtAlerts{[](std::int32_t code) {
         return "code " + std::to_string(code);
     }};
@@ -48,39 +47,17 @@ struct ScreenHost final : contract::HostServices {
     }};
     QtPasteboard qtPasteboard;
     int printFailures = 0;
-    QtPrinting qtPrinting{bundle, [this] {
+    QtPrinting qtPrinting{texts, [this] {
                               ++printFailures;
                           }};
 
-    ScreenHost() { qtInterface.setBundle(bundle); }
+    ScreenHost() { qtInterface.setBundle(texts); }
 
-    contract::OVPreferences& sharedPreferences() override { return fake; }
-    contract::OVDiskController& sharedDiskController() override { return fake; }
-    contract::OVLog& log() override { return fake; }
-    contract::NotificationCenter& defaultCenter() override { return fake; }
-    contract::RunLoop& mainRunLoop() override { return fake; }
-    contract::Threads& threads() override { return fake; }
-    contract::UserDefaults& standardUserDefaults() override { return fake; }
-    contract::Bundle& hostBundle() override { return fake; }
-    contract::ImageAttachment& imageAttachment() override { return fake; }
     contract::Alerts& alerts() override { return qtAlerts; }
     contract::Events& events() override { return qtEvents; }
-    contract::HelpManager& sharedHelpManager() override { return fake; }
     QtInterface& interfaceLoader() override { return qtInterface; }
     contract::Pasteboard& generalPasteboard() override { return qtPasteboard; }
     contract::Printing& printing() override { return qtPrinting; }
-    std::unique_ptr<contract::OVTimeEstimator> makeTimeEstimator() override
-    {
-        return fake.makeTimeEstimator();
-    }
-    std::string OVLocalizedErrorString(contract::ErrorCode code) override
-    {
-        return fake.OVLocalizedErrorString(code);
-    }
-    std::string decimalString(const contract::Value& number) override
-    {
-        return fake.decimalString(number);
-    }
 };
 
 /// The module with its controls, one selected disk, and that disk's log to write into.
@@ -88,7 +65,7 @@ class ToolkitTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        module = std::make_unique<fixwell::OVFXW>(host, host.fake);
+        module = std::make_unique<fixwell::OVFXW>(host, host);
         ASSERT_TRUE(module->init());
         module->registerForNotifications();
         interface = host.qtInterface.latest();
@@ -96,8 +73,8 @@ protected:
         view = interface->outlineView();
         ASSERT_NE(view, nullptr);
         disk->history = contract::Array::make();
-        host.fake.disks.push_back(disk);
-        host.fake.selection = {disk};
+        host.disks.push_back(disk);
+        host.selection = {disk};
         interface->widget().resize(640, 560);
         interface->widget().show();
         selectDisk();
