@@ -9,13 +9,6 @@
 #include <utility>
 
 namespace orvane::desktop {
-namespace {
-
-// Of the report that a module gives when its job is over (fixwell/history/CompletionReport.h).
-const contract::Name reportResultKey{"kOVOP_ResultKey"};
-constexpr std::string_view reportOfFailure = "kOVOP_FailKey";
-
-}  // namespace
 
 JobWatch::JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& closer,
                    const SessionBuses& buses, std::chrono::milliseconds glance,
@@ -52,7 +45,7 @@ void JobWatch::begin()
 
 void JobWatch::reported(const contract::Dictionary& report)
 {
-    job_.hasFailed = report.string(reportResultKey) == reportOfFailure;
+    job_.hasFailed = report.string(contract::kOVOP_ResultKey) == contract::kOVOP_FailKey.text();
 }
 
 // The repair does not wait for the lock, which only makes it less likely to be cut off.

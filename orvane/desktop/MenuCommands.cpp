@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/MenuCommands.h"
 
+#include "contract/toolkit/ControlNames.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QFile>
@@ -11,6 +12,9 @@
 #include <utility>
 
 namespace orvane::desktop {
+
+namespace outlet = contract::outlet;
+
 namespace {
 
 constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
@@ -40,10 +44,10 @@ std::vector<Menu> MenuCommands::menus()
     return {{"&File", fileCommands()},
             {"&Edit", editCommands()},
             {"Dis&k",
-             {buttonCommand("verifyDisk", "&Verify Disk", "verifyDiskButton"),
-              buttonCommand("repairDisk", "&Repair Disk", "repairDiskButton"), line,
-              mapCommand("verifyMap", "Verify Partition &Map", "verifyDiskButton"),
-              mapCommand("repairMap", "Repair &Partition Map", "repairDiskButton")},
+             {buttonCommand("verifyDisk", "&Verify Disk", outlet::verifyDisk),
+              buttonCommand("repairDisk", "&Repair Disk", outlet::repairDisk), line,
+              mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
+              mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)},
              diskMenu},
             {"&View", {detailsCommand()}},
             {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
@@ -121,7 +125,7 @@ std::vector<MenuCommand> MenuCommands::editCommands()
 MenuCommand MenuCommands::detailsCommand()
 {
     const auto button = [this] {
-        return at_.tabs.button("showDetailsButton");
+        return at_.tabs.button(outlet::showDetails);
     };
     return {"showDetails",
             "Show &Details",
@@ -145,7 +149,7 @@ MenuCommand MenuCommands::diskCommand(const char* objectName, std::string_view t
 }
 
 MenuCommand MenuCommands::buttonCommand(const char* objectName, std::string_view title,
-                                        const char* button)
+                                        std::string_view button)
 {
     return {objectName,
             title,
@@ -158,7 +162,7 @@ MenuCommand MenuCommands::buttonCommand(const char* objectName, std::string_view
 }
 
 MenuCommand MenuCommands::mapCommand(const char* objectName, std::string_view title,
-                                     const char* button)
+                                     std::string_view button)
 {
     return {objectName,
             title,
@@ -246,7 +250,7 @@ std::shared_ptr<Disk> MenuCommands::diskWithMap()
 
 // The module takes the map of what is selected as a whole disk, as it does with a device; of an
 // image it takes the volumes.
-void MenuCommands::treatMap(const char* button)
+void MenuCommands::treatMap(std::string_view button)
 {
     at_.controller.setSelection({diskWithMap()});
     at_.tabs.active()->tellOfSelection();

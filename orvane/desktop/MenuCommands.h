@@ -37,8 +37,9 @@ private:
     MenuCommand detailsCommand();
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
                             DiskAction action);
-    MenuCommand buttonCommand(const char* objectName, std::string_view title, const char* button);
-    MenuCommand mapCommand(const char* objectName, std::string_view title, const char* button);
+    MenuCommand buttonCommand(const char* objectName, std::string_view title,
+                              std::string_view button);
+    MenuCommand mapCommand(const char* objectName, std::string_view title, std::string_view button);
 
     bool isLocked() const { return at_.controller.interfaceLock(); }
     void chooseImages(std::string_view title,
@@ -50,7 +51,7 @@ private:
     void selectAll();
     void undoClearing();
     std::shared_ptr<Disk> diskWithMap();
-    void treatMap(const char* button);
+    void treatMap(std::string_view button);
 
     const SessionParts at_;
     DiskPane& disks_;

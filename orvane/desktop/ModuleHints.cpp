@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/ModuleHints.h"
 
+#include "contract/toolkit/ControlNames.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/jobs/UnavailableReason.h"
 
@@ -9,6 +10,9 @@
 #include <utility>
 
 namespace orvane::desktop {
+
+namespace outlet = contract::outlet;
+
 namespace {
 
 // The module puts its reason behind what the button does.
@@ -21,7 +25,7 @@ std::string reasonOfModule(const QtButton& button)
 
 bool isForPermissions(std::string_view button)
 {
-    return button.find("Permissions") != std::string_view::npos;
+    return button == outlet::verifyPermissions || button == outlet::repairPermissions;
 }
 
 }  // namespace
@@ -53,9 +57,8 @@ void ModuleHints::tellReasons()
         return;
     const auto disks = at_.window.disks().selectedDisks();
     const bool isLocked = at_.controller.interfaceLock();
-    const auto reasons =
-        !isLocked && disks.size() > 1 ? reasonsByDisk() : std::map<std::string, std::string>();
-    for (const char* const name : actionButtons)
+    const auto reasons = !isLocked && disks.size() > 1 ? reasonsByDisk() : ReasonsByButton();
+    for (const std::string_view name : outlet::actions)
         if (QtButton* const button = at_.tabs.button(name)) {
             if (isLocked)
                 button->setReason(text("Not available while a job runs."));
@@ -66,7 +69,7 @@ void ModuleHints::tellReasons()
             else if (const auto found = reasons.find(name); found != reasons.end())
                 button->setReason(found->second);
         }
-    if (QtButton* const clear = at_.tabs.button("clearHistoryButton"))
+    if (QtButton* const clear = at_.tabs.button(outlet::clearHistory))
         clear->setReason(
             text(isLocked ? "Not available while a job runs." : "There is no history to clear."));
 }
@@ -86,23 +89,23 @@ std::string ModuleHints::reasonFor(const Disk& disk, std::string_view button)
 }
 
 // For several disks a module says that it is because of one of them. Each is asked about alone.
-std::map<std::string, std::string> ModuleHints::reasonsByDisk()
+ModuleHints::ReasonsByButton ModuleHints::reasonsByDisk()
 {
     constexpr std::size_t mostAsked = 32;
-    std::map<std::string, std::string> reasons;
-    const auto isGrey = [this](const char* name) {
+    ReasonsByButton reasons;
+    const auto isGrey = [this](std::string_view name) {
         QtButton* const button = at_.tabs.button(name);
         return button != nullptr && !button->isEnabled();
     };
-    std::vector<const char*> grey;
-    std::copy_if(actionButtons.begin(), actionButtons.end(), std::back_inserter(grey), isGrey);
+    std::vector<std::string_view> grey;
+    std::copy_if(outlet::actions.begin(), outlet::actions.end(), std::back_inserter(grey), isGrey);
     const auto disks = at_.window.disks().selectedDisks();
     if (grey.empty() || disks.size() > mostAsked)
         return reasons;
     for (const auto& disk : disks) {
         at_.controller.setSelection({disk});
         at_.tabs.active()->tellOfSelection();
-        for (const char* const name : grey) {
+        for (const std::string_view name : grey) {
             if (!isGrey(name))
                 continue;
             const std::string own = reasonOfModule(*at_.tabs.button(name));
@@ -128,7 +131,7 @@ std::string ModuleHints::emptyText()
         if (const std::string why = whyUnavailable(*disks.front(), library_, at_.host.translator());
             !why.empty())
             return why;
-    const QtButton* const verify = at_.tabs.button("verifyDiskButton");
+    const QtButton* const verify = at_.tabs.button(outlet::verifyDisk);
     if (verify == nullptr || !verify->isEnabled())
         return text("There is no history of what is selected.");
     return at_.host.translator().sentence(

@@ -25,10 +25,12 @@ public:
     void refresh();
 
 private:
+    using ReasonsByButton = std::map<std::string_view, std::string>;
+
     void tellEmptyText();
     void tellReasons();
     std::string reasonFor(const Disk& disk, std::string_view button);
-    std::map<std::string, std::string> reasonsByDisk();
+    ReasonsByButton reasonsByDisk();
     std::string emptyText();
     std::string text(std::string_view key) { return at_.host.translator().text(key); }
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/ModuleTabs.h"
 
+#include "contract/toolkit/ControlNames.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QLabel>
@@ -82,9 +83,10 @@ bool ModuleTab::stopJob()
 {
     if (interface_ == nullptr)
         return false;
-    for (const char* const name : actionButtons) {
+    for (const std::string_view name : contract::outlet::actions) {
         QtButton* const button = interface_->button(name);
-        if (button != nullptr && button->action() == "stopAction:" && button->isEnabled()) {
+        if (button != nullptr && button->action() == contract::selector::stop &&
+            button->isEnabled()) {
             button->press();
             return true;
         }

@@ -8,7 +8,6 @@
 #include "orvane/support/modules/ModuleLoader.h"
 #include "pellar/Manager.h"
 
-#include <array>
 #include <filesystem>
 #include <memory>
 #include <string>
@@ -72,10 +71,6 @@ private:
     LoadedInterface* interface_ = nullptr;  ///< of the host's loader
     bool isActive_ = false;
 };
-
-/// The buttons with which a module verifies and repairs, by their outlets.
-inline constexpr std::array actionButtons{"verifyDiskButton", "repairDiskButton",
-                                          "verifyPermissionsButton", "repairPermissionsButton"};
 
 /// The modules' tabs, in the order of the window's. Main thread.
 class ModuleTabs {

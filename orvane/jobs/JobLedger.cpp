@@ -38,13 +38,12 @@ bool hasAnswer(const Run& run)
 // As the modules make the heading of an error (fixwell/messagelog).
 contract::Dictionary headingOfError(const std::string& sentence)
 {
-    constexpr int heading = -1;
     constexpr double points = 11;
     const contract::Color red{1, 0, 0, 1};
     return contract::Dictionary::of(
         {{contract::kFsckMessageType, contract::kFsckFail},
          {contract::kFsckMessageString, std::string_view(sentence)},
-         {contract::kFsckVerbosity, heading},
+         {contract::kFsckVerbosity, contract::verbosity::heading},
          {contract::Name("kOV_finalAttributedString_type"),
           contract::StyledText::make(sentence + "\n",
                                      {contract::Font::boldSystem(points), red, {}})}});

@@ -23,11 +23,9 @@ contract::StyledText textOfRow(contract::OutlineView& view, std::size_t row)
     return textOfItem(view, view.itemAtRow(row));
 }
 
-// As in fixwell/messagelog.
 bool isDetail(const contract::OutlineItem& item)
 {
-    constexpr std::int64_t leastVerbosity = 1;
-    return item.integer(contract::kFsckVerbosity) >= leastVerbosity;
+    return item.integer(contract::kFsckVerbosity) >= contract::verbosity::detail;
 }
 
 void LogModel::setView(contract::OutlineView* view)

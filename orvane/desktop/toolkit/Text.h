@@ -3,7 +3,7 @@
 
 #include "contract/foundation/Bundle.h"
 #include "contract/foundation/StyledText.h"
-#include "contract/foundation/UserDefaults.h"
+#include "contract/support/OVPreferences.h"
 
 #include <QByteArray>
 #include <QString>
