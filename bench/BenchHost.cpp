@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "bench/BenchHost.h"
 
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
 #include <stdexcept>

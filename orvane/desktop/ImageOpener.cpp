@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/ImageOpener.h"
 
-#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/DiskLookup.h"
 
 #include <utility>
 

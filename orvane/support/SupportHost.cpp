@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/SupportHost.h"
 
-#include "orvane/support/texts/DecimalNumbers.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/time/TimeEstimator.h"
+#include "orvane/support/texts/TimeEstimator.h"
 
 #include <utility>
 
@@ -31,7 +30,7 @@ Translator translatorOf(const ModuleBundle& bundle)
 
 }  // namespace
 
-SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
+SupportHost::SupportHost(SupportOptions options, EventLoop& loop)
     : options_(std::move(options)),
       loop_(loop),
       bundle_(options_.hostBundle, hostTable),

@@ -3,7 +3,7 @@
 
 #include "orvane/jobs/HostReasons.h"
 #include "orvane/privileges/LibraryOptions.h"
-#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/texts/ErrorTexts.h"

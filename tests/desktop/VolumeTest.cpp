@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/UDisks.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/LoopDevice.h"

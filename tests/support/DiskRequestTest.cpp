@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DiskReader.h"
 #include "orvane/support/udisks/DiskRequest.h"
-#include "orvane/support/udisks/DriveHealth.h"
+#include "orvane/support/udisks/UDisks.h"
 
 #include <gtest/gtest.h>
 

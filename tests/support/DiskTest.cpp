@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TemporaryDirectory.h"
+#include "orvane/support/DiskLookup.h"
 #include "orvane/support/disks/DiskController.h"
-#include "orvane/support/disks/DiskLookup.h"
 #include "orvane/support/disks/MountTable.h"
 #include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/disks/UdevDatabase.h"

@@ -2,7 +2,6 @@
 #include "TemporaryDirectory.h"
 #include "ToolRun.h"
 #include "orvane/support/disks/DiskController.h"
-#include "orvane/support/disks/DiskEvents.h"
 #include "orvane/support/disks/DiskWatch.h"
 #include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/loop/MainLoop.h"

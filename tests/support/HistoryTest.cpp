@@ -5,7 +5,6 @@
 #include "orvane/support/disks/Disk.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/DiskHistories.h"
-#include "orvane/support/history/HistoryKey.h"
 #include "orvane/support/history/HistoryStore.h"
 #include "orvane/support/settings/ValueJSON.h"
 

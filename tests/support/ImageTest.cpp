@@ -3,8 +3,7 @@
 #include "ToolRun.h"
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/images/ImageAttacher.h"
-#include "orvane/support/images/ImageContents.h"
-#include "orvane/support/images/ImageDisks.h"
+#include "orvane/support/images/ImageFile.h"
 #include "orvane/support/loop/Notifications.h"
 
 #include <gtest/gtest.h>

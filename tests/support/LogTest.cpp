@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TemporaryDirectory.h"
-#include "orvane/support/log/ActivityLog.h"
+#include "orvane/support/files/ActivityLog.h"
 
 #include <gtest/gtest.h>
 

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/support/texts/DecimalNumbers.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/texts/ModuleBundle.h"
-#include "orvane/support/time/TimeEstimator.h"
+#include "orvane/support/texts/TimeEstimator.h"
 #include "tests/support/TemporaryDirectory.h"
 
 #include <gtest/gtest.h>

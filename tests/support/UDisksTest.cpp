@@ -3,10 +3,9 @@
 #include "ToolRun.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "orvane/support/udisks/BusCall.h"
+#include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
-#include "orvane/support/udisks/ImageDevices.h"
-#include "orvane/support/udisks/MountedAt.h"
 #include "orvane/support/udisks/UDisks.h"
 #include "pellar/volumes/DiskClaim.h"
 #include "tests/support/BusDaemon.h"
@@ -232,7 +231,7 @@ TEST_F(DirectTest, RootAttachesAnImageUntilItIsDetached)
 
 TEST_F(DirectTest, AnImageInUseComesOffLater)
 {
-    const FileDescriptor user(::open(device_->name().c_str(), O_RDONLY | O_CLOEXEC));
+    const pellar::FileDescriptor user(::open(device_->name().c_str(), O_RDONLY | O_CLOEXEC));
     EXPECT_EQ(
         kindOf(carryOut(request(DiskAction::Detach, DiskStep::Kind::DetachLoop, device_->name()))),
         Kind::Lingers);

@@ -3,7 +3,7 @@
 
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 
 #include <QLocale>
 #include <QStringList>

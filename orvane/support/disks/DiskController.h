@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/support/OVDiskController.h"
-#include "orvane/support/Failure.h"
 #include "orvane/support/disks/Disk.h"
+#include "orvane/support/files/Failure.h"
 
 #include <functional>
 #include <memory>

@@ -3,8 +3,8 @@
 
 #include "orvane/support/disks/BlockProbe.h"
 #include "orvane/support/disks/UdevDatabase.h"
-#include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -88,7 +88,7 @@ struct Contents {
 Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
                     const DiskSources& sources)
 {
-    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!device)
         return {superblockFromUdev(number, sources), {}};
     const ByteRange all{0, size};

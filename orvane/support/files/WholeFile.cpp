@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/files/WholeFile.h"
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -44,7 +44,7 @@ public:
 
 private:
     std::string name_;
-    FileDescriptor descriptor_;
+    pellar::FileDescriptor descriptor_;
     bool isRenamed_ = false;
 };
 
@@ -52,7 +52,7 @@ private:
 // which takes nothing away from the file.
 void syncDirectory(const std::filesystem::path& directory)
 {
-    const FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const pellar::FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (opened)
         ::fsync(opened.get());
 }
@@ -81,7 +81,7 @@ int writeAll(int descriptor, std::string_view bytes)
 
 std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
 {
-    const FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!opened)
         return errno;
     struct stat status = {};

@@ -2,11 +2,20 @@
 #include "orvane/support/history/DiskHistories.h"
 
 #include "contract/foundation/Dictionary.h"
-#include "orvane/support/history/HistoryKey.h"
 
 #include <algorithm>
 
 namespace orvane {
+
+std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID)
+{
+    if (disk.uuid.empty())
+        return "disk:" + disk.identifier + "@" + std::to_string(disk.offset);
+    const bool isInImage = disk.storage == contract::DiskReference::Storage::FileRegion;
+    if (isInImage || sharesUUID)
+        return "uuid:" + disk.uuid + "@" + disk.identifier;
+    return "uuid:" + disk.uuid;
+}
 
 using contract::Array;
 

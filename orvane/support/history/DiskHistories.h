@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/DiskFacts.h"
+#include "orvane/support/disks/DiskHistory.h"
 #include "orvane/support/history/HistoryStore.h"
 
 #include <functional>
@@ -10,6 +11,15 @@
 #include <string>
 
 namespace orvane {
+
+/// What a volume's history is filed under.
+///
+/// A file system on a device is known by its UUID, because device names change from one start to
+/// the next. Copies of a device have the same UUID, so while two are known at one time,
+/// `sharesUUID` tells them apart by their identifiers. An image file is known by its path as well
+/// as by its UUID: copies of images are everyday things, and they are not checked at one time.
+/// What has no UUID is known by its identifier.
+[[nodiscard]] std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID);
 
 /// The histories in memory: each is read from the store when it is first asked for, and lives
 /// until the program ends, so that a disk that goes and comes again finds its records. Main thread

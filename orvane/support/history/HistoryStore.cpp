@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/history/HistoryStore.h"
 
-#include "orvane/support/history/HistorySchema.h"
+#include "orvane/support/history/HistoryDatabase.h"
 
 #include <utility>
 

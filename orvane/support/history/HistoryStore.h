@@ -2,12 +2,11 @@
 #pragma once
 
 #include "contract/foundation/Array.h"
-#include "orvane/support/Failure.h"
-#include "orvane/support/history/Checkpointer.h"
+#include "orvane/support/files/Failure.h"
 #include "orvane/support/history/Database.h"
-#include "orvane/support/history/InternTable.h"
+#include "orvane/support/history/HistoryDatabase.h"
 #include "orvane/support/history/RecordTable.h"
-#include "orvane/support/history/RunLedger.h"
+#include "orvane/support/history/RunTable.h"
 
 #include <cstdint>
 #include <filesystem>
@@ -67,7 +66,7 @@ private:
 
         InternTable volumes;
         RecordTable records;
-        RunLedger runs;
+        RunTable runs;
     };
     /// Why the database did not do what it was asked.
     struct Mishap {

@@ -2,9 +2,9 @@
 #pragma once
 
 #include "contract/foundation/Array.h"
-#include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/DiskHistory.h"
 #include "orvane/support/history/Database.h"
-#include "orvane/support/history/RecordVocabulary.h"
+#include "orvane/support/history/RecordEncoding.h"
 
 #include <chrono>
 #include <cstdint>

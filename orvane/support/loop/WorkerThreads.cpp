@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/loop/WorkerThreads.h"
 
-#include "orvane/support/loop/Outbox.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <algorithm>
 #include <system_error>
@@ -11,7 +11,7 @@
 
 namespace orvane {
 
-class WorkerThreads::Worker final : public Outbox {
+class WorkerThreads::Worker final : public DeliveryQueue {
 public:
     explicit Worker(WorkerThreads& o) : owner(o) {}
 
@@ -21,12 +21,12 @@ public:
             owner.perform(*this, std::move(task));
             return;
         }
-        const auto meeting = std::make_shared<Rendezvous>();
+        const auto meeting = std::make_shared<AwaitedTask>();
         {
             const std::lock_guard guard(owner.lock_);
             rendezvous = meeting;
         }
-        owner.perform(*this, Rendezvous::taskFor(meeting, std::move(task)));
+        owner.perform(*this, AwaitedTask::taskFor(meeting, std::move(task)));
         meeting->wait();
     }
 
@@ -43,12 +43,12 @@ public:
     std::thread thread;
     // All guarded by the owner's lock.
     std::vector<contract::RunLoop::Task> heldBack;
-    std::shared_ptr<Rendezvous> rendezvous;  ///< the one it waited at last
+    std::shared_ptr<AwaitedTask> rendezvous;  ///< the one it waited at last
     bool isFirst = false;                    ///< nothing needs to be held back
     bool isOver = false;
 };
 
-WorkerThreads::WorkerThreads(HostLoop& loop) : loop_(loop) {}
+WorkerThreads::WorkerThreads(EventLoop& loop) : loop_(loop) {}
 
 WorkerThreads::~WorkerThreads()
 {

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/support/ModuleEntry.h"
-#include "orvane/support/Failure.h"
-#include "orvane/support/texts/ModuleBundle.h"
+#include "orvane/support/files/Failure.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <filesystem>
 #include <memory>

@@ -4,6 +4,8 @@
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
 
+#include <sys/statvfs.h>
+
 #include <algorithm>
 #include <array>
 #include <cctype>
@@ -121,6 +123,29 @@ void SettingsFile::goOnInMemory(const std::string& sentence)
 {
     file_.clear();
     warn_(sentence + "; changed settings hold until the program ends");
+}
+
+namespace {
+
+constexpr std::string_view showDetailsKey = "showDetailsInFixwell";
+
+}  // namespace
+
+bool isMountedReadOnly(const std::filesystem::path& path)
+{
+    struct statvfs status = {};
+    return ::statvfs(path.c_str(), &status) == 0 && (status.f_flag & ST_RDONLY) != 0;
+}
+
+bool Preferences::showDetailsInFixwell() const
+{
+    return settings_.objectForKey(showDetailsKey).boolean();
+}
+
+void Preferences::setShowDetailsInFixwell(bool shows)
+{
+    if (shows != showDetailsInFixwell())
+        settings_.setObjectForKey(shows, showDetailsKey);
 }
 
 }  // namespace orvane

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "contract/support/OVPreferences.h"
-#include "orvane/support/Failure.h"
+#include "orvane/support/files/Failure.h"
 
 #include <filesystem>
 #include <map>
@@ -36,6 +36,22 @@ private:
     std::filesystem::path file_;
     WarningSink warn_;
     Settings settings_;
+};
+
+/// Whether the file system at `path` is mounted read-only (statvfs(3)); NO when it cannot be told.
+[[nodiscard]] bool isMountedReadOnly(const std::filesystem::path& path);
+
+/// The preferences, kept in the stored settings, which must outlive this object.
+class Preferences final : public contract::OVPreferences {
+public:
+    explicit Preferences(contract::UserDefaults& settings) : settings_(settings) {}
+
+    bool showDetailsInFixwell() const override;
+    void setShowDetailsInFixwell(bool shows) override;
+    bool rootVolumeIsReadOnly() const override { return isMountedReadOnly("/"); }
+
+private:
+    contract::UserDefaults& settings_;
 };
 
 }  // namespace orvane

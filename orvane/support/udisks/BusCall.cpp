@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/BusCall.h"
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <poll.h>
 #include <sys/eventfd.h>
@@ -37,7 +37,7 @@ private:
         static_cast<void>(!::write(descriptor_.get(), &one, sizeof one));
     }
 
-    FileDescriptor descriptor_;
+    pellar::FileDescriptor descriptor_;
     std::stop_callback<std::function<void()>> callback_;
 };
 

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DirectDisks.h"
 
-#include "orvane/support/files/FileDescriptor.h"
-#include "orvane/support/udisks/MountedAt.h"
+#include "pellar/mounts/Holders.h"
 #include "pellar/mounts/MountCall.h"
 #include "pellar/mounts/MountContext.h"
+#include "pellar/process/FileDescriptor.h"
 #include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
@@ -16,7 +16,24 @@
 #include <cerrno>
 #include <memory>
 
-namespace orvane::direct {
+namespace orvane {
+
+std::vector<pellar::MountPlace> placesOf(const std::string& node)
+{
+    return pellar::mountPlacesOf(std::filesystem::path(node), pellar::SystemPaths());
+}
+
+std::string holdersText(const std::vector<pellar::MountPlace>& places)
+{
+    std::vector<std::string> holders;
+    for (const pellar::MountPlace& place : places)
+        for (const std::string& holder : pellar::holdersOf(place.target))
+            holders.push_back(holder);
+    return pellar::shownNames(holders);
+}
+
+namespace direct {
+
 namespace {
 
 struct Free {
@@ -51,7 +68,7 @@ std::string targetInTable(const std::string& node)
 
 Answer<> control(const std::string& node, unsigned long request)
 {
-    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     return answerOf(!device || ::ioctl(device.get(), request, 0) != 0 ? errno : 0);
 }
 
@@ -115,4 +132,6 @@ Answer<std::string> setUpLoop(int file, pellar::Access access)
     return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
 }
 
-}  // namespace orvane::direct
+}  // namespace direct
+
+}  // namespace orvane

@@ -2,11 +2,21 @@
 #pragma once
 
 #include "orvane/support/udisks/Refusal.h"
+#include "pellar/mounts/MountPlace.h"
 #include "pellar/process/Access.h"
 
 #include <string>
+#include <vector>
 
-namespace orvane::direct {
+namespace orvane {
+
+/// Where the device with this node is mounted, in the order in which it was. Any thread.
+[[nodiscard]] std::vector<pellar::MountPlace> placesOf(const std::string& node);
+
+/// Who keeps these places busy, "name (number)", as far as this user may see; printable.
+[[nodiscard]] std::string holdersText(const std::vector<pellar::MountPlace>& places);
+
+namespace direct {
 
 // What root does without UDisks2, by libmount and ioctl(2). All take the node of a block device;
 // any thread, and may take minutes.
@@ -22,4 +32,6 @@ namespace orvane::direct {
 /// A loop device on an open file that stays; its node.
 [[nodiscard]] Answer<std::string> setUpLoop(int file, pellar::Access access);
 
-}  // namespace orvane::direct
+}  // namespace direct
+
+}  // namespace orvane

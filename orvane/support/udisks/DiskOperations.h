@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
 #include "orvane/support/udisks/DiskRequest.h"
+#include "orvane/support/udisks/Refusal.h"
+#include "pellar/process/Access.h"
 
 #include <cstdint>
+#include <filesystem>
 #include <functional>
 #include <map>
 #include <memory>
@@ -14,6 +17,17 @@
 #include <vector>
 
 namespace orvane {
+
+/// Makes an image file a device of the system that stays until it is detached: through UDisks2, or
+/// itself where there is none and this is root. Answers the device's node. IsReadOnly where the
+/// file is to be written and this user may not; BeingUsed while a job of ours works on it, and
+/// none can begin on it meanwhile; Attached where it is. Not on the main thread: may take minutes.
+[[nodiscard]] Answer<std::string> attachImage(const std::filesystem::path& image,
+                                              pellar::Access access,
+                                              const std::stop_token& stop = {});
+
+/// How this user may open the file.
+[[nodiscard]] pellar::Access accessTo(const std::filesystem::path& image);
 
 /// Does all the steps of a request through UDisks2, or itself where there is none and this is
 /// root. Not on the main thread: may take minutes. Abandoned when the thread is asked to stop.
@@ -26,7 +40,7 @@ public:
     using Finished = std::function<void(const std::vector<std::string>& failures)>;
 
     /// The loop outlives this object; `texts` too.
-    DiskOperations(HostLoop& loop, const Translator& texts) : loop_(loop), texts_(texts) {}
+    DiskOperations(EventLoop& loop, const Translator& texts) : loop_(loop), texts_(texts) {}
     DiskOperations(const DiskOperations&) = delete;
     DiskOperations& operator=(const DiskOperations&) = delete;
     /// Waits for nobody's password: what UDisks2 has been asked for, it goes on with alone. What
@@ -55,7 +69,7 @@ private:
                                            const std::stop_token& stop);
     void finish(Number number, const std::vector<Result>& results);
 
-    HostLoop& loop_;
+    EventLoop& loop_;
     const Translator& texts_;
     Number latest_ = 0;
     /// Handed to the task that reports back, which finds it empty when this object has gone.

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/UTF8.h"
+#include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/DiskOperations.h"
-#include "orvane/support/udisks/ImageDevices.h"
-#include "orvane/support/udisks/MountedAt.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/Commands.h"
 #include "pellar/volumes/DiskUse.h"

@@ -1,0 +1,94 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/loop/EventLoop.h"
+
+#include <utility>
+
+namespace orvane {
+namespace {
+
+/// Abandons when the last copy of the task is destroyed; harmless after the task has run.
+struct Ticket {
+    explicit Ticket(std::shared_ptr<AwaitedTask> r) : rendezvous(std::move(r)) {}
+    Ticket(const Ticket&) = delete;
+    Ticket& operator=(const Ticket&) = delete;
+    ~Ticket() { rendezvous->abandon(); }
+
+    std::shared_ptr<AwaitedTask> rendezvous;
+};
+
+}  // namespace
+
+contract::RunLoop::Task AwaitedTask::taskFor(const std::shared_ptr<AwaitedTask>& rendezvous,
+                                           contract::RunLoop::Task task)
+{
+    return [ticket = std::make_shared<Ticket>(rendezvous), task = std::move(task)] {
+        ticket->rendezvous->run(task);
+    };
+}
+
+void AwaitedTask::run(const contract::RunLoop::Task& task)
+{
+    {
+        const std::lock_guard guard(lock_);
+        if (state_ != State::Pending)
+            return;
+        state_ = State::Running;
+    }
+    task();
+    const std::lock_guard guard(lock_);
+    state_ = State::Over;
+    changed_.notify_all();
+}
+
+void AwaitedTask::wait()
+{
+    std::unique_lock guard(lock_);
+    changed_.wait(guard, [this] { return state_ == State::Over; });
+}
+
+void AwaitedTask::abandon()
+{
+    const std::lock_guard guard(lock_);
+    if (state_ == State::Pending) {
+        state_ = State::Over;
+        changed_.notify_all();
+    }
+}
+
+namespace {
+
+thread_local DeliveryQueue* current = nullptr;
+
+}  // namespace
+
+DeliveryQueue* DeliveryQueue::ofThisThread()
+{
+    return current;
+}
+
+DeliveryQueue::Scope::Scope(DeliveryQueue& outbox) : before_(current)
+{
+    current = &outbox;
+}
+
+DeliveryQueue::Scope::~Scope()
+{
+    current = before_;
+}
+
+void EventLoop::performOnMainThread(Task task, Wait wait)
+{
+    if (DeliveryQueue* const outbox = DeliveryQueue::ofThisThread()) {
+        outbox->perform(std::move(task), wait);
+    } else if (wait == Wait::No) {
+        post(std::move(task));
+    } else if (isMainThread()) {
+        task();
+    } else {
+        const auto rendezvous = std::make_shared<AwaitedTask>();
+        post(AwaitedTask::taskFor(rendezvous, std::move(task)));
+        rendezvous->wait();
+    }
+}
+
+}  // namespace orvane
