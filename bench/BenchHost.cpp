@@ -39,7 +39,7 @@ DiskTree sampleDisk()
 {
     DiskTree tree;
     tree.facts.identifier = "/somewhere/on/this/machine/sample.img#0";
-    tree.facts.displayName = "sample";
+    tree.facts.name = "sample";
     tree.facts.type = diskType::bareVolume;
     tree.facts.filesystem = "ext4";
     tree.facts.path = "/somewhere/on/this/machine/sample.img";

@@ -13,7 +13,7 @@ namespace orvane {
 
 namespace fs = std::filesystem;
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::find(std::string_view name)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::find(std::string_view name)
 {
     if (name.empty())
         return cannotUse(name, translator_.text("it has no name"));
@@ -30,7 +30,8 @@ Failure DiskLookup::cannotUse(std::string_view object, std::string_view reason) 
     return {translator_.sentence("cannot use ‘%@’: %@", {contract::printable(object), reason})};
 }
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::findByTag(std::string_view tag, std::string_view value)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::findByTag(std::string_view tag,
+                                                             std::string_view value)
 {
     const bool isLabel = tag == "LABEL=";
     std::vector<std::shared_ptr<Disk>> meant;
@@ -49,7 +50,7 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findByTag(std::string_view tag, std::
     return meant.front();
 }
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::findFile(const fs::path& path)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::findFile(const fs::path& path)
 {
     struct stat status = {};
     if (::stat(path.c_str(), &status) != 0)
@@ -64,7 +65,7 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findFile(const fs::path& path)
     }
 }
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::findDevice(const fs::path& path)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::findDevice(const fs::path& path)
 {
     std::error_code error;
     const fs::path node = fs::canonical(path, error);
@@ -78,7 +79,7 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findDevice(const fs::path& path)
     return controller_.addDevice(*facts);
 }
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::findMountPoint(const fs::path& path)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::findMountPoint(const fs::path& path)
 {
     std::error_code error;
     const fs::path directory = fs::canonical(path, error);
@@ -95,12 +96,12 @@ Outcome<std::shared_ptr<Disk>> DiskLookup::findMountPoint(const fs::path& path)
                                                    : "this directory is no mount point"));
 }
 
-Outcome<std::shared_ptr<Disk>> DiskLookup::findImage(const fs::path& path)
+Result<std::shared_ptr<Disk>, Failure> DiskLookup::findImage(const fs::path& path)
 {
     auto opened = openImage(path, translator_);
-    if (failed(opened))
-        return cannotUse(path.native(), failureMessage(opened));
-    return controller_.addImage(factsOfImage(std::get<OpenImage>(opened)));
+    if (!opened)
+        return cannotUse(path.native(), opened.error().message);
+    return controller_.addImage(factsOfImage(*opened));
 }
 
 }  // namespace orvane

@@ -21,10 +21,10 @@ public:
 
     /// An image file or a device that was not known becomes known, and appears. Answers one
     /// sentence where there is no such disk. Never waits: not for a FIFO, not for a device.
-    [[nodiscard]] Outcome<std::shared_ptr<Disk>> find(std::string_view name);
+    [[nodiscard]] Result<std::shared_ptr<Disk>, Failure> find(std::string_view name);
 
 private:
-    using Found = Outcome<std::shared_ptr<Disk>>;
+    using Found = Result<std::shared_ptr<Disk>, Failure>;
 
     Found findByTag(std::string_view tag, std::string_view value);
     Found findFile(const std::filesystem::path& path);

@@ -79,7 +79,7 @@ void SupportHost::connectDisks()
 
 // Nobody waits for it on the main thread, not even where a module wishes to: somewhere a user may
 // be looking for the password. What fails is told later.
-Outcome<> SupportHost::start(DiskAction action, const Disk& disk)
+Result<void, Failure> SupportHost::start(DiskAction action, const Disk& disk)
 {
     if (isPossible(action, disk))
         operations_.start({requestFor(action, disk)},
@@ -87,7 +87,7 @@ Outcome<> SupportHost::start(DiskAction action, const Disk& disk)
                               for (const std::string& failure : failures)
                                   warn(failure);
                           });
-    return Done{};
+    return {};
 }
 
 void SupportHost::loadHistoriesLater()

@@ -84,7 +84,7 @@ public:
 private:
     void warn(const std::string& sentence);
     void connectDisks();
-    Outcome<> start(DiskAction action, const Disk& disk);
+    Result<void, Failure> start(DiskAction action, const Disk& disk);
     void loadHistoriesLater();
     void loadHistories();
 

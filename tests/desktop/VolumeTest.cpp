@@ -48,7 +48,7 @@ protected:
     /// What UDisks2 says to a device that is not mounted: known, or not yet.
     Refusal::Kind asked() const
     {
-        return std::get<Refusal>(UDisks().unmount(device_->name())).kind;
+        return UDisks().unmount(device_->name()).error().kind;
     }
     std::string mountPoint() { return cell(device_->name(), DiskColumn::MountPoint); }
     /// The commands for volumes that the open menu offers, by their first letters.

@@ -14,7 +14,7 @@ using contract::DiskReference;
 DiskFacts facts(const std::string& node, std::int32_t type, const std::string& mountPoint = "")
 {
     DiskFacts facts;
-    facts.identifier = facts.displayName = node;
+    facts.identifier = facts.name = node;
     facts.path = node;
     facts.type = type;
     facts.filesystem = type == diskType::whole ? "" : "ext4";

@@ -82,7 +82,7 @@ protected:
             GTEST_SKIP() << obstacle;
         ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label_, image_, "8M"}),
                   0);
-        ASSERT_FALSE(failed(watch_.start()));
+        ASSERT_TRUE(watch_.start());
     }
 
     void read() { disks_.synchronize(readSystemDisks(DiskSources())); }

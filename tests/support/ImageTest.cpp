@@ -44,12 +44,11 @@ int makeExt(const fs::path& image, std::uint64_t offset, std::uint64_t bytes,
 DiskTree disksIn(const fs::path& image)
 {
     const auto opened = openImage(image, Translator());
-    if (failed(opened)) {
-        ADD_FAILURE() << failureMessage(opened);
+    if (!opened) {
+        ADD_FAILURE() << opened.error().message;
         return {};
     }
-    const auto& open = std::get<OpenImage>(opened);
-    return disksOfImage(open, readContents(open));
+    return disksOfImage(*opened, readContents(*opened));
 }
 
 std::string outline(const DiskTree& tree)
@@ -69,7 +68,7 @@ TEST(ImageDisks, ABareFileSystemIsOneVolume)
     ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "B\x1b[31m\xff%s"), 0) << "mke2fs is needed";
     const DiskTree disk = disksIn(image);
     EXPECT_EQ(outline(disk), "0:type6:ext4");
-    EXPECT_EQ(disk.facts.displayName, "B\x1b[31m\xff%s") << "a label is any bytes";
+    EXPECT_EQ(disk.facts.name, "B\x1b[31m\xff%s") << "a label is any bytes";
     EXPECT_EQ(disk.facts.length, 8 * mebibyte);
     EXPECT_FALSE(disk.facts.isWhole);
     EXPECT_FALSE(disk.facts.uuid.empty());
@@ -109,7 +108,7 @@ TEST(ImageDisks, PartitionsOfAGPT)
     ASSERT_EQ(disk.children.size(), 4U);
     EXPECT_EQ(disk.children[0].facts.offset, mebibyte);
     EXPECT_EQ(disk.children[0].facts.length, 16 * mebibyte);
-    EXPECT_EQ(disk.children[0].facts.displayName, "disk.img#1");
+    EXPECT_EQ(disk.children[0].facts.name, "disk.img#1");
     EXPECT_EQ(disk.children[0].facts.identifier, image.native() + "#1");
 
     fs::resize_file(image, 20 * mebibyte);
@@ -146,8 +145,7 @@ TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
     ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "Data"), 0) << "mke2fs is needed";
     Notifications center;
     DiskController controller(center, {});
-    const auto offline =
-        controller.addImage(factsOfImage(std::get<OpenImage>(openImage(image, Translator()))));
+    const auto offline = controller.addImage(factsOfImage(*openImage(image, Translator())));
     ImageAttacher attacher({}, Translator());
     contract::Dictionary result;
     contract::OVDiskPointer top;

@@ -14,8 +14,7 @@ namespace orvane::test {
 int runTool(const std::vector<std::string>& arguments, std::string_view input)
 {
     const pellar::FileDescriptor standardInput(::memfd_create("input", 0));
-    if (writeAll(standardInput.get(), input) != 0 ||
-        ::lseek(standardInput.get(), 0, SEEK_SET) != 0)
+    if (writeAll(standardInput.get(), input) != 0 || ::lseek(standardInput.get(), 0, SEEK_SET) != 0)
         return -1;
     posix_spawn_file_actions_t actions;
     ::posix_spawn_file_actions_init(&actions);

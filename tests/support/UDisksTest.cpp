@@ -47,9 +47,9 @@ private:
 };
 
 template <class T>
-Kind kindOf(const Answer<T>& answer)
+Kind kindOf(const Result<T, Refusal>& answer)
 {
-    return std::get<Refusal>(answer).kind;
+    return answer.error().kind;
 }
 
 DiskRequest request(DiskAction action, DiskStep::Kind kind, const std::string& node)
@@ -123,18 +123,18 @@ protected:
         }
         for (const Access access : {Access::ReadWrite, Access::ReadOnly}) {
             const auto answer = attachImage(image, access);
-            ASSERT_EQ(answer.index(), 0U) << reasonText(std::get<Refusal>(answer), texts_);
-            const std::filesystem::path node = std::get<std::string>(answer);
+            ASSERT_TRUE(answer) << reasonText(answer.error(), texts_);
+            const std::filesystem::path node = *answer;
             std::ifstream isReadOnly("/sys/block" / node.filename() / "ro");
             EXPECT_EQ(isReadOnly.get(), access == Access::ReadOnly ? '1' : '0');
             const auto again = attachImage(image, Access::ReadOnly);
-            ASSERT_EQ(again.index(), 1U);
-            EXPECT_EQ(std::get<Refusal>(again), (Refusal{Kind::Attached, node}));
+            ASSERT_FALSE(again);
+            EXPECT_EQ(again.error(), (Refusal{Kind::Attached, node}));
             const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
             EXPECT_EQ(job.index(), 1U) << "a job on the file, too";
             const auto request =
                 orvane::request(DiskAction::Detach, DiskStep::Kind::DetachLoop, node);
-            EXPECT_EQ(carryOut(request).index(), 0U);
+            EXPECT_TRUE(carryOut(request));
         }
         EXPECT_EQ(pellar::DiskClaim::take(disk, Access::ReadWrite, {}).index(), 0U)
             << "no lock is left";
@@ -294,11 +294,11 @@ public:
         root_ = add("");
         root_->addObjectManager();
         manager_ = add("/Manager");
-        addMethod(*manager_, "org.freedesktop.UDisks2.Manager", "ResolveDevice",
-                  [](const Options&, const Options&) {
-                      return std::vector{
-                          sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
-                  });
+        addMethod(
+            *manager_, "org.freedesktop.UDisks2.Manager", "ResolveDevice",
+            [](const Options&, const Options&) {
+                return std::vector{sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
+            });
         finish(*manager_);
         addVolume();
         addDrive();
@@ -329,19 +329,27 @@ private:
                           unanswered_.push_back(std::move(result));
                       isAsked = true;
                   });
-        addProperties(
-            *volume_, "org.freedesktop.UDisks2.Block",
-            std::pair{"Device",
-                      [] { return std::vector<std::uint8_t>{'/', 'd', 'e', 'v', '/', 'x', 0}; }},
-            std::pair{"Drive",
-                      [] { return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d"); }});
+        addProperties(*volume_, "org.freedesktop.UDisks2.Block",
+                      std::pair{"Device",
+                                [] {
+                                    return std::vector<std::uint8_t>{'/', 'd', 'e', 'v',
+                                                                     '/', 'x', 0};
+                                }},
+                      std::pair{"Drive", [] {
+                                    return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d");
+                                }});
     }
     void addDrive()
     {
         drive_ = add("/drives/d");
         addProperties(*drive_, "org.freedesktop.UDisks2.Drive.Ata",
-                      std::pair{"SmartUpdated", [] { return std::uint64_t{1700000000}; }},
-                      std::pair{"SmartFailing", [] { return true; }});
+                      std::pair{"SmartUpdated",
+                                [] {
+                                    return std::uint64_t{1700000000};
+                                }},
+                      std::pair{"SmartFailing", [] {
+                                    return true;
+                                }});
     }
 
     std::unique_ptr<sdbus::IConnection> connection_;
@@ -412,9 +420,9 @@ TEST_F(FakeUDisksTest, TheHealthOfAllDrivesComesWithOneCall)
         udisks.askForFailingDrives();
         return udisks.failingDrives(longest);
     };
-    EXPECT_EQ(std::get<Refusal>(ask(20s)).kind, Kind::NoService);
+    EXPECT_EQ(ask(20s).error().kind, Kind::NoService);
     const FakeUDisks fake(bus_.address());
-    EXPECT_EQ(std::get<0>(ask(20s)), (std::set<std::string>{"/dev/x"}));
+    EXPECT_EQ(*ask(20s), (std::set<std::string>{"/dev/x"}));
 }
 
 }  // namespace

@@ -39,7 +39,7 @@ QString nameText(const DiskRow& row)
                            facts.type != diskType::diskImage;
     if (!label.isEmpty() && !isInImage && !file.isEmpty())
         return label + QStringLiteral(" (") + file + QLatin1Char(')');
-    const QString name = shown(facts.displayName);
+    const QString name = shown(facts.name);
     return name.isEmpty() ? file : name;
 }
 

@@ -16,10 +16,6 @@
 
 namespace orvane {
 
-/// Files on this kind of file system (as libblkid or the kernel names it) have owners of their own.
-/// NO for an unknown one: Linux then makes an owner up for all of them (mount(8), "uid=").
-[[nodiscard]] bool hasOwners(std::string_view filesystemType);
-
 /// What the installed tools can do for one type of file system.
 struct FilesystemCapabilities {
     bool canVerify = false;
@@ -78,7 +74,7 @@ public:
 
     std::string diskIdentifier() const override { return facts_.identifier; }
     /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.
-    std::string displayName() const override { return contract::printable(facts_.displayName); }
+    std::string displayName() const override { return contract::printable(facts_.name); }
     std::int32_t diskType() const override { return facts_.type; }
     std::int64_t diskNumber() const override { return facts_.number; }
     bool isWhole() const override { return facts_.isWhole; }

@@ -20,8 +20,8 @@ class DiskController final : public contract::OVDiskController {
 public:
     /// What reaches outside. An empty function is an operation that cannot be done here.
     struct Hooks {
-        std::function<Outcome<>(const Disk& disk)> mount;
-        std::function<Outcome<>(const Disk& disk)> eject;
+        std::function<Result<void, Failure>(const Disk& disk)> mount;
+        std::function<Result<void, Failure>(const Disk& disk)> eject;
         /// How notifyFrontmostModulesOnly delivers.
         std::function<void(contract::Name name, const contract::Notification&)> notifyFrontmost;
         WarningSink warn;
@@ -84,7 +84,7 @@ private:
     void forget(const std::shared_ptr<Disk>& root);
     void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
     void bringUpToDate(const std::shared_ptr<Disk>& image, const DiskFacts& contents);
-    void warn(const Outcome<>& outcome);
+    void warn(const Result<void, Failure>& outcome);
 
     contract::NotificationCenter& center_;
     Disk::Surroundings surroundings_;

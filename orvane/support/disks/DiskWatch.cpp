@@ -164,7 +164,7 @@ DiskWatch::~DiskWatch()
 }
 
 // The watcher is made here, not in its thread: it must not miss what follows.
-Outcome<> DiskWatch::start()
+Result<void, Failure> DiskWatch::start()
 {
     constexpr const char* attempt = "listen to the kernel for disks that come and go";
     pellar::FileDescriptor events = openEvents();
@@ -182,7 +182,9 @@ Outcome<> DiskWatch::start()
     } catch (const std::system_error& refused) {
         return cannot(attempt, "netlink", refused.code().value());
     }
-    return isListening ? Outcome<>(Done{}) : Outcome<>(cannot(attempt, "netlink", error));
+    if (!isListening)
+        return cannot(attempt, "netlink", error);
+    return {};
 }
 
 }  // namespace orvane

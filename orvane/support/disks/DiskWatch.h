@@ -60,7 +60,7 @@ public:
     /// Once. What happened before goes unnoticed, so look at the disks after this. Where the
     /// system does not let the program listen to the kernel (some containers), that is answered,
     /// and mounts are watched all the same.
-    [[nodiscard]] Outcome<> start();
+    [[nodiscard]] Result<void, Failure> start();
 
 private:
     using Liveness = std::shared_ptr<DiskWatch*>;

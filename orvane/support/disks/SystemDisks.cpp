@@ -25,7 +25,7 @@ namespace fs = std::filesystem;
 std::string attribute(const fs::path& device, const char* name)
 {
     const auto contents = readWholeFile(device / name, 4096);
-    std::string text = contents.index() == 0 ? std::get<0>(contents) : std::string();
+    std::string text = contents ? *contents : std::string();
     text.erase(text.find_last_not_of(" \n") + 1);
     return text;
 }
@@ -68,10 +68,7 @@ bool isLeftOut(const fs::path& device)
 
 Superblock superblockFromUdev(const std::string& number, const DiskSources& sources)
 {
-    const auto contents = readWholeFile(sources.udevData / ("b" + number), 1U << 20U);
-    if (contents.index() != 0)
-        return {};
-    auto properties = parseUdevProperties(std::get<0>(contents));
+    auto properties = udevProperties(number, sources.udevData);
     return {properties["ID_FS_USAGE"], properties["ID_FS_TYPE"],
             decodeUdevName(properties["ID_FS_LABEL_ENC"]), properties["ID_FS_UUID"]};
 }
@@ -136,7 +133,7 @@ void addSuperblock(DiskFacts& facts, const Contents& contents)
     facts.label = superblock.label;
     facts.uuid = superblock.isFilesystem() ? superblock.uuid : std::string();
     if (!facts.label.empty())
-        facts.displayName = facts.label;
+        facts.name = facts.label;
 }
 
 DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
@@ -144,7 +141,7 @@ DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
     DiskFacts facts;
     facts.path = sources.dev / device.filename();
     facts.identifier = facts.path.native();
-    facts.displayName = device.filename();
+    facts.name = device.filename();
     facts.length = sizeOf(device);
     facts.isWritable = attribute(device, "ro") != "1";
     // Of whole disks only (Linux, Documentation/ABI/stable/sysfs-block, diskseq).
@@ -199,7 +196,7 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
     // The kernel gives the device of an extended partition two sectors, for its loader.
     const bool isContainer = known != nullptr ? known->isContainer : facts.length <= 1024;
     if (known != nullptr && !known->name.empty())
-        facts.displayName = known->name;
+        facts.name = known->name;
     if (isContainer) {
         facts.type = diskType::container;
     } else {
@@ -215,7 +212,7 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
 {
     const std::string number = attribute(device, "dev");
     DiskFacts facts = baseFacts(device, sources);
-    facts.displayName = nameOfWhole(device);
+    facts.name = nameOfWhole(device);
     facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
     DiskTree tree;
@@ -258,7 +255,7 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
     DiskFacts facts;
     facts.path = node;
     facts.identifier = node.native();
-    facts.displayName = node.filename();
+    facts.name = node.filename();
     facts.length = sizeOf(device);
     facts.isWritable = attribute(device, "ro") != "1";
     const Contents contents = contentsOf(node, number, facts.length, sources);

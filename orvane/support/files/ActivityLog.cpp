@@ -132,7 +132,7 @@ bool RotatingFile::isStillTheFile() const
 
 int RotatingFile::open()
 {
-    if (failed(createPrivateDirectory(file_.parent_path())))
+    if (!createPrivateDirectory(file_.parent_path()))
         return ENOENT;
     // A link or a FIFO that somebody has put in the log's place is refused, not written to.
     const int flags = O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;

@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
+
 #include <functional>
 #include <string>
-#include <variant>
+#include <string_view>
 
 namespace orvane {
 
@@ -15,23 +17,7 @@ struct Failure {
     friend bool operator==(const Failure&, const Failure&) = default;
 };
 
-struct Done {};
-
-/// Either what was asked for, or why there is none.
-template <class T = Done>
-using Outcome = std::variant<T, Failure>;
-
-template <class T>
-[[nodiscard]] bool failed(const Outcome<T>& outcome)
-{
-    return std::holds_alternative<Failure>(outcome);
-}
-
-template <class T>
-[[nodiscard]] const std::string& failureMessage(const Outcome<T>& outcome)
-{
-    return std::get<Failure>(outcome).message;
-}
+using pellar::Result;
 
 /// Where a service says, once, that it goes on with less than it should.
 using WarningSink = std::function<void(const std::string& sentence)>;

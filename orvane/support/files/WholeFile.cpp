@@ -52,7 +52,8 @@ private:
 // which takes nothing away from the file.
 void syncDirectory(const std::filesystem::path& directory)
 {
-    const pellar::FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const pellar::FileDescriptor opened(
+        ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (opened)
         ::fsync(opened.get());
 }
@@ -79,7 +80,7 @@ int writeAll(int descriptor, std::string_view bytes)
     return 0;
 }
 
-std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
+Result<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
 {
     const pellar::FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!opened)
@@ -107,17 +108,17 @@ std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, 
     }
 }
 
-Outcome<> replaceFile(const std::filesystem::path& file, std::string_view contents)
+Result<void, Failure> replaceFile(const std::filesystem::path& file, std::string_view contents)
 {
     const std::filesystem::path target = targetOf(file);
     TemporaryFile temporary(target);
     if (const int error = temporary.become(target, contents))
         return cannot("write", file.native(), error);
     syncDirectory(target.parent_path());
-    return Done();
+    return {};
 }
 
-Outcome<> createPrivateDirectory(const std::filesystem::path& directory)
+Result<void, Failure> createPrivateDirectory(const std::filesystem::path& directory)
 {
     if (directory.empty())
         return cannot("create the directory", "", ENOENT);
@@ -135,7 +136,7 @@ Outcome<> createPrivateDirectory(const std::filesystem::path& directory)
     std::error_code ignored;
     if (!std::filesystem::is_directory(directory, ignored))
         return cannot("create the directory", directory.native(), ENOTDIR);
-    return Done();
+    return {};
 }
 
 }  // namespace orvane

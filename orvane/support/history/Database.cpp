@@ -10,8 +10,8 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// Another program may hold the right to write for so long; then every attempt gives up at once until
-// it is free. A check does not wait for its history once for each record.
+// Another program may hold the right to write for so long; then every attempt gives up at once
+// until it is free. A check does not wait for its history once for each record.
 constexpr auto longestWait = 2s;
 // What was free for so long is held anew.
 constexpr auto newBeginning = 10s;
@@ -82,8 +82,8 @@ Database Database::opened(const char* name)
 {
     Database result;
     sqlite3* database = nullptr;
-    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE |
-                      SQLITE_OPEN_NOFOLLOW;
+    const int flags =
+        SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE | SQLITE_OPEN_NOFOLLOW;
     const int error = sqlite3_open_v2(name, &database, flags, nullptr);
     result.database_.reset(database);
     if (error != SQLITE_OK) {

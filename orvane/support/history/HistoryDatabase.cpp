@@ -137,8 +137,8 @@ HistoryDatabase openHistory(const std::filesystem::path& file, const WarningSink
 {
     if (file.empty())
         return inMemory();
-    if (const auto directory = createPrivateDirectory(file.parent_path()); failed(directory))
-        return inMemoryBecause(file, failureMessage(directory), warn);
+    if (const auto directory = createPrivateDirectory(file.parent_path()); !directory)
+        return inMemoryBecause(file, directory.error().message, warn);
 
     std::string reason;
     for (int attempt = 0; attempt < 2; ++attempt) {

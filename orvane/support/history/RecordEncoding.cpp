@@ -173,8 +173,8 @@ Dictionary recordFrom(const RecordColumns& columns, const RecordShape& shape)
             case RecordSlot::Text:
                 record.set(entry.key,
                            contract::StyledText::make(columns.text, columns.style != nullptr
-                                                                       ? *columns.style
-                                                                       : contract::TextStyle()));
+                                                                        ? *columns.style
+                                                                        : contract::TextStyle()));
                 break;
             case RecordSlot::Origin: record.set(entry.key, entry.origin); break;
             case RecordSlot::Extra: record.set(entry.key, extras.next()); break;

@@ -58,7 +58,7 @@ struct RecordColumns {
                                       std::string& room);
 /// The record again: the same keys in the same order with values of the same kinds.
 [[nodiscard]] contract::Dictionary recordFrom(const RecordColumns& columns,
-                                             const RecordShape& shape);
+                                              const RecordShape& shape);
 
 /// What records have in common, written once: the looks of their text and their shapes. Remembers
 /// what the tables hold. The database outlives this object.

@@ -24,14 +24,13 @@ Run::Time timeFrom(std::int64_t milliseconds)
     return Run::Time(std::chrono::milliseconds(milliseconds));
 }
 
-/// When the process began, in clock ticks since the start of the system (proc(5), /proc/PID/stat, field
-/// 22); empty when there is none.
+/// When the process began, in clock ticks since the start of the system (proc(5), /proc/PID/stat,
+/// field 22); empty when there is none.
 std::string startOfProcess(const std::string& process)
 {
     const auto stat = readWholeFile("/proc/" + process + "/stat", 4096);
-    const auto* const text = std::get_if<std::string>(&stat);
     // The second field is a name that may hold anything, blanks and parentheses too.
-    std::istringstream fields(text != nullptr ? text->substr(text->rfind(')') + 1) : "");
+    std::istringstream fields(stat ? stat->substr(stat->rfind(')') + 1) : "");
     std::string field;
     for (int number = 3; number <= 22; ++number)
         if (!(fields >> field))
@@ -42,8 +41,7 @@ std::string startOfProcess(const std::string& process)
 std::string startOfSystem()
 {
     const auto id = readWholeFile("/proc/sys/kernel/random/boot_id", 100);
-    const auto* const text = std::get_if<std::string>(&id);
-    return text != nullptr ? text->substr(0, text->find('\n')) : std::string();
+    return id ? id->substr(0, id->find('\n')) : std::string();
 }
 
 /// Never the same for two processes.

@@ -42,16 +42,15 @@ std::shared_ptr<ImageReading> ImageReading::start(const std::filesystem::path& i
 }
 
 // The host's texts may be gone when a file answers at last, so none are looked up here.
-ImageReading::Result ImageReading::readNow(const std::filesystem::path& image)
+ImageReading::Outcome ImageReading::readNow(const std::filesystem::path& image)
 {
-    auto opened = openImage(image, Translator());
-    if (failed(opened))
-        return Failure{failureMessage(opened)};
-    const auto& open = std::get<OpenImage>(opened);
-    return ReadImage{disksOfImage(open, readContents(open)), loopDeviceOf(open)};
+    const auto opened = openImage(image, Translator());
+    if (!opened)
+        return opened.error();
+    return ReadImage{disksOfImage(*opened, readContents(*opened)), loopDeviceOf(*opened)};
 }
 
-void ImageReading::finish(Result result)
+void ImageReading::finish(Outcome result)
 {
     const std::lock_guard guard(lock_);
     result_ = std::move(result);
@@ -74,7 +73,7 @@ void ImageReading::giveUp()
     changed_.notify_all();
 }
 
-std::optional<ImageReading::Result> ImageReading::result() const
+std::optional<ImageReading::Outcome> ImageReading::result() const
 {
     const std::lock_guard guard(lock_);
     return result_;
@@ -92,7 +91,7 @@ ImageAttacher::ImageAttacher(Disk::Surroundings surroundings, Translator transla
 }
 
 contract::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::path& image,
-                                                     contract::Dictionary& result)
+                                                      contract::Dictionary& result)
 {
     const auto reading = ImageReading::start(image, {}, reader_);
     {
@@ -109,18 +108,18 @@ contract::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::pat
     if (state == ImageReading::State::Reading)
         return note(image, translator_.text("the file does not answer"),
                     contract::kPLErrorCannotOpen);
-    const ImageReading::Result read = *reading->result();
-    if (failed(read))
-        return note(image, translator_.text(failureMessage(read)), contract::kPLErrorCannotOpen);
+    const ImageReading::Outcome read = *reading->result();
+    if (!read)
+        return note(image, translator_.text(read.error().message), contract::kPLErrorCannotOpen);
     lastErrors_.erase(image.native());
-    attached_.emplace(++attachments_, std::get<ReadImage>(read).disks);
+    attached_.emplace(++attachments_, read->disks);
     result = contract::Dictionary::of({{attachmentKey, attachments_}});
     return contract::kPLNoError;
 }
 
 // With the lock held.
 contract::ErrorCode ImageAttacher::note(const std::filesystem::path& image, std::string_view reason,
-                                       contract::ErrorCode code)
+                                        contract::ErrorCode code)
 {
     const std::string name = contract::printable(image.filename().native());
     lastErrors_[image.native()] = translator_.sentence("cannot attach ‘%@’: %@", {name, reason});
@@ -141,7 +140,8 @@ void ImageAttacher::resumeAttachments()
     isStopped_ = false;
 }
 
-contract::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(const contract::Dictionary& result)
+contract::OVDiskPointer ImageAttacher::TopLevelPLDiskForImageDict(
+    const contract::Dictionary& result)
 {
     const std::lock_guard guard(lock_);
     const auto found = attached_.extract(result.integer(attachmentKey));

@@ -32,12 +32,12 @@ struct ReadImage {
 class ImageReading {
 public:
     /// A failure is the bare reason, in English where it is one of the host's own.
-    using Result = Outcome<ReadImage>;
+    using Outcome = Result<ReadImage, Failure>;
 
-    using Reader = std::function<Result(const std::filesystem::path& image)>;
+    using Reader = std::function<Outcome(const std::filesystem::path& image)>;
 
     /// Reads it on the calling thread.
-    static Result readNow(const std::filesystem::path& image);
+    static Outcome readNow(const std::filesystem::path& image);
     /// `done` is called on the reader's thread, also after it was given up; none when empty. Where
     /// the system gives no thread, the image is read before this returns.
     static std::shared_ptr<ImageReading> start(const std::filesystem::path& image,
@@ -50,15 +50,15 @@ public:
     /// Nobody is interested any more: who waits returns at once.
     void giveUp();
     /// What was read; none while it is being read.
-    std::optional<Result> result() const;
+    std::optional<Outcome> result() const;
 
 private:
-    void finish(Result result);
+    void finish(Outcome result);
 
     mutable std::mutex lock_;
     std::condition_variable changed_;
-    std::optional<Result> result_;  ///< guarded
-    bool isGivenUp_ = false;        ///< guarded
+    std::optional<Outcome> result_;  ///< guarded
+    bool isGivenUp_ = false;         ///< guarded
 };
 
 /// Attaches disk images without the system's help: the image is read, and its volumes become
@@ -74,7 +74,7 @@ public:
     /// kPLErrorCannotOpen when the file cannot be opened, is empty, is no disk image, or does not
     /// answer for half a minute; kPLErrorCancelled after `stopAttachments`.
     [[nodiscard]] contract::ErrorCode AttachImageWithURL(const std::filesystem::path& image,
-                                                        contract::Dictionary& result) override;
+                                                         contract::Dictionary& result) override;
     contract::OVDiskPointer TopLevelPLDiskForImageDict(const contract::Dictionary& result) override;
 
     /// Attachments that are under way end at once, and no others begin before
@@ -92,7 +92,7 @@ public:
 
 private:
     contract::ErrorCode note(const std::filesystem::path& image, std::string_view reason,
-                            contract::ErrorCode code);
+                             contract::ErrorCode code);
 
     const Disk::Surroundings surroundings_;
     const Translator translator_;

@@ -83,9 +83,11 @@ std::string ImageVolume::filesystem() const
     return superblock.type.empty() && hasExtBackup ? "ext4" : "";
 }
 
-Outcome<OpenImage> openImage(const std::filesystem::path& path, const Translator& translator)
+Result<OpenImage, Failure> openImage(const std::filesystem::path& path,
+                                     const Translator& translator)
 {
-    pellar::FileDescriptor descriptor(::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
+    pellar::FileDescriptor descriptor(
+        ::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
     if (!descriptor)
         return Failure{errorText(errno)};
     struct stat status = {};
@@ -152,7 +154,7 @@ void addVolume(DiskFacts& facts, const ImageVolume& volume, std::string nameWith
     facts.label = volume.superblock.label;
     if (volume.superblock.isFilesystem())
         facts.uuid = volume.superblock.uuid;
-    facts.displayName = facts.label.empty() ? std::move(nameWithoutLabel) : facts.label;
+    facts.name = facts.label.empty() ? std::move(nameWithoutLabel) : facts.label;
 }
 
 DiskTree partitionOf(const OpenImage& image, const ImageVolume& volume)
@@ -173,7 +175,7 @@ DiskFacts factsOfImage(const OpenImage& image)
 {
     DiskFacts facts;
     facts.identifier = image.path.native();
-    facts.displayName = image.path.filename();
+    facts.name = image.path.filename();
     facts.type = diskType::diskImage;
     facts.storage = contract::DiskReference::Storage::FileRegion;
     facts.path = image.path;
@@ -186,7 +188,7 @@ DiskFacts factsOfImage(const OpenImage& image)
 DiskTree disksOfImage(const OpenImage& image, const ImageContents& contents)
 {
     DiskTree top{partOfImage(image, contents.whole), {}};
-    top.facts.displayName = image.path.filename();
+    top.facts.name = image.path.filename();
     if (!contents.hasPartitionMap) {
         top.facts.type = diskType::bareVolume;
         addVolume(top.facts, contents.whole, image.path.filename());

@@ -24,8 +24,8 @@ struct OpenImage {
 
 /// Opens a regular file that may be a disk image: it is not empty, and no text; otherwise the bare
 /// reason ("the file is empty"). Any thread; does not wait for whatever else the path may name.
-[[nodiscard]] Outcome<OpenImage> openImage(const std::filesystem::path& path,
-                                           const Translator& translator);
+[[nodiscard]] Result<OpenImage, Failure> openImage(const std::filesystem::path& path,
+                                                   const Translator& translator);
 
 /// What lies in a stretch of an image.
 struct ImageVolume {

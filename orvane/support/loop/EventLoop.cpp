@@ -8,21 +8,21 @@ namespace {
 
 /// Abandons when the last copy of the task is destroyed; harmless after the task has run.
 struct Ticket {
-    explicit Ticket(std::shared_ptr<AwaitedTask> r) : rendezvous(std::move(r)) {}
+    explicit Ticket(std::shared_ptr<AwaitedTask> r) : awaited(std::move(r)) {}
     Ticket(const Ticket&) = delete;
     Ticket& operator=(const Ticket&) = delete;
-    ~Ticket() { rendezvous->abandon(); }
+    ~Ticket() { awaited->abandon(); }
 
-    std::shared_ptr<AwaitedTask> rendezvous;
+    std::shared_ptr<AwaitedTask> awaited;
 };
 
 }  // namespace
 
-contract::RunLoop::Task AwaitedTask::taskFor(const std::shared_ptr<AwaitedTask>& rendezvous,
-                                           contract::RunLoop::Task task)
+contract::RunLoop::Task AwaitedTask::taskFor(const std::shared_ptr<AwaitedTask>& awaited,
+                                             contract::RunLoop::Task task)
 {
-    return [ticket = std::make_shared<Ticket>(rendezvous), task = std::move(task)] {
-        ticket->rendezvous->run(task);
+    return [ticket = std::make_shared<Ticket>(awaited), task = std::move(task)] {
+        ticket->awaited->run(task);
     };
 }
 
@@ -66,9 +66,9 @@ DeliveryQueue* DeliveryQueue::ofThisThread()
     return current;
 }
 
-DeliveryQueue::Scope::Scope(DeliveryQueue& outbox) : before_(current)
+DeliveryQueue::Scope::Scope(DeliveryQueue& queue) : before_(current)
 {
-    current = &outbox;
+    current = &queue;
 }
 
 DeliveryQueue::Scope::~Scope()
@@ -78,16 +78,16 @@ DeliveryQueue::Scope::~Scope()
 
 void EventLoop::performOnMainThread(Task task, Wait wait)
 {
-    if (DeliveryQueue* const outbox = DeliveryQueue::ofThisThread()) {
-        outbox->perform(std::move(task), wait);
+    if (DeliveryQueue* const queue = DeliveryQueue::ofThisThread()) {
+        queue->perform(std::move(task), wait);
     } else if (wait == Wait::No) {
         post(std::move(task));
     } else if (isMainThread()) {
         task();
     } else {
-        const auto rendezvous = std::make_shared<AwaitedTask>();
-        post(AwaitedTask::taskFor(rendezvous, std::move(task)));
-        rendezvous->wait();
+        const auto awaited = std::make_shared<AwaitedTask>();
+        post(AwaitedTask::taskFor(awaited, std::move(task)));
+        awaited->wait();
     }
 }
 

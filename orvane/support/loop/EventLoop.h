@@ -13,9 +13,9 @@ namespace orvane {
 /// abandoned task is never run, because what it refers to is gone with the waiting caller.
 class AwaitedTask {
 public:
-    /// The task to hand over. Destroying it unrun abandons the rendezvous.
-    static contract::RunLoop::Task taskFor(const std::shared_ptr<AwaitedTask>& rendezvous,
-                                          contract::RunLoop::Task task);
+    /// The task to hand over. Destroying it unrun abandons it.
+    static contract::RunLoop::Task taskFor(const std::shared_ptr<AwaitedTask>& awaited,
+                                           contract::RunLoop::Task task);
 
     /// Returns when the task has run or was abandoned.
     void wait();
@@ -33,21 +33,21 @@ private:
 };
 
 /// What one worker thread hands to the main thread, while somebody else decides when it is
-/// delivered. A run loop asks for the calling thread's outbox in performOnMainThread, and puts
+/// delivered. A run loop asks for the calling thread's queue in performOnMainThread, and puts
 /// the task there when it has one.
 class DeliveryQueue {
 public:
-    /// The calling thread's outbox; none for a thread that has none, as the main thread.
+    /// The calling thread's queue; none for a thread that has none, as the main thread.
     static DeliveryQueue* ofThisThread();
 
     /// The worker's own thread. `UntilDone` returns when the task has run, or when it never will
     /// because the program ends.
     virtual void perform(contract::RunLoop::Task task, contract::RunLoop::Wait wait) = 0;
 
-    /// Makes `outbox` the calling thread's for as long as this object lives.
+    /// Makes `queue` the calling thread's for as long as this object lives.
     class Scope {
     public:
-        explicit Scope(DeliveryQueue& outbox);
+        explicit Scope(DeliveryQueue& queue);
         Scope(const Scope&) = delete;
         Scope& operator=(const Scope&) = delete;
         ~Scope();
@@ -60,12 +60,12 @@ protected:
     ~DeliveryQueue() = default;
 };
 
-/// A front end's main loop. What a worker hands over goes through the calling thread's DeliveryQueue,
-/// where it has one, so that it arrives in the workers' order.
+/// A front end's main loop. What a worker hands over goes through the calling thread's
+/// DeliveryQueue, where it has one, so that it arrives in the workers' order.
 class EventLoop : public contract::RunLoop {
 public:
     void performOnMainThread(Task task, Wait wait) final;
-    /// Any thread. Queues the task behind what was posted before, past any outbox.
+    /// Any thread. Queues the task behind what was posted before, past any queue.
     virtual void post(Task task) = 0;
 };
 

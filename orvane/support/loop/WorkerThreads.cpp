@@ -21,13 +21,13 @@ public:
             owner.perform(*this, std::move(task));
             return;
         }
-        const auto meeting = std::make_shared<AwaitedTask>();
+        const auto mine = std::make_shared<AwaitedTask>();
         {
             const std::lock_guard guard(owner.lock_);
-            rendezvous = meeting;
+            awaited = mine;
         }
-        owner.perform(*this, AwaitedTask::taskFor(meeting, std::move(task)));
-        meeting->wait();
+        owner.perform(*this, AwaitedTask::taskFor(mine, std::move(task)));
+        mine->wait();
     }
 
     void run(const contract::RunLoop::Task& task)
@@ -43,8 +43,8 @@ public:
     std::thread thread;
     // All guarded by the owner's lock.
     std::vector<contract::RunLoop::Task> heldBack;
-    std::shared_ptr<AwaitedTask> rendezvous;  ///< the one it waited at last
-    bool isFirst = false;                    ///< nothing needs to be held back
+    std::shared_ptr<AwaitedTask> awaited;  ///< the one it waited at last
+    bool isFirst = false;                  ///< nothing needs to be held back
     bool isOver = false;
 };
 
@@ -56,8 +56,8 @@ WorkerThreads::~WorkerThreads()
         const std::lock_guard guard(lock_);
         isClosing_ = true;
         for (const auto& worker : workers_)
-            if (worker->rendezvous)
-                worker->rendezvous->abandon();
+            if (worker->awaited)
+                worker->awaited->abandon();
     }
     closing_.notify_all();
     for (const auto& worker : workers_)
@@ -87,8 +87,8 @@ void WorkerThreads::perform(Worker& worker, contract::RunLoop::Task task)
 {
     const std::lock_guard guard(lock_);
     if (isClosing_) {
-        if (worker.rendezvous)
-            worker.rendezvous->abandon();
+        if (worker.awaited)
+            worker.awaited->abandon();
     } else if (worker.isFirst) {
         loop_.post(std::move(task));
     } else {

@@ -38,7 +38,7 @@ private:
 
     std::filesystem::path directory_;
     mutable std::mutex lock_;
-    mutable std::uint64_t revision_ = 0;                            ///< guarded by the lock
+    mutable std::uint64_t revision_ = 0;                       ///< guarded by the lock
     mutable std::map<std::string, Files, std::less<>> files_;  ///< guarded; for that revision
 };
 

@@ -21,7 +21,8 @@ namespace orvane {
 /// change with the user; people's numbers come from decimalText.
 void adoptUserLocale();
 
-/// Switches the languages of every catalogue, a list as LANGUAGE has it ("" for English). Any thread.
+/// Switches the languages of every catalogue, a list as LANGUAGE has it ("" for English). Any
+/// thread.
 void setLanguage(const std::string& languages);
 
 /// The languages in force ("lb:de"); empty for English. Any thread.

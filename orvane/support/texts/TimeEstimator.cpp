@@ -28,12 +28,12 @@ std::string durationText(double seconds, const Translator& translator)
     if (minutes < 75) {
         const long shown = roundedTo(minutes < 12.5 ? 1 : 5, minutes);
         return contract::format(translator.plural("about %ld minute", "about %ld minutes", shown),
-                               {shown});
+                                {shown});
     }
     if (minutes < 36 * 60) {
         const long shown = roundedTo(1, minutes / 60);
         return contract::format(translator.plural("about %ld hour", "about %ld hours", shown),
-                               {shown});
+                                {shown});
     }
     const long shown = roundedTo(1, minutes / 60 / 24);
     return contract::format(translator.plural("about %ld day", "about %ld days", shown), {shown});

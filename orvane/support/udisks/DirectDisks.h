@@ -24,13 +24,13 @@ namespace direct {
 /// YES for root.
 [[nodiscard]] bool isAllowed();
 /// As /etc/fstab says; NoTable when it does not name the device (fstab(5)).
-[[nodiscard]] Answer<> mount(const std::string& node);
+[[nodiscard]] Result<void, Refusal> mount(const std::string& node);
 /// From all the places where it is mounted.
-[[nodiscard]] Answer<> unmount(const std::string& node);
-[[nodiscard]] Answer<> eject(const std::string& node);
-[[nodiscard]] Answer<> detachLoop(const std::string& node);
+[[nodiscard]] Result<void, Refusal> unmount(const std::string& node);
+[[nodiscard]] Result<void, Refusal> eject(const std::string& node);
+[[nodiscard]] Result<void, Refusal> detachLoop(const std::string& node);
 /// A loop device on an open file that stays; its node.
-[[nodiscard]] Answer<std::string> setUpLoop(int file, pellar::Access access);
+[[nodiscard]] Result<std::string, Refusal> setUpLoop(int file, pellar::Access access);
 
 }  // namespace direct
 

@@ -82,23 +82,23 @@ std::optional<Refusal> objectionTo(int file)
     return device.empty() ? std::nullopt : std::optional(Refusal{Refusal::Kind::Attached, device});
 }
 
-Answer<std::string> setUp(int file, Access access, const std::stop_token& stop)
+Result<std::string, Refusal> setUp(int file, Access access, const std::stop_token& stop)
 {
     auto answer = UDisks(stop).setUpLoop(file, access);
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    const bool isOurs = refusal != nullptr && isLeftToOthers(*refusal) && direct::isAllowed();
+    const bool isOurs = !answer && isLeftToOthers(answer.error()) && direct::isAllowed();
     return isOurs ? direct::setUpLoop(file, access) : answer;
 }
 
 }  // namespace
 
-Answer<std::string> attachImage(const std::filesystem::path& image, Access access,
-                                const std::stop_token& stop)
+Result<std::string, Refusal> attachImage(const std::filesystem::path& image, Access access,
+                                         const std::stop_token& stop)
 {
     if (const auto objection = objectionTo(image))
         return *objection;
     const int mode = access == Access::ReadOnly ? O_RDONLY : O_RDWR;
-    const pellar::FileDescriptor file(::open(image.c_str(), mode | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
+    const pellar::FileDescriptor file(
+        ::open(image.c_str(), mode | O_NONBLOCK | O_CLOEXEC | O_NOCTTY));
     if (!file)
         return refusalToOpen(image, access, errno);
     const FileLock lock(file.get(), access);
@@ -116,7 +116,7 @@ Access accessTo(const std::filesystem::path& image)
 
 namespace {
 
-Answer<> throughUDisks(UDisks& udisks, const DiskStep& step)
+Result<void, Refusal> throughUDisks(UDisks& udisks, const DiskStep& step)
 {
     switch (step.kind) {
         case DiskStep::Kind::Mount: return udisks.mount(step.node);
@@ -128,7 +128,7 @@ Answer<> throughUDisks(UDisks& udisks, const DiskStep& step)
     return Refusal{};
 }
 
-Answer<> directly(const DiskStep& step)
+Result<void, Refusal> directly(const DiskStep& step)
 {
     switch (step.kind) {
         case DiskStep::Kind::Mount: return direct::mount(step.node);
@@ -141,15 +141,14 @@ Answer<> directly(const DiskStep& step)
 }
 
 // UDisks2 may be there and not know the device; then that is the reason, and not the missing table.
-Answer<> throughAny(UDisks& udisks, const DiskStep& step)
+Result<void, Refusal> throughAny(UDisks& udisks, const DiskStep& step)
 {
-    const Answer<> answer = throughUDisks(udisks, step);
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    if (refusal == nullptr || !isLeftToOthers(*refusal) || !direct::isAllowed())
+    const Result<void, Refusal> answer = throughUDisks(udisks, step);
+    if (answer || !isLeftToOthers(answer.error()) || !direct::isAllowed())
         return answer;
-    const Answer<> other = directly(step);
-    const bool saysNothing = refusal->kind == Refusal::Kind::UnknownDevice && other.index() == 1 &&
-                             std::get<Refusal>(other).kind == Refusal::Kind::NoTable;
+    const Result<void, Refusal> other = directly(step);
+    const bool saysNothing = answer.error().kind == Refusal::Kind::UnknownDevice && !other &&
+                             other.error().kind == Refusal::Kind::NoTable;
     return saysNothing ? answer : other;
 }
 
@@ -173,40 +172,38 @@ bool hasComeOff(const std::string& node)
     return !std::filesystem::exists(image, error);
 }
 
-Answer<> attach(const std::filesystem::path& image, const std::stop_token& stop)
+Result<void, Refusal> attach(const std::filesystem::path& image, const std::stop_token& stop)
 {
     const auto answer = attachImage(image, accessTo(image), stop);
-    if (const auto* const refusal = std::get_if<Refusal>(&answer))
-        return *refusal;
-    return Done{};
+    if (!answer)
+        return answer.error();
+    return {};
 }
 
-Answer<> carryOut(UDisks& udisks, const DiskStep& step)
+Result<void, Refusal> carryOut(UDisks& udisks, const DiskStep& step)
 {
     if (step.kind != DiskStep::Kind::Mount && holdsSystem(placesOf(step.node)))
         return Refusal{Refusal::Kind::HoldsSystem, {}};
-    Answer<> answer = throughAny(udisks, step);
-    if (step.kind == DiskStep::Kind::DetachLoop && answer.index() == 0 && !hasComeOff(step.node))
+    Result<void, Refusal> answer = throughAny(udisks, step);
+    if (step.kind == DiskStep::Kind::DetachLoop && answer && !hasComeOff(step.node))
         return Refusal{Refusal::Kind::Lingers, {}};
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    if (refusal != nullptr && refusal->kind == Refusal::Kind::Busy)
+    if (!answer && answer.error().kind == Refusal::Kind::Busy)
         return Refusal{Refusal::Kind::Busy, holdersText(placesOf(step.node))};
     return answer;
 }
 
 }  // namespace
 
-Answer<> carryOut(const DiskRequest& request, const std::stop_token& stop)
+Result<void, Refusal> carryOut(const DiskRequest& request, const std::stop_token& stop)
 {
     UDisks udisks(stop);
     for (const DiskStep& step : request.steps) {
-        const Answer<> answer =
+        const Result<void, Refusal> answer =
             step.kind == DiskStep::Kind::Attach ? attach(step.node, stop) : carryOut(udisks, step);
-        const auto* const refusal = std::get_if<Refusal>(&answer);
-        if (refusal != nullptr && refusal->kind != Refusal::Kind::AlreadySo)
+        if (!answer && answer.error().kind != Refusal::Kind::AlreadySo)
             return answer;
     }
-    return Done{};
+    return {};
 }
 
 DiskOperations::~DiskOperations()
@@ -222,13 +219,13 @@ bool DiskOperations::isUnderWay(const std::string& identifier) const
     });
 }
 
-std::vector<DiskOperations::Result> DiskOperations::carryOutAll(
+std::vector<DiskOperations::Answer> DiskOperations::carryOutAll(
     const std::vector<DiskRequest>& requests, const std::stop_token& stop)
 {
-    std::vector<Result> results;
+    std::vector<Answer> answers;
     for (const DiskRequest& request : requests)
-        results.push_back({request, carryOut(request, stop)});
-    return results;
+        answers.push_back({request, carryOut(request, stop)});
+    return answers;
 }
 
 void DiskOperations::start(std::vector<DiskRequest> requests, Finished finished)
@@ -244,29 +241,28 @@ void DiskOperations::start(std::vector<DiskRequest> requests, Finished finished)
     try {
         running.thread = std::jthread(
             [&loop = loop_, alive = liveness_, number, requests](const std::stop_token& stop) {
-                loop.post([alive, number, results = carryOutAll(requests, stop)] {
+                loop.post([alive, number, answers = carryOutAll(requests, stop)] {
                     if (*alive != nullptr)
-                        (*alive)->finish(number, results);
+                        (*alive)->finish(number, answers);
                 });
             });
     } catch (const std::system_error& error) {
         const Refusal refusal{Refusal::Kind::Other, errorText(error.code().value())};
-        std::vector<Result> results;
+        std::vector<Answer> answers;
         for (const DiskRequest& request : requests)
-            results.push_back({request, refusal});
-        finish(number, results);
+            answers.push_back({request, refusal});
+        finish(number, answers);
     }
 }
 
 // Taken off first: whoever is told may start the next.
-void DiskOperations::finish(Number number, const std::vector<Result>& results)
+void DiskOperations::finish(Number number, const std::vector<Answer>& answers)
 {
     const auto ended = running_.extract(number);
     std::vector<std::string> failures;
-    for (const auto& [request, answer] : results)
-        if (const auto* const refusal = std::get_if<Refusal>(&answer);
-            refusal != nullptr && !isSilent(*refusal))
-            failures.push_back(failureText(request, *refusal, texts_));
+    for (const auto& [request, answer] : answers)
+        if (!answer && !isSilent(answer.error()))
+            failures.push_back(failureText(request, answer.error(), texts_));
     if (ended.mapped().finished)
         ended.mapped().finished(failures);
 }

@@ -22,16 +22,17 @@ namespace orvane {
 /// itself where there is none and this is root. Answers the device's node. IsReadOnly where the
 /// file is to be written and this user may not; BeingUsed while a job of ours works on it, and
 /// none can begin on it meanwhile; Attached where it is. Not on the main thread: may take minutes.
-[[nodiscard]] Answer<std::string> attachImage(const std::filesystem::path& image,
-                                              pellar::Access access,
-                                              const std::stop_token& stop = {});
+[[nodiscard]] Result<std::string, Refusal> attachImage(const std::filesystem::path& image,
+                                                       pellar::Access access,
+                                                       const std::stop_token& stop = {});
 
 /// How this user may open the file.
 [[nodiscard]] pellar::Access accessTo(const std::filesystem::path& image);
 
 /// Does all the steps of a request through UDisks2, or itself where there is none and this is
 /// root. Not on the main thread: may take minutes. Abandoned when the thread is asked to stop.
-[[nodiscard]] Answer<> carryOut(const DiskRequest& request, const std::stop_token& stop = {});
+[[nodiscard]] Result<void, Refusal> carryOut(const DiskRequest& request,
+                                             const std::stop_token& stop = {});
 
 /// Mounts, unmounts and ejects behind the main thread's back. Main thread.
 class DiskOperations {
@@ -54,9 +55,9 @@ public:
     [[nodiscard]] bool isUnderWay(const std::string& identifier) const;
 
 private:
-    struct Result {
+    struct Answer {
         DiskRequest request;
-        Answer<> answer;
+        Result<void, Refusal> answer;
     };
     struct Running {
         std::vector<std::string> identifiers;
@@ -65,9 +66,9 @@ private:
     };
     using Number = std::uint64_t;
 
-    static std::vector<Result> carryOutAll(const std::vector<DiskRequest>& requests,
+    static std::vector<Answer> carryOutAll(const std::vector<DiskRequest>& requests,
                                            const std::stop_token& stop);
-    void finish(Number number, const std::vector<Result>& results);
+    void finish(Number number, const std::vector<Answer>& answers);
 
     EventLoop& loop_;
     const Translator& texts_;

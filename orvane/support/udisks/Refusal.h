@@ -6,7 +6,6 @@
 
 #include <string>
 #include <string_view>
-#include <variant>
 
 namespace orvane {
 
@@ -43,9 +42,6 @@ struct Refusal {
 
     friend bool operator==(const Refusal&, const Refusal&) = default;
 };
-
-template <class T = Done>
-using Answer = std::variant<T, Refusal>;
 
 /// What an error that came over the bus means. Its name and text are from outside: any bytes.
 [[nodiscard]] Refusal refusalOf(std::string_view errorName, std::string_view errorText);
