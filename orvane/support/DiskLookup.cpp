@@ -76,7 +76,7 @@ Result<std::shared_ptr<Disk>, Failure> DiskLookup::findDevice(const fs::path& pa
     const auto facts = readBlockDevice(node, DiskSources());
     if (!facts || facts->length == 0)
         return cannotUse(path.native(), translator_.text("there is no medium in it"));
-    return controller_.addDevice(*facts);
+    return controller_.add(*facts);
 }
 
 Result<std::shared_ptr<Disk>, Failure> DiskLookup::findMountPoint(const fs::path& path)
@@ -101,7 +101,7 @@ Result<std::shared_ptr<Disk>, Failure> DiskLookup::findImage(const fs::path& pat
     auto opened = openImage(path, translator_);
     if (!opened)
         return cannotUse(path.native(), opened.error().message);
-    return controller_.addImage(factsOfImage(*opened));
+    return controller_.add(factsOfImage(*opened));
 }
 
 }  // namespace orvane

@@ -41,9 +41,7 @@ struct Host {
 
     Notifications center;
     std::string heard;
-    DiskController controller{center, {[](std::string_view) {
-                                  return FilesystemCapabilities();
-                              }}};
+    DiskController controller{center, {}};
 };
 
 TEST(DiskController, TellsWhatHasHappenedToTheSystemsDisks)
@@ -105,14 +103,13 @@ TEST(DiskController, APartitionThatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
     const auto volume = host.controller.diskNamed("sda1");
     host.controller.hold({volume});
     host.takeHeard();
-    for (int i = 0; i < 2; ++i) {
+    for (const char* const told : {"Ej sda1\n", ""}) {
         host.controller.synchronize({tree("sda", {tree("sda2")})});
-        EXPECT_EQ(host.takeHeard(), i == 0 ? "Ej sda1\n" : "") << "told once";
+        EXPECT_EQ(host.takeHeard(), told) << "once";
         EXPECT_EQ(host.controller.diskNamed("sda1"), volume);
     }
     EXPECT_TRUE(host.controller.release());
     EXPECT_EQ(host.controller.diskNamed("sda1"), nullptr);
-    EXPECT_NE(host.controller.diskNamed("sda2"), nullptr);
 }
 
 TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)

@@ -58,7 +58,8 @@ std::string exactly(const Value& value)
 Array loaded(HistoryStore& store, std::string_view volume)
 {
     const Array history = Array::make();
-    store.load(store.recordsOf(volume), history);
+    RecordTimes times;
+    store.load(store.recordsOf(volume), history, times);
     return history;
 }
 

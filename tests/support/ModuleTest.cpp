@@ -7,6 +7,8 @@
 
 #include <unistd.h>
 
+#include <functional>
+
 namespace orvane {
 namespace {
 
@@ -37,13 +39,17 @@ TEST(ModuleLoader, LoadsAModuleOfTheSameContract)
 
 TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
 {
-    using Change = void (*)(const fs::path& bundle);
     struct Case {
         const char* library;
-        Change change;
+        std::function<void(const fs::path& bundle)> change;
         const char* sentence;
     };
     const auto nothing = [](const fs::path&) {
+    };
+    const auto opened = [](const char* name) {
+        return [name](const fs::path& bundle) {
+            fs::permissions(bundle / name, fs::perms::others_write, fs::perm_options::add);
+        };
     };
     for (const Case& c :
          {Case{TEST_MODULE_WRONG, nothing,
@@ -51,22 +57,9 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
           Case{TEST_MODULE_NO_ENTRY, nothing, "OVModuleEntry"},
           Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::resize_file(b / "test.so", 100); },
                "cannot read file data"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b / "test.so", fs::perms::others_write, fs::perm_options::add);
-               },
-               "other users may change it"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b, fs::perms::others_write, fs::perm_options::add);
-               },
-               "other users may change it"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b / "module.json", fs::perms::others_write,
-                                   fs::perm_options::add);
-               },
-               "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("test.so"), "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("."), "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("module.json"), "other users may change it"},
           Case{TEST_MODULE_RIGHT,
                [](const fs::path& b) {
                    fs::rename(b / "test.so", b / "real.so");

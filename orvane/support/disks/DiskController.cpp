@@ -82,16 +82,6 @@ std::shared_ptr<Disk> DiskController::add(const DiskFacts& facts)
     return disk;
 }
 
-std::shared_ptr<Disk> DiskController::addImage(const DiskFacts& facts)
-{
-    return add(facts);
-}
-
-std::shared_ptr<Disk> DiskController::addDevice(const DiskFacts& facts)
-{
-    return add(facts);
-}
-
 void DiskController::adopt(const DiskTree& top)
 {
     adopt(Disk::make(top, surroundings_));

@@ -136,12 +136,12 @@ void addSuperblock(DiskFacts& facts, const Contents& contents)
         facts.name = facts.label;
 }
 
-DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
+DiskFacts baseFacts(const fs::path& device, const fs::path& node)
 {
     DiskFacts facts;
-    facts.path = sources.dev / device.filename();
-    facts.identifier = facts.path.native();
-    facts.name = device.filename();
+    facts.path = node;
+    facts.identifier = node.native();
+    facts.name = node.filename();
     facts.length = sizeOf(device);
     facts.isWritable = attribute(device, "ro") != "1";
     // Of whole disks only (Linux, Documentation/ABI/stable/sysfs-block, diskseq).
@@ -186,7 +186,7 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
                        const DiskSources& sources)
 {
     const std::string number = attribute(device, "dev");
-    DiskFacts facts = baseFacts(device, sources);
+    DiskFacts facts = baseFacts(device, sources.dev / device.filename());
     facts.type = diskType::volume;
     facts.number = static_cast<std::int64_t>(numberIn(attribute(device, "partition")));
     const Partition* known = nullptr;
@@ -211,7 +211,7 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
 DiskTree readWhole(const fs::path& device, const DiskSources& sources)
 {
     const std::string number = attribute(device, "dev");
-    DiskFacts facts = baseFacts(device, sources);
+    DiskFacts facts = baseFacts(device, sources.dev / device.filename());
     facts.name = nameOfWhole(device);
     facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
@@ -252,12 +252,7 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
         return std::nullopt;
     const std::string number = fmt::format("{}:{}", major(status.st_rdev), minor(status.st_rdev));
     const fs::path device = sources.sysBlock.parent_path() / "dev/block" / number;
-    DiskFacts facts;
-    facts.path = node;
-    facts.identifier = node.native();
-    facts.name = node.filename();
-    facts.length = sizeOf(device);
-    facts.isWritable = attribute(device, "ro") != "1";
+    DiskFacts facts = baseFacts(device, node);
     const Contents contents = contentsOf(node, number, facts.length, sources);
     const bool isPartition = !attribute(device, "partition").empty();
     facts.type = isPartition

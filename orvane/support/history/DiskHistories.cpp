@@ -43,7 +43,7 @@ DiskHistories::History& DiskHistories::find(const DiskFacts& disk)
 
 DiskHistories::History DiskHistories::load(const std::string& key)
 {
-    const HistoryStore::Range all = store_.recordsOf(key);
+    const RecordRange all = store_.recordsOf(key);
     const bool isGradual = isIncomplete_ && all.size() > recordsAtOnce;
     const std::int64_t first = isGradual ? all.end - recordsAtOnce : all.next;
     History history;

@@ -74,7 +74,7 @@ private:
     struct Older {
         contract::Array records;
         RecordTimes times;
-        HistoryStore::Range left;
+        RecordRange left;
     };
 
     struct History {

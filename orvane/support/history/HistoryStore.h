@@ -34,13 +34,10 @@ public:
     HistoryStore& operator=(const HistoryStore&) = delete;
     ~HistoryStore();
 
-    using Range = RecordRange;
-
     /// All that the volume has.
-    [[nodiscard]] Range recordsOf(std::string_view key);
+    [[nodiscard]] RecordRange recordsOf(std::string_view key);
     /// Appends those of the records that are still there, oldest first, and their times.
-    void load(Range records, const contract::Array& history, RecordTimes& times);
-    void load(Range records, const contract::Array& history);
+    void load(RecordRange records, const contract::Array& history, RecordTimes& times);
     /// Appends the records from `firstNew` on to the volume's, with their times; where none are
     /// given, with the present one. All of them or, when it answers NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const contract::Array& history,
@@ -90,7 +87,6 @@ private:
     std::int64_t noteBegin(std::string_view key, std::string_view action, Run::Time started);
     void writeLate();
     bool failedTo(std::string_view attempt, const Mishap& mishap);
-    std::int64_t knownVolume(std::string_view key);
     void countAdded(std::int64_t records);
 
     const std::filesystem::path file_;

@@ -82,6 +82,7 @@ std::optional<ImageReading::Outcome> ImageReading::result() const
 namespace {
 
 const contract::Name attachmentKey{"orvane-attachment"};
+constexpr std::chrono::seconds longestWait{30};
 
 }  // namespace
 
@@ -100,7 +101,7 @@ contract::ErrorCode ImageAttacher::AttachImageWithURL(const std::filesystem::pat
         if (isStopped_)
             reading->giveUp();
     }
-    const ImageReading::State state = reading->waitFor(longestWait_);
+    const ImageReading::State state = reading->waitFor(longestWait);
     const std::lock_guard guard(lock_);
     readings_.erase(reading);
     if (state == ImageReading::State::GivenUp)

@@ -81,10 +81,9 @@ public:
     /// `resumeAttachments`.
     void stopAttachments();
     void resumeAttachments();
-    /// Before anything is attached: how an image is read, and how long that may take.
+    /// Before anything is attached: how an image is read.
     void setReader(ImageReading::Reader reader) { reader_ = std::move(reader); }
     const ImageReading::Reader& reader() const { return reader_; }
-    void setLongestWait(std::chrono::milliseconds longest) { longestWait_ = longest; }
 
     /// Why the last attachment of this image failed, as a sentence to show ("cannot attach
     /// ‘x.img’: the file is empty"); empty when it did not.
@@ -98,7 +97,6 @@ private:
     const Translator translator_;
 
     ImageReading::Reader reader_ = ImageReading::readNow;
-    std::chrono::milliseconds longestWait_ = std::chrono::seconds(30);
 
     mutable std::mutex lock_;
     std::set<std::shared_ptr<ImageReading>> readings_;  ///< that are waited for; guarded

@@ -4,26 +4,14 @@
 #include <utility>
 
 namespace orvane {
-namespace {
-
-/// Abandons when the last copy of the task is destroyed; harmless after the task has run.
-struct Ticket {
-    explicit Ticket(std::shared_ptr<AwaitedTask> r) : awaited(std::move(r)) {}
-    Ticket(const Ticket&) = delete;
-    Ticket& operator=(const Ticket&) = delete;
-    ~Ticket() { awaited->abandon(); }
-
-    std::shared_ptr<AwaitedTask> awaited;
-};
-
-}  // namespace
 
 contract::RunLoop::Task AwaitedTask::taskFor(const std::shared_ptr<AwaitedTask>& awaited,
                                              contract::RunLoop::Task task)
 {
-    return [ticket = std::make_shared<Ticket>(awaited), task = std::move(task)] {
-        ticket->awaited->run(task);
-    };
+    // Given up when the last copy of the task is destroyed; harmless after it has run.
+    const std::shared_ptr<AwaitedTask> ticket(awaited.get(),
+                                              [awaited](AwaitedTask* it) { it->abandon(); });
+    return [ticket, task = std::move(task)] { ticket->run(task); };
 }
 
 void AwaitedTask::run(const contract::RunLoop::Task& task)

@@ -132,10 +132,10 @@ constexpr std::string_view showDetailsKey = "showDetailsInFixwell";
 
 }  // namespace
 
-bool isMountedReadOnly(const std::filesystem::path& path)
+bool Preferences::rootVolumeIsReadOnly() const
 {
     struct statvfs status = {};
-    return ::statvfs(path.c_str(), &status) == 0 && (status.f_flag & ST_RDONLY) != 0;
+    return ::statvfs("/", &status) == 0 && (status.f_flag & ST_RDONLY) != 0;
 }
 
 bool Preferences::showDetailsInFixwell() const

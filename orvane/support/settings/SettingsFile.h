@@ -38,9 +38,6 @@ private:
     Settings settings_;
 };
 
-/// Whether the file system at `path` is mounted read-only (statvfs(3)); NO when it cannot be told.
-[[nodiscard]] bool isMountedReadOnly(const std::filesystem::path& path);
-
 /// The preferences, kept in the stored settings, which must outlive this object.
 class Preferences final : public contract::OVPreferences {
 public:
@@ -48,7 +45,8 @@ public:
 
     bool showDetailsInFixwell() const override;
     void setShowDetailsInFixwell(bool shows) override;
-    bool rootVolumeIsReadOnly() const override { return isMountedReadOnly("/"); }
+    /// Whether "/" is mounted so (statvfs(3)); NO when it cannot be told.
+    bool rootVolumeIsReadOnly() const override;
 
 private:
     contract::UserDefaults& settings_;

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DirectDisks.h"
 
-#include "pellar/mounts/Holders.h"
 #include "pellar/mounts/MountCall.h"
 #include "pellar/mounts/MountContext.h"
 #include "pellar/process/FileDescriptor.h"
@@ -22,17 +21,6 @@ std::vector<pellar::MountPlace> placesOf(const std::string& node)
 {
     return pellar::mountPlacesOf(std::filesystem::path(node), pellar::SystemPaths());
 }
-
-std::string holdersText(const std::vector<pellar::MountPlace>& places)
-{
-    std::vector<std::string> holders;
-    for (const pellar::MountPlace& place : places)
-        for (const std::string& holder : pellar::holdersOf(place.target))
-            holders.push_back(holder);
-    return pellar::shownNames(holders);
-}
-
-namespace direct {
 
 namespace {
 
@@ -80,12 +68,12 @@ Result<void, Refusal> control(const std::string& node, unsigned long request)
 
 }  // namespace
 
-bool isAllowed()
+bool DirectDisks::isAllowed()
 {
     return ::geteuid() == 0;
 }
 
-Result<void, Refusal> mount(const std::string& node)
+Result<void, Refusal> DirectDisks::mount(const std::string& node)
 {
     const std::string target = targetInTable(node);
     if (target.empty())
@@ -98,7 +86,7 @@ Result<void, Refusal> mount(const std::string& node)
     return answerOf(errorOf(context, mnt_context_mount(context.get())));
 }
 
-Result<void, Refusal> unmount(const std::string& node)
+Result<void, Refusal> DirectDisks::unmount(const std::string& node)
 {
     auto places = placesOf(node);
     if (places.empty())
@@ -117,7 +105,7 @@ Result<void, Refusal> unmount(const std::string& node)
     return {};
 }
 
-Result<void, Refusal> eject(const std::string& node)
+Result<void, Refusal> DirectDisks::eject(const std::string& node)
 {
     const auto answer = control(node, CDROMEJECT);
     if (!answer && answer.error().kind == Refusal::Kind::Other)
@@ -125,19 +113,17 @@ Result<void, Refusal> eject(const std::string& node)
     return answer;
 }
 
-Result<void, Refusal> detachLoop(const std::string& node)
+Result<void, Refusal> DirectDisks::detachLoop(const std::string& node)
 {
     return control(node, LOOP_CLR_FD);
 }
 
-Result<std::string, Refusal> setUpLoop(int file, pellar::Access access)
+Result<std::string, Refusal> DirectDisks::setUpLoop(int file, pellar::Access access)
 {
     const auto made = pellar::setUpLoop(file, 0, 0, access, pellar::LoopLife::UntilDetached);
     if (const int* const error = std::get_if<int>(&made))
         return refusalOf(*error);
     return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
 }
-
-}  // namespace direct
 
 }  // namespace orvane

@@ -3,6 +3,7 @@
 
 #include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/UDisks.h"
+#include "pellar/mounts/Holders.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/volumes/DiskUse.h"
 
@@ -85,8 +86,8 @@ std::optional<Refusal> objectionTo(int file)
 Result<std::string, Refusal> setUp(int file, Access access, const std::stop_token& stop)
 {
     auto answer = UDisks(stop).setUpLoop(file, access);
-    const bool isOurs = !answer && isLeftToOthers(answer.error()) && direct::isAllowed();
-    return isOurs ? direct::setUpLoop(file, access) : answer;
+    const bool isOurs = !answer && isLeftToOthers(answer.error()) && DirectDisks::isAllowed();
+    return isOurs ? DirectDisks::setUpLoop(file, access) : answer;
 }
 
 }  // namespace
@@ -109,32 +110,16 @@ Result<std::string, Refusal> attachImage(const std::filesystem::path& image, Acc
     return setUp(file.get(), access, stop);
 }
 
-Access accessTo(const std::filesystem::path& image)
-{
-    return ::access(image.c_str(), W_OK) == 0 ? Access::ReadWrite : Access::ReadOnly;
-}
-
 namespace {
 
-Result<void, Refusal> throughUDisks(UDisks& udisks, const DiskStep& step)
+template <class Service>
+Result<void, Refusal> through(Service&& service, const DiskStep& step)
 {
     switch (step.kind) {
-        case DiskStep::Kind::Mount: return udisks.mount(step.node);
-        case DiskStep::Kind::Unmount: return udisks.unmount(step.node);
-        case DiskStep::Kind::Eject: return udisks.eject(step.node);
-        case DiskStep::Kind::DetachLoop: return udisks.detachLoop(step.node);
-        case DiskStep::Kind::Attach: break;
-    }
-    return Refusal{};
-}
-
-Result<void, Refusal> directly(const DiskStep& step)
-{
-    switch (step.kind) {
-        case DiskStep::Kind::Mount: return direct::mount(step.node);
-        case DiskStep::Kind::Unmount: return direct::unmount(step.node);
-        case DiskStep::Kind::Eject: return direct::eject(step.node);
-        case DiskStep::Kind::DetachLoop: return direct::detachLoop(step.node);
+        case DiskStep::Kind::Mount: return service.mount(step.node);
+        case DiskStep::Kind::Unmount: return service.unmount(step.node);
+        case DiskStep::Kind::Eject: return service.eject(step.node);
+        case DiskStep::Kind::DetachLoop: return service.detachLoop(step.node);
         case DiskStep::Kind::Attach: break;
     }
     return Refusal{};
@@ -143,10 +128,10 @@ Result<void, Refusal> directly(const DiskStep& step)
 // UDisks2 may be there and not know the device; then that is the reason, and not the missing table.
 Result<void, Refusal> throughAny(UDisks& udisks, const DiskStep& step)
 {
-    const Result<void, Refusal> answer = throughUDisks(udisks, step);
-    if (answer || !isLeftToOthers(answer.error()) || !direct::isAllowed())
+    const Result<void, Refusal> answer = through(udisks, step);
+    if (answer || !isLeftToOthers(answer.error()) || !DirectDisks::isAllowed())
         return answer;
-    const Result<void, Refusal> other = directly(step);
+    const Result<void, Refusal> other = through(DirectDisks(), step);
     const bool saysNothing = answer.error().kind == Refusal::Kind::UnknownDevice && !other &&
                              other.error().kind == Refusal::Kind::NoTable;
     return saysNothing ? answer : other;
@@ -172,12 +157,28 @@ bool hasComeOff(const std::string& node)
     return !std::filesystem::exists(image, error);
 }
 
+/// How this user may open the file.
+Access accessTo(const std::filesystem::path& image)
+{
+    return ::access(image.c_str(), W_OK) == 0 ? Access::ReadWrite : Access::ReadOnly;
+}
+
 Result<void, Refusal> attach(const std::filesystem::path& image, const std::stop_token& stop)
 {
     const auto answer = attachImage(image, accessTo(image), stop);
     if (!answer)
         return answer.error();
     return {};
+}
+
+/// Who keeps these places busy, "name (number)", as far as this user may see; printable.
+std::string holdersText(const std::vector<pellar::MountPlace>& places)
+{
+    std::vector<std::string> holders;
+    for (const pellar::MountPlace& place : places)
+        for (const std::string& holder : pellar::holdersOf(place.target))
+            holders.push_back(holder);
+    return pellar::shownNames(holders);
 }
 
 Result<void, Refusal> carryOut(UDisks& udisks, const DiskStep& step)

@@ -26,9 +26,6 @@ namespace orvane {
                                                        pellar::Access access,
                                                        const std::stop_token& stop = {});
 
-/// How this user may open the file.
-[[nodiscard]] pellar::Access accessTo(const std::filesystem::path& image);
-
 /// Does all the steps of a request through UDisks2, or itself where there is none and this is
 /// root. Not on the main thread: may take minutes. Abandoned when the thread is asked to stop.
 [[nodiscard]] Result<void, Refusal> carryOut(const DiskRequest& request,

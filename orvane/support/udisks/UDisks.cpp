@@ -12,28 +12,6 @@
 
 namespace orvane {
 
-bool isFailing(const DriveFacts& drive)
-{
-    const auto& warnings = drive.nvmeWarnings;
-    return (drive.ata.updated != 0 && drive.ata.isFailing) ||
-           std::any_of(warnings.begin(), warnings.end(),
-                       [](const std::string& warning) { return warning != "temperature"; });
-}
-
-std::set<std::string> failingDevices(const std::vector<DriveFacts>& drives,
-                                     const std::vector<DeviceOfDrive>& devices)
-{
-    std::set<std::string> failing;
-    for (const DriveFacts& drive : drives)
-        if (isFailing(drive))
-            failing.insert(drive.object);
-    std::set<std::string> nodes;
-    for (const DeviceOfDrive& device : devices)
-        if (failing.contains(device.drive))
-            nodes.insert(device.node);
-    return nodes;
-}
-
 namespace {
 
 using namespace std::chrono_literals;
@@ -101,33 +79,43 @@ const Properties* interfaceOf(const std::map<std::string, Properties>& object, c
     return found != object.end() ? &found->second : nullptr;
 }
 
-DriveFacts driveFacts(const sdbus::ObjectPath& path,
-                      const std::map<std::string, Properties>& object)
+DriveHealth healthOf(const std::map<std::string, Properties>& object)
 {
-    DriveFacts drive{path, {}, {}};
-    if (const auto* const ata = interfaceOf(object, "Drive.Ata"))
-        drive.ata = {valueOf<std::uint64_t>(*ata, "SmartUpdated", 0),
-                     valueOf(*ata, "SmartFailing", false)};
+    DriveHealth drive;
+    if (const auto* const ata = interfaceOf(object, "Drive.Ata")) {
+        drive.smartUpdated = valueOf<std::uint64_t>(*ata, "SmartUpdated", 0);
+        drive.isSmartFailing = valueOf(*ata, "SmartFailing", false);
+    }
     // Since UDisks2 2.10.
     if (const auto* const nvme = interfaceOf(object, "NVMe.Controller"))
         drive.nvmeWarnings = valueOf(*nvme, "SmartCriticalWarning", std::vector<std::string>());
     return drive;
 }
 
+/// The nodes of those devices, whole or parts, whose drive is failing.
 std::set<std::string> failingNodes(const Objects& objects)
 {
-    std::vector<DriveFacts> drives;
-    std::vector<DeviceOfDrive> devices;
+    std::set<std::string> nodes;
     for (const auto& [path, object] : objects) {
-        drives.push_back(driveFacts(path, object));
-        if (const auto* const block = interfaceOf(object, "Block"))
-            devices.push_back({fileName(valueOf(*block, "Device", std::vector<std::uint8_t>())),
-                               valueOf(*block, "Drive", sdbus::ObjectPath("/"))});
+        const auto* const block = interfaceOf(object, "Block");
+        const auto drive = block != nullptr
+                               ? objects.find(valueOf(*block, "Drive", sdbus::ObjectPath("/")))
+                               : objects.end();
+        if (drive != objects.end() && isFailing(healthOf(drive->second)))
+            nodes.insert(fileName(valueOf(*block, "Device", std::vector<std::uint8_t>())));
     }
-    return failingDevices(drives, devices);
+    return nodes;
 }
 
 }  // namespace
+
+bool isFailing(const DriveHealth& drive)
+{
+    const auto& warnings = drive.nvmeWarnings;
+    return (drive.smartUpdated != 0 && drive.isSmartFailing) ||
+           std::any_of(warnings.begin(), warnings.end(),
+                       [](const std::string& warning) { return warning != "temperature"; });
+}
 
 UDisks::UDisks(std::stop_token stop) : stop_(std::move(stop))
 {
