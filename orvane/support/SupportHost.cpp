@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/SupportHost.h"
 
+#include "orvane/support/files/WholeFile.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/support/texts/TimeEstimator.h"
 
@@ -10,11 +11,6 @@ namespace orvane {
 namespace {
 
 constexpr const char* hostTable = "Orvane";
-
-std::filesystem::path in(const std::filesystem::path& directory, const char* name)
-{
-    return directory.empty() ? directory : directory / name;
-}
 
 Translator translatorOf(const ModuleBundle& bundle)
 {
@@ -41,10 +37,10 @@ SupportHost::SupportHost(SupportOptions options, EventLoop& loop)
                if (options_.warn)
                    options_.warn(sentence);
            }),
-      settings_(in(options_.paths.config, "settings.json"),
+      settings_(fileIn(options_.paths.config, "settings.json"),
                 [this](const std::string& sentence) { warn(sentence); }),
       preferences_(settings_),
-      store_(options_.keepsHistory ? in(options_.paths.state, "history.sqlite3") : "",
+      store_(options_.keepsHistory ? fileIn(options_.paths.state, "history.sqlite3") : "",
              options_.historyLimits, [this](const std::string& sentence) { warn(sentence); }),
       histories_(store_),
       disks_(center_, {options_.capabilities, &histories_}),

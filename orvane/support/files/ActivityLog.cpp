@@ -169,18 +169,13 @@ std::string_view nameOf(int level)
     }
 }
 
-std::filesystem::path in(const std::filesystem::path& directory, const char* name)
-{
-    return directory.empty() ? directory : directory / name;
-}
-
 }  // namespace
 
 ActivityLog::ActivityLog(const Options& options, const WarningSink& warn)
     : keptLevel_(options.keptLevel),
       shownLevel_(options.shownLevel),
-      developers_(in(options.directory, "fixwell.log"), options.limits, warn),
-      activity_(in(options.directory, "activity.log"), options.limits, warn)
+      developers_(fileIn(options.directory, "fixwell.log"), options.limits, warn),
+      activity_(fileIn(options.directory, "activity.log"), options.limits, warn)
 {
 }
 

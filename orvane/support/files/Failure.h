@@ -1,11 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/foundation/UTF8.h"
 #include "pellar/outcome/Result.h"
 
 #include <functional>
 #include <string>
 #include <string_view>
+#include <system_error>
 
 namespace orvane {
 
@@ -23,11 +25,21 @@ using pellar::Result;
 using WarningSink = std::function<void(const std::string& sentence)>;
 
 /// What the system says about an error number (errno(3)).
-[[nodiscard]] std::string errorText(int errorNumber);
+[[nodiscard]] inline std::string errorText(int errorNumber)
+{
+    return std::generic_category().message(errorNumber);
+}
 
 /// "cannot ATTEMPT ‘OBJECT’: OUTCOME", with the object made printable.
-[[nodiscard]] Failure cannot(std::string_view attempt, std::string_view object,
-                             std::string_view outcome);
-[[nodiscard]] Failure cannot(std::string_view attempt, std::string_view object, int errorNumber);
+[[nodiscard]] inline Failure cannot(const std::string& attempt, std::string_view object,
+                                    const std::string& outcome)
+{
+    return {"cannot " + attempt + " ‘" + contract::printable(object) + "’: " + outcome};
+}
+[[nodiscard]] inline Failure cannot(const std::string& attempt, std::string_view object,
+                                    int errorNumber)
+{
+    return cannot(attempt, object, errorText(errorNumber));
+}
 
 }  // namespace orvane

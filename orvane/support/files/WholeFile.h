@@ -10,6 +10,13 @@
 
 namespace orvane {
 
+/// The file of this name in the directory; empty where there is no directory.
+[[nodiscard]] inline std::filesystem::path fileIn(const std::filesystem::path& directory,
+                                                  std::string_view name)
+{
+    return directory.empty() ? directory : directory / name;
+}
+
 /// Writes all of `bytes`; the error number, or 0. Interrupted and partial writes are continued.
 [[nodiscard]] int writeAll(int descriptor, std::string_view bytes);
 

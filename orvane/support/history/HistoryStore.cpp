@@ -45,7 +45,7 @@ HistoryStore::Mishap HistoryStore::lastMishap()
 }
 
 // Always NO, for the caller to pass on.
-bool HistoryStore::failedTo(std::string_view attempt, const Mishap& mishap)
+bool HistoryStore::failedTo(const std::string& attempt, const Mishap& mishap)
 {
     tables_->records.forgetWritten();
     if (mishap.isDamage && isKept_) {

@@ -86,7 +86,7 @@ private:
     Mishap lastMishap();
     std::int64_t noteBegin(std::string_view key, std::string_view action, Run::Time started);
     void writeLate();
-    bool failedTo(std::string_view attempt, const Mishap& mishap);
+    bool failedTo(const std::string& attempt, const Mishap& mishap);
     void countAdded(std::int64_t records);
 
     const std::filesystem::path file_;
