@@ -73,7 +73,7 @@ void SupportHost::connectDisks()
     };
 }
 
-// Nobody waits for it on the main thread, not even where a module wishes to: somewhere a user may
+// The main thread does not wait for it, not even where a module wishes to: somewhere a user may
 // be looking for the password. What fails is told later.
 Result<void, Failure> SupportHost::start(DiskAction action, const Disk& disk)
 {

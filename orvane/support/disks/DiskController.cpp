@@ -153,7 +153,7 @@ void DiskController::tellGone(const std::shared_ptr<Disk>& top)
         }
 }
 
-// First forgotten, then told: whoever hears of it must not find the disk any more.
+// First forgotten, then told: an observer must not find the disk any more.
 void DiskController::forget(const std::shared_ptr<Disk>& root)
 {
     if (!isHeld(root))

@@ -120,7 +120,7 @@ int RotatingFile::makeReady()
     return open();
 }
 
-// Another program may have rotated the log, or somebody has removed it.
+// Another program may have rotated the log, or a user removed it.
 bool RotatingFile::isStillTheFile() const
 {
     struct stat mine = {};
@@ -134,7 +134,7 @@ int RotatingFile::open()
 {
     if (!createPrivateDirectory(file_.parent_path()))
         return ENOENT;
-    // A link or a FIFO that somebody has put in the log's place is refused, not written to.
+    // A link or a FIFO in the log's place is refused, not written to.
     const int flags = O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK;
     descriptor_ = pellar::FileDescriptor(::open(file_.c_str(), flags, 0600));
     return descriptor_ ? 0 : errno;
@@ -197,7 +197,7 @@ void ActivityLog::ov_log(int level, int /*flags*/, std::string_view line)
         developers_.buffer().append(clock_.now()).append(text);
         developers_.flush();
     }
-    // Standard error may be closed; there is nobody left to tell.
+    // Standard error may be closed; there is no other place to say it.
     if (level <= shownLevel_)
         static_cast<void>(writeAll(STDERR_FILENO, text));
 }

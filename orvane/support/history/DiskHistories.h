@@ -25,15 +25,15 @@ namespace orvane {
 /// until the program ends, so that a disk that goes and comes again finds its records. Main thread
 /// only.
 ///
-/// A long history may come in two steps, so that nobody waits for its oldest records: at first the
-/// newest ones alone, and the complete list when `loadMore` has read the others.
+/// A long history may come in two steps, so that no caller waits for its oldest records: at first
+/// the newest ones alone, and the complete list when `loadMore` has read the others.
 class DiskHistories final : public HistoryKeeper {
 public:
     /// The store must outlive this object.
     explicit DiskHistories(HistoryStore& store) : store_(store) {}
 
     /// From now on long histories come in two steps. `isIncomplete` is called when one has begun
-    /// to; somebody must then call `loadMore` until it answers NO.
+    /// to; the caller must then call `loadMore` until it answers NO.
     void loadGradually(std::function<void()> isIncomplete)
     {
         isIncomplete_ = std::move(isIncomplete);

@@ -27,8 +27,8 @@ struct ReadImage {
 };
 
 /// One reading of an image file, on a thread of its own: a file on a network or on a sleeping
-/// drive may keep its reader waiting for as long as it likes, and nobody has to wait with it. Any
-/// thread.
+/// drive may keep its reader waiting for as long as it likes, and no other thread has to wait with
+/// it. Any thread.
 class ImageReading {
 public:
     /// A failure is the bare reason, in English where it is one of the host's own.
@@ -47,7 +47,7 @@ public:
     enum class State { Reading, Done, GivenUp };
     /// Returns when it is done or given up, or that time is over.
     State waitFor(std::chrono::milliseconds longest);
-    /// Nobody is interested any more: who waits returns at once.
+    /// The result is not wanted any more: `waitFor` returns at once.
     void giveUp();
     /// What was read; none while it is being read.
     std::optional<Outcome> result() const;

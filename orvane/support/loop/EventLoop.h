@@ -32,7 +32,7 @@ private:
     State state_ = State::Pending;
 };
 
-/// What one worker thread hands to the main thread, while somebody else decides when it is
+/// What one worker thread hands to the main thread, while its owner decides when it is
 /// delivered. A run loop asks for the calling thread's queue in performOnMainThread, and puts
 /// the task there when it has one.
 class DeliveryQueue {
@@ -65,7 +65,7 @@ protected:
 class EventLoop : public contract::RunLoop {
 public:
     void performOnMainThread(Task task, Wait wait) final;
-    /// Any thread. Queues the task behind what was posted before, past any queue.
+    /// Any thread. Queues the task behind what was posted before, past any DeliveryQueue.
     virtual void post(Task task) = 0;
 };
 

@@ -9,9 +9,9 @@ namespace orvane {
 
 /// Takes the signals by which a user or the system ends a program (SIGINT, SIGTERM, SIGHUP) off
 /// their ordinary way, from this object's making until its end: they can be read from a
-/// descriptor instead. Threads that are started meanwhile leave them alone; none may be running
-/// before. From then on a write to nobody is an error and no signal: output that is not read any
-/// more must not end a repair in its middle.
+/// descriptor instead. Threads that are started while it lives leave them alone; none may be
+/// running before. From then on a write to a closed pipe is an error and no signal: output that is
+/// not read any more must not end a repair in its middle.
 class SignalReader {
 public:
     SignalReader();

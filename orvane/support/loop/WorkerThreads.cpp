@@ -71,10 +71,10 @@ void WorkerThreads::detachNewThread(contract::RunLoop::Task task)
     Worker* worker = nullptr;
     {
         const std::lock_guard guard(lock_);
-        const bool nobodyIsBefore = std::all_of(workers_.begin(), workers_.end(),
+        const bool isFirst = std::all_of(workers_.begin(), workers_.end(),
                                                 [](const auto& other) { return other->isOver; });
         worker = workers_.emplace_back(std::make_unique<Worker>(*this)).get();
-        worker->isFirst = nobodyIsBefore;
+        worker->isFirst = isFirst;
     }
     try {
         worker->thread = std::thread([worker, task] { worker->run(task); });

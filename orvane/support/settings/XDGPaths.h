@@ -24,7 +24,7 @@ struct XDGPaths {
     std::filesystem::path data;
 };
 
-/// Whether a base directory is somebody else's.
+/// Whether a base directory is another user's.
 using IsForeign = std::function<bool(const std::filesystem::path& directory)>;
 
 /// `accountHome` stands in when HOME is not set or foreign; a variable that is no absolute path is

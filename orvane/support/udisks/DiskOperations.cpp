@@ -55,7 +55,7 @@ Refusal refusalToOpen(const std::filesystem::path& image, Access access, int err
     return {Refusal::Kind::Other, errorText(error)};
 }
 
-// Of less than a sector the system makes a device without any, which nobody finds again.
+// Of less than a sector the system makes a device without any, which is never found again.
 bool canBeDisk(const struct stat& status)
 {
     constexpr off_t sectorBytes = 512;
@@ -145,7 +145,7 @@ bool holdsSystem(const std::vector<pellar::MountPlace>& places)
                        [](const auto& place) { return place.target == "/"; });
 }
 
-// The kernel takes an image off when nobody has its device open any more (loop(4), LOOP_CLR_FD);
+// The kernel takes an image off when its device is open no more (loop(4), LOOP_CLR_FD);
 // the device manager may have, for a moment.
 bool hasComeOff(const std::string& node)
 {
@@ -256,7 +256,7 @@ void DiskOperations::start(std::vector<DiskRequest> requests, Finished finished)
     }
 }
 
-// Taken off first: whoever is told may start the next.
+// Taken off first: the callback may start the next.
 void DiskOperations::finish(Number number, const std::vector<Answer>& answers)
 {
     const auto ended = running_.extract(number);

@@ -21,7 +21,7 @@ namespace orvane {
 /// Makes an image file a device of the system that stays until it is detached: through UDisks2, or
 /// itself where there is none and this is root. Answers the device's node. IsReadOnly where the
 /// file is to be written and this user may not; BeingUsed while a job of ours works on it, and
-/// none can begin on it meanwhile; Attached where it is. Not on the main thread: may take minutes.
+/// none can begin on it until then; Attached where it is. Not on the main thread: may take minutes.
 [[nodiscard]] Result<std::string, Refusal> attachImage(const std::filesystem::path& image,
                                                        pellar::Access access,
                                                        const std::stop_token& stop = {});
@@ -41,7 +41,7 @@ public:
     DiskOperations(EventLoop& loop, const Translator& texts) : loop_(loop), texts_(texts) {}
     DiskOperations(const DiskOperations&) = delete;
     DiskOperations& operator=(const DiskOperations&) = delete;
-    /// Waits for nobody's password: what UDisks2 has been asked for, it goes on with alone. What
+    /// Does not wait for a password: what UDisks2 has been asked for, it goes on with alone. What
     /// this process does itself is brought to its end.
     ~DiskOperations();
 

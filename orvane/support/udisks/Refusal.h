@@ -30,7 +30,7 @@ struct Refusal {
         IsWhole,      ///< it has volumes, and is none
         IsNoLoop,     ///< a device that no image is behind
         HasGone,
-        Lingers,     ///< it goes when nobody has it open any more
+        Lingers,     ///< it goes when it is open no more
         Attached,    ///< an image that is attached already; `detail` names the device
         BeingUsed,   ///< an image that is being verified or repaired
         IsReadOnly,  ///< an image that this user may not write to
