@@ -61,7 +61,7 @@ void DiskScan::finish(const std::vector<DiskTree>& disks)
         start();
 }
 
-DiskPane::DiskPane(DesktopHost& host, HostLoop& loop, DiskList& list, const JobLedger& ledger,
+DiskPane::DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
                    std::vector<std::string> named, bool scansSystemDisks, Events events)
     : host_(host),
       list_(list),
@@ -104,8 +104,8 @@ void DiskPane::synchronize()
 void DiskPane::start()
 {
     if (scansSystemDisks_) {
-        if (const auto watching = watch_.start(); failed(watching))
-            host_.log().ov_log(contract::OVLog::error, 0, failureMessage(watching));
+        if (const auto watching = watch_.start(); !watching)
+            host_.log().ov_log(contract::OVLog::error, 0, watching.error().message);
         scan_.start();
     }
     openNamed(true);

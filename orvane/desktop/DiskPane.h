@@ -23,7 +23,7 @@ public:
     using Finished = std::function<void(const std::vector<DiskTree>& disks)>;
 
     /// `finished` is called from the loop, which outlives this object.
-    DiskScan(HostLoop& loop, Finished finished) : loop_(loop), finished_(std::move(finished)) {}
+    DiskScan(EventLoop& loop, Finished finished) : loop_(loop), finished_(std::move(finished)) {}
     DiskScan(const DiskScan&) = delete;
     DiskScan& operator=(const DiskScan&) = delete;
     /// Waits for a scan that is under way; nothing is heard of it any more.
@@ -36,7 +36,7 @@ public:
 private:
     void finish(const std::vector<DiskTree>& disks);
 
-    HostLoop& loop_;
+    EventLoop& loop_;
     Finished finished_;
     bool isScanning_ = false;
     bool mustScanAgain_ = false;
@@ -60,7 +60,7 @@ public:
 
     /// `named` are opened at the start, as orvane/support/disks/DiskLookup.h takes them. All but
     /// the events and names outlive this object. The list follows the host's disks from here on.
-    DiskPane(DesktopHost& host, HostLoop& loop, DiskList& list, const JobLedger& ledger,
+    DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
              std::vector<std::string> named, bool scansSystemDisks, Events events);
     DiskPane(const DiskPane&) = delete;
     DiskPane& operator=(const DiskPane&) = delete;

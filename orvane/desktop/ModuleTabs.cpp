@@ -10,17 +10,17 @@
 
 namespace orvane::desktop {
 
-Outcome<std::unique_ptr<ModuleTab>> ModuleTab::load(const std::filesystem::path& bundle,
+Result<std::unique_ptr<ModuleTab>, Failure> ModuleTab::load(const std::filesystem::path& bundle,
                                                     const Surroundings& surroundings)
 {
     auto loaded = loadModule(bundle);
-    if (failed(loaded))
-        return Failure{failureMessage(loaded)};
-    auto tab = std::make_unique<ModuleTab>(surroundings, std::get<LoadedModule>(std::move(loaded)));
+    if (!loaded)
+        return loaded.error();
+    auto tab = std::make_unique<ModuleTab>(surroundings, *std::move(loaded));
     if (!shouldRun(tab->loaded_, surroundings.host))
         return std::unique_ptr<ModuleTab>();
-    if (const auto made = tab->makeModule(); failed(made))
-        return Failure{failureMessage(made)};
+    if (const auto made = tab->makeModule(); !made)
+        return made.error();
     return tab;
 }
 
@@ -40,18 +40,18 @@ ModuleTab::~ModuleTab()
         host_.printing().forget(*interface_->outlineView());
 }
 
-Outcome<> ModuleTab::makeModule()
+Result<void, Failure> ModuleTab::makeModule()
 {
     const LoadedInterface* const before = host_.interfaceLoader().latest();
     host_.interfaceLoader().setBundle(*loaded_.bundle);
     auto made = orvane::makeModule(loaded_, host_, *this);
-    if (failed(made))
-        return Failure{failureMessage(made)};
-    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
+    if (!made)
+        return made.error();
+    module_ = *std::move(made);
     if (LoadedInterface* const latest = host_.interfaceLoader().latest(); latest != before)
         interface_ = latest;
     library_.setDelegate(module_->asyncDelegate());
-    return Done{};
+    return {};
 }
 
 contract::OVDiskPointer ModuleTab::workingDisk() const
@@ -100,10 +100,10 @@ void ModuleTabs::load(const std::vector<std::filesystem::path>& bundles,
     std::string switchedOff;
     for (const std::filesystem::path& bundle : bundles) {
         auto tab = ModuleTab::load(bundle, {host_, controller_, libraryOptions});
-        if (failed(tab))
-            warn(failureMessage(tab));
-        else if (std::get<std::unique_ptr<ModuleTab>>(tab))
-            add(std::get<std::unique_ptr<ModuleTab>>(std::move(tab)));
+        if (!tab)
+            warn(tab.error().message);
+        else if (*tab)
+            add(*std::move(tab));
         else
             switchedOff += (switchedOff.empty() ? "" : ", ") + bundle.stem().string();
     }

@@ -2,7 +2,7 @@
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/ProgramStart.h"
-#include "orvane/support/loop/EndingSignals.h"
+#include "orvane/support/loop/SignalReader.h"
 #include "orvane/support/texts/Language.h"
 
 #include <QApplication>
@@ -87,7 +87,7 @@ public:
     }
 
 private:
-    EndingSignals signals_;
+    SignalReader signals_;
     std::optional<QSocketNotifier> notifier_;
 };
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/PasswordAgent.h"
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 #include "pellar/process/ForkedSignals.h"
 
 #include <fcntl.h>
@@ -21,6 +21,8 @@
 extern char** environ;
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 namespace {
 
 constexpr const char* program = "/usr/bin/pkttyagent";

@@ -4,7 +4,7 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 
 #include <QLocale>
 #include <QPainter>
@@ -129,7 +129,7 @@ QString nameText(const DiskRow& row)
                            facts.type != diskType::diskImage;
     if (!label.isEmpty() && !isInImage && !file.isEmpty())
         return label + QStringLiteral(" (") + file + QLatin1Char(')');
-    const QString name = shown(facts.displayName);
+    const QString name = shown(facts.name);
     return name.isEmpty() ? file : name;
 }
 

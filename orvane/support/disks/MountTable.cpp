@@ -82,9 +82,8 @@ std::vector<Mount> parseMountInfo(std::string_view text)
 
 std::vector<Mount> currentMounts()
 {
-    const auto contents = readWholeFile("/proc/self/mountinfo", 16U << 20U);
-    const auto* const text = std::get_if<std::string>(&contents);
-    auto mounts = text != nullptr ? parseMountInfo(*text) : std::vector<Mount>();
+    const auto text = readWholeFile("/proc/self/mountinfo", 16U << 20U);
+    auto mounts = text ? parseMountInfo(*text) : std::vector<Mount>();
     for (Mount& mount : mounts)
         mount.source = nodeOf(mount.source);
     return mounts;

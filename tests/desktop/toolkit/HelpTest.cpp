@@ -2,8 +2,8 @@
 #include "fixwell/availability/ButtonDecision.h"
 #include "orvane/desktop/toolkit/Help.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/texts/ModuleBundle.h"
 #include "tests/module/FakeHost.h"
 
 #include <QFile>
