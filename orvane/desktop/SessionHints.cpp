@@ -23,14 +23,6 @@ Check checkOf(const Run& run)
             QDateTime::fromMSecsSinceEpoch(started.count())};
 }
 
-// The module puts its reason behind what the button does.
-std::string reasonOfModule(const QtButton& button)
-{
-    const std::string& toolTip = button.toolTip();
-    const std::size_t at = toolTip.find("\n\n");
-    return at == std::string::npos ? std::string() : toolTip.substr(at + 2);
-}
-
 bool isForPermissions(std::string_view button)
 {
     return button.find("Permissions") != std::string_view::npos;
@@ -114,17 +106,17 @@ void DesktopSession::tellReasons()
         reasons = reasonsByDisk();
     for (const auto& [name, reason] : reasons)
         if (QtButton* const button = moduleButton(name.c_str()))
-            button->setReason(reason);
+            button->setHostReason(reason);
     if (QtButton* const clear = moduleButton("clearHistoryButton"))
-        clear->setReason(text(controller_.interfaceLock() ? "Not available while a job runs."
-                                                          : "There is no history to clear."));
+        clear->setHostReason(text(controller_.interfaceLock() ? "Not available while a job runs."
+                                                              : "There is no history to clear."));
 }
 
 // Why the button is grey for the disk that is selected, where the module gives no reason.
 std::string DesktopSession::reasonFor(const Disk& disk, std::string_view button)
 {
     QtButton* const control = moduleButton(std::string(button).c_str());
-    if (control == nullptr || !reasonOfModule(*control).empty())
+    if (control == nullptr || !control->reason().empty())
         return {};
     std::string reason = orvane::reasonOfHost(disk, library_, host_.translator());
     if (reason.empty() && disk.facts().type == diskType::whole && isForPermissions(button))
@@ -154,7 +146,7 @@ std::map<std::string, std::string> DesktopSession::reasonsByDisk()
         for (const char* const name : grey) {
             if (!isGrey(name))
                 continue;
-            const std::string own = reasonOfModule(*moduleButton(name));
+            const std::string& own = moduleButton(name)->reason();
             const std::string why = own.empty() ? reasonFor(*disk, name) : own;
             reasons[name] += (reasons[name].empty() ? "" : "\n") +
                              host_.translator().sentence("“%@”: %@", {disk->displayName(), why});

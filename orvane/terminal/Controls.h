@@ -13,31 +13,23 @@ public:
     void setNeedsDisplay(bool /*needsDisplay*/) override {}
     void setEnabled(bool isEnabled) override { isEnabled_ = isEnabled; }
     bool isEnabled() const override { return isEnabled_; }
-    void setToolTip(std::string_view text) override { toolTip_ = text; }
+    void setToolTip(std::string_view /*text*/) override {}
     void setTitle(std::string_view title) override { title_ = title; }
     void setAction(contract::Selector action) override { action_ = action; }
     void setIntegerValue(std::int64_t /*value*/) override {}
-    void setKeyEquivalent(std::string_view key) override { key_ = key; }
+    void setKeyEquivalent(std::string_view /*key*/) override {}
     void setTag(std::int64_t tag) override { tag_ = tag; }
+    void setReason(std::string_view reason) override { reason_ = reason; }
 
     const std::string& title() const { return title_; }
-    const std::string& toolTip() const { return toolTip_; }
+    const std::string& reason() const { return reason_; }
     contract::Selector action() const { return action_; }
     std::int64_t tag() const { return tag_; }
-    const std::string& keyEquivalent() const { return key_; }
-
-    /// Why the button cannot be used: what the tooltip says beyond describing the button.
-    std::string reason() const
-    {
-        const std::size_t gap = toolTip_.find("\n\n");
-        return gap == std::string::npos ? std::string() : toolTip_.substr(gap + 2);
-    }
 
 private:
     bool isEnabled_ = true;
-    std::string toolTip_;
     std::string title_;
-    std::string key_;
+    std::string reason_;
     contract::Selector action_;
     std::int64_t tag_ = 0;
 };

@@ -37,7 +37,7 @@ TEST_F(Interface, AClickReachesTheModuleAndAJobTurnsTheButtonIntoStop)
 {
     QtButton& verify = *interface->button("verifyDiskButton");
     const QKeySequence shortcut = verify.widget().shortcut();
-    ASSERT_TRUE(verify.isEnabled()) << verify.toolTip();
+    ASSERT_TRUE(verify.isEnabled()) << verify.reason();
     verify.press();
     settle();
     EXPECT_EQ(verify.title(), "Stop Verify");
