@@ -88,14 +88,13 @@ int run(const std::vector<std::string>& arguments)
 {
     const auto user = userWhoAsked();
     settle();
-    const auto read = readHelperArguments(arguments, isBlockDevice);
-    if (const auto* const refusal = std::get_if<std::string>(&read)) {
-        std::fprintf(stderr, "pellar-helper: %s\n", refusal->c_str());
+    const auto request = readHelperArguments(arguments, isBlockDevice);
+    if (!request) {
+        std::fprintf(stderr, "pellar-helper: %s\n", request.error());
         return exitWrongUsage;
     }
-    const auto& request = std::get<HelperRequest>(read);
     adoptUserLocale();
-    setLanguage(request.languages);
+    setLanguage(request->languages);
 
     // As if it lay beside the programs, where texts and modules are looked for.
     const auto program =
@@ -109,7 +108,7 @@ int run(const std::vector<std::string>& arguments)
     if (const auto bundles = findModuleBundles(moduleDirectories(noEnvironment, program));
         !bundles.empty())
         texts.setResultTexts(moduleTexts.emplace(bundles.front() / "locale"));
-    runHelperJob(request, user, texts);
+    runHelperJob(*request, user, texts);
     return 0;
 }
 

@@ -40,7 +40,7 @@ bool isWayOfRootsAlone(const std::filesystem::path& directory)
     }
 }
 
-std::variant<std::string, pellar::Sentence> mountedSystemOn(const std::filesystem::path& device)
+pellar::Result<std::string, pellar::Sentence> mountedSystemOn(const std::filesystem::path& device)
 {
     struct stat status = {};
     if (::stat(device.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))

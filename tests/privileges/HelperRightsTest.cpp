@@ -2,7 +2,6 @@
 // What the helper takes from the program that asks, and from the mount table.
 
 #include "orvane/privileges/AskingProgram.h"
-#include "orvane/privileges/AttachedRegion.h"
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/ProgramStart.h"
 #include "pellar/process/Command.h"
@@ -127,9 +126,9 @@ TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
         request.operation = c.operation;
         request.disk.length = c.length;
         const FileDescriptor file(::open(c.file.c_str(), c.mode | O_CLOEXEC));
-        const auto attached = AttachedRegion::attach(file, request);
-        ASSERT_TRUE(std::holds_alternative<Undone>(attached)) << c.file;
-        EXPECT_EQ(std::get<Undone>(attached).reason.key, c.reason) << c.file << c.mode;
+        const auto attached = attachRegion(file, request);
+        ASSERT_FALSE(attached) << c.file;
+        EXPECT_EQ(attached.error().reason.key, c.reason) << c.file << c.mode;
     }
 }
 

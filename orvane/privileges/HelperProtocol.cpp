@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/privileges/HelperRequest.h"
+#include "orvane/privileges/HelperProtocol.h"
+
+#include "orvane/support/settings/ValueJSON.h"
 
 #include <algorithm>
 #include <array>
@@ -15,7 +17,7 @@ namespace {
 using pellar::Operation;
 using pellar::Subject;
 using Arguments = std::span<const std::string>;
-using Read = std::variant<HelperRequest, std::string>;
+using Read = pellar::Result<HelperRequest, const char*>;
 
 struct Task {
     std::string_view word;
@@ -140,6 +142,68 @@ std::string acceptedLanguages(std::string_view list)
     return accepted;
 }
 
+using nlohmann::json;
+
+json jsonFromText(const std::string& text)
+{
+    return jsonFromValue(contract::Value(std::string_view(text)));
+}
+
+json jsonFromDictionary(const contract::Dictionary& dictionary)
+{
+    return dictionary ? jsonFromValue(contract::Value(dictionary)) : json();
+}
+
+struct EventWriter {
+    json operator()(const pellar::Started&) const { return json::array({"started"}); }
+    json operator()(const pellar::Message& message) const
+    {
+        return json::array(
+            {"message", jsonFromText(message.text), jsonFromDictionary(message.dictionary)});
+    }
+    json operator()(const pellar::Trace& trace) const
+    {
+        return json::array({"trace", jsonFromText(trace.line)});
+    }
+    json operator()(const pellar::Finished& finished) const
+    {
+        return json::array({"finished", finished.mainError, finished.detailError,
+                            jsonFromDictionary(finished.result)});
+    }
+};
+
+std::string textFromJSON(const json& part)
+{
+    return std::string(valueFromJSON(part).string());
+}
+
+std::optional<pellar::Event> eventFromJSON(const json& parts)
+{
+    const auto& kind = parts.at(0).get_ref<const std::string&>();
+    if (kind == "started")
+        return pellar::Started{};
+    if (kind == "message")
+        return pellar::Message{textFromJSON(parts.at(1)), valueFromJSON(parts.at(2)).dictionary()};
+    if (kind == "trace")
+        return pellar::Trace{textFromJSON(parts.at(1))};
+    if (kind == "finished")
+        return pellar::Finished{parts.at(1).get<std::int32_t>(), parts.at(2).get<std::int32_t>(),
+                                valueFromJSON(parts.at(3)).dictionary()};
+    return std::nullopt;
+}
+
+std::string_view attemptOf(const HelperRequest& request)
+{
+    const bool isRepair = request.operation == pellar::Operation::Repair;
+    if (request.subject == Subject::Permissions)
+        return isRepair ? "cannot repair the permissions on “%1$@”: %2$@"
+                        : "cannot verify the permissions on “%1$@”: %2$@";
+    if (request.subject == Subject::PartitionMap)
+        return isRepair ? "cannot repair the partition map of “%1$@”: %2$@"
+                        : "cannot verify the partition map of “%1$@”: %2$@";
+    return isRepair ? "cannot repair “%1$@”: %2$@" : "cannot verify “%1$@”: %2$@";
+}
+
 }  // namespace
 
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
@@ -201,6 +265,32 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
         task->subject == Subject::Permissions && !texts.empty() && texts.back() == fetching;
     return withTexts(std::move(request),
                      texts.first(texts.size() - (request.fetchesArchives ? 1 : 0)));
+}
+
+std::string lineFromEvent(const pellar::Event& event)
+{
+    return std::visit(EventWriter{}, event).dump();
+}
+
+std::optional<pellar::Event> eventFromLine(std::string_view line)
+{
+    const json parts = parsedJSON(line);
+    if (!parts.is_array() || parts.empty())
+        return std::nullopt;
+    try {
+        return eventFromJSON(parts);
+    } catch (const json::exception&) {
+        return std::nullopt;
+    }
+}
+
+void reportFailure(const JobFailure& failure, const HelperRequest& request,
+                   const pellar::Texts& texts, pellar::JobLog& log)
+{
+    const std::string message =
+        pellar::Sentence{attemptOf(request), log.diskName(), failure.reason.in(texts)}.in(texts);
+    log.failure(message);
+    log.finished(failure.error, 0, failure.verdict, message);
 }
 
 }  // namespace orvane

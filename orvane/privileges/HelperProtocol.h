@@ -2,12 +2,19 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/DiskIdentity.h"
+#include "pellar/jobs/Event.h"
+#include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/outcome/Result.h"
 
+#include <filesystem>
 #include <functional>
+#include <optional>
 #include <string>
-#include <variant>
+#include <string_view>
 #include <vector>
 
 namespace orvane {
@@ -25,16 +32,6 @@ struct HelperRequest {
     bool fetchesArchives = false;
 
     bool isOnImage() const { return image >= 0; }
-
-    friend bool operator==(const HelperRequest& a, const HelperRequest& b)
-    {
-        return a.subject == b.subject && a.operation == b.operation && a.image == b.image &&
-               a.disk.path == b.disk.path && a.disk.offset == b.disk.offset &&
-               a.disk.length == b.disk.length && a.disk.identifier == b.disk.identifier &&
-               a.disk.name == b.disk.name && a.disk.filesystem == b.disk.filesystem &&
-               a.disk.isWhole == b.disk.isWhole && a.identity == b.identity &&
-               a.languages == b.languages && a.fetchesArchives == b.fetchesArchives;
-    }
 };
 
 /// What has to be asked for a job, on the disk that has its name now.
@@ -50,8 +47,24 @@ struct HelperRequest {
 /// anybody's: nothing is taken but a block device below /dev by its own name, or the number of a
 /// descriptor and a region, and names that cannot do harm. `isBlockDevice` answers for a path that
 /// leads through no link.
-[[nodiscard]] std::variant<HelperRequest, std::string> readHelperArguments(
+[[nodiscard]] pellar::Result<HelperRequest, const char*> readHelperArguments(
     const std::vector<std::string>& arguments,
     const std::function<bool(const std::filesystem::path&)>& isBlockDevice);
+
+/// A job's event as one line of JSON without its end, and back. What a line of another program
+/// holds is no event.
+[[nodiscard]] std::string lineFromEvent(const pellar::Event& event);
+[[nodiscard]] std::optional<pellar::Event> eventFromLine(std::string_view line);
+
+/// How a job ends that was not done.
+struct JobFailure {
+    contract::ErrorCode error;
+    pellar::Sentence reason;
+    contract::Name verdict = contract::kPLVerdictFailed;
+};
+
+/// "cannot repair “NAME”: REASON", in the log and as the job's end, which has begun.
+void reportFailure(const JobFailure& failure, const HelperRequest& request,
+                   const pellar::Texts& texts, pellar::JobLog& log);
 
 }  // namespace orvane
