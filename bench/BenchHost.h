@@ -3,7 +3,6 @@
 
 #include "fixwell/module/OVFXW.h"
 #include "orvane/terminal/TerminalHost.h"
-#include "orvane/terminal/TerminalWindow.h"
 
 #include <filesystem>
 #include <memory>
@@ -22,7 +21,6 @@ class SilentReporter final : public Reporter {
                   std::string_view) override
     {
     }
-    void report(const std::string&, const contract::Dictionary&) override {}
     void alert(const std::string&, const std::string&) override {}
     void failure(const std::string&, const std::string&) override {}
     void warning(const std::string&) override {}
@@ -63,7 +61,7 @@ private:
     MainLoop loop_;
     TerminalWindow window_;
     LogView logView_;
-    Interface interface_;
+    TerminalInterface interface_;
     TerminalAlerts alerts_;
     ModuleBundle bundle_;
     TerminalHost host_;

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/CommandLine.h"
-#include "orvane/terminal/DiskNames.h"
+#include "orvane/terminal/Reporter.h"
 
 #include <gtest/gtest.h>
 
 namespace orvane {
 namespace {
 
-std::variant<Request, Ending> readWords(std::vector<const char*> words)
+pellar::Result<Request, Ending> readWords(std::vector<const char*> words)
 {
     words.insert(words.begin(), "fixwell");
     return readCommandLine(static_cast<int>(words.size()), words.data());
@@ -17,8 +17,8 @@ TEST(CommandLine, WordsBecomeARequest)
 {
     const auto read = readWords({"--color", "never", "repair", "a", "--details", "LABEL=x y",
                                  "--yes", "--log-level=2", "--no-progress", "--trace"});
-    ASSERT_TRUE(std::holds_alternative<Request>(read));
-    const Request& request = std::get<Request>(read);
+    ASSERT_TRUE(read);
+    const Request& request = *read;
     EXPECT_EQ(request.command, Command::Repair);
     EXPECT_EQ(request.disks, (std::vector<std::string>{"a", "LABEL=x y"}));
     EXPECT_EQ(request.coloring, Coloring::Never);
@@ -50,10 +50,10 @@ TEST(CommandLine, EachCommandIsItself)
           Case{{"attach", "--read-only", "a"}, Command::Attach, 1},
           Case{{"detach", "a"}, Command::Detach, 1}}) {
         const auto read = readWords(c.words);
-        ASSERT_TRUE(std::holds_alternative<Request>(read)) << c.words.front();
-        EXPECT_EQ(std::get<Request>(read).command, c.command) << c.words.front();
-        EXPECT_EQ(std::get<Request>(read).disks.size(), c.disks) << c.words.front();
-        EXPECT_FALSE(std::get<Request>(read).confirms) << "only on demand";
+        ASSERT_TRUE(read) << c.words.front();
+        EXPECT_EQ(read->command, c.command) << c.words.front();
+        EXPECT_EQ(read->disks.size(), c.disks) << c.words.front();
+        EXPECT_FALSE(read->confirms) << "only on demand";
     }
 }
 
@@ -72,18 +72,18 @@ TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsage)
           Case{{"verify", "--log-level=loud", "a"}, "no number"},
           Case{{"verify", "--log-level=-1", "a"}, "out of range"}}) {
         const auto read = readWords(c.words);
-        ASSERT_TRUE(std::holds_alternative<Ending>(read)) << c.because;
-        EXPECT_EQ(std::get<Ending>(read).status, 16) << c.because;
-        EXPECT_FALSE(std::get<Ending>(read).text.empty()) << c.because;
+        ASSERT_FALSE(read) << c.because;
+        EXPECT_EQ(read.error().status, 16) << c.because;
+        EXPECT_FALSE(read.error().text.empty()) << c.because;
     }
     const auto help = readWords({"verify", "--help"});
-    ASSERT_TRUE(std::holds_alternative<Ending>(help));
-    EXPECT_EQ(std::get<Ending>(help).status, 0);
+    ASSERT_FALSE(help);
+    EXPECT_EQ(help.error().status, 0);
 }
 
-TEST(DiskNames, APartGoesByTheNameOfItsImage)
+TEST(GivenNames, APartGoesByTheNameOfItsImage)
 {
-    DiskNames names;
+    GivenNames names;
     names.add("/tmp/a.img", "a.img");
     names.add("/tmp/a.img#odd", "odd");
     names.add("/dev/sdb", "LABEL=x");
@@ -104,7 +104,7 @@ TEST(DiskNames, APartGoesByTheNameOfItsImage)
         EXPECT_EQ(names.nameOf(c.identifier), c.name) << c.because;
 }
 
-TEST(DiskNames, OnlyANumberLiesInside)
+TEST(GivenNames, OnlyANumberLiesInside)
 {
     struct Case {
         std::string_view identifier;
@@ -115,7 +115,7 @@ TEST(DiskNames, OnlyANumberLiesInside)
          {Case{"/a", "/a", true}, Case{"/a#0", "/a", true}, Case{"/a#17", "/a", true},
           Case{"/a#", "/a", false}, Case{"/a#1x", "/a", false}, Case{"/a#1#2", "/a", false},
           Case{"/ab", "/a", false}, Case{"/a", "/a#1", false}})
-        EXPECT_EQ(DiskNames::isWithin(c.identifier, c.named), c.isWithin)
+        EXPECT_EQ(GivenNames::isWithin(c.identifier, c.named), c.isWithin)
             << c.identifier << " in " << c.named;
 }
 

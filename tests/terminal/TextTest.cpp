@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/UTF8.h"
-#include "orvane/terminal/ByteCount.h"
-#include "orvane/terminal/ExitStatus.h"
-#include "orvane/terminal/ProgressLine.h"
+#include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/TerminalText.h"
 #include "tests/terminal/ProgramTest.h"
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/terminal/Interface.h"
+#include "orvane/terminal/TerminalToolkit.h"
 
 namespace orvane {
 namespace {
@@ -17,7 +17,7 @@ constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
 
 }  // namespace
 
-bool Interface::loadInterface(std::string_view /*name*/, contract::InterfaceOwner& owner)
+bool TerminalInterface::loadInterface(std::string_view /*name*/, contract::InterfaceOwner& owner)
 {
     owner_ = &owner;
     for (const contract::Outlet& outlet : owner.outlets())
@@ -26,7 +26,7 @@ bool Interface::loadInterface(std::string_view /*name*/, contract::InterfaceOwne
     return true;
 }
 
-void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
+void TerminalInterface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
 {
     if (auto* const button = std::get_if<contract::Button**>(&outlet.place)) {
         TerminalButton& made = buttons_[std::string(outlet.name)];
@@ -46,19 +46,19 @@ void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner
     }
 }
 
-void Interface::disconnect(contract::InterfaceOwner& owner)
+void TerminalInterface::disconnect(contract::InterfaceOwner& owner)
 {
     if (owner_ == &owner)
         owner_ = nullptr;
 }
 
-TerminalButton* Interface::button(std::string_view outlet)
+TerminalButton& TerminalInterface::button(std::string_view outlet)
 {
     const auto found = buttons_.find(outlet);
-    return found == buttons_.end() ? nullptr : &found->second;
+    return found == buttons_.end() ? missingButton_ : found->second;
 }
 
-bool Interface::press(TerminalButton& button)
+bool TerminalInterface::press(TerminalButton& button)
 {
     return button.isEnabled() && owner_ != nullptr && owner_->perform(button.action(), &button);
 }
