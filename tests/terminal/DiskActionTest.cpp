@@ -66,19 +66,16 @@ TEST_F(DiskActionTest, AnImageIsAttachedMountedAndDetached)
 TEST_F(DiskActionTest, WhatCannotBeDoneIsSaidWithItsReason)
 {
     const auto image = makeVolume("volume.img");
-    write(path("short"), std::string(511, '\0'));
     struct Case {
         std::vector<std::string> words;
         std::string_view said;
     };
     for (const Case& c : {
              Case{{"mount", image}, "which has to be attached as a device first"},
+             Case{{"unmount", image}, "which has to be attached as a device first"},
              Case{{"eject", image}, "which has to be attached as a device first"},
              Case{{"detach", image}, "it is not an attached image"},
-             Case{{"attach", "/dev/null"}, "it is no regular file"},
              Case{{"attach", "/"}, "“/” as a device: it is no regular file"},
-             Case{{"attach", path("short")}, "too small to hold a disk"},
-             Case{{"attach", path("missing")}, "No such file or directory"},
          }) {
         const RunResult result = run(c.words);
         EXPECT_EQ(result.status, 8) << c.said;

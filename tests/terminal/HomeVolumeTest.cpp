@@ -37,15 +37,12 @@ protected:
                    : "the system mounts no such volume here";
     }
 
-    nlohmann::json action(const char* name) const
-    {
-        const Events events(run({"list", "--json", device_->name()}).output);
-        return events.named("disk").at(0)["actions"][name];
-    }
+    /// Why the list says that this cannot be done; "none" where it can.
     std::string reasonAgainst(const char* name) const
     {
-        const nlohmann::json told = action(name);
-        return told["available"] ? "none" : told["reason"].get<std::string>();
+        const Events events(run({"list", "--json", device_->name()}).output);
+        const nlohmann::json action = events.named("disk").at(0)["actions"][name];
+        return action["available"] ? "none" : action["reason"].get<std::string>();
     }
 
     std::unique_ptr<LoopDevice> device_;
