@@ -7,6 +7,7 @@
 // event; "stop" on standard input stops the job, and the end of standard input ends it.
 
 #include "orvane/jobs/LibraryTexts.h"
+#include "orvane/privileges/CheckedText.h"
 #include "orvane/privileges/HelperJob.h"
 #include "orvane/support/ProgramStart.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -17,7 +18,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <charconv>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
@@ -40,11 +40,7 @@ bool isBlockDevice(const std::filesystem::path& path)
 std::optional<uid_t> userWhoAsked()
 {
     const char* const variable = std::getenv("PKEXEC_UID");
-    const std::string_view text = variable != nullptr ? variable : "";
-    uid_t user = 0;
-    const auto [rest, error] = std::from_chars(text.data(), text.data() + text.size(), user);
-    const bool isNumber = error == std::errc() && rest == text.data() + text.size();
-    return isNumber ? std::optional(user) : std::nullopt;
+    return numberIn<uid_t>(variable != nullptr ? variable : "");
 }
 
 // A limit that the user has set would end the work in the middle of a write.

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/HelperProtocol.h"
 
+#include "orvane/privileges/CheckedText.h"
 #include "orvane/support/settings/ValueJSON.h"
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <limits>
 #include <optional>
 #include <span>
@@ -56,33 +56,12 @@ const Task* taskOf(const HelperRequest& request)
     });
 }
 
-bool consistsOf(std::string_view text, std::string_view allowed, std::size_t longest)
-{
-    const auto isAllowed = [allowed](char character) {
-        const bool isLetter = (character >= 'a' && character <= 'z') ||
-                              (character >= 'A' && character <= 'Z') ||
-                              (character >= '0' && character <= '9');
-        return isLetter || allowed.find(character) != std::string_view::npos;
-    };
-    return text.size() <= longest && std::all_of(text.begin(), text.end(), isAllowed);
-}
-
 // Canonical, so that no link of another user's is followed as root.
 bool isCanonicalDevice(const std::string& path)
 {
     return path.starts_with("/dev/") && path.find("//") == std::string::npos &&
            path.find("/./") == std::string::npos && path.find("/../") == std::string::npos &&
            !path.ends_with('/') && !path.ends_with("/..") && !path.ends_with("/.");
-}
-
-/// Digits and nothing else, at most `largest`.
-std::optional<std::uint64_t> numberIn(const std::string& text, std::uint64_t largest)
-{
-    std::uint64_t number = 0;
-    const char* const end = text.data() + text.size();
-    const auto [rest, error] = std::from_chars(text.data(), end, number);
-    const bool isNumber = error == std::errc() && rest == end;
-    return isNumber && number <= largest ? std::optional(number) : std::nullopt;
 }
 
 /// IDENTIFIER NAME FILESYSTEM LANGUAGES
@@ -110,13 +89,13 @@ Read readRegion(Arguments arguments)
     const Task* const task = taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
     if (task == nullptr || task->subject != Subject::Filesystem)
         return "unknown operation";
-    const auto image = numberIn(arguments[1], std::numeric_limits<int>::max());
-    const auto offset = numberIn(arguments[2], largest);
-    const auto length = numberIn(arguments[3], largest);
-    if (!image || !offset || !length || *length == 0 || *length > largest - *offset)
+    const auto image = numberIn<int>(arguments[1]);
+    const auto offset = numberIn<std::uint64_t>(arguments[2]);
+    const auto length = numberIn<std::uint64_t>(arguments[3]);
+    if (!image || *image < 0 || !offset || *offset > largest || !length || *length == 0 ||
+        *length > largest - *offset)
         return "no region of a file";
-    HelperRequest request{task->subject, task->operation, {}, {}, static_cast<int>(*image), {},
-                          false};
+    HelperRequest request{.subject = task->subject, .operation = task->operation, .image = *image};
     request.disk.storage = contract::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
@@ -208,9 +187,11 @@ std::string_view attemptOf(const HelperRequest& request)
 
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
-    HelperRequest request{
-        job.subject,        job.operation, job.disk, {}, -1, acceptedLanguages(languages),
-        job.fetchesArchives};
+    HelperRequest request{.subject = job.subject,
+                          .operation = job.operation,
+                          .disk = job.disk,
+                          .languages = acceptedLanguages(languages),
+                          .fetchesArchives = job.fetchesArchives};
     if (!job.image) {
         request.identity = identityOf(job.disk.path);
         return request;
@@ -257,7 +238,8 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
     const auto identity = DiskIdentity::fromText(arguments[2]);
     if (!identity)
         return "it is not said which disk is meant";
-    HelperRequest request{task->subject, task->operation, {}, *identity, -1, {}, false};
+    HelperRequest request{
+        .subject = task->subject, .operation = task->operation, .identity = *identity};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
     Arguments texts = Arguments(arguments).subspan(3);

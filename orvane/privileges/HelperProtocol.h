@@ -24,10 +24,10 @@ struct HelperRequest {
     pellar::Subject subject = pellar::Subject::Filesystem;
     pellar::Operation operation = pellar::Operation::Verify;
     /// A block device; or, without a path, a region of an image file.
-    contract::DiskReference disk;
-    DiskIdentity identity;  ///< of the block device
-    int image = -1;         ///< the image's descriptor in the program that asks; -1 for a device
-    std::string languages;  ///< for the texts; empty for English
+    contract::DiskReference disk = {};
+    DiskIdentity identity = {};  ///< of the block device
+    int image = -1;  ///< the image's descriptor in the program that asks; -1 for a device
+    std::string languages = {};  ///< for the texts; empty for English
     /// Archives of packages may be fetched over the network; for permissions alone.
     bool fetchesArchives = false;
 
