@@ -4,7 +4,7 @@
 namespace orvane::test {
 namespace {
 
-class ListTest : public ProgramTest {};
+using ListTest = ProgramTest;
 
 TEST_F(ListTest, TellsWhatIsKnownOfAnImage)
 {

@@ -4,7 +4,7 @@
 namespace orvane::test {
 namespace {
 
-class QueueTest : public ProgramTest {};
+using QueueTest = ProgramTest;
 
 // Who reads along must be able to show each event with its disk.
 TEST_F(QueueTest, EveryImageIsTreatedInItsTurnWhateverBecomesOfTheOthers)
