@@ -76,7 +76,7 @@ private:
 };
 
 /// Reads from standard input what is wanted: each "stop" presses, and so does the end of the input,
-/// when nobody is there any more. The loop outlives it.
+/// when the program that asked has gone. The loop outlives it.
 class StopInput {
 public:
     StopInput(MainLoop& loop, std::function<void()> pressed)
@@ -190,7 +190,7 @@ private:
         pellar::Manager manager(loop_, texts_, options);
         manager.setDelegate(&printer_);
         const auto tool = manager.makeRepairDisk();
-        // A refusal to begin has no events of its own; its number tells whoever asked.
+        // A refusal to begin has no events of its own; its number goes to the program that asked.
         if (const ErrorCode error = begin(*tool)) {
             printer_.plAsyncStartedForDisk(nullptr);
             printer_.plAsyncFinishedForDisk(nullptr, error, 0, {});

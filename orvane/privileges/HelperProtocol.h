@@ -43,8 +43,8 @@ struct HelperRequest {
 /// administrator is shown.
 [[nodiscard]] std::vector<std::string> argumentsOf(const HelperRequest& request);
 
-/// What the arguments ask for, or why they are refused. They come from a program that may be
-/// anybody's: nothing is taken but a block device below /dev by its own name, or the number of a
+/// What the arguments ask for, or why they are refused. They come from a program of any
+/// user's: nothing is taken but a block device below /dev by its own name, or the number of a
 /// descriptor and a region, and names that cannot do harm. `isBlockDevice` answers for a path that
 /// leads through no link.
 [[nodiscard]] pellar::Result<HelperRequest, const char*> readHelperArguments(

@@ -12,7 +12,7 @@
 namespace orvane {
 namespace {
 
-// Whoever mounts a file system of their own in user space may name any device as its source.
+// A user who mounts a file system of their own in user space may name any device as its source.
 // Only btrfs, which may be on several, has another device number than its source has.
 bool isReallyOn(const pellar::MountPlace& place, dev_t device)
 {

@@ -229,7 +229,7 @@ void PrivilegedScript::take(std::string_view lines)
     }
 }
 
-// Nothing is told after the end, whatever comes. A result on an image waits for the end, when the
+// What comes after the end is dropped. A result on an image waits for the end, when the
 // image is looked at.
 void PrivilegedScript::take(pellar::Event event)
 {

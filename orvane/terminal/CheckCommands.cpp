@@ -122,8 +122,8 @@ std::string objectionToMap(const NamedDisk& named, const std::shared_ptr<Disk>& 
                                                   {named.name, why});
 }
 
-/// The maps of the disks; an image stays attached meanwhile. A disk that has none is reported and
-/// left out.
+/// Treats the disks' partition maps; images stay attached until the end. A disk without one is
+/// reported and left out.
 int treatMaps(const std::vector<NamedDisk>& wanted, const ActionButton& action, Session& session,
               Reporter& reporter)
 {

@@ -47,7 +47,7 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
         const AttachedImage image(session, named.disk);
         std::vector<std::shared_ptr<Disk>> selection =
             withParts(image.top() ? image.top() : named.disk);
-        // What was said of the image as a file is its history, too.
+        // The records of the image as a file belong to its history, too.
         if (image.top())
             selection.push_back(named.disk);
         std::for_each(selection.begin(), selection.end(), forgetFailure);
@@ -55,7 +55,7 @@ int runHistory(const Request& request, Session& session, Reporter& reporter)
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
             session.select(selection);
-            session.pressAndWait(session.button("clearHistoryButton"));
+            session.pressAndWait(session.button(contract::outlet::clearHistory));
         } else {
             reporter.runs(named.name, runsOf(selection, session));
             session.writeAllRowsOf(named.name);

@@ -46,7 +46,7 @@ std::string placeOf(const Disk& disk)
     return places.empty() ? std::string() : places.front().target;
 }
 
-/// What may want a password, with somebody there to ask for it.
+/// Runs what may need a password, with a password agent present.
 template <class Function>
 auto askingFor(const Function& function, Session& session)
 {

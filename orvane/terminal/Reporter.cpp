@@ -34,7 +34,7 @@ bool GivenNames::isWithin(std::string_view identifier, std::string_view named)
                             part.find_first_not_of("0123456789", 1) == std::string_view::npos);
 }
 
-// A reader that has gone away has seen what it wanted; any other loss is said once, at the end.
+// A reader that has gone away has seen what it wanted; any other loss is reported at the end.
 void Reporter::flush()
 {
     if (std::fflush(stdout) != 0 && errno != EPIPE)

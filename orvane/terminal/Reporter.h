@@ -57,7 +57,7 @@ class GivenNames {
 public:
     void add(const std::string& identifier, const std::string& name) { names_[identifier] = name; }
 
-    /// The identifier itself for a disk that nobody named.
+    /// The identifier itself for a disk that was not named.
     std::string nameOf(std::string_view identifier) const;
 
     /// Whether the disk is the named one, or lies inside it.
@@ -87,14 +87,14 @@ public:
                           contract::ErrorCode error, std::string_view message) = 0;
     /// What the module reports of a finished queue.
     virtual void report(const std::string& /*disk*/, const contract::Dictionary& /*report*/) {}
-    /// Somebody else asks for a password on the terminal: nothing is drawn meanwhile. `Left`: it
-    /// was left with Ctrl-C, in the middle of its line.
+    /// A password agent asks on the terminal, and nothing is drawn until it is over. `Left`: the
+    /// prompt was left with Ctrl-C, in the middle of its line.
     enum class Prompt { Open, Left, Over };
     virtual void prompt(Prompt /*state*/) {}
     virtual void alert(const std::string& title, const std::string& message) = 0;
     /// Something that went wrong outside of a job: one sentence.
     virtual void failure(const std::string& disk, const std::string& sentence) = 0;
-    /// Something that the program goes on without, or tells about its own doing.
+    /// What the program goes on without, or a line of its trace.
     virtual void warning(const std::string& sentence) = 0;
     virtual void listed(const DiskLine& disk) = 0;
     /// Something that is no job was done: one sentence. `place` is the device or the mount point
@@ -103,8 +103,8 @@ public:
                       const std::string& sentence) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
-    /// The last thing that is said. NO, with a word on standard error, when some of what was said
-    /// could not be written.
+    /// The last call. NO, with a sentence on standard error, when some of the output could not be
+    /// written.
     virtual bool end();
 
 protected:

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/toolkit/ControlNames.h"
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/jobs/ObservedManager.h"
 #include "orvane/jobs/RunKeeper.h"
@@ -11,6 +12,7 @@
 #include "orvane/terminal/TerminalHost.h"
 #include "pellar/Manager.h"
 
+#include <array>
 #include <map>
 #include <memory>
 #include <optional>
@@ -28,14 +30,14 @@ struct NamedDisk {
 /// A command and the module's button that it presses.
 struct ActionButton {
     Command command;
-    const char* outlet;
+    std::string_view outlet;
 };
 
 inline constexpr std::array<ActionButton, 4> actionButtons{{
-    {Command::Verify, "verifyDiskButton"},
-    {Command::Repair, "repairDiskButton"},
-    {Command::VerifyPermissions, "verifyPermissionsButton"},
-    {Command::RepairPermissions, "repairPermissionsButton"},
+    {Command::Verify, contract::outlet::verifyDisk},
+    {Command::Repair, contract::outlet::repairDisk},
+    {Command::VerifyPermissions, contract::outlet::verifyPermissions},
+    {Command::RepairPermissions, contract::outlet::repairPermissions},
 }};
 
 /// One run of the program: the host, the library and the module, what the commands do with them,
@@ -61,8 +63,8 @@ public:
     /// name stands for here, if not for itself.
     std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, int& status,
                                      std::string (*meant)(const std::string& name) = nullptr);
-    /// Somebody else may ask for a password from now on: nothing is drawn, and there is an agent
-    /// that can, until `asked`.
+    /// A password may be asked for from now on: there is an agent, and nothing is drawn until
+    /// `asked`.
     void expectPassword();
     void asked() { reporter_.prompt(Reporter::Prompt::Over); }
 

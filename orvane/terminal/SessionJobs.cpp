@@ -94,10 +94,12 @@ void Session::interrupt()
 bool Session::pressStop()
 {
     return !currentDisk_.empty() &&
-           std::any_of(actionButtons.begin(), actionButtons.end(), [this](const auto& action) {
-               TerminalButton& candidate = button(action.outlet);
-               return candidate.action() == "stopAction:" && interface_.press(candidate);
-           });
+           std::any_of(contract::outlet::actions.begin(), contract::outlet::actions.end(),
+                       [this](std::string_view outlet) {
+                           TerminalButton& candidate = button(outlet);
+                           return candidate.action() == contract::selector::stop &&
+                                  interface_.press(candidate);
+                       });
 }
 
 TerminalWindow::Events Session::windowEvents()
@@ -108,9 +110,8 @@ TerminalWindow::Events Session::windowEvents()
             },
             [this](const contract::Dictionary& report) {
                 reportEnd();
-                reporter_.report(
-                    names_.nameOf(report.string(contract::Name("kOVOP_DiskIdentifierKey"))),
-                    report);
+                reporter_.report(names_.nameOf(report.string(contract::kOVOP_DiskIdentifierKey)),
+                                 report);
             }};
 }
 

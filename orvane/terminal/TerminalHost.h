@@ -43,7 +43,7 @@ private:
     bool wasDeclined_ = false;
 };
 
-/// Preferences as stored, but for what the command line says for this once.
+/// The stored preferences, except for what the command line sets for this run.
 class RequestedPreferences final : public contract::OVPreferences {
 public:
     RequestedPreferences(contract::OVPreferences& stored, std::optional<bool> showsDetails)

@@ -61,7 +61,7 @@ std::string bar(double percent)
            fmt::format(" {:3.0f} %", std::clamp(percent, 0.0, 100.0));
 }
 
-/// A mark that wanders once over the bar in as many seconds as it has cells.
+/// A mark that moves by one cell of the bar each second.
 std::string wanderingMark(std::chrono::seconds elapsed)
 {
     const int at = static_cast<int>(elapsed.count() % barCells);

@@ -1,19 +1,18 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/TerminalToolkit.h"
 
+#include "contract/toolkit/ControlNames.h"
+
 namespace orvane {
 namespace {
 
-/// What the interface file says of a button; the module sets the others itself.
+/// The actions that the interface file gives to buttons; the module sets the others itself.
 contract::Selector actionInFile(std::string_view outlet)
 {
-    if (outlet == "showDetailsButton")
-        return "showDetailsAction:";
-    return outlet == "clearHistoryButton" ? "clearHistoryAction:" : "";
+    if (outlet == contract::outlet::showDetails)
+        return contract::selector::showDetails;
+    return outlet == contract::outlet::clearHistory ? contract::selector::clearHistory : "";
 }
-
-// The one custom view that a log's interface file names.
-constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
 
 }  // namespace
 
@@ -37,7 +36,7 @@ void TerminalInterface::connect(const contract::Outlet& outlet, contract::Interf
     } else if (auto* const view = std::get_if<contract::TextView**>(&outlet.place)) {
         **view = &textView_;
     } else {
-        outlineView_ = owner.makeOutlineView(logViewClass, logView_);
+        outlineView_ = owner.makeOutlineView(contract::messageOutlineViewClass, logView_);
         if (!outlineView_)
             return;
         outlineView_->setDataSource(owner.outlineViewDelegate());

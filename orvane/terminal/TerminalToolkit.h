@@ -15,7 +15,7 @@
 
 namespace orvane {
 
-/// A button that nobody sees: a command presses it, and reads from it why it cannot.
+/// A button without a screen: a command presses it, or reads the reason why it cannot.
 class TerminalButton final : public contract::Button {
 public:
     void setNeedsDisplay(bool /*needsDisplay*/) override {}
@@ -125,7 +125,7 @@ private:
     std::string status_;
 };
 
-/// A module's interface on a terminal: for each outlet a control that nobody sees, and the log's
+/// A module's interface on a terminal: for each outlet a control without a screen, and the log's
 /// rows on standard output. The controls are pressed by commands.
 class TerminalInterface final : public contract::InterfaceLoader {
 public:

@@ -19,7 +19,7 @@ namespace {
 
 constexpr std::chrono::milliseconds redrawInterval{100};
 
-/// A heading that is neither good nor bad and says what it is about: a job's first line.
+/// A heading without a result, but with a text of its own: a job's first line.
 bool isStartOfRun(const contract::Dictionary& record)
 {
     return record.integer(contract::kFsckVerbosity) < 0 &&
