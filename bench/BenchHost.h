@@ -39,7 +39,7 @@ public:
     explicit BenchHost(const std::filesystem::path& state);
     ~BenchHost() override;
 
-    contract::OVFXW& module() { return *module_; }
+    fixwell::OVFXW& module() { return *module_; }
     contract::OutlineViewDelegate& rows() { return *module_; }
     const contract::DiskReferencePointer& reference() const { return reference_; }
     Disk& disk() { return *disk_; }
@@ -67,7 +67,7 @@ private:
     TerminalHost host_;
     std::shared_ptr<Disk> disk_;
     contract::DiskReferencePointer reference_;
-    std::unique_ptr<contract::OVFXW> module_;
+    std::unique_ptr<fixwell::OVFXW> module_;
 };
 
 }  // namespace orvane::bench
