@@ -59,7 +59,7 @@ BenchHost::BenchHost(const std::filesystem::path& state)
               "FXW"),
       host_(optionsIn(state), loop_, interface_, alerts_, reporter_, false),
       disk_(Disk::make(sampleDisk(), {optionsIn(state).capabilities, &host_.histories()})),
-      module_(std::make_unique<contract::OVFXW>(host_, *this))
+      module_(std::make_unique<fixwell::OVFXW>(host_, *this))
 {
     host_.sharedDiskController().adopt(disk_);
     reference_ = disk_->theKRDisk();

@@ -3,7 +3,6 @@
 
 #include "fixwell/module/OVFXW.h"
 #include "orvane/terminal/TerminalHost.h"
-#include "orvane/terminal/TerminalWindow.h"
 
 #include <filesystem>
 #include <memory>
@@ -22,7 +21,6 @@ class SilentReporter final : public Reporter {
                   std::string_view) override
     {
     }
-    void report(const std::string&, const contract::Dictionary&) override {}
     void alert(const std::string&, const std::string&) override {}
     void failure(const std::string&, const std::string&) override {}
     void warning(const std::string&) override {}
@@ -41,7 +39,7 @@ public:
     explicit BenchHost(const std::filesystem::path& state);
     ~BenchHost() override;
 
-    contract::OVFXW& module() { return *module_; }
+    fixwell::OVFXW& module() { return *module_; }
     contract::OutlineViewDelegate& rows() { return *module_; }
     const contract::DiskReferencePointer& reference() const { return reference_; }
     Disk& disk() { return *disk_; }
@@ -63,13 +61,13 @@ private:
     MainLoop loop_;
     TerminalWindow window_;
     LogView logView_;
-    Interface interface_;
+    TerminalInterface interface_;
     TerminalAlerts alerts_;
     ModuleBundle bundle_;
     TerminalHost host_;
     std::shared_ptr<Disk> disk_;
     contract::DiskReferencePointer reference_;
-    std::unique_ptr<contract::OVFXW> module_;
+    std::unique_ptr<fixwell::OVFXW> module_;
 };
 
 }  // namespace orvane::bench

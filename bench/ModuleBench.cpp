@@ -85,7 +85,7 @@ void compareWithGrep()
         secondsOf({"grep", "-c", "-i", "-F", "-f", phrases.string(), outputFile.string()});
     });
     BenchHost host(scratch / "state");
-    contract::LineClassifier classifier(host.host().hostBundle());
+    fixwell::LineClassifier classifier(host.host().hostBundle());
     long found = 0;
     const double classify = bestSeconds(5, [&] {
         for (const std::string_view line : lines)

@@ -48,6 +48,9 @@ public:
     /// "\r" is Return; empty for none.
     virtual void setKeyEquivalent(std::string_view key) = 0;
     virtual void setTag(std::int64_t tag) = 0;
+    /// Why it cannot be pressed, in the user's language, to be shown behind the tooltip; empty when
+    /// it can, or when the module has no words for it.
+    virtual void setReason(std::string_view reason) = 0;
 };
 
 class TextField : public Control {

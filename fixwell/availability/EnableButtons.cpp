@@ -136,18 +136,15 @@ void OVFXW::applyDecision(const ButtonDecision& decision)
     enable(messageOutlineView, decision.showDetails);
 
     const bool isMultiple = selectionOfDisks_ && selectionOfDisks_->size() > 1;
-    const auto toolTip = [&](const ActionButtonTexts& texts, FXWReason reason) {
-        if (reason != FXWReasonNone)
-            return format("%@\n\n%@", {localized(texts.toolTip), reasonString(reason, isMultiple)});
-        return localized(action == texts.runningCode ? localizable("This operation can be stopped")
-                                                     : texts.toolTip);
-    };
     for (std::size_t i = 0; i < buttons.size(); ++i) {
         if (buttons[i] == nullptr)
             continue;
         const ActionButtonTexts& texts = actionButtonTexts[i];
         const bool stops = action == texts.runningCode || action == texts.partitionMapCode;
-        buttons[i]->setToolTip(toolTip(texts, availability[i].reason));
+        buttons[i]->setToolTip(localized(action == texts.runningCode
+                                             ? localizable("This operation can be stopped")
+                                             : texts.toolTip));
+        buttons[i]->setReason(reasonString(availability[i].reason, isMultiple));
         buttons[i]->setAction(stops ? selector::stop : texts.action);
         buttons[i]->setTitle(localized(stops ? texts.stopTitle : texts.title));
     }

@@ -15,14 +15,6 @@ namespace outlet = contract::outlet;
 
 namespace {
 
-// The module puts its reason behind what the button does.
-std::string reasonOfModule(const QtButton& button)
-{
-    const std::string& toolTip = button.toolTip();
-    const std::size_t at = toolTip.find("\n\n");
-    return at == std::string::npos ? std::string() : toolTip.substr(at + 2);
-}
-
 bool isForPermissions(std::string_view button)
 {
     return button == outlet::verifyPermissions || button == outlet::repairPermissions;
@@ -61,16 +53,16 @@ void ModuleHints::tellReasons()
     for (const std::string_view name : outlet::actions)
         if (QtButton* const button = at_.tabs.button(name)) {
             if (isLocked)
-                button->setReason(text("Not available while a job runs."));
+                button->setHostReason(text("Not available while a job runs."));
             else if (disks.empty())
-                button->setReason(text("Select a disk first."));
+                button->setHostReason(text("Select a disk first."));
             else if (disks.size() == 1)
-                button->setReason(reasonFor(*disks.front(), name));
+                button->setHostReason(reasonFor(*disks.front(), name));
             else if (const auto found = reasons.find(name); found != reasons.end())
-                button->setReason(found->second);
+                button->setHostReason(found->second);
         }
     if (QtButton* const clear = at_.tabs.button(outlet::clearHistory))
-        clear->setReason(
+        clear->setHostReason(
             text(isLocked ? "Not available while a job runs." : "There is no history to clear."));
 }
 
@@ -78,7 +70,7 @@ void ModuleHints::tellReasons()
 std::string ModuleHints::reasonFor(const Disk& disk, std::string_view button)
 {
     QtButton* const control = at_.tabs.button(button);
-    if (control == nullptr || !reasonOfModule(*control).empty())
+    if (control == nullptr || !control->reason().empty())
         return {};
     std::string reason = whyUnavailable(disk, library_, at_.host.translator());
     if (reason.empty() && disk.facts().type == diskType::whole && isForPermissions(button))
@@ -108,7 +100,7 @@ ModuleHints::ReasonsByButton ModuleHints::reasonsByDisk()
         for (const std::string_view name : grey) {
             if (!isGrey(name))
                 continue;
-            const std::string own = reasonOfModule(*at_.tabs.button(name));
+            const std::string& own = at_.tabs.button(name)->reason();
             const std::string why = own.empty() ? reasonFor(*disk, name) : own;
             reasons[name] += (reasons[name].empty() ? "" : "\n") +
                              at_.host.translator().sentence("“%@”: %@", {disk->displayName(), why});

@@ -1,14 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/AskingProgram.h"
 
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/support/files/WholeFile.h"
 
+#include <fcntl.h>
+#include <pwd.h>
 #include <sys/stat.h>
 #include <sys/syscall.h>
 #include <unistd.h>
 
 #include <array>
 #include <cstdio>
+#include <cstring>
+#include <optional>
 #include <string>
 
 namespace orvane {
@@ -41,6 +46,30 @@ bool hasOnlyUsersRights(pid_t id, uid_t user)
     return status && areAllUsers(*status, user);
 }
 
+using pellar::Access;
+
+/// How the file is open; none when it can be neither read nor written through the descriptor.
+std::optional<Access> accessOf(int file)
+{
+    const int flags = ::fcntl(file, F_GETFL);
+    if (flags < 0 || (flags & O_PATH) != 0)
+        return std::nullopt;
+    switch (flags & O_ACCMODE) {
+        case O_RDONLY: return Access::ReadOnly;
+        case O_RDWR: return Access::ReadWrite;
+        default: return std::nullopt;
+    }
+}
+
+bool isInside(const contract::DiskReference& region, int file)
+{
+    struct stat status = {};
+    if (::fstat(file, &status) != 0 || !S_ISREG(status.st_mode))
+        return false;
+    const auto size = static_cast<std::uint64_t>(status.st_size);
+    return region.offset <= size && region.length <= size - region.offset;
+}
+
 }  // namespace
 
 // The parent's number cannot have passed to another program while it is still the parent's.
@@ -65,6 +94,36 @@ FileDescriptor AskingProgram::take(int descriptor) const
     FileDescriptor file(
         static_cast<int>(::syscall(SYS_pidfd_getfd, process_.get(), descriptor, 0)));
     return isStillUsers() ? std::move(file) : FileDescriptor();
+}
+
+pellar::Result<pellar::LoopDevice, JobFailure> attachRegion(const FileDescriptor& image,
+                                                            const HelperRequest& request)
+{
+    const Access wanted =
+        request.operation == pellar::Operation::Repair ? Access::ReadWrite : Access::ReadOnly;
+    const auto given = accessOf(image.get());
+    if (!given || !isInside(request.disk, image.get()))
+        return JobFailure{contract::kPLErrorCannotOpen,
+                          {"it is not a part of an image that you have opened", {}, {}}};
+    if (wanted == Access::ReadWrite && given == Access::ReadOnly)
+        return JobFailure{contract::kPLErrorReadOnly, {"you may not write to the image", {}, {}}};
+    auto device =
+        pellar::LoopDevice::attach(image.get(), request.disk.offset, request.disk.length, wanted);
+    if (const int* const error = std::get_if<int>(&device))
+        return JobFailure{
+            contract::kPLErrorCannotOpen,
+            {"it could not be attached as a device: %1$@", ::strerrordesc_np(*error), {}}};
+    return std::get<pellar::LoopDevice>(std::move(device));
+}
+
+std::filesystem::path homeDirectoryOf(uid_t user)
+{
+    passwd entry = {};
+    passwd* found = nullptr;
+    std::array<char, 16384> buffer;
+    if (::getpwuid_r(user, &entry, buffer.data(), buffer.size(), &found) != 0 || found == nullptr)
+        return {};
+    return found->pw_dir;
 }
 
 }  // namespace orvane

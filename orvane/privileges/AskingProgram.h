@@ -1,10 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/privileges/HelperProtocol.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
+#include "pellar/volumes/LoopDevice.h"
 
 #include <sys/types.h>
 
+#include <filesystem>
 #include <optional>
 
 namespace orvane {
@@ -35,5 +39,14 @@ private:
     uid_t user_;
     FileDescriptor process_;
 };
+
+/// The region of an image that the request names, as a device. `image` is the file as the asking
+/// program has it open; invalid where it has none. That program's way of opening it is the limit:
+/// what it may only read is attached to be read.
+[[nodiscard]] pellar::Result<pellar::LoopDevice, JobFailure> attachRegion(
+    const FileDescriptor& image, const HelperRequest& request);
+
+/// Of this user, as the system's list of users tells it (getpwuid(3)); empty when it does not.
+[[nodiscard]] std::filesystem::path homeDirectoryOf(uid_t user);
 
 }  // namespace orvane

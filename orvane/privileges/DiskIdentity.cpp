@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/DiskIdentity.h"
 
+#include "orvane/privileges/CheckedText.h"
 #include "orvane/support/disks/BlockProbe.h"
 #include "orvane/support/disks/UdevDatabase.h"
 #include "orvane/support/files/WholeFile.h"
@@ -20,11 +21,7 @@ constexpr std::size_t longestUUID = 64;
 
 bool isUUID(std::string_view text)
 {
-    return text.size() <= longestUUID && std::all_of(text.begin(), text.end(), [](char character) {
-               return (character >= '0' && character <= '9') ||
-                      (character >= 'a' && character <= 'z') ||
-                      (character >= 'A' && character <= 'Z') || character == '-';
-           });
+    return consistsOf(text, "-", longestUUID);
 }
 
 std::string numberOf(dev_t device)
@@ -61,14 +58,6 @@ std::string_view takePart(std::string_view& text)
     return part;
 }
 
-template <class Number>
-bool readNumber(std::string_view text, Number& number)
-{
-    const char* const end = text.data() + text.size();
-    const auto [rest, error] = std::from_chars(text.data(), end, number);
-    return error == std::errc() && rest == end;
-}
-
 }  // namespace
 
 std::string DiskIdentity::text() const
@@ -81,15 +70,12 @@ std::optional<DiskIdentity> DiskIdentity::fromText(std::string_view text)
     constexpr int separators = 3;
     if (std::count(text.begin(), text.end(), ':') != separators)
         return std::nullopt;
-    unsigned majorNumber = 0;
-    unsigned minorNumber = 0;
-    DiskIdentity identity;
-    if (!readNumber(takePart(text), majorNumber) || !readNumber(takePart(text), minorNumber) ||
-        !readNumber(takePart(text), identity.sequence) || !isUUID(text))
+    const auto majorNumber = numberIn<unsigned>(takePart(text));
+    const auto minorNumber = numberIn<unsigned>(takePart(text));
+    const auto sequence = numberIn<std::uint64_t>(takePart(text));
+    if (!majorNumber || !minorNumber || !sequence || !isUUID(text))
         return std::nullopt;
-    identity.device = makedev(majorNumber, minorNumber);
-    identity.uuid = text;
-    return identity;
+    return DiskIdentity{makedev(*majorNumber, *minorNumber), *sequence, std::string(text)};
 }
 
 bool DiskIdentity::isStill(const DiskIdentity& now) const

@@ -1,20 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/HelperJob.h"
 
-#include "contract/pellar/MessageKeys.h"
+#include "contract/pellar/PLRepairDisk.h"
 #include "orvane/privileges/AskingProgram.h"
-#include "orvane/privileges/AttachedRegion.h"
-#include "orvane/privileges/HelperConversation.h"
-#include "orvane/privileges/HomeDirectory.h"
 #include "orvane/privileges/MountedSystem.h"
-#include "orvane/privileges/UndoneJob.h"
+#include "orvane/support/loop/MainLoop.h"
 #include "pellar/Manager.h"
+#include "pellar/jobs/Event.h"
+#include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
+#include <poll.h>
+#include <unistd.h>
 
 #include <cerrno>
 #include <cstring>
+#include <functional>
 #include <memory>
+#include <optional>
+#include <string>
 #include <utility>
 
 namespace orvane {
@@ -29,16 +33,78 @@ using pellar::Subject;
 constexpr const char* savedSectors = "/var/lib/orvane/partition-maps";
 constexpr const char* permissionReferences = "/var/lib/orvane/permissions";
 
-std::variant<AttachedRegion, Undone> attachedRegion(const HelperRequest& request,
-                                                    std::optional<uid_t> user)
+bool write(const std::string& line)
 {
-    const auto program = user ? AskingProgram::of(*user) : std::nullopt;
-    if (!program)
-        return Undone{contract::kPLErrorCannotOpen,
-                      contract::kPLVerdictFailed,
-                      {"the program that asked for it has gone, or is not yours", {}, {}}};
-    return AttachedRegion::attach(program->take(request.image), request);
+    const std::string text = line + "\n";
+    for (std::size_t done = 0; done < text.size();) {
+        const ssize_t count = ::write(STDOUT_FILENO, text.data() + done, text.size() - done);
+        if (count <= 0 && errno != EINTR)
+            return false;
+        done += count > 0 ? static_cast<std::size_t>(count) : 0;
+    }
+    return true;
 }
+
+/// Prints what happens in the job: a line for each event on standard output, while it is read.
+class EventPrinter final : public contract::PLAsyncDelegate {
+public:
+    void plAsyncStartedForDisk(const contract::DiskReferencePointer&) override
+    {
+        print(pellar::Started{});
+    }
+    void plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
+                               const contract::Dictionary& dictionary) override
+    {
+        print(pellar::Message{std::string(string), dictionary});
+    }
+    void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer&, ErrorCode mainError,
+                                ErrorCode detailError, const contract::Dictionary& result) override
+    {
+        isOver_ = true;
+        print(pellar::Finished{mainError, detailError, result});
+    }
+
+    void trace(std::string_view line) { print(pellar::Trace{std::string(line)}); }
+    bool isOver() const { return isOver_; }
+
+private:
+    void print(const pellar::Event& event) { isRead_ = isRead_ && write(lineFromEvent(event)); }
+
+    bool isOver_ = false;
+    bool isRead_ = true;
+};
+
+/// Reads from standard input what is wanted: each "stop" presses, and so does the end of the input,
+/// when the program that asked has gone. The loop outlives it.
+class StopInput {
+public:
+    StopInput(MainLoop& loop, std::function<void()> pressed)
+        : loop_(loop), pressed_(std::move(pressed))
+    {
+        loop_.watch(STDIN_FILENO, POLLIN, [this](short) { read(); });
+    }
+    StopInput(const StopInput&) = delete;
+    StopInput& operator=(const StopInput&) = delete;
+    ~StopInput() { loop_.unwatch(STDIN_FILENO); }
+
+private:
+    void read()
+    {
+        char buffer[64];
+        const ssize_t count = ::read(STDIN_FILENO, buffer, sizeof buffer);
+        if (count <= 0)
+            loop_.unwatch(STDIN_FILENO);
+        if (count == 0)
+            pressed_();
+        for (ssize_t i = 0; i < count; ++i)
+            if (buffer[i] == '\n')
+                pressed_();
+    }
+
+    MainLoop& loop_;
+    const std::function<void()> pressed_;
+};
 
 /// One job, with what it stands on.
 class HelperJob {
@@ -50,58 +116,61 @@ public:
 
     void run()
     {
-        const auto undone = prepare();
-        if (!undone)
-            work();
+        if (const auto failure = prepare())
+            refuse(*failure);
         else
-            refuse(*undone);
+            work();
     }
 
 private:
-    std::optional<Undone> prepare()
+    std::optional<JobFailure> prepare()
     {
         disk_ = request_.disk;
         if (request_.isOnImage())
             return attach();
-        if (auto undone = holdDevice())
-            return undone;
+        if (auto failure = holdDevice())
+            return failure;
         return request_.subject == Subject::Permissions ? findSystem() : std::nullopt;
     }
 
     // While it is open its number goes to no other disk, so that what the job opens by the name is
     // this one.
-    std::optional<Undone> holdDevice()
+    std::optional<JobFailure> holdDevice()
     {
         device_ = FileDescriptor(
             ::open(disk_.path.c_str(), O_RDONLY | O_NONBLOCK | O_NOCTTY | O_NOFOLLOW | O_CLOEXEC));
         if (!device_)
-            return Undone{contract::kPLErrorCannotOpen,
-                          contract::kPLVerdictFailed,
-                          {"it cannot be opened: %1$@", ::strerrordesc_np(errno), {}}};
+            return JobFailure{contract::kPLErrorCannotOpen,
+                              {"it cannot be opened: %1$@", ::strerrordesc_np(errno), {}}};
         if (!request_.identity.isStill(identityOf(device_)))
-            return Undone{
+            return JobFailure{
                 contract::kPLErrorDiskChanged,
-                contract::kPLVerdictFailed,
                 {"the disk changed: another one has its name now; nothing was done", {}, {}}};
         return std::nullopt;
     }
 
-    std::optional<Undone> findSystem()
+    std::optional<JobFailure> findSystem()
     {
         const auto place = mountedSystemOn(disk_.path);
-        if (const auto* const reason = std::get_if<pellar::Sentence>(&place))
-            return Undone{contract::kPLErrorUnsupported, contract::kPLVerdictFailed, *reason};
-        disk_.mountPoint = std::get<std::string>(place);
+        if (!place)
+            return JobFailure{contract::kPLErrorUnsupported, place.error()};
+        disk_.mountPoint = *place;
         return std::nullopt;
     }
 
-    std::optional<Undone> attach()
+    std::optional<JobFailure> attach()
     {
-        auto region = attachedRegion(request_, user_);
-        if (auto* const undone = std::get_if<Undone>(&region))
-            return std::move(*undone);
-        region_.emplace(std::get<AttachedRegion>(std::move(region)));
-        disk_ = region_->disk(request_);
+        const auto program = user_ ? AskingProgram::of(*user_) : std::nullopt;
+        if (!program)
+            return JobFailure{contract::kPLErrorCannotOpen,
+                              {"the program that asked for it has gone, or is not yours", {}, {}}};
+        auto region = attachRegion(program->take(request_.image), request_);
+        if (!region)
+            return std::move(region).error();
+        region_.emplace(*std::move(region));
+        disk_.storage = DiskReference::Storage::BlockDevice;
+        disk_.path = region_->node();
+        disk_.offset = 0;
         return std::nullopt;
     }
 
@@ -116,19 +185,19 @@ private:
             return request_.fetchesArchives;
         };
         options.commandTrace = [this](std::string_view line) {
-            teller_.trace(line);
+            printer_.trace(line);
         };
         pellar::Manager manager(loop_, texts_, options);
-        manager.setDelegate(&teller_);
+        manager.setDelegate(&printer_);
         const auto tool = manager.makeRepairDisk();
-        // A refusal to begin has no events of its own; its number tells whoever asked.
+        // A refusal to begin has no events of its own; its number goes to the program that asked.
         if (const ErrorCode error = begin(*tool)) {
-            teller_.plAsyncStartedForDisk(nullptr);
-            teller_.plAsyncFinishedForDisk(nullptr, error, 0, {});
+            printer_.plAsyncStartedForDisk(nullptr);
+            printer_.plAsyncFinishedForDisk(nullptr, error, 0, {});
             return;
         }
-        const StopLine stop(loop_, [&tool] { tool->cancelCurrentOperation(); });
-        loop_.runUntil([this] { return teller_.isOver(); });
+        const StopInput stop(loop_, [&tool] { tool->cancelCurrentOperation(); });
+        loop_.runUntil([this] { return printer_.isOver(); });
     }
 
     ErrorCode begin(contract::PLRepairDisk& tool) const
@@ -148,24 +217,24 @@ private:
                         : tool.beginStoragesystemFilesystemVerifyForDisk(disk);
     }
 
-    void refuse(const Undone& undone)
+    void refuse(const JobFailure& failure)
     {
-        pellar::EventRoad road(loop_, {&teller_, nullptr, {}, [] {
+        pellar::EventRoad road(loop_, {&printer_, nullptr, {}, [] {
                                        }});
         pellar::JobLog log(request_.disk, texts_, road);
         log.started();
-        tellUndone(undone, request_, texts_, log);
-        loop_.runUntil([this] { return teller_.isOver(); });
+        reportFailure(failure, request_, texts_, log);
+        loop_.runUntil([this] { return printer_.isOver(); });
     }
 
     const HelperRequest& request_;
     const std::optional<uid_t> user_;
     const pellar::Texts& texts_;
     MainLoop loop_;
-    Teller teller_;
+    EventPrinter printer_;
     DiskReference disk_;
     FileDescriptor device_;
-    std::optional<AttachedRegion> region_;  ///< given back last
+    std::optional<pellar::LoopDevice> region_;  ///< given back last
 };
 
 }  // namespace

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/privileges/HelperRequest.h"
+#include "orvane/privileges/HelperProtocol.h"
 #include "pellar/texts/Texts.h"
 
 #include <sys/types.h>

@@ -7,6 +7,7 @@
 // event; "stop" on standard input stops the job, and the end of standard input ends it.
 
 #include "orvane/jobs/LibraryTexts.h"
+#include "orvane/privileges/CheckedText.h"
 #include "orvane/privileges/HelperJob.h"
 #include "orvane/support/ProgramStart.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -17,7 +18,6 @@
 #include <unistd.h>
 
 #include <algorithm>
-#include <charconv>
 #include <csignal>
 #include <cstdio>
 #include <cstdlib>
@@ -40,11 +40,7 @@ bool isBlockDevice(const std::filesystem::path& path)
 std::optional<uid_t> userWhoAsked()
 {
     const char* const variable = std::getenv("PKEXEC_UID");
-    const std::string_view text = variable != nullptr ? variable : "";
-    uid_t user = 0;
-    const auto [rest, error] = std::from_chars(text.data(), text.data() + text.size(), user);
-    const bool isNumber = error == std::errc() && rest == text.data() + text.size();
-    return isNumber ? std::optional(user) : std::nullopt;
+    return numberIn<uid_t>(variable != nullptr ? variable : "");
 }
 
 // A limit that the user has set would end the work in the middle of a write.
@@ -88,14 +84,13 @@ int run(const std::vector<std::string>& arguments)
 {
     const auto user = userWhoAsked();
     settle();
-    const auto read = readHelperArguments(arguments, isBlockDevice);
-    if (const auto* const refusal = std::get_if<std::string>(&read)) {
-        std::fprintf(stderr, "pellar-helper: %s\n", refusal->c_str());
+    const auto request = readHelperArguments(arguments, isBlockDevice);
+    if (!request) {
+        std::fprintf(stderr, "pellar-helper: %s\n", request.error());
         return exitWrongUsage;
     }
-    const auto& request = std::get<HelperRequest>(read);
     adoptUserLocale();
-    setLanguage(request.languages);
+    setLanguage(request->languages);
 
     // As if it lay beside the programs, where texts and modules are looked for.
     const auto program =
@@ -109,7 +104,7 @@ int run(const std::vector<std::string>& arguments)
     if (const auto bundles = findModuleBundles(moduleDirectories(noEnvironment, program));
         !bundles.empty())
         texts.setResultTexts(moduleTexts.emplace(bundles.front() / "locale"));
-    runHelperJob(request, user, texts);
+    runHelperJob(*request, user, texts);
     return 0;
 }
 

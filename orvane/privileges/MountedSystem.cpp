@@ -12,7 +12,7 @@
 namespace orvane {
 namespace {
 
-// Whoever mounts a file system of their own in user space may name any device as its source.
+// A user who mounts a file system of their own in user space may name any device as its source.
 // Only btrfs, which may be on several, has another device number than its source has.
 bool isReallyOn(const pellar::MountPlace& place, dev_t device)
 {
@@ -40,7 +40,7 @@ bool isWayOfRootsAlone(const std::filesystem::path& directory)
     }
 }
 
-std::variant<std::string, pellar::Sentence> mountedSystemOn(const std::filesystem::path& device)
+pellar::Result<std::string, pellar::Sentence> mountedSystemOn(const std::filesystem::path& device)
 {
     struct stat status = {};
     if (::stat(device.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))

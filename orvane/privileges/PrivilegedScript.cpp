@@ -3,18 +3,157 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "orvane/privileges/EventWire.h"
-#include "orvane/privileges/HelperProcess.h"
 #include "pellar/process/Command.h"
+#include "pellar/process/FileDescriptor.h"
 
+#include <fcntl.h>
 #include <poll.h>
+#include <spawn.h>
+#include <sys/socket.h>
+#include <sys/types.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <array>
 #include <cerrno>
+#include <csignal>
+#include <optional>
+#include <string>
+#include <string_view>
 #include <utility>
+#include <vector>
 
 namespace orvane {
+namespace {
+
+/// With the standard signal handling, whatever ours is.
+class SpawnAttributes {
+public:
+    SpawnAttributes()
+    {
+        ::posix_spawnattr_init(&attributes_);
+        sigset_t signals;
+        ::sigfillset(&signals);
+        ::posix_spawnattr_setsigdefault(&attributes_, &signals);
+        ::sigemptyset(&signals);
+        ::posix_spawnattr_setsigmask(&attributes_, &signals);
+        ::posix_spawnattr_setflags(&attributes_, POSIX_SPAWN_SETSIGDEF | POSIX_SPAWN_SETSIGMASK);
+    }
+    SpawnAttributes(const SpawnAttributes&) = delete;
+    SpawnAttributes& operator=(const SpawnAttributes&) = delete;
+    ~SpawnAttributes() { ::posix_spawnattr_destroy(&attributes_); }
+    const posix_spawnattr_t* get() const { return &attributes_; }
+
+private:
+    posix_spawnattr_t attributes_{};
+};
+
+pid_t spawn(const std::vector<std::string>& command, int input, int output)
+{
+    std::vector<char*> arguments;
+    for (const std::string& argument : command)
+        arguments.push_back(const_cast<char*>(argument.c_str()));
+    arguments.push_back(nullptr);
+    posix_spawn_file_actions_t actions;
+    ::posix_spawn_file_actions_init(&actions);
+    ::posix_spawn_file_actions_adddup2(&actions, input, STDIN_FILENO);
+    ::posix_spawn_file_actions_adddup2(&actions, output, STDOUT_FILENO);
+    // What it says of itself is said by us, in the user's words. Passwords are asked for on the
+    // terminal itself.
+    ::posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, "/dev/null", O_WRONLY, 0);
+    const SpawnAttributes attributes;
+    pid_t id = -1;
+    if (::posix_spawn(&id, arguments[0], &actions, attributes.get(), arguments.data(), environ) !=
+        0)
+        id = -1;
+    ::posix_spawn_file_actions_destroy(&actions);
+    return id;
+}
+
+}  // namespace
+
+/// A program that runs with more rights than ours, so it cannot be signalled: it is told to end
+/// through its standard input, and ends in order when that closes. It stays in our process group,
+/// where it can ask for a password on the terminal.
+class HelperProcess {
+public:
+    /// None when it cannot be started.
+    [[nodiscard]] static std::optional<HelperProcess> start(
+        const std::vector<std::string>& command);
+    HelperProcess(HelperProcess&& other) noexcept;
+    HelperProcess& operator=(HelperProcess&&) = delete;
+    /// Closes its input and waits for its end.
+    ~HelperProcess();
+
+    int output() const { return output_.get(); }
+    /// Nothing happens when it has gone.
+    void tell(std::string_view line);
+    void closeInput() { input_.reset(); }
+    /// Waits; the exit status, or none when it was killed. Once.
+    std::optional<int> reap();
+
+private:
+    HelperProcess(pid_t id, FileDescriptor input, FileDescriptor output)
+        : id_(id), input_(std::move(input)), output_(std::move(output))
+    {
+    }
+
+    pid_t id_;
+    FileDescriptor input_;
+    FileDescriptor output_;
+};
+
+std::optional<HelperProcess> HelperProcess::start(const std::vector<std::string>& command)
+{
+    // A socket for its input: writing to one that has gone is an error, and no signal.
+    int input[2];
+    int output[2];
+    if (::socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, input) != 0)
+        return std::nullopt;
+    FileDescriptor ourInput(input[0]);
+    const FileDescriptor theirInput(input[1]);
+    if (::pipe2(output, O_CLOEXEC) != 0)
+        return std::nullopt;
+    FileDescriptor ourOutput(output[0]);
+    const FileDescriptor theirOutput(output[1]);
+    const pid_t id = spawn(command, theirInput.get(), theirOutput.get());
+    if (id < 0)
+        return std::nullopt;
+    return HelperProcess(id, std::move(ourInput), std::move(ourOutput));
+}
+
+HelperProcess::HelperProcess(HelperProcess&& other) noexcept
+    : id_(std::exchange(other.id_, -1)),
+      input_(std::move(other.input_)),
+      output_(std::move(other.output_))
+{
+}
+
+HelperProcess::~HelperProcess()
+{
+    closeInput();
+    static_cast<void>(reap());
+}
+
+void HelperProcess::tell(std::string_view line)
+{
+    const std::string text = std::string(line) + "\n";
+    if (input_)
+        ::send(input_.get(), text.data(), text.size(), MSG_NOSIGNAL | MSG_DONTWAIT);
+}
+
+std::optional<int> HelperProcess::reap()
+{
+    if (id_ < 0)
+        return std::nullopt;
+    int status = 0;
+    pid_t waited;
+    do
+        waited = ::waitpid(id_, &status, 0);
+    while (waited < 0 && errno == EINTR);
+    id_ = -1;
+    return waited > 0 && WIFEXITED(status) ? std::optional(WEXITSTATUS(status)) : std::nullopt;
+}
 
 PrivilegedScript::PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob job,
                                    const pellar::Texts& texts, pellar::StopSwitch& stop,
@@ -90,7 +229,7 @@ void PrivilegedScript::take(std::string_view lines)
     }
 }
 
-// Nothing is told after the end, whatever comes. A result on an image waits for the end, when the
+// What comes after the end is dropped. A result on an image waits for the end, when the
 // image is looked at.
 void PrivilegedScript::take(pellar::Event event)
 {
@@ -113,11 +252,11 @@ void PrivilegedScript::takeEnd(pellar::Finished end)
     hasFinished_ = true;
     const bool isAnswer = job_.image && end.mainError != contract::kPLErrorCancelled;
     if (isAnswer && !job_.image->isStillWhole())
-        return finish(contract::kPLErrorDiskChanged, contract::kPLVerdictFailed,
-                      "the disk became shorter or unreadable meanwhile");
+        return fail(contract::kPLErrorDiskChanged,
+                    "the disk became shorter or unreadable meanwhile");
     if (isAnswer && !job_.image->isStillInPlace())
-        return finish(contract::kPLErrorDiskChanged, contract::kPLVerdictFailed,
-                      "the disk was deleted, moved or replaced meanwhile");
+        return fail(contract::kPLErrorDiskChanged,
+                    "the disk was deleted, moved or replaced meanwhile");
     for (pellar::Event& event : held_)
         road_.add(std::move(event));
     road_.add(std::move(end));
@@ -158,25 +297,25 @@ void PrivilegedScript::explain(std::optional<int> status)
     constexpr int dismissed = 126;
     constexpr int notAuthorized = 127;
     if (status == dismissed || (!hasStarted_ && stop_.isPressed()))
-        finish(contract::kPLErrorCancelled, contract::kPLVerdictStopped,
-               "the authorisation was not given; nothing was done");
+        fail(contract::kPLErrorCancelled, "the authorisation was not given; nothing was done",
+             contract::kPLVerdictStopped);
     else if (status == notAuthorized && !hasStarted_)
-        finish(contract::kPLErrorNotAuthorized, contract::kPLVerdictFailed,
-               job_.image ? "its tool needs it attached as a device of its own, for which you are "
-                            "not authorised; nothing was done"
-                          : "you are not authorised to work on this disk; nothing was done");
+        fail(contract::kPLErrorNotAuthorized,
+             job_.image ? "its tool needs it attached as a device of its own, for which you are "
+                          "not authorised; nothing was done"
+                        : "you are not authorised to work on this disk; nothing was done");
     else if (!hasStarted_)
-        finish(contract::kPLErrorNotAuthorized, contract::kPLVerdictFailed,
-               "it needs an administrator's rights, and they could not be asked for");
+        fail(contract::kPLErrorNotAuthorized,
+             "it needs an administrator's rights, and they could not be asked for");
     else
-        finish(contract::kPLErrorToolFailed, contract::kPLVerdictFailed,
-               "the program that works on it as administrator ended unexpectedly");
+        fail(contract::kPLErrorToolFailed,
+             "the program that works on it as administrator ended unexpectedly");
 }
 
-void PrivilegedScript::finish(contract::ErrorCode error, contract::Name verdict,
-                              std::string_view reason)
+void PrivilegedScript::fail(contract::ErrorCode error, std::string_view reason,
+                            contract::Name verdict)
 {
-    tellUndone({error, verdict, {reason, {}, {}}}, request_, texts_, log_);
+    reportFailure({error, {reason, {}, {}}, verdict}, request_, texts_, log_);
 }
 
 }  // namespace orvane

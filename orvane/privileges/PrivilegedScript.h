@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/privileges/HelperRequest.h"
-#include "orvane/privileges/UndoneJob.h"
+#include "orvane/privileges/HelperProtocol.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/LineGuard.h"
 #include "pellar/jobs/Script.h"
@@ -49,7 +48,8 @@ private:
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);
     void asked();
-    void finish(contract::ErrorCode error, contract::Name verdict, std::string_view reason);
+    void fail(contract::ErrorCode error, std::string_view reason,
+              contract::Name verdict = contract::kPLVerdictFailed);
 
     const HelperLaunch launch_;
     const pellar::PrivilegedJob job_;  ///< its image stays open for the helper

@@ -2,10 +2,11 @@
 #include "orvane/terminal/CommandLine.h"
 
 #include "contract/foundation/UTF8.h"
-#include "orvane/terminal/ExitStatus.h"
+#include "contract/pellar/MessageKeys.h"
 
 #include <CLI/CLI.hpp>
 
+#include <algorithm>
 #include <array>
 
 namespace orvane {
@@ -91,7 +92,7 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
 
 }  // namespace
 
-std::variant<Request, Ending> readCommandLine(int argc, const char* const* argv)
+pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* argv)
 {
     Request request;
     CLI::App app("Fixwell: checks disks, tells what was found and what it means, and repairs.",
@@ -109,9 +110,30 @@ std::variant<Request, Ending> readCommandLine(int argc, const char* const* argv)
         app.exit(asked, text, text);
         return Ending{exitSound, text.str()};
     } catch (const CLI::ParseError& error) {
-        return Ending{exitUsage,
-                      "fixwell: " + contract::printable(error.what()) + "\nTry “fixwell --help”.\n"};
+        return Ending{exitUsage, "fixwell: " + contract::printable(error.what()) +
+                                     "\nTry “fixwell --help”.\n"};
     }
+}
+
+std::string_view nameOf(Command command)
+{
+    return std::find_if(commandTexts.begin(), commandTexts.end(),
+                        [command](const CommandText& text) { return text.command == command; })
+        ->name;
+}
+
+int exitStatusFor(std::string_view verdict)
+{
+    using namespace contract;
+    if (verdict == kPLVerdictSound.text())
+        return exitSound;
+    if (verdict == kPLVerdictRepaired.text())
+        return exitRepaired;
+    if (verdict == kPLVerdictDamaged.text())
+        return exitDamaged;
+    if (verdict == kPLVerdictStopped.text())
+        return exitStopped;
+    return exitUnchecked;
 }
 
 }  // namespace orvane

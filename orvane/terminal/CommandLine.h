@@ -1,12 +1,25 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
+
 #include <optional>
 #include <string>
-#include <variant>
+#include <string_view>
 #include <vector>
 
 namespace orvane {
+
+// The bits of the exit status, or-ed over all disks, after fsck(8).
+inline constexpr int exitSound = 0;
+inline constexpr int exitRepaired = 1;   ///< damage was found and repaired
+inline constexpr int exitDamaged = 4;    ///< damage is left
+inline constexpr int exitUnchecked = 8;  ///< could not be checked, or not conclusively
+inline constexpr int exitUsage = 16;
+inline constexpr int exitStopped = 32;
+
+/// For a verdict of the disk-management library; an unknown one counts as unchecked.
+int exitStatusFor(std::string_view verdict);
 
 enum class Command {
     Verify,
@@ -47,6 +60,9 @@ struct Ending {
     std::string text;  ///< for standard output when the status is 0, else for standard error
 };
 
-std::variant<Request, Ending> readCommandLine(int argc, const char* const* argv);
+[[nodiscard]] pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* argv);
+
+/// As the user writes it.
+std::string_view nameOf(Command command);
 
 }  // namespace orvane

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/terminal/JSONReporter.h"
+#include "orvane/terminal/Reporter.h"
 
-#include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
 
 #include <nlohmann/json.hpp>
@@ -33,138 +32,141 @@ ordered_json textOrNull(std::string_view text)
     return text.empty() ? ordered_json(nullptr) : ordered_json(std::string(text));
 }
 
+/// Speaks to other programs: one JSON object (RFC 8259) per line of standard output, each with an
+/// "event". Bytes that are no UTF-8 become U+FFFD.
+class JSONReporter final : public Reporter {
+public:
+    void started(const std::string& disk, std::string_view action,
+                 const std::string& title) override
+    {
+        write({{"event", "started"}, {"disk", disk}, {"action", action}, {"title", title}});
+        flush();
+        shownPercent_.reset();
+    }
+
+    void record(const std::string& disk, const contract::Dictionary& record,
+                const contract::StyledText& text) override
+    {
+        write({{"event", "record"},
+               {"disk", disk},
+               {"type", textOrNull(record.string(contract::kFsckMessageType))},
+               {"verbosity", record.integer(contract::kFsckVerbosity)},
+               {"text", std::string(text.characters())}});
+    }
+
+    void rowsWritten() override { flush(); }
+
+    void progress(const std::string& disk, std::optional<double> percent,
+                  const std::string& status) override
+    {
+        const bool hasMoved =
+            percent && (!shownPercent_ || std::abs(*percent - *shownPercent_) >= percentStep);
+        if (!hasMoved && status == shownStatus_)
+            return;
+        shownPercent_ = percent;
+        shownStatus_ = status;
+        write({{"event", "progress"},
+               {"disk", disk},
+               {"percent", percent ? ordered_json(std::round(*percent * 10) / 10) : ordered_json()},
+               {"status", status}});
+        flush();
+    }
+
+    void finished(const std::string& disk, std::string_view verdict, contract::ErrorCode error,
+                  std::string_view message) override
+    {
+        write({{"event", "finished"},
+               {"disk", disk},
+               {"verdict", verdict},
+               {"error", error},
+               {"message", std::string(message)}});
+        flush();
+    }
+
+    void report(const std::string& disk, const contract::Dictionary& report) override
+    {
+        ordered_json event{{"event", "report"}};
+        for (const auto& [key, value] : report.entries())
+            event[std::string(key.text())] =
+                value.kind() == contract::Kind::Object ? ordered_json(disk) : jsonOf(value);
+        write(event);
+    }
+
+    void alert(const std::string& title, const std::string& message) override
+    {
+        write({{"event", "alert"}, {"title", title}, {"message", message}});
+    }
+
+    // A disk that never came to a job is finished all the same, so that a reader waits for nothing.
+    void failure(const std::string& disk, const std::string& sentence) override
+    {
+        finished(disk, contract::kPLVerdictFailed.text(), contract::kPLErrorCannotOpen, sentence);
+    }
+
+    // Standard output is for events.
+    void warning(const std::string& sentence) override { writeError(sentence); }
+
+    void listed(const DiskLine& disk) override
+    {
+        ordered_json actions = ordered_json::object();
+        for (const ActionLine& action : disk.actions)
+            actions[action.command] = {{"available", action.isAvailable},
+                                       {"reason", textOrNull(action.reason)}};
+        write({{"event", "disk"},
+               {"disk", disk.disk},
+               {"name", disk.name},
+               {"kind", disk.kind},
+               {"bytes", disk.bytes},
+               {"filesystem", textOrNull(disk.filesystem)},
+               {"mountPoint", textOrNull(disk.mountPoint)},
+               {"lastChecked", textOrNull(disk.lastChecked)},
+               {"verdict", textOrNull(disk.verdict)},
+               {"laterAttempt", disk.later
+                                    ? ordered_json{{"started", disk.later->started},
+                                                   {"verdict", textOrNull(disk.later->verdict)}}
+                                    : ordered_json(nullptr)},
+               {"actions", actions}});
+    }
+
+    void done(const std::string& disk, std::string_view action, const std::string& place,
+              const std::string& sentence) override
+    {
+        write({{"event", "done"},
+               {"disk", disk},
+               {"action", action},
+               {"place", textOrNull(place)},
+               {"message", sentence}});
+        flush();
+    }
+
+    void runs(const std::string& disk, const std::vector<RunLine>& runs) override
+    {
+        for (const RunLine& run : runs)
+            write({{"event", "run"},
+                   {"disk", disk},
+                   {"started", run.started},
+                   {"action", run.action},
+                   {"verdict", textOrNull(run.verdict)},
+                   {"message", textOrNull(run.message)}});
+    }
+
+private:
+    static void write(const ordered_json& event)
+    {
+        const std::string line =
+            event.dump(-1, ' ', false, ordered_json::error_handler_t::replace) + "\n";
+        std::fwrite(line.data(), 1, line.size(), stdout);
+    }
+
+    std::optional<double> shownPercent_;
+    std::string shownStatus_;
+};
+
 }  // namespace
 
-void JSONReporter::write(const ordered_json& event)
+std::unique_ptr<Reporter> makeJSONReporter()
 {
-    const std::string line =
-        event.dump(-1, ' ', false, ordered_json::error_handler_t::replace) + "\n";
-    std::fwrite(line.data(), 1, line.size(), stdout);
-}
-
-void JSONReporter::started(const std::string& disk, std::string_view action,
-                           const std::string& title)
-{
-    write({{"event", "started"}, {"disk", disk}, {"action", action}, {"title", title}});
-    flush();
-    shownPercent_.reset();
-}
-
-void JSONReporter::record(const std::string& disk, const contract::Dictionary& record,
-                          const contract::StyledText& text)
-{
-    write({{"event", "record"},
-           {"disk", disk},
-           {"type", textOrNull(record.string(contract::kFsckMessageType))},
-           {"verbosity", record.integer(contract::kFsckVerbosity)},
-           {"text", std::string(text.characters())}});
-}
-
-void JSONReporter::rowsWritten()
-{
-    flush();
-}
-
-void JSONReporter::progress(const std::string& disk, std::optional<double> percent,
-                            const std::string& status)
-{
-    const bool hasMoved =
-        percent && (!shownPercent_ || std::abs(*percent - *shownPercent_) >= percentStep);
-    if (!hasMoved && status == shownStatus_)
-        return;
-    shownPercent_ = percent;
-    shownStatus_ = status;
-    write({{"event", "progress"},
-           {"disk", disk},
-           {"percent", percent ? ordered_json(std::round(*percent * 10) / 10) : ordered_json()},
-           {"status", status}});
-    flush();
-}
-
-void JSONReporter::finished(const std::string& disk, std::string_view verdict,
-                            contract::ErrorCode error, std::string_view message)
-{
-    write({{"event", "finished"},
-           {"disk", disk},
-           {"verdict", verdict},
-           {"error", error},
-           {"message", std::string(message)}});
-    flush();
-}
-
-void JSONReporter::report(const std::string& disk, const contract::Dictionary& report)
-{
-    ordered_json event{{"event", "report"}};
-    for (const auto& [key, value] : report.entries())
-        event[std::string(key.text())] =
-            value.kind() == contract::Kind::Object ? ordered_json(disk) : jsonOf(value);
-    write(event);
-}
-
-void JSONReporter::alert(const std::string& title, const std::string& message)
-{
-    write({{"event", "alert"}, {"title", title}, {"message", message}});
-}
-
-// A disk that never came to a job is finished all the same, so that a reader waits for nothing.
-void JSONReporter::failure(const std::string& disk, const std::string& sentence)
-{
-    write({{"event", "finished"},
-           {"disk", disk},
-           {"verdict", contract::kPLVerdictFailed.text()},
-           {"error", contract::kPLErrorCannotOpen},
-           {"message", sentence}});
-    flush();
-}
-
-// Standard output is for events.
-void JSONReporter::warning(const std::string& sentence)
-{
-    const std::string line = "fixwell: " + contract::printable(sentence) + "\n";
-    std::fwrite(line.data(), 1, line.size(), stderr);
-}
-
-void JSONReporter::listed(const DiskLine& disk)
-{
-    ordered_json actions = ordered_json::object();
-    for (const ActionLine& action : disk.actions)
-        actions[action.command] = {{"available", action.isAvailable},
-                                   {"reason", textOrNull(action.reason)}};
-    write({{"event", "disk"},
-           {"disk", disk.disk},
-           {"name", disk.name},
-           {"kind", disk.kind},
-           {"bytes", disk.bytes},
-           {"filesystem", textOrNull(disk.filesystem)},
-           {"mountPoint", textOrNull(disk.mountPoint)},
-           {"lastChecked", textOrNull(disk.lastChecked)},
-           {"verdict", textOrNull(disk.verdict)},
-           {"laterAttempt", disk.later ? ordered_json{{"started", disk.later->started},
-                                                      {"verdict", textOrNull(disk.later->verdict)}}
-                                       : ordered_json(nullptr)},
-           {"actions", actions}});
-}
-
-void JSONReporter::done(const std::string& disk, std::string_view action, const std::string& place,
-                        const std::string& sentence)
-{
-    write({{"event", "done"},
-           {"disk", disk},
-           {"action", action},
-           {"place", textOrNull(place)},
-           {"message", sentence}});
-    flush();
-}
-
-void JSONReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
-{
-    for (const RunLine& run : runs)
-        write({{"event", "run"},
-               {"disk", disk},
-               {"started", run.started},
-               {"action", run.action},
-               {"verdict", textOrNull(run.verdict)},
-               {"message", textOrNull(run.message)}});
+    return std::make_unique<JSONReporter>();
 }
 
 }  // namespace orvane

@@ -12,15 +12,18 @@ void LogView::countRows()
 void LogView::followFromLastRow()
 {
     countRows();
-    written_ = rows_ > 0 ? rows_ - 1 : 0;
-    isWriting_ = true;
-    writeNewRows();
+    writeFrom(rows_ > 0 ? rows_ - 1 : 0);
 }
 
 void LogView::writeAllRows()
 {
     countRows();
-    written_ = 0;
+    writeFrom(0);
+}
+
+void LogView::writeFrom(std::size_t row)
+{
+    written_ = row;
     isWriting_ = true;
     writeNewRows();
 }

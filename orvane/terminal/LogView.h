@@ -62,6 +62,7 @@ public:
 
 private:
     void countRows();
+    void writeFrom(std::size_t row);
     void writeNewRows();
 
     contract::RunLoop& loop_;

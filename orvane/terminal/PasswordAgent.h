@@ -14,7 +14,7 @@ namespace orvane {
 /// over ssh: the answer is then "No session for cookie" (polkit 122). UDisks2 cannot ask at all.
 class PasswordAgent {
 public:
-    /// Returns when it can ask; none where there is no terminal, or nobody who asks on one.
+    /// Returns when it can ask; none where there is no terminal or no pkttyagent.
     [[nodiscard]] static std::unique_ptr<PasswordAgent> start();
     PasswordAgent(const PasswordAgent&) = delete;
     PasswordAgent& operator=(const PasswordAgent&) = delete;

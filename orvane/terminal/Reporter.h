@@ -5,6 +5,9 @@
 #include "contract/foundation/StyledText.h"
 #include "contract/pellar/ErrorCodes.h"
 
+#include <functional>
+#include <map>
+#include <memory>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -48,6 +51,22 @@ struct RunLine {
     std::string message;
 };
 
+/// What the user called each disk. A volume inside an image is called by the image's name and
+/// its number: "backup.img#2".
+class GivenNames {
+public:
+    void add(const std::string& identifier, const std::string& name) { names_[identifier] = name; }
+
+    /// The identifier itself for a disk that was not named.
+    std::string nameOf(std::string_view identifier) const;
+
+    /// Whether the disk is the named one, or lies inside it.
+    static bool isWithin(std::string_view identifier, std::string_view named);
+
+private:
+    std::map<std::string, std::string, std::less<>> names_;
+};
+
 /// How the program speaks: to people, or to other programs. `disk` is always what the user
 /// named, or that and the volume's number.
 class Reporter {
@@ -66,15 +85,16 @@ public:
                           const std::string& status) = 0;
     virtual void finished(const std::string& disk, std::string_view verdict,
                           contract::ErrorCode error, std::string_view message) = 0;
-    virtual void report(const std::string& disk, const contract::Dictionary& report) = 0;
-    /// Somebody else asks for a password on the terminal: nothing is drawn meanwhile. `Left`: it
-    /// was left with Ctrl-C, in the middle of its line.
+    /// What the module reports of a finished queue.
+    virtual void report(const std::string& /*disk*/, const contract::Dictionary& /*report*/) {}
+    /// A password agent asks on the terminal, and nothing is drawn until it is over. `Left`: the
+    /// prompt was left with Ctrl-C, in the middle of its line.
     enum class Prompt { Open, Left, Over };
     virtual void prompt(Prompt /*state*/) {}
     virtual void alert(const std::string& title, const std::string& message) = 0;
     /// Something that went wrong outside of a job: one sentence.
     virtual void failure(const std::string& disk, const std::string& sentence) = 0;
-    /// Something that the program goes on without, or tells about its own doing.
+    /// What the program goes on without, or a line of its trace.
     virtual void warning(const std::string& sentence) = 0;
     virtual void listed(const DiskLine& disk) = 0;
     /// Something that is no job was done: one sentence. `place` is the device or the mount point
@@ -83,16 +103,32 @@ public:
                       const std::string& sentence) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
-    /// The last thing that is said. NO, with a word on standard error, when some of what was said
-    /// could not be written.
+    /// The last call. NO, with a sentence on standard error, when some of the output could not be
+    /// written.
     virtual bool end();
 
 protected:
     /// Hands what is buffered to the system, after every burst: a reader sees it at once.
     void flush();
+    /// "fixwell: SENTENCE" on standard error, made printable.
+    static void writeError(const std::string& sentence);
 
 private:
     bool hasLostOutput_ = false;
 };
+
+struct TextReporterOptions {
+    bool colors = false;
+    bool showsProgress = false;
+    /// A text of the host's own in the user's language.
+    std::function<std::string(std::string_view key)> translate;
+};
+
+/// Speaks to people: rows as they come, and on a terminal one live line at the bottom.
+[[nodiscard]] std::unique_ptr<Reporter> makeTextReporter(TextReporterOptions options);
+
+/// Speaks to other programs: one JSON object (RFC 8259) per line of standard output, each with an
+/// "event". Bytes that are no UTF-8 become U+FFFD.
+[[nodiscard]] std::unique_ptr<Reporter> makeJSONReporter();
 
 }  // namespace orvane

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
-#include "orvane/jobs/UnavailableReason.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -10,7 +9,6 @@
 
 #include <unistd.h>
 
-#include <array>
 #include <future>
 
 namespace orvane {
@@ -33,7 +31,7 @@ Session::Session(const Request& request, Reporter& reporter)
       logView_(
           loop_,
           [this](const contract::Dictionary& record, const contract::StyledText& text) {
-              reporter_.record(jobs_.currentDisk(), record, text);
+              reporter_.record(currentDisk_, record, text);
           },
           [this] { host_.histories().saveNew(); }, [this] { reporter_.rowsWritten(); }),
       interface_(logView_),
@@ -42,24 +40,13 @@ Session::Session(const Request& request, Reporter& reporter)
       libraryTexts_(hostTexts_),
       library_(loop_, libraryTexts_, libraryOptions(request)),
       host_(supportOptions(request), loop_, interface_, alerts_, reporter, request.showsDetails),
-      jobs_(reporter, window_, names_, jobHooks()),
       ledger_(host_, {[this](const StartedRun& run, const contract::DiskReferencePointer& disk) {
-                          jobs_.began(run, disk);
+                          jobBegan(run, disk);
                       },
-                      [this](const StartedRun& run, const RunEnd& end) { jobs_.ended(run, end); },
+                      [this](const StartedRun& run, const RunEnd& end) { jobEnded(run, end); },
                       {}})
 {
-    window_.setEvents({
-        [this] {
-            if (ledger_.currentRun() != nullptr)
-                reporter_.progress(jobs_.currentDisk(), window_.percent(), window_.status());
-        },
-        [this](const contract::Dictionary& report) {
-            jobs_.flush();
-            reporter_.report(names_.nameOf(report.string(contract::Name("kOVOP_DiskIdentifierKey"))),
-                             report);
-        },
-    });
+    window_.setEvents(windowEvents());
 }
 
 Session::~Session()
@@ -136,18 +123,6 @@ void Session::expectPassword()
         agent_ = PasswordAgent::start();
 }
 
-JobReporter::Hooks Session::jobHooks()
-{
-    JobReporter::Hooks hooks;
-    hooks.flushRows = [this] {
-        logView_.flush();
-    };
-    hooks.follow = [this](const contract::DiskReferencePointer& disk) {
-        follow(disk);
-    };
-    return hooks;
-}
-
 Result<void, Failure> Session::loadModule()
 {
     const auto bundles = findModuleBundles(
@@ -170,6 +145,23 @@ Result<void, Failure> Session::loadModule()
     return {};
 }
 
+std::vector<NamedDisk> Session::findDisks(const std::vector<std::string>& names, int& status,
+                                          std::string (*meant)(const std::string& name))
+{
+    std::vector<NamedDisk> disks;
+    for (const std::string& name : names) {
+        auto found = findDisk(meant != nullptr ? meant(name) : name);
+        if (!found) {
+            reporter_.failure(name, found.error().message);
+            status |= exitUnchecked;
+            continue;
+        }
+        disks.push_back({name, *std::move(found)});
+        names_.add(disks.back().disk->facts().identifier, name);
+    }
+    return disks;
+}
+
 Result<Session::DiskPointer, Failure> Session::findDisk(const std::string& name)
 {
     // Only what is no file needs the system's disks: a mount point, a label, a UUID.
@@ -178,110 +170,26 @@ Result<Session::DiskPointer, Failure> Session::findDisk(const std::string& name)
         host_.refreshDisks();
         knowsSystemDisks_ = true;
     }
-    auto found = DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
-    if (found)
-        names_.add((*found)->facts().identifier, name);
-    return found;
+    return DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
 }
 
-Session::DiskPointer Session::attach(const DiskPointer& image)
+AttachedImage::AttachedImage(Session& session, const std::shared_ptr<Disk>& image)
+    : session_(&session)
 {
-    if (!image->isOfflineDiskImage())
-        return nullptr;
+    auto& attachment = session.host().imageAttachment();
     contract::Dictionary result;
-    if (host_.imageAttachment().AttachImageWithURL(image->diskImagePath(), result) != 0)
-        return nullptr;
-    const auto top =
-        std::dynamic_pointer_cast<Disk>(host_.imageAttachment().TopLevelPLDiskForImageDict(result));
-    if (top)
-        host_.sharedDiskController().adopt(top);
-    return top;
-}
-
-void Session::detach(const DiskPointer& topLevelDisk)
-{
-    if (topLevelDisk)
-        host_.sharedDiskController().ejectDisk(topLevelDisk, true);
-}
-
-std::string Session::reasonOfHost(const Disk& disk)
-{
-    return whyUnavailable(disk, library_, host_.translator());
-}
-
-std::string Session::reasonAgainstPartitionMap(const DiskPointer& disk) const
-{
-    return library_.reasonAgainstPartitionMap(*disk->theKRDisk());
-}
-
-void Session::select(const std::vector<DiskPointer>& disks)
-{
-    logView_.holdBack();
-    window_.select({disks.begin(), disks.end()});
-    module_->windowChangedNotication({contract::OVDiskChangedNotification, nullptr, {}});
-}
-
-// The disk list of a window would keep its selection; here the log goes with the disk that is
-// being worked on, so that its rows come one after the other.
-void Session::follow(const contract::DiskReferencePointer& reference)
-{
-    if (const auto disk =
-            std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference)))
-        select({disk});
-    logView_.followFromLastRow();
-    if (isStopping_)
-        loop_.post([this] { pressStop(); });
-}
-
-TerminalButton& Session::button(std::string_view outlet)
-{
-    static TerminalButton missing;
-    TerminalButton* const found = interface_.button(outlet);
-    return found != nullptr ? *found : missing;
-}
-
-void Session::pressAndWait(TerminalButton& button)
-{
-    // Before, an interruption just ends the program: there is nothing yet to be ended in order.
-    const Interrupts interrupts(loop_, [this] { interrupt(); });
-    if (!interface_.press(button))
+    if (!image->isOfflineDiskImage() ||
+        attachment.AttachImageWithURL(image->diskImagePath(), result) != 0)
         return;
-    loop_.runUntil([this] { return !window_.interfaceLock() && !alerts_.isAsking(); });
-    jobs_.flush();
-    host_.histories().saveNew();
+    top_ = std::dynamic_pointer_cast<Disk>(attachment.TopLevelPLDiskForImageDict(result));
+    if (top_)
+        session.host().sharedDiskController().adopt(top_);
 }
 
-void Session::writeAllRowsOf(const std::string& name)
+AttachedImage::~AttachedImage()
 {
-    jobs_.setCurrentDisk(name);
-    logView_.writeAllRows();
-}
-
-// The first interruption is the Stop button. A job whose images are still being attached has none
-// that works; the attaching ends, and should the job begin all the same, it is stopped then. Every
-// further interruption presses the tool harder.
-void Session::interrupt()
-{
-    reporter_.prompt(Reporter::Prompt::Left);
-    const bool isFirst = !isStopping_;
-    isStopping_ = true;
-    if (!isFirst)
-        library_.cancelAgain();
-    else if (!pressStop())
-        host_.imageAttachment().stopAttachments();
-}
-
-bool Session::pressStop()
-{
-    constexpr std::array outlets{"verifyDiskButton", "repairDiskButton", "verifyPermissionsButton",
-                                 "repairPermissionsButton"};
-    for (const char* outlet : outlets) {
-        TerminalButton& candidate = button(outlet);
-        if (!jobs_.currentDisk().empty() && candidate.action() == "stopAction:" &&
-            interface_.press(candidate))
-            return true;
-    }
-    return false;
+    if (top_)
+        session_->host().sharedDiskController().ejectDisk(top_, true);
 }
 
 }  // namespace orvane

@@ -1,26 +1,48 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/toolkit/ControlNames.h"
+#include "orvane/jobs/JobLedger.h"
 #include "orvane/jobs/LibraryTexts.h"
 #include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "orvane/terminal/CommandLine.h"
-#include "orvane/terminal/DiskNames.h"
-#include "orvane/terminal/Interrupts.h"
-#include "orvane/terminal/JobReporter.h"
 #include "orvane/terminal/PasswordAgent.h"
 #include "orvane/terminal/TerminalHost.h"
-#include "orvane/terminal/TerminalWindow.h"
 #include "pellar/Manager.h"
 
+#include <array>
+#include <map>
 #include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
 namespace orvane {
 
-/// One run of the program: the host, the library and the module, and what the commands do with
-/// them. Main thread only; one at a time.
+/// A disk as the user named it.
+struct NamedDisk {
+    std::string name;
+    std::shared_ptr<Disk> disk;
+};
+
+/// A command and the module's button that it presses.
+struct ActionButton {
+    Command command;
+    std::string_view outlet;
+};
+
+inline constexpr std::array<ActionButton, 4> actionButtons{{
+    {Command::Verify, contract::outlet::verifyDisk},
+    {Command::Repair, contract::outlet::repairDisk},
+    {Command::VerifyPermissions, contract::outlet::verifyPermissions},
+    {Command::RepairPermissions, contract::outlet::repairPermissions},
+}};
+
+/// One run of the program: the host, the library and the module, what the commands do with them,
+/// and what comes of the jobs. Main thread only; one at a time.
+///
+/// It follows the jobs: tells the reporter, and remembers the verdicts for the exit status.
 class Session final : private contract::ModuleSite {
 public:
     using DiskPointer = std::shared_ptr<Disk>;
@@ -34,24 +56,19 @@ public:
     /// Loads the module; a sentence when that fails.
     [[nodiscard]] Result<void, Failure> loadModule();
 
-    /// The disk that the user means; its later rows and events go by that name.
-    [[nodiscard]] Result<DiskPointer, Failure> findDisk(const std::string& name);
-    /// Makes the volumes of an image file known, as a job would; none for any other disk. To be
-    /// given back with `detach`.
-    DiskPointer attach(const DiskPointer& image);
-    void detach(const DiskPointer& topLevelDisk);
-    /// Somebody else may ask for a password from now on: nothing is drawn, and there is an agent
-    /// that can, until `asked`.
+    /// The disks that the user means; their later rows and events go by these names. One that
+    /// cannot be found is reported, and adds exitUnchecked to `status`. `meant` is asked what a
+    /// name stands for here, if not for itself.
+    std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, int& status,
+                                     std::string (*meant)(const std::string& name) = nullptr);
+    /// A password may be asked for from now on: there is an agent, and nothing is drawn until
+    /// `asked`.
     void expectPassword();
     void asked() { reporter_.prompt(Reporter::Prompt::Over); }
-    /// Why the library cannot treat the disk's partition map; empty when it can.
-    std::string reasonAgainstPartitionMap(const DiskPointer& disk) const;
-    /// Why the host has nothing to offer for the disk; empty when that is not its to say.
-    std::string reasonOfHost(const Disk& disk);
 
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);
-    TerminalButton& button(std::string_view outlet);
+    TerminalButton& button(std::string_view outlet) { return interface_.button(outlet); }
     /// Presses the button, and returns when the job is over or was declined.
     void pressAndWait(TerminalButton& button);
     /// Writes the selected disks' whole log, under the name that the user gave.
@@ -59,9 +76,12 @@ public:
 
     bool wasDeclined() const { return alerts_.wasDeclined(); }
     bool wasStopped() const { return isStopping_; }
+    /// How the jobs ended, by disk identifier.
+    const std::map<std::string, RunEnd>& outcomes() const { return outcomes_; }
     TerminalHost& host() { return host_; }
-    const DiskNames& names() const { return names_; }
-    const JobReporter& jobs() const { return jobs_; }
+    const Translator& texts() { return host_.translator(); }
+    const pellar::Manager& library() const { return library_; }
+    const GivenNames& names() const { return names_; }
 
 private:
     bool isActiveTab() const override { return true; }
@@ -73,10 +93,14 @@ private:
 
     SupportOptions supportOptions(const Request& request);
     pellar::ManagerOptions libraryOptions(const Request& request);
+    TerminalWindow::Events windowEvents();
     void trace(std::string_view line);
     Asking asking();
-    JobReporter::Hooks jobHooks();
+    [[nodiscard]] Result<DiskPointer, Failure> findDisk(const std::string& name);
     void follow(const contract::DiskReferencePointer& disk);
+    void jobBegan(const StartedRun& run, const contract::DiskReferencePointer& disk);
+    void jobEnded(const StartedRun& run, const RunEnd& end);
+    void reportEnd();
     void interrupt();
     bool pressStop();
 
@@ -84,21 +108,40 @@ private:
     const bool tracesCommands_;
     std::unique_ptr<PasswordAgent> agent_;
     MainLoop loop_;
-    DiskNames names_;
+    GivenNames names_;
     TerminalWindow window_;
     LogView logView_;
-    Interface interface_;
+    TerminalInterface interface_;
     TerminalAlerts alerts_;
     Catalogue hostTexts_;
     LibraryTexts libraryTexts_;
     pellar::Manager library_;
     TerminalHost host_;
-    JobReporter jobs_;
     JobLedger ledger_;
     LoadedModule loaded_;
     std::unique_ptr<contract::OVModule> module_;
+    std::string currentDisk_;  ///< what the user calls the disk whose rows are coming
+    std::optional<RunEnd> unreportedEnd_;
+    std::map<std::string, RunEnd> outcomes_;
     bool isStopping_ = false;
     bool knowsSystemDisks_ = false;
+};
+
+/// The volumes of an image file, known for as long as this lives, as they are to a job. None of any
+/// other disk. The session outlives it.
+class AttachedImage {
+public:
+    AttachedImage(Session& session, const std::shared_ptr<Disk>& image);
+    AttachedImage(AttachedImage&&) = default;
+    AttachedImage& operator=(AttachedImage&&) = delete;
+    ~AttachedImage();
+
+    /// None as well where the image cannot be attached.
+    const std::shared_ptr<Disk>& top() const { return top_; }
+
+private:
+    Session* session_;
+    std::shared_ptr<Disk> top_;
 };
 
 }  // namespace orvane

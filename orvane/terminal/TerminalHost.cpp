@@ -1,9 +1,67 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/TerminalHost.h"
 
+#include "contract/foundation/UTF8.h"
+
+#include <cstdio>
+#include <iostream>
+
 namespace orvane {
 
-TerminalHost::TerminalHost(SupportOptions options, MainLoop& loop, Interface& interface,
+class TerminalAlerts::Question final : public contract::Alert,
+                                       public std::enable_shared_from_this<Question> {
+public:
+    Question(TerminalAlerts& alerts, Text text) : alerts_(alerts), text_(std::move(text)) {}
+
+    std::vector<contract::Button*> buttons() override { return {&default_, &alternate_}; }
+    void orderOut() override {}
+
+    void beginSheetModalForWindow(contract::Window* /*window*/,
+                                  std::function<void(contract::Alert&, long)> end) override
+    {
+        alerts_.isAsking_ = true;
+        alerts_.loop_.performOnMainThread(
+            [self = shared_from_this(), end = std::move(end)] {
+                const bool isConfirmed = self->isConfirmed();
+                self->alerts_.isAsking_ = false;
+                self->alerts_.wasDeclined_ = !isConfirmed;
+                const TerminalButton& pressed = isConfirmed ? self->default_ : self->alternate_;
+                end(*self, static_cast<long>(pressed.tag()));
+            },
+            contract::RunLoop::Wait::No);
+    }
+
+private:
+    bool isConfirmed() const
+    {
+        if (alerts_.answer_ != Answer::Ask)
+            return alerts_.answer_ == Answer::Confirm;
+        alerts_.reporter_.alert(text_.message, text_.informative);
+        std::printf("%s [y/N] ", contract::printable(text_.defaultButton).c_str());
+        std::fflush(stdout);
+        std::string answer;
+        std::getline(std::cin, answer);
+        return answer == "y" || answer == "Y" || answer == "yes";
+    }
+
+    TerminalAlerts& alerts_;
+    Text text_;
+    TerminalButton default_;
+    TerminalButton alternate_;
+};
+
+std::shared_ptr<contract::Alert> TerminalAlerts::makeAlert(const contract::Alert::Text& text)
+{
+    return std::make_shared<Question>(*this, text);
+}
+
+void TerminalAlerts::simpleModuleAlert(const std::string& title, const std::string& message,
+                                       std::int32_t /*error*/)
+{
+    reporter_.alert(title, message);
+}
+
+TerminalHost::TerminalHost(SupportOptions options, MainLoop& loop, TerminalInterface& interface,
                            TerminalAlerts& alerts, Reporter& reporter,
                            std::optional<bool> showsDetails)
     : SupportHost(std::move(options), loop),

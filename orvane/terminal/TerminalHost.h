@@ -1,16 +1,49 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/foundation/RunLoop.h"
+#include "contract/toolkit/Alert.h"
 #include "orvane/support/SupportHost.h"
 #include "orvane/support/loop/MainLoop.h"
-#include "orvane/terminal/Interface.h"
-#include "orvane/terminal/TerminalAlerts.h"
+#include "orvane/terminal/Reporter.h"
+#include "orvane/terminal/TerminalToolkit.h"
 
 #include <optional>
 
 namespace orvane {
 
-/// Preferences as stored, but for what the command line says for this once.
+/// Alerts as text. A question is answered by --yes, or asked on the terminal, where only the word
+/// for yes confirms; without a terminal it is answered with the button that Return stands for.
+class TerminalAlerts final : public contract::Alerts {
+public:
+    enum class Answer { Confirm, Ask, Decline };
+
+    /// Both outlive this object.
+    TerminalAlerts(contract::RunLoop& loop, Reporter& reporter, Answer answer)
+        : loop_(loop), reporter_(reporter), answer_(answer)
+    {
+    }
+
+    std::shared_ptr<contract::Alert> makeAlert(const contract::Alert::Text& text) override;
+    void simpleModuleAlert(const std::string& title, const std::string& message,
+                           std::int32_t error) override;
+
+    /// A question waits for its answer.
+    bool isAsking() const { return isAsking_; }
+    /// The last question was not confirmed.
+    bool wasDeclined() const { return wasDeclined_; }
+
+private:
+    class Question;
+
+    contract::RunLoop& loop_;
+    Reporter& reporter_;
+    Answer answer_;
+    bool isAsking_ = false;
+    bool wasDeclined_ = false;
+};
+
+/// The stored preferences, except for what the command line sets for this run.
 class RequestedPreferences final : public contract::OVPreferences {
 public:
     RequestedPreferences(contract::OVPreferences& stored, std::optional<bool> showsDetails)
@@ -42,7 +75,7 @@ class TerminalHost final : public SupportHost,
                            public contract::Printing {
 public:
     /// All references outlive this object.
-    TerminalHost(SupportOptions options, MainLoop& loop, Interface& interface,
+    TerminalHost(SupportOptions options, MainLoop& loop, TerminalInterface& interface,
                  TerminalAlerts& alerts, Reporter& reporter, std::optional<bool> showsDetails);
 
     contract::OVPreferences& sharedPreferences() override { return preferences_; }
@@ -67,7 +100,7 @@ public:
 
 private:
     RequestedPreferences preferences_;
-    Interface& interface_;
+    TerminalInterface& interface_;
     TerminalAlerts& alerts_;
     Reporter& reporter_;
     contract::PrintInfo printInfo_;

@@ -3,7 +3,11 @@
 
 #include "contract/foundation/UTF8.h"
 
+#include <fmt/format.h>
+
 #include <algorithm>
+#include <array>
+#include <ctime>
 #include <cwchar>
 
 namespace orvane {
@@ -38,6 +42,31 @@ void appendLine(std::string& result, std::string_view line, const std::string& l
     result += contract::printable(line);
     if (!look.empty())
         result += reset;
+}
+
+constexpr int barCells = 24;
+
+std::string repeated(std::string_view cell, int times)
+{
+    std::string text;
+    for (int i = 0; i < times; ++i)
+        text += cell;
+    return text;
+}
+
+std::string bar(double percent)
+{
+    const int full = std::clamp(static_cast<int>(percent / 100 * barCells), 0, barCells);
+    return repeated("█", full) + repeated("░", barCells - full) +
+           fmt::format(" {:3.0f} %", std::clamp(percent, 0.0, 100.0));
+}
+
+/// A mark that moves by one cell of the bar each second.
+std::string wanderingMark(std::chrono::seconds elapsed)
+{
+    const int at = static_cast<int>(elapsed.count() % barCells);
+    return repeated("░", at) + "█" + repeated("░", barCells - at - 1) +
+           fmt::format(" {}:{:02}", elapsed.count() / 60, elapsed.count() % 60);
 }
 
 }  // namespace
@@ -88,6 +117,34 @@ std::string fittedTo(std::string_view text, std::size_t columns)
         contract::appendUTF8(fitted, character);
     }
     return fitted;
+}
+
+std::string byteCount(std::uint64_t bytes)
+{
+    constexpr std::array units{"B", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
+    auto amount = static_cast<double>(bytes);
+    std::size_t unit = 0;
+    for (; amount >= 1000 && unit + 1 < units.size(); ++unit)
+        amount /= 1024;
+    const bool isRound = unit == 0 || amount >= 9.95 || amount == static_cast<int>(amount);
+    return fmt::format("{:.{}f} {}", amount, isRound ? 0 : 1, units[unit]);
+}
+
+std::string localTime(std::chrono::system_clock::time_point time)
+{
+    const std::time_t seconds = std::chrono::system_clock::to_time_t(time);
+    std::tm parts{};
+    std::array<char, 32> text{};
+    if (::localtime_r(&seconds, &parts) == nullptr)
+        return {};
+    return {text.data(), std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M", &parts)};
+}
+
+std::string progressLine(const JobProgress& progress, std::size_t columns)
+{
+    const std::string gauge =
+        progress.percent ? bar(*progress.percent) : wanderingMark(progress.elapsed);
+    return fittedTo(gauge + "  " + contract::printable(progress.status), columns);
 }
 
 }  // namespace orvane

@@ -3,6 +3,9 @@
 
 #include "contract/foundation/StyledText.h"
 
+#include <chrono>
+#include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -17,5 +20,22 @@ std::string terminalText(const contract::StyledText& text, bool colors);
 
 /// As much of `text`, which must be printable, as fits into `columns` columns.
 std::string fittedTo(std::string_view text, std::size_t columns);
+
+/// "512 B", "1.5 MiB", "40 GiB": at most three digits, in powers of 1024 (IEC 80000-13).
+std::string byteCount(std::uint64_t bytes);
+
+/// "2024-05-06 07:08", the local time.
+std::string localTime(std::chrono::system_clock::time_point time);
+
+/// How far a job is, as the bottom line of a terminal shows it.
+struct JobProgress {
+    std::optional<double> percent;  ///< none while there is no telling
+    std::string status;
+    std::chrono::seconds elapsed{0};
+};
+
+/// One line of at most `columns` columns: a bar and the percentage, or a moving mark and the time
+/// gone by, and the status text.
+std::string progressLine(const JobProgress& progress, std::size_t columns);
 
 }  // namespace orvane

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/terminal/TextReporter.h"
+#include "orvane/terminal/Reporter.h"
 
+#include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
-#include "orvane/terminal/ByteCount.h"
 #include "orvane/terminal/TerminalText.h"
 
 #include <fmt/format.h>
@@ -11,16 +11,19 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <chrono>
+#include <cstdio>
+
 namespace orvane {
 namespace {
 
 constexpr std::chrono::milliseconds redrawInterval{100};
 
-/// A heading that is neither good nor bad and says what it is about: a job's first line.
+/// A heading without a result, but with a text of its own: a job's first line.
 bool isStartOfRun(const contract::Dictionary& record)
 {
-    return record.integer(contract::kFsckVerbosity) < 0 && !record.has(contract::kFsckMessageType) &&
-           record.has(contract::kFsckMessageString);
+    return record.integer(contract::kFsckVerbosity) < 0 &&
+           !record.has(contract::kFsckMessageType) && record.has(contract::kFsckMessageString);
 }
 
 std::size_t terminalColumns()
@@ -31,190 +34,210 @@ std::size_t terminalColumns()
     return 79;
 }
 
+/// Speaks to people: rows as they come, and on a terminal one live line at the bottom.
+class TextReporter final : public Reporter {
+public:
+    explicit TextReporter(TextReporterOptions options) : options_(std::move(options)) {}
+    ~TextReporter() override { hideProgress(); }
+
+    void started(const std::string& /*disk*/, std::string_view /*action*/,
+                 const std::string& title) override
+    {
+        progress_.status = title;
+        progress_.percent.reset();
+        began_ = Clock::now();
+        endLine();
+    }
+
+    void record(const std::string& /*disk*/, const contract::Dictionary& record,
+                const contract::StyledText& text) override
+    {
+        if (hasWrittenRows_ && isStartOfRun(record)) {
+            endLine();
+            write("\n");
+        }
+        hasWrittenRows_ = true;
+        write(terminalText(text, options_.colors));
+    }
+
+    void rowsWritten() override
+    {
+        drawProgress();
+        flush();
+    }
+
+    void progress(const std::string& /*disk*/, std::optional<double> percent,
+                  const std::string& status) override
+    {
+        progress_.percent = percent;
+        progress_.status = status;
+        drawProgress();
+    }
+
+    // What a person needs to know of these three stands in the log's rows and in the alert.
+    void finished(const std::string& /*disk*/, std::string_view /*verdict*/,
+                  contract::ErrorCode /*error*/, std::string_view /*message*/) override
+    {
+        progress_.status.clear();
+        hideProgress();
+        endLine();
+        flush();
+    }
+
+    void prompt(Prompt state) override
+    {
+        if (state == Prompt::Left && isHeldBack_ && options_.showsProgress)
+            write("\n");
+        isHeldBack_ = state == Prompt::Open;
+        hideProgress();
+        endLine();
+        flush();
+    }
+
+    void alert(const std::string& title, const std::string& message) override
+    {
+        endLine();
+        write("\n" + bold(title) + "\n" + safeLines(message) + "\n");
+    }
+
+    void failure(const std::string& /*disk*/, const std::string& sentence) override
+    {
+        warning(sentence);
+    }
+
+    void warning(const std::string& sentence) override
+    {
+        hideProgress();
+        endLine();
+        flush();
+        writeError(sentence);
+    }
+
+    void listed(const DiskLine& disk) override
+    {
+        const std::string indent = disk.isVolume ? "  " : "";
+        std::string facts = byteCount(disk.bytes) + "  " + disk.kind;
+        if (!disk.filesystem.empty())
+            facts += "  " + disk.filesystem;
+        if (!disk.mountPoint.empty())
+            facts += "  " + sentence("mounted at %@", {disk.mountPoint});
+        const std::string name = disk.name.empty() ? "" : "  “" + disk.name + "”";
+        write(indent + bold(disk.disk) + contract::printable(name + "  " + facts) + "\n");
+        const auto below = [&](const std::string& text) {
+            write(indent + "    " + text + "\n");
+        };
+        if (disk.lastChecked.empty())
+            below(sentence("never checked", {}));
+        else
+            below(sentence("last checked %@: %@", {disk.lastChecked, verdictText(disk.verdict)}));
+        if (disk.later)
+            below(sentence("after that, %@: %@",
+                           {disk.later->started, verdictText(disk.later->verdict)}));
+        for (const ActionLine& action : disk.actions)
+            below(fmt::format("{:<24} {}", action.title,
+                              action.isAvailable ? sentence("available", {})
+                                                 : contract::printable(action.reason)));
+    }
+
+    void done(const std::string& /*disk*/, std::string_view /*action*/,
+              const std::string& /*place*/, const std::string& sentence) override
+    {
+        write(contract::printable(sentence) + "\n");
+        flush();
+    }
+
+    void runs(const std::string& disk, const std::vector<RunLine>& runs) override
+    {
+        endLine();
+        write(bold(disk) + (runs.empty() ? ": " + sentence("never checked", {}) + "\n" : "\n"));
+        for (const RunLine& run : runs)
+            write(contract::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
+                                                  verdictText(run.verdict))) +
+                  "\n");
+        if (!runs.empty())
+            write("\n");
+    }
+
+    bool end() override
+    {
+        hideProgress();
+        endLine();
+        return Reporter::end();
+    }
+
+private:
+    using Clock = std::chrono::steady_clock;
+
+    void write(std::string_view text)
+    {
+        if (text.empty())
+            return;
+        hideProgress();
+        std::fwrite(text.data(), 1, text.size(), stdout);
+        isAtLineStart_ = text.back() == '\n';
+    }
+
+    void endLine()
+    {
+        if (!isAtLineStart_)
+            write("\n");
+    }
+
+    void hideProgress()
+    {
+        if (!isProgressShown_)
+            return;
+        std::fputs("\r\x1b[K", stdout);
+        isProgressShown_ = false;
+    }
+
+    void drawProgress()
+    {
+        const Clock::time_point now = Clock::now();
+        const bool isDue = !isProgressShown_ || now - drawn_ >= redrawInterval;
+        if (!options_.showsProgress || isHeldBack_ || !isAtLineStart_ || progress_.status.empty() ||
+            !isDue)
+            return;
+        progress_.elapsed = std::chrono::duration_cast<std::chrono::seconds>(now - began_);
+        const std::string line = "\r\x1b[K" + progressLine(progress_, terminalColumns());
+        std::fwrite(line.data(), 1, line.size(), stdout);
+        flush();
+        drawn_ = now;
+        isProgressShown_ = true;
+    }
+
+    std::string bold(std::string_view text) const
+    {
+        const std::string safe = safeLines(text);
+        return options_.colors ? "\x1b[1m" + safe + "\x1b[0m" : safe;
+    }
+
+    std::string sentence(std::string_view key,
+                         std::initializer_list<contract::FormatArgument> arguments) const
+    {
+        return contract::format(options_.translate(key), arguments);
+    }
+
+    std::string verdictText(std::string_view verdict) const
+    {
+        return options_.translate(verdict.empty() ? "cut off" : verdict);
+    }
+
+    const TextReporterOptions options_;
+    JobProgress progress_;
+    Clock::time_point began_ = Clock::now();
+    Clock::time_point drawn_{};
+    bool isProgressShown_ = false;
+    bool isHeldBack_ = false;
+    bool isAtLineStart_ = true;
+    bool hasWrittenRows_ = false;
+};
+
 }  // namespace
 
-void TextReporter::write(std::string_view text)
+std::unique_ptr<Reporter> makeTextReporter(TextReporterOptions options)
 {
-    if (text.empty())
-        return;
-    hideProgress();
-    std::fwrite(text.data(), 1, text.size(), stdout);
-    isAtLineStart_ = text.back() == '\n';
-}
-
-void TextReporter::endLine()
-{
-    if (!isAtLineStart_)
-        write("\n");
-}
-
-std::string TextReporter::sentence(std::string_view key,
-                                   std::initializer_list<contract::FormatArgument> arguments) const
-{
-    return contract::format(options_.translate(key), arguments);
-}
-
-std::string TextReporter::verdictText(std::string_view verdict) const
-{
-    return options_.translate(verdict.empty() ? "cut off" : verdict);
-}
-
-std::string TextReporter::bold(std::string_view text) const
-{
-    const std::string safe = safeLines(text);
-    return options_.colors ? "\x1b[1m" + safe + "\x1b[0m" : safe;
-}
-
-void TextReporter::started(const std::string& /*disk*/, std::string_view /*action*/,
-                           const std::string& title)
-{
-    progress_.status = title;
-    progress_.percent.reset();
-    began_ = Clock::now();
-    endLine();
-}
-
-void TextReporter::record(const std::string& /*disk*/, const contract::Dictionary& record,
-                          const contract::StyledText& text)
-{
-    if (hasWrittenRows_ && isStartOfRun(record)) {
-        endLine();
-        write("\n");
-    }
-    hasWrittenRows_ = true;
-    write(terminalText(text, options_.colors));
-}
-
-void TextReporter::rowsWritten()
-{
-    drawProgress();
-    flush();
-}
-
-void TextReporter::progress(const std::string& /*disk*/, std::optional<double> percent,
-                            const std::string& status)
-{
-    progress_.percent = percent;
-    progress_.status = status;
-    drawProgress();
-}
-
-void TextReporter::drawProgress()
-{
-    const Clock::time_point now = Clock::now();
-    const bool isDue = !isProgressShown_ || now - drawn_ >= redrawInterval;
-    if (!options_.showsProgress || isHeldBack_ || !isAtLineStart_ || progress_.status.empty() ||
-        !isDue)
-        return;
-    progress_.elapsed = std::chrono::duration_cast<std::chrono::seconds>(now - began_);
-    const std::string line = "\r\x1b[K" + progressLine(progress_, terminalColumns());
-    std::fwrite(line.data(), 1, line.size(), stdout);
-    flush();
-    drawn_ = now;
-    isProgressShown_ = true;
-}
-
-void TextReporter::hideProgress()
-{
-    if (!isProgressShown_)
-        return;
-    std::fputs("\r\x1b[K", stdout);
-    isProgressShown_ = false;
-}
-
-// What a person needs to know of these three stands in the log's rows and in the alert.
-void TextReporter::finished(const std::string& /*disk*/, std::string_view /*verdict*/,
-                            contract::ErrorCode /*error*/, std::string_view /*message*/)
-{
-    progress_.status.clear();
-    hideProgress();
-    endLine();
-    flush();
-}
-
-void TextReporter::report(const std::string& /*disk*/, const contract::Dictionary& /*report*/) {}
-
-void TextReporter::prompt(Prompt state)
-{
-    if (state == Prompt::Left && isHeldBack_ && options_.showsProgress)
-        write("\n");
-    isHeldBack_ = state == Prompt::Open;
-    hideProgress();
-    endLine();
-    flush();
-}
-
-void TextReporter::alert(const std::string& title, const std::string& message)
-{
-    endLine();
-    write("\n" + bold(title) + "\n" + safeLines(message) + "\n");
-}
-
-void TextReporter::failure(const std::string& /*disk*/, const std::string& sentence)
-{
-    warning(sentence);
-}
-
-void TextReporter::warning(const std::string& sentence)
-{
-    hideProgress();
-    endLine();
-    flush();
-    const std::string line = "fixwell: " + contract::printable(sentence) + "\n";
-    std::fwrite(line.data(), 1, line.size(), stderr);
-}
-
-void TextReporter::listed(const DiskLine& disk)
-{
-    const std::string indent = disk.isVolume ? "  " : "";
-    std::string facts = byteCount(disk.bytes) + "  " + disk.kind;
-    if (!disk.filesystem.empty())
-        facts += "  " + disk.filesystem;
-    if (!disk.mountPoint.empty())
-        facts += "  " + sentence("mounted at %@", {disk.mountPoint});
-    write(indent + bold(disk.disk) +
-          (disk.name.empty() ? "" : contract::printable("  “" + disk.name + "”")) + "  " +
-          contract::printable(facts) + "\n");
-    write(indent + "    " +
-          (disk.lastChecked.empty()
-               ? sentence("never checked", {})
-               : sentence("last checked %@: %@", {disk.lastChecked, verdictText(disk.verdict)})) +
-          "\n");
-    if (disk.later)
-        write(indent + "    " +
-              sentence("after that, %@: %@",
-                       {disk.later->started, verdictText(disk.later->verdict)}) +
-              "\n");
-    for (const ActionLine& action : disk.actions)
-        write(fmt::format(
-            "{}    {:<24} {}\n", indent, action.title,
-            action.isAvailable ? sentence("available", {}) : contract::printable(action.reason)));
-}
-
-void TextReporter::done(const std::string& /*disk*/, std::string_view /*action*/,
-                        const std::string& /*place*/, const std::string& sentence)
-{
-    write(contract::printable(sentence) + "\n");
-    flush();
-}
-
-void TextReporter::runs(const std::string& disk, const std::vector<RunLine>& runs)
-{
-    endLine();
-    write(bold(disk) + (runs.empty() ? ": " + sentence("never checked", {}) + "\n" : "\n"));
-    for (const RunLine& run : runs)
-        write(contract::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
-                                             verdictText(run.verdict))) +
-              "\n");
-    if (!runs.empty())
-        write("\n");
-}
-
-bool TextReporter::end()
-{
-    hideProgress();
-    endLine();
-    return Reporter::end();
+    return std::make_unique<TextReporter>(std::move(options));
 }
 
 }  // namespace orvane

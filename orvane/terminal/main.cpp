@@ -3,12 +3,7 @@
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/terminal/CommandLine.h"
-#include "orvane/terminal/ExitStatus.h"
-#include "orvane/terminal/JSONReporter.h"
-#include "orvane/terminal/Session.h"
-#include "orvane/terminal/TextReporter.h"
-#include "orvane/terminal/commands/Commands.h"
+#include "orvane/terminal/Commands.h"
 
 #include <unistd.h>
 
@@ -16,7 +11,7 @@
 #include <cstdlib>
 #include <exception>
 #include <memory>
-#include <optional>
+#include <utility>
 
 namespace orvane {
 namespace {
@@ -39,8 +34,8 @@ bool wantsColors(const Request& request)
 std::unique_ptr<Reporter> makeReporter(const Request& request)
 {
     if (request.isJSON)
-        return std::make_unique<JSONReporter>();
-    TextReporter::Options options;
+        return makeJSONReporter();
+    TextReporterOptions options;
     options.translate =
         [texts = std::make_shared<Catalogue>(hostBundleDirectory(runningExecutable()) / "locale")](
             std::string_view key) {
@@ -48,11 +43,10 @@ std::unique_ptr<Reporter> makeReporter(const Request& request)
         };
     options.colors = wantsColors(request);
     options.showsProgress = request.showsProgress && isTerminal();
-    return std::make_unique<TextReporter>(options);
+    return makeTextReporter(std::move(options));
 }
 
-/// What needs no module.
-std::optional<int> carryOutAlone(const Request& request, Session& session, Reporter& reporter)
+int carryOut(const Request& request, Session& session, Reporter& reporter)
 {
     switch (request.command) {
         case Command::Mount:
@@ -60,14 +54,8 @@ std::optional<int> carryOutAlone(const Request& request, Session& session, Repor
         case Command::Eject:
         case Command::Detach: return runDiskAction(request, session, reporter);
         case Command::Attach: return runAttach(request, session, reporter);
-        default: return std::nullopt;
+        default: break;  // what needs the module
     }
-}
-
-int carryOut(const Request& request, Session& session, Reporter& reporter)
-{
-    if (const auto status = carryOutAlone(request, session, reporter))
-        return *status;
     if (const auto loaded = session.loadModule(); !loaded) {
         reporter.warning(loaded.error().message);
         return exitUnchecked;
@@ -75,7 +63,7 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     switch (request.command) {
         case Command::List: return runList(request, session, reporter);
         case Command::History: return runHistory(request, session, reporter);
-        default: return runAction(request, session, reporter);
+        default: return runCheck(request, session, reporter);
     }
 }
 
@@ -83,17 +71,17 @@ int run(int argc, const char* const* argv)
 {
     setInheritanceRight();
     adoptUserLocale();
-    const auto read = readCommandLine(argc, argv);
-    if (const auto* const ending = std::get_if<Ending>(&read)) {
-        std::fputs(ending->text.c_str(), ending->status == exitSound ? stdout : stderr);
-        return ending->status;
+    const auto request = readCommandLine(argc, argv);
+    if (!request) {
+        const Ending& ending = request.error();
+        std::fputs(ending.text.c_str(), ending.status == exitSound ? stdout : stderr);
+        return ending.status;
     }
-    const Request& request = std::get<Request>(read);
-    const std::unique_ptr<Reporter> reporter = makeReporter(request);
+    const std::unique_ptr<Reporter> reporter = makeReporter(*request);
     int status = 0;
     {
-        Session session(request, *reporter);
-        status = carryOut(request, session, *reporter);
+        Session session(*request, *reporter);
+        status = carryOut(*request, session, *reporter);
     }
     return reporter->end() ? status : status | exitUnchecked;
 }

@@ -216,21 +216,21 @@ TEST_F(OVFXWTest, ToolTipsExplainWhatIsNotAvailable)
     const auto disk = addDisk("a");
     disk->writable = false;
     select(disk);
-    EXPECT_EQ(
-        button("repairDiskButton").toolTip,
-        "Repair the structure of the disk’s file system, if necessary\n\nNot available because "
-        "the selected disk can’t be written to.");
+    EXPECT_EQ(button("repairDiskButton").toolTip,
+              "Repair the structure of the disk’s file system, if necessary");
+    EXPECT_EQ(button("repairDiskButton").reason,
+              "Not available because the selected disk can’t be written to.");
     EXPECT_EQ(button("verifyDiskButton").toolTip,
               "Check whether the structure of the disk’s file system is OK");
+    EXPECT_EQ(button("verifyDiskButton").reason, "");
     select(addDisk("b"), disk);
-    EXPECT_NE(button("repairDiskButton").toolTip.find("one of the selected disks"),
+    EXPECT_NE(button("repairDiskButton").reason.find("one of the selected disks"),
               std::string::npos);
 
     select();
     EXPECT_FALSE(button("verifyDiskButton").enabled);
     EXPECT_TRUE(button("showDetailsButton").enabled);
-    EXPECT_EQ(button("repairDiskButton").toolTip,
-              "Repair the structure of the disk’s file system, if necessary");
+    EXPECT_EQ(button("repairDiskButton").reason, "");
 
     host.isMain = false;
     select(addDisk("c"));

@@ -90,6 +90,7 @@ struct FakeDisk final : OVDisk {
 struct FakeButton final : Button {
     bool enabled = true;
     std::string toolTip;
+    std::string reason;
     std::string title;
     std::string action;
     std::string key = "unset";
@@ -105,6 +106,7 @@ struct FakeButton final : Button {
     void setIntegerValue(std::int64_t number) override { value = number; }
     void setKeyEquivalent(std::string_view equivalent) override { key = equivalent; }
     void setTag(std::int64_t number) override { tag = number; }
+    void setReason(std::string_view text) override { reason = text; }
 };
 
 struct FakeTextField final : TextField {

@@ -99,6 +99,9 @@ TEST(E2fsckVerdict, WeighsWhatWeKnowBesides)
     run.result.cause = StopCause::User;
     EXPECT_EQ(judge(run).verdict, Verdict::Stopped) << "it was stopped, however it ended";
 
+    const Findings words = readAll({"The volume “image” appears to be OK."}).findings;
+    EXPECT_EQ(judge(evidence(Exited{4}, words)).verdict, Verdict::Damaged) << "it lies in words";
+
     run = evidence(Killed{SIGINT}, damaged);
     run.result.cause = StopCause::TooMuchOutput;
     EXPECT_EQ(judge(run).verdict, Verdict::Damaged) << "what it had found stands";

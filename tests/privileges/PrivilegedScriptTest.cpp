@@ -17,26 +17,23 @@ namespace {
 class PrivilegedScriptTest : public testing::Test {
 protected:
     /// What the launched program does, as a shell script, after the arguments were seen.
-    void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
-    {
-        launch(script, {pellar::Subject::Filesystem, operation,
-                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr, false});
-    }
     void launch(const std::string& script, const pellar::PrivilegedJob& job)
     {
+        job_.reset();
+        listener_ = {};
+        asking_.clear();
         const auto launcher = workshop_.path("launcher");
         std::ofstream(launcher) << "#!/bin/sh\n" << script << "\n";
         std::filesystem::permissions(launcher, std::filesystem::perms::owner_all);
+        const HelperLaunch how{{launcher.native()},
+                               "",
+                               {[this] { asking_ += "begins "; },
+                                [this] {
+                                    asking_ += "ends ";
+                                }}};
         job_ = std::make_unique<pellar::Job>(
-            [this, launcher, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
-                return std::make_unique<PrivilegedScript>(
-                    HelperLaunch{{launcher.native()},
-                                 "",
-                                 {[this] { asking_ += "begins "; },
-                                  [this] {
-                                      asking_ += "ends ";
-                                  }}},
-                    job, texts_, stop, road);
+            [this, how, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
+                return std::make_unique<PrivilegedScript>(how, job, texts_, stop, road);
             },
             pellar::EventReceiver{&listener_,
                                   pellar::test::reference("/dev/sdz9"),
@@ -44,6 +41,15 @@ protected:
                                   [] {
                                   }},
             loop_);
+    }
+    void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
+    {
+        launch(script, jobOn("/dev/sdz9", operation));
+    }
+    static pellar::PrivilegedJob jobOn(const std::string& device, pellar::Operation operation)
+    {
+        return {pellar::Subject::Filesystem, operation,
+                *pellar::test::reference(device, "ext4", "Stick"), nullptr, false};
     }
     [[nodiscard]] bool finishes()
     {
@@ -93,15 +99,12 @@ TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)
                   "cannot repair “Stick”: the program that works on it as administrator ended "
                   "unexpectedly"},
          }) {
-        listener_ = {};
-        asking_.clear();
         launch(c.script, pellar::Operation::Repair);
         ASSERT_TRUE(finishes()) << c.script;
         EXPECT_EQ(listener_.started, 1) << c.script;
         EXPECT_EQ(listener_.error, c.error) << c.script;
         EXPECT_EQ(listener_.message, c.message);
         EXPECT_EQ(asking_, "begins ends ");
-        job_.reset();
     }
 }
 
@@ -115,10 +118,9 @@ TEST_F(PrivilegedScriptTest, StopIsPassedOnAndLeavingEndsTheHelper)
     job_->stop();
     ASSERT_TRUE(finishes());
     EXPECT_EQ(listener_.message, "stop");
-    job_.reset();
 
     launch("printf '[\"started\"]\\n'\ncat >/dev/null\n: >'" + ended.native() + "'");
-    ASSERT_TRUE(loop_.runUntil([this] { return listener_.started == 2; }));
+    ASSERT_TRUE(loop_.runUntil([this] { return listener_.started == 1; }));
     job_.reset();  // waits: nobody is left behind
     EXPECT_TRUE(std::filesystem::exists(ended));
 }
@@ -148,7 +150,6 @@ TEST_F(PrivilegedScriptTest, AnImageIsHandedOverAsAnOpenFile)
     launch(script, jobOnImage(image));
     ASSERT_TRUE(finishes());
     EXPECT_EQ(listener_.message, "attach-verify " + image.native() + " 4096 8192");
-    job_.reset();
 }
 
 // A device on it does not show that it was deleted.
@@ -161,7 +162,6 @@ TEST_F(PrivilegedScriptTest, AnImageThatWasDeletedGetsNoResult)
         workshop_.path("end").native() +
         "' ]; do sleep 0.02; done\nprintf '[\"finished\",0,0,null]\\n'";
     for (const bool isDeleted : {false, true}) {
-        listener_ = {};
         const auto image = workshop_.path("image");
         workshop_.write("image", std::string(16384, 'x'));
         launch(script, jobOnImage(image));
@@ -195,14 +195,11 @@ TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
          {Case{"ulimit -S -n 16", 0, "sound"},
           Case{"losetup -d " + device.name() + "\nlosetup " + device.name() + " '" + other + "'",
                contract::kPLErrorDiskChanged, "failed"}}) {
-        listener_ = {};
         launch(c.meanwhile + "\nexec " PELLAR_HELPER " \"$@\"",
-               {pellar::Subject::Filesystem, pellar::Operation::Verify,
-                *pellar::test::reference(device.name(), "ext4", "Stick"), nullptr, false});
+               jobOn(device.name(), pellar::Operation::Verify));
         ASSERT_TRUE(finishes());
         EXPECT_EQ(listener_.error, c.error) << listener_.message;
         EXPECT_EQ(listener_.verdict, c.verdict) << listener_.message;
-        job_.reset();
     }
 }
 

@@ -1,63 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/CommandLine.h"
-#include "orvane/terminal/DiskNames.h"
-
-#include <gtest/gtest.h>
+#include "orvane/terminal/Reporter.h"
+#include "tests/terminal/ProgramTest.h"
 
 namespace orvane {
 namespace {
 
-std::variant<Request, Ending> readWords(std::vector<const char*> words)
+pellar::Result<Request, Ending> readWords(std::vector<const char*> words)
 {
     words.insert(words.begin(), "fixwell");
     return readCommandLine(static_cast<int>(words.size()), words.data());
 }
 
-TEST(CommandLine, WordsBecomeARequest)
+TEST(CommandLine, ARequestIsConfirmedOnDemandOnlyAndMayNameAFileLikeAnOption)
 {
-    const auto read = readWords({"--color", "never", "repair", "a", "--details", "LABEL=x y",
-                                 "--yes", "--log-level=2", "--no-progress", "--trace"});
-    ASSERT_TRUE(std::holds_alternative<Request>(read));
-    const Request& request = std::get<Request>(read);
-    EXPECT_EQ(request.command, Command::Repair);
-    EXPECT_EQ(request.disks, (std::vector<std::string>{"a", "LABEL=x y"}));
-    EXPECT_EQ(request.coloring, Coloring::Never);
-    EXPECT_EQ(request.showsDetails, true);
-    EXPECT_TRUE(request.confirms);
-    EXPECT_TRUE(request.tracesCommands);
-    EXPECT_FALSE(request.showsProgress);
-    EXPECT_FALSE(request.isJSON);
-    EXPECT_EQ(request.logLevel, 2);
+    const auto plain = readWords({"repair", "--", "--yes"});
+    ASSERT_TRUE(plain);
+    EXPECT_FALSE(plain->confirms);
+    EXPECT_EQ(plain->disks, std::vector<std::string>{"--yes"});
+    const auto confirmed = readWords({"--color", "never", "repair", "a", "--yes", "LABEL=x y"});
+    ASSERT_TRUE(confirmed);
+    EXPECT_TRUE(confirmed->confirms);
+    EXPECT_EQ(confirmed->disks, (std::vector<std::string>{"a", "LABEL=x y"}));
 }
 
-TEST(CommandLine, EachCommandIsItself)
-{
-    struct Case {
-        std::vector<const char*> words;
-        Command command;
-        std::size_t disks;
-    };
-    for (const Case& c :
-         {Case{{"verify", "a"}, Command::Verify, 1},
-          Case{{"verify", "a", "b", "c"}, Command::Verify, 3},
-          Case{{"verify", "--", "--json"}, Command::Verify, 1},
-          Case{{"repair", "a"}, Command::Repair, 1},
-          Case{{"verify-permissions", "/"}, Command::VerifyPermissions, 1},
-          Case{{"repair-permissions", "/"}, Command::RepairPermissions, 1},
-          Case{{"list"}, Command::List, 0}, Case{{"list", "a"}, Command::List, 1},
-          Case{{"history", "a"}, Command::History, 1}, Case{{"mount", "a", "b"}, Command::Mount, 2},
-          Case{{"unmount", "a"}, Command::Unmount, 1}, Case{{"eject", "a"}, Command::Eject, 1},
-          Case{{"attach", "--read-only", "a"}, Command::Attach, 1},
-          Case{{"detach", "a"}, Command::Detach, 1}}) {
-        const auto read = readWords(c.words);
-        ASSERT_TRUE(std::holds_alternative<Request>(read)) << c.words.front();
-        EXPECT_EQ(std::get<Request>(read).command, c.command) << c.words.front();
-        EXPECT_EQ(std::get<Request>(read).disks.size(), c.disks) << c.words.front();
-        EXPECT_FALSE(std::get<Request>(read).confirms) << "only on demand";
-    }
-}
-
-TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsage)
+TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsageAndNotObeyed)
 {
     struct Case {
         std::vector<const char*> words;
@@ -68,22 +35,22 @@ TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsage)
           Case{{"verify"}, "what?"}, Case{{"history", "--clear"}, "whose?"},
           Case{{"verify", "--clear", "a"}, "only a history is cleared"}, Case{{"attach"}, "what?"},
           Case{{"mount", "--read-only", "a"}, "only an image is attached so"},
-          Case{{"verify", "--colour=never", "a"}, "no such option"},
+          Case{{"verify", "--color=pink", "a"}, "no such choice"},
           Case{{"verify", "--log-level=loud", "a"}, "no number"},
-          Case{{"verify", "--log-level=-1", "a"}, "out of range"}}) {
+          Case{{"verify", "--log-level=9", "a"}, "out of range"},
+          Case{{"verify", "--f\x1b[2Jast", "a"}, "an option with escapes"},
+          Case{{"\x1b]0;title\x07"}, "a command with escapes"}}) {
         const auto read = readWords(c.words);
-        ASSERT_TRUE(std::holds_alternative<Ending>(read)) << c.because;
-        EXPECT_EQ(std::get<Ending>(read).status, 16) << c.because;
-        EXPECT_FALSE(std::get<Ending>(read).text.empty()) << c.because;
+        ASSERT_FALSE(read) << c.because;
+        EXPECT_EQ(read.error().status, 16) << c.because;
+        EXPECT_TRUE(read.error().text.starts_with("fixwell: ")) << c.because;
+        EXPECT_FALSE(test::holdsControls(read.error().text)) << c.because;
     }
-    const auto help = readWords({"verify", "--help"});
-    ASSERT_TRUE(std::holds_alternative<Ending>(help));
-    EXPECT_EQ(std::get<Ending>(help).status, 0);
 }
 
-TEST(DiskNames, APartGoesByTheNameOfItsImage)
+TEST(GivenNames, APartGoesByTheNameOfItsImage)
 {
-    DiskNames names;
+    GivenNames names;
     names.add("/tmp/a.img", "a.img");
     names.add("/tmp/a.img#odd", "odd");
     names.add("/dev/sdb", "LABEL=x");
@@ -94,29 +61,15 @@ TEST(DiskNames, APartGoesByTheNameOfItsImage)
     };
     for (const Case& c :
          {Case{"/tmp/a.img", "a.img", "as named"}, Case{"/tmp/a.img#0", "a.img", "fills the image"},
-          Case{"/tmp/a.img#2", "a.img#2", "a volume"},
-          Case{"/tmp/a.img#12", "a.img#12", "two digits"},
+          Case{"/tmp/a.img#12", "a.img#12", "a volume"},
           Case{"/tmp/a.img#odd", "odd", "a file of its own"},
           Case{"/tmp/a.img#odd#1", "odd#1", "inside that file"},
+          Case{"/tmp/a.img#", "/tmp/a.img#", "another file"},
+          Case{"/tmp/a.img#1x", "/tmp/a.img#1x", "another file"},
+          Case{"/tmp/a.img#1#2", "/tmp/a.img#1#2", "another file"},
           Case{"/tmp/a.img2", "/tmp/a.img2", "another file"},
-          Case{"/dev/sdb", "LABEL=x", "a device"},
-          Case{"/dev/sdb1", "/dev/sdb1", "nobody named it"}, Case{"/tmp/b", "/tmp/b", "unknown"}})
+          Case{"/dev/sdb", "LABEL=x", "a device"}, Case{"/dev/sdb1", "/dev/sdb1", "not named"}})
         EXPECT_EQ(names.nameOf(c.identifier), c.name) << c.because;
-}
-
-TEST(DiskNames, OnlyANumberLiesInside)
-{
-    struct Case {
-        std::string_view identifier;
-        std::string_view named;
-        bool isWithin;
-    };
-    for (const Case& c :
-         {Case{"/a", "/a", true}, Case{"/a#0", "/a", true}, Case{"/a#17", "/a", true},
-          Case{"/a#", "/a", false}, Case{"/a#1x", "/a", false}, Case{"/a#1#2", "/a", false},
-          Case{"/ab", "/a", false}, Case{"/a", "/a#1", false}})
-        EXPECT_EQ(DiskNames::isWithin(c.identifier, c.named), c.isWithin)
-            << c.identifier << " in " << c.named;
 }
 
 }  // namespace

@@ -16,7 +16,7 @@ protected:
     }
 };
 
-TEST_F(HistoryCommandTest, RunsAndRecordsOutliveTheProgram)
+TEST_F(HistoryCommandTest, RunsOutliveTheProgramUntilTheyAreCleared)
 {
     makeDamagedVolume("a");
     makeVolume("b");
@@ -24,7 +24,7 @@ TEST_F(HistoryCommandTest, RunsAndRecordsOutliveTheProgram)
         static_cast<void>(run({command, "a"}));
     const std::vector<std::string> expected{"verify damaged", "repair repaired", "verify sound"};
     EXPECT_EQ(verdicts("a"), expected);
-    EXPECT_EQ(verdicts("b"), std::vector<std::string>()) << "each image has its own";
+    EXPECT_NE(run({"history", "b"}).output.find("never checked"), std::string::npos);
 
     const std::string shown = run({"history", "a"}).output;
     const std::size_t damage = shown.find("needs to be repaired.");
@@ -33,20 +33,13 @@ TEST_F(HistoryCommandTest, RunsAndRecordsOutliveTheProgram)
     EXPECT_LT(damage, repair) << shown;
     EXPECT_LT(repair, good) << shown;
     EXPECT_NE(good, std::string::npos) << shown;
-    EXPECT_NE(run({"history", "b"}).output.find("never checked"), std::string::npos);
-}
 
-TEST_F(HistoryCommandTest, ClearForgetsTheImageAndNoOther)
-{
-    makeVolume("a");
-    makeVolume("b");
-    static_cast<void>(run({"verify", "a", "b"}));
-    EXPECT_EQ(run({"history", "--clear", "a"}).status, 0);
-    const RunResult cleared = run({"history", "--json", "a"});
-    EXPECT_EQ(cleared.output, "");
+    static_cast<void>(run({"verify", "b"}));
+    for (int times = 0; times < 2; ++times)
+        EXPECT_EQ(run({"history", "--clear", "a"}).status, 0) << "there may be nothing to clear";
+    EXPECT_EQ(run({"history", "--json", "a"}).output, "");
     EXPECT_NE(run({"history", "a"}).output.find("never checked"), std::string::npos);
-    EXPECT_EQ(verdicts("b").size(), 1U);
-    EXPECT_EQ(run({"history", "--clear", "a"}).status, 0) << "there is nothing to clear";
+    EXPECT_EQ(verdicts("b").size(), 1U) << "each image has its own";
 }
 
 TEST_F(HistoryCommandTest, HistoryTellsTheRecordsAsTheyWereSeen)
@@ -69,17 +62,6 @@ TEST_F(HistoryCommandTest, AStateDirectoryThatCannotBeUsedIsSaidAndTheCheckGoesO
     EXPECT_EQ(result.status, 0) << result.errors;
     EXPECT_NE(result.output.find("appears to be OK."), std::string::npos) << result.output;
     EXPECT_NE(result.errors.find("history"), std::string::npos) << result.errors;
-}
-
-TEST_F(HistoryCommandTest, ADamagedDatabaseIsSaidAndTheCheckGoesOn)
-{
-    makeVolume("image");
-    static_cast<void>(run({"verify", "image"}));
-    write(path("state/orvane/history.sqlite3"), std::string(20'000, 'x'));
-    const RunResult result = run({"verify", "image"});
-    EXPECT_EQ(result.status, 0) << result.errors;
-    EXPECT_NE(result.errors.find("history"), std::string::npos) << result.errors;
-    EXPECT_EQ(verdicts("image"), std::vector<std::string>{"verify sound"}) << "a new one is begun";
 }
 
 }  // namespace

@@ -37,15 +37,12 @@ protected:
                    : "the system mounts no such volume here";
     }
 
-    nlohmann::json action(const char* name) const
-    {
-        const Events events(run({"list", "--json", device_->name()}).output);
-        return events.named("disk").at(0)["actions"][name];
-    }
+    /// Why the list says that this cannot be done; "none" where it can.
     std::string reasonAgainst(const char* name) const
     {
-        const nlohmann::json told = action(name);
-        return told["available"] ? "none" : told["reason"].get<std::string>();
+        const Events events(run({"list", "--json", device_->name()}).output);
+        const nlohmann::json action = events.named("disk").at(0)["actions"][name];
+        return action["available"] ? "none" : action["reason"].get<std::string>();
     }
 
     std::unique_ptr<LoopDevice> device_;
@@ -67,9 +64,7 @@ TEST_F(HomeVolumeTest, IsNotVerifiedWhereItIsExt4AndTheReasonIsTold)
     if (const char* const why = obstacle("ext4", "mkfs.ext4"))
         GTEST_SKIP() << why;
     EXPECT_NE(reasonAgainst("verify").find("only from a snapshot"), std::string::npos);
-    const RunResult result = run({"verify", device_->name()});
-    EXPECT_EQ(result.status, 8);
-    EXPECT_NE(result.errors.find("only from a snapshot"), std::string::npos) << result.errors;
+    EXPECT_EQ(run({"verify", device_->name()}).status, 8);
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "tests/support/ToolRun.h"
 #include "tests/terminal/ProgramTest.h"
 
 namespace orvane::test {
@@ -7,18 +6,6 @@ namespace {
 
 class PartitionMapTest : public ProgramTest {
 protected:
-    /// A disk of 16 MiB with a sound ext4 volume in its one partition.
-    std::filesystem::path makeDisk(std::string_view name, std::string_view label = "gpt") const
-    {
-        write(path(name), {});
-        std::filesystem::resize_file(path(name), 16 * mebibyte);
-        const std::string script = "label: " + std::string(label) + "\nstart=2048, size=16384\n";
-        if (runTool({"sfdisk", "-q", path(name)}, script) != 0)
-            throw std::runtime_error("cannot prepare the test: sfdisk failed");
-        patch(path(name), 1 * mebibyte, contentsOf(makeVolume("volume")));
-        return path(name);
-    }
-
     RunResult treat(const char* command, const std::string& disk) const
     {
         return run({command, "--partition-map", disk});
@@ -32,7 +19,7 @@ std::string zeros(std::size_t count)
 
 TEST_F(PartitionMapTest, ADamagedMapOfAnImageIsNamedWhateverElseIsChecked)
 {
-    const auto disk = makeDisk("disk.img");
+    const auto disk = makeDisk("disk.img", {makeVolume("volume")});
     const auto names = [this](const char* command) {
         const RunResult result = run({command, "disk.img"});
         return result.errors.find(
@@ -43,13 +30,13 @@ TEST_F(PartitionMapTest, ADamagedMapOfAnImageIsNamedWhateverElseIsChecked)
     patch(disk, 512, zeros(512));
     EXPECT_TRUE(names("verify")) << "its volume is checked, and the map is not";
     EXPECT_TRUE(names("list"));
-    patch(disk, 16 * mebibyte - 512, zeros(512));
+    patch(disk, 10 * mebibyte - 512, zeros(512));
     EXPECT_TRUE(names("verify")) << "neither copy says where its volume is";
 }
 
 TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)
 {
-    const auto disk = makeDisk("disk.img");
+    const auto disk = makeDisk("disk.img", {makeVolume("volume")});
     const std::string sound = contentsOf(disk);
     EXPECT_EQ(treat("verify", "disk.img").status, 0);
     EXPECT_EQ(treat("repair", "disk.img").status, 0) << "there is nothing to be done";
@@ -57,11 +44,10 @@ TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)
     EXPECT_FALSE(std::filesystem::exists(path("state/orvane/partition-maps")));
 
     patch(disk, 512, zeros(33 * 512));
-    const RunResult verified = treat("verify", "disk.img");
-    EXPECT_EQ(verified.status, 4) << verified.output << verified.errors;
-    EXPECT_NE(verified.output.find("The main copy of the partition map is missing."),
-              std::string::npos)
-        << verified.output;
+    EXPECT_EQ(treat("verify", "disk.img").status, 4);
+    const RunResult history = run({"history", "disk.img"});
+    EXPECT_NE(history.output.find("verify-partition-map damaged"), std::string::npos)
+        << history.output;
     const RunResult repaired = treat("repair", "disk.img");
     EXPECT_EQ(repaired.status, 1) << repaired.output << repaired.errors;
     EXPECT_NE(repaired.output.find("README.txt there tells how to put them back"),
@@ -74,11 +60,11 @@ TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)
 
 TEST_F(PartitionMapTest, OneJobTreatsSeveralDisksWhateverBecomesOfEach)
 {
-    const auto broken = makeDisk("broken.img");
-    makeDisk("sound.img", "dos");
+    const auto broken = makeDisk("broken.img", {makeVolume("volume")});
+    makeDisk("sound.img", {makeVolume("volume")}, "dos");
     makeVolume("bare.img");
     patch(broken, 1024, zeros(8));
-    patch(broken, 16 * mebibyte - 33 * 512, zeros(8));
+    patch(broken, 10 * mebibyte - 33 * 512, zeros(8));
     const std::string before = contentsOf(broken);
     const RunResult all =
         run({"repair", "--json", "--partition-map", "broken.img", "sound.img", "bare.img", "none"});
@@ -91,41 +77,10 @@ TEST_F(PartitionMapTest, OneJobTreatsSeveralDisksWhateverBecomesOfEach)
     EXPECT_TRUE(contentsOf(broken) == before);
 }
 
-// What libblkid calls no table at all is one that a person wants to hear about.
-TEST_F(PartitionMapTest, IsFoundWhereLittleIsLeftOfIt)
-{
-    struct Case {
-        std::string_view label;
-        std::uint64_t offset;
-        std::string bytes;
-        int status;
-        std::string_view says;
-    };
-    for (const Case& c :
-         {Case{"gpt", 0, zeros(34 * 512), 1, "was repaired successfully."},
-          Case{"dos", 446, "\x42", 4, "boot flag of partition 1 is neither on nor off"},
-          Case{"dos", 458, "\xFF\xFF\xFF\xFF", 4, "reaches beyond the end of the disk"}}) {
-        const auto disk = makeDisk("disk.img", c.label);
-        patch(disk, c.offset, c.bytes);
-        const RunResult result = treat("repair", "disk.img");
-        EXPECT_EQ(result.status, c.status) << c.says << result.output << result.errors;
-        EXPECT_NE(result.output.find(c.says), std::string::npos) << result.output;
-    }
-}
-
-TEST_F(PartitionMapTest, IsKeptInTheHistoryOfTheDisk)
-{
-    patch(makeDisk("disk.img"), 512, zeros(512));
-    EXPECT_EQ(treat("verify", "disk.img").status, 4);
-    const RunResult history = run({"history", "disk.img"});
-    EXPECT_NE(history.output.find("verify-partition-map damaged"), std::string::npos)
-        << history.output;
-}
-
 TEST_F(PartitionMapTest, SpeaksTheUsersLanguage)
 {
     environment_["LANGUAGE"] = "de";
-    patch(makeDisk("disk.img"), 512, zeros(512));
+    patch(makeDisk("disk.img", {makeVolume("volume")}), 512, zeros(512));
     const RunResult repaired = run({"repair", "--details", "--partition-map", "disk.img"});
     EXPECT_NE(repaired.output.find("Die Hauptkopie der Partitionstabelle fehlt."),
               std::string::npos)

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/terminal/Program.h"
 
+#include "pellar/process/FileDescriptor.h"
+
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <poll.h>
@@ -19,55 +21,27 @@
 namespace orvane::test {
 namespace {
 
-/// The words of a start as execve(2) wants them; borrows from the launch.
-class StartWords {
-public:
-    explicit StartWords(const Launch& launch)
-    {
-        words_.emplace_back("fixwell");
-        words_.insert(words_.end(), launch.arguments.begin(), launch.arguments.end());
-        for (const auto& [name, value] : launch.environment)
-            settings_.push_back(name + "=" + value);
-        point(words_, arguments_);
-        point(settings_, environment_);
-    }
-
-    [[noreturn]] void execute(const Launch& launch) const
-    {
-        const bool isAllowed =
-            !launch.user || ::setresuid(*launch.user, *launch.user, *launch.user) == 0;
-        if (isAllowed && (launch.directory.empty() || ::chdir(launch.directory.c_str()) == 0))
-            ::execve(TERMINAL_PROGRAM, arguments_.data(), environment_.data());
-        ::_exit(127);
-    }
-
-private:
-    static void point(std::vector<std::string>& texts, std::vector<char*>& pointers)
-    {
+/// In the child; the test has no threads, so it may allocate there.
+[[noreturn]] void execute(Launch launch)
+{
+    std::vector<std::string> settings;
+    for (const auto& [name, value] : launch.environment)
+        settings.push_back(name + "=" + value);
+    launch.arguments.insert(launch.arguments.begin(), "fixwell");
+    const auto pointersTo = [](std::vector<std::string>& texts) {
+        std::vector<char*> pointers;
         for (std::string& text : texts)
             pointers.push_back(text.data());
         pointers.push_back(nullptr);
-    }
-
-    std::vector<std::string> words_;
-    std::vector<std::string> settings_;
-    std::vector<char*> arguments_;
-    std::vector<char*> environment_;
-};
-
-struct Pipe {
-    Pipe()
-    {
-        int ends[2];
-        if (::pipe2(ends, O_CLOEXEC) != 0)
-            throw std::runtime_error("cannot make a pipe for the test");
-        reader = FileDescriptor(ends[0]);
-        writer = FileDescriptor(ends[1]);
-    }
-
-    FileDescriptor reader;
-    FileDescriptor writer;
-};
+        return pointers;
+    };
+    const bool isAllowed =
+        !launch.user || ::setresuid(*launch.user, *launch.user, *launch.user) == 0;
+    if (isAllowed && (launch.directory.empty() || ::chdir(launch.directory.c_str()) == 0))
+        ::execve(TERMINAL_PROGRAM, pointersTo(launch.arguments).data(),
+                 pointersTo(settings).data());
+    ::_exit(127);
+}
 
 }  // namespace
 
@@ -95,35 +69,34 @@ Program::~Program()
 
 void Program::startInPipes(const Launch& launch)
 {
-    const StartWords words(launch);
-    Pipe output;
-    Pipe errors;
-    const FileDescriptor nothing(::open("/dev/null", O_RDONLY | O_CLOEXEC));
-    const FileDescriptor full(::open("/dev/full", O_WRONLY | O_CLOEXEC));
+    auto output = pellar::makePipe();
+    auto errors = pellar::makePipe();
+    if (!output || !errors)
+        throw std::runtime_error("cannot make a pipe for the test");
     id_ = ::fork();
     if (id_ == 0) {
-        ::dup2(nothing.get(), STDIN_FILENO);
-        ::dup2(launch.output == Launch::Output::Full ? full.get() : output.writer.get(),
+        ::dup2(::open("/dev/null", O_RDONLY | O_CLOEXEC), STDIN_FILENO);
+        ::dup2(launch.output == Launch::Output::Full ? ::open("/dev/full", O_WRONLY | O_CLOEXEC)
+                                                     : output->writeEnd.get(),
                STDOUT_FILENO);
         if (launch.output == Launch::Output::Closed)
             ::close(STDOUT_FILENO);
-        ::dup2(errors.writer.get(), STDERR_FILENO);
-        words.execute(launch);
+        ::dup2(errors->writeEnd.get(), STDERR_FILENO);
+        execute(launch);
     }
-    output_ = std::move(output.reader);
-    errors_ = std::move(errors.reader);
+    output_ = std::move(output->readEnd);
+    errors_ = std::move(errors->readEnd);
 }
 
 void Program::startOnTerminal(const Launch& launch)
 {
-    const StartWords words(launch);
     winsize size{};
     size.ws_row = 24;
     size.ws_col = *launch.columns;
     int master = -1;
     id_ = ::forkpty(&master, nullptr, nullptr, &size);
     if (id_ == 0)
-        words.execute(launch);
+        execute(launch);
     ::fcntl(master, F_SETFD, FD_CLOEXEC);
     output_ = FileDescriptor(master);
 }

@@ -6,6 +6,7 @@
 #include <sys/prctl.h>
 #include <sys/wait.h>
 
+#include <algorithm>
 #include <csignal>
 #include <cstdlib>
 #include <fstream>
@@ -102,6 +103,24 @@ std::filesystem::path ProgramTest::makeDamagedVolume(std::string_view name,
     return image;
 }
 
+std::filesystem::path ProgramTest::makeDisk(std::string_view name,
+                                            const std::vector<std::filesystem::path>& volumes,
+                                            std::string_view label) const
+{
+    std::string script = "label: " + std::string(label) + "\n";
+    std::string contents(1 * mebibyte, '\0');
+    for (const std::filesystem::path& volume : volumes) {
+        const std::string bytes = contentsOf(volume);
+        script += "start=" + std::to_string(contents.size() / 512) +
+                  ", size=" + std::to_string(bytes.size() / 512) + "\n";
+        contents += bytes;
+    }
+    write(path(name), contents + std::string(1 * mebibyte, '\0'));
+    if (runTool({"sfdisk", "-q", path(name)}, script) != 0)
+        throw std::runtime_error("cannot prepare the test: sfdisk failed");
+    return path(name);
+}
+
 void ProgramTest::patch(const std::filesystem::path& image, std::uint64_t offset,
                         std::string_view bytes) const
 {
@@ -120,30 +139,63 @@ void ProgramTest::useTool(std::string_view script)
     environment_["FIXWELL_TOOL_PATH"] = path("tools");
 }
 
-std::vector<pid_t> strayProcesses()
-{
-    std::vector<pid_t> found;
-    const std::string self = std::to_string(::getpid());
-    std::ifstream children("/proc/self/task/" + self + "/children");
-    for (pid_t child = 0; children >> child;)
-        found.push_back(child);
-    return found;
-}
-
 // A tool whose program was killed is killed by the kernel a moment later: two seconds are waited,
-// and whoever is there then was left behind.
+// and what is there then was left behind.
 int endStrayProcesses()
 {
     constexpr std::chrono::milliseconds pause{20};
     for (int i = 0; i < 100 && ::waitpid(-1, nullptr, WNOHANG) >= 0; ++i)
         std::this_thread::sleep_for(pause);
-    const std::vector<pid_t> strays = strayProcesses();
-    for (const pid_t stray : strays)
-        ::kill(stray, SIGKILL);
+    std::ifstream children("/proc/self/task/" + std::to_string(::getpid()) + "/children");
+    for (pid_t child = 0; children >> child;)
+        ::kill(child, SIGKILL);
     int reaped = 0;
     while (::waitpid(-1, nullptr, 0) > 0)
         ++reaped;
     return reaped;
+}
+
+Events::Events(std::string_view output)
+{
+    for (const std::string& line : linesOf(output)) {
+        nlohmann::json event = nlohmann::json::parse(line, nullptr, false);
+        if (event.is_object() && event.contains("event"))
+            all_.push_back(std::move(event));
+        else
+            ADD_FAILURE() << "no event: " << line;
+    }
+}
+
+std::vector<nlohmann::json> Events::named(std::string_view event) const
+{
+    std::vector<nlohmann::json> found;
+    std::copy_if(all_.begin(), all_.end(), std::back_inserter(found),
+                 [event](const nlohmann::json& one) { return one["event"] == event; });
+    return found;
+}
+
+std::vector<std::string> Events::story(const std::vector<std::string>& names) const
+{
+    std::vector<std::string> story;
+    for (const nlohmann::json& event : all_) {
+        std::string line = event["event"];
+        if (std::find(names.begin(), names.end(), line) == names.end())
+            continue;
+        for (const char* key : {"disk", "verdict"})
+            if (event.contains(key))
+                line += " " + event[key].get<std::string>();
+        story.push_back(line);
+    }
+    return story;
+}
+
+std::vector<nlohmann::json> Events::recordsWith(std::string_view part) const
+{
+    std::vector<nlohmann::json> found = named("record");
+    std::erase_if(found, [part](const nlohmann::json& record) {
+        return record["text"].get<std::string>().find(part) == std::string::npos;
+    });
+    return found;
 }
 
 std::vector<std::string> linesOf(std::string_view text)

@@ -2,10 +2,10 @@
 #pragma once
 
 #include "tests/support/TemporaryDirectory.h"
-#include "tests/terminal/Events.h"
 #include "tests/terminal/Program.h"
 
 #include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
 
 #include <cstdint>
 #include <filesystem>
@@ -18,10 +18,22 @@ namespace orvane::test {
 
 inline constexpr std::uint64_t mebibyte = 1U << 20U;
 
-/// What a tool says that has checked everything and found nothing.
-inline const std::string soundRun =
-    "say Pass 1: Checking inodes, blocks, and sizes\n"
-    "say Disk: 11/2048 files (9.1% non-contiguous), 1618/8192 blocks\n";
+/// The events of a run with --json. A line that is no JSON object with an "event" fails the test.
+class Events {
+public:
+    explicit Events(std::string_view output);
+
+    const std::vector<nlohmann::json>& all() const { return all_; }
+    std::vector<nlohmann::json> named(std::string_view event) const;
+    std::size_t count(std::string_view event) const { return named(event).size(); }
+    /// "started a.img", "finished a.img sound", "alert", ...: the events of these names, in order.
+    std::vector<std::string> story(const std::vector<std::string>& names) const;
+    /// The records whose text holds `part`.
+    std::vector<nlohmann::json> recordsWith(std::string_view part) const;
+
+private:
+    std::vector<nlohmann::json> all_;
+};
 
 /// A user with a directory of images, who has never used the program before. When the test ends no
 /// process that came from it may be left.
@@ -51,6 +63,11 @@ protected:
     /// A volume that has lost its root directory.
     std::filesystem::path makeDamagedVolume(std::string_view name,
                                             const std::vector<std::string>& options = {}) const;
+    /// A disk with a partition of as many MiB for each volume, one after the other from the first
+    /// MiB on, and one MiB after the last.
+    std::filesystem::path makeDisk(std::string_view name,
+                                   const std::vector<std::filesystem::path>& volumes,
+                                   std::string_view label = "gpt") const;
     /// Replaces bytes of the file.
     void patch(const std::filesystem::path& image, std::uint64_t offset,
                std::string_view bytes) const;
@@ -68,9 +85,6 @@ protected:
 /// Ends all processes that were left to the test, and tells how many there were. Those that are
 /// about to end by themselves are waited for.
 int endStrayProcesses();
-/// The processes that have been left to the test and still run.
-std::vector<pid_t> strayProcesses();
-
 std::vector<std::string> linesOf(std::string_view text);
 std::size_t countOf(std::string_view part, std::string_view text);
 /// Whether a terminal would find something to obey in it, apart from line ends.

@@ -4,44 +4,31 @@
 namespace orvane::test {
 namespace {
 
-class QueueTest : public ProgramTest {
-protected:
-    void SetUp() override
-    {
-        ProgramTest::SetUp();
-        makeVolume("a");
-        makeDamagedVolume("b");
-        makeVolume("c");
-    }
-};
+using QueueTest = ProgramTest;
 
-TEST_F(QueueTest, EveryImageStartsAndFinishesInItsTurn)
+// Who reads along must be able to show each event with its disk.
+TEST_F(QueueTest, EveryImageIsTreatedInItsTurnWhateverBecomesOfTheOthers)
 {
-    const RunResult result = run({"verify", "--json", "a", "b", "c"});
-    EXPECT_EQ(result.status, 4);
+    makeVolume("a");
+    makeDamagedVolume("b");
+    makeVolume("c");
+    const RunResult result = run({"verify", "--details", "--json", "a", "missing", "b", "c"});
+    EXPECT_EQ(result.status, 4 | 8);
     EXPECT_EQ(result.errors, "");
-    const std::vector<std::string> story{
-        "started a", "finished a sound", "started b", "finished b damaged",
-        "started c", "finished c sound", "report",    "alert"};
-    EXPECT_EQ(Events(result.output).story({"started", "finished", "report", "alert"}), story);
-}
-
-TEST_F(QueueTest, TheOneAlertNamesTheImageAndTheRecordsTheirOwn)
-{
-    const Events events(run({"verify", "--json", "a", "b", "c"}).output);
-    ASSERT_EQ(events.count("alert"), 1U);
+    const Events events(result.output);
+    const std::vector<std::string> story{"finished missing failed",
+                                         "started a",
+                                         "finished a sound",
+                                         "started b",
+                                         "finished b damaged",
+                                         "started c",
+                                         "finished c sound",
+                                         "report",
+                                         "alert"};
+    EXPECT_EQ(events.story({"started", "finished", "report", "alert"}), story);
     const std::string title = events.named("alert").front()["title"];
     EXPECT_NE(title.find("“b”"), std::string::npos) << title;
-    for (const auto& record : events.recordsWith("Root inode"))
-        EXPECT_EQ(record["disk"], "b") << record;
-    for (const auto& record : events.recordsWith("appears to be OK."))
-        EXPECT_NE(record["disk"], "b") << record;
-    EXPECT_EQ(events.recordsWith("appears to be OK.").size(), 2U);
-}
 
-TEST_F(QueueTest, RecordsStandBetweenTheStartAndTheEndOfTheirImage)
-{
-    const Events events(run({"verify", "--details", "--json", "a", "b", "c"}).output);
     std::string current;
     for (const auto& event : events.all()) {
         if (event["event"] == "started")
@@ -52,34 +39,22 @@ TEST_F(QueueTest, RecordsStandBetweenTheStartAndTheEndOfTheirImage)
             EXPECT_EQ(event["disk"], current) << event;
         }
     }
-}
+    ASSERT_FALSE(events.recordsWith("Root inode").empty());
+    EXPECT_EQ(events.recordsWith("Root inode").front()["disk"], "b");
 
-// Who reads along must be able to show each progress with its disk.
-TEST_F(QueueTest, ProgressNamesTheImageItsStatusNames)
-{
-    const Events events(run({"verify", "--json", "a", "b", "c"}).output);
     ASSERT_GT(events.count("progress"), 0U);
     for (const auto& progress : events.named("progress")) {
         const std::string disk = progress["disk"];
         const std::string status = progress["status"];
-        EXPECT_FALSE(disk.empty()) << progress;
-        if (status.find("“") != std::string::npos) {
-            EXPECT_NE(status.find("“" + disk + "”"), std::string::npos) << progress;
-        }
+        EXPECT_TRUE(status.find("“") == std::string::npos ||
+                    status.find("“" + disk + "”") != std::string::npos)
+            << progress;
     }
-}
-
-TEST_F(QueueTest, ABadImageKeepsNoOtherFromBeingChecked)
-{
-    const RunResult result = run({"verify", "--json", "a", "missing", "c"});
-    EXPECT_EQ(result.status, 8);
-    const std::vector<std::string> story{"finished missing failed", "started a", "finished a sound",
-                                         "started c", "finished c sound"};
-    EXPECT_EQ(Events(result.output).story({"started", "finished"}), story);
 }
 
 TEST_F(QueueTest, AnImageThatIsNamedTwiceIsSound)
 {
+    makeVolume("a");
     const RunResult result = run({"verify", "a", "a", path("a")});
     EXPECT_EQ(result.status, 0) << result.output << result.errors;
 }

@@ -82,32 +82,44 @@ QtButton::~QtButton()
 
 void QtButton::setToolTip(std::string_view text)
 {
-    if (toolTip_ == text)
-        return;
-    toolTip_ = text;
-    reason_.clear();
-    showToolTip();
+    setModuleText(toolTip_, text);
 }
 
 void QtButton::setReason(std::string_view reason)
 {
-    if (widget_.isEnabled() || reason_ == reason)
+    setModuleText(reason_, reason);
+}
+
+void QtButton::setModuleText(std::string& text, std::string_view value)
+{
+    if (text == value)
         return;
-    reason_ = reason;
+    text = value;
+    hostReason_.clear();
+    showToolTip();
+}
+
+void QtButton::setHostReason(std::string_view reason)
+{
+    if (widget_.isEnabled() || hostReason_ == reason)
+        return;
+    hostReason_ = reason;
     showToolTip();
 }
 
 void QtButton::setEnabled(bool isEnabled)
 {
     widget_.setEnabled(isEnabled);
-    if (isEnabled && !std::exchange(reason_, {}).empty())
+    if (isEnabled && !std::exchange(hostReason_, {}).empty())
         showToolTip();
 }
 
 void QtButton::showToolTip()
 {
-    const std::string between = reason_.empty() || toolTip_.empty() ? "" : "\n\n";
-    const std::string text = toolTip_ + between + reason_;
+    std::string text = toolTip_;
+    for (const std::string& reason : {reason_, hostReason_})
+        if (!reason.empty())
+            text += (text.empty() ? "" : "\n\n") + reason;
     widget_.setToolTip(toQtToolTip(text));
     widget_.setAccessibleDescription(toQt(text));
 }

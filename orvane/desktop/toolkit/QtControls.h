@@ -99,14 +99,15 @@ public:
     void setIntegerValue(std::int64_t value) override { widget_.setChecked(value != 0); }
     void setKeyEquivalent(std::string_view key) override;
     void setTag(std::int64_t tag) override { tag_ = tag; }
+    void setReason(std::string_view reason) override;
 
     contract::Selector action() const { return action_; }
     /// As the module gave it, without the escapes that the widget needs.
     const std::string& title() const { return title_; }
-    const std::string& toolTip() const { return toolTip_; }
-    /// What the host has to say about why the button is grey, behind the module's tooltip; until
+    const std::string& reason() const { return reason_; }
+    /// What the host has to say about why the button is grey, behind the module's reason; until
     /// the module says something else, or the button can be pressed again.
-    void setReason(std::string_view reason);
+    void setHostReason(std::string_view reason);
     std::int64_t tag() const { return tag_; }
     bool isChecked() const { return widget_.isChecked(); }
     /// Return presses it.
@@ -117,6 +118,7 @@ public:
     void press() { widget_.click(); }
 
 private:
+    void setModuleText(std::string& text, std::string_view value);
     void showToolTip();
 
     QAbstractButton& widget_;
@@ -125,6 +127,7 @@ private:
     std::string title_;
     std::string toolTip_;
     std::string reason_;
+    std::string hostReason_;
     std::int64_t tag_ = 0;
     bool isDefault_ = false;
 };

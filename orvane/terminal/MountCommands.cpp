@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "contract/foundation/UTF8.h"
 #include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/DiskOperations.h"
-#include "orvane/terminal/ExitStatus.h"
-#include "orvane/terminal/commands/Commands.h"
+#include "orvane/terminal/Commands.h"
 #include "pellar/volumes/DiskUse.h"
 
 #include <sys/stat.h>
@@ -17,15 +15,14 @@ namespace {
 struct ActionText {
     Command command;
     DiskAction action;
-    const char* name;
     const char* done;  ///< with the disk's name and, when it was mounted, the place
 };
 
 constexpr std::array actionTexts{
-    ActionText{Command::Mount, DiskAction::Mount, "mount", "“%@” is mounted at %@."},
-    ActionText{Command::Unmount, DiskAction::Unmount, "unmount", "“%@” is not mounted any more."},
-    ActionText{Command::Eject, DiskAction::Eject, "eject", "“%@” was ejected."},
-    ActionText{Command::Detach, DiskAction::Detach, "detach", "“%@” was detached."}};
+    ActionText{Command::Mount, DiskAction::Mount, "“%@” is mounted at %@."},
+    ActionText{Command::Unmount, DiskAction::Unmount, "“%@” is not mounted any more."},
+    ActionText{Command::Eject, DiskAction::Eject, "“%@” was ejected."},
+    ActionText{Command::Detach, DiskAction::Detach, "“%@” was detached."}};
 
 const ActionText& textsOf(Command command)
 {
@@ -49,7 +46,7 @@ std::string placeOf(const Disk& disk)
     return places.empty() ? std::string() : places.front().target;
 }
 
-/// What may want a password, with somebody there to ask for it.
+/// Runs what may need a password, with a password agent present.
 template <class Function>
 auto askingFor(const Function& function, Session& session)
 {
@@ -66,7 +63,7 @@ bool isAsWanted(const Result<void, Refusal>& answer)
 
 int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Reporter& reporter)
 {
-    const Translator& translator = session.host().translator();
+    const Translator& translator = session.texts();
     const DiskRequest request = requestFor(texts.action, *named.disk);
     const auto objection = objectionTo(texts.action, *named.disk);
     const auto answer = objection ? Result<void, Refusal>(*objection)
@@ -77,7 +74,7 @@ int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Repo
     }
     const std::string place =
         texts.action == DiskAction::Mount ? placeOf(*named.disk) : std::string();
-    reporter.done(named.name, texts.name, place,
+    reporter.done(named.name, nameOf(texts.command), place,
                   translator.sentence(texts.done, {request.name, place}));
     return exitSound;
 }
@@ -88,7 +85,7 @@ int runDiskAction(const Request& request, Session& session, Reporter& reporter)
 {
     int status = exitSound;
     const auto meant = request.command == Command::Detach ? deviceBehind : nullptr;
-    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status, meant))
+    for (const NamedDisk& named : session.findDisks(request.disks, status, meant))
         status |= doTo(named, textsOf(request.command), session, reporter);
     return status;
 }
@@ -101,14 +98,13 @@ int runAttach(const Request& request, Session& session, Reporter& reporter)
     for (const std::string& name : request.disks) {
         const auto answer = askingFor([&] { return attachImage(name, access); }, session);
         if (!answer) {
-            reporter.failure(
-                name, failureText(requestToAttach(name), answer.error(), session.host().translator()));
+            reporter.failure(name,
+                             failureText(requestToAttach(name), answer.error(), session.texts()));
             status |= exitUnchecked;
             continue;
         }
         // The device alone, for scripts.
-        const auto& node = *answer;
-        reporter.done(name, "attach", node, node);
+        reporter.done(name, "attach", *answer, *answer);
     }
     return status;
 }

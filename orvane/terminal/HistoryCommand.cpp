@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/terminal/commands/Commands.h"
-#include "orvane/terminal/commands/LocalTime.h"
+#include "orvane/terminal/Commands.h"
+#include "orvane/terminal/TerminalText.h"
 
 #include <algorithm>
 #include <utility>
@@ -24,13 +24,13 @@ std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Ses
                      [](const auto& a, const auto& b) { return a.first < b.first; });
     std::vector<RunLine> lines;
     for (const auto& [time, run] : runs)
-        lines.push_back({localTime(run.started), run.action, run.verdict(),
-                         run.end ? run.end->message : ""});
+        lines.push_back(
+            {localTime(run.started), run.action, run.verdict(), run.end ? run.end->message : ""});
     return lines;
 }
 
-// The module leaves out the disks of a failing drive, on which nothing is to be done. Their history is
-// wanted most of all, and looking at it does nothing to them.
+// The module leaves out the disks of a failing drive, on which nothing is to be done. Their history
+// is wanted most of all, and looking at it does nothing to them.
 void forgetFailure(const std::shared_ptr<Disk>& disk)
 {
     DiskFacts facts = disk->facts();
@@ -43,24 +43,23 @@ void forgetFailure(const std::shared_ptr<Disk>& disk)
 int runHistory(const Request& request, Session& session, Reporter& reporter)
 {
     int status = 0;
-    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
-        const std::shared_ptr<Disk> top = session.attach(named.disk);
-        const std::shared_ptr<Disk> shown = top ? top : named.disk;
-        std::vector<std::shared_ptr<Disk>> selection = withParts(shown);
-        // What was said of the image as a file is its history, too.
-        if (top)
+    for (const NamedDisk& named : session.findDisks(request.disks, status)) {
+        const AttachedImage image(session, named.disk);
+        std::vector<std::shared_ptr<Disk>> selection =
+            withParts(image.top() ? image.top() : named.disk);
+        // The records of the image as a file belong to its history, too.
+        if (image.top())
             selection.push_back(named.disk);
         std::for_each(selection.begin(), selection.end(), forgetFailure);
         session.select({named.disk});
         if (request.clearsHistory) {
             // A volume's history is its own to clear, the whole disk's alone would leave it.
             session.select(selection);
-            session.pressAndWait(session.button("clearHistoryButton"));
+            session.pressAndWait(session.button(contract::outlet::clearHistory));
         } else {
             reporter.runs(named.name, runsOf(selection, session));
             session.writeAllRowsOf(named.name);
         }
-        session.detach(top);
     }
     return status;
 }

@@ -1,23 +1,22 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/terminal/Interface.h"
+#include "orvane/terminal/TerminalToolkit.h"
+
+#include "contract/toolkit/ControlNames.h"
 
 namespace orvane {
 namespace {
 
-/// What the interface file says of a button; the module sets the others itself.
+/// The actions that the interface file gives to buttons; the module sets the others itself.
 contract::Selector actionInFile(std::string_view outlet)
 {
-    if (outlet == "showDetailsButton")
-        return "showDetailsAction:";
-    return outlet == "clearHistoryButton" ? "clearHistoryAction:" : "";
+    if (outlet == contract::outlet::showDetails)
+        return contract::selector::showDetails;
+    return outlet == contract::outlet::clearHistory ? contract::selector::clearHistory : "";
 }
-
-// The one custom view that a log's interface file names.
-constexpr std::string_view logViewClass = "OVFXWMessageOutlineView";
 
 }  // namespace
 
-bool Interface::loadInterface(std::string_view /*name*/, contract::InterfaceOwner& owner)
+bool TerminalInterface::loadInterface(std::string_view /*name*/, contract::InterfaceOwner& owner)
 {
     owner_ = &owner;
     for (const contract::Outlet& outlet : owner.outlets())
@@ -26,7 +25,7 @@ bool Interface::loadInterface(std::string_view /*name*/, contract::InterfaceOwne
     return true;
 }
 
-void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
+void TerminalInterface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
 {
     if (auto* const button = std::get_if<contract::Button**>(&outlet.place)) {
         TerminalButton& made = buttons_[std::string(outlet.name)];
@@ -37,7 +36,7 @@ void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner
     } else if (auto* const view = std::get_if<contract::TextView**>(&outlet.place)) {
         **view = &textView_;
     } else {
-        outlineView_ = owner.makeOutlineView(logViewClass, logView_);
+        outlineView_ = owner.makeOutlineView(contract::messageOutlineViewClass, logView_);
         if (!outlineView_)
             return;
         outlineView_->setDataSource(owner.outlineViewDelegate());
@@ -46,19 +45,19 @@ void Interface::connect(const contract::Outlet& outlet, contract::InterfaceOwner
     }
 }
 
-void Interface::disconnect(contract::InterfaceOwner& owner)
+void TerminalInterface::disconnect(contract::InterfaceOwner& owner)
 {
     if (owner_ == &owner)
         owner_ = nullptr;
 }
 
-TerminalButton* Interface::button(std::string_view outlet)
+TerminalButton& TerminalInterface::button(std::string_view outlet)
 {
     const auto found = buttons_.find(outlet);
-    return found == buttons_.end() ? nullptr : &found->second;
+    return found == buttons_.end() ? missingButton_ : found->second;
 }
 
-bool Interface::press(TerminalButton& button)
+bool TerminalInterface::press(TerminalButton& button)
 {
     return button.isEnabled() && owner_ != nullptr && owner_->perform(button.action(), &button);
 }

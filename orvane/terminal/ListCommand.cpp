@@ -1,10 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "contract/foundation/UTF8.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskFacts.h"
-#include "orvane/terminal/commands/ActionButtons.h"
-#include "orvane/terminal/commands/Commands.h"
-#include "orvane/terminal/commands/LocalTime.h"
+#include "orvane/terminal/Commands.h"
+#include "orvane/terminal/TerminalText.h"
 
 namespace orvane {
 namespace {
@@ -29,7 +27,7 @@ std::vector<ActionLine> actionsFor(const std::shared_ptr<Disk>& disk, Session& s
     std::vector<ActionLine> lines;
     for (const ActionButton& action : actionButtons) {
         const TerminalButton& button = session.button(action.outlet);
-        lines.push_back({action.name, button.title(), button.isEnabled(),
+        lines.push_back({std::string(nameOf(action.command)), button.title(), button.isEnabled(),
                          button.isEnabled() ? "" : unavailableReason(session, button, *disk)});
     }
     return lines;
@@ -41,7 +39,7 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     DiskLine line;
     line.disk = session.names().nameOf(facts.identifier);
     line.name = disk->displayName();
-    line.kind = session.host().translator().text(kindText(facts.type));
+    line.kind = session.texts().text(kindText(facts.type));
     line.filesystem = facts.filesystem;
     line.bytes = facts.length;
     line.mountPoint = facts.mountPoint;
@@ -71,7 +69,8 @@ void listTree(const std::shared_ptr<Disk>& disk, bool isVolume, Session& session
 /// What an image holds is shown below it; commands take the image, and treat every volume of it.
 void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
 {
-    const std::shared_ptr<Disk> top = session.attach(image.disk);
+    const AttachedImage attached(session, image.disk);
+    const std::shared_ptr<Disk>& top = attached.top();
     DiskLine line = describe(image.disk, session);
     line.actions = actionsFor(image.disk, session);
     if (top && top->parts().empty()) {
@@ -83,17 +82,17 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
         line.later = volume.later;
     }
     reporter.listed(line);
-    for (const std::shared_ptr<Disk>& part :
-         top ? top->parts() : std::vector<std::shared_ptr<Disk>>()) {
+    if (!top)
+        return;
+    for (const std::shared_ptr<Disk>& part : top->parts()) {
         if (!part->facts().isShown)
             continue;
         DiskLine volume = describe(part, session);
         volume.isVolume = true;
         reporter.listed(volume);
     }
-    if (top && top->facts().hasDamagedMap)
+    if (top->facts().hasDamagedMap)
         reporter.warning(damagedMapSentence(session, image));
-    session.detach(top);
 }
 
 }  // namespace
@@ -107,7 +106,7 @@ int runList(const Request& request, Session& session, Reporter& reporter)
             listTree(disk, false, session, reporter);
         return status;
     }
-    for (const NamedDisk& named : findDisks(request.disks, session, reporter, status)) {
+    for (const NamedDisk& named : session.findDisks(request.disks, status)) {
         if (named.disk->isOfflineDiskImage())
             listImage(named, session, reporter);
         else

@@ -1,9 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "orvane/privileges/HelperRequest.h"
+#include "orvane/privileges/HelperProtocol.h"
+
+#include "orvane/privileges/CheckedText.h"
+#include "orvane/support/settings/ValueJSON.h"
 
 #include <algorithm>
 #include <array>
-#include <charconv>
 #include <limits>
 #include <optional>
 #include <span>
@@ -15,7 +17,7 @@ namespace {
 using pellar::Operation;
 using pellar::Subject;
 using Arguments = std::span<const std::string>;
-using Read = std::variant<HelperRequest, std::string>;
+using Read = pellar::Result<HelperRequest, const char*>;
 
 struct Task {
     std::string_view word;
@@ -54,33 +56,12 @@ const Task* taskOf(const HelperRequest& request)
     });
 }
 
-bool consistsOf(std::string_view text, std::string_view allowed, std::size_t longest)
-{
-    const auto isAllowed = [allowed](char character) {
-        const bool isLetter = (character >= 'a' && character <= 'z') ||
-                              (character >= 'A' && character <= 'Z') ||
-                              (character >= '0' && character <= '9');
-        return isLetter || allowed.find(character) != std::string_view::npos;
-    };
-    return text.size() <= longest && std::all_of(text.begin(), text.end(), isAllowed);
-}
-
 // Canonical, so that no link of another user's is followed as root.
 bool isCanonicalDevice(const std::string& path)
 {
     return path.starts_with("/dev/") && path.find("//") == std::string::npos &&
            path.find("/./") == std::string::npos && path.find("/../") == std::string::npos &&
            !path.ends_with('/') && !path.ends_with("/..") && !path.ends_with("/.");
-}
-
-/// Digits and nothing else, at most `largest`.
-std::optional<std::uint64_t> numberIn(const std::string& text, std::uint64_t largest)
-{
-    std::uint64_t number = 0;
-    const char* const end = text.data() + text.size();
-    const auto [rest, error] = std::from_chars(text.data(), end, number);
-    const bool isNumber = error == std::errc() && rest == end;
-    return isNumber && number <= largest ? std::optional(number) : std::nullopt;
 }
 
 /// IDENTIFIER NAME FILESYSTEM LANGUAGES
@@ -108,13 +89,13 @@ Read readRegion(Arguments arguments)
     const Task* const task = taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
     if (task == nullptr || task->subject != Subject::Filesystem)
         return "unknown operation";
-    const auto image = numberIn(arguments[1], std::numeric_limits<int>::max());
-    const auto offset = numberIn(arguments[2], largest);
-    const auto length = numberIn(arguments[3], largest);
-    if (!image || !offset || !length || *length == 0 || *length > largest - *offset)
+    const auto image = numberIn<int>(arguments[1]);
+    const auto offset = numberIn<std::uint64_t>(arguments[2]);
+    const auto length = numberIn<std::uint64_t>(arguments[3]);
+    if (!image || *image < 0 || !offset || *offset > largest || !length || *length == 0 ||
+        *length > largest - *offset)
         return "no region of a file";
-    HelperRequest request{task->subject, task->operation, {}, {}, static_cast<int>(*image), {},
-                          false};
+    HelperRequest request{.subject = task->subject, .operation = task->operation, .image = *image};
     request.disk.storage = contract::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
@@ -140,13 +121,77 @@ std::string acceptedLanguages(std::string_view list)
     return accepted;
 }
 
+using nlohmann::json;
+
+json jsonFromText(const std::string& text)
+{
+    return jsonFromValue(contract::Value(std::string_view(text)));
+}
+
+json jsonFromDictionary(const contract::Dictionary& dictionary)
+{
+    return dictionary ? jsonFromValue(contract::Value(dictionary)) : json();
+}
+
+struct EventWriter {
+    json operator()(const pellar::Started&) const { return json::array({"started"}); }
+    json operator()(const pellar::Message& message) const
+    {
+        return json::array(
+            {"message", jsonFromText(message.text), jsonFromDictionary(message.dictionary)});
+    }
+    json operator()(const pellar::Trace& trace) const
+    {
+        return json::array({"trace", jsonFromText(trace.line)});
+    }
+    json operator()(const pellar::Finished& finished) const
+    {
+        return json::array({"finished", finished.mainError, finished.detailError,
+                            jsonFromDictionary(finished.result)});
+    }
+};
+
+std::string textFromJSON(const json& part)
+{
+    return std::string(valueFromJSON(part).string());
+}
+
+std::optional<pellar::Event> eventFromJSON(const json& parts)
+{
+    const auto& kind = parts.at(0).get_ref<const std::string&>();
+    if (kind == "started")
+        return pellar::Started{};
+    if (kind == "message")
+        return pellar::Message{textFromJSON(parts.at(1)), valueFromJSON(parts.at(2)).dictionary()};
+    if (kind == "trace")
+        return pellar::Trace{textFromJSON(parts.at(1))};
+    if (kind == "finished")
+        return pellar::Finished{parts.at(1).get<std::int32_t>(), parts.at(2).get<std::int32_t>(),
+                                valueFromJSON(parts.at(3)).dictionary()};
+    return std::nullopt;
+}
+
+std::string_view attemptOf(const HelperRequest& request)
+{
+    const bool isRepair = request.operation == pellar::Operation::Repair;
+    if (request.subject == Subject::Permissions)
+        return isRepair ? "cannot repair the permissions on “%1$@”: %2$@"
+                        : "cannot verify the permissions on “%1$@”: %2$@";
+    if (request.subject == Subject::PartitionMap)
+        return isRepair ? "cannot repair the partition map of “%1$@”: %2$@"
+                        : "cannot verify the partition map of “%1$@”: %2$@";
+    return isRepair ? "cannot repair “%1$@”: %2$@" : "cannot verify “%1$@”: %2$@";
+}
+
 }  // namespace
 
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
-    HelperRequest request{
-        job.subject,        job.operation, job.disk, {}, -1, acceptedLanguages(languages),
-        job.fetchesArchives};
+    HelperRequest request{.subject = job.subject,
+                          .operation = job.operation,
+                          .disk = job.disk,
+                          .languages = acceptedLanguages(languages),
+                          .fetchesArchives = job.fetchesArchives};
     if (!job.image) {
         request.identity = identityOf(job.disk.path);
         return request;
@@ -193,7 +238,8 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
     const auto identity = DiskIdentity::fromText(arguments[2]);
     if (!identity)
         return "it is not said which disk is meant";
-    HelperRequest request{task->subject, task->operation, {}, *identity, -1, {}, false};
+    HelperRequest request{
+        .subject = task->subject, .operation = task->operation, .identity = *identity};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
     Arguments texts = Arguments(arguments).subspan(3);
@@ -201,6 +247,32 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
         task->subject == Subject::Permissions && !texts.empty() && texts.back() == fetching;
     return withTexts(std::move(request),
                      texts.first(texts.size() - (request.fetchesArchives ? 1 : 0)));
+}
+
+std::string lineFromEvent(const pellar::Event& event)
+{
+    return std::visit(EventWriter{}, event).dump();
+}
+
+std::optional<pellar::Event> eventFromLine(std::string_view line)
+{
+    const json parts = parsedJSON(line);
+    if (!parts.is_array() || parts.empty())
+        return std::nullopt;
+    try {
+        return eventFromJSON(parts);
+    } catch (const json::exception&) {
+        return std::nullopt;
+    }
+}
+
+void reportFailure(const JobFailure& failure, const HelperRequest& request,
+                   const pellar::Texts& texts, pellar::JobLog& log)
+{
+    const std::string message =
+        pellar::Sentence{attemptOf(request), log.diskName(), failure.reason.in(texts)}.in(texts);
+    log.failure(message);
+    log.finished(failure.error, 0, failure.verdict, message);
 }
 
 }  // namespace orvane

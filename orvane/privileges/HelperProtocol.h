@@ -2,12 +2,19 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/DiskIdentity.h"
+#include "pellar/jobs/Event.h"
+#include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/outcome/Result.h"
 
+#include <filesystem>
 #include <functional>
+#include <optional>
 #include <string>
-#include <variant>
+#include <string_view>
 #include <vector>
 
 namespace orvane {
@@ -17,24 +24,14 @@ struct HelperRequest {
     pellar::Subject subject = pellar::Subject::Filesystem;
     pellar::Operation operation = pellar::Operation::Verify;
     /// A block device; or, without a path, a region of an image file.
-    contract::DiskReference disk;
-    DiskIdentity identity;  ///< of the block device
-    int image = -1;         ///< the image's descriptor in the program that asks; -1 for a device
-    std::string languages;  ///< for the texts; empty for English
+    contract::DiskReference disk = {};
+    DiskIdentity identity = {};  ///< of the block device
+    int image = -1;  ///< the image's descriptor in the program that asks; -1 for a device
+    std::string languages = {};  ///< for the texts; empty for English
     /// Archives of packages may be fetched over the network; for permissions alone.
     bool fetchesArchives = false;
 
     bool isOnImage() const { return image >= 0; }
-
-    friend bool operator==(const HelperRequest& a, const HelperRequest& b)
-    {
-        return a.subject == b.subject && a.operation == b.operation && a.image == b.image &&
-               a.disk.path == b.disk.path && a.disk.offset == b.disk.offset &&
-               a.disk.length == b.disk.length && a.disk.identifier == b.disk.identifier &&
-               a.disk.name == b.disk.name && a.disk.filesystem == b.disk.filesystem &&
-               a.disk.isWhole == b.disk.isWhole && a.identity == b.identity &&
-               a.languages == b.languages && a.fetchesArchives == b.fetchesArchives;
-    }
 };
 
 /// What has to be asked for a job, on the disk that has its name now.
@@ -46,12 +43,28 @@ struct HelperRequest {
 /// administrator is shown.
 [[nodiscard]] std::vector<std::string> argumentsOf(const HelperRequest& request);
 
-/// What the arguments ask for, or why they are refused. They come from a program that may be
-/// anybody's: nothing is taken but a block device below /dev by its own name, or the number of a
+/// What the arguments ask for, or why they are refused. They come from a program of any
+/// user's: nothing is taken but a block device below /dev by its own name, or the number of a
 /// descriptor and a region, and names that cannot do harm. `isBlockDevice` answers for a path that
 /// leads through no link.
-[[nodiscard]] std::variant<HelperRequest, std::string> readHelperArguments(
+[[nodiscard]] pellar::Result<HelperRequest, const char*> readHelperArguments(
     const std::vector<std::string>& arguments,
     const std::function<bool(const std::filesystem::path&)>& isBlockDevice);
+
+/// A job's event as one line of JSON without its end, and back. What a line of another program
+/// holds is no event.
+[[nodiscard]] std::string lineFromEvent(const pellar::Event& event);
+[[nodiscard]] std::optional<pellar::Event> eventFromLine(std::string_view line);
+
+/// How a job ends that was not done.
+struct JobFailure {
+    contract::ErrorCode error;
+    pellar::Sentence reason;
+    contract::Name verdict = contract::kPLVerdictFailed;
+};
+
+/// "cannot repair “NAME”: REASON", in the log and as the job's end, which has begun.
+void reportFailure(const JobFailure& failure, const HelperRequest& request,
+                   const pellar::Texts& texts, pellar::JobLog& log);
 
 }  // namespace orvane

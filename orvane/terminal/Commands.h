@@ -1,0 +1,27 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "orvane/terminal/Session.h"
+
+#include <string>
+
+namespace orvane {
+
+// Each command answers the exit status.
+
+/// Verify or repair: all disks together as one job, as if they were selected in a window.
+int runCheck(const Request& request, Session& session, Reporter& reporter);
+int runList(const Request& request, Session& session, Reporter& reporter);
+int runHistory(const Request& request, Session& session, Reporter& reporter);
+/// Mount, unmount, eject or detach: one disk after the other.
+int runDiskAction(const Request& request, Session& session, Reporter& reporter);
+int runAttach(const Request& request, Session& session, Reporter& reporter);
+
+/// Why the button cannot be pressed for the selected disk: that its drive is failing, the module's
+/// reason, or that there is none to be had.
+std::string unavailableReason(Session& session, const TerminalButton& button, const Disk& disk);
+
+/// That an image's partition map is damaged, and what can be done about it.
+std::string damagedMapSentence(Session& session, const NamedDisk& image);
+
+}  // namespace orvane
