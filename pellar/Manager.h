@@ -5,7 +5,7 @@
 #include "contract/pellar/PLRepairDisk.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/texts/Texts.h"
-#include "pellar/tools/Operation.h"
+#include "pellar/outcome/Operation.h"
 
 #include <memory>
 #include <string>

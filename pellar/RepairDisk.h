@@ -7,7 +7,7 @@
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobScript.h"
 #include "pellar/texts/Texts.h"
-#include "pellar/tools/Operation.h"
+#include "pellar/outcome/Operation.h"
 
 #include <memory>
 #include <vector>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/mounts/UnmountedDisk.h"
 #include "pellar/process/Access.h"
 #include "pellar/volumes/DiskClaim.h"

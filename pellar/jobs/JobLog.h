@@ -7,7 +7,7 @@
 #include "pellar/jobs/ProblemLimiter.h"
 #include "pellar/jobs/ProgressMeter.h"
 #include "pellar/texts/Sentence.h"
-#include "pellar/tools/Judgement.h"
+#include "pellar/outcome/Judgement.h"
 
 #include <string>
 #include <string_view>

@@ -5,7 +5,7 @@
 
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/jobs/Meaning.h"
+#include "pellar/outcome/Damage.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
 #include "pellar/tools/Capability.h"

@@ -5,7 +5,7 @@
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobDisk.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Tool.h"

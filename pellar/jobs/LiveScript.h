@@ -4,7 +4,7 @@
 #include "contract/pellar/DiskReference.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/mounts/MountPlace.h"
 #include "pellar/process/ProcessRunner.h"

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 
 namespace pellar {
 

@@ -3,7 +3,7 @@
 
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/permissions/Comparison.h"
 #include "pellar/permissions/Inspection.h"

@@ -3,7 +3,7 @@
 
 #include "contract/pellar/DiskReference.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/tools/Operation.h"
+#include "pellar/outcome/Operation.h"
 #include "pellar/volumes/DiskClaim.h"
 
 #include <functional>

@@ -3,7 +3,7 @@
 
 #include "pellar/permissions/Inspection.h"
 #include "pellar/texts/Sentence.h"
-#include "pellar/tools/Judgement.h"
+#include "pellar/outcome/Judgement.h"
 
 #include <cstdint>
 #include <vector>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/process/ProcessRunner.h"
-#include "pellar/tools/Judgement.h"
+#include "pellar/outcome/Judgement.h"
 
 #include <cstdint>
 #include <string>

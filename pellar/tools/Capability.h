@@ -3,7 +3,7 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "pellar/texts/Sentence.h"
-#include "pellar/tools/Operation.h"
+#include "pellar/outcome/Operation.h"
 
 #include <filesystem>
 #include <string_view>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/tools/Damage.h"
+#include "pellar/outcome/Damage.h"
 
 #include <string_view>
 

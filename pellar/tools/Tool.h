@@ -3,8 +3,8 @@
 
 #include "pellar/process/Access.h"
 #include "pellar/process/ProcessRunner.h"
-#include "pellar/tools/Damage.h"
-#include "pellar/tools/Judgement.h"
+#include "pellar/outcome/Damage.h"
+#include "pellar/outcome/Judgement.h"
 #include "pellar/volumes/Readability.h"
 
 #include <cstdint>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 
 #include "contract/pellar/ErrorCodes.h"
 

@@ -3,8 +3,8 @@
 
 #include "contract/foundation/Name.h"
 #include "pellar/texts/Texts.h"
-#include "pellar/tools/Judgement.h"
-#include "pellar/tools/Operation.h"
+#include "pellar/outcome/Judgement.h"
+#include "pellar/outcome/Operation.h"
 
 #include <cstdint>
 #include <optional>

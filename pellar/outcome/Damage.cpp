@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/Meaning.h"
+#include "pellar/outcome/Damage.h"
 
 #include <array>
 

@@ -2,6 +2,8 @@
 #pragma once
 
 #include <cstdint>
+#include <string_view>
+#include <vector>
 
 namespace pellar {
 
@@ -31,5 +33,9 @@ public:
 private:
     std::uint8_t kinds_ = 0;
 };
+
+/// What damage means to the owner of the files, gravest first: English texts, and text keys.
+/// They speak of a repair only where there is one.
+std::vector<std::string_view> meaningOf(Damage damage, bool canBeRepaired = true);
 
 }  // namespace pellar
