@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/SystemPaths.h"
 #include "pellar/jobs/PrivilegedJob.h"
 #include "pellar/process/OutputBudget.h"
-#include "pellar/volumes/SystemPaths.h"
 
 #include <chrono>
 #include <filesystem>

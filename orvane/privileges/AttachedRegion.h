@@ -4,7 +4,7 @@
 #include "orvane/privileges/HelperRequest.h"
 #include "orvane/privileges/UndoneJob.h"
 #include "orvane/support/files/FileDescriptor.h"
-#include "pellar/volumes/LoopDevice.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <variant>
 

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/mounts/UnmountedDisk.h"
 #include "pellar/process/Access.h"
-#include "pellar/volumes/DiskClaim.h"
 
 #include <optional>
 #include <vector>

@@ -5,16 +5,16 @@
 
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
+#include "pellar/bytes/Bytes.h"
+#include "pellar/disks/DiskForTool.h"
+#include "pellar/jobs/LogReplay.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
+#include "pellar/probe/SignatureProbe.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
-#include "pellar/volumes/DiskBytes.h"
-#include "pellar/volumes/DiskForTool.h"
-#include "pellar/volumes/LogReplay.h"
-#include "pellar/volumes/SignatureProbe.h"
 
 #include <algorithm>
 #include <chrono>

@@ -6,7 +6,7 @@
 #include "pellar/jobs/DiskNaming.h"
 #include "pellar/jobs/OutcomeReport.h"
 #include "pellar/tools/LiveVerification.h"
-#include "pellar/volumes/BtrfsSuperblock.h"
+#include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>

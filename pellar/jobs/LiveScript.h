@@ -8,8 +8,8 @@
 #include "pellar/jobs/Script.h"
 #include "pellar/mounts/MountPlace.h"
 #include "pellar/process/ProcessRunner.h"
-#include "pellar/tools/BtrfsScrub.h"
-#include "pellar/volumes/MountedBtrfs.h"
+#include "pellar/tools/btrfs/BtrfsScrub.h"
+#include "pellar/tools/btrfs/MountedBtrfs.h"
 
 #include <filesystem>
 #include <optional>

@@ -2,9 +2,9 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/Script.h"
 #include "pellar/outcome/Operation.h"
-#include "pellar/volumes/DiskClaim.h"
 
 #include <functional>
 #include <memory>

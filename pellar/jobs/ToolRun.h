@@ -2,9 +2,9 @@
 #pragma once
 
 #include "pellar/ManagerOptions.h"
+#include "pellar/disks/DiskForTool.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/tools/Tool.h"
-#include "pellar/volumes/DiskForTool.h"
 
 #include <filesystem>
 #include <memory>

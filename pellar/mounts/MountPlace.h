@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/volumes/SystemPaths.h"
+#include "pellar/disks/SystemPaths.h"
 
 #include <sys/types.h>
 

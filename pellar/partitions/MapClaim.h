@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/partitions/FileSectors.h"
 #include "pellar/partitions/PartitionMap.h"
-#include "pellar/volumes/DiskClaim.h"
 
 #include <optional>
 #include <variant>

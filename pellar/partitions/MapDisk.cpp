@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapDisk.h"
 
-#include "pellar/volumes/SignatureProbe.h"
+#include "pellar/probe/SignatureProbe.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>

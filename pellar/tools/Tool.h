@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/Readability.h"
 #include "pellar/process/Access.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/outcome/Judgement.h"
-#include "pellar/volumes/Readability.h"
 
 #include <cstdint>
 #include <memory>

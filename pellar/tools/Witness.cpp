@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Witness.h"
 
-#include "pellar/volumes/SignatureProbe.h"
+#include "pellar/probe/SignatureProbe.h"
 
 namespace pellar {
 

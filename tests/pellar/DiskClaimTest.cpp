@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/disks/DiskClaim.h"
 
-#include "pellar/volumes/DiskUse.h"
+#include "pellar/disks/DiskUse.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
 

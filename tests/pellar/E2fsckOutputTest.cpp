@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/E2fsckOutput.h"
+#include "pellar/tools/ext/E2fsckOutput.h"
 
 #include "pellar/tools/Tools.h"
 #include "tests/pellar/Recorded.h"

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/volumes/ExtSuperblock.h"
+#include "pellar/tools/ext/ExtSuperblock.h"
 
 #include "pellar/process/FileDescriptor.h"
 

@@ -3,7 +3,7 @@
 
 #include "pellar/mounts/MountPlace.h"
 #include "pellar/process/Command.h"
-#include "pellar/volumes/MountedBtrfs.h"
+#include "pellar/tools/btrfs/MountedBtrfs.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
 #include "tests/support/ScrubRecords.h"

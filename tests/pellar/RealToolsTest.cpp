@@ -4,9 +4,9 @@
 // not installed is named, and its cases are skipped.
 
 #include "contract/pellar/ErrorCodes.h"
+#include "pellar/disks/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
-#include "pellar/volumes/DiskUse.h"
-#include "pellar/volumes/LoopDevice.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/VolumeStates.h"
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/tools/E2fsckOutput.h"
+#include "pellar/tools/ext/E2fsckOutput.h"
 
 #include <filesystem>
 #include <fstream>

@@ -3,11 +3,11 @@
 // What is read of a disk before a tool may touch it. That it is read rightly is proven on real
 // volumes; here stands what no maker makes.
 
+#include "pellar/tools/FatBootSector.h"
 #include "pellar/tools/ToolTable.h"
-#include "pellar/volumes/BtrfsSuperblock.h"
-#include "pellar/volumes/FatBootSector.h"
-#include "pellar/volumes/NtfsBootSector.h"
-#include "pellar/volumes/XfsSuperblock.h"
+#include "pellar/tools/XfsSuperblock.h"
+#include "pellar/tools/btrfs/BtrfsSuperblock.h"
+#include "pellar/tools/ntfs/NtfsBootSector.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/VolumeStates.h"
 

@@ -8,7 +8,7 @@
 #include "orvane/support/udisks/ImageDevices.h"
 #include "orvane/support/udisks/MountedAt.h"
 #include "orvane/support/udisks/UDisks.h"
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/disks/DiskClaim.h"
 #include "tests/support/BusDaemon.h"
 #include "tests/support/LoopDevice.h"
 

@@ -3,9 +3,9 @@
 
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/MountedAt.h"
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/mounts/MountCall.h"
 #include "pellar/mounts/MountContext.h"
-#include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
 #include <linux/cdrom.h>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/partitions/DiskMaker.h"
 
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/partitions/RepairPlan.h"
 #include "tests/pellar/partitions/DiskMaker.h"

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapReport.h"
 
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 #include "pellar/partitions/MapDisk.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 

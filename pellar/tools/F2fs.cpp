@@ -1,0 +1,99 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/F2fsSuperblock.h"
+#include "pellar/tools/Judging.h"
+#include "pellar/tools/LineOutput.h"
+#include "pellar/tools/Tools.h"
+#include "pellar/tools/Witness.h"
+
+#include <array>
+
+namespace pellar {
+namespace {
+
+constexpr std::string_view name = "fsck.f2fs";
+
+// f2fs-tools 1.15 and 1.16, fsck/fsck.c and fsck/mount.c.
+constexpr std::array signs{
+    DamageSign{"a valid F2FS superblock", Damage::Structure},
+    DamageSign{"Magic Mismatch", Damage::Structure},
+    DamageSign{"Can't find valid checkpoint", Damage::Structure},
+    DamageSign{"Invalid CP CRC", Damage::Structure},
+    DamageSign{"SIT", Damage::Bookkeeping},
+    DamageSign{"curseg", Damage::Bookkeeping},
+    DamageSign{"matching with CP", Damage::Bookkeeping},
+    DamageSign{"matched with CP", Damage::Bookkeeping},
+    DamageSign{"nreachable", Damage::LostPlaces},
+};
+
+bool tellsOfDamage(std::string_view line)
+{
+    return line.find("[ASSERT]") != std::string_view::npos ||
+           line.find("[Fail]") != std::string_view::npos || line.starts_with("Magic Mismatch") ||
+           line.find("Can't find ") != std::string_view::npos ||
+           line.find("Invalid CP CRC") != std::string_view::npos || line.starts_with("NID[0x");
+}
+
+/// Reads what fsck.f2fs prints: what is wrong is marked "[ASSERT]", each part of the check ends
+/// with "[Ok..]" or "[Fail]", and a full run with "Done: 0.000000 secs".
+class F2fsOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        constexpr std::string_view state = "Info: checkpoint state = ";
+        findings_.isComplete = findings_.isComplete || line.starts_with("Done: ");
+        findings_.corrections += line.find("[FIX]") != std::string_view::npos ? 1 : 0;
+        // Data that was written after the last checkpoint waits to be rolled forward.
+        if (line.starts_with(state) && line.find(" unmount") == std::string_view::npos)
+            findings_.skippedJournal = true;
+        if (line.starts_with("[ASSERT]") && (line.find("dev_read") != std::string_view::npos ||
+                                             line.find("read NAT bits") != std::string_view::npos))
+            noteReadFault({std::nullopt, std::nullopt, true});
+        if (!tellsOfDamage(line))
+            return detail(line);
+        const DamageSign* const sign = damageIn(signs, line);
+        return problem(line, sign == nullptr ? Damage::Contents : sign->kind);
+    }
+};
+
+// It gives up with 255, after having said why.
+constexpr std::array damagedStatuses{1, 4, 255};
+
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
+{
+    const auto superblock = readF2fsSuperblock(disk, offset, availableBytes);
+    VolumeFacts facts = factsFrom(superblock, "f2fs", disk, offset, availableBytes);
+    facts.volumeBytes = superblock ? superblock->volumeBytes : 0;
+    return facts;
+}
+
+// Without -f a volume that says of itself that all is well is believed.
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
+{
+    return {access == Access::ReadOnly ? "--dry-run" : "-y", "-f", disk};
+}
+
+// It ends with 0 where the first superblock was lost and the second was taken.
+Judgement judge(const RunEvidence& evidence)
+{
+    return judgeRun(evidence, {name, damagedStatuses, [](int, const Findings& findings) {
+                                   return findings.isComplete;
+                               }});
+}
+
+}  // namespace
+
+const Tool& fsckF2fs()
+{
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "f2fs-tools",
+        .habits = {.logReplayedAs = "f2fs"},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = readerFor<F2fsOutput>,
+        .judge = judge,
+    };
+    return tool;
+}
+
+}  // namespace pellar

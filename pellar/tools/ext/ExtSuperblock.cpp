@@ -1,0 +1,189 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/ext/ExtSuperblock.h"
+
+#include "pellar/bytes/Bytes.h"
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <limits>
+
+namespace pellar {
+namespace {
+
+constexpr std::uint16_t magicNumber = 0xEF53;
+constexpr std::uint32_t compatHasJournal = 0x4;
+constexpr std::uint32_t incompatRecover = 0x4;
+constexpr std::uint32_t incompatJournalDevice = 0x8;
+constexpr std::uint32_t incompat64Bit = 0x80;
+constexpr std::uint32_t incompatMetaGroups = 0x10;
+constexpr std::uint32_t compatFewBackups = 0x200;
+constexpr std::uint32_t readOnlyCompatSparseBackups = 0x1;
+constexpr std::uint32_t readOnlyCompatMetadataChecksum = 0x400;
+
+std::uint32_t number(Bytes bytes, std::size_t offset, std::size_t length)
+{
+    std::uint32_t value = 0;
+    for (std::size_t i = length; i-- > 0;)
+        value = value << 8U | bytes[offset + i];
+    return value;
+}
+
+/// CRC-32C without the final inversion, as the volume's own checksums are.
+std::uint32_t crc32c(Bytes bytes)
+{
+    std::uint32_t sum = ~0U;
+    for (const std::uint8_t byte : bytes) {
+        sum ^= byte;
+        for (int bit = 0; bit < 8; ++bit)
+            sum = sum >> 1U ^ ((sum & 1U) != 0 ? 0x82F63B78U : 0U);
+    }
+    return sum;
+}
+
+bool hasRightChecksum(Bytes bytes)
+{
+    constexpr std::size_t checksumOffset = 0x3FC;
+    const std::uint32_t readOnlyCompat = number(bytes, 0x64, 4);
+    return (readOnlyCompat & readOnlyCompatMetadataChecksum) == 0 ||
+           crc32c(bytes.first(checksumOffset)) == number(bytes, checksumOffset, 4);
+}
+
+/// Where the first backup lies: block 8193 with blocks of 1 KiB, 16384 of 2 KiB, 32768 of 4 KiB.
+struct BackupPlace {
+    std::uint64_t offset;
+    std::uint32_t blockBytes;
+};
+constexpr std::array backupPlaces{BackupPlace{32768ULL * 4096, 4096},
+                                  BackupPlace{8193ULL * 1024, 1024},
+                                  BackupPlace{16384ULL * 2048, 2048}};
+
+std::optional<ExtSuperblock> readAt(int descriptor, std::uint64_t place)
+{
+    std::array<std::uint8_t, ExtSuperblock::size> bytes;
+    const ssize_t count =
+        ::pread(descriptor, bytes.data(), bytes.size(), static_cast<off_t>(place));
+    if (count != static_cast<ssize_t>(bytes.size()))
+        return std::nullopt;
+    return parseExtSuperblock(bytes);
+}
+
+}  // namespace
+
+std::uint64_t ExtSuperblock::volumeBytes() const
+{
+    constexpr auto greatest = std::numeric_limits<std::uint64_t>::max();
+    return blockCount > greatest / blockBytes ? greatest : blockCount * blockBytes;
+}
+
+std::uint64_t ExtSuperblock::groups() const
+{
+    return groupBlocks == 0 || firstDataBlock >= blockCount
+               ? 0
+               : (blockCount - firstDataBlock - 1) / groupBlocks + 1;
+}
+
+std::uint64_t ExtSuperblock::descriptorTableBytes() const
+{
+    constexpr std::uint64_t largestTable = 64U << 20U;
+    const std::uint64_t bytes = productOrGreatest(groups(), descriptorBytes);
+    return bytes > largestTable ? 0 : (bytes + blockBytes - 1) / blockBytes * blockBytes;
+}
+
+// With sparse backups they are in the groups 1 and all powers of 3, 5 and 7.
+std::vector<DiskPiece> ExtSuperblock::backups(std::uint64_t availableBytes) const
+{
+    std::vector<DiskPiece> pieces;
+    if (!hasSparseBackups || hasFewBackups)
+        return pieces;
+    const std::uint64_t bytes = blockBytes + (hasMetaGroups ? 0 : descriptorTableBytes());
+    for (const std::uint64_t base : {3U, 5U, 7U})
+        for (std::uint64_t group = base == 3 ? 1 : base; group < groups(); group *= base) {
+            const std::uint64_t start =
+                productOrGreatest(firstDataBlock + group * groupBlocks, blockBytes);
+            if (start >= availableBytes)
+                break;
+            pieces.push_back({start, std::min(bytes, availableBytes - start)});
+        }
+    return pieces;
+}
+
+std::optional<ExtSuperblock> parseExtSuperblock(Bytes bytes)
+{
+    constexpr std::uint32_t greatestBlockShift = 6;  // blocks of 64 KiB
+    if (bytes.size() < ExtSuperblock::size || number(bytes, 0x38, 2) != magicNumber)
+        return std::nullopt;
+    const std::uint32_t blockShift = number(bytes, 0x18, 4);
+    const std::uint32_t compat = number(bytes, 0x5C, 4);
+    const std::uint32_t incompat = number(bytes, 0x60, 4);
+    ExtSuperblock block;
+    block.blockCount = number(bytes, 0x04, 4);
+    if ((incompat & incompat64Bit) != 0)
+        block.blockCount |= std::uint64_t{number(bytes, 0x150, 4)} << 32U;
+    if (blockShift > greatestBlockShift || block.blockCount == 0 || !hasRightChecksum(bytes))
+        return std::nullopt;
+    block.blockBytes = 1024U << blockShift;
+    block.hasJournal = (compat & compatHasJournal) != 0;
+    block.hasExternalJournal = block.hasJournal && number(bytes, 0xE0, 4) == 0;
+    block.inodeCount = number(bytes, 0x00, 4);
+    block.freeInodes = number(bytes, 0x10, 4);
+    block.firstDataBlock = number(bytes, 0x14, 4);
+    block.groupBlocks = number(bytes, 0x20, 4);
+    block.descriptorBytes = (incompat & incompat64Bit) != 0 ? number(bytes, 0xFE, 2) : 32;
+    block.hasMetaGroups = (incompat & incompatMetaGroups) != 0;
+    block.hasFewBackups = (compat & compatFewBackups) != 0;
+    block.hasSparseBackups = (number(bytes, 0x64, 4) & readOnlyCompatSparseBackups) != 0;
+    block.isJournalDevice = (incompat & incompatJournalDevice) != 0;
+    block.needsRecovery = (incompat & incompatRecover) != 0;
+    return block;
+}
+
+std::optional<ExtSuperblock> readExtSuperblock(int descriptor, std::uint64_t offset,
+                                               std::uint64_t availableBytes)
+{
+    constexpr std::uint64_t primaryOffset = 1024;
+    if (availableBytes < primaryOffset + ExtSuperblock::size)
+        return std::nullopt;
+    if (const auto primary = readAt(descriptor, offset + primaryOffset))
+        return primary;
+    for (const BackupPlace& place : backupPlaces) {
+        if (place.offset + ExtSuperblock::size > availableBytes)
+            continue;
+        auto backup = readAt(descriptor, offset + place.offset);
+        if (backup && backup->blockBytes == place.blockBytes) {
+            backup->isBackup = true;
+            return backup;
+        }
+    }
+    return std::nullopt;
+}
+
+// The kernel brings the superblock's count up to date at unmounting, those of the groups with each
+// file.
+std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
+                                           const ExtSuperblock& superblock)
+{
+    constexpr std::uint32_t smallestWithHighHalf = 64;
+    const std::uint64_t bytes = superblock.descriptorTableBytes();
+    if (superblock.hasMetaGroups || bytes == 0 || superblock.descriptorBytes < 32 ||
+        superblock.freeInodes > superblock.inodeCount)
+        return std::nullopt;
+    const std::uint64_t place =
+        (std::uint64_t{superblock.firstDataBlock} + 1) * superblock.blockBytes;
+    const auto table = readDisk(descriptor, offset + place, bytes);
+    if (!table)
+        return std::nullopt;
+    std::uint64_t free = 0;
+    for (std::uint64_t group = 0; group < superblock.groups(); ++group) {
+        const Bytes entry =
+            Bytes(*table).subspan(group * superblock.descriptorBytes, superblock.descriptorBytes);
+        free += number(entry, 0x0E, 2);
+        if (superblock.descriptorBytes >= smallestWithHighHalf)
+            free += std::uint64_t{number(entry, 0x2E, 2)} << 16U;
+    }
+    return free == superblock.freeInodes ? std::optional(superblock.inodeCount - free)
+                                         : std::nullopt;
+}
+
+}  // namespace pellar

@@ -1,0 +1,33 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "pellar/bytes/Bytes.h"
+
+namespace pellar {
+
+/// What we read ourselves of an NTFS volume (Linux, Documentation/filesystems/ntfs.rst, and the
+/// fields that the boot sector has kept since Windows NT).
+struct NtfsBootSector {
+    static constexpr std::size_t size = 512;
+
+    std::uint64_t volumeBytes = 0;  ///< with the backup behind its end
+    std::uint32_t sectorBytes = 0;
+    std::uint64_t clusterBytes = 0;
+    std::uint64_t fileTablePlace = 0;  ///< of the master file table, bytes from the start
+    std::uint32_t fileRecordBytes = 0;
+    bool isBackup = false;
+
+    friend bool operator==(const NtfsBootSector&, const NtfsBootSector&) = default;
+};
+
+std::optional<NtfsBootSector> parseNtfsBootSector(Bytes bytes);
+
+/// The boot sector of the volume that starts at `offset`, or its backup in the last sector.
+std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t offset,
+                                                 std::uint64_t availableBytes);
+
+/// Whether the backup, in the sector behind the volume's last, can be read and is none, or tells of
+/// another volume than `sector`, the one in front.
+bool differsFromNtfsBackup(int descriptor, std::uint64_t offset, const NtfsBootSector& sector);
+
+}  // namespace pellar
