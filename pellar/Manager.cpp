@@ -5,7 +5,6 @@
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapOutcome.h"
 #include "pellar/tools/Capability.h"
-#include "pellar/tools/LiveVerification.h"
 
 #include <unistd.h>
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/disks/SystemPaths.h"
 #include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/process/KernelFiles.h"
 #include "pellar/process/OutputBudget.h"
 
 #include <chrono>

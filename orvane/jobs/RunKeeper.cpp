@@ -3,7 +3,7 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/disks/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 

@@ -10,17 +10,39 @@
 
 namespace pellar {
 
-using Bytes = std::span<const std::uint8_t>;
+using Bytes = std::vector<std::uint8_t>;
+using ByteView = std::span<const std::uint8_t>;
 
 /// All of `count` bytes at `place`, or none.
-std::optional<std::vector<std::uint8_t>> readDisk(int descriptor, std::uint64_t place,
-                                                  std::size_t count);
+std::optional<Bytes> readDisk(int descriptor, std::uint64_t place, std::size_t count);
 
-// `offset` and `length` lie within `bytes`; `length` is 8 at most.
-std::uint64_t littleEndian(Bytes bytes, std::size_t offset, std::size_t length);
-std::uint64_t bigEndian(Bytes bytes, std::size_t offset, std::size_t length);
+// The number of `length` bytes, 8 at most, that stands at `offset`. All of them must be there.
 
-bool holdsText(Bytes bytes, std::size_t offset, std::string_view text);
+constexpr std::uint64_t littleEndian(ByteView bytes, std::size_t offset, std::size_t length)
+{
+    std::uint64_t value = 0;
+    for (std::size_t i = length; i-- > 0;)
+        value = value << 8U | bytes[offset + i];
+    return value;
+}
+
+constexpr std::uint64_t bigEndian(ByteView bytes, std::size_t offset, std::size_t length)
+{
+    std::uint64_t value = 0;
+    for (std::size_t i = 0; i < length; ++i)
+        value = value << 8U | bytes[offset + i];
+    return value;
+}
+
+constexpr void putLittleEndian(std::span<std::uint8_t> bytes, std::size_t offset,
+                               std::size_t length, std::uint64_t value)
+{
+    for (std::size_t i = 0; i < length; ++i)
+        bytes[offset + i] = static_cast<std::uint8_t>(value >> (8 * i));
+}
+
+/// The text's place must lie within `bytes`.
+bool holdsText(ByteView bytes, std::size_t offset, std::string_view text);
 
 constexpr bool isPowerOfTwo(std::uint64_t value)
 {

@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/disks/DiskUse.h"
 
-#include "pellar/disks/KernelFile.h"
+#include "pellar/process/KernelFiles.h"
 
-#include <sys/stat.h>
 #include <sys/sysmacros.h>
 
 #include <algorithm>
@@ -19,12 +18,6 @@ std::string_view takeUntil(std::string_view& text, char end)
     const std::string_view part = text.substr(0, length);
     text.remove_prefix(std::min(length + 1, text.size()));
     return part;
-}
-
-bool isSameFile(const std::string& path, dev_t device, ino_t number)
-{
-    struct stat status = {};
-    return ::stat(path.c_str(), &status) == 0 && status.st_dev == device && status.st_ino == number;
 }
 
 }  // namespace
@@ -46,22 +39,6 @@ bool isMounted(dev_t device, const SystemPaths& paths)
 {
     const std::optional<std::string> mountInfo = readKernelFile(paths.mountInfo);
     return !mountInfo || mountInfoNames(*mountInfo, major(device), minor(device));
-}
-
-std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths)
-{
-    std::error_code error;
-    for (const auto& device : std::filesystem::directory_iterator(paths.blockDevices, error)) {
-        // sysfs ends every value with a line feed; the path itself may hold one.
-        std::optional<std::string> file = readKernelFile(device.path() / "loop/backing_file");
-        if (!file || file->empty())
-            continue;
-        if (file->back() == '\n')
-            file->pop_back();
-        if (isSameFile(*file, fileDevice, fileNumber))
-            return "/dev/" + device.path().filename().native();
-    }
-    return {};
 }
 
 }  // namespace pellar

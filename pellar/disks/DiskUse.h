@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/disks/SystemPaths.h"
+#include "pellar/process/KernelFiles.h"
 
 #include <sys/types.h>
 
@@ -17,8 +17,5 @@ bool mountInfoNames(std::string_view mountInfo, unsigned major, unsigned minor);
 /// Whether a file system on this block device is mounted. YES also when the list cannot be read:
 /// what is not known to be free is not touched.
 bool isMounted(dev_t device, const SystemPaths& paths);
-
-/// The node of a loop device that is set up on this file, wherever in it; empty when there is none.
-std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths);
 
 }  // namespace pellar

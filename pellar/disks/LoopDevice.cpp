@@ -1,11 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/disks/LoopDevice.h"
 
-#include "pellar/disks/KernelFile.h"
-
 #include <fcntl.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -13,10 +12,9 @@
 #include <thread>
 
 namespace pellar {
+namespace {
 
 using namespace std::chrono_literals;
-
-namespace {
 
 constexpr std::uint64_t sectorBytes = 512;
 
@@ -38,6 +36,12 @@ FileDescriptor openDevice(const std::string& name, Access access)
 {
     const int mode = access == Access::ReadOnly ? O_RDONLY : O_RDWR;
     return FileDescriptor(::open(("/dev/" + name).c_str(), mode | O_CLOEXEC));
+}
+
+bool isSameFile(const std::string& path, dev_t device, ino_t number)
+{
+    struct stat status = {};
+    return ::stat(path.c_str(), &status) == 0 && status.st_dev == device && status.st_ino == number;
 }
 
 }  // namespace
@@ -97,6 +101,22 @@ LoopDevice::~LoopDevice()
     device_.reset();
     for (int i = 0; i < 100 && behind_ && readKernelFile(place_) == behind_; ++i)
         std::this_thread::sleep_for(10ms);
+}
+
+std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths)
+{
+    std::error_code error;
+    for (const auto& device : std::filesystem::directory_iterator(paths.blockDevices, error)) {
+        // sysfs ends every value with a line feed; the path itself may hold one.
+        std::optional<std::string> file = readKernelFile(device.path() / "loop/backing_file");
+        if (!file || file->empty())
+            continue;
+        if (file->back() == '\n')
+            file->pop_back();
+        if (isSameFile(*file, fileDevice, fileNumber))
+            return "/dev/" + device.path().filename().native();
+    }
+    return {};
 }
 
 }  // namespace pellar

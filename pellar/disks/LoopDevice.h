@@ -3,6 +3,9 @@
 
 #include "pellar/process/Access.h"
 #include "pellar/process/FileDescriptor.h"
+#include "pellar/process/KernelFiles.h"
+
+#include <sys/types.h>
 
 #include <cstdint>
 #include <filesystem>
@@ -58,5 +61,8 @@ private:
     std::filesystem::path place_;  ///< where the kernel tells what is behind the device
     std::optional<std::string> behind_;
 };
+
+/// The node of a loop device that is set up on this file, wherever in it; empty when there is none.
+std::string loopDeviceOn(dev_t fileDevice, ino_t fileNumber, const SystemPaths& paths);
 
 }  // namespace pellar

@@ -6,7 +6,7 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/bytes/Bytes.h"
-#include "pellar/disks/DiskForTool.h"
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/LogReplay.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/jobs/Obstacles.h"

@@ -5,7 +5,7 @@
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/jobs/DiskNaming.h"
 #include "pellar/jobs/OutcomeReport.h"
-#include "pellar/tools/LiveVerification.h"
+#include "pellar/tools/Capability.h"
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <fcntl.h>

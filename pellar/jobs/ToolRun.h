@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/ManagerOptions.h"
-#include "pellar/disks/DiskForTool.h"
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/tools/Tool.h"
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/disks/SystemPaths.h"
+#include "pellar/process/KernelFiles.h"
 
 #include <sys/types.h>
 

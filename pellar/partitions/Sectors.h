@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/partitions/Bytes.h"
+#include "pellar/bytes/Bytes.h"
 
 #include <optional>
 

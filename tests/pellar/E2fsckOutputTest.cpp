@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/ext/E2fsckOutput.h"
 
-#include "pellar/tools/Tools.h"
+#include "pellar/tools/ToolTable.h"
 #include "tests/pellar/Recorded.h"
 
 #include <gtest/gtest.h>

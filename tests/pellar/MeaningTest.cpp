@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/outcome/Damage.h"
-#include "pellar/tools/ext/E2fsckDamage.h"
+#include "pellar/tools/ext/E2fsckOutput.h"
 
 #include <gtest/gtest.h>
 

@@ -4,7 +4,6 @@
 // not installed is named, and its cases are skipped.
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/disks/DiskUse.h"
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/Workshop.h"

@@ -7,7 +7,7 @@
 #include "pellar/tools/ToolTable.h"
 #include "pellar/tools/XfsSuperblock.h"
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
-#include "pellar/tools/ntfs/NtfsBootSector.h"
+#include "pellar/tools/ntfs/NtfsVolume.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/VolumeStates.h"
 

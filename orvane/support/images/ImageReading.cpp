@@ -2,7 +2,7 @@
 #include "orvane/support/images/ImageReading.h"
 
 #include "orvane/support/images/ImageDisks.h"
-#include "pellar/disks/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 

@@ -4,7 +4,7 @@
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/UDisks.h"
-#include "pellar/disks/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

@@ -5,7 +5,7 @@
 #include "orvane/support/udisks/MountedAt.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/Commands.h"
-#include "pellar/disks/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 

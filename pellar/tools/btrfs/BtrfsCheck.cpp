@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Judging.h"
-#include "pellar/tools/LineOutput.h"
-#include "pellar/tools/Tools.h"
-#include "pellar/tools/Witness.h"
+#include "pellar/tools/ToolOutput.h"
+#include "pellar/tools/ToolTable.h"
+#include "pellar/tools/VolumeFacts.h"
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <array>

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/ProcessRunner.h"
 #include "pellar/outcome/Judgement.h"
+#include "pellar/process/ProcessRunner.h"
 
 #include <cstdint>
 #include <string>

@@ -5,7 +5,7 @@
 
 namespace pellar {
 
-std::optional<BtrfsSuperblock> parseBtrfsSuperblock(Bytes bytes, std::uint64_t place)
+std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_t place)
 {
     if (bytes.size() < BtrfsSuperblock::size || !holdsText(bytes, 64, "_BHRfS_M") ||
         littleEndian(bytes, 48, 8) != place)

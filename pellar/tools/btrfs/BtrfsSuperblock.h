@@ -2,9 +2,13 @@
 #pragma once
 
 #include "pellar/bytes/Bytes.h"
-#include "pellar/tools/btrfs/BtrfsId.h"
+
+#include <array>
 
 namespace pellar {
+
+/// By which a btrfs file system is known: in its superblock, and to the kernel.
+using BtrfsId = std::array<std::uint8_t, 16>;
 
 /// What we read ourselves of a btrfs volume (btrfs-progs, Documentation/dev/On-disk-format.rst,
 /// "Superblock"; all fields little-endian).
@@ -21,7 +25,7 @@ struct BtrfsSuperblock {
 };
 
 /// None for a superblock that says itself that it belongs elsewhere than at `place`.
-std::optional<BtrfsSuperblock> parseBtrfsSuperblock(Bytes bytes, std::uint64_t place);
+std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_t place);
 
 /// The superblock at 64 KiB, or a copy of it at 64 MiB or 256 GiB.
 std::optional<BtrfsSuperblock> readBtrfsSuperblock(int descriptor, std::uint64_t offset,

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/tools/btrfs/BtrfsId.h"
+#include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <cstdint>
 #include <filesystem>

@@ -2,7 +2,7 @@
 #include "pellar/probe/SignatureProbe.h"
 #include "pellar/process/ChildProcess.h"
 #include "pellar/tools/Judging.h"
-#include "pellar/tools/Tools.h"
+#include "pellar/tools/ToolTable.h"
 #include "pellar/tools/ext/E2fsckOutput.h"
 #include "pellar/tools/ext/ExtSuperblock.h"
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Damage.h"
 #include "pellar/tools/Tool.h"
 
 #include <optional>
@@ -42,5 +43,9 @@ private:
 /// "2 7 13 /dev/sdb1": pass, done, of; weighed as e2fsck's own progress bar does. None for
 /// anything else.
 std::optional<double> e2fsckPercent(std::string_view progressLine);
+
+/// What a problem that e2fsck names means. A line that is not known counts as damaged contents:
+/// rather too grave than too light.
+Damage e2fsckDamageOf(std::string_view problem);
 
 }  // namespace pellar

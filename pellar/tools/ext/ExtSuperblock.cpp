@@ -1,13 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/ext/ExtSuperblock.h"
 
-#include "pellar/bytes/Bytes.h"
-
-#include <unistd.h>
+#include "pellar/bytes/Checksums.h"
 
 #include <algorithm>
 #include <array>
-#include <limits>
 
 namespace pellar {
 namespace {
@@ -22,27 +19,12 @@ constexpr std::uint32_t compatFewBackups = 0x200;
 constexpr std::uint32_t readOnlyCompatSparseBackups = 0x1;
 constexpr std::uint32_t readOnlyCompatMetadataChecksum = 0x400;
 
-std::uint32_t number(Bytes bytes, std::size_t offset, std::size_t length)
+std::uint32_t number(ByteView bytes, std::size_t offset, std::size_t length)
 {
-    std::uint32_t value = 0;
-    for (std::size_t i = length; i-- > 0;)
-        value = value << 8U | bytes[offset + i];
-    return value;
+    return static_cast<std::uint32_t>(littleEndian(bytes, offset, length));
 }
 
-/// CRC-32C without the final inversion, as the volume's own checksums are.
-std::uint32_t crc32c(Bytes bytes)
-{
-    std::uint32_t sum = ~0U;
-    for (const std::uint8_t byte : bytes) {
-        sum ^= byte;
-        for (int bit = 0; bit < 8; ++bit)
-            sum = sum >> 1U ^ ((sum & 1U) != 0 ? 0x82F63B78U : 0U);
-    }
-    return sum;
-}
-
-bool hasRightChecksum(Bytes bytes)
+bool hasRightChecksum(ByteView bytes)
 {
     constexpr std::size_t checksumOffset = 0x3FC;
     const std::uint32_t readOnlyCompat = number(bytes, 0x64, 4);
@@ -61,20 +43,15 @@ constexpr std::array backupPlaces{BackupPlace{32768ULL * 4096, 4096},
 
 std::optional<ExtSuperblock> readAt(int descriptor, std::uint64_t place)
 {
-    std::array<std::uint8_t, ExtSuperblock::size> bytes;
-    const ssize_t count =
-        ::pread(descriptor, bytes.data(), bytes.size(), static_cast<off_t>(place));
-    if (count != static_cast<ssize_t>(bytes.size()))
-        return std::nullopt;
-    return parseExtSuperblock(bytes);
+    const auto bytes = readDisk(descriptor, place, ExtSuperblock::size);
+    return bytes ? parseExtSuperblock(*bytes) : std::nullopt;
 }
 
 }  // namespace
 
 std::uint64_t ExtSuperblock::volumeBytes() const
 {
-    constexpr auto greatest = std::numeric_limits<std::uint64_t>::max();
-    return blockCount > greatest / blockBytes ? greatest : blockCount * blockBytes;
+    return productOrGreatest(blockCount, blockBytes);
 }
 
 std::uint64_t ExtSuperblock::groups() const
@@ -109,7 +86,7 @@ std::vector<DiskPiece> ExtSuperblock::backups(std::uint64_t availableBytes) cons
     return pieces;
 }
 
-std::optional<ExtSuperblock> parseExtSuperblock(Bytes bytes)
+std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes)
 {
     constexpr std::uint32_t greatestBlockShift = 6;  // blocks of 64 KiB
     if (bytes.size() < ExtSuperblock::size || number(bytes, 0x38, 2) != magicNumber)
@@ -176,8 +153,8 @@ std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
         return std::nullopt;
     std::uint64_t free = 0;
     for (std::uint64_t group = 0; group < superblock.groups(); ++group) {
-        const Bytes entry =
-            Bytes(*table).subspan(group * superblock.descriptorBytes, superblock.descriptorBytes);
+        const ByteView entry = ByteView(*table).subspan(group * superblock.descriptorBytes,
+                                                        superblock.descriptorBytes);
         free += number(entry, 0x0E, 2);
         if (superblock.descriptorBytes >= smallestWithHighHalf)
             free += std::uint64_t{number(entry, 0x2E, 2)} << 16U;

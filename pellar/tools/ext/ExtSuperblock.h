@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/bytes/Bytes.h"
 #include "pellar/disks/Readability.h"
 
 #include <cstddef>
 #include <cstdint>
 #include <optional>
-#include <span>
 #include <vector>
 
 namespace pellar {
@@ -50,7 +50,7 @@ struct ExtSuperblock {
 
 /// None when the bytes are no superblock: no magic number, impossible geometry, or a checksum
 /// that does not fit.
-std::optional<ExtSuperblock> parseExtSuperblock(std::span<const std::uint8_t> bytes);
+std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes);
 
 /// The primary superblock of the volume that starts at `offset`, or, where there is none, the first
 /// backup at the places where mke2fs(8) puts it for the block sizes 1, 2 and 4 KiB. None when

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/Judging.h"
-#include "pellar/tools/LineOutput.h"
-#include "pellar/tools/Tools.h"
-#include "pellar/tools/Witness.h"
-#include "pellar/tools/ntfs/NtfsBootSector.h"
-#include "pellar/tools/ntfs/NtfsState.h"
+#include "pellar/tools/ToolOutput.h"
+#include "pellar/tools/ToolTable.h"
+#include "pellar/tools/VolumeFacts.h"
+#include "pellar/tools/ntfs/NtfsVolume.h"
 
 #include <array>
 #include <charconv>

@@ -20,7 +20,7 @@ struct NtfsBootSector {
     friend bool operator==(const NtfsBootSector&, const NtfsBootSector&) = default;
 };
 
-std::optional<NtfsBootSector> parseNtfsBootSector(Bytes bytes);
+std::optional<NtfsBootSector> parseNtfsBootSector(ByteView bytes);
 
 /// The boot sector of the volume that starts at `offset`, or its backup in the last sector.
 std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t offset,
@@ -29,5 +29,17 @@ std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t o
 /// Whether the backup, in the sector behind the volume's last, can be read and is none, or tells of
 /// another volume than `sector`, the one in front.
 bool differsFromNtfsBackup(int descriptor, std::uint64_t offset, const NtfsBootSector& sector);
+
+/// Whether the volume's own record says that it was not properly unmounted or is to be checked by
+/// its own system. None when the record cannot be read.
+std::optional<bool> isNtfsMarkedDirty(int descriptor, std::uint64_t offset,
+                                      const NtfsBootSector& sector);
+
+/// Whether the journal ($LogFile) holds changes that its own system has still to bring to their
+/// places: the newer of its two restart pages names a client, and does not call the volume clean
+/// (Linux, fs/ntfs3/fslog.c: RESTART_HDR, RESTART_AREA). NO for an emptied journal; none when it
+/// cannot be read.
+std::optional<bool> hasNtfsJournalWaiting(int descriptor, std::uint64_t offset,
+                                          const NtfsBootSector& sector);
 
 }  // namespace pellar

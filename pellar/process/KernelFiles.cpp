@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/disks/KernelFile.h"
+#include "pellar/process/KernelFiles.h"
 
 #include "pellar/process/FileDescriptor.h"
 

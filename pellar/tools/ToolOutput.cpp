@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/LineOutput.h"
+#include "pellar/tools/ToolOutput.h"
 
 namespace pellar {
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/Witness.h"
+#include "pellar/tools/VolumeFacts.h"
 
 #include "pellar/probe/SignatureProbe.h"
 
