@@ -3,7 +3,7 @@
 
 #include "pellar/jobs/PrivilegedJob.h"
 #include "pellar/process/KernelFiles.h"
-#include "pellar/process/OutputBudget.h"
+#include "pellar/process/ProcessOutput.h"
 
 #include <chrono>
 #include <filesystem>

@@ -42,7 +42,17 @@ bool needsPrivileges(Subject subject, const contract::DiskReference& disk, Opera
     if (subject == Subject::Permissions)
         return operation == Operation::Repair;
     const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
-    return ::access(disk.path.c_str(), wanted) != 0 || !mountPlacesOf(disk.path, paths).empty();
+    return ::access(disk.path.c_str(), wanted) != 0 || !mountsOf(disk.path, paths).empty();
+}
+
+/// Whether the directory lies on what is mounted at one of the places.
+bool holdsDirectory(const std::vector<Mount>& places, const std::filesystem::path& directory,
+                    const SystemPaths& paths)
+{
+    const auto holder = mountHolding(currentMounts(paths), directory);
+    return holder && std::any_of(places.begin(), places.end(), [&](const Mount& place) {
+               return place.target == holder->target;
+           });
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -159,9 +169,9 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
 {
     if (error != contract::kPLErrorCouldNotUnmount && error != contract::kPLErrorDiskInUse)
         return error;
-    auto mounts = mountPlacesOf(disk->path, options_.systemPaths);
+    auto mounts = mountsOf(disk->path, options_.systemPaths);
     const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
-                                    [](const MountPlace& place) { return place.target == "/"; });
+                                    [](const Mount& place) { return place.target == "/"; });
     const bool staysMounted =
         isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
@@ -173,7 +183,7 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     return contract::kPLNoError;
 }
 
-void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<MountPlace>& mounts)
+void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<Mount>& mounts)
 {
     start(disk, [disk, mounts, this](StopSwitch& stop, EventRoad& road) {
         return std::make_unique<LiveScript>(disk, mounts, options_, texts_, stop, road);

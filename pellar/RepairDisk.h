@@ -57,7 +57,7 @@ private:
     bool isPartThatOthersAttach(const JobRequest& request) const;
     void startVolume(JobRequest request);
     void startLive(const contract::DiskReferencePointer& disk,
-                   const std::vector<MountPlace>& mounts);
+                   const std::vector<Mount>& mounts);
     void start(const contract::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     contract::RunLoop& loop_;

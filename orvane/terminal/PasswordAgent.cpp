@@ -2,7 +2,7 @@
 #include "orvane/terminal/PasswordAgent.h"
 
 #include "orvane/support/files/FileDescriptor.h"
-#include "pellar/process/ForkedSignals.h"
+#include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>

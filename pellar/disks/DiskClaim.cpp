@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/disks/DiskClaim.h"
 
-#include "pellar/disks/DiskUse.h"
+#include "pellar/mounts/MountTable.h"
 
 #include <fcntl.h>
 #include <sys/file.h>

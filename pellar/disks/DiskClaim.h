@@ -4,7 +4,7 @@
 #include "contract/pellar/DiskReference.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "pellar/disks/LoopDevice.h"
-#include "pellar/process/Access.h"
+#include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/process/KernelFiles.h"
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/Access.h"
+#include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/process/KernelFiles.h"
 

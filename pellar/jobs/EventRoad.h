@@ -4,7 +4,7 @@
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/PLRepairDisk.h"
 #include "pellar/jobs/Event.h"
-#include "pellar/process/StopLadder.h"
+#include "pellar/process/Stopping.h"
 
 #include <cstddef>
 #include <functional>

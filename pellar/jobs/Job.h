@@ -4,7 +4,7 @@
 #include "contract/foundation/RunLoop.h"
 #include "pellar/jobs/EventRoad.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <thread>
 

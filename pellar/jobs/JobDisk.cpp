@@ -8,7 +8,7 @@
 namespace pellar {
 
 JobDisk::JobDisk(contract::DiskReferencePointer disk, std::optional<DiskClaim> claim,
-                 std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log)
+                 std::vector<Mount> mounts, const SystemPaths& paths, JobLog& log)
     : disk_(std::move(disk)),
       claim_(std::move(claim)),
       mounts_(std::move(mounts)),

@@ -20,7 +20,7 @@ struct JobRequest {
     contract::DiskReferencePointer disk;
     Operation operation = Operation::Verify;
     std::optional<DiskClaim> claim;  ///< none: the job claims the disk itself, unmounted before
-    std::vector<MountPlace> mounts;  ///< where it is mounted, when there is no claim
+    std::vector<Mount> mounts;  ///< where it is mounted, when there is no claim
     const Tool* tool = nullptr;      ///< null: the kind of the volume is still to be found out
 };
 

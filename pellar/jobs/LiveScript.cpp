@@ -24,7 +24,7 @@ constexpr std::uint64_t anyBytes = ~std::uint64_t{0};
 
 }  // namespace
 
-LiveScript::LiveScript(contract::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+LiveScript::LiveScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
                        const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                        EventRoad& road)
     : disk_(std::move(disk)),
@@ -77,7 +77,7 @@ int LiveScript::reachVolume()
         return errno;
     const auto superblock = readBtrfsSuperblock(device_.get(), 0, anyBytes);
     int error = ENODEV;
-    for (const MountPlace& place : mounts_) {
+    for (const Mount& place : mounts_) {
         auto opened = MountedBtrfs::open(place.target);
         if (const int* const openError = std::get_if<int>(&opened)) {
             error = *openError;

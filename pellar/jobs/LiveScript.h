@@ -4,9 +4,9 @@
 #include "contract/pellar/DiskReference.h"
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/tools/btrfs/BtrfsScrub.h"
 #include "pellar/tools/btrfs/MountedBtrfs.h"
@@ -23,7 +23,7 @@ namespace pellar {
 class LiveScript final : public Script, private RunListener {
 public:
     /// `mounts` is where the disk is mounted, not empty.
-    LiveScript(contract::DiskReferencePointer disk, std::vector<MountPlace> mounts,
+    LiveScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
                const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
                EventRoad& road);
 
@@ -46,7 +46,7 @@ private:
     void tick() override;
 
     const contract::DiskReferencePointer disk_;
-    const std::vector<MountPlace> mounts_;
+    const std::vector<Mount> mounts_;
     const ManagerOptions& options_;
     const Texts& texts_;
     StopSwitch& stop_;

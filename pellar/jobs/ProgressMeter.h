@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/StopLadder.h"
+#include "pellar/process/Stopping.h"
 
 #include <optional>
 

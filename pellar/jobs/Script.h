@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/jobs/EventRoad.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <functional>
 #include <memory>

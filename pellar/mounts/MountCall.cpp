@@ -90,14 +90,14 @@ int bindPart(const MountCalls& calls, const MountCall& call, const FileDescripto
 
 }  // namespace
 
-std::variant<MountCalls, NotHeld> mountCallsFor(const std::vector<MountPlace>& places)
+std::variant<MountCalls, NotHeld> mountCallsFor(const std::vector<Mount>& places)
 {
     auto points = holdMountPoints(places);
     if (const auto* const notHeld = std::get_if<NotHeld>(&points))
         return *notHeld;
     MountCalls all;
     all.points = std::get<std::vector<MountPoint>>(std::move(points));
-    for (const MountPlace& place : places) {
+    for (const Mount& place : places) {
         if (!place.isBind() && all.whole == MountPoint::none)
             all.whole = all.calls.size();
         MountCall call{place.source, place.target, place.filesystem, {}, 0, place.isBind()};
@@ -118,7 +118,7 @@ int perform(const MountCalls& calls, std::size_t index) noexcept
     return call.isBind ? bindPart(calls, call, place) : mountDevice(call, place);
 }
 
-bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places)
+bool isCovered(const Mount& place, const std::vector<Mount>& places)
 {
     struct statx status = {};
     if (::statx(AT_FDCWD, place.target.c_str(), AT_NO_AUTOMOUNT, STATX_MNT_ID, &status) != 0 ||

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/mounts/MountPlace.h"
 #include "pellar/mounts/MountPoint.h"
+#include "pellar/mounts/MountTable.h"
 
 #include <string>
 #include <vector>
@@ -29,7 +29,7 @@ struct MountCalls {
 
 /// Keeps hold of where the places are. Needs the right to mount.
 [[nodiscard]] std::variant<MountCalls, NotHeld> mountCallsFor(
-    const std::vector<MountPlace>& places);
+    const std::vector<Mount>& places);
 
 /// Mounts one of them; 0, or an errno value: ESTALE when its place is another now. Allocates
 /// nothing and may run in a forked child (signal-safety(7)).
@@ -37,6 +37,6 @@ struct MountCalls {
 
 /// Whether what shows at the place is none of these, the places of one disk: who unmounts it by its
 /// path unmounts another. NO when it is not known.
-[[nodiscard]] bool isCovered(const MountPlace& place, const std::vector<MountPlace>& places);
+[[nodiscard]] bool isCovered(const Mount& place, const std::vector<Mount>& places);
 
 }  // namespace pellar

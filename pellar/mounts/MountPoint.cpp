@@ -106,17 +106,17 @@ std::variant<MountPoint::Directory, int> directoryBelow(const FileDescriptor& ho
 }
 
 /// On which of the places another one lies.
-std::size_t outerOf(const MountPlace& place, const std::vector<MountPlace>& places)
+std::size_t outerOf(const Mount& place, const std::vector<Mount>& places)
 {
     const auto outer = std::find_if(
         places.begin(), places.end(),
-        [&place](const MountPlace& other) { return other.id != 0 && other.id == place.parent; });
+        [&place](const Mount& other) { return other.id != 0 && other.id == place.parent; });
     return outer == places.end() ? MountPoint::none
                                  : static_cast<std::size_t>(outer - places.begin());
 }
 
 /// 0, or an errno value.
-int hold(MountPoint& point, const MountPlace& place, const std::vector<MountPlace>& places)
+int hold(MountPoint& point, const Mount& place, const std::vector<Mount>& places)
 {
     const std::filesystem::path target = place.target;
     point.name = target.filename();
@@ -152,7 +152,7 @@ int hold(MountPoint& point, const MountPlace& place, const std::vector<MountPlac
 }  // namespace
 
 std::variant<std::vector<MountPoint>, NotHeld> holdMountPoints(
-    const std::vector<MountPlace>& places)
+    const std::vector<Mount>& places)
 {
     std::vector<MountPoint> points(places.size());
     for (std::size_t i = 0; i < places.size(); ++i)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <cstdint>
@@ -46,7 +46,7 @@ struct NotHeld {
 
 /// Of each place of one disk, in the order in which they were mounted. Needs the right to mount.
 [[nodiscard]] std::variant<std::vector<MountPoint>, NotHeld> holdMountPoints(
-    const std::vector<MountPlace>& places);
+    const std::vector<Mount>& places);
 
 // What follows allocates nothing and may run in a forked child (signal-safety(7)). `points` are all
 // those of a disk, and `index` says which is meant.

@@ -4,8 +4,8 @@
 #include "pellar/permissions/Accounts.h"
 #include "pellar/permissions/Reference.h"
 #include "pellar/permissions/RootDirectory.h"
-#include "pellar/process/OutputBudget.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
+#include "pellar/process/ProcessOutput.h"
 #include "pellar/texts/Sentence.h"
 
 #include <filesystem>

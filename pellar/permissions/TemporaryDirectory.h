@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <sys/types.h>
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ChildProcess.h"
 
-#include "pellar/process/ForkedSignals.h"
+#include "pellar/process/ChildProcess.h"
 #include "pellar/process/ReducedRights.h"
 
 #include <fcntl.h>

@@ -2,7 +2,7 @@
 #include "pellar/process/Command.h"
 
 #include "contract/foundation/UTF8.h"
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <unistd.h>
 

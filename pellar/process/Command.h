@@ -4,9 +4,32 @@
 #include <filesystem>
 #include <string>
 #include <string_view>
+#include <variant>
 #include <vector>
 
 namespace pellar {
+
+/// What a run of a tool may do to the disk.
+enum class Access { ReadOnly, ReadWrite };
+
+struct Exited {
+    int status;
+    friend bool operator==(const Exited&, const Exited&) = default;
+};
+
+struct Killed {
+    int signal;
+    friend bool operator==(const Killed&, const Killed&) = default;
+};
+
+struct NotStarted {
+    int error;  ///< errno
+    friend bool operator==(const NotStarted&, const NotStarted&) = default;
+};
+
+/// How a run of a tool ended. Only `Exited` carries a status, so a tool that crashed or never
+/// started cannot be mistaken for one that answered 0.
+using Ending = std::variant<Exited, Killed, NotStarted>;
 
 /// A program and its arguments. It is never given to a shell.
 struct Command {

@@ -2,8 +2,8 @@
 #include "pellar/process/ProcessRunner.h"
 
 #include "pellar/process/ChildProcess.h"
-#include "pellar/process/LineSplitter.h"
-#include "pellar/process/PseudoTerminal.h"
+#include "pellar/process/FileDescriptor.h"
+#include "pellar/process/ProcessOutput.h"
 
 #include <poll.h>
 #include <unistd.h>

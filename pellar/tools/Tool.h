@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/outcome/Judgement.h"
-#include "pellar/process/Access.h"
+#include "pellar/process/Command.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/tools/ToolOutput.h"
 #include "pellar/tools/VolumeFacts.h"

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/disks/DiskClaim.h"
 
-#include "pellar/disks/DiskUse.h"
+#include "pellar/mounts/MountTable.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
 
@@ -121,20 +121,48 @@ TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
     }
 }
 
-TEST(MountInfo, FindsADeviceByItsNumber)
+TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
 {
-    constexpr std::string_view mountInfo =
-        "36 35 8:17 / /mnt rw,noatime shared:1 - ext4 /dev/sdb1 rw\n"
-        "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n"
-        "38";
-    EXPECT_TRUE(mountInfoNames(mountInfo, 8, 17));
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 1)) << "the start of another number";
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 2)) << "in another column";
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 3)) << "in another column";
-    EXPECT_FALSE(mountInfoNames("", 8, 17));
-    for (const char* const unreadable : {"/nonexistent", "/"})  // opened, but not read
-        EXPECT_TRUE(isMounted(makedev(8, 17), {"/sys/block", unreadable}))
-            << "what is not known to be free is not touched";
+    const auto mounts = parseMounts(
+        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw\n"
+        "30 22 8:3 /sub /bind rw - ext4 /dev/sda3 rw\n"
+        "31 22 8:3 / /media/My\\040Disk\\134 ro,nosuid - ext4 /dev/sda3 rw\n"
+        "32 22 0:40 /@home /home rw master:2 shared:3 - btrfs /dev/sdb1 ro,errors=remount-ro\n"
+        "33 22 8:17 / /gone rw - ext4 /dev/sdb1 rw\n"
+        "nonsense\n33 22 8:4\n");
+    ASSERT_EQ(mounts.size(), 5U) << "lines that are no mounts are left out";
+    const auto media = mountOfDevice(mounts, makedev(8, 3), "/dev/sda3");
+    ASSERT_TRUE(media);
+    EXPECT_EQ(media->target, "/media/My Disk\\") << "the whole goes before a part of it";
+    EXPECT_TRUE(media->isReadOnly);
+    EXPECT_EQ(mountOfDevice(mounts, makedev(8, 33), "/dev/sdb1")->target, "/home")
+        << "several devices, one number of its own; a device of another number has had the name";
+    EXPECT_FALSE(mounts[3].isReadOnly) << "the kernel's answer to an error is nobody's wish";
+    EXPECT_FALSE(mounts[3].isBind()) << "a subvolume is mounted by an option";
+    EXPECT_FALSE(mountOfDevice(mounts, makedev(8, 9), "/dev/sda9"));
+    EXPECT_EQ(mountHolding(mounts, "/home/me")->device, makedev(0, 40));
+    EXPECT_EQ(mountHolding(mounts, "/homes")->device, makedev(8, 2));
+}
+
+TEST(MountTable, WhatIsNotKnownToBeFreeIsMounted)
+{
+    const test::Workshop workshop;
+    workshop.write("mounts", "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
+                             "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
+    workshop.write("none", "");
+    struct Case {
+        std::filesystem::path list;
+        unsigned minor;
+        bool isMounted;
+    };
+    for (const Case& c : {Case{workshop.path("mounts"), 17, true},
+                          Case{workshop.path("mounts"), 1, false},
+                          Case{workshop.path("mounts"), 2, false},
+                          Case{workshop.path("mounts"), 3, false},
+                          Case{workshop.path("none"), 17, false},
+                          Case{"/nonexistent", 17, true}, Case{"/", 17, true}})
+        EXPECT_EQ(isMounted(makedev(8, c.minor), {"/sys/block", c.list}), c.isMounted)
+            << c.list << ' ' << c.minor;
 }
 
 }  // namespace

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Volumes that are verified while they stay mounted, on real loop devices. Needs root.
 
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
 #include "pellar/process/Command.h"
 #include "pellar/tools/btrfs/MountedBtrfs.h"
 #include "tests/pellar/Workshop.h"
@@ -148,7 +148,7 @@ TEST_F(LiveVerify, FindsDamageAndWritesNothing)
         EXPECT_NE(bench->listener.message.find(c.says), std::string::npos)
             << bench->listener.message;
         EXPECT_TRUE(bytesOf(image()) == before) << c.says;
-        EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
+        EXPECT_FALSE(mountsOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
     }
 }
 
@@ -188,7 +188,7 @@ TEST_F(LiveVerify, IsNotForAVolumeThatCanBeUnmounted)
     bench.verify(disk());
     EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
     EXPECT_TRUE(bench.listener.hasPlainLine("no error found")) << "as btrfs check ends";
-    EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty());
+    EXPECT_FALSE(mountsOf(fs::path(device_->name()), {}).empty());
 }
 
 }  // namespace

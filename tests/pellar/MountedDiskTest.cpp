@@ -2,7 +2,7 @@
 // Jobs on volumes that are mounted, on real loop devices. Needs root.
 
 #include "pellar/mounts/Holders.h"
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
 #include "tests/pellar/Workshop.h"
 #include "tests/support/LoopDevice.h"
 
@@ -53,11 +53,11 @@ protected:
     }
 
     fs::path place() const { return workshop_.path("place"); }
-    std::vector<MountPlace> mounts() const
+    std::vector<Mount> mounts() const
     {
         struct stat status = {};
         ::stat(device_->name().c_str(), &status);
-        return mountPlacesOf(status.st_rdev, {});
+        return mountsOf(status.st_rdev, {});
     }
     contract::DiskReferencePointer disk() const { return test::reference(device_->name()); }
     /// A program that verifies the disk is killed while it is unmounted.
@@ -65,7 +65,7 @@ protected:
 
     test::Workshop workshop_;
     std::unique_ptr<orvane::test::LoopDevice> device_;
-    std::vector<MountPlace> before_;
+    std::vector<Mount> before_;
 };
 
 TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
@@ -212,7 +212,7 @@ TEST_F(MountedDisk, NobodyLeadsItElsewhereMeanwhile)
                       0);
             const auto places = [this] {
                 std::string found;
-                for (const MountPlace& place : mounts())
+                for (const Mount& place : mounts())
                     found += place.target;
                 return found;
             };
@@ -239,7 +239,7 @@ TEST_F(MountedDisk, NobodyLeadsItElsewhereMeanwhile)
                                     bench.listener.hasErrorWith("could not be mounted again");
                 EXPECT_EQ(isTold, expected.empty()) << c.because;
             }
-            for (const MountPlace& place : mounts())
+            for (const Mount& place : mounts())
                 ::umount(place.target.c_str());
         }
 }
@@ -283,7 +283,7 @@ TEST_F(MountedDisk, IsMountedAgainOverWhatLiesBelowWhenTheProgramIsKilled)
     ASSERT_EQ(::mount(device_->name().c_str(), covered.c_str(), "ext4", 0, nullptr), 0);
     before_ = mounts();
     expectMountedAgainAfterKill();
-    for (const MountPlace& place : mounts())
+    for (const Mount& place : mounts())
         ::umount2(place.target.c_str(), MNT_DETACH);
     ::umount(covered.c_str());
 }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/process/OutputBudget.h"
-#include "pellar/process/StopLadder.h"
+#include "pellar/process/Stopping.h"
+#include "pellar/process/ProcessOutput.h"
 
 #include <gtest/gtest.h>
 

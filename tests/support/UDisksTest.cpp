@@ -241,9 +241,9 @@ TEST_F(DirectTest, AnImageInUseComesOffLater)
 // With the one step that could do no harm to it.
 TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
 {
-    const auto mounts = currentMounts();
+    const auto mounts = pellar::currentMounts();
     const auto root = std::find_if(mounts.begin(), mounts.end(),
-                                   [](const Mount& mount) { return mount.mountPoint == "/"; });
+                                   [](const pellar::Mount& mount) { return mount.target == "/"; });
     if (root == mounts.end() || placesOf(root->source).empty())
         GTEST_SKIP() << "the root of this system is on no device";
     EXPECT_EQ(

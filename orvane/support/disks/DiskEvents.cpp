@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/DiskEvents.h"
 
+#include <sys/sysmacros.h>
+
 #include <algorithm>
 
 namespace orvane {
@@ -21,11 +23,11 @@ bool isAboutBlockDevice(std::string_view message)
     return message.find("\0SUBSYSTEM=block\0"sv) != std::string_view::npos;
 }
 
-std::vector<Mount> deviceMounts(const std::vector<Mount>& mounts)
+std::vector<pellar::Mount> deviceMounts(const std::vector<pellar::Mount>& mounts)
 {
-    std::vector<Mount> kept;
-    std::copy_if(mounts.begin(), mounts.end(), std::back_inserter(kept), [](const Mount& mount) {
-        return !mount.device.starts_with("0:") || mount.source.starts_with("/dev/");
+    std::vector<pellar::Mount> kept;
+    std::copy_if(mounts.begin(), mounts.end(), std::back_inserter(kept), [](const auto& mount) {
+        return major(mount.device) != 0 || mount.source.starts_with("/dev/");
     });
     return kept;
 }

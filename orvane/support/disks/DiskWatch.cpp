@@ -93,7 +93,7 @@ private:
 
     bool mountsHaveChanged()
     {
-        auto now = deviceMounts(currentMounts());
+        auto now = deviceMounts(pellar::currentMounts());
         return std::exchange(mounts_, now) != now;
     }
 
@@ -101,7 +101,7 @@ private:
     const int stop_;
     const std::function<void()> tell_;
     const FileDescriptor mountInfo_{::open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)};
-    std::vector<Mount> mounts_ = deviceMounts(currentMounts());
+    std::vector<pellar::Mount> mounts_ = deviceMounts(pellar::currentMounts());
     EventBurst burst_;
 };
 

@@ -4,7 +4,7 @@
 #include "orvane/support/Failure.h"
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/loop/HostLoop.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <functional>
 #include <memory>

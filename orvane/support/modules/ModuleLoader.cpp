@@ -5,7 +5,7 @@
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <dlfcn.h>
 #include <fcntl.h>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/modules/ModuleSearch.h"
 
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <unistd.h>
 

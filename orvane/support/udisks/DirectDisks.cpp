@@ -5,9 +5,9 @@
 #include "orvane/support/udisks/MountedAt.h"
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/mounts/MountCall.h"
-#include "pellar/mounts/MountContext.h"
 
 #include <fcntl.h>
+#include <libmount/libmount.h>
 #include <linux/cdrom.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
@@ -22,7 +22,24 @@ namespace {
 struct Free {
     void operator()(libmnt_table* table) const { mnt_unref_table(table); }
     void operator()(libmnt_cache* cache) const { mnt_unref_cache(cache); }
+    void operator()(libmnt_context* context) const { mnt_free_context(context); }
 };
+
+/// One mount or unmount by libmount; null when there is no memory.
+using MountContext = std::unique_ptr<libmnt_context, Free>;
+
+/// What libmount's answer to it means: 0, or an errno value. The library answers its own failures
+/// negative, and a system call's with a status of its own (libmount's documentation, "Mount
+/// context"). A helper, such as that of NTFS-3G, has neither and told its own standard error: EIO.
+int errorOf(const MountContext& context, int answer)
+{
+    const bool hasHelperFailed = mnt_context_helper_executed(context.get()) == 1 &&
+                                 mnt_context_get_helper_status(context.get()) != 0;
+    if (answer == 0)
+        return hasHelperFailed ? EIO : 0;
+    const int error = mnt_context_get_syscall_errno(context.get());
+    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
+}
 
 Answer<> answerOf(int error)
 {
@@ -67,7 +84,7 @@ Answer<> mount(const std::string& node)
     const std::string target = targetInTable(node);
     if (target.empty())
         return Refusal{Refusal::Kind::NoTable, {}};
-    const pellar::MountContext context(mnt_new_context());
+    const MountContext context(mnt_new_context());
     if (!context)
         return answerOf(ENOMEM);
     // By its target alone, libmount takes the rest from the table.
@@ -82,7 +99,7 @@ Answer<> unmount(const std::string& node)
         return Refusal{Refusal::Kind::AlreadySo, {}};
     // The last one first: it may lie over or below the others.
     for (; !places.empty(); places.pop_back()) {
-        const pellar::MountContext context(mnt_new_context());
+        const MountContext context(mnt_new_context());
         if (!context)
             return answerOf(ENOMEM);
         if (isCovered(places.back(), places))

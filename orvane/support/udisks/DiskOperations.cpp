@@ -52,7 +52,7 @@ Answer<> throughAny(UDisks& udisks, const DiskStep& step)
 
 // Asked of the mounts as they are now: the list of disks may be out of date. Root's own attempt
 // would take away what else of the device is mounted before it came to "/".
-bool holdsSystem(const std::vector<pellar::MountPlace>& places)
+bool holdsSystem(const std::vector<pellar::Mount>& places)
 {
     return std::any_of(places.begin(), places.end(),
                        [](const auto& place) { return place.target == "/"; });

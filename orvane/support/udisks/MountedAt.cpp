@@ -5,15 +5,15 @@
 
 namespace orvane {
 
-std::vector<pellar::MountPlace> placesOf(const std::string& node)
+std::vector<pellar::Mount> placesOf(const std::string& node)
 {
-    return pellar::mountPlacesOf(std::filesystem::path(node), pellar::SystemPaths());
+    return pellar::mountsOf(std::filesystem::path(node), pellar::SystemPaths());
 }
 
-std::string holdersText(const std::vector<pellar::MountPlace>& places)
+std::string holdersText(const std::vector<pellar::Mount>& places)
 {
     std::vector<std::string> holders;
-    for (const pellar::MountPlace& place : places)
+    for (const pellar::Mount& place : places)
         for (const std::string& holder : pellar::holdersOf(place.target))
             holders.push_back(holder);
     return pellar::shownNames(holders);

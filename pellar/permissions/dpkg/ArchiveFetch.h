@@ -5,7 +5,7 @@
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/process/ProcessRunner.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <filesystem>
 #include <functional>

@@ -6,7 +6,7 @@
 #include "pellar/permissions/reader/BrokeredServices.h"
 #include "pellar/permissions/reader/ReaderRights.h"
 #include "pellar/permissions/reader/ReferenceBytes.h"
-#include "pellar/process/ForkedSignals.h"
+#include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>
 #include <poll.h>

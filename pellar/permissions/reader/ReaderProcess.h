@@ -3,7 +3,7 @@
 
 #include "pellar/permissions/Reference.h"
 #include "pellar/permissions/dpkg/DpkgReferences.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 #include "pellar/texts/Sentence.h"
 
 #include <functional>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/process/LineSplitter.h"
+#include "pellar/process/ProcessOutput.h"
 
 #include <algorithm>
 
