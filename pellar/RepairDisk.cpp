@@ -7,8 +7,8 @@
 #include "pellar/jobs/MapScript.h"
 #include "pellar/jobs/PartOfImageScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/packages/InstalledSystem.h"
 #include "pellar/partitions/MapDisk.h"
-#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 

@@ -3,7 +3,7 @@
 
 #include "contract/foundation/UTF8.h"
 #include "pellar/mounts/MountTable.h"
-#include "pellar/permissions/InstalledSystem.h"
+#include "pellar/packages/InstalledSystem.h"
 
 #include <sys/stat.h>
 

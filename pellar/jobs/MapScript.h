@@ -3,9 +3,9 @@
 
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/partitions/MapClaim.h"
+#include "pellar/outcome/Outcome.h"
+#include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/partitions/RepairPlan.h"
 

@@ -5,8 +5,8 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
+#include "pellar/packages/InstalledSystem.h"
 #include "pellar/permissions/InstalledReferences.h"
-#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PermissionsOutcome.h"
 #include "pellar/permissions/Restoring.h"
 

@@ -3,13 +3,12 @@
 
 #include "pellar/ManagerOptions.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/outcome/Outcome.h"
 #include "pellar/jobs/Script.h"
-#include "pellar/permissions/Comparison.h"
+#include "pellar/outcome/Outcome.h"
+#include "pellar/packages/Reference.h"
+#include "pellar/packages/RootDirectory.h"
 #include "pellar/permissions/Inspection.h"
-#include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/permissions/Tally.h"
+#include "pellar/permissions/PermissionsOutcome.h"
 
 #include <optional>
 

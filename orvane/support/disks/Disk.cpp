@@ -2,7 +2,7 @@
 #include "orvane/support/disks/Disk.h"
 
 #include "orvane/support/disks/Ownership.h"
-#include "pellar/permissions/InstalledSystem.h"
+#include "pellar/packages/InstalledSystem.h"
 
 #include <algorithm>
 #include <utility>

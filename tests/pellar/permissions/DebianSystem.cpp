@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/permissions/DebianSystem.h"
 
-#include "pellar/permissions/Digest.h"
+#include "pellar/packages/Digest.h"
 #include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>

@@ -3,9 +3,9 @@
 // owners do.
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/permissions/InstalledSystem.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/permissions/dpkg/DpkgReferences.h"
+#include "pellar/packages/InstalledSystem.h"
+#include "pellar/packages/RootDirectory.h"
+#include "pellar/packages/dpkg/DpkgReferences.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/permissions/DebianSystem.h"
 

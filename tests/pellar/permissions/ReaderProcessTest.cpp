@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 // The process that reads what strangers wrote, and what they may have written.
 
-#include "pellar/permissions/PackagedFile.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/permissions/ScriptMentions.h"
-#include "pellar/permissions/TemporaryDirectory.h"
-#include "pellar/permissions/reader/ReaderProcess.h"
-#include "pellar/permissions/reader/ReferenceBytes.h"
-#include "pellar/permissions/rpm/DatabaseCopy.h"
+#include "pellar/packages/PackagedFile.h"
+#include "pellar/packages/RPMReferences.h"
+#include "pellar/packages/RootDirectory.h"
+#include "pellar/packages/ScriptMentions.h"
+#include "pellar/packages/TemporaryDirectory.h"
+#include "pellar/packages/reader/ReaderProcess.h"
+#include "pellar/packages/reader/ReferenceBytes.h"
 #include "pellar/process/ChildProcess.h"
 #include "pellar/process/ReducedRights.h"
 #include "tests/pellar/permissions/DebianSystem.h"
