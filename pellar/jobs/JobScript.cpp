@@ -11,7 +11,7 @@
 #include "pellar/outcome/Damage.h"
 #include "pellar/jobs/Obstacles.h"
 #include "pellar/jobs/OutcomeReport.h"
-#include "pellar/probe/SignatureProbe.h"
+#include "pellar/probe/DiskProbe.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
@@ -141,9 +141,9 @@ std::optional<Outcome> JobScript::objection() const
 /// What is there is named, where it is something.
 Outcome JobScript::withoutTool() const
 {
-    const std::string type = probeSignature(disk_.claim().descriptor(), disk_.claim().offset(),
-                                            disk_.claim().availableBytes())
-                                 .type;
+    const DiskClaim& claim = disk_.claim();
+    const std::string type =
+        readSuperblock(claim.descriptor(), {claim.offset(), claim.availableBytes()}).type;
     if (type.empty())
         return failedOutcome(contract::kPLErrorUnsupported,
                              {"no file system was found that can be checked", {}, {}});

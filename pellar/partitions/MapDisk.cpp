@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapDisk.h"
 
-#include "pellar/probe/SignatureProbe.h"
+#include "pellar/probe/DiskProbe.h"
 
 #include <fcntl.h>
 #include <linux/fs.h>
@@ -81,7 +81,7 @@ PartitionMap readMapOf(int descriptor, const FileSectors& sectors, std::uint64_t
     const bool isPlainMBR = map.kind == PartitionMap::Kind::MBR && map.boot.ordinaryCount() > 0;
     if (isPlainMBR || (map.boot.hasProtective() && map.hasCopiesInPlace()))
         return map;
-    const Signature signature = probeSignature(descriptor, offset, length);
+    const Superblock signature = readSuperblock(descriptor, {offset, length});
     return readPartitionMap(sectors, signature.isAmbivalent ? "?" : signature.type);
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/VolumeFacts.h"
 
-#include "pellar/probe/SignatureProbe.h"
+#include "pellar/probe/DiskProbe.h"
 
 namespace pellar {
 
@@ -10,7 +10,7 @@ bool isForeignTo(std::string_view filesystemType, bool isRecognized, int disk, s
 {
     if (!isRecognized)
         return true;
-    const Signature signature = probeSignature(disk, offset, availableBytes);
+    const Superblock signature = readSuperblock(disk, {offset, availableBytes});
     return signature.isAmbivalent || (!signature.type.empty() && signature.type != filesystemType);
 }
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/probe/SignatureProbe.h"
+#include "pellar/probe/DiskProbe.h"
 #include "pellar/process/ChildProcess.h"
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
@@ -94,7 +94,7 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     if (facts.hasPrimary && !superblock->needsRecovery)
         facts.files = countExtFiles(disk, offset, *superblock);
     if (!facts.hasPrimary && availableBytes > 0) {
-        const Signature signature = probeSignature(disk, offset, availableBytes);
+        const Superblock signature = readSuperblock(disk, {offset, availableBytes});
         const bool isExt = signature.type.starts_with("ext") || signature.type.empty();
         facts.isForeign = signature.isAmbivalent || !isExt;
     }

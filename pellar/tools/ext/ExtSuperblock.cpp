@@ -163,4 +163,14 @@ std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
                                          : std::nullopt;
 }
 
+bool hasExtBackupSuperblock(int descriptor, ByteRange range)
+{
+    return std::any_of(backupPlaces.begin(), backupPlaces.end(), [&](const BackupPlace& backup) {
+        if (backup.offset + ExtSuperblock::size > range.length)
+            return false;
+        const auto bytes = readDisk(descriptor, range.offset + backup.offset, ExtSuperblock::size);
+        return bytes && number(*bytes, 0x38, 2) == magicNumber && number(*bytes, 0x5A, 2) == 1;
+    });
+}
+
 }  // namespace pellar

@@ -3,6 +3,7 @@
 
 #include "pellar/bytes/Bytes.h"
 #include "pellar/disks/Readability.h"
+#include "pellar/probe/DiskProbe.h"
 
 #include <cstddef>
 #include <cstdint>
@@ -62,5 +63,9 @@ std::optional<ExtSuperblock> readExtSuperblock(int descriptor, std::uint64_t off
 /// itself among them. None where the books do not agree with each other, or cannot be read.
 std::optional<std::uint64_t> countExtFiles(int descriptor, std::uint64_t offset,
                                            const ExtSuperblock& superblock);
+
+/// A backup superblock of ext2, ext3 or ext4 stands where mke2fs puts the first one: the volume
+/// was made by it even though its own superblock is gone.
+[[nodiscard]] bool hasExtBackupSuperblock(int descriptor, ByteRange range);
 
 }  // namespace pellar
