@@ -21,8 +21,6 @@ struct ExfatBootSector {
     std::uint32_t sectorBytes = 0;
     bool isMarkedDirty = false;  ///< not properly unmounted
     bool isBackup = false;
-
-    friend bool operator==(const ExfatBootSector&, const ExfatBootSector&) = default;
 };
 
 std::optional<ExfatBootSector> parseExfatBootSector(ByteView bytes)

@@ -17,8 +17,6 @@ struct F2fsSuperblock {
 
     std::uint64_t volumeBytes = 0;
     bool isBackup = false;
-
-    friend bool operator==(const F2fsSuperblock&, const F2fsSuperblock&) = default;
 };
 
 std::optional<F2fsSuperblock> parseF2fsSuperblock(ByteView bytes)

@@ -21,8 +21,6 @@ struct FatBootSector {
     std::uint64_t volumeBytes = 0;
     bool isMarkedDirty = false;  ///< not properly unmounted
     bool isBackup = false;
-
-    friend bool operator==(const FatBootSector&, const FatBootSector&) = default;
 };
 
 /// The fields that FAT12, FAT16 and FAT32 share.

@@ -20,8 +20,6 @@ struct XfsSuperblock {
     bool hasExternalLog = false;
     bool hasRealtimePart = false;  ///< kept on another disk
     bool isBackup = false;
-
-    friend bool operator==(const XfsSuperblock&, const XfsSuperblock&) = default;
 };
 
 /// Where a second group may begin: a disk is divided into four (small ones into two), and no group

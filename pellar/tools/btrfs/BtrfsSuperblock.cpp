@@ -4,7 +4,9 @@
 #include <algorithm>
 
 namespace pellar {
+namespace {
 
+/// None for a superblock that says itself that it belongs elsewhere than at `place`.
 std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_t place)
 {
     if (bytes.size() < BtrfsSuperblock::size || !holdsText(bytes, 64, "_BHRfS_M") ||
@@ -17,6 +19,8 @@ std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_
     block.diskBytes = littleEndian(bytes, 209, 8);
     return block.disks == 0 ? std::nullopt : std::optional(block);
 }
+
+}  // namespace
 
 std::optional<BtrfsSuperblock> readBtrfsSuperblock(int descriptor, std::uint64_t offset,
                                                    std::uint64_t availableBytes)

@@ -20,12 +20,7 @@ struct BtrfsSuperblock {
     std::uint64_t disks = 0;      ///< that the volume is made of
     bool hasLog = false;          ///< changes that only a mount brings to their place
     bool isBackup = false;
-
-    friend bool operator==(const BtrfsSuperblock&, const BtrfsSuperblock&) = default;
 };
-
-/// None for a superblock that says itself that it belongs elsewhere than at `place`.
-std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_t place);
 
 /// The superblock at 64 KiB, or a copy of it at 64 MiB or 256 GiB.
 std::optional<BtrfsSuperblock> readBtrfsSuperblock(int descriptor, std::uint64_t offset,

@@ -10,7 +10,6 @@ namespace pellar {
 namespace {
 
 constexpr std::uint16_t magicNumber = 0xEF53;
-constexpr std::uint32_t compatHasJournal = 0x4;
 constexpr std::uint32_t incompatRecover = 0x4;
 constexpr std::uint32_t incompatJournalDevice = 0x8;
 constexpr std::uint32_t incompat64Bit = 0x80;
@@ -40,6 +39,36 @@ struct BackupPlace {
 constexpr std::array backupPlaces{BackupPlace{32768ULL * 4096, 4096},
                                   BackupPlace{8193ULL * 1024, 1024},
                                   BackupPlace{16384ULL * 2048, 2048}};
+
+/// None when the bytes are no superblock: no magic number, impossible geometry, or a checksum
+/// that does not fit.
+std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes)
+{
+    constexpr std::uint32_t greatestBlockShift = 6;  // blocks of 64 KiB
+    if (bytes.size() < ExtSuperblock::size || number(bytes, 0x38, 2) != magicNumber)
+        return std::nullopt;
+    const std::uint32_t blockShift = number(bytes, 0x18, 4);
+    const std::uint32_t compat = number(bytes, 0x5C, 4);
+    const std::uint32_t incompat = number(bytes, 0x60, 4);
+    ExtSuperblock block;
+    block.blockCount = number(bytes, 0x04, 4);
+    if ((incompat & incompat64Bit) != 0)
+        block.blockCount |= std::uint64_t{number(bytes, 0x150, 4)} << 32U;
+    if (blockShift > greatestBlockShift || block.blockCount == 0 || !hasRightChecksum(bytes))
+        return std::nullopt;
+    block.blockBytes = 1024U << blockShift;
+    block.inodeCount = number(bytes, 0x00, 4);
+    block.freeInodes = number(bytes, 0x10, 4);
+    block.firstDataBlock = number(bytes, 0x14, 4);
+    block.groupBlocks = number(bytes, 0x20, 4);
+    block.descriptorBytes = (incompat & incompat64Bit) != 0 ? number(bytes, 0xFE, 2) : 32;
+    block.hasMetaGroups = (incompat & incompatMetaGroups) != 0;
+    block.hasFewBackups = (compat & compatFewBackups) != 0;
+    block.hasSparseBackups = (number(bytes, 0x64, 4) & readOnlyCompatSparseBackups) != 0;
+    block.isJournalDevice = (incompat & incompatJournalDevice) != 0;
+    block.needsRecovery = (incompat & incompatRecover) != 0;
+    return block;
+}
 
 std::optional<ExtSuperblock> readAt(int descriptor, std::uint64_t place)
 {
@@ -84,36 +113,6 @@ std::vector<DiskPiece> ExtSuperblock::backups(std::uint64_t availableBytes) cons
             pieces.push_back({start, std::min(bytes, availableBytes - start)});
         }
     return pieces;
-}
-
-std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes)
-{
-    constexpr std::uint32_t greatestBlockShift = 6;  // blocks of 64 KiB
-    if (bytes.size() < ExtSuperblock::size || number(bytes, 0x38, 2) != magicNumber)
-        return std::nullopt;
-    const std::uint32_t blockShift = number(bytes, 0x18, 4);
-    const std::uint32_t compat = number(bytes, 0x5C, 4);
-    const std::uint32_t incompat = number(bytes, 0x60, 4);
-    ExtSuperblock block;
-    block.blockCount = number(bytes, 0x04, 4);
-    if ((incompat & incompat64Bit) != 0)
-        block.blockCount |= std::uint64_t{number(bytes, 0x150, 4)} << 32U;
-    if (blockShift > greatestBlockShift || block.blockCount == 0 || !hasRightChecksum(bytes))
-        return std::nullopt;
-    block.blockBytes = 1024U << blockShift;
-    block.hasJournal = (compat & compatHasJournal) != 0;
-    block.hasExternalJournal = block.hasJournal && number(bytes, 0xE0, 4) == 0;
-    block.inodeCount = number(bytes, 0x00, 4);
-    block.freeInodes = number(bytes, 0x10, 4);
-    block.firstDataBlock = number(bytes, 0x14, 4);
-    block.groupBlocks = number(bytes, 0x20, 4);
-    block.descriptorBytes = (incompat & incompat64Bit) != 0 ? number(bytes, 0xFE, 2) : 32;
-    block.hasMetaGroups = (incompat & incompatMetaGroups) != 0;
-    block.hasFewBackups = (compat & compatFewBackups) != 0;
-    block.hasSparseBackups = (number(bytes, 0x64, 4) & readOnlyCompatSparseBackups) != 0;
-    block.isJournalDevice = (incompat & incompatJournalDevice) != 0;
-    block.needsRecovery = (incompat & incompatRecover) != 0;
-    return block;
 }
 
 std::optional<ExtSuperblock> readExtSuperblock(int descriptor, std::uint64_t offset,

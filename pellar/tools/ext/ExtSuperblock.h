@@ -19,8 +19,6 @@ struct ExtSuperblock {
 
     std::uint64_t blockCount = 0;
     std::uint32_t blockBytes = 0;
-    bool hasJournal = false;
-    bool hasExternalJournal = false;
     /// The volume is itself the journal of another one.
     bool isJournalDevice = false;
     /// The journal holds changes that are not yet in their place.
@@ -45,13 +43,7 @@ struct ExtSuperblock {
 
     /// Bytes; the greatest number when the product does not fit.
     std::uint64_t volumeBytes() const;
-
-    friend bool operator==(const ExtSuperblock&, const ExtSuperblock&) = default;
 };
-
-/// None when the bytes are no superblock: no magic number, impossible geometry, or a checksum
-/// that does not fit.
-std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes);
 
 /// The primary superblock of the volume that starts at `offset`, or, where there is none, the first
 /// backup at the places where mke2fs(8) puts it for the block sizes 1, 2 and 4 KiB. None when

@@ -20,8 +20,6 @@ struct NtfsBootSector {
     friend bool operator==(const NtfsBootSector&, const NtfsBootSector&) = default;
 };
 
-std::optional<NtfsBootSector> parseNtfsBootSector(ByteView bytes);
-
 /// The boot sector of the volume that starts at `offset`, or its backup in the last sector.
 std::optional<NtfsBootSector> readNtfsBootSector(int descriptor, std::uint64_t offset,
                                                  std::uint64_t availableBytes);

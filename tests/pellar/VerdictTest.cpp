@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/process/ProcessOutput.h"
-#include "pellar/tools/ToolTable.h"
+#include "pellar/tools/btrfs/BtrfsScrub.h"
 #include "tests/pellar/Recorded.h"
 
 #include <gtest/gtest.h>
@@ -8,7 +7,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <csignal>
-#include <iterator>
 #include <map>
 #include <random>
 
@@ -16,35 +14,8 @@ namespace {
 
 using namespace pellar;
 
-/// The lines as a run would tell them: what a tool writes over itself is two lines.
-std::vector<std::string> linesOf(const std::filesystem::path& recording)
-{
-    std::ifstream file(recording, std::ios::binary);
-    if (!file)
-        throw std::runtime_error("no recording " + recording.string());
-    std::vector<std::string> lines;
-    LineSplitter splitter(4096,
-                          [&lines](std::string_view line, bool) { lines.emplace_back(line); });
-    splitter.take(std::string(std::istreambuf_iterator<char>(file), {}));
-    splitter.finish();
-    return lines;
-}
-
-std::filesystem::path recordingOf(std::string_view name)
-{
-    return std::filesystem::path(PELLAR_RECORDED_DIRECTORY) / (std::string(name) + ".txt");
-}
-
-test::Reading readAll(const Tool& tool, const std::vector<std::string>& lines)
-{
-    const auto reader = tool.makeReader();
-    test::Reading reading;
-    for (const std::string& line : lines)
-        reader->read(line, reading.lines);
-    reader->finish(reading.lines);
-    reading.findings = reader->findings();
-    return reading;
-}
+using test::readAll;
+using test::recordedLines;
 
 VolumeFacts plainVolume()
 {
@@ -70,6 +41,19 @@ struct Case {
 };
 
 const std::vector<Case> verifications{
+    {"ext4", "e2fsck/sound", 0, Verdict::Sound, 0, "nothing found"},
+    {"ext4", "e2fsck/optimizable", 0, Verdict::Sound, 0, "a saving is no damage"},
+    {"ext4", "e2fsck/wrong-free-count", 0, Verdict::Damaged, 1, "a repair would write, despite 0"},
+    {"ext4", "e2fsck/damaged", 4, Verdict::Damaged, 6, "it says so itself"},
+    {"ext4", "e2fsck/multiply-claimed", 4, Verdict::Damaged, 3, "it says so itself"},
+    {"ext4", "e2fsck/old-journal", 0, Verdict::Damaged, 1, "a repair would write, and not ask"},
+    {"ext4", "e2fsck/backup-superblock", 4, Verdict::Damaged, 20, "the main superblock is lost"},
+    {"ext4", "e2fsck/gave-up", 12, Verdict::Damaged, 12, "gave up with damage in sight"},
+    {"ext4", "e2fsck/journal-skipped", 0, Verdict::Inconclusive, 1, "it may put the count right"},
+    {"ext4", "e2fsck/external-journal-missing", 12, Verdict::Inconclusive, 1, "half is not here"},
+    {"ext4", "e2fsck/no-superblock", 8, Verdict::Damaged, 3, "none where there was one"},
+    {"ext4", "e2fsck/crashed", 8, Verdict::Failed, 1, "a crash is no answer"},
+    {"ext4", "e2fsck/cancelled", 32, Verdict::Stopped, 0, "interrupted, and not by us"},
     {"vfat", "fsck.fat/sound", 0, Verdict::Sound, 0, "nothing found"},
     {"vfat", "fsck.fat/dirty", 1, Verdict::Damaged, 1, "a repair would take the mark off"},
     {"vfat", "fsck.fat/lost", 1, Verdict::Damaged, 1, "a chain without a name"},
@@ -111,40 +95,37 @@ const std::vector<Case> verifications{
     {"f2fs", "fsck.f2fs/no-first-superblock", 0, Verdict::Damaged, 2, "0, as the second is good"},
 };
 
-std::size_t problemsIn(const test::Reading& reading)
-{
-    return static_cast<std::size_t>(
-        std::count_if(reading.lines.begin(), reading.lines.end(),
-                      [](const ToolLine& line) { return line.kind == ToolLine::Kind::Problem; }));
-}
-
 TEST(ToolVerdict, OfRecordedVerifications)
 {
     for (const Case& c : verifications) {
         const Tool& tool = *toolFor(c.filesystem);
-        const auto lines = linesOf(recordingOf(c.recording));
+        const auto lines = recordedLines(c.recording);
         EXPECT_EQ(judge(tool, lines, Exited{c.status}).verdict, c.verdict)
             << c.recording << ": " << c.because;
-        const auto reading = readAll(tool, lines);
-        EXPECT_EQ(problemsIn(reading), c.problems) << c.recording << ": " << c.because;
-        EXPECT_EQ(reading.findings.problems, c.problems) << c.recording;
+        EXPECT_EQ(readAll(tool, lines).problems().size(), c.problems) << c.recording;
     }
 }
 
 TEST(ToolVerdict, TruncatedOutputNeverReadsAsSound)
 {
-    for (const Case& c : verifications) {
-        const Tool& tool = *toolFor(c.filesystem);
-        const auto all = linesOf(recordingOf(c.recording));
+    const auto expectNeverSound = [](std::string_view filesystem, std::string_view recording) {
         // What stands behind the line that ends the check itself: advice, or a tally.
-        const std::size_t behind = c.filesystem == "ntfs" ? 3 : c.filesystem == "btrfs" ? 7 : 1;
+        const std::size_t behind = filesystem == "ntfs"    ? 3
+                                   : filesystem == "btrfs" ? 7
+                                   : filesystem == "ext4"  ? 0
+                                                           : 1;
+        const auto all = recordedLines(recording);
         for (std::size_t kept = 0; kept + behind < all.size(); ++kept) {
             const std::vector<std::string> lines(all.begin(),
                                                  all.begin() + static_cast<std::ptrdiff_t>(kept));
-            EXPECT_NE(judge(tool, lines, Exited{0}).verdict, Verdict::Sound)
-                << c.recording << " after " << kept << " lines";
+            EXPECT_NE(judge(*toolFor(filesystem), lines, Exited{0}).verdict, Verdict::Sound)
+                << recording << " after " << kept << " lines";
         }
-    }
+    };
+    for (const Case& c : verifications)
+        expectNeverSound(c.filesystem, c.recording);
+    for (const std::string& recording : test::recordingsOfE2fsck())
+        expectNeverSound("ext4", recording);
 }
 
 TEST(ToolVerdict, OnlyACleanExitIsSound)
@@ -153,7 +134,7 @@ TEST(ToolVerdict, OnlyACleanExitIsSound)
         if (c.verdict != Verdict::Sound || c.filesystem == "ntfs")
             continue;
         const Tool& tool = *toolFor(c.filesystem);
-        const auto lines = linesOf(recordingOf(c.recording));
+        const auto lines = recordedLines(c.recording);
         for (int status = 1; status < 256; ++status)
             EXPECT_NE(judge(tool, lines, Exited{status}).verdict, Verdict::Sound) << status;
         for (const Ending& ending : {Ending(Killed{SIGKILL}), Ending(NotStarted{ENOENT})})
@@ -166,33 +147,53 @@ TEST(ToolVerdict, WeighsWhatWeKnowBesides)
 {
     struct Doubt {
         void (*apply)(VolumeFacts& volume);
+        bool concernsExt;
         Verdict verdict;
         std::string_view because;
     };
     const Doubt doubts[] = {
-        {[](VolumeFacts& v) { v.availableBytes -= 1; }, Verdict::Damaged, "its end is missing"},
-        {[](VolumeFacts& v) { v.hasPrimary = false; }, Verdict::Damaged, "a copy was taken"},
-        {[](VolumeFacts& v) { v.needsRecovery = true; }, Verdict::Inconclusive, "a log waits"},
+        {[](VolumeFacts& v) { v.availableBytes -= 1; }, true, Verdict::Damaged,
+         "its end is missing"},
+        {[](VolumeFacts& v) { v.hasPrimary = false; }, false, Verdict::Damaged, "a copy was taken"},
+        {[](VolumeFacts& v) { v.needsRecovery = true; }, true, Verdict::Inconclusive,
+         "a log waits"},
     };
     for (const Case& c : verifications)
         for (const Doubt& doubt : doubts) {
-            if (c.verdict != Verdict::Sound)
+            // e2fsck says itself that it took a copy.
+            if (c.verdict != Verdict::Sound || (c.filesystem == "ext4" && !doubt.concernsExt))
                 continue;
             VolumeFacts volume = plainVolume();
             doubt.apply(volume);
-            EXPECT_EQ(
-                judge(*toolFor(c.filesystem), linesOf(recordingOf(c.recording)), Exited{0}, volume)
-                    .verdict,
-                doubt.verdict)
+            EXPECT_EQ(judge(*toolFor(c.filesystem), recordedLines(c.recording), Exited{0}, volume)
+                          .verdict,
+                      doubt.verdict)
                 << c.recording << ": " << doubt.because;
         }
+}
+
+TEST(ToolVerdict, WhatARunHadFoundBeforeItWasEndedStands)
+{
+    for (const Tool* const tool : allTools()) {
+        RunEvidence evidence{
+            Access::ReadOnly, {Killed{SIGINT}, StopCause::TooMuchOutput}, {}, plainVolume()};
+        EXPECT_EQ(tool->judge(evidence).code, contract::kPLErrorToolMisbehaved) << tool->name;
+        evidence.findings.problems = 1;
+        EXPECT_EQ(tool->judge(evidence).verdict, Verdict::Damaged) << tool->name;
+        evidence.result.cause = StopCause::User;
+        EXPECT_EQ(tool->judge(evidence).verdict, Verdict::Stopped) << tool->name;
+        evidence.result = {Exited{8}, StopCause::None};
+        evidence.findings = {};
+        evidence.findings.foundDiskInUse = true;
+        EXPECT_EQ(tool->judge(evidence).code, contract::kPLErrorDiskInUse) << tool->name;
+    }
 }
 
 // Mounting makes anew what they tell of; for the quotas it exits with 1.
 TEST(ToolVerdict, RemarksOfBtrfsAreNoDamage)
 {
     const Tool& btrfs = *toolFor("btrfs");
-    auto lines = linesOf(recordingOf("btrfs/sound"));
+    auto lines = recordedLines("btrfs/sound");
     const auto insert = [&lines](std::string line) {
         lines.insert(lines.begin() + 3, std::move(line));
     };
@@ -288,8 +289,7 @@ TEST(ToolVerdict, AMarkOfImproperUnmountingIsNeverSound)
     VolumeFacts marked = plainVolume();
     marked.isMarkedDirty = true;
     const auto verdictOf = [&marked](std::string_view filesystem, std::string_view recording) {
-        return judge(*toolFor(filesystem), linesOf(recordingOf(recording)), Exited{0}, marked)
-            .verdict;
+        return judge(*toolFor(filesystem), recordedLines(recording), Exited{0}, marked).verdict;
     };
     EXPECT_EQ(verdictOf("exfat", "fsck.exfat/sound"), Verdict::Damaged)
         << "fsck.exfat pays no heed to it, and takes it off";
@@ -307,7 +307,11 @@ TEST(ToolVerdict, OfRepairingRuns)
         std::string_view because;
     };
     for (const Repair& c :
-         {Repair{"vfat", "fsck.fat/repaired", 1, true, "it says that it has written"},
+         {Repair{"ext4", "e2fsck/repaired", 1, true, "all corrected"},
+          Repair{"ext4", "e2fsck/repaired", 3, true, "and the root volume is to be rebooted"},
+          Repair{"ext4", "e2fsck/sound", 0, false, "there was nothing to do"},
+          Repair{"ext4", "e2fsck/no-superblock", 8, false, "it got nowhere"},
+          Repair{"vfat", "fsck.fat/repaired", 1, true, "it says that it has written"},
           Repair{"vfat", "fsck.fat/no-fat", 1, false, "it says 1 all the same"},
           Repair{"exfat", "fsck.exfat/repaired", 1, true, "corrected"},
           Repair{"exfat", "fsck.exfat/debian13-repaired", 1, true, "other numbers in its lines"},
@@ -319,17 +323,9 @@ TEST(ToolVerdict, OfRepairingRuns)
           Repair{"xfs", "xfs_repair/log-first", 2, false, "it refused"},
           Repair{"f2fs", "fsck.f2fs/repaired", 1, true, "it came to its end"},
           Repair{"f2fs", "fsck.f2fs/lost-nodes", 255, false, "it gave up"}}) {
-        const Judgement judgement = judge(*toolFor(c.filesystem), linesOf(recordingOf(c.recording)),
+        const Judgement judgement = judge(*toolFor(c.filesystem), recordedLines(c.recording),
                                           Exited{c.status}, plainVolume(), Access::ReadWrite);
         EXPECT_EQ(judgement.madeProgress, c.madeProgress) << c.recording << ": " << c.because;
-    }
-}
-
-TEST(ToolVerdict, StoppedIsStopped)
-{
-    for (const Tool* const tool : allTools()) {
-        RunEvidence evidence{Access::ReadOnly, {Exited{0}, StopCause::User}, {}, plainVolume()};
-        EXPECT_EQ(tool->judge(evidence).verdict, Verdict::Stopped) << tool->name;
     }
 }
 
@@ -340,22 +336,26 @@ TEST(ToolArguments, OnlyARepairMayWrite)
         {"e2fsck", "-n"},          {"fsck.fat", "-n"},   {"fsck.exfat", "-n"},
         {"ntfsresize", "-i"},      {"xfs_repair", "-n"}, {"btrfs", "--readonly"},
         {"fsck.f2fs", "--dry-run"}};
-    for (const Tool* const tool : allTools()) {
-        const auto verify = tool->arguments(Access::ReadOnly, "/proc/self/fd/3", 0);
-        EXPECT_EQ(std::count(verify.begin(), verify.end(), readOnly.at(tool->name)), 1)
-            << tool->name;
-        EXPECT_EQ(verify.back(), "/proc/self/fd/3");
-        const auto repair = tool->arguments(Access::ReadWrite, "/proc/self/fd/3", 0);
-        const bool isSameProgram = tool->canRepair() && tool->repairName == tool->name;
-        EXPECT_TRUE(!isSameProgram ||
-                    std::count(repair.begin(), repair.end(), readOnly.at(tool->name)) == 0)
-            << tool->name;
-    }
+    // Every option of any of them that lets it write.
+    const std::vector<std::string> writing{"-y", "-p", "-a", "-D", "-c", "-l",
+                                           "-L", "-z", "-w", "-r", "-s", "--repair"};
+    for (const Tool* const tool : allTools())
+        for (const std::uint64_t offset : {0U, 4096U}) {
+            const auto verify = tool->arguments(Access::ReadOnly, "/proc/self/fd/3", offset);
+            EXPECT_EQ(std::ranges::count(verify, readOnly.at(tool->name)), 1) << tool->name;
+            for (const std::string& option : writing)
+                EXPECT_EQ(std::ranges::count(verify, option), 0) << tool->name << option;
+            EXPECT_TRUE(verify.back().starts_with("/proc/self/fd/3")) << tool->name;
+            const auto repair = tool->arguments(Access::ReadWrite, "/proc/self/fd/3", offset);
+            const bool isSameProgram = tool->canRepair() && tool->repairName == tool->name;
+            EXPECT_TRUE(!isSameProgram || std::ranges::count(repair, readOnly.at(tool->name)) == 0)
+                << tool->name;
+        }
 }
 
 TEST(ToolOutput, ProgressIsToldAndNotShown)
 {
-    const auto reading = readAll(*toolFor("ntfs"), linesOf(recordingOf("ntfs/sound")));
+    const auto reading = readAll(*toolFor("ntfs"), recordedLines("ntfs/sound"));
     std::vector<double> percents;
     for (const ToolLine& line : reading.lines)
         if (line.kind == ToolLine::Kind::Progress)
@@ -375,6 +375,75 @@ TEST(ToolOutput, AnyBytesAreRead)
             lines.push_back(line);
         }
         EXPECT_NE(judge(*tool, lines, Exited{0}).verdict, Verdict::Sound) << tool->name;
+    }
+}
+
+Judgement judgeScrub(const std::vector<std::string>& lines, Ending ending,
+                     StopCause cause = StopCause::None, std::size_t disks = 1)
+{
+    ScrubReport report;
+    for (const std::string& line : lines)
+        readScrubLine(line, report);
+    return judgeScrub({ending, cause}, report, disks);
+}
+
+TEST(ScrubVerdict, OfWhatBtrfsScrubReallyPrinted)
+{
+    struct Scrub {
+        const char* recording;
+        Ending ending;
+        Verdict verdict;
+        const char* says;
+        std::string_view because;
+    };
+    for (const Scrub& c : {
+             Scrub{"sound", Exited{0}, Verdict::Sound, "", "nothing found"},
+             Scrub{"two-disks", Exited{0}, Verdict::Sound, "", "both were read"},
+             Scrub{"file", Exited{3}, Verdict::Damaged, "without any good copy", "one block"},
+             Scrub{"one-copy", Exited{0}, Verdict::Damaged, "another, good copy",
+                   "0 and \"corrected\", but nothing was corrected"},
+             Scrub{"no-copy", Exited{3}, Verdict::Damaged, "without any good copy", "both copies"},
+             Scrub{"file-and-copy", Exited{3}, Verdict::Damaged, "without any good copy",
+                   "the worse of the two is told"},
+             Scrub{"superblock", Exited{0}, Verdict::Damaged, "", "0, and no warning at all"},
+             Scrub{"missing-disk", Exited{0}, Verdict::Inconclusive, "another disk", "0"},
+             Scrub{"debian13-sound", Exited{0}, Verdict::Sound, "", "it says that it starts"},
+             Scrub{"debian13-two-disks", Exited{0}, Verdict::Sound, "", "for each disk"},
+             Scrub{"debian13-file", Exited{3}, Verdict::Damaged, "without any good copy",
+                   "it counts the errors in its sentence"},
+             Scrub{"debian13-one-copy", Exited{0}, Verdict::Damaged, "another, good copy",
+                   "\"1 corrected\", but nothing was corrected"},
+             Scrub{"debian13-missing-disk", Exited{0}, Verdict::Inconclusive, "another disk",
+                   "it says that it starts on the missing one"},
+             Scrub{"other", Exited{1}, Verdict::Failed, "another program is", "says so"},
+             Scrub{"other-unrecorded", Exited{1}, Verdict::Failed, "another program is",
+                   "only the kernel knows of the other"},
+             Scrub{"stopped", Exited{1}, Verdict::Failed, "another program has ended",
+                   "it was not us"},
+             Scrub{"no-right", Exited{1}, Verdict::Failed, "could not do its work", "not root"},
+             Scrub{"sound", Killed{9}, Verdict::Failed, "was killed", "whatever it had said"},
+             Scrub{"sound", Exited{3}, Verdict::Damaged, "", "the status says more than the text"},
+         }) {
+        const Judgement judgement = judgeScrub(
+            recordedLines("btrfs-scrub/" + std::string(c.recording)), c.ending, StopCause::None,
+            std::string_view(c.recording).ends_with("two-disks") ? 2 : 1);
+        EXPECT_EQ(judgement.verdict, c.verdict) << c.recording << ": " << c.because;
+        EXPECT_NE(judgement.reason.key.find(c.says), std::string_view::npos)
+            << c.recording << ": " << judgement.reason.key;
+    }
+    EXPECT_EQ(judgeScrub(recordedLines("btrfs-scrub/stopped"), Exited{1}, StopCause::User).verdict,
+              Verdict::Stopped);
+}
+
+TEST(ScrubVerdict, OutputThatIsCutShortIsNeverSound)
+{
+    for (const std::size_t disks : {1U, 2U}) {
+        auto lines = recordedLines(disks == 1 ? "btrfs-scrub/sound" : "btrfs-scrub/two-disks");
+        while (!lines.empty()) {
+            lines.pop_back();
+            EXPECT_NE(judgeScrub(lines, Exited{0}, StopCause::None, disks).verdict, Verdict::Sound)
+                << disks << " disks, " << lines.size() << " lines";
+        }
     }
 }
 
