@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/LineSplitter.h"
+#include "pellar/process/ProcessOutput.h"
 #include "pellar/tools/ToolTable.h"
 
 #include <filesystem>
