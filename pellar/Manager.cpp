@@ -12,7 +12,7 @@
 
 namespace pellar {
 
-Manager::Manager(contract::RunLoop& loop, const Texts& texts, ManagerOptions options)
+Manager::Manager(contract::RunLoop& loop, const Texts& texts, JobOptions options)
     : loop_(loop), texts_(texts), options_(std::move(options))
 {
 }

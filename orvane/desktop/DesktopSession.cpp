@@ -98,9 +98,9 @@ SupportOptions DesktopSession::supportOptions()
     return options;
 }
 
-pellar::ManagerOptions DesktopSession::libraryOptions()
+pellar::JobOptions DesktopSession::libraryOptions()
 {
-    pellar::ManagerOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
+    pellar::JobOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
     options.outputLimits = options_.outputLimits;
     options.archiveFetching = {[this] { return fetchesArchives(); },
                                libraryTexts_.text("The archives of these packages are downloaded "

@@ -61,7 +61,7 @@ public:
 
 private:
     SupportOptions supportOptions();
-    pellar::ManagerOptions libraryOptions();
+    pellar::JobOptions libraryOptions();
     DiskStates diskStates();
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
     std::string activityOn(const Disk& disk);

@@ -21,7 +21,7 @@ public:
         DesktopHost& host;
         WindowController& window;
         JobObserver& jobs;
-        pellar::ManagerOptions libraryOptions;
+        pellar::JobOptions libraryOptions;
     };
 
     /// Loads the bundle's module, unless it is switched off in the settings: then there is no tab.

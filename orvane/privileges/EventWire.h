@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/jobs/Event.h"
+#include "pellar/jobs/EventQueue.h"
 
 #include <optional>
 #include <string>

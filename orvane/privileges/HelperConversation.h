@@ -3,7 +3,7 @@
 
 #include "contract/pellar/PLRepairDisk.h"
 #include "orvane/support/loop/MainLoop.h"
-#include "pellar/jobs/Event.h"
+#include "pellar/jobs/EventQueue.h"
 
 #include <functional>
 

@@ -107,7 +107,7 @@ private:
 
     void work()
     {
-        pellar::ManagerOptions options;
+        pellar::JobOptions options;
         options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
         if (user_)
@@ -150,9 +150,9 @@ private:
 
     void refuse(const Undone& undone)
     {
-        pellar::EventRoad road(loop_, {&teller_, nullptr, {}, [] {
+        pellar::EventQueue events(loop_, {&teller_, nullptr, {}, [] {
                                        }});
-        pellar::JobLog log(request_.disk, texts_, road);
+        pellar::JobLog log(request_.disk, texts_, events);
         log.started();
         tellUndone(undone, request_, texts_, log);
         loop_.runUntil([this] { return teller_.isOver(); });

@@ -145,7 +145,7 @@ std::string acceptedLanguages(std::string_view list)
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
     HelperRequest request{
-        job.subject,        job.operation, job.disk, {}, -1, acceptedLanguages(languages),
+        job.task.subject, job.task.operation, job.disk, {}, -1, acceptedLanguages(languages),
         job.fetchesArchives};
     if (!job.image) {
         request.identity = identityOf(job.disk.path);

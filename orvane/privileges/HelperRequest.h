@@ -3,7 +3,7 @@
 
 #include "contract/pellar/DiskReference.h"
 #include "orvane/privileges/DiskIdentity.h"
-#include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/jobs/JobOptions.h"
 
 #include <functional>
 #include <string>

@@ -73,7 +73,7 @@ private:
     contract::PLManager& pl() override { return observedLibrary_; }
 
     SupportOptions supportOptions(const Request& request);
-    pellar::ManagerOptions libraryOptions(const Request& request);
+    pellar::JobOptions libraryOptions(const Request& request);
     void trace(std::string_view line);
     Asking asking();
     JobReporter::Hooks jobHooks();

@@ -90,13 +90,13 @@ int bindPart(const MountCalls& calls, const MountCall& call, const FileDescripto
 
 }  // namespace
 
-std::variant<MountCalls, NotHeld> mountCallsFor(const std::vector<Mount>& places)
+Result<MountCalls, NotHeld> mountCallsFor(const std::vector<Mount>& places)
 {
     auto points = holdMountPoints(places);
-    if (const auto* const notHeld = std::get_if<NotHeld>(&points))
-        return *notHeld;
+    if (!points)
+        return points.error();
     MountCalls all;
-    all.points = std::get<std::vector<MountPoint>>(std::move(points));
+    all.points = *std::move(points);
     for (const Mount& place : places) {
         if (!place.isBind() && all.whole == MountPoint::none)
             all.whole = all.calls.size();

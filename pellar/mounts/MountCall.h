@@ -3,6 +3,7 @@
 
 #include "pellar/mounts/MountPoint.h"
 #include "pellar/mounts/MountTable.h"
+#include "pellar/outcome/Result.h"
 
 #include <string>
 #include <vector>
@@ -28,8 +29,7 @@ struct MountCalls {
 };
 
 /// Keeps hold of where the places are. Needs the right to mount.
-[[nodiscard]] std::variant<MountCalls, NotHeld> mountCallsFor(
-    const std::vector<Mount>& places);
+[[nodiscard]] Result<MountCalls, NotHeld> mountCallsFor(const std::vector<Mount>& places);
 
 /// Mounts one of them; 0, or an errno value: ESTALE when its place is another now. Allocates
 /// nothing and may run in a forked child (signal-safety(7)).

@@ -92,8 +92,8 @@ FileDescriptor openHolder(std::span<const MountPoint> points, std::size_t index)
 
 /// The directory below what is mounted, in a copy of the mount that it is on: the copy has nothing
 /// mounted in it (open_tree(2)).
-std::variant<MountPoint::Directory, int> directoryBelow(const FileDescriptor& holder,
-                                                        const std::string& name)
+Result<MountPoint::Directory, int> directoryBelow(const FileDescriptor& holder,
+                                                  const std::string& name)
 {
     const FileDescriptor copy(
         ::open_tree(holder.get(), "", OPEN_TREE_CLONE | OPEN_TREE_CLOEXEC | AT_EMPTY_PATH));
@@ -108,9 +108,9 @@ std::variant<MountPoint::Directory, int> directoryBelow(const FileDescriptor& ho
 /// On which of the places another one lies.
 std::size_t outerOf(const Mount& place, const std::vector<Mount>& places)
 {
-    const auto outer = std::find_if(
-        places.begin(), places.end(),
-        [&place](const Mount& other) { return other.id != 0 && other.id == place.parent; });
+    const auto outer = std::find_if(places.begin(), places.end(), [&place](const Mount& other) {
+        return other.id != 0 && other.id == place.parent;
+    });
     return outer == places.end() ? MountPoint::none
                                  : static_cast<std::size_t>(outer - places.begin());
 }
@@ -135,9 +135,9 @@ int hold(MountPoint& point, const Mount& place, const std::vector<Mount>& places
         return EBUSY;
     if (mountOf(statusOf(holder)) == place.parent) {
         auto below = directoryBelow(holder, point.name);
-        if (const int* const error = std::get_if<int>(&below))
-            return *error;
-        point.below = std::get<MountPoint::Directory>(below);
+        if (!below)
+            return below.error();
+        point.below = *below;
     }
     if (point.outer == MountPoint::none) {
         point.belowMount = place.parent;
@@ -151,8 +151,7 @@ int hold(MountPoint& point, const Mount& place, const std::vector<Mount>& places
 
 }  // namespace
 
-std::variant<std::vector<MountPoint>, NotHeld> holdMountPoints(
-    const std::vector<Mount>& places)
+Result<std::vector<MountPoint>, NotHeld> holdMountPoints(const std::vector<Mount>& places)
 {
     std::vector<MountPoint> points(places.size());
     for (std::size_t i = 0; i < places.size(); ++i)

@@ -2,13 +2,13 @@
 #pragma once
 
 #include "pellar/mounts/MountTable.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <cstdint>
 #include <limits>
 #include <span>
 #include <string>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -45,7 +45,7 @@ struct NotHeld {
 };
 
 /// Of each place of one disk, in the order in which they were mounted. Needs the right to mount.
-[[nodiscard]] std::variant<std::vector<MountPoint>, NotHeld> holdMountPoints(
+[[nodiscard]] Result<std::vector<MountPoint>, NotHeld> holdMountPoints(
     const std::vector<Mount>& places);
 
 // What follows allocates nothing and may run in a forked child (signal-safety(7)). `points` are all

@@ -120,9 +120,8 @@ std::vector<Mount> currentMounts(const SystemPaths& paths)
 bool isMounted(dev_t device, const SystemPaths& paths)
 {
     const auto mounts = readMounts(paths);
-    return !mounts || std::any_of(mounts->begin(), mounts->end(), [device](const Mount& mount) {
-        return mount.device == device;
-    });
+    return !mounts || std::any_of(mounts->begin(), mounts->end(),
+                                  [device](const Mount& mount) { return mount.device == device; });
 }
 
 std::vector<Mount> mountsOf(dev_t device, const SystemPaths& paths)
@@ -148,8 +147,8 @@ std::optional<Mount> mountOfDevice(const std::vector<Mount>& mounts, dev_t devic
     };
     std::optional<Mount> best;
     for (const Mount& mount : mounts) {
-        const bool isOfDevice = mount.device == device ||
-                                (major(mount.device) == 0 && leadsTo(mount.source, node));
+        const bool isOfDevice =
+            mount.device == device || (major(mount.device) == 0 && leadsTo(mount.source, node));
         if (isOfDevice && (!best || rank(mount) > rank(*best)))
             best = mount;
     }

@@ -179,7 +179,7 @@ Sentence whyNotMountedAgain(const MountCall& call, int error)
 
 }  // namespace
 
-std::variant<MountKeeper, int> MountKeeper::start(const MountCalls& calls)
+Result<MountKeeper, int> MountKeeper::start(const MountCalls& calls)
 {
     const std::vector<int> kept = descriptorsOf(calls);
     int ends[2];
@@ -205,23 +205,22 @@ MountKeeper::~MountKeeper()
     }
 }
 
-std::variant<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<Mount> places,
-                                                          const SystemPaths& paths)
+Result<UnmountedDisk, Sentence> UnmountedDisk::take(std::vector<Mount> places,
+                                                    const SystemPaths& paths)
 {
     if (const Sentence objection = objectionTo(places); !objection.isEmpty())
         return objection;
     auto calls = mountCallsFor(places);
-    if (const auto* const notHeld = std::get_if<NotHeld>(&calls))
-        return whyNotHeld(places[notHeld->place], notHeld->error, paths);
-    auto keeper = MountKeeper::start(std::get<MountCalls>(calls));
-    if (const int* const error = std::get_if<int>(&keeper))
+    if (!calls)
+        return whyNotHeld(places[calls.error().place], calls.error().error, paths);
+    auto keeper = MountKeeper::start(*calls);
+    if (!keeper)
         return Sentence{
             "nobody could be found to mount it again, should this program be killed: "
             "%1$@",
-            ::strerrordesc_np(*error),
+            ::strerrordesc_np(keeper.error()),
             {}};
-    UnmountedDisk disk(std::get<MountCalls>(std::move(calls)),
-                       std::get<MountKeeper>(std::move(keeper)));
+    UnmountedDisk disk(*std::move(calls), *std::move(keeper));
     // The last one first: it may lie over or below the others.
     for (; disk.mounted_ > 0; --disk.mounted_) {
         const std::size_t last = disk.mounted_ - 1;

@@ -3,6 +3,7 @@
 
 #include "pellar/mounts/MountCall.h"
 #include "pellar/mounts/MountTable.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/texts/Sentence.h"
 
@@ -10,7 +11,6 @@
 
 #include <optional>
 #include <utility>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -25,7 +25,7 @@ namespace pellar {
 class MountKeeper {
 public:
     /// An errno value where the system gives no process.
-    [[nodiscard]] static std::variant<MountKeeper, int> start(const MountCalls& calls);
+    [[nodiscard]] static Result<MountKeeper, int> start(const MountCalls& calls);
 
     MountKeeper(MountKeeper&& other) noexcept
         : id_(std::exchange(other.id_, 0)), lifeline_(std::move(other.lifeline_))
@@ -49,8 +49,8 @@ private:
 class UnmountedDisk {
 public:
     /// Unmounts all the places, or none: why not, naming who holds it.
-    [[nodiscard]] static std::variant<UnmountedDisk, Sentence> take(std::vector<Mount> places,
-                                                                    const SystemPaths& paths);
+    [[nodiscard]] static Result<UnmountedDisk, Sentence> take(std::vector<Mount> places,
+                                                              const SystemPaths& paths);
     UnmountedDisk(UnmountedDisk&&) noexcept = default;
     UnmountedDisk& operator=(UnmountedDisk&&) = delete;
     ~UnmountedDisk() { static_cast<void>(mountAgain()); }

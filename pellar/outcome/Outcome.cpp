@@ -105,8 +105,8 @@ Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& 
         if (!outcome.warnings.empty())
             outcome.reason = outcome.warnings.front();
     } else if (confirmation.verdict == Verdict::Damaged) {
-        outcome.code =
-            outcome.code == contract::kPLErrorCutShort ? contract::kPLErrorCutShort : contract::kPLErrorNotRepaired;
+        outcome.code = outcome.code == contract::kPLErrorCutShort ? contract::kPLErrorCutShort
+                                                                  : contract::kPLErrorNotRepaired;
         if (!passes.empty() && passes.back().judgement.verdict == Verdict::Failed)
             outcome.reason = passes.back().judgement.reason;
     }

@@ -2,9 +2,9 @@
 #pragma once
 
 #include "contract/foundation/Name.h"
-#include "pellar/texts/Texts.h"
 #include "pellar/outcome/Judgement.h"
-#include "pellar/outcome/Operation.h"
+#include "pellar/outcome/Task.h"
+#include "pellar/texts/Texts.h"
 
 #include <cstdint>
 #include <optional>

@@ -142,8 +142,8 @@ int errorOfExec(int descriptor)
 
 }  // namespace
 
-std::variant<ChildProcess, NotStarted> ChildProcess::start(const Command& command,
-                                                           const ChildStreams& streams)
+Result<ChildProcess, NotStarted> ChildProcess::start(const Command& command,
+                                                     const ChildStreams& streams)
 {
     int ends[2];
     if (::pipe2(ends, O_CLOEXEC) != 0)

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 
@@ -8,7 +9,6 @@
 #include <sys/types.h>
 
 #include <csignal>
-#include <variant>
 
 namespace pellar {
 
@@ -68,8 +68,8 @@ struct ChildStreams {
 /// ended.
 class ChildProcess {
 public:
-    [[nodiscard]] static std::variant<ChildProcess, NotStarted> start(const Command& command,
-                                                                      const ChildStreams& streams);
+    [[nodiscard]] static Result<ChildProcess, NotStarted> start(const Command& command,
+                                                                const ChildStreams& streams);
 
     ChildProcess(ChildProcess&& other) noexcept;
     ChildProcess& operator=(ChildProcess&&) = delete;

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "pellar/process/Command.h"
-#include "pellar/process/Stopping.h"
 #include "pellar/process/ProcessOutput.h"
+#include "pellar/process/Stopping.h"
 
 #include <chrono>
 #include <cstddef>

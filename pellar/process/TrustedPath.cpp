@@ -13,7 +13,7 @@
 namespace pellar {
 namespace {
 
-using Opened = std::variant<FileDescriptor, std::string>;
+using Opened = Result<FileDescriptor, std::string>;
 
 bool isProgramOwner(uid_t owner)
 {
@@ -67,7 +67,7 @@ std::string whyOthersCanChange(const struct stat& status)
     return othersMayWrite ? "other users may change it" : "";
 }
 
-std::variant<FileDescriptor, std::string> openTrusted(const std::filesystem::path& path)
+Result<FileDescriptor, std::string> openTrusted(const std::filesystem::path& path)
 {
     std::error_code error;
     const std::filesystem::path canonical = std::filesystem::canonical(path, error);
@@ -78,10 +78,10 @@ std::variant<FileDescriptor, std::string> openTrusted(const std::filesystem::pat
     Opened opened = openChecked(AT_FDCWD, "/", "/", canonical.relative_path() != "");
     std::filesystem::path way = "/";
     for (const std::filesystem::path& name : canonical.relative_path()) {
-        if (!std::holds_alternative<FileDescriptor>(opened))
+        if (!opened)
             return opened;
         way /= name;
-        opened = openChecked(std::get<FileDescriptor>(opened).get(), name, way, way != canonical);
+        opened = openChecked(opened->get(), name, way, way != canonical);
     }
     return opened;
 }

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <sys/stat.h>
 
 #include <filesystem>
 #include <string>
-#include <variant>
 
 namespace pellar {
 
@@ -22,7 +22,6 @@ namespace pellar {
 /// Opens (O_PATH) what the path leads to. For root all directories on the way there are looked at,
 /// each as it is opened; others cannot lead it elsewhere meanwhile. Why it is refused, in English,
 /// is answered instead.
-[[nodiscard]] std::variant<FileDescriptor, std::string> openTrusted(
-    const std::filesystem::path& path);
+[[nodiscard]] Result<FileDescriptor, std::string> openTrusted(const std::filesystem::path& path);
 
 }  // namespace pellar

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/outcome/Operation.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/texts/Sentence.h"
 
 #include <filesystem>

@@ -82,7 +82,8 @@ TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
         if (isLetGo)
             ::flock(other.get(), LOCK_UN);
         bench.finish(begun);
-        EXPECT_EQ(bench.listener.error, isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
+        EXPECT_EQ(bench.listener.error,
+                  isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
     }
 }
 
@@ -124,7 +125,7 @@ TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
 TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
 {
     const auto mounts = parseMounts(
-        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw\n"
+        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw,seclabel,errors=remount-ro\n"
         "30 22 8:3 /sub /bind rw - ext4 /dev/sda3 rw\n"
         "31 22 8:3 / /media/My\\040Disk\\134 ro,nosuid - ext4 /dev/sda3 rw\n"
         "32 22 0:40 /@home /home rw master:2 shared:3 - btrfs /dev/sdb1 ro,errors=remount-ro\n"
@@ -137,6 +138,7 @@ TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
     EXPECT_TRUE(media->isReadOnly);
     EXPECT_EQ(mountOfDevice(mounts, makedev(8, 33), "/dev/sdb1")->target, "/home")
         << "several devices, one number of its own; a device of another number has had the name";
+    EXPECT_EQ(mounts[0].options, "rw,relatime,errors=remount-ro") << "what the kernel takes";
     EXPECT_FALSE(mounts[3].isReadOnly) << "the kernel's answer to an error is nobody's wish";
     EXPECT_FALSE(mounts[3].isBind()) << "a subvolume is mounted by an option";
     EXPECT_FALSE(mountOfDevice(mounts, makedev(8, 9), "/dev/sda9"));
@@ -147,20 +149,20 @@ TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
 TEST(MountTable, WhatIsNotKnownToBeFreeIsMounted)
 {
     const test::Workshop workshop;
-    workshop.write("mounts", "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
-                             "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
+    workshop.write("mounts",
+                   "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
+                   "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
     workshop.write("none", "");
     struct Case {
         std::filesystem::path list;
         unsigned minor;
         bool isMounted;
     };
-    for (const Case& c : {Case{workshop.path("mounts"), 17, true},
-                          Case{workshop.path("mounts"), 1, false},
-                          Case{workshop.path("mounts"), 2, false},
-                          Case{workshop.path("mounts"), 3, false},
-                          Case{workshop.path("none"), 17, false},
-                          Case{"/nonexistent", 17, true}, Case{"/", 17, true}})
+    for (const Case& c :
+         {Case{workshop.path("mounts"), 17, true}, Case{workshop.path("mounts"), 1, false},
+          Case{workshop.path("mounts"), 2, false}, Case{workshop.path("mounts"), 3, false},
+          Case{workshop.path("none"), 17, false}, Case{"/nonexistent", 17, true},
+          Case{"/", 17, true}})
         EXPECT_EQ(isMounted(makedev(8, c.minor), {"/sys/block", c.list}), c.isMounted)
             << c.list << ' ' << c.minor;
 }

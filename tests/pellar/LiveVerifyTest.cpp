@@ -41,7 +41,7 @@ protected:
             GTEST_SKIP() << "mounting needs root";
         workshop_.write("image", {});
         fs::resize_file(image(), 128U << 20U);
-        if (findProgram("mkfs.btrfs", ManagerOptions().toolPath).empty())
+        if (findProgram("mkfs.btrfs", JobOptions().toolPath).empty())
             GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
         workshop_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
         fs::create_directory(place());
@@ -117,7 +117,7 @@ protected:
     contract::DiskReferencePointer disk() const { return test::reference(device_->name(), "btrfs"); }
     std::unique_ptr<test::Bench> bench() const
     {
-        ManagerOptions options;
+        JobOptions options;
         options.homeDirectory = place();
         return std::make_unique<test::Bench>(options);
     }

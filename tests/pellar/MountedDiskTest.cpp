@@ -82,7 +82,7 @@ TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
              Case{"kill 9", false, "failed", "the tool was killed"},
              Case{"exit 16", true, "failed", "the tool did not start properly"},
          }) {
-        ManagerOptions options;
+        JobOptions options;
         if (*c.script != '\0')
             options.toolPath = workshop_.fakeTools(c.script);
         test::Bench bench(options);
@@ -90,12 +90,13 @@ TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
         EXPECT_EQ(bench.listener.verdict, c.verdict) << c.because << ": " << bench.listener.message;
         EXPECT_EQ(mounts(), before_) << c.because;
         EXPECT_TRUE(fs::is_directory(workshop_.path("place") / "part"));
+        EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << "a process is left";
     }
 }
 
 TEST_F(MountedDisk, IsMountedAgainAfterAStop)
 {
-    ManagerOptions options;
+    JobOptions options;
     options.toolPath = workshop_.fakeTools("say Pass 1: Checking inodes\nwait");
     test::Bench bench(options);
     ASSERT_EQ(bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
@@ -109,7 +110,7 @@ TEST_F(MountedDisk, IsMountedAgainAfterAStop)
 /// A job in a process of its own, to be killed.
 class OtherProgram {
 public:
-    OtherProgram(const ManagerOptions& options, const contract::DiskReferencePointer& disk,
+    OtherProgram(const JobOptions& options, const contract::DiskReferencePointer& disk,
                  bool repairs)
         : id_(::fork())
     {
@@ -138,7 +139,7 @@ private:
 
 void MountedDisk::expectMountedAgainAfterKill() const
 {
-    ManagerOptions options;
+    JobOptions options;
     options.toolPath = workshop_.fakeTools("wait");
     OtherProgram verification(options, disk(), false);
     EXPECT_TRUE(comesTrue([this] { return mounts().empty(); }));
@@ -148,7 +149,7 @@ void MountedDisk::expectMountedAgainAfterKill() const
 
 TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
 {
-    ManagerOptions options;
+    JobOptions options;
     options.toolPath = workshop_.fakeTools("wait");
     OtherProgram verification(options, disk(), false);
     ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
@@ -217,7 +218,7 @@ TEST_F(MountedDisk, NobodyLeadsItElsewhereMeanwhile)
                 return found;
             };
             const std::string expected = c.found.empty() ? "" : workshop_.path(c.found).native();
-            ManagerOptions options;
+            JobOptions options;
             options.toolPath = workshop_.fakeTools("wait");
             if (isKilled) {
                 OtherProgram verification(options, disk(), false);
@@ -288,14 +289,6 @@ TEST_F(MountedDisk, IsMountedAgainOverWhatLiesBelowWhenTheProgramIsKilled)
     ::umount(covered.c_str());
 }
 
-TEST_F(MountedDisk, NobodyIsLeftWatchingAfterTheJob)
-{
-    test::Bench bench;
-    EXPECT_EQ(bench.verify(disk()), 0);
-    EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
-    EXPECT_EQ(errno, ECHILD);
-}
-
 TEST_F(MountedDisk, WhoHoldsItIsNamedAndNothingIsChanged)
 {
     const auto refusal = [this] {
@@ -354,13 +347,6 @@ TEST(Holders, AreFoundByEveryWayOfHolding)
     std::ofstream(workshop.path("block/loop3/loop/backing_file")) << (mount / "a.img").native();
     EXPECT_EQ(holdersOf(mount.native(), "/none", workshop.path("block")),
               std::vector<std::string>{"loop3"});
-}
-
-TEST(MountOptions, WhatTheKernelOnlyTellsIsNotGivenBack)
-{
-    EXPECT_EQ(mountableOptions("rw,seclabel,relatime,errors=remount-ro"),
-              "rw,relatime,errors=remount-ro");
-    EXPECT_EQ(mountableOptions("seclabel"), "");
 }
 
 }  // namespace

@@ -15,6 +15,91 @@ namespace {
 using namespace std::chrono_literals;
 using namespace pellar;
 
+std::vector<std::string> split(const std::vector<std::string>& pieces, std::size_t longest = 8)
+{
+    std::vector<std::string> lines;
+    LineSplitter splitter(longest, [&lines](std::string_view line, bool isCut) {
+        lines.push_back(std::string(line) + (isCut ? "[cut]" : ""));
+    });
+    for (const std::string& piece : pieces)
+        splitter.take(piece);
+    splitter.finish();
+    return lines;
+}
+
+TEST(LineSplitter, CutsAtEveryLineEnd)
+{
+    using namespace std::string_literals;
+    struct Case {
+        std::vector<std::string> pieces;
+        std::vector<std::string> lines;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{{"a\nb\n"}, {"a", "b"}, "the last end makes no empty line"},
+          Case{{"a\r\nb\rc"}, {"a", "b", "c"}, "three kinds of ends, and none"},
+          Case{{"a\r", "\nb"}, {"a", "b"}, "one end, torn apart"},
+          Case{{"a\r", "", "\n\nb"}, {"a", "", "b"}, "an end and an empty line"},
+          Case{{"a\r\r\nb"}, {"a", "", "b"}, "two ends"},
+          Case{{"a\0\xFF\n"s}, {"a\0\xFF"s}, "any bytes"},
+          Case{{"12345678\n"}, {"12345678"}, "just as long as may be"},
+          Case{{"123456789", "more\nb\n"}, {"12345678[cut]", "b"}, "the rest is dropped"},
+          Case{{"12345678", "9"}, {"12345678[cut]"}, "cut at the very end"},
+          Case{{}, {}, "nothing"}})
+        EXPECT_EQ(split(c.pieces), c.lines) << c.because;
+}
+
+const Clock::time_point start{};
+
+TEST(StopLadder, PressesHarderAsTimePasses)
+{
+    StopLadder ladder({2s, 3s, 0s});
+    EXPECT_EQ(ladder.due(start + 1h), 0) << "nobody wants it to end";
+    EXPECT_EQ(ladder.press(start), SIGINT);
+    EXPECT_EQ(ladder.due(start + 1999ms), 0);
+    EXPECT_EQ(ladder.due(start + 2s), SIGTERM);
+    EXPECT_EQ(ladder.due(start + 4999ms), 0);
+    EXPECT_EQ(ladder.due(start + 5s), SIGKILL);
+    EXPECT_FALSE(ladder.deadline());
+    EXPECT_EQ(ladder.press(start + 6s), 0) << "there is nothing harder";
+}
+
+TEST(StopLadder, EachPressIsTheNextStepAtOnce)
+{
+    StopLadder ladder(graceTimesFor(Access::ReadWrite));
+    EXPECT_EQ(ladder.press(start), SIGINT);
+    EXPECT_EQ(ladder.press(start), SIGTERM);
+    EXPECT_EQ(ladder.press(start), SIGKILL);
+}
+
+TEST(StopLadder, LeavingKillsAReaderAndGivesAWriterAMoment)
+{
+    EXPECT_EQ(StopLadder(graceTimesFor(Access::ReadOnly)).pressHard(start), SIGKILL);
+    StopLadder writer(graceTimesFor(Access::ReadWrite));
+    EXPECT_EQ(writer.pressHard(start), SIGINT);
+    EXPECT_EQ(writer.pressHard(start + 1s), 0) << "once is enough";
+    EXPECT_EQ(writer.due(start + 3s), SIGKILL);
+}
+
+TEST(OutputBudget, VerifyIsEndedWhereRepairGoesOnUnheard)
+{
+    struct Case {
+        Access access;
+        int lines;
+        OutputBudget::State state;
+    };
+    for (const Case& c : {Case{Access::ReadOnly, 10, OutputBudget::State::Heard},
+                          Case{Access::ReadOnly, 11, OutputBudget::State::Spent},
+                          Case{Access::ReadWrite, 11, OutputBudget::State::Unheard},
+                          Case{Access::ReadWrite, 99, OutputBudget::State::Unheard},
+                          Case{Access::ReadWrite, 100, OutputBudget::State::Spent}}) {
+        OutputBudget budget({10, 1000}, c.access);
+        for (int i = 0; i < c.lines; ++i)
+            budget.countLine();
+        EXPECT_EQ(budget.state(), c.state) << c.lines << " lines";
+    }
+}
+
 /// Keeps the lines; presses the stop switch at the first one when asked to.
 class Lines final : public RunListener {
 public:

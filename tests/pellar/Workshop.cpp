@@ -23,8 +23,7 @@ void runProgram(std::string_view name, std::vector<std::string> arguments)
     const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
     auto child =
         ChildProcess::start({findProgram(name, systemPath), std::move(arguments)}, {sink.get()});
-    if (!std::holds_alternative<ChildProcess>(child) ||
-        std::get<ChildProcess>(child).reap() != Ending(Exited{0}))
+    if (!child || child->reap() != Ending(Exited{0}))
         throw std::runtime_error("cannot prepare the test: " + std::string(name) + " failed");
 }
 
@@ -186,7 +185,7 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image, std
     return disk;
 }
 
-Bench::Bench(ManagerOptions options)
+Bench::Bench(JobOptions options)
     : manager(loop, texts, [this, &options] {
           options.commandTrace = [this](std::string_view line) {
               traces.emplace_back(line);

@@ -102,7 +102,7 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image,
 
 /// One library, one listener, one loop.
 struct Bench {
-    explicit Bench(ManagerOptions options = {});
+    explicit Bench(JobOptions options = {});
 
     /// Runs a job to its *finished* and answers what the begin answered.
     contract::ErrorCode verify(const contract::DiskReferencePointer& disk);

@@ -19,7 +19,7 @@ protected:
     /// What the launched program does, as a shell script, after the arguments were seen.
     void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
     {
-        launch(script, {pellar::Subject::Filesystem, operation,
+        launch(script, {{pellar::Subject::Filesystem, operation},
                         *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr, false});
     }
     void launch(const std::string& script, const pellar::PrivilegedJob& job)
@@ -28,7 +28,7 @@ protected:
         std::ofstream(launcher) << "#!/bin/sh\n" << script << "\n";
         std::filesystem::permissions(launcher, std::filesystem::perms::owner_all);
         job_ = std::make_unique<pellar::Job>(
-            [this, launcher, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
+            [this, launcher, job](pellar::StopSwitch& stop, pellar::EventQueue& road) {
                 return std::make_unique<PrivilegedScript>(
                     HelperLaunch{{launcher.native()},
                                  "",
@@ -197,7 +197,7 @@ TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
                contract::kPLErrorDiskChanged, "failed"}}) {
         listener_ = {};
         launch(c.meanwhile + "\nexec " PELLAR_HELPER " \"$@\"",
-               {pellar::Subject::Filesystem, pellar::Operation::Verify,
+               {{pellar::Subject::Filesystem, pellar::Operation::Verify},
                 *pellar::test::reference(device.name(), "ext4", "Stick"), nullptr, false});
         ASSERT_TRUE(finishes());
         EXPECT_EQ(listener_.error, c.error) << listener_.message;

@@ -109,9 +109,9 @@ Outcome<const contract::ModuleEntry*> openLibrary(FileDescriptor file,
 Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle)
 {
     const auto opened = pellar::openTrusted(bundle);
-    if (const auto* const reason = std::get_if<std::string>(&opened))
-        return cannot(attempt, bundle.native(), *reason);
-    const auto& directory = std::get<FileDescriptor>(opened);
+    if (!opened)
+        return cannot(attempt, bundle.native(), opened.error());
+    const FileDescriptor& directory = *opened;
     const auto json = openFile(directory, "module.json", bundle / "module.json");
     if (failed(json))
         return std::get<Failure>(json);

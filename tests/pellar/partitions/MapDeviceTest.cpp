@@ -52,7 +52,7 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
     auto reference = std::make_shared<contract::DiskReference>(*test::wholeDisk(device.name()));
     reference->storage = contract::DiskReference::Storage::BlockDevice;
     reference->length = 0;
-    ManagerOptions options;
+    JobOptions options;
     options.savedSectorsDirectory = workshop.path("saved");
     test::Bench bench(options);
 

@@ -29,7 +29,7 @@ constexpr std::uint64_t lastSector = 32767;
 struct MapBench : test::Bench {
     explicit MapBench(const fs::path& saved)
         : Bench([&] {
-              ManagerOptions options;
+              JobOptions options;
               options.savedSectorsDirectory = saved;
               return options;
           }())

@@ -148,8 +148,8 @@ TEST(ReducedProgram, IsNobodyAndWritesWhereItMay)
     for (const char* const name : {"own/file", "other/file"}) {
         auto started = ChildProcess::start(
             {"/usr/bin/touch", {workshop.path(name)}, true, workshop.path("own")}, {sink.get()});
-        ASSERT_TRUE(std::holds_alternative<ChildProcess>(started));
-        static_cast<void>(std::get<ChildProcess>(started).reap());
+        ASSERT_TRUE(started);
+        static_cast<void>(started->reap());
     }
     ASSERT_TRUE(fs::exists(workshop.path("own/file")));
     EXPECT_EQ(test::rightsOf(workshop.path("own/file")).user, userOfReduced);

@@ -1,17 +1,46 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/jobs/PrivilegedJob.h"
+#include "contract/pellar/DiskReference.h"
+#include "pellar/disks/DiskClaim.h"
+#include "pellar/jobs/EventQueue.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/process/KernelFiles.h"
 #include "pellar/process/ProcessOutput.h"
+#include "pellar/process/Stopping.h"
 
 #include <chrono>
 #include <filesystem>
 #include <functional>
+#include <memory>
 #include <string>
 #include <string_view>
 
 namespace pellar {
+
+/// What a job does, on the thread that calls `run`. Whatever happens, it tells *started* once,
+/// first, and *finished* once, last.
+class Script {
+public:
+    virtual ~Script() = default;
+    virtual void run() = 0;
+};
+
+/// A job for which this user has no right: on a block device that they may not open, on files that
+/// are not theirs, or on a part of an image that the kernel has to make a device of.
+struct PrivilegedJob {
+    Task task;
+    contract::DiskReference disk;
+    /// The image file of which the disk is a part, as this user has opened it: whoever does the
+    /// job may do no more with it. None for a block device.
+    std::shared_ptr<const DiskClaim> image;
+    /// The user agrees that archives of packages are fetched (JobOptions::archiveFetching).
+    bool fetchesArchives = false;
+};
+
+/// Makes the script of such a job; empty where there is no way to get the right. Any thread.
+using PrivilegedScripts =
+    std::function<std::unique_ptr<Script>(const PrivilegedJob&, StopSwitch&, EventQueue&)>;
 
 /// Whether the archives of packages of the running system are fetched over the network, where
 /// nothing else says what permissions their files have.
@@ -23,7 +52,8 @@ struct ArchiveFetching {
     std::string howToAllow;
 };
 
-struct ManagerOptions {
+/// How the library is set up, for all its jobs.
+struct JobOptions {
     /// Where tools are looked for: absolute directories, the first that has the tool wins.
     std::string toolPath = "/usr/sbin:/usr/bin:/sbin:/bin";
     /// For one run of a tool.
@@ -48,5 +78,11 @@ struct ManagerOptions {
     std::filesystem::path savedSectorsDirectory;
     PrivilegedScripts privileged;
 };
+
+/// What a task may do to the disk.
+inline Access accessFor(Operation operation)
+{
+    return operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+}
 
 }  // namespace pellar

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/LiveScript.h"
+#include "pellar/jobs/LiveVolumeScript.h"
 
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/jobs/DiskNaming.h"
-#include "pellar/jobs/OutcomeReport.h"
+#include "pellar/jobs/ToolRun.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
@@ -24,28 +23,22 @@ constexpr std::uint64_t anyBytes = ~std::uint64_t{0};
 
 }  // namespace
 
-LiveScript::LiveScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
-                       const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
-                       EventRoad& road)
-    : disk_(std::move(disk)),
-      mounts_(std::move(mounts)),
-      options_(options),
-      texts_(texts),
-      stop_(stop),
-      road_(road),
-      log_(*disk_, texts, road)
+LiveVolumeScript::LiveVolumeScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
+                                   JobContext context)
+    : disk_(std::move(disk)), mounts_(std::move(mounts)), context_(std::move(context))
 {
 }
 
-void LiveScript::run()
+void LiveVolumeScript::run()
 {
     log_.started();
-    tellOutcome(verify(), Operation::Verify, texts_, log_);
+    log_.outcomeOfVolume(verify(), Operation::Verify);
 }
 
-Outcome LiveScript::verify()
+Outcome LiveVolumeScript::verify()
 {
-    const Capability capability = liveCapabilityFor(mounts_.front().filesystem, options_.toolPath);
+    const Capability capability =
+        liveCapabilityFor(mounts_.front().filesystem, context_.options.toolPath);
     if (!capability.isGiven())
         return failedOutcome(capability.error, capability.reason);
     program_ = capability.program;
@@ -56,7 +49,7 @@ Outcome LiveScript::verify()
     return outcomeWithoutRepair(judgement);
 }
 
-std::optional<Outcome> LiveScript::findVolume()
+std::optional<Outcome> LiveVolumeScript::findVolume()
 {
     if (const int error = reachVolume())
         return failedOutcome(
@@ -70,7 +63,7 @@ std::optional<Outcome> LiveScript::findVolume()
 
 // An errno. Something else may be mounted over a place, so what is found there is compared with the
 // disk.
-int LiveScript::reachVolume()
+int LiveVolumeScript::reachVolume()
 {
     device_ = FileDescriptor(::open(disk_->path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     if (!device_)
@@ -90,15 +83,14 @@ int LiveScript::reachVolume()
     return error;
 }
 
-Judgement LiveScript::scrub()
+Judgement LiveVolumeScript::scrub()
 {
     const RunRequest run = request();
     log_.trace("run: " + shown(run.command));
-    log_.step(contract::kFsckVerify,
-              log_.text({"Verifying “%1$@” while it stays mounted", log_.diskName(), {}}));
-    road_.flush();
+    log_.step(Operation::Verify, {"Verifying “%1$@” while it stays mounted", log_.diskName(), {}});
+    log_.flush();
     storedBytes_ = volume_->storedBytes();
-    const RunResult result = runTool(run, stop_, *this);
+    const RunResult result = runTool(run, context_.stop, *this);
     Judgement judgement = judgeScrub(result, report_, volume_->disks());
     if (judgement.verdict != Verdict::Stopped && !isStillThere())
         judgement = {Verdict::Failed,
@@ -111,19 +103,19 @@ Judgement LiveScript::scrub()
 
 // It gets time when the program is leaving, too: killed, an older kernel's scrub would go on, and
 // its process with it.
-RunRequest LiveScript::request() const
+RunRequest LiveVolumeScript::request() const
 {
     RunRequest request;
     request.command = {program_, scrubArguments(diskArgumentOfTool())};
     request.disk = volume_->descriptor();
-    request.limits = options_.outputLimits;
+    request.limits = context_.options.outputLimits;
     request.graceTimes = graceTimesFor(Access::ReadWrite);
     request.longestTick = 500ms;
     return request;
 }
 
 /// NO when the device's name leads to no disk, or another one, or its beginning cannot be read.
-bool LiveScript::isStillThere() const
+bool LiveVolumeScript::isStillThere() const
 {
     struct stat before = {};
     struct stat now = {};
@@ -134,16 +126,16 @@ bool LiveScript::isStillThere() const
     return superblock && superblock->id == volume_->id();
 }
 
-void LiveScript::tellFindings(const Judgement& judgement)
+void LiveVolumeScript::tellFindings(const Judgement& judgement)
 {
     for (const Sentence& finding : scrubFindings(report_))
         log_.error(finding);
     const bool hasReadAll =
         judgement.verdict == Verdict::Sound || judgement.verdict == Verdict::Damaged;
     if (hasReadAll && report_.withoutChecksum > 0)
-        log_.remark(log_.text({"Blocks of files that have no checksum to be compared with: %1$@",
-                               std::to_string(report_.withoutChecksum),
-                               {}}));
+        log_.remark({"Blocks of files that have no checksum to be compared with: %1$@",
+                     std::to_string(report_.withoutChecksum),
+                     {}});
     if (judgement.verdict != Verdict::Sound)
         return;
     log_.remark(log_.text("Everything that has a checksum agrees with it, in every copy."));
@@ -151,7 +143,7 @@ void LiveScript::tellFindings(const Judgement& judgement)
         "Whether the parts of the file system agree with each other shows only unmounted."));
 }
 
-void LiveScript::line(std::string_view line, bool)
+void LiveVolumeScript::line(std::string_view line, bool)
 {
     readScrubLine(line, report_);
     const std::string text = withDiskName(line, log_.diskName());
@@ -161,20 +153,20 @@ void LiveScript::line(std::string_view line, bool)
         log_.detail(text);
 }
 
-void LiveScript::stopAsked()
+void LiveVolumeScript::stopAsked()
 {
     isStopping_ = true;
     volume_->cancelScrub();
 }
 
-void LiveScript::tick()
+void LiveVolumeScript::tick()
 {
     if (isStopping_)  // the tool may have begun only after it was asked to end
         volume_->cancelScrub();
     const auto scrubbed = volume_->scrubbedBytes();
     if (scrubbed && storedBytes_ > 0)
         log_.progress(100.0 * static_cast<double>(*scrubbed) / static_cast<double>(storedBytes_));
-    road_.flushIfDue();
+    log_.flushIfDue();
 }
 
 }  // namespace pellar

@@ -1,27 +1,38 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/JobScript.h"
-
-#include "contract/pellar/ErrorCodes.h"
+#include "pellar/jobs/VolumeScript.h"
 
 #include "contract/foundation/UTF8.h"
+#include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/bytes/Bytes.h"
 #include "pellar/disks/DiskClaim.h"
-#include "pellar/jobs/LogReplay.h"
 #include "pellar/outcome/Damage.h"
-#include "pellar/jobs/Obstacles.h"
-#include "pellar/jobs/OutcomeReport.h"
 #include "pellar/probe/DiskProbe.h"
+#include "pellar/process/FileDescriptor.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
 
+#include <sys/mount.h>
+
 #include <algorithm>
+#include <cerrno>
 #include <chrono>
+#include <cstring>
 #include <utility>
 
 namespace pellar {
 namespace {
+
+bool isMissingRight(int error)
+{
+    return error == EPERM || error == EACCES;
+}
+
+std::string textOf(int error)
+{
+    return ::strerrordesc_np(error);
+}
 
 /// The share of the progress that a repair takes; the verification behind it takes the rest.
 constexpr double repairShare = 60;
@@ -30,31 +41,66 @@ constexpr double lookShare = 30;
 
 }  // namespace
 
-JobScript::JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
-                     StopSwitch& stop, EventRoad& road)
+Judgement notAttached(const Tool& tool, int error)
+{
+    const std::string name(tool.name);
+    const Sentence reason =
+        isMissingRight(error)
+            ? Sentence{"%1$@ needs the volume as a disk of its own, which only an administrator "
+                       "may make of a part of an image",
+                       name,
+                       {}}
+            : Sentence{"the volume could not be made a disk of its own for %1$@: %2$@", name,
+                       textOf(error)};
+    return {Verdict::Failed, contract::kPLErrorCannotOpen, error, reason};
+}
+
+Outcome notReplayed(int error)
+{
+    const Sentence reason =
+        isMissingRight(error)
+            ? Sentence{"its log has to be replayed by mounting it, which only an administrator may",
+                       {},
+                       {}}
+            : Sentence{"its log could not be replayed by mounting it: %1$@", textOf(error), {}};
+    return {Verdict::Inconclusive, contract::kPLErrorInconclusive, error, reason};
+}
+
+int replayLog(const std::string& filesystem, int device)
+{
+    const FileDescriptor context(::fsopen(filesystem.c_str(), FSOPEN_CLOEXEC));
+    if (!context)
+        return errno;
+    const std::string source = pathOfDescriptor(device);
+    if (::fsconfig(context.get(), FSCONFIG_SET_STRING, "source", source.c_str(), 0) != 0)
+        return errno;
+    // A copy of a volume has its UUID, and the volume itself may be mounted (xfs(5)).
+    if (filesystem == "xfs" &&
+        ::fsconfig(context.get(), FSCONFIG_SET_FLAG, "nouuid", nullptr, 0) != 0)
+        return errno;
+    return ::fsconfig(context.get(), FSCONFIG_CMD_CREATE, nullptr, nullptr, 0) == 0 ? 0 : errno;
+}
+
+VolumeScript::VolumeScript(VolumeRequest request, JobContext context)
     : operation_(request.operation),
       tool_(request.tool),
-      options_(options),
-      texts_(texts),
-      stop_(stop),
-      road_(road),
-      log_(*request.disk, texts, road),
-      disk_(request.disk, std::move(request.claim), std::move(request.mounts), options.systemPaths,
-            log_)
+      context_(std::move(context)),
+      disk_(request.disk, std::move(request.claim), std::move(request.mounts),
+            context_.options.systemPaths, log_)
 {
 }
 
-void JobScript::run()
+void VolumeScript::run()
 {
     log_.started();
     for (State state = State::Examining; state != State::Done;)
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
     disk_.giveBack();
-    tellOutcome(outcome_, operation_, texts_, log_);
+    log_.outcomeOfVolume(outcome_, operation_);
 }
 
-JobScript::State JobScript::next(State state)
+VolumeScript::State VolumeScript::next(State state)
 {
     switch (state) {
         case State::Examining: return examine();
@@ -68,11 +114,11 @@ JobScript::State JobScript::next(State state)
     return State::Done;
 }
 
-JobScript::State JobScript::examine()
+VolumeScript::State VolumeScript::examine()
 {
     if (const auto objection = objectionToJob())
         return end(*objection);
-    if (const auto refusal = disk_.take(wantedAccess()))
+    if (const auto refusal = disk_.take(accessFor(operation_)))
         return end(*refusal);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
@@ -80,8 +126,8 @@ JobScript::State JobScript::examine()
         tool_ = toolRecognizing(disk_.claim().descriptor(), disk_.claim().offset(),
                                 disk_.claim().availableBytes());
     if (tool_ != nullptr) {
-        program_ = findProgram(tool_->name, options_.toolPath);
-        repairProgram_ = findProgram(tool_->repairName, options_.toolPath);
+        program_ = findProgram(tool_->name, context_.options.toolPath);
+        repairProgram_ = findProgram(tool_->repairName, context_.options.toolPath);
         volume_ = factsFor(*tool_);
     }
     if (const auto objection = objectionToDisk())
@@ -94,18 +140,18 @@ JobScript::State JobScript::examine()
 }
 
 /// Why there is no way, by what the disk is listed as: said before anything is unmounted for it.
-std::optional<Outcome> JobScript::objectionToJob() const
+std::optional<Outcome> VolumeScript::objectionToJob() const
 {
     if (disk_.reference().filesystem.empty())
         return std::nullopt;
     const Capability capability =
-        capabilityFor(disk_.reference().filesystem, operation_, options_.toolPath);
+        capabilityFor(disk_.reference().filesystem, operation_, context_.options.toolPath);
     return capability.isGiven() ? std::nullopt
                                 : std::optional(failedOutcome(capability.error, capability.reason));
 }
 
 /// Where no file system is found in its place, that may be for want of reading.
-std::optional<Outcome> JobScript::objectionToDisk()
+std::optional<Outcome> VolumeScript::objectionToDisk()
 {
     const bool isInPlace = tool_ != nullptr && volume_.isRecognized && volume_.hasPrimary;
     const auto byte = isInPlace ? std::nullopt : unreadableByte({});
@@ -113,7 +159,7 @@ std::optional<Outcome> JobScript::objectionToDisk()
 }
 
 /// Why no tool may run; none when one may.
-std::optional<Outcome> JobScript::objection() const
+std::optional<Outcome> VolumeScript::objection() const
 {
     constexpr std::uint64_t smallestVolume = 2048;
     const std::uint64_t available = disk_.claim().availableBytes();
@@ -139,7 +185,7 @@ std::optional<Outcome> JobScript::objection() const
 }
 
 /// What is there is named, where it is something.
-Outcome JobScript::withoutTool() const
+Outcome VolumeScript::withoutTool() const
 {
     const DiskClaim& claim = disk_.claim();
     const std::string type =
@@ -147,7 +193,7 @@ Outcome JobScript::withoutTool() const
     if (type.empty())
         return failedOutcome(contract::kPLErrorUnsupported,
                              {"no file system was found that can be checked", {}, {}});
-    const Capability capability = capabilityFor(type, operation_, options_.toolPath);
+    const Capability capability = capabilityFor(type, operation_, context_.options.toolPath);
     return failedOutcome(
         contract::kPLErrorUnsupported,
         capability.isGiven()
@@ -158,7 +204,7 @@ Outcome JobScript::withoutTool() const
 }
 
 /// A tool that repairs a volume whose end is missing throws away what it cannot reach.
-std::optional<Outcome> JobScript::objectionToSize()
+std::optional<Outcome> VolumeScript::objectionToSize()
 {
     if (!volume_.isCutShort())
         return std::nullopt;
@@ -169,7 +215,7 @@ std::optional<Outcome> JobScript::objectionToSize()
     return outcomeOfVerification(cutShort(0));
 }
 
-JobScript::State JobScript::verify()
+VolumeScript::State VolumeScript::verify()
 {
     const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
     const Judgement judgement = judge(evidence);
@@ -179,18 +225,18 @@ JobScript::State JobScript::verify()
                                   : outcomeWithoutRepair(judgement));
 }
 
-void JobScript::tellMeaning(const RunEvidence& evidence)
+void VolumeScript::tellMeaning(const RunEvidence& evidence)
 {
     Damage damage = evidence.findings.damage;
     if (!evidence.findings.isComplete)
         damage.add(Damage::Unsurveyed);
     for (const std::string_view meaning : meaningOf(damage, tool_->canRepair()))
-        log_.remark(texts_.text(meaning));
+        log_.remark(Sentence{meaning, {}, {}});
 }
 
 /// A sound volume is not written to, what is not known to be damaged is not repaired, and nothing
 /// is written to a disk that cannot be read.
-JobScript::State JobScript::look()
+VolumeScript::State VolumeScript::look()
 {
     log_.meter().setRange(0, lookShare);
     // What is wrong before a journal is replayed may not be wrong afterwards.
@@ -212,12 +258,12 @@ JobScript::State JobScript::look()
     return byte ? end(outcomeOfVerification(unreadable(byte))) : State::Repairing;
 }
 
-JobScript::State JobScript::replay()
+VolumeScript::State VolumeScript::replay()
 {
-    log_.step(contract::kFsckRepair, texts_.text("Replaying the log by mounting the volume"));
+    log_.step(Operation::Repair, {"Replaying the log by mounting the volume", {}, {}});
     const std::string filesystem(tool_->habits.logReplayedAs);
     log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
-    road_.flush();
+    log_.flush();
     const auto disk =
         DiskForTool::prepare(disk_.claim(), DiskForTool::Form::BlockDevice, Access::ReadWrite);
     const int* const prepareError = std::get_if<int>(&disk);
@@ -230,7 +276,7 @@ JobScript::State JobScript::replay()
     return State::Confirming;
 }
 
-JobScript::State JobScript::repair()
+VolumeScript::State VolumeScript::repair()
 {
     log_.meter().setRange(passes_.empty() ? lookShare : 0, repairShare);
     const RunEvidence evidence = runOnce(
@@ -248,7 +294,7 @@ JobScript::State JobScript::repair()
     return isOver ? end(outcomeOfVerification(judgement)) : State::Confirming;
 }
 
-JobScript::State JobScript::confirm()
+VolumeScript::State VolumeScript::confirm()
 {
     log_.meter().setRange(repairShare, 100);
     const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
@@ -261,23 +307,23 @@ JobScript::State JobScript::confirm()
     if (outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired)
         for (const RepairPass& pass : passes_)
             if (pass.judgement.verdict == Verdict::Failed)
-                log_.failure(pass.judgement.reason.in(texts_));
+                log_.failure(pass.judgement.reason);
     return end(outcome);
 }
 
-JobScript::State JobScript::end(Outcome outcome)
+VolumeScript::State VolumeScript::end(Outcome outcome)
 {
     outcome_ = std::move(outcome);
     return State::Done;
 }
 
-VolumeFacts JobScript::factsFor(const Tool& tool) const
+VolumeFacts VolumeScript::factsFor(const Tool& tool) const
 {
     return tool.examine(disk_.claim().descriptor(), disk_.claim().offset(),
                         disk_.claim().availableBytes());
 }
 
-RunEvidence JobScript::runOnce(Access access, ToolRun::Problems problems)
+RunEvidence VolumeScript::runOnce(Access access, ToolRun::Problems problems)
 {
     volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
     const auto form =
@@ -288,12 +334,12 @@ RunEvidence JobScript::runOnce(Access access, ToolRun::Problems problems)
         return {access, {NotStarted{*error}}, {}, volume_};
     }
     ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access, problems,
-                {options_, log_, road_, stop_});
+                context_);
     return run.run(std::get<DiskForTool>(disk), volume_);
 }
 
 // What was found on a disk that then went away is no answer about the disk that is left.
-Judgement JobScript::judge(const RunEvidence& evidence) const
+Judgement VolumeScript::judge(const RunEvidence& evidence) const
 {
     Judgement judgement = obstacle_ ? *obstacle_ : tool_->judge(evidence);
     if (judgement.verdict == Verdict::Stopped)
@@ -315,13 +361,14 @@ Judgement JobScript::judge(const RunEvidence& evidence) const
 }
 
 /// What a tool takes for damage may be a disk that cannot be read, which not every tool says.
-Judgement JobScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
+Judgement VolumeScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
 {
-    const bool isAnswer =
-        judgement.code == contract::kPLErrorUnreadable || judgement.code == contract::kPLErrorDamaged ||
-        judgement.code == contract::kPLErrorCutShort || judgement.code == contract::kPLErrorInconclusive ||
-        judgement.code == contract::kPLErrorToolFailed;
-    if (obstacle_ || !isAnswer || stop_.isPressed() ||
+    const bool isAnswer = judgement.code == contract::kPLErrorUnreadable ||
+                          judgement.code == contract::kPLErrorDamaged ||
+                          judgement.code == contract::kPLErrorCutShort ||
+                          judgement.code == contract::kPLErrorInconclusive ||
+                          judgement.code == contract::kPLErrorToolFailed;
+    if (obstacle_ || !isAnswer || context_.stop.isPressed() ||
         std::holds_alternative<NotStarted>(evidence.result.ending))
         return judgement;
     const auto byte = unreadableByte(evidence.findings.readFault.value_or(ReadFault()));
@@ -330,7 +377,7 @@ Judgement JobScript::asKernelSays(const Judgement& judgement, const RunEvidence&
 
 /// Our own reading of where the tool could not, and of where a file system keeps what it is built
 /// on; of all, for half a minute, where a tool could not read and does not say where.
-std::optional<std::uint64_t> JobScript::unreadableByte(const ReadFault& fault) const
+std::optional<std::uint64_t> VolumeScript::unreadableByte(const ReadFault& fault) const
 {
     constexpr std::uint64_t around = 1U << 20U;
     const std::uint64_t available = disk_.claim().availableBytes();
@@ -344,11 +391,13 @@ std::optional<std::uint64_t> JobScript::unreadableByte(const ReadFault& fault) c
     return firstUnreadable(pieces);
 }
 
-std::optional<std::uint64_t> JobScript::firstUnreadable(const std::vector<DiskPiece>& pieces) const
+std::optional<std::uint64_t> VolumeScript::firstUnreadable(
+    const std::vector<DiskPiece>& pieces) const
 {
     const auto deadline = Clock::now() + std::chrono::seconds(30);
-    return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces,
-                                   [&] { return stop_.isPressed() || Clock::now() > deadline; });
+    return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces, [&] {
+        return context_.stop.isPressed() || Clock::now() > deadline;
+    });
 }
 
 }  // namespace pellar

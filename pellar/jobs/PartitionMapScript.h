@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/ManagerOptions.h"
-#include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Script.h"
+#include "pellar/jobs/Job.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapReport.h"
@@ -13,10 +11,10 @@ namespace pellar {
 
 /// Verifies or repairs a disk's partition map: reads and judges it; to repair, plans, keeps what
 /// will be overwritten, writes, and reads and judges it again. The references outlive it.
-class MapScript final : public Script {
+class PartitionMapScript final : public Script {
 public:
-    MapScript(contract::DiskReferencePointer disk, Operation operation,
-              const ManagerOptions& options, const Texts& texts, StopSwitch& stop, EventRoad& road);
+    PartitionMapScript(contract::DiskReferencePointer disk, Operation operation,
+                       JobContext context);
 
     void run() override;
 
@@ -30,15 +28,11 @@ private:
     void tell(const Finding& finding);
     void step(Sentence sentence, double percent);
     void report(const Outcome& outcome);
-    contract::Name stepType() const;
 
     const contract::DiskReferencePointer disk_;
     const Operation operation_;
-    const ManagerOptions& options_;
-    const Texts& texts_;
-    StopSwitch& stop_;
-    EventRoad& road_;
-    JobLog log_;
+    JobContext context_;
+    JobLog& log_ = context_.log;
 };
 
 }  // namespace pellar

@@ -2,12 +2,10 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
-#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobDisk.h"
-#include "pellar/jobs/JobLog.h"
-#include "pellar/outcome/Outcome.h"
-#include "pellar/jobs/Script.h"
 #include "pellar/jobs/ToolRun.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/tools/Tool.h"
 
 #include <filesystem>
@@ -16,11 +14,11 @@
 
 namespace pellar {
 
-struct JobRequest {
+struct VolumeRequest {
     contract::DiskReferencePointer disk;
     Operation operation = Operation::Verify;
     std::optional<DiskClaim> claim;  ///< none: the job claims the disk itself, unmounted before
-    std::vector<Mount> mounts;  ///< where it is mounted, when there is no claim
+    std::vector<Mount> mounts;       ///< where it is mounted, when there is no claim
     const Tool* tool = nullptr;      ///< null: the kind of the volume is still to be found out
 };
 
@@ -35,10 +33,9 @@ struct JobRequest {
 ///
 /// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
 /// tells *started* once, first, and *finished* once, last. The references outlive it.
-class JobScript final : public Script {
+class VolumeScript final : public Script {
 public:
-    JobScript(JobRequest request, const ManagerOptions& options, const Texts& texts,
-              StopSwitch& stop, EventRoad& road);
+    VolumeScript(VolumeRequest request, JobContext context);
 
     void run() override;
 
@@ -54,10 +51,6 @@ private:
     State confirm();
     State end(Outcome outcome);
 
-    Access wantedAccess() const
-    {
-        return operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
-    }
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToDisk();
@@ -73,11 +66,8 @@ private:
 
     const Operation operation_;
     const Tool* tool_;
-    const ManagerOptions& options_;
-    const Texts& texts_;
-    StopSwitch& stop_;
-    EventRoad& road_;
-    JobLog log_;
+    JobContext context_;
+    JobLog& log_ = context_.log;
     JobDisk disk_;
 
     std::filesystem::path program_;

@@ -2,9 +2,7 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
-#include "pellar/ManagerOptions.h"
-#include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Script.h"
+#include "pellar/jobs/Job.h"
 #include "pellar/mounts/MountTable.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/process/ProcessRunner.h"
@@ -20,12 +18,11 @@ namespace pellar {
 /// Verifies a btrfs volume that stays mounted, because the system or the user works on it: the
 /// kernel reads all of it and compares it with its checksums. Nothing is written to it. Needs
 /// root. The references outlive it.
-class LiveScript final : public Script, private RunListener {
+class LiveVolumeScript final : public Script, private RunListener {
 public:
     /// `mounts` is where the disk is mounted, not empty.
-    LiveScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
-               const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
-               EventRoad& road);
+    LiveVolumeScript(contract::DiskReferencePointer disk, std::vector<Mount> mounts,
+                     JobContext context);
 
     void run() override;
 
@@ -42,16 +39,13 @@ private:
     void progressLine(std::string_view) override {}
     void lineLimitReached() override {}
     void stopAsked() override;
-    void pause() override { road_.flush(); }
+    void pause() override { log_.flush(); }
     void tick() override;
 
     const contract::DiskReferencePointer disk_;
     const std::vector<Mount> mounts_;
-    const ManagerOptions& options_;
-    const Texts& texts_;
-    StopSwitch& stop_;
-    EventRoad& road_;
-    JobLog log_;
+    JobContext context_;
+    JobLog& log_ = context_.log;
 
     FileDescriptor device_;
     std::optional<MountedBtrfs> volume_;

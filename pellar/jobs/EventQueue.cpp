@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/EventRoad.h"
+#include "pellar/jobs/EventQueue.h"
 
 #include "contract/pellar/MessageKeys.h"
 
@@ -26,8 +26,8 @@ std::size_t bytesOf(const Event& event)
 
 }  // namespace
 
-/// Outlives the road in the tasks that wait in the main loop.
-struct EventRoad::Shared {
+/// Outlives the events in the tasks that wait in the main loop.
+struct EventQueue::Shared {
     explicit Shared(EventReceiver r) : receiver(std::move(r)) {}
 
     std::mutex lock;
@@ -38,15 +38,15 @@ struct EventRoad::Shared {
 };
 
 /// One batch on its way; gives its place back when its task is done or dropped.
-class EventRoad::Crossing {
+class EventQueue::Batch {
 public:
-    Crossing(std::shared_ptr<Shared> shared, std::vector<Event> events)
+    Batch(std::shared_ptr<Shared> shared, std::vector<Event> events)
         : shared_(std::move(shared)), events_(std::move(events))
     {
     }
-    Crossing(const Crossing&) = delete;
-    Crossing& operator=(const Crossing&) = delete;
-    ~Crossing()
+    Batch(const Batch&) = delete;
+    Batch& operator=(const Batch&) = delete;
+    ~Batch()
     {
         const std::lock_guard guard(shared_->lock);
         --shared_->underWay;
@@ -60,12 +60,12 @@ private:
     std::vector<Event> events_;
 };
 
-EventRoad::EventRoad(contract::RunLoop& loop, EventReceiver receiver)
+EventQueue::EventQueue(contract::RunLoop& loop, EventReceiver receiver)
     : loop_(loop), shared_(std::make_shared<Shared>(std::move(receiver)))
 {
 }
 
-void EventRoad::add(Event event)
+void EventQueue::add(Event event)
 {
     if (batch_.empty())
         oldest_ = Clock::now();
@@ -75,7 +75,7 @@ void EventRoad::add(Event event)
         flush();
 }
 
-void EventRoad::flush()
+void EventQueue::flush()
 {
     if (batch_.empty())
         return;
@@ -90,24 +90,24 @@ void EventRoad::flush()
         ++shared_->underWay;
     }
     // Posted without the lock: a loop may run the task at once.
-    const auto crossing = std::make_shared<Crossing>(shared_, std::move(events));
-    loop_.performOnMainThread([crossing] { crossing->arrive(); }, contract::RunLoop::Wait::No);
+    const auto batch = std::make_shared<Batch>(shared_, std::move(events));
+    loop_.performOnMainThread([batch] { batch->arrive(); }, contract::RunLoop::Wait::No);
 }
 
-void EventRoad::flushIfDue()
+void EventQueue::flushIfDue()
 {
     if (!batch_.empty() && Clock::now() - oldest_ >= 100ms)
         flush();
 }
 
-void EventRoad::close()
+void EventQueue::close()
 {
     const std::lock_guard guard(shared_->lock);
     shared_->isClosed = true;
     shared_->room.notify_all();
 }
 
-void EventRoad::deliver(Shared& shared, std::vector<Event>& events)
+void EventQueue::deliver(Shared& shared, std::vector<Event>& events)
 {
     for (const Event& event : events) {
         if (shared.isClosed)  // asked anew each time: the delegate may end the job

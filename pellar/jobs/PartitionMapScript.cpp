@@ -1,9 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/jobs/MapScript.h"
+#include "pellar/jobs/PartitionMapScript.h"
 
 #include "contract/foundation/Array.h"
 #include "contract/foundation/UTF8.h"
-#include "contract/pellar/MessageKeys.h"
 #include "pellar/partitions/MapOutcome.h"
 #include "pellar/partitions/SavedSectors.h"
 
@@ -14,10 +13,6 @@
 
 namespace pellar {
 namespace {
-
-// The levels at which the module shows a message: always as a heading is, or as a main line is.
-constexpr int errorLevel = -1;
-constexpr int mainLevel = 0;
 
 contract::Value valueOf(const FindingArgument& argument)
 {
@@ -55,20 +50,13 @@ Outcome stopped()
 
 }  // namespace
 
-MapScript::MapScript(contract::DiskReferencePointer disk, Operation operation,
-                     const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
-                     EventRoad& road)
-    : disk_(std::move(disk)),
-      operation_(operation),
-      options_(options),
-      texts_(texts),
-      stop_(stop),
-      road_(road),
-      log_(*disk_, texts, road)
+PartitionMapScript::PartitionMapScript(contract::DiskReferencePointer disk, Operation operation,
+                                       JobContext context)
+    : disk_(std::move(disk)), operation_(operation), context_(std::move(context))
 {
 }
 
-void MapScript::run()
+void PartitionMapScript::run()
 {
     log_.started();
     report(carryOut());
@@ -76,27 +64,26 @@ void MapScript::run()
 
 // udev locks a device while it looks at it, as it does after every change (systemd's "Locking Block
 // Device Access"). That is over in a moment; a mount is not.
-std::variant<MapClaim, contract::ErrorCode> MapScript::claim() const
+std::variant<MapClaim, contract::ErrorCode> PartitionMapScript::claim() const
 {
     constexpr std::chrono::milliseconds pause{50};
     constexpr int mostTries = 40;
-    const Access access = operation_ == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
     for (int tries = 1;; ++tries) {
-        auto taken = MapClaim::take(*disk_, access, options_.systemPaths);
+        auto taken = MapClaim::take(*disk_, accessFor(operation_), context_.options.systemPaths);
         const auto* const error = std::get_if<contract::ErrorCode>(&taken);
         const bool isBusy = error != nullptr && *error == contract::kPLErrorDiskInUse;
-        if (!isBusy || tries == mostTries || stop_.isPressed())
+        if (!isBusy || tries == mostTries || context_.stop.isPressed())
             return taken;
         std::this_thread::sleep_for(pause);
     }
 }
 
 // The claim ends here: the disk is given back before the end is told.
-Outcome MapScript::carryOut()
+Outcome PartitionMapScript::carryOut()
 {
     step({"Reading the partition map of “%1$@”", log_.diskName(), {}}, 5);
     const auto taken = claim();
-    if (stop_.isPressed())
+    if (context_.stop.isPressed())
         return stopped();
     if (const auto* const error = std::get_if<contract::ErrorCode>(&taken))
         return failedOutcome(*error, reasonOf(*error));
@@ -116,7 +103,8 @@ Outcome MapScript::carryOut()
                : outcome;
 }
 
-Outcome MapScript::repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report)
+Outcome PartitionMapScript::repair(const MapClaim& claim, const PartitionMap& map,
+                                   const MapReport& report)
 {
     const auto planned = planRepair(map, report, claim.sectors());
     if (const auto* const refusal = std::get_if<Sentence>(&planned))
@@ -125,21 +113,23 @@ Outcome MapScript::repair(const MapClaim& claim, const PartitionMap& map, const 
     Outcome outcome;
     if (!save(claim, plan, outcome))
         return outcome;
-    if (stop_.isPressed())
+    if (context_.stop.isPressed())
         return stopped();
     outcome = write(claim, plan);
     if (outcome.verdict == Verdict::Repaired && !claim.rereadPartitions())
         log_.remark(
-            texts_.text("The system has not taken up the repaired map yet; it does when "
-                        "the disk is connected again."));
+            Sentence{"The system has not taken up the repaired map yet; it does when "
+                     "the disk is connected again.",
+                     {},
+                     {}});
     return outcome;
 }
 
-bool MapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome)
+bool PartitionMapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome)
 {
     const SavedDisk disk{disk_->path, claim.offset(), claim.sectors().sectorBytes(),
                          std::chrono::system_clock::now()};
-    const auto saved = saveSectors(plan, disk, options_.savedSectorsDirectory);
+    const auto saved = saveSectors(plan, disk, context_.options.savedSectorsDirectory);
     if (const auto* const refusal = std::get_if<Sentence>(&saved)) {
         outcome = outcomeOfRefusedRepair(*refusal);
         return false;
@@ -147,15 +137,15 @@ bool MapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& out
     const std::string directory =
         contract::printable(std::get<std::filesystem::path>(saved).native());
     log_.remark(
-        log_.text(Sentence{"The sectors that are overwritten are kept in %1$@; the "
-                           "README.txt there tells how to put them back.",
-                           directory,
-                           {}}));
+        {"The sectors that are overwritten are kept in %1$@; the README.txt there tells how "
+         "to put them back.",
+         directory,
+         {}});
     return true;
 }
 
 // Whatever has happened on the way, what can be read afterwards is the answer.
-Outcome MapScript::write(const MapClaim& claim, const RepairPlan& plan)
+Outcome PartitionMapScript::write(const MapClaim& claim, const RepairPlan& plan)
 {
     const FileSectors sectors = claim.sectors();
     for (const SectorWrite& write : plan.writes) {
@@ -179,7 +169,7 @@ Outcome MapScript::write(const MapClaim& claim, const RepairPlan& plan)
     return outcomeOfMapRepair(map, found);
 }
 
-void MapScript::tellMap(const PartitionMap& map)
+void PartitionMapScript::tellMap(const PartitionMap& map)
 {
     if (map.kind == PartitionMap::Kind::None)
         return;
@@ -198,49 +188,34 @@ void MapScript::tellMap(const PartitionMap& map)
          30);
 }
 
-void MapScript::tell(const Finding& finding)
+void PartitionMapScript::tell(const Finding& finding)
 {
     const bool isNote = levelOf(finding.kind) == FindingLevel::Note;
-    const contract::Dictionary message =
-        contract::Dictionary::of({{contract::kFsckMessageString, texts_.text(textOf(finding.kind))},
-                                 {contract::kFsckVerbosity, isNote ? mainLevel : errorLevel},
-                                 {contract::kFsckParameters, parametersOf(finding)}});
-    if (!isNote)
-        message.set(contract::kFsckMessageType, contract::kFsckError);
-    road_.add(Message{{}, message});
+    const std::string text = context_.texts.text(textOf(finding.kind));
+    if (isNote)
+        log_.remark(text, parametersOf(finding));
+    else
+        log_.error(text, parametersOf(finding));
 }
 
-void MapScript::step(Sentence sentence, double percent)
+void PartitionMapScript::step(Sentence sentence, double percent)
 {
-    log_.step(stepType(), log_.text(sentence));
+    log_.step(operation_, sentence);
     log_.progress(percent);
 }
 
-void MapScript::report(const Outcome& outcome)
+void PartitionMapScript::report(const Outcome& outcome)
 {
     const std::string message =
-        mapMessageOf(outcome, operation_, log_.diskName(), texts_).in(texts_);
+        mapMessageOf(outcome, operation_, log_.diskName(), context_.texts).in(context_.texts);
     if (outcome.verdict == Verdict::Failed)
         log_.failure(message);
     else if (!outcome.reason.isEmpty())
         log_.remark(message);
     const Sentence line = mapVerdictLine(outcome.verdict, operation_, log_.diskName());
-    if (!line.isEmpty()) {
-        const bool isGood = outcome.code == contract::kPLNoError;
-        road_.add(Message{
-            {},
-            contract::Dictionary::of(
-                {{contract::kFsckMessageType, isGood ? contract::kFsckSuccess : contract::kFsckError},
-                 {contract::kFsckMessageString, line.in(texts_)},
-                 {contract::kFsckVerbosity, mainLevel}})});
-    }
-    log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
-    log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
-}
-
-contract::Name MapScript::stepType() const
-{
-    return operation_ == Operation::Verify ? contract::kFsckVerify : contract::kFsckRepair;
+    if (!line.isEmpty())
+        log_.verdict(outcome.code == contract::kPLNoError, log_.text(line));
+    log_.finished(outcome, message);
 }
 
 }  // namespace pellar
