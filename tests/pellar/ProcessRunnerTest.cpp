@@ -51,53 +51,16 @@ TEST(LineSplitter, CutsAtEveryLineEnd)
 
 const Clock::time_point start{};
 
-TEST(StopLadder, PressesHarderAsTimePasses)
-{
-    StopLadder ladder({2s, 3s, 0s});
-    EXPECT_EQ(ladder.due(start + 1h), 0) << "nobody wants it to end";
-    EXPECT_EQ(ladder.press(start), SIGINT);
-    EXPECT_EQ(ladder.due(start + 1999ms), 0);
-    EXPECT_EQ(ladder.due(start + 2s), SIGTERM);
-    EXPECT_EQ(ladder.due(start + 4999ms), 0);
-    EXPECT_EQ(ladder.due(start + 5s), SIGKILL);
-    EXPECT_FALSE(ladder.deadline());
-    EXPECT_EQ(ladder.press(start + 6s), 0) << "there is nothing harder";
-}
-
-TEST(StopLadder, EachPressIsTheNextStepAtOnce)
-{
-    StopLadder ladder(graceTimesFor(Access::ReadWrite));
-    EXPECT_EQ(ladder.press(start), SIGINT);
-    EXPECT_EQ(ladder.press(start), SIGTERM);
-    EXPECT_EQ(ladder.press(start), SIGKILL);
-}
-
 TEST(StopLadder, LeavingKillsAReaderAndGivesAWriterAMoment)
 {
     EXPECT_EQ(StopLadder(graceTimesFor(Access::ReadOnly)).pressHard(start), SIGKILL);
     StopLadder writer(graceTimesFor(Access::ReadWrite));
     EXPECT_EQ(writer.pressHard(start), SIGINT);
     EXPECT_EQ(writer.pressHard(start + 1s), 0) << "once is enough";
+    EXPECT_EQ(writer.due(start + 2999ms), 0);
     EXPECT_EQ(writer.due(start + 3s), SIGKILL);
-}
-
-TEST(OutputBudget, VerifyIsEndedWhereRepairGoesOnUnheard)
-{
-    struct Case {
-        Access access;
-        int lines;
-        OutputBudget::State state;
-    };
-    for (const Case& c : {Case{Access::ReadOnly, 10, OutputBudget::State::Heard},
-                          Case{Access::ReadOnly, 11, OutputBudget::State::Spent},
-                          Case{Access::ReadWrite, 11, OutputBudget::State::Unheard},
-                          Case{Access::ReadWrite, 99, OutputBudget::State::Unheard},
-                          Case{Access::ReadWrite, 100, OutputBudget::State::Spent}}) {
-        OutputBudget budget({10, 1000}, c.access);
-        for (int i = 0; i < c.lines; ++i)
-            budget.countLine();
-        EXPECT_EQ(budget.state(), c.state) << c.lines << " lines";
-    }
+    EXPECT_FALSE(writer.deadline());
+    EXPECT_EQ(writer.press(start + 6s), 0) << "there is nothing harder";
 }
 
 /// Keeps the lines; presses the stop switch at the first one when asked to.
@@ -219,28 +182,49 @@ TEST(ProcessRunner, BoundsWhatAToolPrints)
 {
     struct Case {
         std::string_view script;
+        Access access;
+        bool ignoresStops;
+        OutputLimits limits;
         std::size_t lines;
+        int limitsTold;
         std::string_view because;
     };
-    for (const Case& c : {Case{"flood-lines", 1000, "lines without end"},
-                          Case{"flood-bytes", 1, "a line without end is one line, cut"}}) {
+    for (const Case& c : {
+             Case{"flood-lines", Access::ReadOnly, false, {1000, 1U << 20U}, 1000, 0, "lines"},
+             Case{"flood-bytes",
+                  Access::ReadOnly,
+                  false,
+                  {1000, 1U << 20U},
+                  1,
+                  0,
+                  "a line without end is one line, cut"},
+             Case{"flood-lines",
+                  Access::ReadWrite,
+                  false,
+                  {1000, 1U << 30U},
+                  1000,
+                  1,
+                  "a repair runs on unheard before it is ended"},
+             Case{"flood-lines",
+                  Access::ReadWrite,
+                  true,
+                  {100, 10000},
+                  100,
+                  1,
+                  "also one that ignores being asked"},
+         }) {
         Runner runner;
-        runner.request.limits = {1000, 1U << 20U};
+        runner.request.access = c.access;
+        runner.request.ignoresStops = c.ignoresStops;
+        runner.request.limits = c.limits;
+        runner.request.graceTimes = {c.ignoresStops ? 24h : 100ms, 100ms, 50ms};
         const RunResult result = runner.run(c.script);
         EXPECT_EQ(result.cause, StopCause::TooMuchOutput) << c.because;
         EXPECT_EQ(runner.lines.output.size(), c.lines) << c.because;
+        EXPECT_EQ(runner.lines.limits, c.limitsTold) << c.because;
         EXPECT_LE(runner.lines.output.back().size(), longestToolLine) << c.because;
     }
-}
-
-TEST(ProcessRunner, LetsARepairRunOnUnheardBeforeItEndsIt)
-{
-    Runner runner;
-    runner.request.access = Access::ReadWrite;
-    runner.request.limits = {1000, 1U << 30U};
-    EXPECT_EQ(runner.run("flood-lines").cause, StopCause::TooMuchOutput);
-    EXPECT_EQ(runner.lines.output.size(), 1000U);
-    EXPECT_EQ(runner.lines.limits, 1) << "one sentence says so";
+    expectNoChildren();
 }
 
 TEST(ProcessRunner, EndsASilentToolOnlyWhenAskedTo)
@@ -305,19 +289,6 @@ TEST(ProcessRunner, LetsAWriterComeToItsEndThatWouldBreakOff)
     EXPECT_EQ(insisting.run("say begun\nwait").ending, Ending(Killed{SIGKILL}))
         << "who asks three times has his way";
     expectNoChildren();
-}
-
-TEST(ProcessRunner, EndsAWriterThatIgnoresStopsAndPrintsWithoutEnd)
-{
-    Runner runner;
-    runner.request.access = Access::ReadWrite;
-    runner.request.ignoresStops = true;
-    runner.request.limits = {100, 10000};
-    runner.request.graceTimes = {24h, 24h, 50ms};
-    const RunResult result = runner.run("flood-lines");
-    EXPECT_EQ(result.ending, Ending(Killed{SIGKILL}));
-    EXPECT_EQ(result.cause, StopCause::TooMuchOutput);
-    EXPECT_EQ(runner.lines.limits, 1);
 }
 
 TEST(ProcessRunner, DoesNotStartWhatIsAlreadyStopped)
