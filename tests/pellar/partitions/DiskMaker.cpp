@@ -35,14 +35,6 @@ void makeFile(const std::filesystem::path& path, std::uint64_t bytes)
 
 }  // namespace
 
-std::optional<Bytes> MemorySectors::read(std::uint64_t first, std::uint64_t number) const
-{
-    if (!isOnDisk(first, number, count()))
-        return std::nullopt;
-    const auto begin = bytes.begin() + static_cast<std::ptrdiff_t>(first * sectorBytes_);
-    return Bytes(begin, begin + static_cast<std::ptrdiff_t>(number * sectorBytes_));
-}
-
 Bytes fileBytes(const std::filesystem::path& path)
 {
     std::ifstream file(path, std::ios::binary);

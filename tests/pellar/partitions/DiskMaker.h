@@ -13,24 +13,6 @@ namespace pellar::test {
 
 inline constexpr std::uint64_t mebibyte = 1U << 20U;
 
-/// A disk in memory.
-class MemorySectors final : public Sectors {
-public:
-    explicit MemorySectors(Bytes disk, std::uint32_t sectorBytes = 512)
-        : bytes(std::move(disk)), sectorBytes_(sectorBytes)
-    {
-    }
-
-    std::uint32_t sectorBytes() const override { return sectorBytes_; }
-    std::uint64_t count() const override { return bytes.size() / sectorBytes_; }
-    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override;
-
-    Bytes bytes;
-
-private:
-    std::uint32_t sectorBytes_;
-};
-
 Bytes fileBytes(const std::filesystem::path& path);
 
 struct ToolAnswer {

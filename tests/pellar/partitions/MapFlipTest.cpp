@@ -12,7 +12,24 @@ namespace {
 
 using namespace pellar;
 using test::DiskImage;
-using test::MemorySectors;
+
+/// A disk in memory.
+class MemorySectors final : public Sectors {
+public:
+    explicit MemorySectors(Bytes disk) : bytes(std::move(disk)) {}
+
+    std::uint32_t sectorBytes() const override { return 512; }
+    std::uint64_t count() const override { return bytes.size() / 512; }
+    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override
+    {
+        if (!isOnDisk(first, number, count()))
+            return std::nullopt;
+        const auto begin = bytes.begin() + static_cast<std::ptrdiff_t>(first * sectorBytes());
+        return Bytes(begin, begin + static_cast<std::ptrdiff_t>(number * sectorBytes()));
+    }
+
+    Bytes bytes;
+};
 
 MapReport reportOf(const MemorySectors& disk)
 {
