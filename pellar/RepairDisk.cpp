@@ -235,19 +235,20 @@ ErrorCode RepairDisk::refusal(Task task, const DiskReferencePointer& disk) const
         return contract::kPLErrorBusy;
     if (!disk || disk->path.empty())
         return contract::kPLErrorNoDiskReference;
+    if (task.subject == Subject::Permissions)
+        return refusalOfPermissions(*disk);
     if (disk->isWhole != (task.subject == Subject::PartitionMap))
-        return task.subject == Subject::Permissions ? refusalOfPermissions()
-                                                    : contract::kPLErrorUnsupported;
-    if (task.subject == Subject::Permissions &&
-        (disk->mountPoint.empty() || installedSystemAt(disk->mountPoint) == PackageDatabase::None))
-        return refusalOfPermissions();
+        return contract::kPLErrorUnsupported;
     if (task.subject == Subject::Filesystem)
         traceTool(*disk, task.operation);
     return contract::kPLNoError;
 }
 
-ErrorCode RepairDisk::refusalOfPermissions() const
+ErrorCode RepairDisk::refusalOfPermissions(const contract::DiskReference& disk) const
 {
+    if (!disk.isWhole && !disk.mountPoint.empty() &&
+        installedSystemAt(disk.mountPoint) != PackageDatabase::None)
+        return contract::kPLNoError;
     trace(
         texts_.text("the volume is not mounted as the root of a system with a package "
                     "database that is known here"));

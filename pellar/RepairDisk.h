@@ -44,7 +44,7 @@ public:
 private:
     contract::ErrorCode begin(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode refusal(Task task, const contract::DiskReferencePointer& disk) const;
-    contract::ErrorCode refusalOfPermissions() const;
+    contract::ErrorCode refusalOfPermissions(const contract::DiskReference& disk) const;
     bool beginPrivileged(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode beginVolume(const contract::DiskReferencePointer& disk,
                                     Operation operation);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/mounts/MountCall.h"
+#include "pellar/mounts/MountPoint.h"
 #include "pellar/mounts/MountTable.h"
 #include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"

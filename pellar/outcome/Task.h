@@ -1,9 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include <array>
-#include <string_view>
-
 namespace pellar {
 
 /// What of a disk a job is about.
@@ -21,19 +18,5 @@ struct Task {
 
     friend bool operator==(const Task&, const Task&) = default;
 };
-
-struct TaskName {
-    std::string_view name;
-    Task task;
-};
-
-/// The words by which programs of the product ask each other for a task.
-inline constexpr std::array taskNames{
-    TaskName{"verify", {Subject::Filesystem, Operation::Verify}},
-    TaskName{"repair", {Subject::Filesystem, Operation::Repair}},
-    TaskName{"verify-map", {Subject::PartitionMap, Operation::Verify}},
-    TaskName{"repair-map", {Subject::PartitionMap, Operation::Repair}},
-    TaskName{"verify-permissions", {Subject::Permissions, Operation::Verify}},
-    TaskName{"repair-permissions", {Subject::Permissions, Operation::Repair}}};
 
 }  // namespace pellar

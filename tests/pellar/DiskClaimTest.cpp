@@ -2,7 +2,7 @@
 #include "pellar/disks/DiskClaim.h"
 
 #include "pellar/mounts/MountTable.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
@@ -25,19 +25,19 @@ ErrorCode claimError(const std::filesystem::path& path, Access access = Access::
 
 TEST(DiskClaim, RefusesWhatIsNoDisk)
 {
-    const test::Workshop workshop;
-    EXPECT_EQ(claimError(workshop.path("nothing")), contract::kPLErrorCannotOpen);
-    EXPECT_EQ(claimError(workshop.path("")), contract::kPLErrorCannotOpen) << "a directory";
-    ASSERT_EQ(::mkfifo(workshop.path("fifo").c_str(), 0600), 0);
-    EXPECT_EQ(claimError(workshop.path("fifo")), contract::kPLErrorCannotOpen);
+    const test::TestDirectory directory;
+    EXPECT_EQ(claimError(directory.path("nothing")), contract::kPLErrorCannotOpen);
+    EXPECT_EQ(claimError(directory.path("")), contract::kPLErrorCannotOpen) << "a directory";
+    ASSERT_EQ(::mkfifo(directory.path("fifo").c_str(), 0600), 0);
+    EXPECT_EQ(claimError(directory.path("fifo")), contract::kPLErrorCannotOpen);
     EXPECT_EQ(claimError("/dev/zero"), contract::kPLErrorCannotOpen);
 }
 
 TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", "x");
-    const auto disk = test::reference(workshop.path("disk"));
+    const test::TestDirectory directory;
+    directory.write("disk", "x");
+    const auto disk = test::reference(directory.path("disk"));
     {
         const auto reader = DiskClaim::take(*disk, Access::ReadOnly, {});
         EXPECT_EQ(claimError(disk->path), contract::kPLNoError);
@@ -49,17 +49,17 @@ TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
 
 TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", "x");
-    workshop.write("other", "x");
-    std::filesystem::create_hard_link(workshop.path("disk"), workshop.path("second name"));
-    std::filesystem::create_directories(workshop.path("block/loop0/loop"));
-    std::filesystem::create_directories(workshop.path("block/sda"));
-    workshop.write("block/loop0/loop/backing_file", workshop.path("second name").string() + "\n");
-    const SystemPaths paths{workshop.path("block"), "/proc/self/mountinfo"};
-    EXPECT_EQ(claimError(workshop.path("disk"), Access::ReadOnly, paths),
+    const test::TestDirectory directory;
+    directory.write("disk", "x");
+    directory.write("other", "x");
+    std::filesystem::create_hard_link(directory.path("disk"), directory.path("second name"));
+    std::filesystem::create_directories(directory.path("block/loop0/loop"));
+    std::filesystem::create_directories(directory.path("block/sda"));
+    directory.write("block/loop0/loop/backing_file", directory.path("second name").string() + "\n");
+    const SystemPaths paths{directory.path("block"), "/proc/self/mountinfo"};
+    EXPECT_EQ(claimError(directory.path("disk"), Access::ReadOnly, paths),
               contract::kPLErrorDiskInUse);
-    EXPECT_EQ(claimError(workshop.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
+    EXPECT_EQ(claimError(directory.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
 }
 
 // The device manager locks a device while it looks at it, and the main thread waits for nobody.
@@ -67,31 +67,31 @@ TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
 {
     if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
         GTEST_SKIP() << obstacle;
-    const test::Workshop workshop;
-    const orvane::test::LoopDevice device(workshop.makeExt("disk", 16U << 20U));
+    const test::TestDirectory directory;
+    const orvane::test::LoopDevice device(directory.makeExt("disk", 16U << 20U));
     if (device.name().empty())
         GTEST_SKIP() << "the system gives no loop device";
     const auto disk = test::reference(device.name());
     const FileDescriptor other(::open(device.name().c_str(), O_RDONLY | O_CLOEXEC));
     for (const bool isLetGo : {true, false}) {
         ASSERT_EQ(::flock(other.get(), LOCK_EX), 0);
-        test::Bench bench;
-        const auto begun = bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
+        test::JobFixture library;
+        const auto begun = library.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
         EXPECT_EQ(begun, contract::kPLNoError);
         EXPECT_EQ(DiskClaim::attempt(*disk, Access::ReadOnly, {}).index(), 2U) << "locked still";
         if (isLetGo)
             ::flock(other.get(), LOCK_UN);
-        bench.finish(begun);
-        EXPECT_EQ(bench.listener.error,
+        library.finish(begun);
+        EXPECT_EQ(library.listener.error,
                   isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
     }
 }
 
 TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", std::string(10'000, 'x'));
-    auto disk = *test::reference(workshop.path("disk"));
+    const test::TestDirectory directory;
+    directory.write("disk", std::string(10'000, 'x'));
+    auto disk = *test::reference(directory.path("disk"));
     disk.offset = 4096;
     disk.length = 4096;
     const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
@@ -105,18 +105,18 @@ TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
 
 TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory directory;
     for (const char* const what : {"deleted", "moved", "replaced"}) {
-        workshop.write("disk", std::string(10'000, 'x'));
-        const auto disk = *test::reference(workshop.path("disk"));
+        directory.write("disk", std::string(10'000, 'x'));
+        const auto disk = *test::reference(directory.path("disk"));
         const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
         const auto& claim = std::get<DiskClaim>(taken);
         EXPECT_TRUE(claim.isStillInPlace());
-        std::filesystem::rename(disk.path, workshop.path("elsewhere"));
+        std::filesystem::rename(disk.path, directory.path("elsewhere"));
         if (what == std::string_view("deleted"))
-            std::filesystem::remove(workshop.path("elsewhere"));
+            std::filesystem::remove(directory.path("elsewhere"));
         else if (what == std::string_view("replaced"))
-            workshop.write("disk", std::string(10'000, 'x'));
+            directory.write("disk", std::string(10'000, 'x'));
         EXPECT_FALSE(claim.isStillInPlace()) << what;
         EXPECT_TRUE(claim.isStillWhole()) << what;
     }
@@ -148,20 +148,20 @@ TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
 
 TEST(MountTable, WhatIsNotKnownToBeFreeIsMounted)
 {
-    const test::Workshop workshop;
-    workshop.write("mounts",
-                   "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
-                   "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
-    workshop.write("none", "");
+    const test::TestDirectory directory;
+    directory.write("mounts",
+                    "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
+                    "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
+    directory.write("none", "");
     struct Case {
         std::filesystem::path list;
         unsigned minor;
         bool isMounted;
     };
     for (const Case& c :
-         {Case{workshop.path("mounts"), 17, true}, Case{workshop.path("mounts"), 1, false},
-          Case{workshop.path("mounts"), 2, false}, Case{workshop.path("mounts"), 3, false},
-          Case{workshop.path("none"), 17, false}, Case{"/nonexistent", 17, true},
+         {Case{directory.path("mounts"), 17, true}, Case{directory.path("mounts"), 1, false},
+          Case{directory.path("mounts"), 2, false}, Case{directory.path("mounts"), 3, false},
+          Case{directory.path("none"), 17, false}, Case{"/nonexistent", 17, true},
           Case{"/", 17, true}})
         EXPECT_EQ(isMounted(makedev(8, c.minor), {"/sys/block", c.list}), c.isMounted)
             << c.list << ' ' << c.minor;

@@ -2,7 +2,7 @@
 #include "contract/foundation/Array.h"
 #include "pellar/jobs/JobLog.h"
 #include "pellar/jobs/ToolRun.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
 

@@ -4,7 +4,7 @@
 #include "pellar/outcome/Damage.h"
 #include "pellar/texts/ErrorTexts.h"
 #include "pellar/tools/ext/E2fsckOutput.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
 

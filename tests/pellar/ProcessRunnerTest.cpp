@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ProcessRunner.h"
 
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -86,11 +86,11 @@ public:
 struct Runner {
     RunResult run(std::string_view script)
     {
-        request.command = {workshop.fakeTools(script) + "/e2fsck", {}};
+        request.command = {directory.fakeTools(script) + "/e2fsck", {}};
         return runTool(request, stop, lines);
     }
 
-    test::Workshop workshop;
+    test::TestDirectory directory;
     RunRequest request{{}, Access::ReadOnly, -1, {}, 0ms, {100ms, 100ms, 0ms}};
     StopSwitch stop;
     Lines lines;
@@ -126,12 +126,12 @@ TEST(ProcessRunner, TellsHowAToolEnded)
 TEST(ProcessRunner, SaysWhyAToolDidNotStart)
 {
     Runner runner;
-    runner.request.command = {runner.workshop.path("nothing"), {}};
+    runner.request.command = {runner.directory.path("nothing"), {}};
     EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
               Ending(NotStarted{ENOENT}));
-    runner.workshop.write("text", "no program");
-    std::filesystem::permissions(runner.workshop.path("text"), std::filesystem::perms::owner_all);
-    runner.request.command = {runner.workshop.path("text"), {}};
+    runner.directory.write("text", "no program");
+    std::filesystem::permissions(runner.directory.path("text"), std::filesystem::perms::owner_all);
+    runner.request.command = {runner.directory.path("text"), {}};
     EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
               Ending(NotStarted{ENOEXEC}));
     expectNoChildren();
@@ -208,7 +208,7 @@ TEST(ProcessRunner, BoundsWhatAToolPrints)
              Case{"flood-lines",
                   Access::ReadWrite,
                   true,
-                  {100, 10000},
+                  {100, 1U << 30U},
                   100,
                   1,
                   "also one that ignores being asked"},
@@ -222,7 +222,9 @@ TEST(ProcessRunner, BoundsWhatAToolPrints)
         EXPECT_EQ(result.cause, StopCause::TooMuchOutput) << c.because;
         EXPECT_EQ(runner.lines.output.size(), c.lines) << c.because;
         EXPECT_EQ(runner.lines.limits, c.limitsTold) << c.because;
+        ASSERT_FALSE(runner.lines.output.empty()) << c.because;
         EXPECT_LE(runner.lines.output.back().size(), longestToolLine) << c.because;
+        EXPECT_EQ(result.ending, Ending(Killed{c.ignoresStops ? SIGKILL : SIGINT})) << c.because;
     }
     expectNoChildren();
 }

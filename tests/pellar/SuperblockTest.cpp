@@ -4,7 +4,7 @@
 // is proven with the real tools; here stands what no maker makes.
 
 #include "pellar/tools/ToolTable.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
@@ -105,7 +105,7 @@ TEST(Superblocks, HugeNumbersDoNotWrapAround)
 
 TEST(Superblocks, ALostOneOfExtIsFoundInItsFirstBackup)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     struct Case {
         std::string blockBytes;
         std::uint64_t bytes;
@@ -123,7 +123,7 @@ TEST(Superblocks, ALostOneOfExtIsFoundInItsFirstBackup)
 
 TEST(Superblocks, WhatIsNoneOfExtIsRefused)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     struct Case {
         std::streamoff offset;
         char byte;
@@ -142,7 +142,7 @@ TEST(Superblocks, WhatIsNoneOfExtIsRefused)
 TEST(Superblocks, AnyBytesAreExamined)
 {
     std::mt19937 random(7);
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     for (const auto& maker : orvane::test::volumeMakers()) {
         if (findProgram(maker.command.front(), "/usr/sbin:/usr/bin").empty())
             continue;

@@ -6,7 +6,7 @@
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/ProgramStart.h"
 #include "pellar/process/Command.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
 
@@ -41,7 +41,7 @@ TEST(AskingProgram, GivesWhatItHasOpenItself)
 {
     if (::geteuid() != 0)
         GTEST_SKIP() << "only root may take a file from any program (ptrace(2), Yama)";
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     workshop.write("file", "here");
     const FileDescriptor file(::open(workshop.path("file").c_str(), O_RDONLY | O_CLOEXEC));
     const auto reads = [&file](uid_t user) {
@@ -98,7 +98,7 @@ TEST(AskingProgram, OneThatHadOtherRightsIsNotTrusted)
 
 TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
 {
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     workshop.write("image", std::string(8192, 'x'));
     const std::string image = workshop.path("image");
     HelperRequest request;
@@ -159,7 +159,7 @@ TEST(ProgramStart, TheEndOfAChildIsLearntWhateverWasIgnored)
 
 TEST(ProgramStart, AFileSizeLimitMakesWritingFailAndNothingElse)
 {
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     EXPECT_TRUE(inChild([&workshop] {
         const rlimit limit{4096, 4096};
         ::setrlimit(RLIMIT_FSIZE, &limit);
@@ -176,7 +176,7 @@ TEST(TrustedWay, RootRunsNoToolThatOthersCouldChange)
 {
     if (::geteuid() != 0)
         GTEST_SKIP() << "only root can give files away";
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     const auto directory = workshop.path("tools/more");
     const auto program = directory / "e2fsck";
     struct Case {

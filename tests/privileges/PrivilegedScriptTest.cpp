@@ -4,7 +4,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "orvane/privileges/PrivilegedScript.h"
 #include "pellar/jobs/Job.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
@@ -50,7 +50,7 @@ protected:
         return loop_.runUntil([this] { return listener_.finished == 1; });
     }
 
-    pellar::test::Workshop workshop_;
+    pellar::test::TestDirectory workshop_;
     pellar::test::TestLoop loop_;
     pellar::test::EnglishTexts texts_;
     pellar::test::Listener listener_;

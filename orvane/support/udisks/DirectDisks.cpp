@@ -4,7 +4,7 @@
 #include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/udisks/MountedAt.h"
 #include "pellar/disks/LoopDevice.h"
-#include "pellar/mounts/MountCall.h"
+#include "pellar/mounts/MountPoint.h"
 
 #include <fcntl.h>
 #include <libmount/libmount.h>

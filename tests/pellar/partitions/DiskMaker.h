@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/partitions/PartitionMap.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <filesystem>
 #include <string>
@@ -28,10 +28,10 @@ ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = 
 class DiskImage {
 public:
     /// Throws when the tools cannot make it.
-    static DiskImage gpt(const Workshop& workshop, std::string_view name = "disk.img");
+    static DiskImage gpt(const TestDirectory& workshop, std::string_view name = "disk.img");
     /// The same on 256 KiB: partitions at the sectors 64 to 319, nothing else between the copies.
-    static DiskImage smallGPT(const Workshop& workshop);
-    static DiskImage mbr(const Workshop& workshop, std::string_view script,
+    static DiskImage smallGPT(const TestDirectory& workshop);
+    static DiskImage mbr(const TestDirectory& workshop, std::string_view script,
                          std::string_view name = "disk.img");
 
     const std::filesystem::path& path() const { return path_; }
@@ -54,7 +54,7 @@ public:
     void seal(std::uint64_t headerPlace) const;
 
 private:
-    static DiskImage made(const Workshop& workshop, std::string_view name, std::uint64_t bytes,
+    static DiskImage made(const TestDirectory& workshop, std::string_view name, std::uint64_t bytes,
                           const std::string& script);
     explicit DiskImage(std::filesystem::path path) : path_(std::move(path)) {}
 

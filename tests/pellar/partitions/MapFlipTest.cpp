@@ -61,7 +61,7 @@ void sealHeader(std::span<std::uint8_t> sector)
 // Each byte of a header and of a list is covered by a checksum, in either copy.
 TEST(MapFlips, EveryByteUnderAChecksumIsMissedAndComesBack)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     MemorySectors disk(sound);
     const std::size_t last = (disk.count() - 1) * 512;
@@ -86,7 +86,7 @@ TEST(MapFlips, EveryByteUnderAChecksumIsMissedAndComesBack)
 
 TEST(MapFlips, EveryByteOfTheProtectiveEntryIsSurvived)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     MemorySectors disk(sound);
     for (std::size_t at = 0; at < 512; ++at) {
@@ -105,7 +105,7 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
 {
     constexpr std::uint64_t values[] = {
         0, 1, 2, 34, 478, 511, 512, 0x7FFFFFFF, 0xFFFFFFFF, 1ULL << 62U, 1ULL << 63U, ~0ULL};
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     const std::size_t last = sound.size() - 512;
     for (const std::size_t header : {std::size_t{512}, last}) {
@@ -135,7 +135,7 @@ TEST(MapFlips, AnInterruptedRepairCanAlwaysBeFinished)
         std::size_t length;  ///< set to zero
         std::size_t grownBy;
     };
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     const std::size_t last = sound.size() - 512;
     for (const Case& c :

@@ -152,7 +152,7 @@ contract::DiskReferencePointer mountedAt(const fs::path& root)
 }
 
 PermissionBench::PermissionBench(const fs::path& store)
-    : Bench([&] {
+    : JobFixture([&] {
           JobOptions options;
           options.permissionReferences = store;
           return options;

@@ -51,8 +51,9 @@ public:
     void plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
                                const contract::Dictionary& dictionary) override;
     void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
-    void plAsyncFinishedForDisk(const contract::DiskReferencePointer&, contract::ErrorCode mainError,
-                                contract::ErrorCode, const contract::Dictionary& result) override;
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer&,
+                                contract::ErrorCode mainError, contract::ErrorCode,
+                                const contract::Dictionary& result) override;
 
     /// The texts of dictionaries of this type.
     std::vector<std::string> textsOf(contract::Name type) const;
@@ -73,12 +74,12 @@ public:
 };
 
 /// A directory of one test, and what tests do with disks in it.
-class Workshop {
+class TestDirectory {
 public:
-    Workshop();
-    Workshop(const Workshop&) = delete;
-    Workshop& operator=(const Workshop&) = delete;
-    ~Workshop();
+    TestDirectory();
+    TestDirectory(const TestDirectory&) = delete;
+    TestDirectory& operator=(const TestDirectory&) = delete;
+    ~TestDirectory();
 
     std::filesystem::path path(std::string_view name) const { return directory_ / name; }
     void write(std::string_view name, std::string_view bytes) const;
@@ -86,6 +87,9 @@ public:
     /// A sparse file with a file system of e2fsprogs' own making.
     std::filesystem::path makeExt(std::string_view name, std::uint64_t bytes,
                                   std::vector<std::string> options = {}) const;
+    /// The same with another kind of file system; empty where the program that makes it is not
+    /// installed.
+    std::filesystem::path makeVolume(std::string_view name, std::string_view filesystem) const;
     /// Runs a program with the image as its last argument; a failure fails the test.
     void prepare(std::vector<std::string> command, const std::filesystem::path& image) const;
     /// debugfs(8), writing.
@@ -98,11 +102,12 @@ private:
 };
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image,
-                                        std::string filesystem = "ext4", std::string name = "Disk");
+                                         std::string filesystem = "ext4",
+                                         std::string name = "Disk");
 
 /// One library, one listener, one loop.
-struct Bench {
-    explicit Bench(JobOptions options = {});
+struct JobFixture {
+    explicit JobFixture(JobOptions options = {});
 
     /// Runs a job to its *finished* and answers what the begin answered.
     contract::ErrorCode verify(const contract::DiskReferencePointer& disk);

@@ -1,8 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include "contract/foundation/Array.h"
 #include "pellar/process/ChildProcess.h"
+#include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -118,7 +119,7 @@ bool Listener::hasErrorWith(std::string_view part) const
     });
 }
 
-Workshop::Workshop()
+TestDirectory::TestDirectory()
 {
     std::string pattern = (std::filesystem::temp_directory_path() / "pellar-XXXXXX").string();
     if (::mkdtemp(pattern.data()) == nullptr)
@@ -126,19 +127,19 @@ Workshop::Workshop()
     directory_ = pattern;
 }
 
-Workshop::~Workshop()
+TestDirectory::~TestDirectory()
 {
     std::error_code error;
     std::filesystem::remove_all(directory_, error);
 }
 
-void Workshop::write(std::string_view name, std::string_view bytes) const
+void TestDirectory::write(std::string_view name, std::string_view bytes) const
 {
     std::ofstream(path(name), std::ios::binary) << bytes;
 }
 
-std::filesystem::path Workshop::makeExt(std::string_view name, std::uint64_t bytes,
-                                        std::vector<std::string> options) const
+std::filesystem::path TestDirectory::makeExt(std::string_view name, std::uint64_t bytes,
+                                             std::vector<std::string> options) const
 {
     write(name, {});
     std::filesystem::resize_file(path(name), bytes);
@@ -148,7 +149,23 @@ std::filesystem::path Workshop::makeExt(std::string_view name, std::uint64_t byt
     return path(name);
 }
 
-void Workshop::prepare(std::vector<std::string> command, const std::filesystem::path& image) const
+std::filesystem::path TestDirectory::makeVolume(std::string_view name,
+                                                std::string_view filesystem) const
+{
+    const auto& makers = orvane::test::volumeMakers();
+    const auto maker = std::find_if(makers.begin(), makers.end(), [filesystem](const auto& known) {
+        return known.filesystem == filesystem;
+    });
+    if (findProgram(maker->command.front(), systemPath).empty())
+        return {};
+    write(name, {});
+    std::filesystem::resize_file(path(name), maker->bytes);
+    prepare(maker->command, path(name));
+    return path(name);
+}
+
+void TestDirectory::prepare(std::vector<std::string> command,
+                            const std::filesystem::path& image) const
 {
     const std::string name = command.front();
     command.erase(command.begin());
@@ -156,12 +173,12 @@ void Workshop::prepare(std::vector<std::string> command, const std::filesystem::
     runProgram(name, std::move(command));
 }
 
-void Workshop::damage(const std::filesystem::path& image, std::string command) const
+void TestDirectory::damage(const std::filesystem::path& image, std::string command) const
 {
     runProgram("debugfs", {"-w", "-R", std::move(command), image});
 }
 
-std::string Workshop::fakeTools(std::string_view script, std::string_view tool) const
+std::string TestDirectory::fakeTools(std::string_view script, std::string_view tool) const
 {
     const std::filesystem::path tools = path("tools");
     std::filesystem::create_directories(tools);
@@ -172,7 +189,7 @@ std::string Workshop::fakeTools(std::string_view script, std::string_view tool) 
 }
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,
-                                        std::string name)
+                                         std::string name)
 {
     auto disk = std::make_shared<contract::DiskReference>();
     disk->storage = contract::DiskReference::Storage::FileRegion;
@@ -185,7 +202,7 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image, std
     return disk;
 }
 
-Bench::Bench(JobOptions options)
+JobFixture::JobFixture(JobOptions options)
     : manager(loop, texts, [this, &options] {
           options.commandTrace = [this](std::string_view line) {
               traces.emplace_back(line);
@@ -197,17 +214,17 @@ Bench::Bench(JobOptions options)
     tool = manager.makeRepairDisk();
 }
 
-contract::ErrorCode Bench::verify(const contract::DiskReferencePointer& disk)
+contract::ErrorCode JobFixture::verify(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginStoragesystemFilesystemVerifyForDisk(disk));
 }
 
-contract::ErrorCode Bench::repair(const contract::DiskReferencePointer& disk)
+contract::ErrorCode JobFixture::repair(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginStoragesystemFilesystemRepairForDisk(disk));
 }
 
-contract::ErrorCode Bench::finish(contract::ErrorCode begun)
+contract::ErrorCode JobFixture::finish(contract::ErrorCode begun)
 {
     const int before = listener.finished;
     if (begun != contract::kPLNoError)
