@@ -117,9 +117,9 @@ void expectReport(const fs::path& image, const DamageCase& c)
     EXPECT_EQ(report.findings.size(), c.kinds.size()) << c.because << "\n" << kindsOf(report);
 }
 
-struct MapBench : test::Bench {
+struct MapBench : test::JobFixture {
     explicit MapBench(const fs::path& saved)
-        : Bench([&] {
+        : JobFixture([&] {
               JobOptions options;
               options.savedSectorsDirectory = saved;
               return options;
@@ -184,7 +184,7 @@ Bytes putBack(Bytes disk, const std::map<std::uint64_t, Bytes>& saved)
 }
 
 /// Carried out: what is kept, what is written, and what the disk is then.
-void expectRepaired(const test::Workshop& workshop, MapBench& bench, const DiskImage& disk,
+void expectRepaired(const test::TestDirectory& workshop, MapBench& bench, const DiskImage& disk,
                     const Bytes& before, std::string_view because)
 {
     const Bytes damaged = disk.bytes();
@@ -206,7 +206,7 @@ void expectRepaired(const test::Workshop& workshop, MapBench& bench, const DiskI
     EXPECT_EQ(bench.listener.verdict, "sound") << because;
 }
 
-void expectUntouched(const test::Workshop& workshop, MapBench& bench, const DiskImage& disk,
+void expectUntouched(const test::TestDirectory& workshop, MapBench& bench, const DiskImage& disk,
                      std::string_view because)
 {
     const Bytes damaged = disk.bytes();
@@ -292,7 +292,7 @@ TEST(PartitionMaps, AGPTIsRestoredWhereItIsThereTwiceAndLeftAloneElsewhere)
          "a copied entry"},
     };
     for (const DamageCase& c : cases) {
-        const test::Workshop workshop;
+        const test::TestDirectory workshop;
         const DiskImage disk = DiskImage::gpt(workshop);
         const Bytes before = disk.bytes();
         c.make(disk);
@@ -333,7 +333,7 @@ TEST(PartitionMaps, AnMBRIsOnlyJudged)
         {{link(0, 12, 20000)}, person, {OutsideExtended, Overlap}, "a logical one too long"},
     };
     for (const DamageCase& c : cases) {
-        const test::Workshop workshop;
+        const test::TestDirectory workshop;
         const DiskImage disk = DiskImage::mbr(workshop, script);
         c.make(disk);
         expectReport(disk.path(), c);
@@ -342,7 +342,7 @@ TEST(PartitionMaps, AnMBRIsOnlyJudged)
 
 TEST(PartitionMaps, NothingThatIsNoMapIsTakenForOne)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const auto verdictOf = [&](std::string_view name) {
         return reportOf(workshop.path(name)).verdict;
     };
@@ -361,7 +361,7 @@ TEST(PartitionMaps, NothingThatIsNoMapIsTakenForOne)
 // The danger: a repairer that restores such a map destroys the file system's start.
 TEST(PartitionMaps, AFileSystemInAnOldMapsPlaceIsLeftAlone)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     const Bytes backup = disk.bytes();
     workshop.makeExt("volume", 16 * mebibyte);
@@ -377,7 +377,7 @@ TEST(PartitionMaps, AFileSystemInAnOldMapsPlaceIsLeftAlone)
 // mark of an optical disc is easier to make.
 TEST(PartitionMaps, WhatFillsTheDiskMayOwnItsEnd)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     disk.put(32768, Bytes{1, 'C', 'D', '0', '0', '1', 1});
     disk.put(32768 + 2048, Bytes{255, 'C', 'D', '0', '0', '1', 1});
@@ -393,7 +393,7 @@ TEST(PartitionMaps, WhatFillsTheDiskMayOwnItsEnd)
 
 TEST(PartitionMaps, AnOlderGPTUnderAnMBRIsANote)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     disk.put(protective, Bytes{0, 0, 2, 0, 0x83, 0, 0, 0, 0, 8, 0, 0, 0, 32, 0, 0});
     const MapReport report = reportOf(disk.path());
@@ -402,7 +402,7 @@ TEST(PartitionMaps, AnOlderGPTUnderAnMBRIsANote)
 
 TEST(PartitionMaps, LargeSectorsAreFoundByThemselves)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const auto path = workshop.path("large");
     workshop.write("large", {});
     fs::resize_file(path, 32 * mebibyte);
@@ -421,7 +421,7 @@ TEST(PartitionMaps, LargeSectorsAreFoundByThemselves)
 
 TEST(PartitionMaps, NamesCannotForgeAnything)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     const std::string_view name(
         "\x1b\0[\0"
@@ -441,7 +441,7 @@ TEST(PartitionMaps, NamesCannotForgeAnything)
 // A list with as many partitions as are allowed, all in one place.
 TEST(PartitionMaps, ManyFindingsAreCut)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     const Bytes entry = disk.part(1024, 128);
     Bytes all;
@@ -457,7 +457,7 @@ TEST(PartitionMaps, ManyFindingsAreCut)
 // Some boards start from sector 2 and have their list of partitions behind their loader.
 TEST(PartitionMaps, AListBehindALoaderIsFoundAndTheLoaderLeft)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     if (test::runTool({"sgdisk", "-j", "1000", disk.path()}).status != 0)
         GTEST_SKIP() << "sgdisk is not installed";
@@ -472,7 +472,7 @@ TEST(PartitionMaps, AListBehindALoaderIsFoundAndTheLoaderLeft)
 
 TEST(PartitionMaps, WithoutAPlaceForTheOldSectorsNothingIsWritten)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     workshop.write("file", "x");
     for (const fs::path& saved : {fs::path(), fs::path("relative"), workshop.path("file") / "below",
                                   fs::path("/proc/nowhere")}) {
@@ -488,7 +488,7 @@ TEST(PartitionMaps, WithoutAPlaceForTheOldSectorsNothingIsWritten)
 
 TEST(PartitionMaps, KeepsTheOldSectorsPrivatelyAndTellsHowToPutThemBack)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop, "it's $HOME\n.img");
     disk.fill(512, 512, 0x11);
     const fs::path saved = workshop.path("saved");
@@ -512,7 +512,7 @@ TEST(PartitionMaps, KeepsTheOldSectorsPrivatelyAndTellsHowToPutThemBack)
 
 TEST(PartitionMaps, ADiskThatIsInUseIsOnlyRead)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     disk.fill(512, 512, 0);
     const Bytes damaged = disk.bytes();
@@ -528,7 +528,7 @@ TEST(PartitionMaps, ADiskThatIsInUseIsOnlyRead)
 
 TEST(PartitionMaps, CapabilityAnswersWithoutAJob)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const MapBench bench(workshop.path("saved"));
     const auto can = [&](const contract::DiskReferencePointer& disk) {
         contract::ErrorCode error = 1;
