@@ -32,7 +32,7 @@ bool isVolume(const DiskReferencePointer& disk)
 }
 
 /// Whether a device may be neither opened as the task must, nor unmounted, by this user; and
-/// whether installed files are to be changed. Nobody is asked for a password merely to look at the
+/// whether installed files are to be changed. No password is asked for merely to look at the
 /// files of a volume that is mounted: what this user may not see of it is counted and said.
 bool needsPrivileges(Task task, const contract::DiskReference& disk, const SystemPaths& paths)
 {
@@ -152,14 +152,14 @@ ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation op
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
     VolumeRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
-    // Nobody waits on the main thread: a device that is locked is claimed by the job.
+    // The main thread does not wait: a device that is locked is claimed by the job.
     if (auto* const taken = std::get_if<DiskClaim>(&claim))
         request.claim.emplace(std::move(*taken));
     startVolume(std::move(request));
     return contract::kPLNoError;
 }
 
-/// NO when the job needs nobody's help, or there is none.
+/// NO when the job needs no other rights, or there is no way to them.
 bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
 {
     if (!options_.privileged || !needsPrivileges(task, *disk, options_.systemPaths))

@@ -71,7 +71,7 @@ public:
 
     // Main thread.
 
-    /// Nothing arrives any more, also not what is already under way, and nobody waits.
+    /// Nothing arrives any more, also not what is already under way, and `add` waits no longer.
     void close();
 
 private:

@@ -31,8 +31,8 @@ public:
 struct PrivilegedJob {
     Task task;
     contract::DiskReference disk;
-    /// The image file of which the disk is a part, as this user has opened it: whoever does the
-    /// job may do no more with it. None for a block device.
+    /// The image file of which the disk is a part, as this user has opened it: the job may
+    /// do no more with it. None for a block device.
     std::shared_ptr<const DiskClaim> image;
     /// The user agrees that archives of packages are fetched (JobOptions::archiveFetching).
     bool fetchesArchives = false;

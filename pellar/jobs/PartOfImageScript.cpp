@@ -24,7 +24,7 @@ void PartOfImageScript::run()
         VolumeScript(std::move(request_), std::move(context_)).run();
 }
 
-/// Nobody is asked for a password where the job would end with a reason anyway.
+/// No password is asked for where the job would end with a reason anyway.
 bool PartOfImageScript::needsDevice() const
 {
     const Tool* const tool = request_.tool;

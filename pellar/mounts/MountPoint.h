@@ -62,8 +62,8 @@ struct NotHeld {
                                        std::size_t index) noexcept;
 
 /// The directory, to be mounted on (O_PATH). Where it has gone from a directory that only root may
-/// change, it is made again: whoever had made it takes it away with the mount. None, with errno:
-/// ESTALE when something else is in its place.
+/// change, it is made again: the program that made it takes it away with the mount. None, with
+/// errno: ESTALE when something else is in its place.
 [[nodiscard]] FileDescriptor openToMountOn(std::span<const MountPoint> points,
                                            std::size_t index) noexcept;
 

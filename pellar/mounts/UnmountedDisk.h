@@ -44,7 +44,7 @@ private:
 
 /// A disk that was unmounted for a job, and is mounted again where and as it was: at the latest
 /// when this object goes, however the job ends, and also when this process is killed. It stays
-/// unmounted where others have changed the place meanwhile. Any thread; unmounting writes back what
+/// unmounted where others have changed the place. Any thread; unmounting writes back what
 /// is still to be written, which may take long.
 class UnmountedDisk {
 public:

@@ -50,7 +50,7 @@ inline constexpr std::size_t mostRepairPasses = 5;
 
 Outcome failedOutcome(contract::ErrorCode code, Sentence reason);
 Outcome outcomeOfVerification(const Judgement& judgement);
-/// The same for a kind of volume that is not repaired here: nobody is sent to a repair.
+/// The same for a kind of volume that is not repaired here: no repair is advised.
 Outcome outcomeWithoutRepair(const Judgement& judgement);
 
 /// Whether to repair once more: damage is left, and the last pass got somewhere.

@@ -52,7 +52,7 @@ struct ChildStreams {
     int disk = -1;      ///< becomes diskDescriptorOfTool
     int progress = -1;  ///< becomes progressDescriptorOfTool
     /// A program that writes to a disk is asked to end when the host dies, and may go on printing
-    /// to nobody until it has come to a good place; any other is killed.
+    /// to no reader until it has come to a good place; any other is killed.
     Access access = Access::ReadOnly;
     /// Starts with SIGINT and SIGTERM ignored: nothing but SIGKILL ends it before its time.
     bool ignoresStops = false;

@@ -46,7 +46,7 @@ std::string shown(const Command& command);
 
 /// The program `name` in the first directory of `searchPath` ("/usr/sbin:/usr/bin") that has it as
 /// an executable regular file; empty when none has. Directories that are not absolute are
-/// skipped: what lies in the current directory is nobody's tool. So is, for root, what others could
+/// skipped: the current directory holds no tools. So is, for root, what others could
 /// change.
 std::filesystem::path findProgram(std::string_view name, std::string_view searchPath);
 

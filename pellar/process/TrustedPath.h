@@ -20,7 +20,7 @@ namespace pellar {
 [[nodiscard]] std::string whyOthersCanChange(const struct stat& status);
 
 /// Opens (O_PATH) what the path leads to. For root all directories on the way there are looked at,
-/// each as it is opened; others cannot lead it elsewhere meanwhile. Why it is refused, in English,
+/// each as it is opened; others cannot lead it elsewhere on the way. Why it is refused, in English,
 /// is answered instead.
 [[nodiscard]] Result<FileDescriptor, std::string> openTrusted(const std::filesystem::path& path);
 

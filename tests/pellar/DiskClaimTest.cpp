@@ -62,7 +62,7 @@ TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
     EXPECT_EQ(claimError(directory.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
 }
 
-// The device manager locks a device while it looks at it, and the main thread waits for nobody.
+// The device manager locks a device while it looks at it, and the main thread does not wait.
 TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
 {
     if (const char* const obstacle = orvane::test::LoopDevice::obstacle())

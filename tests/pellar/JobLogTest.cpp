@@ -73,7 +73,7 @@ TEST(EventQueue, TellsNothingOnceItIsClosed)
 {
     QueueFixture fixture;
     std::jthread job([&] {
-        for (int i = 0; i < 100'000; ++i)  // would wait for room that nobody makes
+        for (int i = 0; i < 100'000; ++i)  // would wait for room that is never made
             fixture.queue.add(Message{"x", {}});
     });
     fixture.waitUntilFull();

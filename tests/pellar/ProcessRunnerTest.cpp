@@ -96,7 +96,7 @@ struct Runner {
     Lines lines;
 };
 
-/// Nothing of ours is left: not even an ended process that nobody has reaped.
+/// Nothing of ours is left: not even an ended process that is still to be reaped.
 void expectNoChildren()
 {
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
