@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "bench/BenchHost.h"
 
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
 #include <stdexcept>
@@ -39,7 +39,7 @@ DiskTree sampleDisk()
 {
     DiskTree tree;
     tree.facts.identifier = "/somewhere/on/this/machine/sample.img#0";
-    tree.facts.displayName = "sample";
+    tree.facts.name = "sample";
     tree.facts.type = diskType::bareVolume;
     tree.facts.filesystem = "ext4";
     tree.facts.path = "/somewhere/on/this/machine/sample.img";

@@ -28,4 +28,11 @@ public:
     virtual std::filesystem::path pathForResource(std::string_view name) const = 0;
 };
 
+/// Marks a text as a key of a module's default string table, for the tool that collects them; it
+/// is looked up where it is shown.
+constexpr std::string_view localizable(std::string_view text)
+{
+    return text;
+}
+
 }  // namespace contract

@@ -24,6 +24,8 @@ struct DiskReference {
     std::string filesystem;  ///< as libblkid names it ("ext4"); empty when unknown
     std::string mountPoint;  ///< empty when not mounted
     bool isWhole = false;    ///< a disk with a partition map, not a volume
+
+    friend bool operator==(const DiskReference&, const DiskReference&) = default;
 };
 
 /// None where a disk has no reference (nothing stands behind it any more).

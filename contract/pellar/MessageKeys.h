@@ -3,6 +3,8 @@
 
 #include "contract/foundation/Name.h"
 
+#include <cstdint>
+
 namespace contract {
 
 // The keys of a message dictionary; the log's records carry the same.
@@ -21,6 +23,15 @@ inline const Name kFsckError{"ERROR"};        ///< a problem that was found
 inline const Name kFsckSuccess{"SUCCESS"};    ///< a good result
 inline const Name kFsckFail{"FAIL"};          ///< a failed operation, or a warning
 inline const Name kFsckProgress{"PROGRESS"};  ///< the first parameter is the percentage done
+
+/// How much a record matters. A missing number reads as `main`.
+namespace verbosity {
+inline constexpr std::int64_t summary = -2;  ///< closes a run; hidden while it is the last record
+inline constexpr std::int64_t heading = -1;  ///< drawn bold
+inline constexpr std::int64_t main = 0;
+inline constexpr std::int64_t detail = 1;  ///< from here on shown only with details
+inline constexpr std::int64_t fine = 2;
+}  // namespace verbosity
 
 // The keys of a result dictionary, which a finished job hands over beside its error code.
 

@@ -95,4 +95,10 @@ inline bool hasMountPoint(const OVDisk& disk)
     return !disk.mountPoint().value_or(std::string()).empty();
 }
 
+/// For a line of the log.
+inline std::string identifierOf(const OVDiskPointer& disk)
+{
+    return disk ? disk->diskIdentifier() : std::string("(none)");
+}
+
 }  // namespace contract

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "contract/foundation/Dictionary.h"
+#include "contract/foundation/RunLoop.h"
 #include "contract/support/OVDisk.h"
 
 #include <string>
@@ -9,6 +10,19 @@
 #include <vector>
 
 namespace contract {
+
+// The keys of a completion report, which tells the host how a job ended, and their values.
+
+inline const Name kOVOP_ResultKey{"kOVOP_ResultKey"};
+inline const Name kOVOP_SuccessKey{"kOVOP_SuccessKey"};
+inline const Name kOVOP_FailKey{"kOVOP_FailKey"};
+inline const Name kOVOP_DiskIdentifierKey{"kOVOP_DiskIdentifierKey"};
+inline const Name kOVOP_DiskKey{"kOVOP_DiskKey"};
+inline const Name kOVOP_ActionTypeKey{"kOVOP_ActionTypeKey"};
+inline const Name kOVOP_RepairDiskKey{"kOVOP_RepairDiskKey"};
+inline const Name kOVOP_RepairDiskPermissionsKey{"kOVOP_RepairDiskPermissionsKey"};
+inline const Name kOVOP_VerifyDiskPermissionsKey{"kOVOP_VerifyDiskPermissionsKey"};
+inline const Name kOVOP_VerifyDiskKey{"kOVOP_VerifyDiskKey"};
 
 /// The host window: its selection, its progress bar and status line, its lock. Main thread only.
 class OVWindowController {
@@ -34,6 +48,17 @@ public:
 
     /// A job has ended; `report` has the completion report's keys.
     virtual void notifyWindowOfCompletion(const Dictionary& report) = 0;
+};
+
+/// Estimates how long a job still takes. A new estimator starts at the moment it is made.
+class OVTimeEstimator {
+public:
+    virtual ~OVTimeEstimator() = default;
+
+    /// Moves the reference point: at `start` the job stood at `percent` (0 to 100).
+    virtual void setStartTimeWithPercentComplete(Threads::Date start, double percent) = 0;
+    /// A short localized duration ("2 minutes"), or empty while there is no telling yet.
+    virtual std::string timeEstimateString(double percent) = 0;
 };
 
 }  // namespace contract

@@ -2,13 +2,25 @@
 #pragma once
 
 #include "contract/foundation/StyledText.h"
-#include "contract/toolkit/Selector.h"
 
 #include <cstdint>
 #include <string>
 #include <string_view>
 
 namespace contract {
+
+/// The name of an action that a control sends, "verifyDisk:". A literal: it is not copied.
+using Selector = std::string_view;
+
+/// In points; y grows downwards.
+struct Rect {
+    double x = 0;
+    double y = 0;
+    double width = 0;
+    double height = 0;
+
+    friend bool operator==(const Rect&, const Rect&) = default;
+};
 
 /// Something on the screen. Main thread only; owned by the front end, and alive as long as the
 /// module whose interface file names it.

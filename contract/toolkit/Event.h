@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/toolkit/Selector.h"
+#include "contract/toolkit/Control.h"
 
 #include <cstdint>
 

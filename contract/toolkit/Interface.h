@@ -3,7 +3,6 @@
 
 #include "contract/toolkit/Control.h"
 #include "contract/toolkit/OutlineView.h"
-#include "contract/toolkit/Selector.h"
 
 #include <memory>
 #include <span>

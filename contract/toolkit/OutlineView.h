@@ -5,7 +5,6 @@
 #include "contract/toolkit/BrowserCell.h"
 #include "contract/toolkit/Control.h"
 #include "contract/toolkit/Event.h"
-#include "contract/toolkit/Geometry.h"
 #include "contract/toolkit/Pasteboard.h"
 
 #include <cstddef>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/module/Localizable.h"
+#include "contract/toolkit/ControlNames.h"
 #include "fixwell/module/OVFXW.h"
 
 #include <array>
@@ -68,18 +68,18 @@ struct ActionButtonTexts {
 
 constexpr std::array<ActionButtonTexts, 4> actionButtonTexts{{
     {localizable("Check whether the structure of the disk’s file system is OK"),
-     localizable("Verify Disk"), localizable("Stop Verify"), "verifyDisk:", FXWActionVerifyDisk,
+     localizable("Verify Disk"), localizable("Stop Verify"), selector::verifyDisk, FXWActionVerifyDisk,
      FXWActionVerifyPartitionMap},
     {localizable("Repair the structure of the disk’s file system, if necessary"),
-     localizable("Repair Disk"), localizable("Stop Repair"), "repairDisk:", FXWActionRepairDisk,
+     localizable("Repair Disk"), localizable("Stop Repair"), selector::repairDisk, FXWActionRepairDisk,
      FXWActionRepairPartitionMap},
     {localizable("Check whether the correct permissions are assigned to Tallo-installed files and "
                  "folders"),
      localizable("Verify Disk Permissions"), localizable("Stop Permission Verify"),
-     "verifyPermissions:", FXWActionVerifyPermissions, FXWActionVerifyPermissions},
+     selector::verifyPermissions, FXWActionVerifyPermissions, FXWActionVerifyPermissions},
     {localizable("Set the correct permissions for Tallo-installed files and folders"),
      localizable("Repair Disk Permissions"), localizable("Stop Permission Repair"),
-     "repairPermissions:", FXWActionRepairPermissions, FXWActionRepairPermissions},
+     selector::repairPermissions, FXWActionRepairPermissions, FXWActionRepairPermissions},
 }};
 
 constexpr bool isKnownAction(std::int64_t action)
@@ -148,7 +148,7 @@ void OVFXW::applyDecision(const ButtonDecision& decision)
         const ActionButtonTexts& texts = actionButtonTexts[i];
         const bool stops = action == texts.runningCode || action == texts.partitionMapCode;
         buttons[i]->setToolTip(toolTip(texts, availability[i].reason));
-        buttons[i]->setAction(stops ? "stopAction:" : texts.action);
+        buttons[i]->setAction(stops ? selector::stop : texts.action);
         buttons[i]->setTitle(localized(stops ? texts.stopTitle : texts.title));
     }
     for (View* view : std::array<View*, 7>{
@@ -162,6 +162,42 @@ std::string OVFXW::reasonString(std::int32_t reason, bool multiSelected) const
 {
     const std::string_view text = reasonText(reason, multiSelected);
     return text.empty() ? std::string() : localized(text);
+}
+
+namespace {
+
+constexpr std::int64_t placeholderDiskNumber = 1'000'000'001;
+
+bool isOfferedForOptical(const OVDiskPointer& disk)
+{
+    if (!disk)
+        return true;
+    if (disk->isDVDRAM())
+        return true;
+    return !disk->hasBlankOpticalMedia() && disk->diskNumber() != placeholderDiskNumber;
+}
+
+}  // namespace
+
+bool OVFXW::displayPanelForDiskTypeAndDisk(std::int32_t type, const OVDiskPointer& disk)
+{
+    switch (type) {
+        case 1:
+        case 2:
+        case 3:
+        case 4:
+        case 5:
+        case 6:
+        case 8:
+        case 12: return true;
+        case 15: return isOfferedForOptical(disk);
+        default: return false;
+    }
+}
+
+bool OVFXW::supportsContextMenuForDiskTypeSelectedDisk(std::int32_t type, const OVDiskPointer& disk)
+{
+    return displayPanelForDiskTypeAndDisk(type, disk);
 }
 
 }  // namespace fixwell

@@ -2,6 +2,9 @@
 #include "fixwell/history/CompletionReport.h"
 
 #include "fixwell/jobs/ActionListEntry.h"
+#include "fixwell/messagelog/MessageRecord.h"
+
+#include <array>
 
 namespace fixwell {
 namespace {
@@ -54,6 +57,26 @@ std::optional<PostedWarning> warningToPost(const Array& completedList)
     if (last.isNone())
         return std::nullopt;
     return PostedWarning{};
+}
+
+Dictionary makeSummaryRecord(const Array& history)
+{
+    const std::array types{kFsckVerify, kFsckRepair, kFsckError, kFsckSuccess, kFsckFail};
+    std::array<std::int64_t, types.size()> counts{};
+    for (auto record = history.values().rbegin(); record != history.values().rend(); ++record) {
+        const Dictionary message = record->dictionary();
+        if (verbosityOf(message) < verbosity::main)
+            break;
+        for (std::size_t i = 0; i < types.size(); ++i)
+            counts[i] += message.string(kFsckMessageType) == types[i].text() ? 1 : 0;
+    }
+
+    const Dictionary summary =
+        Dictionary::of({{kOV_finalAttributedString_type, StyledText::make("\n")},
+                        {kFsckVerbosity, verbosity::summary}});
+    for (std::size_t i = 0; i < types.size(); ++i)
+        summary.set(types[i], counts[i]);
+    return summary;
 }
 
 }  // namespace fixwell

@@ -1,7 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/history/CompletionReport.h"
-#include "fixwell/history/SummaryCounts.h"
-#include "fixwell/module/Localizable.h"
 #include "fixwell/module/OVFXW.h"
 
 #include <algorithm>

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/jobs/ActionListEntry.h"
-#include "fixwell/module/Localizable.h"
 #include "fixwell/module/OVFXW.h"
 
 #include <algorithm>

@@ -4,9 +4,38 @@
 #include "contract/foundation/Dictionary.h"
 #include "contract/support/OVDiskController.h"
 #include "fixwell/Contract.h"
-#include "fixwell/jobs/ActionCodes.h"
+
+#include <cstdint>
 
 namespace fixwell {
+
+/// What an action-list entry asks for, and what the running job does (0 when idle).
+enum FXWAction : std::int64_t {
+    FXWActionNone = 0,
+    FXWActionVerifyPermissions = 1,
+    FXWActionRepairPermissions = 2,
+    FXWActionVerifyPartitionMap = 3,
+    FXWActionRepairPartitionMap = 4,
+    FXWActionVerifyDisk = 5,
+    FXWActionRepairDisk = 6,
+};
+
+/// What a launcher notes in its entry. The order is another one than the action codes'; the
+/// finish callback and the warnings read this number, all others the action code.
+enum FXWOperationType : std::int64_t {
+    FXWOperationVerifyDisk = 1,
+    FXWOperationRepairDisk = 2,
+    FXWOperationVerifyPermissions = 3,
+    FXWOperationRepairPermissions = 4,
+    FXWOperationVerifyPartitionMap = 5,
+    FXWOperationRepairPartitionMap = 6,
+};
+
+/// A verification or repair of a volume's file system, whose output is classified.
+constexpr bool isDiskAction(std::int64_t action)
+{
+    return action == FXWActionVerifyDisk || action == FXWActionRepairDisk;
+}
 
 // The keys of an action-list entry: one disk and what is to be done with it. The entry travels
 // from the queue to the in-flight item to the completed list, and gains keys on its way.
@@ -35,9 +64,17 @@ inline const Name kFXW_FirstKestronUpdate{"kFXW_FirstKestronUpdate"};
 inline const Name kEntryPostWarning{"postWarning"};
 inline const Name kEntryPostWarningTitle{"postWarningtitle"};
 
-Dictionary makeActionListEntry(const OVDiskPointer& disk, FXWAction action);
+inline Dictionary makeActionListEntry(const OVDiskPointer& disk, FXWAction action)
+{
+    return Dictionary::of({{kEntryDiskIdentifier, disk->diskIdentifier()},
+                           {kEntryVolumeName, disk->displayName()},
+                           {kEntryAction, static_cast<std::int64_t>(action)},
+                           {kEntryDisk, disk}});
+}
 
 /// The entry's own disk, or none.
-OVDiskPointer diskOfEntry(const Dictionary& entry);
-
+inline OVDiskPointer diskOfEntry(const Dictionary& entry)
+{
+    return entry[kEntryDisk].object<OVDisk>();
+}
 }  // namespace fixwell

@@ -1,8 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/jobs/ActionListEntry.h"
-#include "fixwell/messagelog/MessageRecord.h"
-#include "fixwell/messagelog/MessageStyle.h"
-#include "fixwell/module/Localizable.h"
 #include "fixwell/module/OVFXW.h"
 
 #include <array>
@@ -127,20 +124,6 @@ OVDiskPointer OVFXW::searchForInflightDisk() const
     if (const OVDiskPointer disk = diskOfEntry(completedList.back().dictionary()))
         return disk;
     return diskOfEntry(actionList_.front().dictionary());
-}
-
-void OVFXW::createStartupObject(std::string_view text, const OVDiskPointer& disk)
-{
-    if (!disk)
-        return;
-    const StyledText line = StyledText::make(text, {Font::boldSystem(messageFontPoints), {}, {}});
-    line.append(StyledText::make("\n"));
-    const Dictionary record = Dictionary::of({{kFsckMessageString, text},
-                                              {kOV_finalAttributedString_type, line},
-                                              {kFsckVerbosity, verbosity::heading}});
-    if (!disk->fsckHistoryNoChildren())
-        disk->setFsckHistory(Array::make());
-    addObjectAndUpdateView(disk->fsckHistoryNoChildren(), record, true);
 }
 
 void OVFXW::simulateActionList()

@@ -39,4 +39,12 @@ private:
     std::uint64_t revision_ = 0;
 };
 
+/// Whether the tool marked the line red ("[31m" anywhere, without its escape byte).
+bool scanForSpecialChars(std::string_view line);
+
+/// The text between "[31m" and the first "[0m" (or, where there is none, "[30m") of the line.
+/// An escape byte before the end marker stays. A line without both markers, or with the end
+/// before the start, comes back whole.
+std::string_view removeSpecialChars(std::string_view line);
+
 }  // namespace fixwell

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/messagelog/OVFXWMessageOutlineView.h"
 
-#include "contract/foundation/RichText.h"
+#include "contract/foundation/StyledText.h"
 #include "fixwell/messagelog/MessageRecord.h"
 
 namespace fixwell {
@@ -92,6 +92,28 @@ Rect OVFXWMessageOutlineView::frameOfCellAtColumnRow(std::size_t column, std::si
         frame.width += addedWidth;
     }
     return frame;
+}
+
+OVFXWBrowserCell::OVFXWBrowserCell()
+{
+    setFont(Font::system(messageFontPoints));
+}
+
+void OVFXWBrowserCell::setAttributedStringValue(const StyledText& text)
+{
+    if (text)
+        text.addAttributes(attr());
+    BrowserCell::setAttributedStringValue(text);
+}
+
+const TextStyle& OVFXWBrowserCell::attr()
+{
+    static const TextStyle style = [] {
+        ParagraphStyle paragraph;
+        paragraph.lineBreak = LineBreak::TruncateMiddle;
+        return TextStyle{{}, {}, paragraph};
+    }();
+    return style;
 }
 
 }  // namespace fixwell

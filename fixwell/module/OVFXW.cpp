@@ -1,8 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/module/OVFXW.h"
 
-#include "fixwell/messagelog/OVFXWBrowserCell.h"
-#include "fixwell/module/Localizable.h"
+#include "contract/toolkit/ControlNames.h"
+#include "fixwell/messagelog/OVFXWMessageOutlineView.h"
+
+#include <algorithm>
+#include <array>
 
 namespace fixwell {
 namespace {
@@ -33,15 +36,15 @@ std::string OVFXW::displayNameIn(const Bundle& bundle)
 OVFXW::OVFXW(HostServices& host, ModuleSite& site)
     : OVModule(host, site), lineClassifier_(site.bundle())
 {
-    outlets_ = {{"instructionalTextField", &instructionalTextField},
-                {"repairMessageTextView", &repairMessageTextView},
-                {"verifyDiskButton", &verifyDiskButton},
-                {"repairDiskButton", &repairDiskButton},
-                {"verifyPermissionsButton", &verifyPermissionsButton},
-                {"repairPermissionsButton", &repairPermissionsButton},
-                {"showDetailsButton", &showDetailsButton},
-                {"clearHistoryButton", &clearHistoryButton},
-                {"messageOutlineView", &messageOutlineView}};
+    outlets_ = {{outlet::instructionalText, &instructionalTextField},
+                {outlet::repairMessageText, &repairMessageTextView},
+                {outlet::verifyDisk, &verifyDiskButton},
+                {outlet::repairDisk, &repairDiskButton},
+                {outlet::verifyPermissions, &verifyPermissionsButton},
+                {outlet::repairPermissions, &repairPermissionsButton},
+                {outlet::showDetails, &showDetailsButton},
+                {outlet::clearHistory, &clearHistoryButton},
+                {outlet::messageOutline, &messageOutlineView}};
 }
 
 OVFXW::~OVFXW()
@@ -153,6 +156,46 @@ PLRepairDisk& OVFXW::repairDiskTool()
     if (!repairDiskTool_)
         repairDiskTool_ = pl().makeRepairDisk();
     return *repairDiskTool_;
+}
+
+namespace {
+
+struct ActionMethod {
+    Selector selector;
+    void (OVFXW::*method)(const void* sender);
+};
+
+constexpr std::array<ActionMethod, 9> actionMethods{{
+    {selector::verifyDisk, &OVFXW::verifyDisk},
+    {selector::repairDisk, &OVFXW::repairDisk},
+    {selector::verifyPermissions, &OVFXW::verifyPermissions},
+    {selector::repairPermissions, &OVFXW::repairPermissions},
+    {selector::stop, &OVFXW::stopAction},
+    {selector::showDetails, &OVFXW::showDetailsAction},
+    {selector::clearHistory, &OVFXW::clearHistoryAction},
+    {selector::help, &OVFXW::helpButtonAction},
+    {selector::deleteSelected, &OVFXW::deleteSelected},
+}};
+
+}  // namespace
+
+bool OVFXW::perform(Selector selector, const void* sender)
+{
+    const auto found = std::find_if(
+        actionMethods.begin(), actionMethods.end(),
+        [selector](const ActionMethod& candidate) { return candidate.selector == selector; });
+    if (found == actionMethods.end())
+        return false;
+    (this->*found->method)(sender);
+    return true;
+}
+
+std::unique_ptr<OutlineView> OVFXW::makeOutlineView(std::string_view className,
+                                                    OutlineViewPeer& peer)
+{
+    if (className != messageOutlineViewClass)
+        return nullptr;
+    return std::make_unique<OVFXWMessageOutlineView>(peer, host().generalPasteboard());
 }
 
 }  // namespace fixwell

@@ -2,11 +2,11 @@
 #pragma once
 
 #include "contract/foundation/Format.h"
-#include "contract/foundation/Lock.h"
+#include "contract/foundation/RunLoop.h"
 #include "contract/support/OVModule.h"
 #include "fixwell/Contract.h"
 #include "fixwell/availability/ButtonDecision.h"
-#include "fixwell/jobs/ActionCodes.h"
+#include "fixwell/jobs/ActionListEntry.h"
 #include "fixwell/messagelog/LineClassifier.h"
 #include "fixwell/messagelog/MessageRows.h"
 

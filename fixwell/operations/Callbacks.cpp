@@ -1,24 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/jobs/ActionListEntry.h"
-#include "fixwell/messagelog/ColorMarkers.h"
+#include "fixwell/messagelog/LineClassifier.h"
 #include "fixwell/messagelog/MessageRecord.h"
-#include "fixwell/module/Localizable.h"
 #include "fixwell/module/OVFXW.h"
-#include "fixwell/operations/InUseErrors.h"
-#include "fixwell/operations/OverallProgress.h"
+#include "fixwell/operations/LaunchTable.h"
 
 namespace fixwell {
 namespace {
 
-// What the newer permissions tool reports first, while it reads its database.
-constexpr float readingDatabasePercent = 20.0F;
-constexpr std::chrono::seconds readingDatabaseTime{60};
 constexpr std::chrono::duration<double> remountDelay{2.0};
-
-std::string identifierOf(const OVDiskPointer& disk)
-{
-    return disk ? disk->diskIdentifier() : std::string("(none)");
-}
 
 }  // namespace
 
@@ -73,66 +63,6 @@ void OVFXW::addTextLine(const OVDiskPointer& disk, std::string_view line)
     record.set(kOV_finalAttributedString_type, text);
     const Array history = disk->fsckHistoryNoChildren();
     addObjectAndUpdateView(history, record, forcesReloadOfDiskCheck(history));
-}
-
-void OVFXW::plAsyncProgressForDisk(const DiskReferencePointer& reference, bool barberPole,
-                                   float percent)
-{
-    ov_log(
-        OVLog::trace, "plAsyncProgressForDisk (%@): barberPole=%s, percent=%.1f\n",
-        [&] { return identifierOf(diskController().diskWithKRDisk(reference)); },
-        [&] { return host().hostBundle().localizedString(barberPole ? "Yes" : "No"); },
-        static_cast<double>(percent));
-    if (!(percent > 0) || !(percent < 100))
-        return;
-    if (_jobStarted)
-        percent = rescaledForKestron(percent);
-    else if (!noteFirstProgress(percent))
-        return;
-    if (action != FXWActionNone)
-        showOverallProgress(percent);
-}
-
-/// NO when the report only says that a database is being read, and the bar is to stay as it is.
-bool OVFXW::noteFirstProgress(float percent)
-{
-    _jobStarted = true;
-    if (percent != readingDatabasePercent) {
-        if (inflightItem)
-            inflightItem.set(kFXW_OSVersionKey, kFXW_DISK_IS_MORLA);
-        windowController().setGlobalProgressBarIndeterminate(false);
-        return true;
-    }
-    const std::string reading = localized(localizable("\tReading permissions database."));
-    appendTitleToMessageText(format("%@\n", {reading}));
-    appendTitleToMessageText(
-        format("%@\n", {localized(localizable(
-                           "\tReading the permissions database can take several minutes.\n"))}));
-    windowController().setGlobalProgressText(reading);
-    if (inflightItem)
-        inflightItem.set(kFXW_OSVersionKey, kFXW_DISK_IS_KESTRON);
-    return false;
-}
-
-float OVFXW::rescaledForKestron(float percent)
-{
-    if (inflightItem.string(kFXW_OSVersionKey) != kFXW_DISK_IS_KESTRON.text())
-        return percent;
-    if (!inflightItem.has(kFXW_FirstKestronUpdate)) {
-        inflightItem.set(kFXW_FirstKestronUpdate, kFXW_FirstKestronUpdate);
-        if (totalActionsInJob == 1 && _timeEstimator)
-            _timeEstimator->setStartTimeWithPercentComplete(
-                host().threads().now() - readingDatabaseTime, kestronPercent(percent));
-        windowController().setGlobalProgressBarIndeterminate(false);
-    }
-    return static_cast<float>(kestronPercent(percent));
-}
-
-void OVFXW::showOverallProgress(float percent)
-{
-    const double overall = overallPercent(currentJob, totalActionsInJob, percent);
-    windowController().setGlobalProgressBarValue(overall);
-    setActionMessageWithPercentComplete(overall);
 }
 
 void OVFXW::plAsyncFinishedForDisk(const DiskReferencePointer& reference, ErrorCode mainError,

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "fixwell/jobs/ActionListEntry.h"
-#include "fixwell/module/Localizable.h"
 #include "fixwell/module/OVFXW.h"
-#include "fixwell/operations/InUseErrors.h"
 #include "fixwell/operations/LaunchTable.h"
 
 namespace fixwell {

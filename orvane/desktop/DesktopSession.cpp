@@ -161,10 +161,10 @@ void DesktopSession::loadModules()
     std::string switchedOff;
     for (const std::filesystem::path& bundle : findModuleBundles(options_.moduleDirectories)) {
         auto tab = ModuleTab::load(bundle, {host_, controller_, jobs_, libraryOptions()});
-        if (failed(tab))
-            warn(failureMessage(tab));
-        else if (std::get<std::unique_ptr<ModuleTab>>(tab))
-            addTab(std::get<std::unique_ptr<ModuleTab>>(std::move(tab)));
+        if (!tab)
+            warn(tab.error().message);
+        else if (*tab)
+            addTab(*std::move(tab));
         else
             switchedOff += (switchedOff.empty() ? "" : ", ") + bundle.stem().string();
     }

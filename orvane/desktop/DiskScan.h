@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
 #include "orvane/support/udisks/DiskReader.h"
 
 #include <functional>
@@ -18,7 +18,7 @@ public:
     using Finished = std::function<void(const std::vector<DiskTree>& disks)>;
 
     /// `finished` is called from the loop, which outlives this object.
-    DiskScan(HostLoop& loop, Finished finished) : loop_(loop), finished_(std::move(finished)) {}
+    DiskScan(EventLoop& loop, Finished finished) : loop_(loop), finished_(std::move(finished)) {}
     DiskScan(const DiskScan&) = delete;
     DiskScan& operator=(const DiskScan&) = delete;
     /// Waits for a scan that is under way; nothing is heard of it any more.
@@ -33,7 +33,7 @@ private:
 
     void finish(const std::vector<DiskTree>& disks);
 
-    HostLoop& loop_;
+    EventLoop& loop_;
     Finished finished_;
     bool isScanning_ = false;
     bool mustScanAgain_ = false;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/ImageOpener.h"
 
-#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/DiskLookup.h"
 
 #include <utility>
 
@@ -26,11 +26,11 @@ void ImageOpener::open(const std::vector<std::string>& names)
     std::vector<std::string> failures;
     for (const std::string& name : names) {
         const auto found = DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
-        if (failed(found)) {
-            failures.push_back(failureMessage(found));
+        if (!found) {
+            failures.push_back(found.error().message);
             continue;
         }
-        const auto& disk = std::get<DiskPointer>(found);
+        const auto& disk = *found;
         if (!first)
             first = disk;
         if (disk->isOfflineDiskImage())
@@ -72,11 +72,11 @@ void ImageOpener::finish(const std::filesystem::path& image, const ImageReading&
     if (mustReadAgain)
         read(image);
     Known known;
-    if (failed(*result)) {
+    if (!*result) {
         known = known_[image];
-        known.problem = host_.translator().text(failureMessage(*result));
+        known.problem = host_.translator().text(result->error().message);
     } else {
-        const auto& read = std::get<ReadImage>(*result);
+        const auto& read = **result;
         known = {"", read.loopDevice, read.disks.facts.hasDamagedMap};
         host_.sharedDiskController().adopt(read.disks);
     }

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/support/SupportHost.h"
-#include "orvane/support/images/ImageReading.h"
+#include "orvane/support/images/ImageAttacher.h"
 
 #include <functional>
 #include <map>
@@ -56,7 +56,7 @@ private:
     /// What reaches this object from a reader's thread, as long as it is there.
     struct Lifeline {
         std::mutex lock;
-        HostLoop* loop = nullptr;       ///< guarded; none when the opener has gone
+        EventLoop* loop = nullptr;       ///< guarded; none when the opener has gone
         ImageOpener* opener = nullptr;  ///< main thread
     };
     struct Known {

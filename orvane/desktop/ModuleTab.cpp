@@ -6,17 +6,17 @@
 
 namespace orvane::desktop {
 
-Outcome<std::unique_ptr<ModuleTab>> ModuleTab::load(const std::filesystem::path& bundle,
-                                                    const Surroundings& surroundings)
+Result<std::unique_ptr<ModuleTab>, Failure> ModuleTab::load(const std::filesystem::path& bundle,
+                                                            const Surroundings& surroundings)
 {
     auto loaded = loadModule(bundle);
-    if (failed(loaded))
-        return Failure{failureMessage(loaded)};
-    auto tab = std::make_unique<ModuleTab>(surroundings, std::get<LoadedModule>(std::move(loaded)));
+    if (!loaded)
+        return loaded.error();
+    auto tab = std::make_unique<ModuleTab>(surroundings, *std::move(loaded));
     if (!shouldRun(tab->loaded_, surroundings.host))
         return std::unique_ptr<ModuleTab>();
-    if (const auto made = tab->makeModule(); failed(made))
-        return Failure{failureMessage(made)};
+    if (const auto made = tab->makeModule(); !made)
+        return made.error();
     return tab;
 }
 
@@ -37,18 +37,18 @@ ModuleTab::~ModuleTab()
         host_.printing().forget(*interface_->outlineView());
 }
 
-Outcome<> ModuleTab::makeModule()
+Result<void, Failure> ModuleTab::makeModule()
 {
     const LoadedInterface* const before = host_.interfaceLoader().latest();
     host_.interfaceLoader().setBundle(*loaded_.bundle);
     auto made = orvane::makeModule(loaded_, host_, *this);
-    if (failed(made))
-        return Failure{failureMessage(made)};
-    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
+    if (!made)
+        return made.error();
+    module_ = *std::move(made);
     if (LoadedInterface* const latest = host_.interfaceLoader().latest(); latest != before)
         interface_ = latest;
     observedLibrary_.setDelegate(module_->asyncDelegate());
-    return Done{};
+    return {};
 }
 
 contract::OVDiskPointer ModuleTab::workingDisk() const

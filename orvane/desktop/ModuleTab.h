@@ -25,7 +25,7 @@ public:
     };
 
     /// Loads the bundle's module, unless it is switched off in the settings: then there is no tab.
-    [[nodiscard]] static Outcome<std::unique_ptr<ModuleTab>> load(
+    [[nodiscard]] static Result<std::unique_ptr<ModuleTab>, Failure> load(
         const std::filesystem::path& bundle, const Surroundings& surroundings);
     ModuleTab(const Surroundings& surroundings, LoadedModule loaded);
     ModuleTab(const ModuleTab&) = delete;
@@ -51,7 +51,7 @@ public:
     void stopHarder() { observedLibrary_.cancelAgain(); }
 
 private:
-    Outcome<> makeModule();
+    Result<void, Failure> makeModule();
 
     bool isActiveTab() const override { return isActive_; }
     contract::OVWindowController& windowController() override { return window_; }

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/QtLoop.h"
 
-#include "orvane/support/loop/Outbox.h"
-#include "orvane/support/loop/Rendezvous.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <QThread>
 

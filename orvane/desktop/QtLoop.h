@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <QObject>
 #include <QTimer>
@@ -17,7 +17,7 @@ namespace orvane::desktop {
 ///
 /// Event loops may be nested, as a dialog's is: it goes on with the tasks that are queued behind
 /// the one that opened it.
-class QtLoop final : public HostLoop {
+class QtLoop final : public EventLoop {
 public:
     QtLoop();
     QtLoop(const QtLoop&) = delete;

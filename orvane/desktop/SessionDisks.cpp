@@ -15,8 +15,8 @@ void DesktopSession::watchSystemDisks()
 {
     if (!options_.scansSystemDisks)
         return;
-    if (const auto watching = watch_.start(); failed(watching))
-        host_.log().ov_log(contract::OVLog::error, 0, failureMessage(watching));
+    if (const auto watching = watch_.start(); !watching)
+        host_.log().ov_log(contract::OVLog::error, 0, watching.error().message);
     scan_.start();
 }
 

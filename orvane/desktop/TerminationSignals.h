@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/EndingSignals.h"
+#include "orvane/support/loop/SignalReader.h"
 
 #include <QSocketNotifier>
 
@@ -18,7 +18,7 @@ public:
     void watch(std::function<void()> received);
 
 private:
-    EndingSignals signals_;
+    SignalReader signals_;
     std::unique_ptr<QSocketNotifier> notifier_;
 };
 

@@ -38,7 +38,7 @@ bool hasOnlyUsersRights(pid_t id, uid_t user)
     if (::stat((directoryOf(id) + "/fd").c_str(), &descriptors) != 0 || descriptors.st_uid != user)
         return false;
     const auto status = readWholeFile(directoryOf(id) + "/status", 65536);
-    return status.index() == 0 && areAllUsers(std::get<0>(status), user);
+    return status && areAllUsers(*status, user);
 }
 
 }  // namespace

@@ -1,13 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <sys/types.h>
 
 #include <optional>
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 
 /// The program for which this one works with more rights: its parent, since pkexec(1) gives its
 /// own place to what it starts. Files are taken from it as it has opened them, never by a path:

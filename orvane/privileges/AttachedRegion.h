@@ -3,12 +3,14 @@
 
 #include "orvane/privileges/HelperRequest.h"
 #include "orvane/privileges/UndoneJob.h"
-#include "orvane/support/files/FileDescriptor.h"
 #include "pellar/disks/LoopDevice.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <variant>
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 
 /// The region of an image that a request names, made a device for as long as this lives.
 class AttachedRegion {

@@ -38,10 +38,9 @@ std::uint64_t sequenceOf(dev_t device)
     std::error_code error;
     const auto entry = std::filesystem::canonical("/sys/dev/block/" + numberOf(device), error);
     for (const auto& directory : {entry, entry.parent_path()}) {
-        const auto contents = readWholeFile(directory / "diskseq", 64);
-        const auto* const text = std::get_if<std::string>(&contents);
+        const auto text = readWholeFile(directory / "diskseq", 64);
         std::uint64_t number = 0;
-        if (!error && text != nullptr &&
+        if (!error && text &&
             std::from_chars(text->data(), text->data() + text->size(), number).ec == std::errc())
             return number;
     }
@@ -50,9 +49,7 @@ std::uint64_t sequenceOf(dev_t device)
 
 std::string uuidFromUdev(dev_t device)
 {
-    const auto contents = readWholeFile("/run/udev/data/b" + numberOf(device), 1U << 20U);
-    const auto* const text = std::get_if<std::string>(&contents);
-    const std::string uuid = text != nullptr ? parseUdevProperties(*text)["ID_FS_UUID"] : "";
+    const std::string uuid = udevProperties(numberOf(device))["ID_FS_UUID"];
     return isUUID(uuid) ? uuid : std::string();
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <sys/types.h>
 
@@ -12,6 +12,8 @@
 #include <string_view>
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 
 /// Which disk is meant, beside its name: between the question for a password and the answer, the
 /// name may have passed to another one.

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <sys/types.h>
 
@@ -11,6 +11,8 @@
 #include <vector>
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 
 /// A program that runs with more rights than ours, so it cannot be signalled: it is told to end
 /// through its standard input, and ends in order when that closes. It stays in our process group,

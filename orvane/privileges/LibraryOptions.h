@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/privileges/PrivilegedScript.h"
-#include "orvane/support/Failure.h"
+#include "orvane/support/files/Failure.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/jobs/JobOptions.h"
 #include "pellar/texts/Texts.h"

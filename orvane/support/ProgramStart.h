@@ -3,7 +3,7 @@
 
 namespace orvane {
 
-/// Sets right what whoever started the program may have left it: standard streams that are closed,
+/// Sets right what the program's parent may have left it: standard streams that are closed,
 /// a SIGCHLD that is ignored, and limits on the size of files and stacks. Once, before anything
 /// else: no file is open and no thread runs. A stack that no work can be done on ends the program.
 void setInheritanceRight();

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/SupportHost.h"
 
-#include "orvane/support/texts/DecimalNumbers.h"
+#include "orvane/support/files/WholeFile.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/time/TimeEstimator.h"
+#include "orvane/support/texts/TimeEstimator.h"
 
 #include <utility>
 
@@ -11,11 +11,6 @@ namespace orvane {
 namespace {
 
 constexpr const char* hostTable = "Orvane";
-
-std::filesystem::path in(const std::filesystem::path& directory, const char* name)
-{
-    return directory.empty() ? directory : directory / name;
-}
 
 Translator translatorOf(const ModuleBundle& bundle)
 {
@@ -31,7 +26,7 @@ Translator translatorOf(const ModuleBundle& bundle)
 
 }  // namespace
 
-SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
+SupportHost::SupportHost(SupportOptions options, EventLoop& loop)
     : options_(std::move(options)),
       loop_(loop),
       bundle_(options_.hostBundle, hostTable),
@@ -42,10 +37,10 @@ SupportHost::SupportHost(SupportOptions options, HostLoop& loop)
                if (options_.warn)
                    options_.warn(sentence);
            }),
-      settings_(in(options_.paths.config, "settings.json"),
+      settings_(fileIn(options_.paths.config, "settings.json"),
                 [this](const std::string& sentence) { warn(sentence); }),
       preferences_(settings_),
-      store_(options_.keepsHistory ? in(options_.paths.state, "history.sqlite3") : "",
+      store_(options_.keepsHistory ? fileIn(options_.paths.state, "history.sqlite3") : "",
              options_.historyLimits, [this](const std::string& sentence) { warn(sentence); }),
       histories_(store_),
       disks_(center_, {options_.capabilities, &histories_}),
@@ -78,9 +73,9 @@ void SupportHost::connectDisks()
     };
 }
 
-// Nobody waits for it on the main thread, not even where a module wishes to: somewhere a user may
+// The main thread does not wait for it, not even where a module wishes to: somewhere a user may
 // be looking for the password. What fails is told later.
-Outcome<> SupportHost::start(DiskAction action, const Disk& disk)
+Result<void, Failure> SupportHost::start(DiskAction action, const Disk& disk)
 {
     if (isPossible(action, disk))
         operations_.start({requestFor(action, disk)},
@@ -88,7 +83,7 @@ Outcome<> SupportHost::start(DiskAction action, const Disk& disk)
                               for (const std::string& failure : failures)
                                   warn(failure);
                           });
-    return Done{};
+    return {};
 }
 
 void SupportHost::loadHistoriesLater()

@@ -3,17 +3,16 @@
 
 #include "contract/support/HostServices.h"
 #include "orvane/support/disks/DiskController.h"
+#include "orvane/support/files/ActivityLog.h"
 #include "orvane/support/history/DiskHistories.h"
 #include "orvane/support/history/HistoryStore.h"
 #include "orvane/support/images/ImageAttacher.h"
-#include "orvane/support/log/ActivityLog.h"
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
 #include "orvane/support/loop/Notifications.h"
 #include "orvane/support/loop/WorkerThreads.h"
-#include "orvane/support/settings/Preferences.h"
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/XDGPaths.h"
-#include "orvane/support/texts/ModuleBundle.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Translator.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
@@ -52,7 +51,7 @@ struct SupportOptions {
 /// Main thread; the loop must outlive it.
 class SupportHost : public contract::HostServices {
 public:
-    SupportHost(SupportOptions options, HostLoop& loop);
+    SupportHost(SupportOptions options, EventLoop& loop);
     SupportHost(const SupportHost&) = delete;
     SupportHost& operator=(const SupportHost&) = delete;
     /// Waits for worker threads and saves what is unsaved.
@@ -62,7 +61,7 @@ public:
     DiskController& sharedDiskController() override { return disks_; }
     ActivityLog& log() override { return log_; }
     Notifications& defaultCenter() override { return center_; }
-    HostLoop& mainRunLoop() override { return loop_; }
+    EventLoop& mainRunLoop() override { return loop_; }
     WorkerThreads& threads() override { return threads_; }
     SettingsFile& standardUserDefaults() override { return settings_; }
     ModuleBundle& hostBundle() override { return bundle_; }
@@ -85,12 +84,12 @@ public:
 private:
     void warn(const std::string& sentence);
     void connectDisks();
-    Outcome<> start(DiskAction action, const Disk& disk);
+    Result<void, Failure> start(DiskAction action, const Disk& disk);
     void loadHistoriesLater();
     void loadHistories();
 
     SupportOptions options_;
-    HostLoop& loop_;
+    EventLoop& loop_;
     ModuleBundle bundle_;
     Translator translator_;
     ActivityLog log_;

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/EndingSignals.h"
 #include "orvane/support/loop/MainLoop.h"
+#include "orvane/support/loop/SignalReader.h"
 
 #include <functional>
 
@@ -19,7 +19,7 @@ public:
     ~Interrupts();
 
 private:
-    EndingSignals signals_;
+    SignalReader signals_;
     MainLoop& loop_;
     std::function<void()> interrupted_;
 };

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/PasswordAgent.h"
 
-#include "orvane/support/files/FileDescriptor.h"
 #include "pellar/process/ChildProcess.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>
@@ -21,6 +21,8 @@
 extern char** environ;
 
 namespace orvane {
+
+using pellar::FileDescriptor;
 namespace {
 
 constexpr const char* program = "/usr/bin/pkttyagent";

@@ -3,7 +3,7 @@
 
 #include "orvane/jobs/HostReasons.h"
 #include "orvane/privileges/LibraryOptions.h"
-#include "orvane/support/disks/DiskLookup.h"
+#include "orvane/support/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "pellar/texts/ErrorTexts.h"
@@ -143,7 +143,7 @@ JobReporter::Hooks Session::jobHooks()
     return hooks;
 }
 
-Outcome<> Session::loadModule()
+Result<void, Failure> Session::loadModule()
 {
     const auto bundles = findModuleBundles(
         moduleDirectories(environmentValue, runningExecutable(),
@@ -151,21 +151,21 @@ Outcome<> Session::loadModule()
     if (bundles.empty())
         return cannot("find", "Fixwell.ovmodule", "no module directory holds it");
     auto loaded = orvane::loadModule(bundles.front());
-    if (failed(loaded))
-        return Failure{failureMessage(loaded)};
-    loaded_ = std::get<LoadedModule>(std::move(loaded));
+    if (!loaded)
+        return loaded.error();
+    loaded_ = *std::move(loaded);
     libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
     if (!shouldRun(loaded_, host_))
         return cannot("use", "Fixwell", "it is switched off in the settings (OVModule_FXW)");
     auto made = makeModule(loaded_, host_, *this);
-    if (failed(made))
-        return Failure{failureMessage(made)};
-    module_ = std::get<std::unique_ptr<contract::OVModule>>(std::move(made));
+    if (!made)
+        return made.error();
+    module_ = *std::move(made);
     observedLibrary_.setDelegate(module_->asyncDelegate());
-    return Done{};
+    return {};
 }
 
-Outcome<Session::DiskPointer> Session::findDisk(const std::string& name)
+Result<Session::DiskPointer, Failure> Session::findDisk(const std::string& name)
 {
     // Only what is no file needs the system's disks: a mount point, a label, a UUID.
     std::error_code error;
@@ -174,8 +174,8 @@ Outcome<Session::DiskPointer> Session::findDisk(const std::string& name)
         knowsSystemDisks_ = true;
     }
     auto found = DiskLookup(host_.sharedDiskController(), host_.translator()).find(name);
-    if (!failed(found))
-        names_.add(std::get<DiskPointer>(found)->facts().identifier, name);
+    if (found)
+        names_.add((*found)->facts().identifier, name);
     return found;
 }
 

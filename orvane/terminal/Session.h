@@ -33,10 +33,10 @@ public:
     ~Session() override;
 
     /// Loads the module; a sentence when that fails.
-    [[nodiscard]] Outcome<> loadModule();
+    [[nodiscard]] Result<void, Failure> loadModule();
 
     /// The disk that the user means; its later rows and events go by that name.
-    [[nodiscard]] Outcome<DiskPointer> findDisk(const std::string& name);
+    [[nodiscard]] Result<DiskPointer, Failure> findDisk(const std::string& name);
     /// Makes the volumes of an image file known, as a job would; none for any other disk. To be
     /// given back with `detach`.
     DiskPointer attach(const DiskPointer& image);

@@ -68,8 +68,8 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
 {
     if (const auto status = carryOutAlone(request, session, reporter))
         return *status;
-    if (const auto loaded = session.loadModule(); failed(loaded)) {
-        reporter.warning(failureMessage(loaded));
+    if (const auto loaded = session.loadModule(); !loaded) {
+        reporter.warning(loaded.error().message);
         return exitUnchecked;
     }
     switch (request.command) {

@@ -14,7 +14,7 @@ DiskTree disk(const std::string& identifier, std::vector<DiskTree> children = {}
 {
     DiskTree tree;
     tree.facts.identifier = identifier;
-    tree.facts.displayName = identifier;
+    tree.facts.name = identifier;
     tree.children = std::move(children);
     return tree;
 }
@@ -140,7 +140,7 @@ TEST_F(DiskListTest, ALabelIsNeverMoreThanText)
 {
     list_.show(model_, [] {});
     DiskTree hostile = disk("h");
-    hostile.facts.displayName = "<img src=x>\n\x1b[31m\xff";
+    hostile.facts.name = "<img src=x>\n\x1b[31m\xff";
     hostile.facts.mountPoint = "/mnt/<b>\n";
     synchronize({hostile});
     const QModelIndex row = model_.index(0, 0);

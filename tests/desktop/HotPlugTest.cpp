@@ -118,7 +118,7 @@ TEST_F(HotPlugTest, ADiskThatGoesDuringItsJobIsListedUntilTheEnd)
     const orvane::test::LoopDevice device(makeImage("stick"));
     DiskTree disk;
     disk.facts.identifier = device.name();
-    disk.facts.displayName = "stick";
+    disk.facts.name = "stick";
     disk.facts.type = diskType::bareVolume;
     disk.facts.storage = contract::DiskReference::Storage::BlockDevice;
     disk.facts.path = disk.facts.identifier;

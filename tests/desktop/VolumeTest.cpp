@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/UDisks.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/LoopDevice.h"
@@ -48,7 +48,7 @@ protected:
     /// What UDisks2 says to a device that is not mounted: known, or not yet.
     Refusal::Kind asked() const
     {
-        return std::get<Refusal>(UDisks().unmount(device_->name())).kind;
+        return UDisks().unmount(device_->name()).error().kind;
     }
     std::string mountPoint() { return cell(device_->name(), DiskColumn::MountPoint); }
     /// The commands for volumes that the open menu offers, by their first letters.

@@ -2,9 +2,8 @@
 #include "contract/foundation/Array.h"
 #include "contract/foundation/Dictionary.h"
 #include "contract/foundation/Format.h"
-#include "contract/foundation/Lock.h"
 #include "contract/foundation/PhraseMatcher.h"
-#include "contract/foundation/RichText.h"
+#include "contract/foundation/RunLoop.h"
 #include "contract/foundation/StyledText.h"
 #include "contract/foundation/UTF8.h"
 

@@ -247,18 +247,6 @@ TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
     }
 }
 
-TEST_F(OVFXWTest, AFailedPartitionMapJobIsQuiet)
-{
-    const auto whole = addDisk("disk");
-    whole->type = OVDisk::typeWhole;
-    whole->whole = true;
-    host.refusals["disk"] = kPLErrorCouldNotUnmount;
-    select(whole);
-    module->verifyDisk(nullptr);
-    EXPECT_EQ(linesOf(whole), (std::vector<std::string>{"Verifying partition map for “disk”\n"}));
-    EXPECT_EQ(host.status, "Verify failed.");
-}
-
 TEST_F(OVFXWTest, ADiskThatAFailedStartUnmountedIsMountedAgain)
 {
     const auto disk = addDisk("a");
@@ -294,16 +282,6 @@ TEST_F(OVFXWTest, AMountPointWithoutALengthIsDoubtful)
     host.journal.clear();
     host.timers.front()();
     EXPECT_FALSE(host.has("mount a synchronously")) << "the remount counts it as mounted";
-}
-
-TEST_F(OVFXWTest, DryRunOnlyAnnounces)
-{
-    const auto disk = addDisk("a");
-    select(disk);
-    module->setActionList(Array::of({makeActionListEntry(disk, FXWActionVerifyPermissions)}));
-    simulate();
-    EXPECT_EQ(linesOf(disk), (std::vector<std::string>{"Fake Verify permissions for \"a\"\n"}));
-    EXPECT_FALSE(host.has("verify permissions a"));
 }
 
 // Disk images

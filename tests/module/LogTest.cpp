@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/messagelog/OVFXWBrowserCell.h"
 #include "fixwell/messagelog/OVFXWMessageOutlineView.h"
 #include "tests/module/ModuleTest.h"
 
@@ -279,21 +278,6 @@ TEST_F(OVFXWTest, CellsShowOneLineCutInTheMiddle)
     auto& view = static_cast<OVFXWMessageOutlineView&>(*host.outlineView);
     view.reloadRow(99);
     EXPECT_TRUE(host.outlinePeer.redrawn.empty()) << "no such row, nothing to redraw";
-}
-
-TEST_F(OVFXWTest, PrintingFitsThePageAndKeepsTheSettings)
-{
-    module->printModuleSpecific(nullptr);
-    EXPECT_TRUE(host.has("print pagination 1 with panel"));
-    EXPECT_EQ(host.printInfo.horizontalPagination, Pagination::Fit);
-    EXPECT_FALSE(host.printInfo.isVerticallyCentered);
-}
-
-TEST_F(OVFXWTest, TheInstructionTextIsClearedForEachJob)
-{
-    EXPECT_EQ(host.repairMessageTextView.text, "old");
-    module->verifyDisk(nullptr);
-    EXPECT_EQ(host.repairMessageTextView.text, "");
 }
 
 // Histories of a selection

@@ -88,9 +88,7 @@ protected:
     {
         return module->reasonString(code, multiple);
     }
-    ErrorCode launchVerify(const OVDiskPointer& disk) { return module->doVerifyDisk(disk); }
     void fileAsCompleted(const Dictionary& entry) { module->addDiskToCompletedList(entry); }
-    void simulate() { module->simulateActionList(); }
     OVDiskPointer inflightDisk() const { return module->searchForInflightDisk(); }
 
     fixwell::testing::FakeHost host;

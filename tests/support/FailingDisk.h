@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <atomic>
 #include <cstdint>
@@ -48,8 +48,8 @@ private:
     bool isBad(std::uint64_t start, std::uint64_t bytes) const;
 
     std::filesystem::path directory_;
-    FileDescriptor backing_;
-    FileDescriptor fuse_;
+    pellar::FileDescriptor backing_;
+    pellar::FileDescriptor fuse_;
     std::uint64_t size_ = 0;
     std::vector<Bad> bad_;
     Since since_;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "TemporaryDirectory.h"
-#include "orvane/support/log/ActivityLog.h"
+#include "orvane/support/files/ActivityLog.h"
 
 #include <gtest/gtest.h>
 
@@ -58,7 +58,6 @@ TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
 {
     const TemporaryDirectory directory;
     ActivityLog log({directory.path, contract::OVLog::error}, {});
-    EXPECT_FALSE(log.keepsLevel(contract::OVLog::trace));
     log.ov_log(contract::OVLog::trace, 0, "unheard");
     log.ov_log(contract::OVLog::error, 0, "bad \x1b[31mthing %s\n");
     const std::string text = contentsOf(directory / "fixwell.log");

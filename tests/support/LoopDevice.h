@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <linux/loop.h>
@@ -28,7 +28,7 @@ public:
     {
         // Another test may take the free one first.
         constexpr int mostTries = 20;
-        const FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
+        const pellar::FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
         for (int i = 0; control && number_ < 0 && i < mostTries; ++i) {
             number_ = ::ioctl(control.get(), LOOP_CTL_GET_FREE);
             if (!attach(image))
@@ -48,8 +48,8 @@ public:
     /// NO while somebody else still has the device open from before.
     [[nodiscard]] bool attach(const std::string& image)
     {
-        const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
-        const FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
+        const pellar::FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
+        const pellar::FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
         isOurs_ = device && file && ::ioctl(device.get(), LOOP_SET_FD, file.get()) == 0;
         return isOurs_;
     }
@@ -66,7 +66,7 @@ public:
     {
         if (!std::exchange(isOurs_, false))
             return;
-        const FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
+        const pellar::FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
         if (device)
             ::ioctl(device.get(), LOOP_CLR_FD);
     }

@@ -71,8 +71,8 @@ TEST(MainLoop, NeitherTasksNorTimersStarveADescriptor)
     MainLoop loop;
     int ends[2];
     ASSERT_EQ(::pipe(ends), 0);
-    const FileDescriptor reading(ends[0]);
-    const FileDescriptor writing(ends[1]);
+    const pellar::FileDescriptor reading(ends[0]);
+    const pellar::FileDescriptor writing(ends[1]);
     std::function<void()> forever = [&] {
         loop.post(forever);
     };

@@ -7,6 +7,8 @@
 
 #include <unistd.h>
 
+#include <functional>
+
 namespace orvane {
 namespace {
 
@@ -30,20 +32,24 @@ TEST(ModuleLoader, LoadsAModuleOfTheSameContract)
     const auto bundles = findModuleBundles({directory / "missing", directory.path});
     ASSERT_EQ(bundles.size(), 1U);
     const auto loaded = loadModule(bundles.front());
-    ASSERT_FALSE(failed(loaded)) << failureMessage(loaded);
-    EXPECT_EQ(std::get<LoadedModule>(loaded).name, "Test");
-    EXPECT_NE(std::get<LoadedModule>(loaded).entry->make, nullptr);
+    ASSERT_TRUE(loaded) << loaded.error().message;
+    EXPECT_EQ(loaded->name, "Test");
+    EXPECT_NE(loaded->entry->make, nullptr);
 }
 
 TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
 {
-    using Change = void (*)(const fs::path& bundle);
     struct Case {
         const char* library;
-        Change change;
+        std::function<void(const fs::path& bundle)> change;
         const char* sentence;
     };
     const auto nothing = [](const fs::path&) {
+    };
+    const auto opened = [](const char* name) {
+        return [name](const fs::path& bundle) {
+            fs::permissions(bundle / name, fs::perms::others_write, fs::perm_options::add);
+        };
     };
     for (const Case& c :
          {Case{TEST_MODULE_WRONG, nothing,
@@ -51,22 +57,9 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
           Case{TEST_MODULE_NO_ENTRY, nothing, "OVModuleEntry"},
           Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::resize_file(b / "test.so", 100); },
                "cannot read file data"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b / "test.so", fs::perms::others_write, fs::perm_options::add);
-               },
-               "other users may change it"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b, fs::perms::others_write, fs::perm_options::add);
-               },
-               "other users may change it"},
-          Case{TEST_MODULE_RIGHT,
-               [](const fs::path& b) {
-                   fs::permissions(b / "module.json", fs::perms::others_write,
-                                   fs::perm_options::add);
-               },
-               "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("test.so"), "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("."), "other users may change it"},
+          Case{TEST_MODULE_RIGHT, opened("module.json"), "other users may change it"},
           Case{TEST_MODULE_RIGHT,
                [](const fs::path& b) {
                    fs::rename(b / "test.so", b / "real.so");
@@ -87,10 +80,10 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
         const fs::path bundle = makeBundle(directory, c.library);
         c.change(bundle);
         const auto loaded = loadModule(bundle);
-        ASSERT_TRUE(failed(loaded)) << c.sentence;
-        EXPECT_NE(failureMessage(loaded).find(c.sentence), std::string::npos)
-            << failureMessage(loaded);
-        EXPECT_NE(failureMessage(loaded).find("Test.ovmodule"), std::string::npos)
+        ASSERT_FALSE(loaded) << c.sentence;
+        EXPECT_NE(loaded.error().message.find(c.sentence), std::string::npos)
+            << loaded.error().message;
+        EXPECT_NE(loaded.error().message.find("Test.ovmodule"), std::string::npos)
             << "names the object";
     }
 }
@@ -108,10 +101,10 @@ TEST(ModuleLoader, ForRootTheWayIsLookedAtAsWell)
     fs::rename(bundle, others / "Test.ovmodule");
     ASSERT_EQ(::chown(others.c_str(), somebody, 0), 0);
     const auto loaded = loadModule(others / "Test.ovmodule");
-    ASSERT_TRUE(failed(loaded));
-    EXPECT_NE(failureMessage(loaded).find("on the way there: it belongs to another user"),
+    ASSERT_FALSE(loaded);
+    EXPECT_NE(loaded.error().message.find("on the way there: it belongs to another user"),
               std::string::npos)
-        << failureMessage(loaded);
+        << loaded.error().message;
     std::string told;
     const auto directories =
         moduleDirectories([&](const char*) { return std::optional<std::string>(others.native()); },

@@ -41,7 +41,8 @@ TEST(XDGPaths, VariablesHomesAndNothingAtAll)
                 const auto found = c.environment.find(name);
                 return found == c.environment.end() ? std::nullopt : std::optional(found->second);
             },
-            c.accountHome, [](const std::filesystem::path& directory) {
+            c.accountHome,
+            [](const std::filesystem::path& directory) {
                 return directory.native().starts_with("/foreign");
             });
         EXPECT_EQ(paths.config, c.config) << c.because;
@@ -94,8 +95,8 @@ TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
 {
     const std::string deep(100'000, '[');
     for (const std::string& broken :
-         {std::string("{\"a\": tru"), std::string("[1, 2]"), std::string(),
-          std::string("\xFF\xFE"), std::string("{\"a\":{\"dictionary\":[3]}}"),
+         {std::string("{\"a\": tru"), std::string("[1, 2]"), std::string(), std::string("\xFF\xFE"),
+          std::string("{\"a\":{\"dictionary\":[3]}}"),
           "{\"a\":" + deep + std::string(deep.size(), ']') + "}"}) {
         const TemporaryDirectory directory;
         Settings settings{directory / "settings.json", {}};

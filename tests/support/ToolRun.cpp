@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "ToolRun.h"
 
-#include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <spawn.h>
@@ -13,9 +13,8 @@ namespace orvane::test {
 
 int runTool(const std::vector<std::string>& arguments, std::string_view input)
 {
-    const FileDescriptor standardInput(::memfd_create("input", 0));
-    if (writeAll(standardInput.get(), input) != 0 ||
-        ::lseek(standardInput.get(), 0, SEEK_SET) != 0)
+    const pellar::FileDescriptor standardInput(::memfd_create("input", 0));
+    if (writeAll(standardInput.get(), input) != 0 || ::lseek(standardInput.get(), 0, SEEK_SET) != 0)
         return -1;
     posix_spawn_file_actions_t actions;
     ::posix_spawn_file_actions_init(&actions);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <sys/types.h>
 
@@ -13,6 +13,8 @@
 #include <vector>
 
 namespace orvane::test {
+
+using pellar::FileDescriptor;
 
 /// How the program is to be started.
 struct Launch {

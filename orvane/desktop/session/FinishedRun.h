@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/jobs/JobObserver.h"
-#include "orvane/support/history/RunLedger.h"
+#include "orvane/support/history/RunTable.h"
 
 #include <string>
 

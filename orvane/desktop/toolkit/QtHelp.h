@@ -2,7 +2,7 @@
 #pragma once
 
 #include "contract/foundation/Bundle.h"
-#include "contract/foundation/UserDefaults.h"
+#include "contract/support/OVPreferences.h"
 #include "contract/toolkit/Help.h"
 #include "orvane/desktop/toolkit/HelpWindow.h"
 

@@ -3,7 +3,7 @@
 
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 
 #include <QLocale>
 #include <QStringList>
@@ -39,7 +39,7 @@ QString nameText(const DiskRow& row)
                            facts.type != diskType::diskImage;
     if (!label.isEmpty() && !isInImage && !file.isEmpty())
         return label + QStringLiteral(" (") + file + QLatin1Char(')');
-    const QString name = shown(facts.displayName);
+    const QString name = shown(facts.name);
     return name.isEmpty() ? file : name;
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/foundation/UserDefaults.h"
+#include "contract/support/OVPreferences.h"
 #include "orvane/desktop/window/MainWindow.h"
 
 namespace orvane::desktop {

@@ -1,31 +1,25 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/Disk.h"
 
-#include "orvane/support/disks/Ownership.h"
 #include "pellar/packages/InstalledSystem.h"
 
 #include <algorithm>
+#include <array>
 #include <utility>
 
 namespace orvane {
 namespace {
 
 using contract::Array;
-using contract::Value;
 
-contract::DiskReferencePointer referenceTo(const DiskFacts& facts)
+/// Files on this kind of file system (as libblkid or the kernel names it) have owners of their own.
+/// NO for an unknown one: Linux then makes an owner up for all of them (mount(8), "uid=").
+bool hasOwners(std::string_view filesystemType)
 {
-    contract::DiskReference reference;
-    reference.storage = facts.storage;
-    reference.path = facts.path;
-    reference.offset = facts.offset;
-    reference.length = facts.length;
-    reference.identifier = facts.identifier;
-    reference.name = facts.displayName;
-    reference.filesystem = facts.filesystem;
-    reference.mountPoint = facts.mountPoint;
-    reference.isWhole = facts.isWhole;
-    return std::make_shared<const contract::DiskReference>(std::move(reference));
+    constexpr std::array<std::string_view, 13> types{
+        "ext2",   "ext3", "ext4",     "xfs",      "btrfs", "f2fs",    "jfs",
+        "nilfs2", "zfs",  "bcachefs", "reiserfs", "erofs", "squashfs"};
+    return std::find(types.begin(), types.end(), filesystemType) != types.end();
 }
 
 }  // namespace
@@ -52,21 +46,21 @@ void Disk::setFacts(const DiskFacts& facts)
     if (facts.uuid != facts_.uuid && !facts.uuid.empty() && surroundings_.histories != nullptr)
         own_ = {};
     facts_ = facts;
-    reference_ = referenceTo(facts_);
+    reference_ = std::make_shared<const contract::DiskReference>(facts_);
     filesystem_.reset();
     if (!facts_.filesystem.empty())
-        filesystem_ = std::make_unique<DiskFilesystem>(facts_.filesystem, surroundings_.capabilities);
+        filesystem_ =
+            std::make_unique<DiskFilesystem>(facts_.filesystem, surroundings_.capabilities);
 }
 
 // Without a path, so that an operation on it is refused with a reason. The node may be another
 // disk's by now.
 void Disk::setGone()
 {
-    DiskFacts nothing = facts_;
-    nothing.path.clear();
-    nothing.mountPoint.clear();
     facts_.mountPoint.clear();
-    reference_ = referenceTo(nothing);
+    contract::DiskReference nothing = facts_;
+    nothing.path.clear();
+    reference_ = std::make_shared<const contract::DiskReference>(std::move(nothing));
     hasGone_ = true;
 }
 

@@ -4,15 +4,46 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/support/OVDisk.h"
 #include "orvane/support/disks/DiskFacts.h"
-#include "orvane/support/disks/DiskFilesystem.h"
-#include "orvane/support/disks/HistoryKeeper.h"
-#include "orvane/support/disks/MergedHistory.h"
+#include "orvane/support/disks/DiskHistory.h"
 
+#include <functional>
 #include <memory>
 #include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
 #include <vector>
 
 namespace orvane {
+
+/// What the installed tools can do for one type of file system.
+struct FilesystemCapabilities {
+    bool canVerify = false;
+    bool canRepair = false;
+    bool canVerifyLive = false;
+};
+
+/// Asked on the main thread, with the type as libblkid names it.
+using CapabilityLookup = std::function<FilesystemCapabilities(std::string_view filesystemType)>;
+
+/// A file system type with what can be done for it, asked anew each time: a tool may be installed
+/// while the program runs.
+class DiskFilesystem final : public contract::OVFilesystem {
+public:
+    DiskFilesystem(std::string type, CapabilityLookup capabilities)
+        : type_(std::move(type)), capabilities_(std::move(capabilities))
+    {
+    }
+
+    std::string filesystemType() const override { return type_; }
+    bool canBeRepaired() const override { return capabilities_(type_).canRepair; }
+    bool canBeVerified() const override { return capabilities_(type_).canVerify; }
+    bool supportsLiveVerify() const override { return capabilities_(type_).canVerifyLive; }
+
+private:
+    std::string type_;
+    CapabilityLookup capabilities_;
+};
 
 /// A disk of the host: facts, and where its history is kept. Main thread only, except that any
 /// thread may make one and hand it over.
@@ -43,7 +74,7 @@ public:
 
     std::string diskIdentifier() const override { return facts_.identifier; }
     /// Fit to be shown: a label with a line end or an escape sequence must not forge a log.
-    std::string displayName() const override { return contract::printable(facts_.displayName); }
+    std::string displayName() const override { return contract::printable(facts_.name); }
     std::int32_t diskType() const override { return facts_.type; }
     std::int64_t diskNumber() const override { return facts_.number; }
     bool isWhole() const override { return facts_.isWhole; }

@@ -43,22 +43,6 @@ DiskTree treeOf(const Disk& disk)
     return tree;
 }
 
-DiskFacts factsOf(const contract::DiskReference& reference)
-{
-    DiskFacts facts;
-    facts.identifier = reference.identifier;
-    facts.displayName = reference.name;
-    facts.type = reference.isWhole ? diskType::whole : diskType::volume;
-    facts.isWhole = reference.isWhole;
-    facts.storage = reference.storage;
-    facts.path = reference.path;
-    facts.offset = reference.offset;
-    facts.length = reference.length;
-    facts.filesystem = reference.filesystem;
-    facts.mountPoint = reference.mountPoint;
-    return facts;
-}
-
 }  // namespace
 
 std::vector<std::shared_ptr<Disk>> withParts(const std::shared_ptr<Disk>& disk)
@@ -68,7 +52,8 @@ std::vector<std::shared_ptr<Disk>> withParts(const std::shared_ptr<Disk>& disk)
     return all;
 }
 
-DiskController::DiskController(contract::NotificationCenter& center, Disk::Surroundings surroundings)
+DiskController::DiskController(contract::NotificationCenter& center,
+                               Disk::Surroundings surroundings)
     : center_(center), surroundings_(std::move(surroundings))
 {
 }
@@ -95,16 +80,6 @@ std::shared_ptr<Disk> DiskController::add(const DiskFacts& facts)
     roots_.push_back(disk);
     appear(disk);
     return disk;
-}
-
-std::shared_ptr<Disk> DiskController::addImage(const DiskFacts& facts)
-{
-    return add(facts);
-}
-
-std::shared_ptr<Disk> DiskController::addDevice(const DiskFacts& facts)
-{
-    return add(facts);
 }
 
 void DiskController::adopt(const DiskTree& top)
@@ -178,7 +153,7 @@ void DiskController::tellGone(const std::shared_ptr<Disk>& top)
         }
 }
 
-// First forgotten, then told: whoever hears of it must not find the disk any more.
+// First forgotten, then told: an observer must not find the disk any more.
 void DiskController::forget(const std::shared_ptr<Disk>& root)
 {
     if (!isHeld(root))
@@ -295,7 +270,8 @@ OVDiskPointer DiskController::diskWithIdentifier(std::string_view identifier)
     return diskNamed(identifier);
 }
 
-std::shared_ptr<Disk> DiskController::diskReferredTo(const contract::DiskReferencePointer& reference)
+std::shared_ptr<Disk> DiskController::diskReferredTo(
+    const contract::DiskReferencePointer& reference)
 {
     if (!reference)
         return nullptr;
@@ -321,8 +297,9 @@ OVDiskPointer DiskController::findOrCreateOVDisk(const contract::DiskReferencePo
 {
     if (!disk)
         return nullptr;
-    const auto known = diskReferredTo(disk);
-    return known ? known : add(factsOf(*disk));
+    if (const auto known = diskReferredTo(disk))
+        return known;
+    return add({*disk, disk->isWhole ? diskType::whole : diskType::volume});
 }
 
 std::vector<OVDiskPointer> DiskController::viewablePartitions(const OVDiskPointer& disk)
@@ -338,10 +315,10 @@ std::vector<OVDiskPointer> DiskController::viewablePartitions(const OVDiskPointe
     return volumes;
 }
 
-void DiskController::warn(const Outcome<>& outcome)
+void DiskController::warn(const Result<void, Failure>& outcome)
 {
-    if (failed(outcome) && hooks_.warn)
-        hooks_.warn(failureMessage(outcome));
+    if (!outcome && hooks_.warn)
+        hooks_.warn(outcome.error().message);
 }
 
 void DiskController::mountDisk(const OVDiskPointer& disk, bool includeChildren,

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/support/OVDiskController.h"
-#include "orvane/support/Failure.h"
 #include "orvane/support/disks/Disk.h"
+#include "orvane/support/files/Failure.h"
 
 #include <functional>
 #include <memory>
@@ -20,8 +20,8 @@ class DiskController final : public contract::OVDiskController {
 public:
     /// What reaches outside. An empty function is an operation that cannot be done here.
     struct Hooks {
-        std::function<Outcome<>(const Disk& disk)> mount;
-        std::function<Outcome<>(const Disk& disk)> eject;
+        std::function<Result<void, Failure>(const Disk& disk)> mount;
+        std::function<Result<void, Failure>(const Disk& disk)> eject;
         /// How notifyFrontmostModulesOnly delivers.
         std::function<void(contract::Name name, const contract::Notification&)> notifyFrontmost;
         WarningSink warn;
@@ -38,10 +38,9 @@ public:
     /// The first in tree order for which `isMeant` answers YES; none when there is none.
     std::shared_ptr<Disk> find(const std::function<bool(const Disk&)>& isMeant) const;
 
-    /// Takes in an image file that is not attached; the one known already when there is one.
-    std::shared_ptr<Disk> addImage(const DiskFacts& facts);
-    /// Takes in a device that the system's list does not have, until the next `synchronize`.
-    std::shared_ptr<Disk> addDevice(const DiskFacts& facts);
+    /// Takes in an image file that is not attached, or, until the next `synchronize`, a device that
+    /// the system's list does not have; the one known already when there is one.
+    std::shared_ptr<Disk> add(const DiskFacts& facts);
     /// Makes the disk of an attached image known, with all its parts. Where it is known already,
     /// it is brought up to date: what is in the image may have changed.
     void adopt(const std::shared_ptr<Disk>& top);
@@ -74,7 +73,6 @@ private:
     struct PartsReadAgain;
 
     PartsReadAgain readAgain(const Disk& disk, const std::vector<DiskTree>& trees) const;
-    std::shared_ptr<Disk> add(const DiskFacts& facts);
     void post(contract::Name name, const std::shared_ptr<Disk>& disk);
     std::shared_ptr<Disk> diskReferredTo(const contract::DiskReferencePointer& reference);
     void forgetAsked();
@@ -84,7 +82,7 @@ private:
     void forget(const std::shared_ptr<Disk>& root);
     void update(const std::shared_ptr<Disk>& disk, const DiskTree& tree);
     void bringUpToDate(const std::shared_ptr<Disk>& image, const DiskFacts& contents);
-    void warn(const Outcome<>& outcome);
+    void warn(const Result<void, Failure>& outcome);
 
     contract::NotificationCenter& center_;
     Disk::Surroundings surroundings_;

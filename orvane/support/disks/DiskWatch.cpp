@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/DiskWatch.h"
 
-#include "orvane/support/disks/DiskEvents.h"
-
 #include <fcntl.h>
 #include <linux/netlink.h>
 #include <poll.h>
 #include <sys/socket.h>
+#include <sys/sysmacros.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <system_error>
@@ -16,14 +16,62 @@
 namespace orvane {
 namespace {
 
+using std::chrono::milliseconds;
+
+constexpr milliseconds quietTime{200};
+constexpr milliseconds longestWait{1000};
+
+}  // namespace
+
+// change@/devices/virtual/block/loop0 ACTION=change ... SUBSYSTEM=block MAJOR=7 ... (Linux 6.1),
+// each field ended by a zero byte. udevd sends the same fields behind a header of its own.
+bool isAboutBlockDevice(std::string_view message)
+{
+    using namespace std::string_view_literals;
+    return message.find("\0SUBSYSTEM=block\0"sv) != std::string_view::npos;
+}
+
+std::vector<pellar::Mount> deviceMounts(const std::vector<pellar::Mount>& mounts)
+{
+    std::vector<pellar::Mount> kept;
+    std::copy_if(mounts.begin(), mounts.end(), std::back_inserter(kept), [](const auto& mount) {
+        return major(mount.device) != 0 || mount.source.starts_with("/dev/");
+    });
+    return kept;
+}
+
+void EventBurst::note(Clock::time_point now)
+{
+    events_ = Span{events_ ? events_->first : now, now};
+}
+
+std::optional<milliseconds> EventBurst::timeLeft(Clock::time_point now) const
+{
+    if (!events_)
+        return std::nullopt;
+    const auto due = std::min(events_->last + quietTime, events_->first + longestWait);
+    return std::max(std::chrono::ceil<milliseconds>(due - now), milliseconds(0));
+}
+
+bool EventBurst::takeDue(Clock::time_point now)
+{
+    const auto left = timeLeft(now);
+    if (!left || *left > milliseconds(0))
+        return false;
+    events_.reset();
+    return true;
+}
+
+namespace {
+
 // The kernel's own messages, and those of udevd where it runs: its come when the device can be
 // opened and its file system has been looked at. A library would choose one of the two.
 constexpr unsigned kernelGroup = 1;
 constexpr unsigned udevGroup = 2;
 
-FileDescriptor openEvents()
+pellar::FileDescriptor openEvents()
 {
-    FileDescriptor events(
+    pellar::FileDescriptor events(
         ::socket(AF_NETLINK, SOCK_RAW | SOCK_CLOEXEC | SOCK_NONBLOCK, NETLINK_KOBJECT_UEVENT));
     sockaddr_nl address{};
     address.nl_family = AF_NETLINK;
@@ -56,7 +104,7 @@ bool takeDiskEvents(int events)
 /// The thread's own part: waits, joins events, and has them told.
 class DiskWatch::Watcher {
 public:
-    Watcher(FileDescriptor events, int stop, std::function<void()> tell)
+    Watcher(pellar::FileDescriptor events, int stop, std::function<void()> tell)
         : events_(std::move(events)), stop_(stop), tell_(std::move(tell))
     {
     }
@@ -97,15 +145,15 @@ private:
         return std::exchange(mounts_, now) != now;
     }
 
-    const FileDescriptor events_;
+    const pellar::FileDescriptor events_;
     const int stop_;
     const std::function<void()> tell_;
-    const FileDescriptor mountInfo_{::open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)};
+    const pellar::FileDescriptor mountInfo_{::open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)};
     std::vector<pellar::Mount> mounts_ = deviceMounts(pellar::currentMounts());
     EventBurst burst_;
 };
 
-DiskWatch::DiskWatch(HostLoop& loop, std::function<void()> changed)
+DiskWatch::DiskWatch(EventLoop& loop, std::function<void()> changed)
     : loop_(loop), changed_(std::move(changed))
 {
 }
@@ -117,10 +165,10 @@ DiskWatch::~DiskWatch()
 }
 
 // The watcher is made here, not in its thread: it must not miss what follows.
-Outcome<> DiskWatch::start()
+Result<void, Failure> DiskWatch::start()
 {
     constexpr const char* attempt = "listen to the kernel for disks that come and go";
-    FileDescriptor events = openEvents();
+    pellar::FileDescriptor events = openEvents();
     const int error = errno;
     const bool isListening = static_cast<bool>(events);
     auto watcher = std::make_shared<Watcher>(std::move(events), stop_.descriptor(),
@@ -135,7 +183,9 @@ Outcome<> DiskWatch::start()
     } catch (const std::system_error& refused) {
         return cannot(attempt, "netlink", refused.code().value());
     }
-    return isListening ? Outcome<>(Done{}) : Outcome<>(cannot(attempt, "netlink", error));
+    if (!isListening)
+        return cannot(attempt, "netlink", error);
+    return {};
 }
 
 }  // namespace orvane

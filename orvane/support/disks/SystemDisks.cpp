@@ -3,8 +3,8 @@
 
 #include "orvane/support/disks/BlockProbe.h"
 #include "orvane/support/disks/UdevDatabase.h"
-#include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -26,7 +26,7 @@ namespace fs = std::filesystem;
 std::string attribute(const fs::path& device, const char* name)
 {
     const auto contents = readWholeFile(device / name, 4096);
-    std::string text = contents.index() == 0 ? std::get<0>(contents) : std::string();
+    std::string text = contents ? *contents : std::string();
     text.erase(text.find_last_not_of(" \n") + 1);
     return text;
 }
@@ -69,10 +69,7 @@ bool isLeftOut(const fs::path& device)
 
 Superblock superblockFromUdev(const std::string& number, const DiskSources& sources)
 {
-    const auto contents = readWholeFile(sources.udevData / ("b" + number), 1U << 20U);
-    if (contents.index() != 0)
-        return {};
-    auto properties = parseUdevProperties(std::get<0>(contents));
+    auto properties = udevProperties(number, sources.udevData);
     return {properties["ID_FS_USAGE"], properties["ID_FS_TYPE"],
             decodeUdevName(properties["ID_FS_LABEL_ENC"]), properties["ID_FS_UUID"]};
 }
@@ -89,7 +86,7 @@ struct Contents {
 Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
                     const DiskSources& sources)
 {
-    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!device)
         return {superblockFromUdev(number, sources), {}};
     const ByteRange all{0, size};
@@ -148,15 +145,15 @@ void addSuperblock(DiskFacts& facts, const Contents& contents)
     facts.label = superblock.label;
     facts.uuid = superblock.isFilesystem() ? superblock.uuid : std::string();
     if (!facts.label.empty())
-        facts.displayName = facts.label;
+        facts.name = facts.label;
 }
 
-DiskFacts baseFacts(const fs::path& device, const DiskSources& sources)
+DiskFacts baseFacts(const fs::path& device, const fs::path& node)
 {
     DiskFacts facts;
-    facts.path = sources.dev / device.filename();
-    facts.identifier = facts.path.native();
-    facts.displayName = device.filename();
+    facts.path = node;
+    facts.identifier = node.native();
+    facts.name = node.filename();
     facts.length = sizeOf(device);
     facts.isWritable = attribute(device, "ro") != "1";
     // Of whole disks only (Linux, Documentation/ABI/stable/sysfs-block, diskseq).
@@ -201,7 +198,7 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
                        const DiskSources& sources)
 {
     const std::string number = attribute(device, "dev");
-    DiskFacts facts = baseFacts(device, sources);
+    DiskFacts facts = baseFacts(device, sources.dev / device.filename());
     facts.type = diskType::volume;
     facts.number = static_cast<std::int64_t>(numberIn(attribute(device, "partition")));
     const Partition* known = nullptr;
@@ -211,7 +208,7 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
     // The kernel gives the device of an extended partition two sectors, for its loader.
     const bool isContainer = known != nullptr ? known->isContainer : facts.length <= 1024;
     if (known != nullptr && !known->name.empty())
-        facts.displayName = known->name;
+        facts.name = known->name;
     if (isContainer) {
         facts.type = diskType::container;
     } else {
@@ -226,8 +223,8 @@ DiskTree readPartition(const fs::path& device, const std::optional<PartitionTabl
 DiskTree readWhole(const fs::path& device, const DiskSources& sources)
 {
     const std::string number = attribute(device, "dev");
-    DiskFacts facts = baseFacts(device, sources);
-    facts.displayName = nameOfWhole(device);
+    DiskFacts facts = baseFacts(device, sources.dev / device.filename());
+    facts.name = nameOfWhole(device);
     facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
     DiskTree tree;
@@ -267,12 +264,7 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
         return std::nullopt;
     const std::string number = fmt::format("{}:{}", major(status.st_rdev), minor(status.st_rdev));
     const fs::path device = sources.sysBlock.parent_path() / "dev/block" / number;
-    DiskFacts facts;
-    facts.path = node;
-    facts.identifier = node.native();
-    facts.displayName = node.filename();
-    facts.length = sizeOf(device);
-    facts.isWritable = attribute(device, "ro") != "1";
+    DiskFacts facts = baseFacts(device, node);
     const Contents contents = contentsOf(node, number, facts.length, sources);
     const bool isPartition = !attribute(device, "partition").empty();
     facts.type = isPartition

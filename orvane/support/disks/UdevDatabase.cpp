@@ -1,15 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/UdevDatabase.h"
 
+#include "orvane/support/files/WholeFile.h"
+
 #include <charconv>
 #include <sstream>
 
 namespace orvane {
 
-std::map<std::string, std::string> parseUdevProperties(std::string_view text)
+std::map<std::string, std::string> udevProperties(const std::string& number,
+                                                  const std::filesystem::path& database)
 {
     std::map<std::string, std::string> properties;
-    std::istringstream lines{std::string(text)};
+    const auto contents = readWholeFile(database / ("b" + number), 1U << 20U);
+    std::istringstream lines(contents ? *contents : std::string());
     for (std::string line; std::getline(lines, line);) {
         const std::size_t equals = line.find('=');
         if (line.starts_with("E:") && equals != std::string::npos)

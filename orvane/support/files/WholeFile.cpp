@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/files/WholeFile.h"
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>
@@ -44,7 +44,7 @@ public:
 
 private:
     std::string name_;
-    FileDescriptor descriptor_;
+    pellar::FileDescriptor descriptor_;
     bool isRenamed_ = false;
 };
 
@@ -52,7 +52,8 @@ private:
 // which takes nothing away from the file.
 void syncDirectory(const std::filesystem::path& directory)
 {
-    const FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const pellar::FileDescriptor opened(
+        ::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (opened)
         ::fsync(opened.get());
 }
@@ -79,9 +80,9 @@ int writeAll(int descriptor, std::string_view bytes)
     return 0;
 }
 
-std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
+Result<std::string, int> readWholeFile(const std::filesystem::path& file, std::size_t limit)
 {
-    const FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor opened(::open(file.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!opened)
         return errno;
     struct stat status = {};
@@ -107,17 +108,17 @@ std::variant<std::string, int> readWholeFile(const std::filesystem::path& file, 
     }
 }
 
-Outcome<> replaceFile(const std::filesystem::path& file, std::string_view contents)
+Result<void, Failure> replaceFile(const std::filesystem::path& file, std::string_view contents)
 {
     const std::filesystem::path target = targetOf(file);
     TemporaryFile temporary(target);
     if (const int error = temporary.become(target, contents))
         return cannot("write", file.native(), error);
     syncDirectory(target.parent_path());
-    return Done();
+    return {};
 }
 
-Outcome<> createPrivateDirectory(const std::filesystem::path& directory)
+Result<void, Failure> createPrivateDirectory(const std::filesystem::path& directory)
 {
     if (directory.empty())
         return cannot("create the directory", "", ENOENT);
@@ -135,7 +136,7 @@ Outcome<> createPrivateDirectory(const std::filesystem::path& directory)
     std::error_code ignored;
     if (!std::filesystem::is_directory(directory, ignored))
         return cannot("create the directory", directory.native(), ENOTDIR);
-    return Done();
+    return {};
 }
 
 }  // namespace orvane

@@ -10,8 +10,8 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// Another program may hold the right to write for so long; then every attempt gives up at once until
-// it is free. A check does not wait for its history once for each record.
+// Another program may hold the right to write for so long; then every attempt gives up at once
+// until it is free. A check does not wait for its history once for each record.
 constexpr auto longestWait = 2s;
 // What was free for so long is held anew.
 constexpr auto newBeginning = 10s;
@@ -82,8 +82,8 @@ Database Database::opened(const char* name)
 {
     Database result;
     sqlite3* database = nullptr;
-    const int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE |
-                      SQLITE_OPEN_NOFOLLOW;
+    const int flags =
+        SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE | SQLITE_OPEN_NOFOLLOW;
     const int error = sqlite3_open_v2(name, &database, flags, nullptr);
     result.database_.reset(database);
     if (error != SQLITE_OK) {
@@ -184,6 +184,42 @@ bool Transaction::commit()
         return false;
     isOpen_ = false;
     return true;
+}
+
+InternTable::InternTable(Database& database, const std::string& table, const std::string& column)
+    : database_(database),
+      find_(database.prepare("SELECT id FROM " + table + " WHERE " + column + " = ?")),
+      add_(database.prepare("INSERT INTO " + table + " (" + column + ") VALUES (?)")),
+      read_(database.prepare("SELECT " + column + " FROM " + table + " WHERE id = ?"))
+{
+}
+
+std::int64_t InternTable::find(std::string_view text)
+{
+    find_.bind(1, text);
+    if (find_.step() != Statement::Step::Row)
+        return 0;
+    const std::int64_t number = find_.integer(0);
+    find_.reset();
+    return number;
+}
+
+std::int64_t InternTable::intern(std::string_view text)
+{
+    if (const std::int64_t number = find(text))
+        return number;
+    add_.bind(1, text);
+    return add_.run() ? database_.lastInsertedRow() : 0;
+}
+
+std::optional<std::string> InternTable::text(std::int64_t number)
+{
+    read_.bind(1, number);
+    if (read_.step() != Statement::Step::Row)
+        return std::nullopt;
+    std::string text(read_.text(0));
+    read_.reset();
+    return text;
 }
 
 }  // namespace orvane

@@ -2,11 +2,20 @@
 #include "orvane/support/history/DiskHistories.h"
 
 #include "contract/foundation/Dictionary.h"
-#include "orvane/support/history/HistoryKey.h"
 
 #include <algorithm>
 
 namespace orvane {
+
+std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID)
+{
+    if (disk.uuid.empty())
+        return "disk:" + disk.identifier + "@" + std::to_string(disk.offset);
+    const bool isInImage = disk.storage == contract::DiskReference::Storage::FileRegion;
+    if (isInImage || sharesUUID)
+        return "uuid:" + disk.uuid + "@" + disk.identifier;
+    return "uuid:" + disk.uuid;
+}
 
 using contract::Array;
 
@@ -34,7 +43,7 @@ DiskHistories::History& DiskHistories::find(const DiskFacts& disk)
 
 DiskHistories::History DiskHistories::load(const std::string& key)
 {
-    const HistoryStore::Range all = store_.recordsOf(key);
+    const RecordRange all = store_.recordsOf(key);
     const bool isGradual = isIncomplete_ && all.size() > recordsAtOnce;
     const std::int64_t first = isGradual ? all.end - recordsAtOnce : all.next;
     History history;

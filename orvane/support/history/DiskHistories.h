@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/DiskFacts.h"
+#include "orvane/support/disks/DiskHistory.h"
 #include "orvane/support/history/HistoryStore.h"
 
 #include <functional>
@@ -11,19 +12,28 @@
 
 namespace orvane {
 
+/// What a volume's history is filed under.
+///
+/// A file system on a device is known by its UUID, because device names change from one start to
+/// the next. Copies of a device have the same UUID, so while two are known at one time,
+/// `sharesUUID` tells them apart by their identifiers. An image file is known by its path as well
+/// as by its UUID: copies of images are everyday things, and they are not checked at one time.
+/// What has no UUID is known by its identifier.
+[[nodiscard]] std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID);
+
 /// The histories in memory: each is read from the store when it is first asked for, and lives
 /// until the program ends, so that a disk that goes and comes again finds its records. Main thread
 /// only.
 ///
-/// A long history may come in two steps, so that nobody waits for its oldest records: at first the
-/// newest ones alone, and the complete list when `loadMore` has read the others.
+/// A long history may come in two steps, so that no caller waits for its oldest records: at first
+/// the newest ones alone, and the complete list when `loadMore` has read the others.
 class DiskHistories final : public HistoryKeeper {
 public:
     /// The store must outlive this object.
     explicit DiskHistories(HistoryStore& store) : store_(store) {}
 
     /// From now on long histories come in two steps. `isIncomplete` is called when one has begun
-    /// to; somebody must then call `loadMore` until it answers NO.
+    /// to; the caller must then call `loadMore` until it answers NO.
     void loadGradually(std::function<void()> isIncomplete)
     {
         isIncomplete_ = std::move(isIncomplete);
@@ -64,7 +74,7 @@ private:
     struct Older {
         contract::Array records;
         RecordTimes times;
-        HistoryStore::Range left;
+        RecordRange left;
     };
 
     struct History {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/history/HistoryStore.h"
 
-#include "orvane/support/history/HistorySchema.h"
+#include "orvane/support/history/HistoryDatabase.h"
 
 #include <utility>
 
@@ -45,7 +45,7 @@ HistoryStore::Mishap HistoryStore::lastMishap()
 }
 
 // Always NO, for the caller to pass on.
-bool HistoryStore::failedTo(std::string_view attempt, const Mishap& mishap)
+bool HistoryStore::failedTo(const std::string& attempt, const Mishap& mishap)
 {
     tables_->records.forgetWritten();
     if (mishap.isDamage && isKept_) {
@@ -61,15 +61,10 @@ bool HistoryStore::failedTo(std::string_view attempt, const Mishap& mishap)
     return false;
 }
 
-std::int64_t HistoryStore::knownVolume(std::string_view key)
+RecordRange HistoryStore::recordsOf(std::string_view key)
 {
-    return tables_->volumes.find(key);
-}
-
-HistoryStore::Range HistoryStore::recordsOf(std::string_view key)
-{
-    const std::int64_t volume = knownVolume(key);
-    const Range records = volume != 0 ? tables_->records.recordsOf(volume) : Range();
+    const std::int64_t volume = tables_->volumes.find(key);
+    const RecordRange records = volume != 0 ? tables_->records.recordsOf(volume) : RecordRange();
     if (records.size() > 0)
         return records;
     if (const Mishap mishap = lastMishap(); mishap.isDamage)
@@ -77,16 +72,10 @@ HistoryStore::Range HistoryStore::recordsOf(std::string_view key)
     return {};
 }
 
-void HistoryStore::load(Range records, const Array& history, RecordTimes& times)
+void HistoryStore::load(RecordRange records, const Array& history, RecordTimes& times)
 {
     if (records.size() > 0 && !tables_->records.read(records, history, times))
         failedTo("read the history", lastMishap());
-}
-
-void HistoryStore::load(Range records, const Array& history)
-{
-    RecordTimes ignored;
-    load(records, history, ignored);
 }
 
 bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew,
@@ -124,7 +113,7 @@ void HistoryStore::countAdded(std::int64_t records)
 
 bool HistoryStore::clear(std::string_view key)
 {
-    const std::int64_t volume = knownVolume(key);
+    const std::int64_t volume = tables_->volumes.find(key);
     const bool isCleared =
         volume == 0 || (tables_->records.removeAll(volume) && tables_->runs.keepNewest(volume, 0));
     return isCleared || failedTo("clear the history", lastMishap());
@@ -179,12 +168,12 @@ void HistoryStore::writeLate()
 
 std::vector<Run> HistoryStore::runs(std::string_view key)
 {
-    return tables_->runs.runs(knownVolume(key));
+    return tables_->runs.runs(tables_->volumes.find(key));
 }
 
 std::optional<Run> HistoryStore::lastRun(std::string_view key)
 {
-    auto newest = tables_->runs.runs(knownVolume(key), 1);
+    auto newest = tables_->runs.runs(tables_->volumes.find(key), 1);
     return newest.empty() ? std::nullopt : std::optional(std::move(newest.back()));
 }
 

@@ -2,12 +2,11 @@
 #pragma once
 
 #include "contract/foundation/Array.h"
-#include "orvane/support/Failure.h"
-#include "orvane/support/history/Checkpointer.h"
+#include "orvane/support/files/Failure.h"
 #include "orvane/support/history/Database.h"
-#include "orvane/support/history/InternTable.h"
+#include "orvane/support/history/HistoryDatabase.h"
 #include "orvane/support/history/RecordTable.h"
-#include "orvane/support/history/RunLedger.h"
+#include "orvane/support/history/RunTable.h"
 
 #include <cstdint>
 #include <filesystem>
@@ -35,13 +34,10 @@ public:
     HistoryStore& operator=(const HistoryStore&) = delete;
     ~HistoryStore();
 
-    using Range = RecordRange;
-
     /// All that the volume has.
-    [[nodiscard]] Range recordsOf(std::string_view key);
+    [[nodiscard]] RecordRange recordsOf(std::string_view key);
     /// Appends those of the records that are still there, oldest first, and their times.
-    void load(Range records, const contract::Array& history, RecordTimes& times);
-    void load(Range records, const contract::Array& history);
+    void load(RecordRange records, const contract::Array& history, RecordTimes& times);
     /// Appends the records from `firstNew` on to the volume's, with their times; where none are
     /// given, with the present one. All of them or, when it answers NO, none: try again later.
     [[nodiscard]] bool append(std::string_view key, const contract::Array& history,
@@ -67,7 +63,7 @@ private:
 
         InternTable volumes;
         RecordTable records;
-        RunLedger runs;
+        RunTable runs;
     };
     /// Why the database did not do what it was asked.
     struct Mishap {
@@ -90,8 +86,7 @@ private:
     Mishap lastMishap();
     std::int64_t noteBegin(std::string_view key, std::string_view action, Run::Time started);
     void writeLate();
-    bool failedTo(std::string_view attempt, const Mishap& mishap);
-    std::int64_t knownVolume(std::string_view key);
+    bool failedTo(const std::string& attempt, const Mishap& mishap);
     void countAdded(std::int64_t records);
 
     const std::filesystem::path file_;

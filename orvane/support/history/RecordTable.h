@@ -2,9 +2,9 @@
 #pragma once
 
 #include "contract/foundation/Array.h"
-#include "orvane/support/disks/HistoryKeeper.h"
+#include "orvane/support/disks/DiskHistory.h"
 #include "orvane/support/history/Database.h"
-#include "orvane/support/history/RecordVocabulary.h"
+#include "orvane/support/history/RecordEncoding.h"
 
 #include <chrono>
 #include <cstdint>
@@ -35,7 +35,8 @@ public:
     [[nodiscard]] RecordRange recordsOf(std::int64_t volume);
     /// Appends those of the records that are still there to the history, oldest first, and their
     /// times to `times`.
-    [[nodiscard]] bool read(RecordRange records, const contract::Array& history, RecordTimes& times);
+    [[nodiscard]] bool read(RecordRange records, const contract::Array& history,
+                            RecordTimes& times);
     /// Appends the history's records from `firstNew` on to the volume's; where there are no
     /// times, with `now`. Within a transaction.
     [[nodiscard]] bool append(std::int64_t volume, const contract::Array& history,

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/loop/MainLoop.h"
 
-#include "orvane/support/loop/Outbox.h"
-#include "orvane/support/loop/Rendezvous.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <unistd.h>
 
@@ -22,9 +21,9 @@ namespace {
 // Enough to make the system call between two turns cheap, few enough for Control-C to be heard.
 constexpr int tasksInOneTurn = 512;
 
-FileDescriptor makeWakeup()
+pellar::FileDescriptor makeWakeup()
 {
-    FileDescriptor wakeup(::eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC));
+    pellar::FileDescriptor wakeup(::eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC));
     if (!wakeup)
         throw std::system_error(errno, std::generic_category(), "cannot make an event descriptor");
     return wakeup;

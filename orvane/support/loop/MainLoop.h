@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/files/FileDescriptor.h"
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <atomic>
 #include <chrono>
@@ -20,7 +20,7 @@ namespace orvane {
 ///
 /// Loops may be nested: a task may call `runUntil`, and the inner loop goes on with the tasks that
 /// are queued behind it.
-class MainLoop final : public HostLoop {
+class MainLoop final : public EventLoop {
 public:
     using WatchHandler = std::function<void(short events)>;
 
@@ -71,7 +71,7 @@ private:
     bool runNextTimer(Clock::time_point now);
 
     const std::thread::id mainThread_ = std::this_thread::get_id();
-    const FileDescriptor wakeup_;
+    const pellar::FileDescriptor wakeup_;
     std::atomic<bool> isStopped_ = false;
 
     std::mutex lock_;

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/loop/WorkerThreads.h"
 
-#include "orvane/support/loop/Outbox.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <algorithm>
 #include <system_error>
@@ -11,7 +11,7 @@
 
 namespace orvane {
 
-class WorkerThreads::Worker final : public Outbox {
+class WorkerThreads::Worker final : public DeliveryQueue {
 public:
     explicit Worker(WorkerThreads& o) : owner(o) {}
 
@@ -21,13 +21,13 @@ public:
             owner.perform(*this, std::move(task));
             return;
         }
-        const auto meeting = std::make_shared<Rendezvous>();
+        const auto mine = std::make_shared<AwaitedTask>();
         {
             const std::lock_guard guard(owner.lock_);
-            rendezvous = meeting;
+            awaited = mine;
         }
-        owner.perform(*this, Rendezvous::taskFor(meeting, std::move(task)));
-        meeting->wait();
+        owner.perform(*this, AwaitedTask::taskFor(mine, std::move(task)));
+        mine->wait();
     }
 
     void run(const contract::RunLoop::Task& task)
@@ -43,12 +43,12 @@ public:
     std::thread thread;
     // All guarded by the owner's lock.
     std::vector<contract::RunLoop::Task> heldBack;
-    std::shared_ptr<Rendezvous> rendezvous;  ///< the one it waited at last
-    bool isFirst = false;                    ///< nothing needs to be held back
+    std::shared_ptr<AwaitedTask> awaited;  ///< the one it waited at last
+    bool isFirst = false;                  ///< nothing needs to be held back
     bool isOver = false;
 };
 
-WorkerThreads::WorkerThreads(HostLoop& loop) : loop_(loop) {}
+WorkerThreads::WorkerThreads(EventLoop& loop) : loop_(loop) {}
 
 WorkerThreads::~WorkerThreads()
 {
@@ -56,8 +56,8 @@ WorkerThreads::~WorkerThreads()
         const std::lock_guard guard(lock_);
         isClosing_ = true;
         for (const auto& worker : workers_)
-            if (worker->rendezvous)
-                worker->rendezvous->abandon();
+            if (worker->awaited)
+                worker->awaited->abandon();
     }
     closing_.notify_all();
     for (const auto& worker : workers_)
@@ -71,10 +71,10 @@ void WorkerThreads::detachNewThread(contract::RunLoop::Task task)
     Worker* worker = nullptr;
     {
         const std::lock_guard guard(lock_);
-        const bool nobodyIsBefore = std::all_of(workers_.begin(), workers_.end(),
+        const bool isFirst = std::all_of(workers_.begin(), workers_.end(),
                                                 [](const auto& other) { return other->isOver; });
         worker = workers_.emplace_back(std::make_unique<Worker>(*this)).get();
-        worker->isFirst = nobodyIsBefore;
+        worker->isFirst = isFirst;
     }
     try {
         worker->thread = std::thread([worker, task] { worker->run(task); });
@@ -87,8 +87,8 @@ void WorkerThreads::perform(Worker& worker, contract::RunLoop::Task task)
 {
     const std::lock_guard guard(lock_);
     if (isClosing_) {
-        if (worker.rendezvous)
-            worker.rendezvous->abandon();
+        if (worker.awaited)
+            worker.awaited->abandon();
     } else if (worker.isFirst) {
         loop_.post(std::move(task));
     } else {

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/HostLoop.h"
-#include "orvane/support/loop/Rendezvous.h"
+#include "orvane/support/loop/EventLoop.h"
 
 #include <condition_variable>
 #include <list>
@@ -19,7 +18,7 @@ namespace orvane {
 /// still hand over is dropped, and a worker that sleeps or waits for the main thread is woken.
 class WorkerThreads final : public contract::Threads {
 public:
-    explicit WorkerThreads(HostLoop& loop);
+    explicit WorkerThreads(EventLoop& loop);
     WorkerThreads(const WorkerThreads&) = delete;
     WorkerThreads& operator=(const WorkerThreads&) = delete;
     ~WorkerThreads() override;
@@ -41,7 +40,7 @@ private:
     void passOnFrom(Worker& worker);
     void joinEnded();
 
-    HostLoop& loop_;
+    EventLoop& loop_;
     std::mutex lock_;
     std::condition_variable closing_;
     bool isClosing_ = false;             ///< guarded by the lock

@@ -2,9 +2,9 @@
 #include "orvane/support/modules/ModuleLoader.h"
 
 #include "contract/foundation/UTF8.h"
-#include "orvane/support/files/FileDescriptor.h"
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
+#include "pellar/process/FileDescriptor.h"
 #include "pellar/process/TrustedPath.h"
 
 #include <dlfcn.h>
@@ -35,11 +35,12 @@ Failure linkerFailure(const std::filesystem::path& library)
 }
 
 /// A file in the open directory, which others cannot change. `shown`: its path, for messages.
-Outcome<FileDescriptor> openFile(const FileDescriptor& directory, const std::string& name,
-                                 const std::filesystem::path& shown)
+Result<pellar::FileDescriptor, Failure> openFile(const pellar::FileDescriptor& directory,
+                                                 const std::string& name,
+                                                 const std::filesystem::path& shown)
 {
-    FileDescriptor file(::openat(directory.get(), name.c_str(),
-                                 O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
+    pellar::FileDescriptor file(::openat(
+        directory.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_NOCTTY | O_CLOEXEC));
     struct stat status = {};
     if (!file || ::fstat(file.get(), &status) != 0)
         return cannot(attempt, shown.native(), errno);
@@ -51,7 +52,7 @@ Outcome<FileDescriptor> openFile(const FileDescriptor& directory, const std::str
 }
 
 /// Where it really is; the path to the bundle may be led elsewhere by a link.
-std::filesystem::path pathOf(const FileDescriptor& directory)
+std::filesystem::path pathOf(const pellar::FileDescriptor& directory)
 {
     return std::filesystem::read_symlink(pellar::pathOfDescriptor(directory.get()));
 }
@@ -61,12 +62,13 @@ bool isPlainFileName(const std::filesystem::path& name)
     return !name.empty() && name == name.filename() && name != "." && name != "..";
 }
 
-Outcome<Description> readDescription(const FileDescriptor& file, const std::filesystem::path& shown)
+Result<Description, Failure> readDescription(const pellar::FileDescriptor& file,
+                                             const std::filesystem::path& shown)
 {
     const auto contents = readWholeFile(pellar::pathOfDescriptor(file.get()), 64U << 10U);
-    if (const int* const error = std::get_if<int>(&contents))
-        return cannot(attempt, shown.native(), *error);
-    const auto json = parsedJSON(std::get<std::string>(contents));
+    if (!contents)
+        return cannot(attempt, shown.native(), contents.error());
+    const auto json = parsedJSON(*contents);
     const auto text = [&json](const char* key, const char* otherwise) -> std::string {
         const auto found = json.find(key);
         return found != json.end() && found->is_string() ? found->get<std::string>() : otherwise;
@@ -78,8 +80,8 @@ Outcome<Description> readDescription(const FileDescriptor& file, const std::file
     return Description{text("name", ""), text("library", ""), text("table", "FXW")};
 }
 
-Outcome<const contract::ModuleEntry*> openLibrary(FileDescriptor file,
-                                                 const std::filesystem::path& shown)
+Result<const contract::ModuleEntry*, Failure> openLibrary(pellar::FileDescriptor file,
+                                                          const std::filesystem::path& shown)
 {
     void* const code =
         ::dlopen(pellar::pathOfDescriptor(file.get()).c_str(), RTLD_NOW | RTLD_LOCAL);
@@ -87,7 +89,7 @@ Outcome<const contract::ModuleEntry*> openLibrary(FileDescriptor file,
         return linkerFailure(shown);
     // The linker knows a library by its name. With this one given back, the next to be loaded could
     // have it, and would be taken for the one that is there.
-    static std::vector<FileDescriptor> loaded;
+    static std::vector<pellar::FileDescriptor> loaded;
     loaded.push_back(std::move(file));
     const auto entryFunction =
         reinterpret_cast<contract::ModuleEntryFunction>(::dlsym(code, contract::moduleEntryName));
@@ -106,29 +108,28 @@ Outcome<const contract::ModuleEntry*> openLibrary(FileDescriptor file,
 
 }  // namespace
 
-Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle)
+Result<LoadedModule, Failure> loadModule(const std::filesystem::path& bundle)
 {
     const auto opened = pellar::openTrusted(bundle);
     if (!opened)
         return cannot(attempt, bundle.native(), opened.error());
-    const FileDescriptor& directory = *opened;
+    const pellar::FileDescriptor& directory = *opened;
     const auto json = openFile(directory, "module.json", bundle / "module.json");
-    if (failed(json))
-        return std::get<Failure>(json);
-    const auto described = readDescription(std::get<FileDescriptor>(json), bundle / "module.json");
-    if (failed(described))
-        return std::get<Failure>(described);
-    const auto& description = std::get<Description>(described);
-    const auto shown = bundle / description.library;
-    auto library = openFile(directory, description.library, shown);
-    if (failed(library))
-        return std::get<Failure>(library);
-    const auto entry = openLibrary(std::get<FileDescriptor>(std::move(library)), shown);
-    if (failed(entry))
-        return std::get<Failure>(entry);
-    return LoadedModule{description.name,
-                        std::make_unique<ModuleBundle>(pathOf(directory), description.defaultTable),
-                        std::get<const contract::ModuleEntry*>(entry)};
+    if (!json)
+        return json.error();
+    const auto description = readDescription(*json, bundle / "module.json");
+    if (!description)
+        return description.error();
+    const auto shown = bundle / description->library;
+    auto library = openFile(directory, description->library, shown);
+    if (!library)
+        return library.error();
+    const auto entry = openLibrary(*std::move(library), shown);
+    if (!entry)
+        return entry.error();
+    return LoadedModule{
+        description->name,
+        std::make_unique<ModuleBundle>(pathOf(directory), description->defaultTable), *entry};
 }
 
 bool shouldRun(const LoadedModule& module, contract::HostServices& host)
@@ -136,9 +137,9 @@ bool shouldRun(const LoadedModule& module, contract::HostServices& host)
     return module.entry->shouldRunOnThisConfig(host, *module.bundle);
 }
 
-Outcome<std::unique_ptr<contract::OVModule>> makeModule(const LoadedModule& module,
-                                                       contract::HostServices& host,
-                                                       contract::ModuleSite& site)
+Result<std::unique_ptr<contract::OVModule>, Failure> makeModule(const LoadedModule& module,
+                                                                contract::HostServices& host,
+                                                                contract::ModuleSite& site)
 {
     std::unique_ptr<contract::OVModule> made(module.entry->make(host, site));
     if (!made)

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/support/ModuleEntry.h"
-#include "orvane/support/Failure.h"
-#include "orvane/support/texts/ModuleBundle.h"
+#include "orvane/support/files/Failure.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <filesystem>
 #include <memory>
@@ -25,15 +25,14 @@ struct LoadedModule {
 /// another version of the contract, of which nothing but the version is looked at. All that is
 /// looked at is opened once, and that is what is loaded. Loading runs the library's initializers.
 /// Main thread.
-[[nodiscard]] Outcome<LoadedModule> loadModule(const std::filesystem::path& bundle);
+[[nodiscard]] Result<LoadedModule, Failure> loadModule(const std::filesystem::path& bundle);
 
 /// Whether the module may run here; it says NO where its own switch in the settings is off.
 [[nodiscard]] bool shouldRun(const LoadedModule& module, contract::HostServices& host);
 
 /// A module, made and initialized, with its notifications registered. Host and site must outlive
 /// it.
-[[nodiscard]] Outcome<std::unique_ptr<contract::OVModule>> makeModule(const LoadedModule& module,
-                                                                     contract::HostServices& host,
-                                                                     contract::ModuleSite& site);
+[[nodiscard]] Result<std::unique_ptr<contract::OVModule>, Failure> makeModule(
+    const LoadedModule& module, contract::HostServices& host, contract::ModuleSite& site);
 
 }  // namespace orvane

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/Failure.h"
+#include "orvane/support/files/Failure.h"
 #include "orvane/support/settings/XDGPaths.h"
 
 #include <filesystem>

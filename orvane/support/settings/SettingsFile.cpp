@@ -4,6 +4,8 @@
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
 
+#include <sys/statvfs.h>
+
 #include <algorithm>
 #include <array>
 #include <cctype>
@@ -64,14 +66,15 @@ void SettingsFile::read()
     if (file_.empty())
         return;
     const auto contents = readWholeFile(file_, largestFile);
-    if (const int* const error = std::get_if<int>(&contents)) {
-        if (*error == EFBIG || *error == EINVAL)
+    if (!contents) {
+        const int error = contents.error();
+        if (error == EFBIG || error == EINVAL)
             setAside();
-        else if (*error != ENOENT)
-            goOnInMemory(cannot("read the settings", file_.native(), *error).message);
+        else if (error != ENOENT)
+            goOnInMemory(cannot("read the settings", file_.native(), error).message);
         return;
     }
-    const auto json = parsedJSON(std::get<std::string>(contents));
+    const auto json = parsedJSON(*contents);
     if (!json.is_object()) {
         setAside();
         return;
@@ -110,17 +113,40 @@ void SettingsFile::write()
         json[key] = jsonFromValue(value);
     const auto replaceHandler = nlohmann::json::error_handler_t::replace;
     const auto directory = createPrivateDirectory(file_.parent_path());
-    const auto written = failed(directory)
+    const auto written = !directory
                              ? directory
                              : replaceFile(file_, json.dump(4, ' ', false, replaceHandler) + "\n");
-    if (failed(written))
-        goOnInMemory(failureMessage(written));
+    if (!written)
+        goOnInMemory(written.error().message);
 }
 
 void SettingsFile::goOnInMemory(const std::string& sentence)
 {
     file_.clear();
     warn_(sentence + "; changed settings hold until the program ends");
+}
+
+namespace {
+
+constexpr std::string_view showDetailsKey = "showDetailsInFixwell";
+
+}  // namespace
+
+bool Preferences::rootVolumeIsReadOnly() const
+{
+    struct statvfs status = {};
+    return ::statvfs("/", &status) == 0 && (status.f_flag & ST_RDONLY) != 0;
+}
+
+bool Preferences::showDetailsInFixwell() const
+{
+    return settings_.objectForKey(showDetailsKey).boolean();
+}
+
+void Preferences::setShowDetailsInFixwell(bool shows)
+{
+    if (shows != showDetailsInFixwell())
+        settings_.setObjectForKey(shows, showDetailsKey);
 }
 
 }  // namespace orvane

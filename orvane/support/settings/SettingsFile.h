@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "contract/foundation/UserDefaults.h"
-#include "orvane/support/Failure.h"
+#include "contract/support/OVPreferences.h"
+#include "orvane/support/files/Failure.h"
 
 #include <filesystem>
 #include <map>
@@ -36,6 +36,20 @@ private:
     std::filesystem::path file_;
     WarningSink warn_;
     Settings settings_;
+};
+
+/// The preferences, kept in the stored settings, which must outlive this object.
+class Preferences final : public contract::OVPreferences {
+public:
+    explicit Preferences(contract::UserDefaults& settings) : settings_(settings) {}
+
+    bool showDetailsInFixwell() const override;
+    void setShowDetailsInFixwell(bool shows) override;
+    /// Whether "/" is mounted so (statvfs(3)); NO when it cannot be told.
+    bool rootVolumeIsReadOnly() const override;
+
+private:
+    contract::UserDefaults& settings_;
 };
 
 }  // namespace orvane

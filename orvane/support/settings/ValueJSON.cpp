@@ -224,7 +224,7 @@ TextStyle styleFromJSON(const json& object)
     if (const auto paragraph = object.find("paragraph"); paragraph != object.end())
         style.paragraph =
             contract::ParagraphStyle{static_cast<contract::LineBreak>(paragraph->at(0).get<int>()),
-                                    paragraph->at(1), paragraph->at(2), paragraph->at(3)};
+                                     paragraph->at(1), paragraph->at(2), paragraph->at(3)};
     return style;
 }
 

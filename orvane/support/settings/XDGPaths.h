@@ -24,7 +24,7 @@ struct XDGPaths {
     std::filesystem::path data;
 };
 
-/// Whether a base directory is somebody else's.
+/// Whether a base directory is another user's.
 using IsForeign = std::function<bool(const std::filesystem::path& directory)>;
 
 /// `accountHome` stands in when HOME is not set or foreign; a variable that is no absolute path is
@@ -33,8 +33,8 @@ using IsForeign = std::function<bool(const std::filesystem::path& directory)>;
     const EnvironmentLookup& environment, const std::filesystem::path& accountHome,
     const IsForeign& isForeign = [](const std::filesystem::path&) { return false; });
 
-/// For this process: its environment, and the home directory of its account (passwd(5)). For root, to
-/// whom an environment may have been left by another user (sudo -E), that user's directories are
+/// For this process: its environment, and the home directory of its account (passwd(5)). For root,
+/// to whom an environment may have been left by another user (sudo -E), that user's directories are
 /// foreign: what root makes in them the user could not use any more, and links in them lead root
 /// anywhere.
 [[nodiscard]] XDGPaths userXDGPaths();

@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "contract/foundation/Value.h"
 #include "orvane/support/settings/XDGPaths.h"
 
 #include <cstdint>
 #include <string>
+#include <string_view>
 
 namespace orvane {
 
@@ -19,7 +21,8 @@ namespace orvane {
 /// change with the user; people's numbers come from decimalText.
 void adoptUserLocale();
 
-/// Switches the languages of every catalogue, a list as LANGUAGE has it ("" for English). Any thread.
+/// Switches the languages of every catalogue, a list as LANGUAGE has it ("" for English). Any
+/// thread.
 void setLanguage(const std::string& languages);
 
 /// The languages in force ("lb:de"); empty for English. Any thread.
@@ -30,5 +33,11 @@ void setLanguage(const std::string& languages);
 
 /// Another number after every setLanguage. Any thread.
 [[nodiscard]] std::uint64_t languageRevision();
+
+/// A number in the decimal style of a language ("de", "de_CH", empty for English): grouped by
+/// thousands, with at most three decimals. The separators are those of the Unicode CLDR for the
+/// common languages, and English ones for any other; the system's locales are not asked, because
+/// a rescue system has none. Anything but a number reads as 0.
+[[nodiscard]] std::string decimalText(const contract::Value& number, std::string_view language);
 
 }  // namespace orvane

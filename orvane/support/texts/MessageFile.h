@@ -9,9 +9,9 @@
 namespace orvane {
 
 /// One catalogue as msgfmt(1) writes it, in UTF-8 (GNU gettext manual, 10.3 "The Format of GNU MO
-/// Files"). gettext(3) is not asked, because it translates only where the system has the user's locale
-/// installed: since glibc 2.41 not even LANGUAGE is heard under C.UTF-8, all that a rescue system has.
-/// Immutable; any thread.
+/// Files"). gettext(3) is not asked, because it translates only where the system has the user's
+/// locale installed: since glibc 2.41 not even LANGUAGE is heard under C.UTF-8, all that a rescue
+/// system has. Immutable; any thread.
 class MessageFile {
 public:
     /// None where there is no such file, or it is none of these.

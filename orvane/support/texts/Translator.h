@@ -22,7 +22,7 @@ struct Translator {
             return std::string(count == 1 ? one : many);
         };
 
-    /// The translated format filled with arguments (fixwell/host/foundation/Format.h).
+    /// The translated format filled with arguments (contract/foundation/Format.h).
     std::string sentence(std::string_view key,
                          std::initializer_list<contract::FormatArgument> arguments) const
     {

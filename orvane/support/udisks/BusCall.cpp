@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/BusCall.h"
 
-#include "orvane/support/files/FileDescriptor.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <poll.h>
 #include <sys/eventfd.h>
@@ -37,7 +37,7 @@ private:
         static_cast<void>(!::write(descriptor_.get(), &one, sizeof one));
     }
 
-    FileDescriptor descriptor_;
+    pellar::FileDescriptor descriptor_;
     std::stop_callback<std::function<void()>> callback_;
 };
 
@@ -86,8 +86,8 @@ bool processNext(sdbus::IConnection& connection)
 BusCall::BusCall(sdbus::IConnection& connection, const BusMethod& method,
                  const Arguments& arguments, milliseconds timeout)
     : connection_(connection),
-      proxy_(sdbus::createProxy(connection, BusServiceName(service),
-                                sdbus::ObjectPath(method.object)))
+      proxy_(
+          sdbus::createProxy(connection, BusServiceName(service), sdbus::ObjectPath(method.object)))
 {
     sdbus::MethodCall call = callOf(*proxy_, method);
     arguments(call);
@@ -102,8 +102,8 @@ BusCall::BusCall(sdbus::IConnection& connection, const BusMethod& method,
         timeout);
 }
 
-Answer<sdbus::MethodReply> BusCall::wait(const std::stop_token& stop,
-                                         std::optional<milliseconds> longest)
+Result<sdbus::MethodReply, Refusal> BusCall::wait(const std::stop_token& stop,
+                                                  std::optional<milliseconds> longest)
 {
     const StopDescriptor stopped(stop);
     const auto end = longest ? std::optional(Clock::now() + *longest) : std::nullopt;

@@ -45,14 +45,14 @@ public:
     /// Waits until UDisks2 has answered, the call's time is over, `longest` has passed, or the
     /// thread is asked to stop: the last two are Abandoned, and what UDisks2 does goes on. The
     /// answer borrows from the connection. Throws sdbus::Error when the bus goes away.
-    [[nodiscard]] Answer<sdbus::MethodReply> wait(
+    [[nodiscard]] Result<sdbus::MethodReply, Refusal> wait(
         const std::stop_token& stop,
         std::optional<std::chrono::milliseconds> longest = std::nullopt);
 
 private:
     sdbus::IConnection& connection_;
     std::unique_ptr<sdbus::IProxy> proxy_;
-    std::optional<Answer<sdbus::MethodReply>> answer_;
+    std::optional<Result<sdbus::MethodReply, Refusal>> answer_;
     sdbus::PendingAsyncCall pending_;
 };
 

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DirectDisks.h"
 
-#include "orvane/support/files/FileDescriptor.h"
-#include "orvane/support/udisks/MountedAt.h"
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/mounts/MountPoint.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <libmount/libmount.h>
@@ -16,7 +15,13 @@
 #include <cerrno>
 #include <memory>
 
-namespace orvane::direct {
+namespace orvane {
+
+std::vector<pellar::Mount> placesOf(const std::string& node)
+{
+    return pellar::mountsOf(std::filesystem::path(node), pellar::SystemPaths());
+}
+
 namespace {
 
 struct Free {
@@ -41,15 +46,21 @@ int errorOf(const MountContext& context, int answer)
     return error != 0 ? error : answer < 0 ? -answer : EINVAL;
 }
 
-Answer<> answerOf(int error)
+Refusal refusalOf(int error)
 {
     switch (error) {
-        case 0: return Done{};
-        case EBUSY: return Refusal{Refusal::Kind::Busy, {}};
+        case EBUSY: return {Refusal::Kind::Busy, {}};
         case EPERM:
-        case EACCES: return Refusal{Refusal::Kind::NotAllowed, {}};
-        default: return Refusal{Refusal::Kind::Other, errorText(error)};
+        case EACCES: return {Refusal::Kind::NotAllowed, {}};
+        default: return {Refusal::Kind::Other, errorText(error)};
     }
+}
+
+Result<void, Refusal> answerOf(int error)
+{
+    if (error != 0)
+        return refusalOf(error);
+    return {};
 }
 
 /// Where the table says that the device belongs; empty where it says nothing. The cache knows
@@ -66,33 +77,33 @@ std::string targetInTable(const std::string& node)
     return target != nullptr && *target == '/' ? target : "";
 }
 
-Answer<> control(const std::string& node, unsigned long request)
+Result<void, Refusal> control(const std::string& node, unsigned long request)
 {
-    const FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     return answerOf(!device || ::ioctl(device.get(), request, 0) != 0 ? errno : 0);
 }
 
 }  // namespace
 
-bool isAllowed()
+bool DirectDisks::isAllowed()
 {
     return ::geteuid() == 0;
 }
 
-Answer<> mount(const std::string& node)
+Result<void, Refusal> DirectDisks::mount(const std::string& node)
 {
     const std::string target = targetInTable(node);
     if (target.empty())
         return Refusal{Refusal::Kind::NoTable, {}};
     const MountContext context(mnt_new_context());
     if (!context)
-        return answerOf(ENOMEM);
+        return refusalOf(ENOMEM);
     // By its target alone, libmount takes the rest from the table.
     mnt_context_set_target(context.get(), target.c_str());
     return answerOf(errorOf(context, mnt_context_mount(context.get())));
 }
 
-Answer<> unmount(const std::string& node)
+Result<void, Refusal> DirectDisks::unmount(const std::string& node)
 {
     auto places = placesOf(node);
     if (places.empty())
@@ -101,35 +112,35 @@ Answer<> unmount(const std::string& node)
     for (; !places.empty(); places.pop_back()) {
         const MountContext context(mnt_new_context());
         if (!context)
-            return answerOf(ENOMEM);
+            return refusalOf(ENOMEM);
         if (isCovered(places.back(), places))
-            return answerOf(EBUSY);
+            return refusalOf(EBUSY);
         mnt_context_set_target(context.get(), places.back().target.c_str());
         if (const int error = errorOf(context, mnt_context_umount(context.get())))
-            return answerOf(error);
+            return refusalOf(error);
     }
-    return Done{};
+    return {};
 }
 
-Answer<> eject(const std::string& node)
+Result<void, Refusal> DirectDisks::eject(const std::string& node)
 {
     const auto answer = control(node, CDROMEJECT);
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    const bool isOther = refusal != nullptr && refusal->kind == Refusal::Kind::Other;
-    return isOther ? Refusal{Refusal::Kind::CannotEject, {}} : answer;
+    if (!answer && answer.error().kind == Refusal::Kind::Other)
+        return Refusal{Refusal::Kind::CannotEject, {}};
+    return answer;
 }
 
-Answer<> detachLoop(const std::string& node)
+Result<void, Refusal> DirectDisks::detachLoop(const std::string& node)
 {
     return control(node, LOOP_CLR_FD);
 }
 
-Answer<std::string> setUpLoop(int file, pellar::Access access)
+Result<std::string, Refusal> DirectDisks::setUpLoop(int file, pellar::Access access)
 {
     const auto made = pellar::setUpLoop(file, 0, 0, access, pellar::LoopLife::UntilDetached);
     if (const int* const error = std::get_if<int>(&made))
-        return std::get<Refusal>(answerOf(*error));
+        return refusalOf(*error);
     return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
 }
 
-}  // namespace orvane::direct
+}  // namespace orvane

@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/loop/HostLoop.h"
+#include "orvane/support/loop/EventLoop.h"
 #include "orvane/support/udisks/DiskRequest.h"
+#include "orvane/support/udisks/Refusal.h"
+#include "pellar/process/Command.h"
 
 #include <cstdint>
+#include <filesystem>
 #include <functional>
 #include <map>
 #include <memory>
@@ -15,9 +18,18 @@
 
 namespace orvane {
 
+/// Makes an image file a device of the system that stays until it is detached: through UDisks2, or
+/// itself where there is none and this is root. Answers the device's node. IsReadOnly where the
+/// file is to be written and this user may not; BeingUsed while a job of ours works on it, and
+/// none can begin on it until then; Attached where it is. Not on the main thread: may take minutes.
+[[nodiscard]] Result<std::string, Refusal> attachImage(const std::filesystem::path& image,
+                                                       pellar::Access access,
+                                                       const std::stop_token& stop = {});
+
 /// Does all the steps of a request through UDisks2, or itself where there is none and this is
 /// root. Not on the main thread: may take minutes. Abandoned when the thread is asked to stop.
-[[nodiscard]] Answer<> carryOut(const DiskRequest& request, const std::stop_token& stop = {});
+[[nodiscard]] Result<void, Refusal> carryOut(const DiskRequest& request,
+                                             const std::stop_token& stop = {});
 
 /// Mounts, unmounts and ejects behind the main thread's back. Main thread.
 class DiskOperations {
@@ -26,10 +38,10 @@ public:
     using Finished = std::function<void(const std::vector<std::string>& failures)>;
 
     /// The loop outlives this object; `texts` too.
-    DiskOperations(HostLoop& loop, const Translator& texts) : loop_(loop), texts_(texts) {}
+    DiskOperations(EventLoop& loop, const Translator& texts) : loop_(loop), texts_(texts) {}
     DiskOperations(const DiskOperations&) = delete;
     DiskOperations& operator=(const DiskOperations&) = delete;
-    /// Waits for nobody's password: what UDisks2 has been asked for, it goes on with alone. What
+    /// Does not wait for a password: what UDisks2 has been asked for, it goes on with alone. What
     /// this process does itself is brought to its end.
     ~DiskOperations();
 
@@ -40,9 +52,9 @@ public:
     [[nodiscard]] bool isUnderWay(const std::string& identifier) const;
 
 private:
-    struct Result {
+    struct Answer {
         DiskRequest request;
-        Answer<> answer;
+        Result<void, Refusal> answer;
     };
     struct Running {
         std::vector<std::string> identifiers;
@@ -51,11 +63,11 @@ private:
     };
     using Number = std::uint64_t;
 
-    static std::vector<Result> carryOutAll(const std::vector<DiskRequest>& requests,
+    static std::vector<Answer> carryOutAll(const std::vector<DiskRequest>& requests,
                                            const std::stop_token& stop);
-    void finish(Number number, const std::vector<Result>& results);
+    void finish(Number number, const std::vector<Answer>& answers);
 
-    HostLoop& loop_;
+    EventLoop& loop_;
     const Translator& texts_;
     Number latest_ = 0;
     /// Handed to the task that reports back, which finds it empty when this object has gone.

@@ -42,10 +42,9 @@ std::vector<DiskTree> DiskReader::read(const DiskSources& sources)
     udisks.askForFailingDrives();
     auto disks = readSystemDisks(sources);
     const auto answer = udisks.failingDrives(failing_ ? longestWait : longestFirstWait);
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    if (refusal == nullptr)
-        failing_ = std::get<std::set<std::string>>(answer);
-    else if (!failing_ || refusal->kind != Refusal::Kind::Abandoned)
+    if (answer)
+        failing_ = *answer;
+    else if (!failing_ || answer.error().kind != Refusal::Kind::Abandoned)
         failing_.emplace();
     markFailing(disks, *failing_);
     return disks;

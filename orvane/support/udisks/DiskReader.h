@@ -13,8 +13,8 @@ namespace orvane {
 /// time.
 class DiskReader {
 public:
-    /// As readSystemDisks. UDisks2 is asked before the disks are read, and waited for after that: the
-    /// first time three seconds at most, for it may have to be started, later 50 ms. When it is
+    /// As readSystemDisks. UDisks2 is asked before the disks are read, and waited for after that:
+    /// the first time three seconds at most, for it may have to be started, later 50 ms. When it is
     /// late, what it said the last time stands.
     [[nodiscard]] std::vector<DiskTree> read(const DiskSources& sources);
 

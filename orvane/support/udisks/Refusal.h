@@ -1,12 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/Failure.h"
+#include "orvane/support/files/Failure.h"
 #include "orvane/support/texts/Translator.h"
 
 #include <string>
 #include <string_view>
-#include <variant>
 
 namespace orvane {
 
@@ -31,7 +30,7 @@ struct Refusal {
         IsWhole,      ///< it has volumes, and is none
         IsNoLoop,     ///< a device that no image is behind
         HasGone,
-        Lingers,     ///< it goes when nobody has it open any more
+        Lingers,     ///< it goes when it is open no more
         Attached,    ///< an image that is attached already; `detail` names the device
         BeingUsed,   ///< an image that is being verified or repaired
         IsReadOnly,  ///< an image that this user may not write to
@@ -43,9 +42,6 @@ struct Refusal {
 
     friend bool operator==(const Refusal&, const Refusal&) = default;
 };
-
-template <class T = Done>
-using Answer = std::variant<T, Refusal>;
 
 /// What an error that came over the bus means. Its name and text are from outside: any bytes.
 [[nodiscard]] Refusal refusalOf(std::string_view errorName, std::string_view errorText);

@@ -2,14 +2,16 @@
 #include "orvane/support/udisks/UDisks.h"
 
 #include "orvane/support/udisks/BusCall.h"
-#include "orvane/support/udisks/DriveHealth.h"
-#include "orvane/support/udisks/MountedAt.h"
+#include "orvane/support/udisks/DirectDisks.h"
 
+#include <algorithm>
 #include <map>
+#include <type_traits>
 #include <utility>
 #include <vector>
 
 namespace orvane {
+
 namespace {
 
 using namespace std::chrono_literals;
@@ -17,6 +19,7 @@ using Options = std::map<std::string, sdbus::Variant>;
 using Properties = std::map<std::string, sdbus::Variant>;
 using Objects = std::map<sdbus::ObjectPath, std::map<std::string, Properties>>;
 
+const std::string interfaces = "org.freedesktop.UDisks2.";
 constexpr const char* root = "/org/freedesktop/UDisks2";
 constexpr const char* manager = "/org/freedesktop/UDisks2/Manager";
 constexpr std::chrono::milliseconds questionTime = 25s;
@@ -28,20 +31,29 @@ Options interactive()
     return {{"auth.no_user_interaction", sdbus::Variant(false)}};
 }
 
-Refusal noService()
-{
-    return {Refusal::Kind::NoService, {}};
-}
-
-// No exception of the bus's library leaves this file.
+// No exception leaves this file, neither one of the bus's library nor a Refusal.
 template <class Function>
-auto answered(Function&& function) -> decltype(function())
+auto answerOf(Function&& function) -> Result<decltype(function()), Refusal>
 {
     try {
-        return function();
+        if constexpr (std::is_void_v<decltype(function())>) {
+            function();
+            return {};
+        } else {
+            return function();
+        }
+    } catch (const Refusal& refusal) {
+        return refusal;
     } catch (const sdbus::Error& error) {
         return refusalOf(error.getName(), error.getMessage());
     }
+}
+
+sdbus::MethodReply replyIn(Result<sdbus::MethodReply, Refusal> answer)
+{
+    if (!answer)
+        throw answer.error();
+    return *std::move(answer);
 }
 
 template <class T>
@@ -63,37 +75,47 @@ std::string fileName(const std::vector<std::uint8_t>& bytes)
 
 const Properties* interfaceOf(const std::map<std::string, Properties>& object, const char* name)
 {
-    const auto found = object.find(std::string("org.freedesktop.UDisks2.") + name);
+    const auto found = object.find(interfaces + name);
     return found != object.end() ? &found->second : nullptr;
 }
 
-DriveFacts driveFacts(const sdbus::ObjectPath& path,
-                      const std::map<std::string, Properties>& object)
+DriveHealth healthOf(const std::map<std::string, Properties>& object)
 {
-    DriveFacts drive{path, {}, {}};
-    if (const auto* const ata = interfaceOf(object, "Drive.Ata"))
-        drive.ata = {valueOf<std::uint64_t>(*ata, "SmartUpdated", 0),
-                     valueOf(*ata, "SmartFailing", false)};
+    DriveHealth drive;
+    if (const auto* const ata = interfaceOf(object, "Drive.Ata")) {
+        drive.smartUpdated = valueOf<std::uint64_t>(*ata, "SmartUpdated", 0);
+        drive.isSmartFailing = valueOf(*ata, "SmartFailing", false);
+    }
     // Since UDisks2 2.10.
     if (const auto* const nvme = interfaceOf(object, "NVMe.Controller"))
         drive.nvmeWarnings = valueOf(*nvme, "SmartCriticalWarning", std::vector<std::string>());
     return drive;
 }
 
+/// The nodes of those devices, whole or parts, whose drive is failing.
 std::set<std::string> failingNodes(const Objects& objects)
 {
-    std::vector<DriveFacts> drives;
-    std::vector<DeviceOfDrive> devices;
+    std::set<std::string> nodes;
     for (const auto& [path, object] : objects) {
-        drives.push_back(driveFacts(path, object));
-        if (const auto* const block = interfaceOf(object, "Block"))
-            devices.push_back({fileName(valueOf(*block, "Device", std::vector<std::uint8_t>())),
-                               valueOf(*block, "Drive", sdbus::ObjectPath("/"))});
+        const auto* const block = interfaceOf(object, "Block");
+        const auto drive = block != nullptr
+                               ? objects.find(valueOf(*block, "Drive", sdbus::ObjectPath("/")))
+                               : objects.end();
+        if (drive != objects.end() && isFailing(healthOf(drive->second)))
+            nodes.insert(fileName(valueOf(*block, "Device", std::vector<std::uint8_t>())));
     }
-    return failingDevices(drives, devices);
+    return nodes;
 }
 
 }  // namespace
+
+bool isFailing(const DriveHealth& drive)
+{
+    const auto& warnings = drive.nvmeWarnings;
+    return (drive.smartUpdated != 0 && drive.isSmartFailing) ||
+           std::any_of(warnings.begin(), warnings.end(),
+                       [](const std::string& warning) { return warning != "temperature"; });
+}
 
 UDisks::UDisks(std::stop_token stop) : stop_(std::move(stop))
 {
@@ -106,134 +128,98 @@ UDisks::UDisks(std::stop_token stop) : stop_(std::move(stop))
 
 UDisks::~UDisks() = default;
 
-Answer<std::string> UDisks::objectOf(const std::string& node)
+template <class Value>
+Value UDisks::ask(const BusMethod& method, const BusCall::Arguments& arguments,
+                  std::chrono::milliseconds time)
 {
     if (!connection_)
-        return noService();
-    return answered([&]() -> Answer<std::string> {
-        BusCall call(
-            *connection_, {manager, "org.freedesktop.UDisks2.Manager", "ResolveDevice"},
-            [&](sdbus::MethodCall& arguments) {
-                arguments << Options{{"path", sdbus::Variant(node)}} << Options{};
-            },
-            questionTime);
-        auto reply = call.wait(stop_);
-        if (auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
-        std::vector<sdbus::ObjectPath> objects;
-        std::get<sdbus::MethodReply>(reply) >> objects;
-        if (objects.empty())
-            return Refusal{Refusal::Kind::UnknownDevice, {}};
-        return std::string(objects.front());
-    });
+        throw Refusal{Refusal::Kind::NoService, {}};
+    BusCall call(*connection_, method, arguments, time);
+    auto reply = replyIn(call.wait(stop_));
+    Value value;
+    reply >> value;
+    return value;
 }
 
-Answer<sdbus::Variant> UDisks::property(const std::string& object, const char* interface,
-                                        const char* name)
+std::string UDisks::objectOf(const std::string& node)
 {
-    return answered([&]() -> Answer<sdbus::Variant> {
-        BusCall question(
-            *connection_, {object, "org.freedesktop.DBus.Properties", "Get"},
-            [&](sdbus::MethodCall& arguments) {
-                arguments << std::string("org.freedesktop.UDisks2.") +
-                                 interface << std::string(name);
-            },
-            questionTime);
-        auto reply = question.wait(stop_);
-        if (const auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
-        sdbus::Variant value;
-        std::get<sdbus::MethodReply>(reply) >> value;
-        return value;
-    });
+    const auto objects = ask<std::vector<sdbus::ObjectPath>>(
+        {manager, "org.freedesktop.UDisks2.Manager", "ResolveDevice"},
+        [&](sdbus::MethodCall& arguments) {
+            arguments << Options{{"path", sdbus::Variant(node)}} << Options{};
+        },
+        questionTime);
+    if (objects.empty())
+        throw Refusal{Refusal::Kind::UnknownDevice, {}};
+    return objects.front();
 }
 
-Answer<> UDisks::callObject(const std::string& object, const char* interface, const char* method)
+sdbus::Variant UDisks::property(const std::string& object, const char* interface, const char* name)
 {
-    return answered([&]() -> Answer<> {
-        BusCall call(
-            *connection_, {object, std::string("org.freedesktop.UDisks2.") + interface, method},
-            [](sdbus::MethodCall& arguments) { arguments << interactive(); }, operationTime);
-        const auto reply = call.wait(stop_);
-        if (const auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
-        return Done{};
-    });
+    return ask<sdbus::Variant>(
+        {object, "org.freedesktop.DBus.Properties", "Get"},
+        [&](sdbus::MethodCall& arguments) {
+            arguments << interfaces + interface << std::string(name);
+        },
+        questionTime);
 }
 
-Answer<> UDisks::call(const std::string& node, const char* interface, const char* method)
+void UDisks::callObject(const std::string& object, const char* interface, const char* method)
 {
-    const auto object = objectOf(node);
-    if (const auto* const refusal = std::get_if<Refusal>(&object))
-        return *refusal;
-    return callObject(std::get<std::string>(object), interface, method);
+    BusCall call(
+        *connection_, {object, interfaces + interface, method},
+        [](sdbus::MethodCall& arguments) { arguments << interactive(); }, operationTime);
+    replyIn(call.wait(stop_));
 }
 
-Answer<> UDisks::mount(const std::string& node)
+void UDisks::call(const std::string& node, const char* interface, const char* method)
 {
-    return call(node, "Filesystem", "Mount");
+    callObject(objectOf(node), interface, method);
+}
+
+Result<void, Refusal> UDisks::mount(const std::string& node)
+{
+    return answerOf([&] { call(node, "Filesystem", "Mount"); });
 }
 
 // UDisks2 unmounts one place with each call.
-Answer<> UDisks::unmount(const std::string& node)
+Result<void, Refusal> UDisks::unmount(const std::string& node)
 {
-    Answer<> answer = call(node, "Filesystem", "Unmount");
-    for (auto left = placesOf(node).size(); left > 0 && answer.index() == 0; --left)
-        answer = call(node, "Filesystem", "Unmount");
-    return answer;
+    return answerOf([&] {
+        call(node, "Filesystem", "Unmount");
+        for (auto left = placesOf(node).size(); left > 0; --left)
+            call(node, "Filesystem", "Unmount");
+    });
 }
 
-Answer<> UDisks::detachLoop(const std::string& node)
+Result<void, Refusal> UDisks::detachLoop(const std::string& node)
 {
-    return call(node, "Loop", "Delete");
+    return answerOf([&] { call(node, "Loop", "Delete"); });
 }
 
-Answer<std::string> UDisks::setUpLoop(int file, pellar::Access access)
+Result<std::string, Refusal> UDisks::setUpLoop(int file, pellar::Access access)
 {
-    if (!connection_)
-        return noService();
-    sdbus::ObjectPath object;
-    const auto made = answered([&]() -> Answer<> {
-        BusCall call(
-            *connection_, {manager, "org.freedesktop.UDisks2.Manager", "LoopSetup"},
+    return answerOf([&] {
+        const auto object = ask<sdbus::ObjectPath>(
+            {manager, "org.freedesktop.UDisks2.Manager", "LoopSetup"},
             [&](sdbus::MethodCall& arguments) {
                 Options options = interactive();
                 options["read-only"] = sdbus::Variant(access == pellar::Access::ReadOnly);
                 arguments << sdbus::UnixFd(file) << options;
             },
             operationTime);
-        auto reply = call.wait(stop_);
-        if (const auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
-        std::get<sdbus::MethodReply>(reply) >> object;
-        return Done{};
-    });
-    if (const auto* const refusal = std::get_if<Refusal>(&made))
-        return *refusal;
-    const auto device = property(object, "Block", "Device");
-    if (const auto* const refusal = std::get_if<Refusal>(&device))
-        return *refusal;
-    return answered([&]() -> Answer<std::string> {
-        return fileName(std::get<sdbus::Variant>(device).get<std::vector<std::uint8_t>>());
+        return fileName(property(object, "Block", "Device").get<std::vector<std::uint8_t>>());
     });
 }
 
-Answer<> UDisks::eject(const std::string& node)
+Result<void, Refusal> UDisks::eject(const std::string& node)
 {
-    const auto object = objectOf(node);
-    if (const auto* const refusal = std::get_if<Refusal>(&object))
-        return *refusal;
-    const auto value = property(std::get<std::string>(object), "Block", "Drive");
-    if (const auto* const refusal = std::get_if<Refusal>(&value))
-        return *refusal;
-    const auto drive = answered([&]() -> Answer<std::string> {
-        return std::string(std::get<sdbus::Variant>(value).get<sdbus::ObjectPath>());
+    return answerOf([&] {
+        const auto drive = property(objectOf(node), "Block", "Drive").get<sdbus::ObjectPath>();
+        if (drive == "/")
+            throw Refusal{Refusal::Kind::CannotEject, {}};
+        callObject(drive, "Drive", "Eject");
     });
-    if (const auto* const refusal = std::get_if<Refusal>(&drive))
-        return *refusal;
-    const auto& path = std::get<std::string>(drive);
-    return path == "/" ? Refusal{Refusal::Kind::CannotEject, {}}
-                       : callObject(path, "Drive", "Eject");
 }
 
 void UDisks::askForFailingDrives()
@@ -250,16 +236,14 @@ void UDisks::askForFailingDrives()
     }
 }
 
-Answer<std::set<std::string>> UDisks::failingDrives(std::chrono::milliseconds longest)
+Result<std::set<std::string>, Refusal> UDisks::failingDrives(std::chrono::milliseconds longest)
 {
-    if (!health_)
-        return noService();
-    return answered([&]() -> Answer<std::set<std::string>> {
-        auto reply = health_->wait(stop_, longest);
-        if (const auto* const refusal = std::get_if<Refusal>(&reply))
-            return *refusal;
+    return answerOf([&] {
+        if (!health_)
+            throw Refusal{Refusal::Kind::NoService, {}};
+        auto reply = replyIn(health_->wait(stop_, longest));
         Objects objects;
-        std::get<sdbus::MethodReply>(reply) >> objects;
+        reply >> objects;
         return failingNodes(objects);
     });
 }

@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/UTF8.h"
+#include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/DiskOperations.h"
-#include "orvane/support/udisks/ImageDevices.h"
-#include "orvane/support/udisks/MountedAt.h"
 #include "orvane/terminal/ExitStatus.h"
 #include "orvane/terminal/commands/Commands.h"
 #include "pellar/disks/LoopDevice.h"
@@ -60,10 +59,9 @@ auto askingFor(const Function& function, Session& session)
     return answer;
 }
 
-bool isAsWanted(const Answer<>& answer)
+bool isAsWanted(const Result<void, Refusal>& answer)
 {
-    const auto* const refusal = std::get_if<Refusal>(&answer);
-    return refusal == nullptr || refusal->kind == Refusal::Kind::AlreadySo;
+    return answer || answer.error().kind == Refusal::Kind::AlreadySo;
 }
 
 int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Reporter& reporter)
@@ -71,10 +69,10 @@ int doTo(const NamedDisk& named, const ActionText& texts, Session& session, Repo
     const Translator& translator = session.host().translator();
     const DiskRequest request = requestFor(texts.action, *named.disk);
     const auto objection = objectionTo(texts.action, *named.disk);
-    const Answer<> answer =
-        objection ? Answer<>(*objection) : askingFor([&] { return carryOut(request); }, session);
+    const auto answer = objection ? Result<void, Refusal>(*objection)
+                                  : askingFor([&] { return carryOut(request); }, session);
     if (!isAsWanted(answer)) {
-        reporter.failure(named.name, failureText(request, std::get<Refusal>(answer), translator));
+        reporter.failure(named.name, failureText(request, answer.error(), translator));
         return exitUnchecked;
     }
     const std::string place =
@@ -102,14 +100,14 @@ int runAttach(const Request& request, Session& session, Reporter& reporter)
     int status = exitSound;
     for (const std::string& name : request.disks) {
         const auto answer = askingFor([&] { return attachImage(name, access); }, session);
-        if (const auto* const refusal = std::get_if<Refusal>(&answer)) {
+        if (!answer) {
             reporter.failure(
-                name, failureText(requestToAttach(name), *refusal, session.host().translator()));
+                name, failureText(requestToAttach(name), answer.error(), session.host().translator()));
             status |= exitUnchecked;
             continue;
         }
         // The device alone, for scripts.
-        const auto& node = std::get<std::string>(answer);
+        const auto& node = *answer;
         reporter.done(name, "attach", node, node);
     }
     return status;

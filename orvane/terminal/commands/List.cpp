@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/UTF8.h"
 #include "orvane/jobs/LastRuns.h"
-#include "orvane/support/disks/DiskTypes.h"
+#include "orvane/support/disks/DiskFacts.h"
 #include "orvane/terminal/commands/ActionButtons.h"
 #include "orvane/terminal/commands/Commands.h"
 #include "orvane/terminal/commands/LocalTime.h"

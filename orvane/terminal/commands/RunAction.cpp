@@ -128,12 +128,12 @@ std::vector<NamedDisk> findDisks(const std::vector<std::string>& names, Session&
     std::vector<NamedDisk> disks;
     for (const std::string& name : names) {
         auto found = session.findDisk(meant != nullptr ? meant(name) : name);
-        if (failed(found)) {
-            reporter.failure(name, failureMessage(found));
+        if (!found) {
+            reporter.failure(name, found.error().message);
             status |= exitUnchecked;
             continue;
         }
-        disks.push_back({name, std::get<std::shared_ptr<Disk>>(std::move(found))});
+        disks.push_back({name, *std::move(found)});
     }
     return disks;
 }

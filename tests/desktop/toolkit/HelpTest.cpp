@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/availability/Reasons.h"
+#include "fixwell/availability/ButtonDecision.h"
 #include "orvane/desktop/toolkit/QtHelp.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/texts/ModuleBundle.h"
 #include "tests/module/FakeHost.h"
 
 #include <QFile>

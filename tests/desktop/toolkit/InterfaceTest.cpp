@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
-#include "orvane/support/texts/ModuleBundle.h"
 #include "tests/desktop/toolkit/ToolkitFixture.h"
 
 #include <QFile>
