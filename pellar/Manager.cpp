@@ -5,7 +5,6 @@
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapOutcome.h"
 #include "pellar/tools/Capability.h"
-#include "pellar/tools/LiveVerification.h"
 
 #include <unistd.h>
 
@@ -13,7 +12,7 @@
 
 namespace pellar {
 
-Manager::Manager(contract::RunLoop& loop, const Texts& texts, ManagerOptions options)
+Manager::Manager(contract::RunLoop& loop, const Texts& texts, JobOptions options)
     : loop_(loop), texts_(texts), options_(std::move(options))
 {
 }

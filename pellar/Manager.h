@@ -3,9 +3,9 @@
 
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/PLRepairDisk.h"
-#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobOptions.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/texts/Texts.h"
-#include "pellar/tools/Operation.h"
 
 #include <memory>
 #include <string>
@@ -19,7 +19,7 @@ class RepairDisk;
 /// loop and the texts outlive the manager.
 class Manager final : public contract::PLManager {
 public:
-    Manager(contract::RunLoop& loop, const Texts& texts, ManagerOptions options = {});
+    Manager(contract::RunLoop& loop, const Texts& texts, JobOptions options = {});
 
     void setDelegate(contract::PLAsyncDelegate* delegate) override { delegate_ = delegate; }
     /// Null when there is no delegate yet.
@@ -48,7 +48,7 @@ public:
 private:
     contract::RunLoop& loop_;
     const Texts& texts_;
-    const ManagerOptions options_;
+    const JobOptions options_;
     contract::PLAsyncDelegate* delegate_ = nullptr;  // not owned
     std::weak_ptr<RepairDisk*> latest_;
 };

@@ -3,13 +3,13 @@
 
 #include "contract/foundation/UTF8.h"
 #include "pellar/jobs/JobObserver.h"
-#include "pellar/jobs/JobScript.h"
-#include "pellar/jobs/LiveScript.h"
-#include "pellar/jobs/MapScript.h"
+#include "pellar/jobs/LiveVolumeScript.h"
 #include "pellar/jobs/PartOfImageScript.h"
+#include "pellar/jobs/PartitionMapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/jobs/VolumeScript.h"
+#include "pellar/packages/InstalledSystem.h"
 #include "pellar/partitions/MapDisk.h"
-#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
 
@@ -17,6 +17,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <memory>
 #include <utility>
 #include <variant>
 
@@ -31,19 +32,28 @@ bool isVolume(const DiskReferencePointer& disk)
     return disk && !disk->path.empty() && !disk->isWhole;
 }
 
-/// Whether a device may be neither opened as the operation must, nor unmounted, by this user; and
-/// whether installed files are to be changed. Nobody is asked for a password merely to look at the
+/// Whether a device may be neither opened as the task must, nor unmounted, by this user; and
+/// whether installed files are to be changed. No password is asked for merely to look at the
 /// files of a volume that is mounted: what this user may not see of it is counted and said.
-bool needsPrivileges(Subject subject, const contract::DiskReference& disk, Operation operation,
-                     const SystemPaths& paths)
+bool needsPrivileges(Task task, const contract::DiskReference& disk, const SystemPaths& paths)
 {
     struct stat status = {};
     if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return false;
-    if (subject == Subject::Permissions)
-        return operation == Operation::Repair;
-    const int wanted = operation == Operation::Verify ? R_OK : R_OK | W_OK;
-    return ::access(disk.path.c_str(), wanted) != 0 || !mountPlacesOf(disk.path, paths).empty();
+    if (task.subject == Subject::Permissions)
+        return task.isRepair();
+    return ::access(disk.path.c_str(), task.isRepair() ? R_OK | W_OK : R_OK) != 0 ||
+           !mountsOf(status.st_rdev, paths).empty();
+}
+
+/// Whether the directory lies on what is mounted at one of the places.
+bool holdsDirectory(const std::vector<Mount>& places, const std::filesystem::path& directory,
+                    const SystemPaths& paths)
+{
+    const auto holder = mountHolding(currentMounts(paths), directory);
+    return holder && std::any_of(places.begin(), places.end(), [&](const Mount& place) {
+               return place.target == holder->target;
+           });
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -55,7 +65,7 @@ bool answer(bool value, ErrorCode* error)
 
 }  // namespace
 
-RepairDisk::RepairDisk(contract::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
+RepairDisk::RepairDisk(contract::RunLoop& loop, const Texts& texts, const JobOptions& options,
                        contract::PLAsyncDelegate& delegate)
     : loop_(loop), texts_(texts), options_(options), delegate_(delegate)
 {
@@ -63,32 +73,32 @@ RepairDisk::RepairDisk(contract::RunLoop& loop, const Texts& texts, const Manage
 
 ErrorCode RepairDisk::beginStoragesystemFilesystemVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::Filesystem, Operation::Verify);
+    return begin({Subject::Filesystem, Operation::Verify}, disk);
 }
 
 ErrorCode RepairDisk::beginStoragesystemFilesystemRepairForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::Filesystem, Operation::Repair);
+    return begin({Subject::Filesystem, Operation::Repair}, disk);
 }
 
 ErrorCode RepairDisk::beginPermissionsVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::Permissions, Operation::Verify);
+    return begin({Subject::Permissions, Operation::Verify}, disk);
 }
 
 ErrorCode RepairDisk::beginPermissionsRepairForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::Permissions, Operation::Repair);
+    return begin({Subject::Permissions, Operation::Repair}, disk);
 }
 
 ErrorCode RepairDisk::beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::PartitionMap, Operation::Verify);
+    return begin({Subject::PartitionMap, Operation::Verify}, disk);
 }
 
 ErrorCode RepairDisk::beginPartitionMapRepairForDisk(const DiskReferencePointer& disk)
 {
-    return begin(disk, Subject::PartitionMap, Operation::Repair);
+    return begin({Subject::PartitionMap, Operation::Repair}, disk);
 }
 
 bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error)
@@ -97,7 +107,7 @@ bool RepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer& disk, 
     // What this user may not read is looked at when the job has the right to.
     const bool isUnknown =
         isDisk && options_.privileged &&
-        needsPrivileges(Subject::PartitionMap, *disk, Operation::Verify, options_.systemPaths);
+        needsPrivileges({Subject::PartitionMap, Operation::Verify}, *disk, options_.systemPaths);
     return answer(isUnknown || (isDisk && glanceAtMap(*disk).kind != PartitionMap::Kind::None),
                   error);
 }
@@ -122,48 +132,57 @@ void RepairDisk::cancelCurrentOperation()
         job_->stop();
 }
 
-ErrorCode RepairDisk::begin(const DiskReferencePointer& disk, Subject subject, Operation operation)
+ErrorCode RepairDisk::begin(Task task, const DiskReferencePointer& disk)
 {
     JobObserver* const observer = options_.observer;
     if (observer != nullptr)
-        observer->jobWillBegin(disk, subject, operation);
-    const ErrorCode error = subject == Subject::Filesystem    ? beginFilesystem(disk, operation)
-                            : subject == Subject::Permissions ? beginPermissions(disk, operation)
-                                                              : beginPartitionMap(disk, operation);
+        observer->jobWillBegin(disk, task);
+    const ErrorCode error = beginUnobserved(task, disk);
     if (observer != nullptr && error != contract::kPLNoError)
         observer->jobDidNotBegin(disk, error);
     return error;
 }
 
-ErrorCode RepairDisk::beginFilesystem(const DiskReferencePointer& disk, Operation operation)
+ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& disk)
 {
-    if (const ErrorCode error = refusal(disk, operation))
+    if (const ErrorCode error = refusal(task, disk))
         return error;
-    if (beginPrivileged(Subject::Filesystem, disk, operation))
+    if (beginPrivileged(task, disk))
         return contract::kPLNoError;
-    const Access access = operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
-    auto claim = DiskClaim::attempt(*disk, access, options_.systemPaths);
+    switch (task.subject) {
+        case Subject::Filesystem: return beginVolume(disk, task.operation);
+        // The disk is claimed by the job: why it cannot be had is then said in the log, where a
+        // refusal to begin says nothing.
+        case Subject::PartitionMap: startScript<PartitionMapScript>(disk, task.operation); break;
+        // The volume stays mounted, and need not be claimed: its files are what is looked at.
+        case Subject::Permissions: startScript<PermissionsScript>(disk, task.operation); break;
+    }
+    return contract::kPLNoError;
+}
+
+ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation operation)
+{
+    auto claim = DiskClaim::attempt(*disk, accessFor(operation), options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
-    JobRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
-    // Nobody waits on the main thread: a device that is locked is claimed by the job.
+    VolumeRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
+    // The main thread does not wait: a device that is locked is claimed by the job.
     if (auto* const taken = std::get_if<DiskClaim>(&claim))
         request.claim.emplace(std::move(*taken));
     startVolume(std::move(request));
     return contract::kPLNoError;
 }
 
-/// NO when the job needs nobody's help, or there is none.
-bool RepairDisk::beginPrivileged(Subject subject, const DiskReferencePointer& disk,
-                                 Operation operation)
+/// NO when the job needs no other rights, or there is no way to them.
+bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
 {
-    if (!options_.privileged || !needsPrivileges(subject, *disk, operation, options_.systemPaths))
+    if (!options_.privileged || !needsPrivileges(task, *disk, options_.systemPaths))
         return false;
     const auto& isAllowed = options_.archiveFetching.isAllowed;
-    const bool fetches = subject == Subject::Permissions && isAllowed && isAllowed();
-    const PrivilegedJob job{subject, operation, *disk, nullptr, fetches};
-    start(disk, [job, this](StopSwitch& stop, EventRoad& road) {
-        return options_.privileged(job, stop, road);
+    const bool fetches = task.subject == Subject::Permissions && isAllowed && isAllowed();
+    const PrivilegedJob job{task, *disk, nullptr, fetches};
+    start(disk, [job, this](StopSwitch& stop, EventQueue& events) {
+        return options_.privileged(job, stop, events);
     });
     return true;
 }
@@ -175,13 +194,13 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
 {
     if (error != contract::kPLErrorCouldNotUnmount && error != contract::kPLErrorDiskInUse)
         return error;
-    auto mounts = mountPlacesOf(disk->path, options_.systemPaths);
+    auto mounts = mountsOf(disk->path, options_.systemPaths);
     const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
-                                    [](const MountPlace& place) { return place.target == "/"; });
+                                    [](const Mount& place) { return place.target == "/"; });
     const bool staysMounted =
         isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
-        startLive(disk, mounts);
+        startScript<LiveVolumeScript>(disk, mounts);
     else if (mounts.empty() || isRoot)
         return error;
     else
@@ -189,91 +208,81 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     return contract::kPLNoError;
 }
 
-void RepairDisk::startLive(const DiskReferencePointer& disk, const std::vector<MountPlace>& mounts)
+template <class JobScript, class Argument>
+void RepairDisk::startScript(const DiskReferencePointer& disk, const Argument& argument)
 {
-    start(disk, [disk, mounts, this](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<LiveScript>(disk, mounts, options_, texts_, stop, road);
+    start(disk, [=, this](StopSwitch& stop, EventQueue& events) {
+        return std::make_unique<JobScript>(disk, argument, context(*disk, stop, events));
     });
 }
 
 // A script maker can be copied, a claim cannot.
-void RepairDisk::startVolume(JobRequest request)
+void RepairDisk::startVolume(VolumeRequest request)
 {
     const auto disk = request.disk;
-    const auto shared = std::make_shared<JobRequest>(std::move(request));
-    start(disk, [this, shared](StopSwitch& stop, EventRoad& road) -> std::unique_ptr<Script> {
+    const auto shared = std::make_shared<VolumeRequest>(std::move(request));
+    start(disk, [=, this](StopSwitch& stop, EventQueue& events) -> std::unique_ptr<Script> {
         if (isPartThatOthersAttach(*shared))
-            return std::make_unique<PartOfImageScript>(std::move(*shared), options_, texts_, stop,
-                                                       road);
-        return std::make_unique<JobScript>(std::move(*shared), options_, texts_, stop, road);
+            return std::make_unique<PartOfImageScript>(std::move(*shared),
+                                                       context(*disk, stop, events));
+        return std::make_unique<VolumeScript>(std::move(*shared), context(*disk, stop, events));
     });
 }
 
+JobContext RepairDisk::context(const contract::DiskReference& disk, StopSwitch& stop,
+                               EventQueue& events) const
+{
+    return {disk, options_, texts_, stop, events};
+}
+
 /// The user may not attach it, but others may.
-bool RepairDisk::isPartThatOthersAttach(const JobRequest& request) const
+bool RepairDisk::isPartThatOthersAttach(const VolumeRequest& request) const
 {
     return ::geteuid() != 0 && options_.privileged && request.claim &&
            !request.claim->isBlockDevice() && !request.claim->isAllOfIt();
 }
 
-// The disk is claimed by the job: why it cannot be had is then said in the log, where a refusal to
-// begin says nothing.
-ErrorCode RepairDisk::beginPartitionMap(const DiskReferencePointer& disk, Operation operation)
-{
-    if (job_)
-        return contract::kPLErrorBusy;
-    if (!disk || disk->path.empty())
-        return contract::kPLErrorNoDiskReference;
-    if (!disk->isWhole)
-        return contract::kPLErrorUnsupported;
-    if (beginPrivileged(Subject::PartitionMap, disk, operation))
-        return contract::kPLNoError;
-    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<MapScript>(disk, operation, options_, texts_, stop, road);
-    });
-    return contract::kPLNoError;
-}
-
-// The volume stays mounted, and need not be claimed: its files are what is looked at.
-ErrorCode RepairDisk::beginPermissions(const DiskReferencePointer& disk, Operation operation)
-{
-    if (job_)
-        return contract::kPLErrorBusy;
-    if (!disk || disk->path.empty())
-        return contract::kPLErrorNoDiskReference;
-    if (disk->isWhole || disk->mountPoint.empty() ||
-        installedSystemAt(disk->mountPoint) == PackageDatabase::None) {
-        if (options_.commandTrace)
-            options_.commandTrace(
-                texts_.text("the volume is not mounted as the root of a system with a package "
-                            "database that is known here"));
-        return contract::kPLErrorUnsupported;
-    }
-    if (beginPrivileged(Subject::Permissions, disk, operation))
-        return contract::kPLNoError;
-    start(disk, [disk, operation, this](StopSwitch& stop, EventRoad& road) {
-        return std::make_unique<PermissionsScript>(disk, operation, options_, texts_, stop, road);
-    });
-    return contract::kPLNoError;
-}
-
 /// What can be said without touching the disk.
-ErrorCode RepairDisk::refusal(const DiskReferencePointer& disk, Operation operation) const
+ErrorCode RepairDisk::refusal(Task task, const DiskReferencePointer& disk) const
 {
     if (job_)
         return contract::kPLErrorBusy;
     if (!disk || disk->path.empty())
         return contract::kPLErrorNoDiskReference;
-    if (disk->isWhole)
+    if (task.subject == Subject::Permissions)
+        return refusalOfPermissions(*disk);
+    if (disk->isWhole != (task.subject == Subject::PartitionMap))
         return contract::kPLErrorUnsupported;
-    if (disk->filesystem.empty())
+    if (task.subject == Subject::Filesystem)
+        traceTool(*disk, task.operation);
+    return contract::kPLNoError;
+}
+
+ErrorCode RepairDisk::refusalOfPermissions(const contract::DiskReference& disk) const
+{
+    if (!disk.isWhole && !disk.mountPoint.empty() &&
+        installedSystemAt(disk.mountPoint) != PackageDatabase::None)
         return contract::kPLNoError;
-    const Capability capability = capabilityFor(disk->filesystem, operation, options_.toolPath);
+    trace(
+        texts_.text("the volume is not mounted as the root of a system with a package "
+                    "database that is known here"));
+    return contract::kPLErrorUnsupported;
+}
+
+/// Where there is none, the job itself says why.
+void RepairDisk::traceTool(const contract::DiskReference& disk, Operation operation) const
+{
+    if (disk.filesystem.empty())
+        return;
+    const Capability capability = capabilityFor(disk.filesystem, operation, options_.toolPath);
+    trace(contract::printable(disk.filesystem) + ": " +
+          (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
+}
+
+void RepairDisk::trace(const std::string& line) const
+{
     if (options_.commandTrace)
-        options_.commandTrace(
-            contract::printable(disk->filesystem) + ": " +
-            (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
-    return contract::kPLNoError;  // the job itself says why there is no way
+        options_.commandTrace(line);
 }
 
 void RepairDisk::start(const DiskReferencePointer& disk, const ScriptMaker& makeScript)

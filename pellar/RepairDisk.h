@@ -3,11 +3,10 @@
 
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/PLRepairDisk.h"
-#include "pellar/ManagerOptions.h"
 #include "pellar/jobs/Job.h"
-#include "pellar/jobs/JobScript.h"
+#include "pellar/jobs/VolumeScript.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/texts/Texts.h"
-#include "pellar/tools/Operation.h"
 
 #include <memory>
 #include <vector>
@@ -17,7 +16,7 @@ namespace pellar {
 /// The library's tool of one module. The references, and the delegate, outlive it.
 class RepairDisk final : public contract::PLRepairDisk {
 public:
-    RepairDisk(contract::RunLoop& loop, const Texts& texts, const ManagerOptions& options,
+    RepairDisk(contract::RunLoop& loop, const Texts& texts, const JobOptions& options,
                contract::PLAsyncDelegate& delegate);
 
     contract::ErrorCode beginStoragesystemFilesystemVerifyForDisk(
@@ -46,29 +45,28 @@ public:
     std::weak_ptr<RepairDisk*> liveness() const { return self_; }
 
 private:
-    contract::ErrorCode begin(const contract::DiskReferencePointer& disk, Subject subject,
-                              Operation operation);
-    contract::ErrorCode beginFilesystem(const contract::DiskReferencePointer& disk,
-                                        Operation operation);
-    contract::ErrorCode beginMounted(const contract::DiskReferencePointer& disk, Operation operation,
-                                    contract::ErrorCode error);
-    contract::ErrorCode beginPartitionMap(const contract::DiskReferencePointer& disk,
-                                         Operation operation);
-    contract::ErrorCode beginPermissions(const contract::DiskReferencePointer& disk,
-                                        Operation operation);
-    contract::ErrorCode refusal(const contract::DiskReferencePointer& disk,
-                               Operation operation) const;
-    bool beginPrivileged(Subject subject, const contract::DiskReferencePointer& disk,
-                         Operation operation);
-    bool isPartThatOthersAttach(const JobRequest& request) const;
-    void startVolume(JobRequest request);
-    void startLive(const contract::DiskReferencePointer& disk,
-                   const std::vector<MountPlace>& mounts);
+    contract::ErrorCode begin(Task task, const contract::DiskReferencePointer& disk);
+    contract::ErrorCode beginUnobserved(Task task, const contract::DiskReferencePointer& disk);
+    contract::ErrorCode refusal(Task task, const contract::DiskReferencePointer& disk) const;
+    contract::ErrorCode refusalOfPermissions(const contract::DiskReference& disk) const;
+    bool beginPrivileged(Task task, const contract::DiskReferencePointer& disk);
+    contract::ErrorCode beginVolume(const contract::DiskReferencePointer& disk,
+                                    Operation operation);
+    contract::ErrorCode beginMounted(const contract::DiskReferencePointer& disk,
+                                     Operation operation, contract::ErrorCode error);
+    bool isPartThatOthersAttach(const VolumeRequest& request) const;
+    void traceTool(const contract::DiskReference& disk, Operation operation) const;
+    void trace(const std::string& line) const;
+    JobContext context(const contract::DiskReference& disk, StopSwitch& stop,
+                       EventQueue& events) const;
+    template <class JobScript, class Argument>
+    void startScript(const contract::DiskReferencePointer& disk, const Argument& argument);
+    void startVolume(VolumeRequest request);
     void start(const contract::DiskReferencePointer& disk, const ScriptMaker& makeScript);
 
     contract::RunLoop& loop_;
     const Texts& texts_;
-    const ManagerOptions& options_;
+    const JobOptions& options_;
     contract::PLAsyncDelegate& delegate_;
     std::unique_ptr<Job> job_;
     const std::shared_ptr<RepairDisk*> self_ = std::make_shared<RepairDisk*>(this);

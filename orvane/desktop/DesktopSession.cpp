@@ -72,9 +72,9 @@ SupportOptions DesktopSession::supportOptions()
     return options;
 }
 
-pellar::ManagerOptions DesktopSession::libraryOptions()
+pellar::JobOptions DesktopSession::libraryOptions()
 {
-    pellar::ManagerOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
+    pellar::JobOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
     options.outputLimits = options_.outputLimits;
     options.archiveFetching = {[this] { return fetchesArchives(host_); },
                                libraryTexts_.text("The archives of these packages are downloaded "
@@ -96,7 +96,7 @@ JobLedger::Events DesktopSession::ledgerEvents()
 
 void DesktopSession::loadModules()
 {
-    pellar::ManagerOptions options = libraryOptions();
+    pellar::JobOptions options = libraryOptions();
     options.observer = &ledger_;
     tabs_.load(findModuleBundles(options_.moduleDirectories), options,
                [this](const std::string& sentence) { warn(sentence); });

@@ -48,7 +48,7 @@ public:
 private:
     SessionParts parts() { return {host_, window_, controller_, tabs_, ledger_}; }
     SupportOptions supportOptions();
-    pellar::ManagerOptions libraryOptions();
+    pellar::JobOptions libraryOptions();
     JobLedger::Events ledgerEvents();
     void loadModules();
     void connectWindow();

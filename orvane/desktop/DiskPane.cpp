@@ -194,7 +194,7 @@ std::string DiskPane::activityOn(const Disk& disk)
     const StartedRun* const run = ledger_.currentRun();
     if (run == nullptr || run->identifier != disk.facts().identifier)
         return {};
-    return host_.translator().text(run->isRepair() ? "repairing…" : "verifying…");
+    return host_.translator().text(run->task.isRepair() ? "repairing…" : "verifying…");
 }
 
 std::vector<DiskRequest> DiskPane::requestsFor(DiskAction action) const

@@ -95,7 +95,7 @@ bool ModuleTab::stopJob()
 }
 
 void ModuleTabs::load(const std::vector<std::filesystem::path>& bundles,
-                      const pellar::ManagerOptions& libraryOptions, const WarningSink& warn)
+                      const pellar::JobOptions& libraryOptions, const WarningSink& warn)
 {
     std::string switchedOff;
     for (const std::filesystem::path& bundle : bundles) {

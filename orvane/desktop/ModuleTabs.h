@@ -23,7 +23,7 @@ public:
     struct Surroundings {
         DesktopHost& host;
         WindowController& window;
-        const pellar::ManagerOptions& libraryOptions;
+        const pellar::JobOptions& libraryOptions;
     };
 
     /// Loads the bundle's module, unless it is switched off in the settings: then there is no tab.
@@ -84,7 +84,7 @@ public:
     /// Loads the modules of the bundles, and tells of each that cannot be loaded. Where none is
     /// left, a tab says so.
     void load(const std::vector<std::filesystem::path>& bundles,
-              const pellar::ManagerOptions& libraryOptions, const WarningSink& warn);
+              const pellar::JobOptions& libraryOptions, const WarningSink& warn);
     /// The modules end, their running job with them.
     void clear() { tabs_.clear(); }
 

@@ -4,7 +4,7 @@
 #include "contract/foundation/StyledText.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/volumes/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 
@@ -51,21 +51,7 @@ contract::Dictionary headingOfError(const std::string& sentence)
 
 }  // namespace
 
-std::string_view actionName(pellar::Subject subject, pellar::Operation operation)
-{
-    const bool isRepair = operation == pellar::Operation::Repair;
-    switch (subject) {
-        case pellar::Subject::Filesystem: return isRepair ? "repair" : "verify";
-        case pellar::Subject::Permissions:
-            return isRepair ? "repair-permissions" : "verify-permissions";
-        case pellar::Subject::PartitionMap:
-            return isRepair ? "repair-partition-map" : "verify-partition-map";
-    }
-    return {};
-}
-
-void JobLedger::jobWillBegin(const contract::DiskReferencePointer& reference,
-                             pellar::Subject subject, pellar::Operation operation)
+void JobLedger::jobWillBegin(const contract::DiskReferencePointer& reference, pellar::Task task)
 {
     // What was said until now has its time before this run's.
     host_.histories().saveNew();
@@ -75,9 +61,9 @@ void JobLedger::jobWillBegin(const contract::DiskReferencePointer& reference,
     const auto disk =
         std::dynamic_pointer_cast<Disk>(host_.sharedDiskController().diskWithKRDisk(reference));
     number_ = disk ? host_.historyStore().beginRun(host_.histories().keyOf(disk->facts()),
-                                                   actionName(subject, operation), now())
+                                                   nameOf(task), now())
                    : 0;
-    run_ = {subject, operation, reference ? reference->name : std::string(),
+    run_ = {task, reference ? reference->name : std::string(),
             reference ? reference->identifier : std::string()};
     isRunning_ = true;
     events_.began(run_, reference);
@@ -147,7 +133,7 @@ void keepUnreached(SupportHost& host, Disk& image, pellar::Operation operation,
     const auto time = now();
     const std::int64_t run =
         store.beginRun(host.histories().keyOf(image.facts()),
-                       actionName(pellar::Subject::Filesystem, operation), time);
+                       nameOf(pellar::Task{pellar::Subject::Filesystem, operation}), time);
     store.endRun(run, {failedVerdict(), contract::kPLErrorCannotOpen, sentence}, time);
     image.fsckHistoryNoChildren().append(headingOfError(sentence));
     host.histories().saveNew();

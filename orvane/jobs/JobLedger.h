@@ -15,16 +15,10 @@ namespace orvane {
 
 /// One tool's run on one disk, as the user would name it.
 struct StartedRun {
-    pellar::Subject subject = pellar::Subject::Filesystem;
-    pellar::Operation operation = pellar::Operation::Verify;
+    pellar::Task task;
     std::string disk = {};        ///< any bytes
     std::string identifier = {};  ///< the disk's
-
-    bool isRepair() const { return operation == pellar::Operation::Repair; }
 };
-
-/// "verify", "repair-permissions", ...: stable names for files and other programs.
-[[nodiscard]] std::string_view actionName(pellar::Subject subject, pellar::Operation operation);
 
 /// Keeps the runs of a manager's jobs with their disks' histories: when each began, and how it
 /// ended. One run at a time. Main thread.
@@ -47,8 +41,7 @@ public:
     std::string withDevice(contract::ErrorCode error, std::string text) const;
 
 private:
-    void jobWillBegin(const contract::DiskReferencePointer& disk, pellar::Subject subject,
-                      pellar::Operation operation) override;
+    void jobWillBegin(const contract::DiskReferencePointer& disk, pellar::Task task) override;
     void jobDidNotBegin(const contract::DiskReferencePointer& disk,
                         contract::ErrorCode error) override;
     void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,

@@ -100,7 +100,7 @@ pellar::Result<pellar::LoopDevice, JobFailure> attachRegion(const FileDescriptor
                                                             const HelperRequest& request)
 {
     const Access wanted =
-        request.operation == pellar::Operation::Repair ? Access::ReadWrite : Access::ReadOnly;
+        request.task.operation == pellar::Operation::Repair ? Access::ReadWrite : Access::ReadOnly;
     const auto given = accessOf(image.get());
     if (!given || !isInside(request.disk, image.get()))
         return JobFailure{contract::kPLErrorCannotOpen,

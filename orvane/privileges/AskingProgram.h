@@ -2,9 +2,9 @@
 #pragma once
 
 #include "orvane/privileges/HelperProtocol.h"
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/volumes/LoopDevice.h"
 
 #include <sys/types.h>
 

@@ -6,8 +6,8 @@
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "pellar/Manager.h"
-#include "pellar/jobs/Event.h"
-#include "pellar/volumes/LoopDevice.h"
+#include "pellar/disks/LoopDevice.h"
+#include "pellar/jobs/EventQueue.h"
 
 #include <fcntl.h>
 #include <poll.h>
@@ -130,7 +130,7 @@ private:
             return attach();
         if (auto failure = holdDevice())
             return failure;
-        return request_.subject == Subject::Permissions ? findSystem() : std::nullopt;
+        return request_.task.subject == Subject::Permissions ? findSystem() : std::nullopt;
     }
 
     // While it is open its number goes to no other disk, so that what the job opens by the name is
@@ -176,7 +176,7 @@ private:
 
     void work()
     {
-        pellar::ManagerOptions options;
+        pellar::JobOptions options;
         options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
         if (user_)
@@ -203,8 +203,8 @@ private:
     ErrorCode begin(contract::PLRepairDisk& tool) const
     {
         const auto disk = std::make_shared<const DiskReference>(disk_);
-        const bool isRepair = request_.operation == pellar::Operation::Repair;
-        switch (request_.subject) {
+        const bool isRepair = request_.task.isRepair();
+        switch (request_.task.subject) {
             case Subject::PartitionMap:
                 return isRepair ? tool.beginPartitionMapRepairForDisk(disk)
                                 : tool.beginPartitionMapVerifyForDisk(disk);
@@ -219,9 +219,9 @@ private:
 
     void refuse(const JobFailure& failure)
     {
-        pellar::EventRoad road(loop_, {&printer_, nullptr, {}, [] {
+        pellar::EventQueue events(loop_, {&printer_, nullptr, {}, [] {
                                        }});
-        pellar::JobLog log(request_.disk, texts_, road);
+        pellar::JobLog log(request_.disk, texts_, events);
         log.started();
         reportFailure(failure, request_, texts_, log);
         loop_.runUntil([this] { return printer_.isOver(); });

@@ -14,23 +14,10 @@
 namespace orvane {
 namespace {
 
-using pellar::Operation;
 using pellar::Subject;
+using pellar::Task;
 using Arguments = std::span<const std::string>;
 using Read = pellar::Result<HelperRequest, const char*>;
-
-struct Task {
-    std::string_view word;
-    Subject subject;
-    Operation operation;
-};
-
-// Permissions are verified without the helper.
-constexpr std::array tasks{Task{"verify", Subject::Filesystem, Operation::Verify},
-                           Task{"repair", Subject::Filesystem, Operation::Repair},
-                           Task{"verify-map", Subject::PartitionMap, Operation::Verify},
-                           Task{"repair-map", Subject::PartitionMap, Operation::Repair},
-                           Task{"repair-permissions", Subject::Permissions, Operation::Repair}};
 
 // attach-OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
 constexpr std::string_view attaching = "attach-";
@@ -41,20 +28,6 @@ constexpr std::string_view fetching = "--fetch-archives";
 constexpr std::size_t longestName = 1024;
 constexpr std::size_t longestLanguages = 64;
 constexpr std::string_view languageSigns = "_-@.";
-
-const Task* taskNamed(std::string_view word)
-{
-    const auto* const found = std::find_if(
-        tasks.begin(), tasks.end(), [&](const Task& candidate) { return candidate.word == word; });
-    return found == tasks.end() ? nullptr : found;
-}
-
-const Task* taskOf(const HelperRequest& request)
-{
-    return std::find_if(tasks.begin(), tasks.end(), [&](const Task& candidate) {
-        return candidate.subject == request.subject && candidate.operation == request.operation;
-    });
-}
 
 // Canonical, so that no link of another user's is followed as root.
 bool isCanonicalDevice(const std::string& path)
@@ -86,8 +59,8 @@ Read readRegion(Arguments arguments)
     constexpr std::uint64_t largest = std::numeric_limits<std::int64_t>::max();
     if (arguments.size() < 4)
         return "wrong number of arguments";
-    const Task* const task = taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
-    if (task == nullptr || task->subject != Subject::Filesystem)
+    const auto task = pellar::taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
+    if (!task || task->subject != Subject::Filesystem)
         return "unknown operation";
     const auto image = numberIn<int>(arguments[1]);
     const auto offset = numberIn<std::uint64_t>(arguments[2]);
@@ -95,7 +68,7 @@ Read readRegion(Arguments arguments)
     if (!image || *image < 0 || !offset || *offset > largest || !length || *length == 0 ||
         *length > largest - *offset)
         return "no region of a file";
-    HelperRequest request{.subject = task->subject, .operation = task->operation, .image = *image};
+    HelperRequest request{.task = *task, .image = *image};
     request.disk.storage = contract::DiskReference::Storage::FileRegion;
     request.disk.offset = *offset;
     request.disk.length = *length;
@@ -173,11 +146,11 @@ std::optional<pellar::Event> eventFromJSON(const json& parts)
 
 std::string_view attemptOf(const HelperRequest& request)
 {
-    const bool isRepair = request.operation == pellar::Operation::Repair;
-    if (request.subject == Subject::Permissions)
+    const bool isRepair = request.task.isRepair();
+    if (request.task.subject == Subject::Permissions)
         return isRepair ? "cannot repair the permissions on “%1$@”: %2$@"
                         : "cannot verify the permissions on “%1$@”: %2$@";
-    if (request.subject == Subject::PartitionMap)
+    if (request.task.subject == Subject::PartitionMap)
         return isRepair ? "cannot repair the partition map of “%1$@”: %2$@"
                         : "cannot verify the partition map of “%1$@”: %2$@";
     return isRepair ? "cannot repair “%1$@”: %2$@" : "cannot verify “%1$@”: %2$@";
@@ -187,8 +160,7 @@ std::string_view attemptOf(const HelperRequest& request)
 
 HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& languages)
 {
-    HelperRequest request{.subject = job.subject,
-                          .operation = job.operation,
+    HelperRequest request{.task = job.task,
                           .disk = job.disk,
                           .languages = acceptedLanguages(languages),
                           .fetchesArchives = job.fetchesArchives};
@@ -208,11 +180,11 @@ std::vector<std::string> argumentsOf(const HelperRequest& request)
     const contract::DiskReference& disk = request.disk;
     std::vector<std::string> arguments;
     if (request.isOnImage())
-        arguments = {std::string(attaching) + std::string(taskOf(request)->word),
+        arguments = {std::string(attaching) + std::string(nameOf(request.task)),
                      std::to_string(request.image), std::to_string(disk.offset),
                      std::to_string(disk.length)};
     else
-        arguments = {std::string(taskOf(request)->word), disk.path.native(),
+        arguments = {std::string(nameOf(request.task)), disk.path.native(),
                      request.identity.text()};
     for (const std::string& text :
          {disk.identifier.substr(0, longestName), disk.name.substr(0, longestName), disk.filesystem,
@@ -230,16 +202,16 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
         return "wrong number of arguments";
     if (arguments[0].starts_with(attaching))
         return readRegion(arguments);
-    const Task* const task = taskNamed(arguments[0]);
-    if (task == nullptr)
+    // Permissions are verified without the helper.
+    const auto task = pellar::taskNamed(arguments[0]);
+    if (!task || *task == Task{Subject::Permissions, pellar::Operation::Verify})
         return "unknown operation";
     if (!isCanonicalDevice(arguments[1]) || !isBlockDevice(arguments[1]))
         return "not a block device below /dev";
     const auto identity = DiskIdentity::fromText(arguments[2]);
     if (!identity)
         return "it is not said which disk is meant";
-    HelperRequest request{
-        .subject = task->subject, .operation = task->operation, .identity = *identity};
+    HelperRequest request{.task = *task, .identity = *identity};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
     Arguments texts = Arguments(arguments).subspan(3);

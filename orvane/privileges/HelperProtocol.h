@@ -5,9 +5,9 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/DiskIdentity.h"
-#include "pellar/jobs/Event.h"
+#include "pellar/jobs/EventQueue.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/jobs/JobOptions.h"
 #include "pellar/outcome/Result.h"
 
 #include <filesystem>
@@ -21,8 +21,7 @@ namespace orvane {
 
 /// One job that a program without the right to it asks of the helper.
 struct HelperRequest {
-    pellar::Subject subject = pellar::Subject::Filesystem;
-    pellar::Operation operation = pellar::Operation::Verify;
+    pellar::Task task;
     /// A block device; or, without a path, a region of an image file.
     contract::DiskReference disk = {};
     DiskIdentity identity = {};  ///< of the block device

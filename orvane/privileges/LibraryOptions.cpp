@@ -45,10 +45,10 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
 
 }  // namespace
 
-pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
+pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
                                       const Asking& asking, const WarningSink& refused)
 {
-    pellar::ManagerOptions options;
+    pellar::JobOptions options;
     if (const std::string path = toolPathFromEnvironment(refused); !path.empty())
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
@@ -60,9 +60,9 @@ pellar::ManagerOptions libraryOptions(const XDGPaths& paths, const pellar::Texts
     if (!launcher.empty())
         options.privileged = [launcher, asking, &texts](const pellar::PrivilegedJob& job,
                                                         pellar::StopSwitch& stop,
-                                                        pellar::EventRoad& road) {
+                                                        pellar::EventQueue& events) {
             return std::make_unique<PrivilegedScript>(
-                HelperLaunch{launcher, currentLanguages(), asking}, job, texts, stop, road);
+                HelperLaunch{launcher, currentLanguages(), asking}, job, texts, stop, events);
         };
     return options;
 }

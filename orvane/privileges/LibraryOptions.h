@@ -4,7 +4,7 @@
 #include "orvane/privileges/PrivilegedScript.h"
 #include "orvane/support/files/Failure.h"
 #include "orvane/support/settings/XDGPaths.h"
-#include "pellar/ManagerOptions.h"
+#include "pellar/jobs/JobOptions.h"
 #include "pellar/texts/Texts.h"
 
 namespace orvane {
@@ -13,7 +13,7 @@ namespace orvane {
 /// what a repair overwrites, and how it gets at disks for which the user has no right. `texts`
 /// outlives the options. `refused` (may be empty) is told of directories of FIXWELL_TOOL_PATH that
 /// do not count, because others could change what root would run from there.
-[[nodiscard]] pellar::ManagerOptions libraryOptions(const XDGPaths& paths,
+[[nodiscard]] pellar::JobOptions libraryOptions(const XDGPaths& paths,
                                                     const pellar::Texts& texts,
                                                     const Asking& asking = {},
                                                     const WarningSink& refused = {});

@@ -2,8 +2,8 @@
 #include "orvane/privileges/MountedSystem.h"
 
 #include "contract/foundation/UTF8.h"
-#include "pellar/mounts/MountPlace.h"
-#include "pellar/permissions/InstalledSystem.h"
+#include "pellar/mounts/MountTable.h"
+#include "pellar/packages/InstalledSystem.h"
 
 #include <sys/stat.h>
 
@@ -14,14 +14,14 @@ namespace {
 
 // A user who mounts a file system of their own in user space may name any device as its source.
 // Only btrfs, which may be on several, has another device number than its source has.
-bool isReallyOn(const pellar::MountPlace& place, dev_t device)
+bool isReallyOn(const pellar::Mount& place, dev_t device)
 {
     struct stat status = {};
     return place.filesystem == "btrfs" ||
            (::stat(place.target.c_str(), &status) == 0 && status.st_dev == device);
 }
 
-bool isRootOfSystem(const pellar::MountPlace& place, dev_t device)
+bool isRootOfSystem(const pellar::Mount& place, dev_t device)
 {
     return !place.isBind() && isReallyOn(place, device) &&
            pellar::installedSystemAt(place.target) != pellar::PackageDatabase::None;
@@ -45,7 +45,7 @@ pellar::Result<std::string, pellar::Sentence> mountedSystemOn(const std::filesys
     struct stat status = {};
     if (::stat(device.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return pellar::Sentence{"it is no longer there", {}, {}};
-    auto places = pellar::mountPlacesOf(status.st_rdev, pellar::SystemPaths());
+    auto places = pellar::mountsOf(status.st_rdev, pellar::SystemPaths());
     std::erase_if(places,
                   [&](const auto& place) { return !isRootOfSystem(place, status.st_rdev); });
     if (places.empty())

@@ -157,14 +157,14 @@ std::optional<int> HelperProcess::reap()
 
 PrivilegedScript::PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob job,
                                    const pellar::Texts& texts, pellar::StopSwitch& stop,
-                                   pellar::EventRoad& road)
+                                   pellar::EventQueue& events)
     : launch_(std::move(launch)),
       job_(std::move(job)),
       request_(requestFor(job_, launch_.languages)),
       texts_(texts),
       stop_(stop),
-      road_(road),
-      log_(job_.disk, texts, road),
+      events_(events),
+      log_(job_.disk, texts, events),
       guard_(texts)
 {
 }
@@ -175,7 +175,7 @@ void PrivilegedScript::run()
     for (const std::string& argument : argumentsOf(request_))
         command.push_back(argument);
     log_.trace("run: " + pellar::shown({command.front(), {command.begin() + 1, command.end()}}));
-    road_.flush();
+    events_.flush();
     isAsking_ = true;
     if (launch_.asking.begins)
         launch_.asking.begins();
@@ -190,7 +190,7 @@ void PrivilegedScript::run()
         log_.started();
     if (!hasFinished_)
         explain(status);
-    road_.flush();
+    events_.flush();
 }
 
 void PrivilegedScript::follow(HelperProcess& helper)
@@ -199,13 +199,13 @@ void PrivilegedScript::follow(HelperProcess& helper)
                                  pollfd{stop_.descriptor(), POLLIN, 0}};
     std::array<char, 16384> buffer;
     while (true) {
-        constexpr int lookAgain = 100;  // milliseconds, for what waits on the road
+        constexpr int lookAgain = 100;  // milliseconds, for what waits on the events
         if (::poll(polled.data(), polled.size(), lookAgain) < 0 && errno != EINTR)
             return;
         if (polled[1].revents != 0)
             passStopOn(helper);
         if (polled[0].revents == 0) {
-            road_.flush();
+            events_.flush();
             continue;
         }
         const ssize_t count = ::read(helper.output(), buffer.data(), buffer.size());
@@ -242,7 +242,7 @@ void PrivilegedScript::take(pellar::Event event)
     else if (!held_.empty() || (job_.image && isResult(event)))
         held_.push_back(std::move(event));
     else
-        road_.add(std::move(event));
+        events_.add(std::move(event));
 }
 
 // What was found in a device on an image is true of nothing when the image was cut off or replaced
@@ -258,8 +258,8 @@ void PrivilegedScript::takeEnd(pellar::Finished end)
         return fail(contract::kPLErrorDiskChanged,
                     "the disk was deleted, moved or replaced meanwhile");
     for (pellar::Event& event : held_)
-        road_.add(std::move(event));
-    road_.add(std::move(end));
+        events_.add(std::move(event));
+    events_.add(std::move(end));
 }
 
 /// A line by which the module knows that the disk is in order, or that it is not.

@@ -3,8 +3,7 @@
 
 #include "orvane/privileges/HelperProtocol.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/LineGuard.h"
-#include "pellar/jobs/Script.h"
+#include "pellar/jobs/JobOptions.h"
 #include "pellar/texts/Texts.h"
 
 #include <functional>
@@ -35,7 +34,7 @@ struct HelperLaunch {
 class PrivilegedScript final : public pellar::Script {
 public:
     PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob job, const pellar::Texts& texts,
-                     pellar::StopSwitch& stop, pellar::EventRoad& road);
+                     pellar::StopSwitch& stop, pellar::EventQueue& events);
 
     void run() override;
 
@@ -56,9 +55,9 @@ private:
     const HelperRequest request_;
     const pellar::Texts& texts_;
     pellar::StopSwitch& stop_;
-    pellar::EventRoad& road_;
+    pellar::EventQueue& events_;
     pellar::JobLog log_;
-    const pellar::LineGuard guard_;
+    const pellar::VerdictPhrases guard_;
     std::vector<pellar::Event> held_;  ///< the result, and what follows it
     std::string unfinishedLine_;
     unsigned pressesTold_ = 0;

@@ -89,8 +89,8 @@ Result<std::shared_ptr<Disk>, Failure> DiskLookup::findMountPoint(const fs::path
         [&](const Disk& disk) { return disk.facts().mountPoint == directory.native(); });
     if (volume)
         return volume;
-    const auto mount = mountHolding(currentMounts(), directory);
-    const bool isMountPoint = mount && mount->mountPoint == directory.native();
+    const auto mount = pellar::mountHolding(pellar::currentMounts(), directory);
+    const bool isMountPoint = mount && mount->target == directory.native();
     return cannotUse(path.native(),
                      translator_.text(isMountPoint ? "no disk is mounted on this directory"
                                                    : "this directory is no mount point"));

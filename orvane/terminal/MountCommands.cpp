@@ -2,7 +2,7 @@
 #include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/terminal/Commands.h"
-#include "pellar/volumes/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/PasswordAgent.h"
 
+#include "pellar/process/ChildProcess.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/process/ForkedSignals.h"
 
 #include <fcntl.h>
 #include <linux/close_range.h>

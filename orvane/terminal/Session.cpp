@@ -75,9 +75,9 @@ SupportOptions Session::supportOptions(const Request& request)
     return options;
 }
 
-pellar::ManagerOptions Session::libraryOptions(const Request& request)
+pellar::JobOptions Session::libraryOptions(const Request& request)
 {
-    pellar::ManagerOptions options =
+    pellar::JobOptions options =
         orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking(),
                                [this](const std::string& sentence) { trace(sentence); });
     options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },

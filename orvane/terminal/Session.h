@@ -92,7 +92,7 @@ private:
     contract::PLManager& pl() override { return library_; }
 
     SupportOptions supportOptions(const Request& request);
-    pellar::ManagerOptions libraryOptions(const Request& request);
+    pellar::JobOptions libraryOptions(const Request& request);
     TerminalWindow::Events windowEvents();
     void trace(std::string_view line);
     Asking asking();

@@ -119,7 +119,7 @@ void Session::jobBegan(const StartedRun& run, const contract::DiskReferencePoint
 {
     reportEnd();
     currentDisk_ = names_.nameOf(run.identifier);
-    reporter_.started(currentDisk_, actionName(run.subject, run.operation), window_.status());
+    reporter_.started(currentDisk_, nameOf(run.task), window_.status());
     follow(disk);
 }
 

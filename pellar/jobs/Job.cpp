@@ -7,16 +7,16 @@
 namespace pellar {
 
 Job::Job(const ScriptMaker& makeScript, EventReceiver receiver, contract::RunLoop& loop)
-    : road_(loop, std::move(receiver))
+    : events_(loop, std::move(receiver))
 {
-    auto script = makeScript(stop_, road_);
+    auto script = makeScript(stop_, events_);
     thread_ = std::jthread([script = std::move(script)] { script->run(); });
 }
 
 // Closed first: the job's thread must not wait for a main loop that waits for the thread.
 Job::~Job()
 {
-    road_.close();
+    events_.close();
     stop_.pressHard();
     thread_.join();
 }

@@ -2,13 +2,32 @@
 #pragma once
 
 #include "contract/foundation/RunLoop.h"
-#include "pellar/jobs/EventRoad.h"
-#include "pellar/jobs/Script.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/JobOptions.h"
 
+#include <functional>
+#include <memory>
 #include <thread>
 
 namespace pellar {
+
+/// What every script uses. The references outlive it.
+struct JobContext {
+    const JobOptions& options;
+    const Texts& texts;
+    StopSwitch& stop;
+    EventQueue& events;
+    JobLog log;
+
+    JobContext(const contract::DiskReference& disk, const JobOptions& options_, const Texts& texts_,
+               StopSwitch& stop_, EventQueue& events_)
+        : options(options_), texts(texts_), stop(stop_), events(events_), log(disk, texts, events)
+    {
+    }
+};
+
+/// Makes a script that heeds the switch and tells its events to the queue. Both outlive it.
+using ScriptMaker = std::function<std::unique_ptr<Script>(StopSwitch&, EventQueue&)>;
 
 /// A job under way, on a thread of its own. Main thread. Destroying it ends the tool as fast as
 /// is safe for the disk, waits until nothing of the job is left, and drops what it still had to
@@ -25,7 +44,7 @@ public:
 
 private:
     StopSwitch stop_;
-    EventRoad road_;
+    EventQueue events_;
     std::jthread thread_;
 };
 

@@ -8,7 +8,7 @@
 namespace pellar {
 
 JobDisk::JobDisk(contract::DiskReferencePointer disk, std::optional<DiskClaim> claim,
-                 std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log)
+                 std::vector<Mount> mounts, const SystemPaths& paths, JobLog& log)
     : disk_(std::move(disk)),
       claim_(std::move(claim)),
       mounts_(std::move(mounts)),
@@ -36,12 +36,12 @@ std::optional<Outcome> JobDisk::take(Access access)
 
 std::optional<Outcome> JobDisk::unmount()
 {
-    log_.step(contract::kFsckVerify, log_.text({"Unmounting “%1$@”", log_.diskName(), {}}));
+    log_.step(Operation::Verify, {"Unmounting “%1$@”", log_.diskName(), {}});
     log_.flush();  // what is still to be written may take long
     auto unmounted = UnmountedDisk::take(std::move(mounts_), paths_);
-    if (const auto* const refusal = std::get_if<Sentence>(&unmounted))
-        return failedOutcome(contract::kPLErrorCouldNotUnmount, *refusal);
-    unmounted_.emplace(std::get<UnmountedDisk>(std::move(unmounted)));
+    if (!unmounted)
+        return failedOutcome(contract::kPLErrorCouldNotUnmount, unmounted.error());
+    unmounted_.emplace(*std::move(unmounted));
     return std::nullopt;
 }
 
@@ -50,7 +50,7 @@ void JobDisk::giveBack()
     claim_.reset();
     if (!unmounted_)
         return;
-    log_.step(contract::kFsckVerify, log_.text({"Mounting “%1$@” again", log_.diskName(), {}}));
+    log_.step(Operation::Verify, {"Mounting “%1$@” again", log_.diskName(), {}});
     for (const Sentence& failure : unmounted_->mountAgain())
         log_.error(failure);
     unmounted_.reset();

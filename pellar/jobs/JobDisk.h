@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
 #include "pellar/mounts/UnmountedDisk.h"
-#include "pellar/process/Access.h"
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/outcome/Outcome.h"
+#include "pellar/process/Command.h"
 
 #include <optional>
 #include <vector>
@@ -19,7 +19,7 @@ public:
     /// `claim` is there when the disk was at rest and free as the job began; else `mounts` tells
     /// where it is mounted.
     JobDisk(contract::DiskReferencePointer disk, std::optional<DiskClaim> claim,
-            std::vector<MountPlace> mounts, const SystemPaths& paths, JobLog& log);
+            std::vector<Mount> mounts, const SystemPaths& paths, JobLog& log);
 
     /// Why it cannot be had, and then nothing is changed; none when it is the job's. May take long.
     [[nodiscard]] std::optional<Outcome> take(Access access);
@@ -36,7 +36,7 @@ private:
 
     const contract::DiskReferencePointer disk_;
     std::optional<DiskClaim> claim_;
-    std::vector<MountPlace> mounts_;
+    std::vector<Mount> mounts_;
     std::optional<UnmountedDisk> unmounted_;
     const SystemPaths& paths_;
     JobLog& log_;

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "contract/pellar/PLRepairDisk.h"
-#include "pellar/jobs/PrivilegedJob.h"
+#include "pellar/jobs/JobOptions.h"
 
 namespace pellar {
 
@@ -10,8 +10,7 @@ namespace pellar {
 class JobObserver {
 public:
     /// Before anything is done.
-    virtual void jobWillBegin(const contract::DiskReferencePointer& disk, Subject subject,
-                              Operation operation) = 0;
+    virtual void jobWillBegin(const contract::DiskReferencePointer& disk, Task task) = 0;
     /// The job was refused, and is over.
     virtual void jobDidNotBegin(const contract::DiskReferencePointer& disk,
                                 contract::ErrorCode error) = 0;

@@ -8,9 +8,8 @@
 
 namespace pellar {
 
-PartOfImageScript::PartOfImageScript(JobRequest request, const ManagerOptions& options,
-                                     const Texts& texts, StopSwitch& stop, EventRoad& road)
-    : request_(std::move(request)), options_(options), texts_(texts), stop_(stop), road_(road)
+PartOfImageScript::PartOfImageScript(VolumeRequest request, JobContext context)
+    : request_(std::move(request)), context_(std::move(context))
 {
 }
 
@@ -22,26 +21,26 @@ void PartOfImageScript::run()
     if (needsDevice())
         scriptOfOthers()->run();
     else
-        JobScript(std::move(request_), options_, texts_, stop_, road_).run();
+        VolumeScript(std::move(request_), std::move(context_)).run();
 }
 
-/// Nobody is asked for a password where the job would end with a reason anyway.
+/// No password is asked for where the job would end with a reason anyway.
 bool PartOfImageScript::needsDevice() const
 {
     const Tool* const tool = request_.tool;
     if (tool == nullptr || tool->habits.takesOffset)
         return false;
     const bool isRepair = request_.operation == Operation::Repair;
-    return !findProgram(tool->name, options_.toolPath).empty() &&
-           (!isRepair ||
-            (tool->canRepair() && !findProgram(tool->repairName, options_.toolPath).empty()));
+    return !findProgram(tool->name, context_.options.toolPath).empty() &&
+           (!isRepair || (tool->canRepair() &&
+                          !findProgram(tool->repairName, context_.options.toolPath).empty()));
 }
 
 std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()
 {
-    PrivilegedJob job{Subject::Filesystem, request_.operation, *request_.disk, nullptr, false};
+    PrivilegedJob job{{Subject::Filesystem, request_.operation}, *request_.disk, nullptr, false};
     job.image = std::make_shared<const DiskClaim>(*std::exchange(request_.claim, std::nullopt));
-    return options_.privileged(job, stop_, road_);
+    return context_.options.privileged(job, context_.stop, context_.events);
 }
 
 }  // namespace pellar

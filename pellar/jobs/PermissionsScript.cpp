@@ -1,12 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/PermissionsScript.h"
 
-#include "contract/foundation/Array.h"
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/ErrorCodes.h"
-#include "contract/pellar/MessageKeys.h"
+#include "pellar/packages/InstalledSystem.h"
 #include "pellar/permissions/InstalledReferences.h"
-#include "pellar/permissions/InstalledSystem.h"
 #include "pellar/permissions/PermissionsOutcome.h"
 #include "pellar/permissions/Restoring.h"
 
@@ -27,16 +25,12 @@ constexpr double repairWasTried = 80;
 }  // namespace
 
 PermissionsScript::PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
-                                     const ManagerOptions& options, const Texts& texts,
-                                     StopSwitch& stop, EventRoad& road)
+                                     JobContext context)
     : disk_(std::move(disk)),
       operation_(operation),
-      options_(options),
-      fetchesArchives_(options.archiveFetching.isAllowed && options.archiveFetching.isAllowed()),
-      texts_(texts),
-      stop_(stop),
-      road_(road),
-      log_(*disk_, texts, road)
+      context_(std::move(context)),
+      fetchesArchives_(context_.options.archiveFetching.isAllowed &&
+                       context_.options.archiveFetching.isAllowed())
 {
     log_.leaveLinesOpen();
 }
@@ -90,16 +84,16 @@ std::variant<References, Sentence> PermissionsScript::readReferences(const RootD
 {
     log_.meter().setRange(databaseIsRead, databaseWasRead);
     const ReferenceSources sources{disk_->mountPoint,
-                                   options_.permissionReferences,
-                                   options_.toolPath,
-                                   options_.outputLimits,
+                                   context_.options.permissionReferences,
+                                   context_.options.toolPath,
+                                   context_.options.outputLimits,
                                    [this](std::string line) { log_.trace(std::move(line)); },
                                    [this](std::string line) { log_.remark(std::move(line)); },
                                    fetchesArchives_};
-    return readInstalledReferences(root, accounts_, sources, stop_, [this](double percent) {
+    return readInstalledReferences(root, accounts_, sources, context_.stop, [this](double percent) {
         log_.progress(percent);
-        road_.flushIfDue();
-        return !stop_.isPressed();
+        log_.flushIfDue();
+        return !context_.stop.isPressed();
     });
 }
 
@@ -112,11 +106,11 @@ std::optional<Tally> PermissionsScript::look(const RootDirectory& root,
     tally.packagesBeyondBounds = references.packagesBeyondBounds;
     double done = 0;
     for (const Reference& reference : references.files) {
-        if (stop_.isPressed())
+        if (context_.stop.isPressed())
             return std::nullopt;
         lookAt(root, reference, pass, tally);
         log_.progress(100 * ++done / static_cast<double>(references.files.size()));
-        road_.flushIfDue();
+        log_.flushIfDue();
     }
     log_.endOfRun();
     return tally;
@@ -150,16 +144,12 @@ void PermissionsScript::tellUnseen(const Reference& reference, Unseen unseen)
 {
     const std::string path = contract::printable(reference.path);
     switch (unseen) {
-        case Unseen::Missing:
-            log_.detail(log_.text(Sentence{"“%1$@” is not there.", path, {}}));
-            break;
+        case Unseen::Missing: log_.detail(Sentence{"“%1$@” is not there.", path, {}}); break;
         case Unseen::BehindLink:
-            log_.detail(log_.text(
-                Sentence{"“%1$@” is behind a symbolic link, which is not followed.", path, {}}));
+            log_.detail(
+                Sentence{"“%1$@” is behind a symbolic link, which is not followed.", path, {}});
             break;
-        case Unseen::Unreadable:
-            log_.detail(log_.text(Sentence{"“%1$@” cannot be read.", path, {}}));
-            break;
+        case Unseen::Unreadable: log_.detail(Sentence{"“%1$@” cannot be read.", path, {}}); break;
         case Unseen::ElsewhereMounted: break;
     }
 }
@@ -168,11 +158,11 @@ void PermissionsScript::tell(const Reference& reference, const FoundFile& file,
                              const Difference& difference)
 {
     for (const std::string& line :
-         linesOf(difference, reference, file.permissions, accounts_, texts_)) {
+         linesOf(difference, reference, file.permissions, accounts_, context_.texts)) {
         if (reference.doubt == Doubt::None)
             log_.problem(line);
         else
-            log_.detail(log_.text(Sentence{"Undecided, and never changed: %1$@", line, {}}));
+            log_.detail(Sentence{"Undecided, and never changed: %1$@", line, {}});
     }
 }
 
@@ -186,13 +176,13 @@ bool PermissionsScript::mayBeLentRights(const Reference& reference, const FoundF
     if (contents == Contents::AsPackaged)
         return true;
     ++tally.foreign;
-    log_.problem(log_.text(Sentence{
+    log_.problem(Sentence{
         contents == Contents::NotAsPackaged
             ? "“%1$@”: its content is not the package's, so a repair does not give it these rights."
             : "“%1$@”: it is not known whether its content is the package's, so a repair does not "
               "give it these rights.",
         contract::printable(reference.path),
-        {}}));
+        {}});
     return false;
 }
 
@@ -205,20 +195,20 @@ void PermissionsScript::repair(const RootDirectory& root, const Reference& refer
     const Restoring restoring = restore(root, reference, file);
     if (std::holds_alternative<Restored>(restoring)) {
         ++restored_;
-        log_.detail(log_.text(Sentence{"“%1$@” was set right.", path, {}}));
+        log_.detail(Sentence{"“%1$@” was set right.", path, {}});
     } else if (const auto* const refusal = std::get_if<NotPermitted>(&restoring)) {
-        log_.problem(log_.text(Sentence{"“%1$@” cannot be set right: %2$@.", path,
-                                        std::generic_category().message(refusal->error)}));
+        log_.problem(Sentence{"“%1$@” cannot be set right: %2$@.", path,
+                              std::generic_category().message(refusal->error)});
     } else if (std::holds_alternative<ChangedMeanwhile>(restoring) ||
                std::holds_alternative<ForeignContents>(restoring)) {
-        log_.problem(log_.text(
-            Sentence{"“%1$@” changed while it was looked at, and was left alone.", path, {}}));
+        log_.problem(
+            Sentence{"“%1$@” changed while it was looked at, and was left alone.", path, {}});
     } else {
         log_.problem(
-            log_.text(Sentence{"“%1$@” has other names too, and lies where others can "
-                               "write; it was left alone.",
-                               path,
-                               {}}));
+            Sentence{"“%1$@” has other names too, and lies where others can "
+                     "write; it was left alone.",
+                     path,
+                     {}});
     }
 }
 
@@ -226,24 +216,21 @@ void PermissionsScript::repair(const RootDirectory& root, const Reference& refer
 void PermissionsScript::tellDatabaseIsRead()
 {
     step("Reading what the packages say about their files");
-    road_.add(Message{{},
-                      contract::Dictionary::of(
-                          {{contract::kFsckMessageType, contract::kFsckProgress},
-                           {contract::kFsckParameters, contract::Array::of({databaseIsRead})}})});
-    road_.flush();
+    log_.progressOfJob(databaseIsRead);
+    log_.flush();
 }
 
 void PermissionsScript::tell(const Tally& tally)
 {
     for (const Sentence& sentence : sentencesOf(tally))
-        log_.remark(log_.text(sentence));
+        log_.remark(sentence);
     tellWhatIsMissing(tally);
     if (tally.missing > 0)
-        log_.detail(log_.text(
-            sentenceAbout(tally.missing, "%1$@ file is not there.", "%1$@ files are not there.")));
+        log_.detail(
+            sentenceAbout(tally.missing, "%1$@ file is not there.", "%1$@ files are not there."));
     if (restored_ > 0)
-        log_.remark(log_.text(
-            sentenceAbout(restored_, "%1$@ file was set right.", "%1$@ files were set right.")));
+        log_.remark(
+            sentenceAbout(restored_, "%1$@ file was set right.", "%1$@ files were set right."));
 }
 
 // Only the running system's apt knows where archives come from.
@@ -252,23 +239,22 @@ void PermissionsScript::tellWhatIsMissing(const Tally& tally)
     const bool canBeFetched =
         disk_->mountPoint == "/" && installedSystemAt("/") == PackageDatabase::Dpkg;
     if (tally.withoutSource > 0 && canBeFetched && !fetchesArchives_ &&
-        !options_.archiveFetching.howToAllow.empty())
-        log_.remark(options_.archiveFetching.howToAllow);
+        !context_.options.archiveFetching.howToAllow.empty())
+        log_.remark(context_.options.archiveFetching.howToAllow);
 }
 
 void PermissionsScript::step(std::string_view key)
 {
-    const bool isVerify = operation_ == Operation::Verify;
-    log_.step(isVerify ? contract::kFsckVerify : contract::kFsckRepair, texts_.text(key));
+    log_.step(operation_, {key, {}, {}});
 }
 
 void PermissionsScript::report(const Outcome& outcome)
 {
-    const std::string message = permissionsMessageOf(outcome, operation_, log_.diskName(), texts_);
+    const std::string message =
+        permissionsMessageOf(outcome, operation_, log_.diskName(), context_.texts);
     if (outcome.code != contract::kPLNoError && outcome.verdict != Verdict::Stopped)
         log_.failure(message);
-    log_.trace("result: " + std::string(nameOf(outcome.verdict).text()) + ": " + message);
-    log_.finished(outcome.code, outcome.detail, nameOf(outcome.verdict), message);
+    log_.finished(outcome, message);
 }
 
 }  // namespace pellar

@@ -1,15 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/ManagerOptions.h"
-#include "pellar/jobs/JobLog.h"
-#include "pellar/jobs/Outcome.h"
-#include "pellar/jobs/Script.h"
-#include "pellar/permissions/Comparison.h"
+#include "pellar/jobs/Job.h"
+#include "pellar/outcome/Outcome.h"
+#include "pellar/packages/Reference.h"
+#include "pellar/packages/RootDirectory.h"
 #include "pellar/permissions/Inspection.h"
-#include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/permissions/Tally.h"
+#include "pellar/permissions/PermissionsOutcome.h"
 
 #include <optional>
 
@@ -22,9 +19,7 @@ namespace pellar {
 class PermissionsScript final : public Script {
 public:
     /// Main thread.
-    PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
-                      const ManagerOptions& options, const Texts& texts, StopSwitch& stop,
-                      EventRoad& road);
+    PermissionsScript(contract::DiskReferencePointer disk, Operation operation, JobContext context);
 
     void run() override;
 
@@ -48,12 +43,9 @@ private:
 
     const contract::DiskReferencePointer disk_;
     const Operation operation_;
-    const ManagerOptions& options_;
+    JobContext context_;
+    JobLog& log_ = context_.log;
     const bool fetchesArchives_;
-    const Texts& texts_;
-    StopSwitch& stop_;
-    EventRoad& road_;
-    JobLog log_;
     Accounts accounts_;
     std::uint64_t restored_ = 0;
 };

@@ -2,32 +2,62 @@
 #include "pellar/jobs/ToolRun.h"
 
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/jobs/DiskNaming.h"
+#include "pellar/process/ChildProcess.h"
 
+#include <algorithm>
 #include <utility>
 
 namespace pellar {
+namespace {
+
+std::size_t leadingDigits(std::string_view text)
+{
+    return std::min(text.find_first_not_of("0123456789"), text.size());
+}
+
+}  // namespace
+
+std::string diskArgumentOfTool()
+{
+    return pathOfDescriptor(diskDescriptorOfTool);
+}
+
+std::string withDiskName(std::string_view line, std::string_view diskName)
+{
+    constexpr std::string_view offset = "?offset=";
+    static const std::string argument = diskArgumentOfTool();
+    std::string result;
+    for (std::size_t at = line.find(argument); at != std::string_view::npos;
+         at = line.find(argument)) {
+        const bool isOurs = leadingDigits(line.substr(at + argument.size())) == 0;
+        result += line.substr(0, at);
+        result += isOurs ? diskName : std::string_view(argument);
+        line.remove_prefix(at + argument.size());
+        if (isOurs && line.starts_with(offset))
+            line.remove_prefix(offset.size() + leadingDigits(line.substr(offset.size())));
+    }
+    return result.append(line);
+}
 
 ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
-                 RunSurroundings surroundings)
+                 JobContext& context)
     : tool_(tool),
       program_(std::move(program)),
       access_(access),
       problems_(problems),
-      surroundings_(surroundings),
+      context_(context),
       reader_(tool.makeReader())
 {
 }
 
 RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 {
-    JobLog& log = surroundings_.log;
+    JobLog& log = context_.log;
     const RunRequest request = requestFor(disk);
     log.trace("run: " + shown(request.command));
-    log.step(stepType(), log.text(Sentence{"Running %1$@ on “%2$@”", program_.filename().string(),
-                                           log.diskName()}));
-    surroundings_.road.flush();
-    const RunResult result = runTool(request, surroundings_.stop, *this);
+    log.step(operation(), {"Running %1$@ on “%2$@”", program_.filename(), log.diskName()});
+    log.flush();
+    const RunResult result = runTool(request, context_.stop, *this);
     reader_->finish(lines_);
     tellToolLines();
     log.endOfRun();
@@ -43,24 +73,19 @@ RunRequest ToolRun::requestFor(const DiskForTool& disk) const
     request.command = {program_, tool_.arguments(access_, diskArgumentOfTool(), disk.offset())};
     request.access = access_;
     request.disk = disk.descriptor();
-    request.limits = surroundings_.options.outputLimits;
-    request.silenceLimit = surroundings_.options.silenceLimit;
+    request.limits = context_.options.outputLimits;
+    request.silenceLimit = context_.options.silenceLimit;
     request.graceTimes = isUnstoppable() ? graceTimesOfUnstoppable() : graceTimesFor(access_);
     return request;
 }
 
 void ToolRun::tellEndOf(const RunResult& result)
 {
-    JobLog& log = surroundings_.log;
     if (result.cause == StopCause::TooMuchOutput)
-        log.failure(log.text(
-            Sentence{"%1$@ printed more than a check can need; it was ended and the rest is cut",
-                     program_.filename().string(),
-                     {}}));
+        context_.log.failure(
+            aboutTool("%1$@ printed more than a check can need; it was ended and the rest is cut"));
     else if (result.cause == StopCause::Silence)
-        log.failure(log.text(Sentence{"%1$@ gave no sign of life for too long; it was ended",
-                                      program_.filename().string(),
-                                      {}}));
+        context_.log.failure(aboutTool("%1$@ gave no sign of life for too long; it was ended"));
 }
 
 void ToolRun::line(std::string_view line, bool isCut)
@@ -69,21 +94,19 @@ void ToolRun::line(std::string_view line, bool isCut)
     tellToolLines();
     endIfUnreadable();
     if (isCut)
-        surroundings_.log.detail(surroundings_.log.text("(The line above was longer and is cut.)"));
+        context_.log.detail(Sentence{"(The line above was longer and is cut.)", {}, {}});
 }
 
 void ToolRun::progressLine(std::string_view line)
 {
     if (const auto percent = tool_.percentOf(line))
-        surroundings_.log.progress(*percent);
+        context_.log.progress(*percent);
 }
 
 void ToolRun::lineLimitReached()
 {
-    surroundings_.log.failure(surroundings_.log.text(
-        Sentence{"%1$@ prints very much; the repair goes on, but no more lines are shown",
-                 program_.filename().string(),
-                 {}}));
+    context_.log.failure(
+        aboutTool("%1$@ prints very much; the repair goes on, but no more lines are shown"));
 }
 
 bool ToolRun::isUnstoppable() const
@@ -101,26 +124,24 @@ void ToolRun::endIfUnreadable()
         fault->isUnproven)
         return;
     isEnded_ = true;
-    surroundings_.stop.press();
+    context_.stop.press();
 }
 
 void ToolRun::stopAsked()
 {
     if (isUnstoppable())
-        surroundings_.log.remark(surroundings_.log.text(
-            Sentence{"%1$@ is writing and cannot be interrupted without damage; the run is let "
-                     "come to its end",
-                     program_.filename().string(),
-                     {}}));
+        context_.log.remark(
+            aboutTool("%1$@ is writing and cannot be interrupted without damage; the run is let "
+                      "come to its end"));
 }
 
 void ToolRun::tellToolLines()
 {
-    JobLog& log = surroundings_.log;
+    JobLog& log = context_.log;
     for (const ToolLine& line : lines_) {
         const std::string text = withDiskName(line.text, log.diskName());
         switch (line.kind) {
-            case ToolLine::Kind::Phase: log.step(stepType(), log.text(line.phaseKey)); break;
+            case ToolLine::Kind::Phase: log.step(operation(), {line.phaseKey, {}, {}}); break;
             case ToolLine::Kind::Problem:
                 problems_ == Problems::Kept ? log.detail(text) : log.problem(text);
                 break;
@@ -131,9 +152,9 @@ void ToolRun::tellToolLines()
     lines_.clear();
 }
 
-contract::Name ToolRun::stepType() const
+Operation ToolRun::operation() const
 {
-    return access_ == Access::ReadOnly ? contract::kFsckVerify : contract::kFsckRepair;
+    return access_ == Access::ReadOnly ? Operation::Verify : Operation::Repair;
 }
 
 }  // namespace pellar

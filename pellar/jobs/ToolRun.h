@@ -1,24 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/ManagerOptions.h"
-#include "pellar/jobs/JobLog.h"
+#include "pellar/disks/DiskClaim.h"
+#include "pellar/jobs/Job.h"
 #include "pellar/tools/Tool.h"
-#include "pellar/volumes/DiskForTool.h"
 
 #include <filesystem>
 #include <memory>
+#include <string>
+#include <string_view>
 #include <vector>
 
 namespace pellar {
 
-/// What every run of a job uses; the references outlive it.
-struct RunSurroundings {
-    const ManagerOptions& options;
-    JobLog& log;
-    EventRoad& road;
-    StopSwitch& stop;
-};
+/// The name under which a tool opens the disk that it inherits. No name of the user's ever
+/// stands in a command.
+std::string diskArgumentOfTool();
+
+/// A tool's line with that name, and the offset that may follow it, replaced by the disk's own.
+std::string withDiskName(std::string_view line, std::string_view diskName);
 
 /// One run of a tool: starts it, passes its lines and progress on to the log as they come, and
 /// gathers what they say.
@@ -29,7 +29,7 @@ public:
     enum class Problems { Shown, Kept };
 
     ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
-            RunSurroundings surroundings);
+            JobContext& context);
 
     /// Runs the tool to its end. `volume` is what was seen of the disk before.
     [[nodiscard]] RunEvidence run(const DiskForTool& disk, const VolumeFacts& volume);
@@ -40,20 +40,21 @@ private:
     void endIfUnreadable();
     void tellEndOf(const RunResult& result);
     void tellToolLines();
-    contract::Name stepType() const;
+    Operation operation() const;
+    Sentence aboutTool(std::string_view key) const { return {key, program_.filename(), {}}; }
 
     void line(std::string_view line, bool isCut) override;
     void progressLine(std::string_view line) override;
     void lineLimitReached() override;
     void stopAsked() override;
-    void pause() override { surroundings_.road.flush(); }
-    void tick() override { surroundings_.road.flushIfDue(); }
+    void pause() override { context_.log.flush(); }
+    void tick() override { context_.log.flushIfDue(); }
 
     const Tool& tool_;
     std::filesystem::path program_;
     Access access_;
     Problems problems_;
-    RunSurroundings surroundings_;
+    JobContext& context_;
     std::unique_ptr<OutputReader> reader_;
     std::vector<ToolLine> lines_;
     bool isEnded_ = false;  ///< by us, because of the disk

@@ -1,14 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <cstdint>
 #include <limits>
 #include <span>
 #include <string>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -45,8 +45,8 @@ struct NotHeld {
 };
 
 /// Of each place of one disk, in the order in which they were mounted. Needs the right to mount.
-[[nodiscard]] std::variant<std::vector<MountPoint>, NotHeld> holdMountPoints(
-    const std::vector<MountPlace>& places);
+[[nodiscard]] Result<std::vector<MountPoint>, NotHeld> holdMountPoints(
+    const std::vector<Mount>& places);
 
 // What follows allocates nothing and may run in a forked child (signal-safety(7)). `points` are all
 // those of a disk, and `index` says which is meant.
@@ -62,8 +62,8 @@ struct NotHeld {
                                        std::size_t index) noexcept;
 
 /// The directory, to be mounted on (O_PATH). Where it has gone from a directory that only root may
-/// change, it is made again: whoever had made it takes it away with the mount. None, with errno:
-/// ESTALE when something else is in its place.
+/// change, it is made again: the program that made it takes it away with the mount. None, with
+/// errno: ESTALE when something else is in its place.
 [[nodiscard]] FileDescriptor openToMountOn(std::span<const MountPoint> points,
                                            std::size_t index) noexcept;
 
@@ -79,5 +79,34 @@ public:
 private:
     char text_[sizeof "/proc/self/fd/-2147483648/" + 255];
 };
+
+/// All that it takes to mount a place again as it was, but where that is. Made ready beforehand,
+/// because `perform` may have to run where nothing else can.
+struct MountCall {
+    std::string source;  ///< the device; of a bind mount the way from the root of the file system
+    std::string target;  ///< as the user knows it
+    std::string filesystem;
+    std::string data;         ///< the file system's own options
+    unsigned long flags = 0;  ///< of mount(2)
+    bool isBind = false;
+};
+
+/// The places of one disk, in the order in which they were mounted.
+struct MountCalls {
+    std::vector<MountCall> calls;
+    std::vector<MountPoint> points;
+    std::size_t whole = MountPoint::none;  ///< which shows all of the file system, for bind mounts
+};
+
+/// Keeps hold of where the places are. Needs the right to mount.
+[[nodiscard]] Result<MountCalls, NotHeld> mountCallsFor(const std::vector<Mount>& places);
+
+/// Mounts one of them; 0, or an errno value: ESTALE when its place is another now. Allocates
+/// nothing and may run in a forked child (signal-safety(7)).
+[[nodiscard]] int perform(const MountCalls& calls, std::size_t index) noexcept;
+
+/// Whether what shows at the place is none of these, the places of one disk: who unmounts it by its
+/// path unmounts another. NO when it is not known.
+[[nodiscard]] bool isCovered(const Mount& place, const std::vector<Mount>& places);
 
 }  // namespace pellar

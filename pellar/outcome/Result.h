@@ -25,10 +25,10 @@ class [[nodiscard]] Result {
 
 public:
     template <class Other = T>
-        requires(std::is_constructible_v<T, Other> && !std::is_same_v<std::remove_cvref_t<Other>, E> &&
-                 !std::is_same_v<std::remove_cvref_t<Other>, Result> &&
-                 std::is_convertible_v<Other, T>)
-    Result(Other&& value) : held_(std::in_place_index<0>, std::forward<Other>(value))
+    requires(std::is_constructible_v<T, Other> && !std::is_same_v<std::remove_cvref_t<Other>, E> &&
+             !std::is_same_v<std::remove_cvref_t<Other>, Result> && std::is_convertible_v<Other, T>)
+        Result(Other&& value)
+        : held_(std::in_place_index<0>, std::forward<Other>(value))
     {
     }
     Result(E error) : held_(std::in_place_index<1>, std::move(error)) {}

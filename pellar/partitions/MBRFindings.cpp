@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/partitions/MBRFindings.h"
+#include "pellar/partitions/MapReport.h"
 
-#include "pellar/partitions/Extents.h"
+#include "pellar/partitions/Finding.h"
 
 #include <algorithm>
 #include <limits>

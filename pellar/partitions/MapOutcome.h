@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/jobs/Outcome.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/partitions/MapReport.h"
 
 namespace pellar {

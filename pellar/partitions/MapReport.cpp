@@ -1,9 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/MapReport.h"
 
-#include "pellar/partitions/GPTFindings.h"
-#include "pellar/partitions/MBRFindings.h"
-
 #include <algorithm>
 
 namespace pellar {

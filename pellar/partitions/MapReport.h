@@ -23,4 +23,14 @@ struct MapReport {
 /// Judges a map by what was read of it. Pure.
 [[nodiscard]] MapReport reportOn(const PartitionMap& map);
 
+/// All that is wrong with a GUID partition table, its copies first, then its partitions. Pure.
+[[nodiscard]] std::vector<Finding> gptFindings(const PartitionMap& map);
+
+/// Two good copies that say the same.
+[[nodiscard]] bool isSameTable(const GPTHeader& a, const GPTHeader& b);
+
+/// All that is wrong with a classic partition table. It has no second copy, so none of it can be
+/// repaired without a person. Pure.
+[[nodiscard]] std::vector<Finding> mbrFindings(const PartitionMap& map);
+
 }  // namespace pellar

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/partitions/PartitionMap.h"
 
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 
 #include <algorithm>
 #include <utility>

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/partitions/GPTEntries.h"
+#include "pellar/partitions/GPT.h"
 #include "pellar/partitions/MBR.h"
 
 #include <optional>

@@ -1,13 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/permissions/Permissions.h"
-#include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
+#include "pellar/packages/Accounts.h"
+#include "pellar/packages/Permissions.h"
+#include "pellar/packages/Reference.h"
+#include "pellar/packages/RootDirectory.h"
+#include "pellar/texts/Texts.h"
 
 #include <sys/stat.h>
 
+#include <string>
 #include <variant>
+#include <vector>
 
 namespace pellar {
 
@@ -41,5 +45,26 @@ enum class Contents {
 
 /// Reads the permissions of what was found once more; none when that fails.
 [[nodiscard]] std::optional<Permissions> permissionsOf(int object, struct stat& status);
+
+/// In what a file differs from its reference. Where the kind differs nothing else is compared.
+struct Difference {
+    bool kind = false;
+    bool mode = false;
+    bool user = false;
+    bool group = false;
+    bool capabilities = false;
+
+    bool isNone() const { return !kind && !mode && !user && !group && !capabilities; }
+    friend bool operator==(const Difference&, const Difference&) = default;
+};
+
+/// A symbolic link has no mode of its own (symlink(7)), and only regular files have capabilities.
+Difference compare(const Reference& should, const Permissions& is);
+
+/// A line for each difference, in the user's language: “Permissions differ on “usr/bin/x”: they
+/// are -rw-rw-r--, should be -rw-r--r--.” Names are made fit to be shown.
+std::vector<std::string> linesOf(const Difference& difference, const Reference& should,
+                                 const Permissions& is, const Accounts& accounts,
+                                 const Texts& texts);
 
 }  // namespace pellar

@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/InstalledReferences.h"
 
-#include "pellar/permissions/InstalledSystem.h"
-#include "pellar/permissions/dpkg/ArchiveFetch.h"
-#include "pellar/permissions/dpkg/DpkgReferences.h"
-#include "pellar/permissions/pacman/PacmanReferences.h"
-#include "pellar/permissions/reader/ReaderProcess.h"
-#include "pellar/permissions/rpm/DatabaseCopy.h"
-#include "pellar/permissions/rpm/RPMReferences.h"
+#include "pellar/packages/InstalledSystem.h"
+#include "pellar/packages/PacmanReferences.h"
+#include "pellar/packages/RPMReferences.h"
+#include "pellar/packages/dpkg/AptArchives.h"
+#include "pellar/packages/dpkg/DpkgReferences.h"
+#include "pellar/packages/reader/ReaderProcess.h"
 #include "pellar/process/Command.h"
 
 #include <utility>

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/permissions/Accounts.h"
-#include "pellar/permissions/Reference.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/process/OutputBudget.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/packages/Accounts.h"
+#include "pellar/packages/Reference.h"
+#include "pellar/packages/RootDirectory.h"
+#include "pellar/process/ProcessOutput.h"
+#include "pellar/process/Stopping.h"
 #include "pellar/texts/Sentence.h"
 
 #include <filesystem>

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/permissions/Restoring.h"
 
-#include "pellar/permissions/Capabilities.h"
-#include "pellar/permissions/Comparison.h"
+#include "pellar/packages/Permissions.h"
+#include "pellar/permissions/Inspection.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>

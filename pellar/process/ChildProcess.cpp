@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ChildProcess.h"
 
-#include "pellar/process/ForkedSignals.h"
+#include "pellar/process/ChildProcess.h"
 #include "pellar/process/ReducedRights.h"
 
 #include <fcntl.h>
@@ -142,8 +142,8 @@ int errorOfExec(int descriptor)
 
 }  // namespace
 
-std::variant<ChildProcess, NotStarted> ChildProcess::start(const Command& command,
-                                                           const ChildStreams& streams)
+Result<ChildProcess, NotStarted> ChildProcess::start(const Command& command,
+                                                     const ChildStreams& streams)
 {
     int ends[2];
     if (::pipe2(ends, O_CLOEXEC) != 0)
@@ -157,7 +157,7 @@ std::variant<ChildProcess, NotStarted> ChildProcess::start(const Command& comman
     const pid_t id = forkTool(ready);
     if (id < 0)
         return NotStarted{errno};
-    ::setpgid(id, id);  // whoever is first: a signal to the group must find it
+    ::setpgid(id, id);  // parent or child first: a signal to the group must find it
     ChildProcess child(id, FileDescriptor(static_cast<int>(::syscall(SYS_pidfd_open, id, 0))));
     const int pidfdError = child.end_ ? 0 : errno;
     failureWriter.reset();
@@ -202,7 +202,7 @@ Ending ChildProcess::reap() noexcept
     while (waited < 0 && errno == EINTR);
     id_ = 0;
     if (waited < 0)
-        return NotStarted{errno};  // somebody else reaped it: there is no status to trust
+        return NotStarted{errno};  // it was reaped elsewhere: there is no status to trust
     if (WIFSIGNALED(status))
         return Killed{WTERMSIG(status)};
     return Exited{WEXITSTATUS(status)};

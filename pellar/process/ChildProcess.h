@@ -1,16 +1,46 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/Access.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/Command.h"
-#include "pellar/process/Ending.h"
 #include "pellar/process/FileDescriptor.h"
 
+#include <pthread.h>
 #include <sys/types.h>
 
-#include <variant>
+#include <csignal>
 
 namespace pellar {
+
+/// No handler of ours runs in a forked child, and none in this thread, while this lives.
+class SignalsBlocked {
+public:
+    SignalsBlocked()
+    {
+        sigset_t all;
+        ::sigfillset(&all);
+        ::pthread_sigmask(SIG_SETMASK, &all, &before_);
+    }
+    SignalsBlocked(const SignalsBlocked&) = delete;
+    SignalsBlocked& operator=(const SignalsBlocked&) = delete;
+    ~SignalsBlocked() { ::pthread_sigmask(SIG_SETMASK, &before_, nullptr); }
+
+private:
+    sigset_t before_;
+};
+
+/// In a forked child, before its exec: nothing of ours is handled, ignored or blocked there. Safe
+/// after a fork (signal-safety(7)).
+inline void resetSignals()
+{
+    struct sigaction standard = {};
+    standard.sa_handler = SIG_DFL;
+    for (int signal = 1; signal < NSIG; ++signal)
+        ::sigaction(signal, &standard, nullptr);
+    sigset_t none;
+    ::sigemptyset(&none);
+    ::pthread_sigmask(SIG_SETMASK, &none, nullptr);
+}
 
 /// The numbers under which a tool finds what it inherits besides its standard descriptors.
 inline constexpr int diskDescriptorOfTool = 3;
@@ -22,7 +52,7 @@ struct ChildStreams {
     int disk = -1;      ///< becomes diskDescriptorOfTool
     int progress = -1;  ///< becomes progressDescriptorOfTool
     /// A program that writes to a disk is asked to end when the host dies, and may go on printing
-    /// to nobody until it has come to a good place; any other is killed.
+    /// to no reader until it has come to a good place; any other is killed.
     Access access = Access::ReadOnly;
     /// Starts with SIGINT and SIGTERM ignored: nothing but SIGKILL ends it before its time.
     bool ignoresStops = false;
@@ -38,8 +68,8 @@ struct ChildStreams {
 /// ended.
 class ChildProcess {
 public:
-    [[nodiscard]] static std::variant<ChildProcess, NotStarted> start(const Command& command,
-                                                                      const ChildStreams& streams);
+    [[nodiscard]] static Result<ChildProcess, NotStarted> start(const Command& command,
+                                                                const ChildStreams& streams);
 
     ChildProcess(ChildProcess&& other) noexcept;
     ChildProcess& operator=(ChildProcess&&) = delete;

@@ -2,7 +2,7 @@
 #include "pellar/process/Command.h"
 
 #include "contract/foundation/UTF8.h"
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <unistd.h>
 
@@ -25,8 +25,7 @@ bool isRunnable(const std::filesystem::path& program)
 {
     std::error_code error;
     return std::filesystem::is_regular_file(program, error) &&
-           ::access(program.c_str(), X_OK) == 0 &&
-           (::geteuid() != 0 || std::holds_alternative<FileDescriptor>(openTrusted(program)));
+           ::access(program.c_str(), X_OK) == 0 && (::geteuid() != 0 || openTrusted(program));
 }
 
 }  // namespace

@@ -4,9 +4,32 @@
 #include <filesystem>
 #include <string>
 #include <string_view>
+#include <variant>
 #include <vector>
 
 namespace pellar {
+
+/// What a run of a tool may do to the disk.
+enum class Access { ReadOnly, ReadWrite };
+
+struct Exited {
+    int status;
+    friend bool operator==(const Exited&, const Exited&) = default;
+};
+
+struct Killed {
+    int signal;
+    friend bool operator==(const Killed&, const Killed&) = default;
+};
+
+struct NotStarted {
+    int error;  ///< errno
+    friend bool operator==(const NotStarted&, const NotStarted&) = default;
+};
+
+/// How a run of a tool ended. Only `Exited` carries a status, so a tool that crashed or never
+/// started cannot be mistaken for one that answered 0.
+using Ending = std::variant<Exited, Killed, NotStarted>;
 
 /// A program and its arguments. It is never given to a shell.
 struct Command {
@@ -23,7 +46,7 @@ std::string shown(const Command& command);
 
 /// The program `name` in the first directory of `searchPath` ("/usr/sbin:/usr/bin") that has it as
 /// an executable regular file; empty when none has. Directories that are not absolute are
-/// skipped: what lies in the current directory is nobody's tool. So is, for root, what others could
+/// skipped: the current directory holds no tools. So is, for root, what others could
 /// change.
 std::filesystem::path findProgram(std::string_view name, std::string_view searchPath);
 

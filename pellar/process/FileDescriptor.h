@@ -44,4 +44,10 @@ struct Pipe {
 /// None when the process or the system has no descriptors left; errno says which.
 [[nodiscard]] std::optional<Pipe> makePipe();
 
+/// A pseudo-terminal for a program that holds its output back unless it sees one (pty(7)): raw, so
+/// that nothing is added to what is written, without echo, and so wide that no line is wrapped.
+/// It becomes no process's controlling terminal. The read end does not block; it answers EIO when
+/// every writer is gone. None when the system has no pseudo-terminals, as in a bare rescue shell.
+[[nodiscard]] std::optional<Pipe> makePseudoTerminal();
+
 }  // namespace pellar

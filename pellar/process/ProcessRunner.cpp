@@ -2,8 +2,8 @@
 #include "pellar/process/ProcessRunner.h"
 
 #include "pellar/process/ChildProcess.h"
-#include "pellar/process/LineSplitter.h"
-#include "pellar/process/PseudoTerminal.h"
+#include "pellar/process/FileDescriptor.h"
+#include "pellar/process/ProcessOutput.h"
 
 #include <poll.h>
 #include <unistd.h>
@@ -227,10 +227,9 @@ RunResult runTool(const RunRequest& request, StopSwitch& stop, RunListener& list
     auto started = ChildProcess::start(
         request.command, {output->writeEnd.get(), request.disk, progress->writeEnd.get(),
                           request.access, request.ignoresStops});
-    if (const auto* const failure = std::get_if<NotStarted>(&started))
-        return {*failure};
-    Run run(request, stop, listener, std::move(std::get<ChildProcess>(started)), std::move(*output),
-            std::move(*progress));
+    if (!started)
+        return {started.error()};
+    Run run(request, stop, listener, *std::move(started), std::move(*output), std::move(*progress));
     return run.toItsEnd();
 }
 

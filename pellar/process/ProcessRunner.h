@@ -1,12 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/process/Access.h"
 #include "pellar/process/Command.h"
-#include "pellar/process/Ending.h"
-#include "pellar/process/OutputBudget.h"
-#include "pellar/process/StopLadder.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/ProcessOutput.h"
+#include "pellar/process/Stopping.h"
 
 #include <chrono>
 #include <cstddef>

@@ -9,7 +9,7 @@
 
 namespace pellar {
 
-/// Who a process becomes that root starts with reduced rights: nobody.
+/// The user and group of a process that root starts with reduced rights: nobody.
 inline constexpr uid_t userOfReduced = 65534;
 inline constexpr gid_t groupOfReduced = 65534;
 

@@ -9,7 +9,7 @@
 
 namespace pellar {
 
-/// The English text, and text key, of an error code. Empty for 0 and for codes that are nobody's.
+/// The English text, and text key, of an error code. Empty for 0 and for unknown codes.
 std::string_view errorTextKey(contract::ErrorCode code);
 
 /// The same in the user's language; a code without a text is shown by its number. Never empty.

@@ -28,6 +28,20 @@ std::string_view objectionTo(std::string_view filesystemType)
     return "there is no tool for the file system “%1$@”";
 }
 
+// e2scrub(8) checks a snapshot, for which it needs a logical volume and free space beside it.
+// xfs_scrub(8) says of itself: "xfs_scrub is an immature utility! Do not run this program unless
+// you have backups of your data!"
+std::string_view objectionInUse(std::string_view filesystemType)
+{
+    if (filesystemType.starts_with("ext"))
+        return "%1$@ can be verified in use only from a snapshot, and none is made here; start a "
+               "rescue system to verify it";
+    if (filesystemType == "xfs")
+        return "the tool that verifies %1$@ in use calls itself experimental, and is not used; "
+               "start a rescue system to verify it";
+    return "%1$@ cannot be verified while it is in use; start a rescue system to verify it";
+}
+
 }  // namespace
 
 Capability capabilityFor(std::string_view filesystemType, Operation operation,
@@ -49,6 +63,15 @@ Capability capabilityFor(std::string_view filesystemType, Operation operation,
     if (program.empty())
         return missing(*tool, tool->repairName);
     return {contract::kPLNoError, {}, std::move(program)};
+}
+
+Capability liveCapabilityFor(std::string_view filesystemType, std::string_view toolPath)
+{
+    if (filesystemType == "btrfs")
+        return capabilityFor(filesystemType, Operation::Verify, toolPath);
+    return {contract::kPLErrorUnsupported,
+            {objectionInUse(filesystemType), contract::printable(filesystemType), {}},
+            {}};
 }
 
 }  // namespace pellar

@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/pellar/ErrorCodes.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/texts/Sentence.h"
-#include "pellar/tools/Operation.h"
 
 #include <filesystem>
 #include <string_view>
@@ -22,5 +22,10 @@ struct Capability {
 /// `filesystemType` as libblkid names it; `toolPath` is searched for the tool.
 Capability capabilityFor(std::string_view filesystemType, Operation operation,
                          std::string_view toolPath);
+
+/// Whether a volume of this kind, as libblkid names it, can be verified while it stays mounted and
+/// is written to: with an answer that is true, by a tool that is there. It needs root.
+[[nodiscard]] Capability liveCapabilityFor(std::string_view filesystemType,
+                                           std::string_view toolPath);
 
 }  // namespace pellar

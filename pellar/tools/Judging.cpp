@@ -2,7 +2,7 @@
 #include "pellar/tools/Judging.h"
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/volumes/DiskBytes.h"
+#include "pellar/bytes/Bytes.h"
 
 #include <algorithm>
 #include <cerrno>

@@ -1,8 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/tools/ToolTable.h"
 
-#include "pellar/tools/Tools.h"
-
 #include <algorithm>
 #include <array>
 

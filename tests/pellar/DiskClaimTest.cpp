@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/disks/DiskClaim.h"
 
-#include "pellar/volumes/DiskUse.h"
-#include "tests/pellar/Workshop.h"
+#include "pellar/mounts/MountTable.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
@@ -25,19 +25,19 @@ ErrorCode claimError(const std::filesystem::path& path, Access access = Access::
 
 TEST(DiskClaim, RefusesWhatIsNoDisk)
 {
-    const test::Workshop workshop;
-    EXPECT_EQ(claimError(workshop.path("nothing")), contract::kPLErrorCannotOpen);
-    EXPECT_EQ(claimError(workshop.path("")), contract::kPLErrorCannotOpen) << "a directory";
-    ASSERT_EQ(::mkfifo(workshop.path("fifo").c_str(), 0600), 0);
-    EXPECT_EQ(claimError(workshop.path("fifo")), contract::kPLErrorCannotOpen);
+    const test::TestDirectory directory;
+    EXPECT_EQ(claimError(directory.path("nothing")), contract::kPLErrorCannotOpen);
+    EXPECT_EQ(claimError(directory.path("")), contract::kPLErrorCannotOpen) << "a directory";
+    ASSERT_EQ(::mkfifo(directory.path("fifo").c_str(), 0600), 0);
+    EXPECT_EQ(claimError(directory.path("fifo")), contract::kPLErrorCannotOpen);
     EXPECT_EQ(claimError("/dev/zero"), contract::kPLErrorCannotOpen);
 }
 
 TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", "x");
-    const auto disk = test::reference(workshop.path("disk"));
+    const test::TestDirectory directory;
+    directory.write("disk", "x");
+    const auto disk = test::reference(directory.path("disk"));
     {
         const auto reader = DiskClaim::take(*disk, Access::ReadOnly, {});
         EXPECT_EQ(claimError(disk->path), contract::kPLNoError);
@@ -49,48 +49,49 @@ TEST(DiskClaim, IsSharedByReadersAndKeptFromWriters)
 
 TEST(DiskClaim, RefusesTheFileBehindALoopDevice)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", "x");
-    workshop.write("other", "x");
-    std::filesystem::create_hard_link(workshop.path("disk"), workshop.path("second name"));
-    std::filesystem::create_directories(workshop.path("block/loop0/loop"));
-    std::filesystem::create_directories(workshop.path("block/sda"));
-    workshop.write("block/loop0/loop/backing_file", workshop.path("second name").string() + "\n");
-    const SystemPaths paths{workshop.path("block"), "/proc/self/mountinfo"};
-    EXPECT_EQ(claimError(workshop.path("disk"), Access::ReadOnly, paths),
+    const test::TestDirectory directory;
+    directory.write("disk", "x");
+    directory.write("other", "x");
+    std::filesystem::create_hard_link(directory.path("disk"), directory.path("second name"));
+    std::filesystem::create_directories(directory.path("block/loop0/loop"));
+    std::filesystem::create_directories(directory.path("block/sda"));
+    directory.write("block/loop0/loop/backing_file", directory.path("second name").string() + "\n");
+    const SystemPaths paths{directory.path("block"), "/proc/self/mountinfo"};
+    EXPECT_EQ(claimError(directory.path("disk"), Access::ReadOnly, paths),
               contract::kPLErrorDiskInUse);
-    EXPECT_EQ(claimError(workshop.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
+    EXPECT_EQ(claimError(directory.path("other"), Access::ReadOnly, paths), contract::kPLNoError);
 }
 
-// The device manager locks a device while it looks at it, and the main thread waits for nobody.
+// The device manager locks a device while it looks at it, and the main thread does not wait.
 TEST(DiskClaim, ALockedDeviceIsWaitedForByTheJob)
 {
     if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
         GTEST_SKIP() << obstacle;
-    const test::Workshop workshop;
-    const orvane::test::LoopDevice device(workshop.makeExt("disk", 16U << 20U));
+    const test::TestDirectory directory;
+    const orvane::test::LoopDevice device(directory.makeExt("disk", 16U << 20U));
     if (device.name().empty())
         GTEST_SKIP() << "the system gives no loop device";
     const auto disk = test::reference(device.name());
     const FileDescriptor other(::open(device.name().c_str(), O_RDONLY | O_CLOEXEC));
     for (const bool isLetGo : {true, false}) {
         ASSERT_EQ(::flock(other.get(), LOCK_EX), 0);
-        test::Bench bench;
-        const auto begun = bench.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
+        test::JobFixture library;
+        const auto begun = library.tool->beginStoragesystemFilesystemVerifyForDisk(disk);
         EXPECT_EQ(begun, contract::kPLNoError);
         EXPECT_EQ(DiskClaim::attempt(*disk, Access::ReadOnly, {}).index(), 2U) << "locked still";
         if (isLetGo)
             ::flock(other.get(), LOCK_UN);
-        bench.finish(begun);
-        EXPECT_EQ(bench.listener.error, isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
+        library.finish(begun);
+        EXPECT_EQ(library.listener.error,
+                  isLetGo ? contract::kPLNoError : contract::kPLErrorDiskInUse);
     }
 }
 
 TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
 {
-    const test::Workshop workshop;
-    workshop.write("disk", std::string(10'000, 'x'));
-    auto disk = *test::reference(workshop.path("disk"));
+    const test::TestDirectory directory;
+    directory.write("disk", std::string(10'000, 'x'));
+    auto disk = *test::reference(directory.path("disk"));
     disk.offset = 4096;
     disk.length = 4096;
     const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
@@ -104,37 +105,66 @@ TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
 
 TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory directory;
     for (const char* const what : {"deleted", "moved", "replaced"}) {
-        workshop.write("disk", std::string(10'000, 'x'));
-        const auto disk = *test::reference(workshop.path("disk"));
+        directory.write("disk", std::string(10'000, 'x'));
+        const auto disk = *test::reference(directory.path("disk"));
         const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
         const auto& claim = std::get<DiskClaim>(taken);
         EXPECT_TRUE(claim.isStillInPlace());
-        std::filesystem::rename(disk.path, workshop.path("elsewhere"));
+        std::filesystem::rename(disk.path, directory.path("elsewhere"));
         if (what == std::string_view("deleted"))
-            std::filesystem::remove(workshop.path("elsewhere"));
+            std::filesystem::remove(directory.path("elsewhere"));
         else if (what == std::string_view("replaced"))
-            workshop.write("disk", std::string(10'000, 'x'));
+            directory.write("disk", std::string(10'000, 'x'));
         EXPECT_FALSE(claim.isStillInPlace()) << what;
         EXPECT_TRUE(claim.isStillWhole()) << what;
     }
 }
 
-TEST(MountInfo, FindsADeviceByItsNumber)
+TEST(MountTable, FindsADeviceByItsNumberOrItsSource)
 {
-    constexpr std::string_view mountInfo =
-        "36 35 8:17 / /mnt rw,noatime shared:1 - ext4 /dev/sdb1 rw\n"
-        "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n"
-        "38";
-    EXPECT_TRUE(mountInfoNames(mountInfo, 8, 17));
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 1)) << "the start of another number";
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 2)) << "in another column";
-    EXPECT_FALSE(mountInfoNames(mountInfo, 8, 3)) << "in another column";
-    EXPECT_FALSE(mountInfoNames("", 8, 17));
-    for (const char* const unreadable : {"/nonexistent", "/"})  // opened, but not read
-        EXPECT_TRUE(isMounted(makedev(8, 17), {"/sys/block", unreadable}))
-            << "what is not known to be free is not touched";
+    const auto mounts = parseMounts(
+        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw,seclabel,errors=remount-ro\n"
+        "30 22 8:3 /sub /bind rw - ext4 /dev/sda3 rw\n"
+        "31 22 8:3 / /media/My\\040Disk\\134 ro,nosuid - ext4 /dev/sda3 rw\n"
+        "32 22 0:40 /@home /home rw master:2 shared:3 - btrfs /dev/sdb1 ro,errors=remount-ro\n"
+        "33 22 8:17 / /gone rw - ext4 /dev/sdb1 rw\n"
+        "nonsense\n33 22 8:4\n");
+    ASSERT_EQ(mounts.size(), 5U) << "lines that are no mounts are left out";
+    const auto media = mountOfDevice(mounts, makedev(8, 3), "/dev/sda3");
+    ASSERT_TRUE(media);
+    EXPECT_EQ(media->target, "/media/My Disk\\") << "the whole goes before a part of it";
+    EXPECT_TRUE(media->isReadOnly);
+    EXPECT_EQ(mountOfDevice(mounts, makedev(8, 33), "/dev/sdb1")->target, "/home")
+        << "several devices, one number of its own; a device of another number has had the name";
+    EXPECT_EQ(mounts[0].options, "rw,relatime,errors=remount-ro") << "what the kernel takes";
+    EXPECT_FALSE(mounts[3].isReadOnly) << "the kernel's answer to an error is nobody's wish";
+    EXPECT_FALSE(mounts[3].isBind()) << "a subvolume is mounted by an option";
+    EXPECT_FALSE(mountOfDevice(mounts, makedev(8, 9), "/dev/sda9"));
+    EXPECT_EQ(mountHolding(mounts, "/home/me")->device, makedev(0, 40));
+    EXPECT_EQ(mountHolding(mounts, "/homes")->device, makedev(8, 2));
+}
+
+TEST(MountTable, WhatIsNotKnownToBeFreeIsMounted)
+{
+    const test::TestDirectory directory;
+    directory.write("mounts",
+                    "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
+                    "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
+    directory.write("none", "");
+    struct Case {
+        std::filesystem::path list;
+        unsigned minor;
+        bool isMounted;
+    };
+    for (const Case& c :
+         {Case{directory.path("mounts"), 17, true}, Case{directory.path("mounts"), 1, false},
+          Case{directory.path("mounts"), 2, false}, Case{directory.path("mounts"), 3, false},
+          Case{directory.path("none"), 17, false}, Case{"/nonexistent", 17, true},
+          Case{"/", 17, true}})
+        EXPECT_EQ(isMounted(makedev(8, c.minor), {"/sys/block", c.list}), c.isMounted)
+            << c.list << ' ' << c.minor;
 }
 
 }  // namespace

@@ -1,28 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/tools/E2fsckOutput.h"
+#include "pellar/tools/ext/E2fsckOutput.h"
 
-#include "pellar/tools/Tools.h"
 #include "tests/pellar/Recorded.h"
 
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <variant>
 
 namespace {
 
 using namespace pellar;
-using test::readAll;
-using test::Reading;
-using test::recordedLines;
 
-std::vector<std::string> problemsIn(const Reading& reading)
+test::ReadOutput readAll(const std::vector<std::string>& lines)
 {
-    std::vector<std::string> problems;
-    for (const ToolLine& line : reading.lines)
-        if (line.kind == ToolLine::Kind::Problem)
-            problems.push_back(line.text);
-    return problems;
+    return test::readAll(e2fsck(), lines);
+}
+
+test::ReadOutput readRecording(std::string_view name)
+{
+    return readAll(test::recordedLines("e2fsck/" + std::string(name)));
 }
 
 TEST(E2fsckOutput, FindsTheProblemsInRecordedOutput)
@@ -53,17 +49,17 @@ TEST(E2fsckOutput, FindsTheProblemsInRecordedOutput)
           Case{"crashed",
                {"Signal (11) SIGSEGV (sent from pid 6706) si_code=SI_USER "},
                "e2fsck tells of its crash"}})
-        EXPECT_EQ(problemsIn(readAll(recordedLines(c.recording))), c.problems)
+        EXPECT_EQ(readRecording(c.recording).problems(), c.problems)
             << c.recording << ": " << c.because;
 }
 
 TEST(E2fsckOutput, PassesEveryLineOnOnceAndInOrder)
 {
-    for (const std::string& name : test::recordings()) {
-        std::vector<std::string> expected = recordedLines(name);
+    for (const std::string& name : test::recordingsOfE2fsck()) {
+        std::vector<std::string> expected = test::recordedLines(name);
         std::erase_if(expected, [](const std::string& line) { return line.empty(); });
         std::vector<std::string> passedOn;
-        for (const ToolLine& line : readAll(recordedLines(name)).lines)
+        for (const ToolLine& line : readAll(test::recordedLines(name)).lines)
             passedOn.push_back(line.text);
         EXPECT_EQ(passedOn, expected) << name;
     }
@@ -71,13 +67,13 @@ TEST(E2fsckOutput, PassesEveryLineOnOnceAndInOrder)
 
 TEST(E2fsckOutput, SumsUpWhatWasSaid)
 {
-    EXPECT_TRUE(readAll(recordedLines("journal-skipped")).findings.skippedJournal);
-    EXPECT_TRUE(readAll(recordedLines("journal-replayed")).findings.replayedJournal);
-    EXPECT_TRUE(readAll(recordedLines("external-journal-missing")).findings.lacksExternalJournal);
-    EXPECT_TRUE(readAll(recordedLines("gave-up")).findings.hasErrorsLeft);
-    EXPECT_FALSE(readAll(recordedLines("gave-up")).findings.isComplete);
-    EXPECT_EQ(readAll(recordedLines("crashed")).findings.crashSignal, 11);
-    const Findings repaired = readAll(recordedLines("repaired")).findings;
+    EXPECT_TRUE(readRecording("journal-skipped").findings.skippedJournal);
+    EXPECT_TRUE(readRecording("journal-replayed").findings.replayedJournal);
+    EXPECT_TRUE(readRecording("external-journal-missing").findings.lacksExternalJournal);
+    EXPECT_TRUE(readRecording("gave-up").findings.hasErrorsLeft);
+    EXPECT_FALSE(readRecording("gave-up").findings.isComplete);
+    EXPECT_EQ(readRecording("crashed").findings.crashSignal, 11);
+    const Findings repaired = readRecording("repaired").findings;
     EXPECT_TRUE(repaired.wasModified);
     EXPECT_EQ(repaired.corrections, repaired.problems);
     EXPECT_EQ(repaired.corrections, 10U);

@@ -5,9 +5,7 @@
 #include "tests/support/FailingDisk.h"
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/process/Command.h"
 #include "tests/pellar/partitions/DiskMaker.h"
-#include "tests/support/VolumeStates.h"
 
 #include <gtest/gtest.h>
 
@@ -28,6 +26,7 @@ struct BadPlace {
 const std::vector<BadPlace> badPlaces{
     {"ext4", {134 << 10, 198 << 10}, "the inode table"},
     {"ext4", {0, 4096}, "the superblock"},
+    {"ext4", {0, 16 << 20}, "all of it, which is no empty disk"},
     {"vfat", {2048, 6144}, "the first table"},
     {"vfat", {0, 512}, "the boot sector"},
     {"exfat", {2 << 20, (2 << 20) + 65536}, "the bitmap, of which it says no more than failed"},
@@ -49,35 +48,24 @@ protected:
     {
         if (const std::string obstacle = FailingDisk::obstacle(); !obstacle.empty())
             GTEST_SKIP() << obstacle;
-        std::filesystem::create_directory(workshop_.path("mounted"));
+        std::filesystem::create_directory(directory_.path("mounted"));
     }
 
     /// None where the program that makes it is not installed.
     std::filesystem::path make(std::string_view filesystem) const
     {
-        if (filesystem == "ext4")
-            return makeExt();
-        const auto& makers = orvane::test::volumeMakers();
-        const auto maker = std::find_if(makers.begin(), makers.end(), [filesystem](const auto& m) {
-            return m.filesystem == filesystem;
-        });
-        if (findProgram(maker->command.front(), "/usr/sbin:/usr/bin:/sbin:/bin").empty())
-            return {};
-        workshop_.write("backing", {});
-        std::filesystem::resize_file(workshop_.path("backing"), maker->bytes);
-        workshop_.prepare(maker->command, workshop_.path("backing"));
-        return workshop_.path("backing");
+        return filesystem == "ext4" ? makeExt() : directory_.makeVolume("backing", filesystem);
     }
 
     std::filesystem::path makeExt() const
     {
-        const auto image = workshop_.makeExt("backing", 16U << 20U, {"-b", "1024"});
+        const auto image = directory_.makeExt("backing", 16U << 20U, {"-b", "1024"});
         for (int i = 0; i < 40; ++i)
-            workshop_.damage(image, "mkdir d" + std::to_string(i));
+            directory_.damage(image, "mkdir d" + std::to_string(i));
         return image;
     }
 
-    test::Workshop workshop_;
+    test::TestDirectory directory_;
 };
 
 void expectAdviceToCopy(const test::Listener& heard, std::string_view because)
@@ -97,44 +85,35 @@ TEST_F(FailingDiskTest, IsNeitherDamagedNorWrittenTo)
                 continue;
             // Not known by its label or kind, as a disk whose beginning cannot be read.
             const bool isListed = place.bad.start > 0;
-            const FailingDisk failing(workshop_.path("mounted"), backing, {place.bad});
+            const FailingDisk failing(directory_.path("mounted"), backing, {place.bad});
             const auto disk = test::reference(
                 failing.path(), isListed ? std::string(place.filesystem) : std::string());
-            test::Bench bench;
-            ASSERT_EQ(repairs ? bench.repair(disk) : bench.verify(disk), 0);
+            test::JobFixture library;
+            ASSERT_EQ(repairs ? library.repair(disk) : library.verify(disk), 0);
             const std::string because =
                 std::string(place.filesystem) + ", " + std::string(place.because);
             if (repairs && place.filesystem == "btrfs" && isListed)
-                EXPECT_EQ(bench.listener.error, contract::kPLErrorNoRepairHere) << because;
+                EXPECT_EQ(library.listener.error, contract::kPLErrorNoRepairHere) << because;
             else
-                expectAdviceToCopy(bench.listener, because);
+                expectAdviceToCopy(library.listener, because);
             EXPECT_FALSE(failing.wasWritten()) << because;
         }
-}
-
-TEST_F(FailingDiskTest, IsNoEmptyDisk)
-{
-    const auto backing = make("ext4");
-    const FailingDisk failing(workshop_.path("mounted"), backing, {{0, 16U << 20U}});
-    test::Bench bench;
-    ASSERT_EQ(bench.verify(test::reference(failing.path(), "")), 0);
-    expectAdviceToCopy(bench.listener, "all of it is bad");
 }
 
 // Nothing is restored over a copy that was only not to be read.
 TEST_F(FailingDiskTest, IsNoDamagedPartitionMap)
 {
-    const auto backing = test::DiskImage::gpt(workshop_, "backing").path();
+    const auto backing = test::DiskImage::gpt(directory_, "backing").path();
     for (const FailingDisk::Bad bad :
          {FailingDisk::Bad{0, 512}, FailingDisk::Bad{32735 * 512, 32768 * 512}})
         for (const bool repairs : {false, true}) {
-            const FailingDisk failing(workshop_.path("mounted"), backing, {bad});
+            const FailingDisk failing(directory_.path("mounted"), backing, {bad});
             const auto whole = test::wholeDisk(failing.path());
-            test::Bench bench;
-            ASSERT_EQ(bench.finish(repairs ? bench.tool->beginPartitionMapRepairForDisk(whole)
-                                           : bench.tool->beginPartitionMapVerifyForDisk(whole)),
+            test::JobFixture library;
+            ASSERT_EQ(library.finish(repairs ? library.tool->beginPartitionMapRepairForDisk(whole)
+                                             : library.tool->beginPartitionMapVerifyForDisk(whole)),
                       0);
-            expectAdviceToCopy(bench.listener, "a copy of the partition map");
+            expectAdviceToCopy(library.listener, "a copy of the partition map");
             EXPECT_FALSE(failing.wasWritten());
         }
 }
@@ -143,28 +122,28 @@ TEST_F(FailingDiskTest, IsNoDamagedPartitionMap)
 TEST_F(FailingDiskTest, WhatOnlyARepairReadsIsReadBeforeIt)
 {
     const auto backing = make("ext4");
-    workshop_.damage(backing, "set_super_value free_blocks_count 1");
-    const FailingDisk failing(workshop_.path("mounted"), backing, {{8193 << 10, 8195 << 10}});
-    test::Bench bench;
-    ASSERT_EQ(bench.repair(test::reference(failing.path())), 0);
-    expectAdviceToCopy(bench.listener, "a backup of the superblock");
-    EXPECT_NE(bench.listener.message.find("byte 8388608 "), std::string::npos)
-        << bench.listener.message;
+    directory_.damage(backing, "set_super_value free_blocks_count 1");
+    const FailingDisk failing(directory_.path("mounted"), backing, {{8193 << 10, 8195 << 10}});
+    test::JobFixture library;
+    ASSERT_EQ(library.repair(test::reference(failing.path())), 0);
+    expectAdviceToCopy(library.listener, "a backup of the superblock");
+    EXPECT_NE(library.listener.message.find("byte 8388608 "), std::string::npos)
+        << library.listener.message;
     EXPECT_FALSE(failing.wasWritten());
 }
 
 TEST_F(FailingDiskTest, EndsARepairThatMeetsItOnTheWay)
 {
     const auto backing = make("ext4");
-    workshop_.damage(backing, "feature needs_recovery");
-    workshop_.damage(backing, "clri d7");
-    const FailingDisk failing(workshop_.path("mounted"), backing, {{134 << 10, 646 << 10}},
+    directory_.damage(backing, "feature needs_recovery");
+    directory_.damage(backing, "clri d7");
+    const FailingDisk failing(directory_.path("mounted"), backing, {{134 << 10, 646 << 10}},
                               FailingDisk::Since::FirstWrite);
-    test::Bench bench;
-    ASSERT_EQ(bench.repair(test::reference(failing.path())), 0);
+    test::JobFixture library;
+    ASSERT_EQ(library.repair(test::reference(failing.path())), 0);
     EXPECT_TRUE(failing.wasWritten()) << "it began";
-    expectAdviceToCopy(bench.listener, "it failed while it was being repaired");
-    EXPECT_EQ(std::count_if(bench.traces.begin(), bench.traces.end(),
+    expectAdviceToCopy(library.listener, "it failed while it was being repaired");
+    EXPECT_EQ(std::count_if(library.traces.begin(), library.traces.end(),
                             [](const std::string& line) { return line.starts_with("run: "); }),
               2)
         << "nothing more is asked of the disk";

@@ -1,25 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/Array.h"
-#include "pellar/jobs/DiskNaming.h"
 #include "pellar/jobs/JobLog.h"
-#include "tests/pellar/Workshop.h"
+#include "pellar/jobs/ToolRun.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
+
+#include <atomic>
 
 namespace {
 
 using namespace std::chrono_literals;
 using namespace pellar;
 
-struct Scene {
-    explicit Scene(const Texts& texts = english(), std::string name = "Disk")
-        : disk(test::reference("/dev/sdz9", "ext4", std::move(name))),
-          road(loop, {&listener,
-                      disk,
-                      {},
-                      [] {
-                      }}),
-          log(*disk, texts, road)
+struct LogFixture {
+    explicit LogFixture(const Texts& texts = english(), std::string name = "Disk")
+        : log(*test::reference("/dev/sdz9", "ext4", std::move(name)), texts, events)
     {
     }
 
@@ -30,39 +26,98 @@ struct Scene {
     }
     void deliver()
     {
-        road.flush();
+        events.flush();
         loop.drain();
     }
 
     test::TestLoop loop;
     test::Listener listener;
-    contract::DiskReferencePointer disk;
-    EventRoad road;
+    EventQueue events{loop, {&listener, {}, {}, [] {
+                             }}};
     JobLog log;
 };
+
+struct QueueFixture {
+    void waitUntilFull()
+    {
+        while (loop.waiting() < EventQueue::batchesUnderWay)
+            std::this_thread::yield();
+    }
+
+    test::TestLoop loop;
+    test::Listener listener;
+    EventQueue queue{loop, {&listener, {}, {}, [] {
+                            }}};
+};
+
+TEST(EventQueue, HoldsAFloodBackAndLosesNothing)
+{
+    constexpr std::size_t events = 50'000;
+    QueueFixture fixture;
+    std::atomic<std::size_t> added = 0;
+    std::jthread job([&] {
+        for (; added < events; ++added)
+            fixture.queue.add(Message{std::to_string(added), {}});
+        fixture.queue.add(Finished{});
+        fixture.queue.flush();
+    });
+    fixture.waitUntilFull();
+    EXPECT_LE(added, (EventQueue::batchesUnderWay + 1) * EventQueue::batchEvents);
+    ASSERT_TRUE(fixture.loop.runUntil([&] { return fixture.listener.finished == 1; }));
+    ASSERT_EQ(fixture.listener.plainLines.size(), events);
+    for (std::size_t i = 0; i < events; ++i)
+        ASSERT_EQ(fixture.listener.plainLines[i], std::to_string(i));
+}
+
+TEST(EventQueue, TellsNothingOnceItIsClosed)
+{
+    QueueFixture fixture;
+    std::jthread job([&] {
+        for (int i = 0; i < 100'000; ++i)  // would wait for room that is never made
+            fixture.queue.add(Message{"x", {}});
+    });
+    fixture.waitUntilFull();
+    fixture.queue.close();
+    job.join();
+    fixture.loop.drain();
+    EXPECT_TRUE(fixture.listener.plainLines.empty());
+}
+
+TEST(EventQueue, StopsInTheMiddleOfABatch)
+{
+    QueueFixture fixture;
+    fixture.listener.onMessage = [&fixture] {
+        fixture.queue.close();
+    };
+    fixture.queue.add(Message{"first", {}});
+    fixture.queue.add(Message{"second", {}});
+    fixture.queue.flush();
+    fixture.loop.drain();
+    EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{"first"});
+}
 
 TEST(JobLog, LetsNothingPassForAVerdict)
 {
     for (const std::string_view hostile :
          {"File /a needs to be repaired. (inode #12)", "x APPEARS TO BE OK. x",
           "a name with [31m in it", "Rebuilding Catalog B-tree."}) {
-        Scene scene;
-        scene.log.detail(hostile);
-        scene.deliver();
-        EXPECT_TRUE(scene.listener.plainLines.empty()) << hostile;
-        ASSERT_EQ(scene.listener.dictionaries.size(), 1U) << hostile;
-        EXPECT_EQ(scene.listener.dictionaries[0].integer(contract::kFsckVerbosity), 2) << hostile;
+        LogFixture fixture;
+        fixture.log.detail(hostile);
+        fixture.deliver();
+        EXPECT_TRUE(fixture.listener.plainLines.empty()) << hostile;
+        ASSERT_EQ(fixture.listener.dictionaries.size(), 1U) << hostile;
+        EXPECT_EQ(fixture.listener.dictionaries[0].integer(contract::kFsckVerbosity), 2) << hostile;
     }
 }
 
 TEST(JobLog, ShowsNoControlCharacters)
 {
-    Scene scene;
-    scene.log.detail("a\x1b]0;title\x07 b\tc");
-    scene.log.problem("\x1b[2Jgone");
-    scene.deliver();
-    EXPECT_EQ(scene.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
-    EXPECT_EQ(scene.listener.textsOf(contract::kFsckError),
+    LogFixture fixture;
+    fixture.log.detail("a\x1b]0;title\x07 b\tc");
+    fixture.log.problem("\x1b[2Jgone");
+    fixture.deliver();
+    EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
+    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckError),
               std::vector<std::string>{"\uFFFD[2Jgone"});
 }
 
@@ -73,7 +128,7 @@ TEST(JobLog, NamesTheDiskSoThatItCannotLie)
         std::string identifier;
         std::string shown;
     };
-    const LineGuard guard(Scene::english());
+    const VerdictPhrases phrases(LogFixture::english());
     for (const Case& c :
          {Case{"My Disk", "/dev/sdb1", "My Disk"},
           Case{"it appears to be ok.", "/dev/sdb1", "sdb1"}, Case{"", "/dev/sdb1", "sdb1"},
@@ -81,7 +136,7 @@ TEST(JobLog, NamesTheDiskSoThatItCannotLie)
         contract::DiskReference disk;
         disk.name = c.name;
         disk.identifier = c.identifier;
-        EXPECT_EQ(shownNameOf(disk, guard), c.shown);
+        EXPECT_EQ(shownNameOf(disk, phrases), c.shown);
     }
 }
 
@@ -89,19 +144,19 @@ TEST(JobLog, SaysVerdictsInTheModulesPhrases)
 {
     struct Case {
         Verdict verdict;
-        Access access;
+        Operation operation;
         std::string line;
     };
     for (const Case& c :
-         {Case{Verdict::Sound, Access::ReadOnly, "The volume “%@” appears to be OK.\n"},
-          Case{Verdict::Damaged, Access::ReadOnly, "The volume “%@” needs to be repaired."},
-          Case{Verdict::Damaged, Access::ReadWrite, "The volume “%@” could not be repaired."},
-          Case{Verdict::Repaired, Access::ReadWrite,
+         {Case{Verdict::Sound, Operation::Verify, "The volume “%@” appears to be OK.\n"},
+          Case{Verdict::Damaged, Operation::Verify, "The volume “%@” needs to be repaired."},
+          Case{Verdict::Damaged, Operation::Repair, "The volume “%@” could not be repaired."},
+          Case{Verdict::Repaired, Operation::Repair,
                "The volume “%@” was repaired successfully.\n"}}) {
-        Scene scene(Scene::english(), "%@");
-        scene.log.verdict(c.verdict, c.access);
-        scene.deliver();
-        EXPECT_EQ(scene.listener.plainLines, std::vector<std::string>{c.line});
+        LogFixture fixture(LogFixture::english(), "%@");
+        fixture.log.verdict(c.verdict, c.operation);
+        fixture.deliver();
+        EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{c.line});
     }
 }
 
@@ -118,31 +173,33 @@ public:
 TEST(JobLog, VerdictSurvivesAnIncompleteTranslation)
 {
     const HalfTranslated texts;
-    Scene scene(texts);
-    scene.log.verdict(Verdict::Sound, Access::ReadOnly);
-    scene.deliver();
-    EXPECT_EQ(scene.listener.textsOf(contract::kFsckSuccess),
+    LogFixture fixture(texts);
+    fixture.log.verdict(Verdict::Sound, Operation::Verify);
+    fixture.deliver();
+    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckSuccess),
               std::vector<std::string>{"Das Volume „Disk“ ist in Ordnung."});
 }
 
 TEST(JobLog, KeepsTenThousandProblemsReadable)
 {
-    Scene scene;
+    LogFixture fixture;
     for (int i = 0; i < 10'000; ++i) {
-        scene.log.problem("Inode " + std::to_string(i) + " ref count is 9, should be 1.  Fix? no");
-        if (i % 1000 == 0)  // the road takes only so much before it is emptied
-            scene.deliver();
+        fixture.log.problem("Inode " + std::to_string(i) +
+                            " ref count is 9, should be 1.  Fix? no");
+        if (i % 1000 == 0)  // the events takes only so much before it is emptied
+            fixture.deliver();
     }
     for (int i = 0; i < 500; ++i)
-        scene.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
-    scene.log.endOfRun();
-    scene.deliver();
-    const auto errors = scene.listener.textsOf(contract::kFsckError);
+        fixture.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
+    fixture.log.endOfRun();
+    fixture.deliver();
+    const auto errors = fixture.listener.textsOf(contract::kFsckError);
     EXPECT_EQ(errors.size(), ProblemLimiter::shownInAll + 2);
     EXPECT_EQ(errors[100], "… and %1$@ more like “%2$@”");
-    EXPECT_EQ(scene.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
+    EXPECT_EQ(fixture.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
         << "nothing is lost in the detailed log";
-    const contract::Array rest = scene.listener.dictionaries[100][contract::kFsckParameters].array();
+    const contract::Array rest =
+        fixture.listener.dictionaries[100][contract::kFsckParameters].array();
     EXPECT_EQ(rest.at(0).integer(), 9990);
     EXPECT_EQ(rest.at(1).string(), "Inode # ref count is #, should be #.");
 }
@@ -176,7 +233,7 @@ TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
     EXPECT_EQ(other.report(30, now + 50ms), std::nullopt) << "too soon";
 }
 
-TEST(DiskNaming, ReplacesOurNameForTheDisk)
+TEST(ToolRun, ReplacesOurNameForTheDisk)
 {
     struct Case {
         std::string_view line;

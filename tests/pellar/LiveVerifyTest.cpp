@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Volumes that are verified while they stay mounted, on real loop devices. Needs root.
 
-#include "pellar/mounts/MountPlace.h"
+#include "pellar/mounts/MountTable.h"
 #include "pellar/process/Command.h"
-#include "pellar/volumes/MountedBtrfs.h"
-#include "tests/pellar/Workshop.h"
+#include "pellar/tools/btrfs/MountedBtrfs.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 #include "tests/support/ScrubRecords.h"
 
@@ -39,11 +39,11 @@ protected:
     {
         if (::geteuid() != 0)
             GTEST_SKIP() << "mounting needs root";
-        workshop_.write("image", {});
+        directory_.write("image", {});
         fs::resize_file(image(), 128U << 20U);
-        if (findProgram("mkfs.btrfs", ManagerOptions().toolPath).empty())
+        if (findProgram("mkfs.btrfs", JobOptions().toolPath).empty())
             GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
-        workshop_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
+        directory_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
         fs::create_directory(place());
         if (!mount())
             GTEST_SKIP() << "the system gives no loop device, or mounts no btrfs";
@@ -112,17 +112,20 @@ protected:
         return std::get<MountedBtrfs>(volume).scrubbedBytes().has_value();
     }
 
-    fs::path image() const { return workshop_.path("image"); }
-    fs::path place() const { return workshop_.path("home"); }
-    contract::DiskReferencePointer disk() const { return test::reference(device_->name(), "btrfs"); }
-    std::unique_ptr<test::Bench> bench() const
+    fs::path image() const { return directory_.path("image"); }
+    fs::path place() const { return directory_.path("home"); }
+    contract::DiskReferencePointer disk() const
     {
-        ManagerOptions options;
+        return test::reference(device_->name(), "btrfs");
+    }
+    std::unique_ptr<test::JobFixture> library() const
+    {
+        JobOptions options;
         options.homeDirectory = place();
-        return std::make_unique<test::Bench>(options);
+        return std::make_unique<test::JobFixture>(options);
     }
 
-    test::Workshop workshop_;
+    test::TestDirectory directory_;
     std::unique_ptr<orvane::test::LoopDevice> device_;
 };
 
@@ -142,13 +145,13 @@ TEST_F(LiveVerify, FindsDamageAndWritesNothing)
         if (!c.text.empty())
             damage(c.text, c.everywhere);
         const std::string before = bytesOf(image());
-        const auto bench = this->bench();
-        EXPECT_EQ(bench->verify(disk()), 0);
-        EXPECT_EQ(bench->listener.verdict, c.verdict) << bench->listener.message;
-        EXPECT_NE(bench->listener.message.find(c.says), std::string::npos)
-            << bench->listener.message;
+        const auto library = this->library();
+        EXPECT_EQ(library->verify(disk()), 0);
+        EXPECT_EQ(library->listener.verdict, c.verdict) << library->listener.message;
+        EXPECT_NE(library->listener.message.find(c.says), std::string::npos)
+            << library->listener.message;
         EXPECT_TRUE(bytesOf(image()) == before) << c.says;
-        EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
+        EXPECT_FALSE(mountsOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
     }
 }
 
@@ -156,13 +159,13 @@ TEST_F(LiveVerify, IsStoppedInTheKernelToo)
 {
     if (!slowDown())
         GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
-    const auto bench = this->bench();
-    ASSERT_EQ(bench->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
-    ASSERT_TRUE(bench->loop.runUntil([&] { return !bench->listener.progress.empty(); }));
+    const auto library = this->library();
+    ASSERT_EQ(library->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+    ASSERT_TRUE(library->loop.runUntil([&] { return !library->listener.progress.empty(); }));
     EXPECT_TRUE(isScrubbed());
-    bench->tool->cancelCurrentOperation();
-    ASSERT_TRUE(bench->loop.runUntil([&] { return bench->listener.finished == 1; }));
-    EXPECT_EQ(bench->listener.verdict, "stopped");
+    library->tool->cancelCurrentOperation();
+    ASSERT_TRUE(library->loop.runUntil([&] { return library->listener.finished == 1; }));
+    EXPECT_EQ(library->listener.verdict, "stopped");
     EXPECT_FALSE(isScrubbed());
 }
 
@@ -170,13 +173,13 @@ TEST_F(LiveVerify, LeavesTheScrubOfOthersAlone)
 {
     if (!slowDown())
         GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
-    const auto other = bench();
+    const auto other = library();
     ASSERT_EQ(other->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
     ASSERT_TRUE(other->loop.runUntil([&] { return !other->listener.progress.empty(); }));
-    const auto bench = this->bench();
-    bench->verify(disk());
-    EXPECT_EQ(bench->listener.verdict, "failed");
-    EXPECT_NE(bench->listener.message.find("another program is checking"), std::string::npos);
+    const auto library = this->library();
+    library->verify(disk());
+    EXPECT_EQ(library->listener.verdict, "failed");
+    EXPECT_NE(library->listener.message.find("another program is checking"), std::string::npos);
     EXPECT_TRUE(isScrubbed());
     other->tool->cancelCurrentOperation();
     ASSERT_TRUE(other->loop.runUntil([&] { return other->listener.finished == 1; }));
@@ -184,11 +187,11 @@ TEST_F(LiveVerify, LeavesTheScrubOfOthersAlone)
 
 TEST_F(LiveVerify, IsNotForAVolumeThatCanBeUnmounted)
 {
-    test::Bench bench;
-    bench.verify(disk());
-    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
-    EXPECT_TRUE(bench.listener.hasPlainLine("no error found")) << "as btrfs check ends";
-    EXPECT_FALSE(mountPlacesOf(fs::path(device_->name()), {}).empty());
+    test::JobFixture library;
+    library.verify(disk());
+    EXPECT_EQ(library.listener.verdict, "sound") << library.listener.message;
+    EXPECT_TRUE(library.listener.hasPlainLine("no error found")) << "as btrfs check ends";
+    EXPECT_FALSE(mountsOf(fs::path(device_->name()), {}).empty());
 }
 
 }  // namespace

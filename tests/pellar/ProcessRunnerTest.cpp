@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ProcessRunner.h"
 
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -14,6 +14,54 @@ namespace {
 
 using namespace std::chrono_literals;
 using namespace pellar;
+
+std::vector<std::string> split(const std::vector<std::string>& pieces, std::size_t longest = 8)
+{
+    std::vector<std::string> lines;
+    LineSplitter splitter(longest, [&lines](std::string_view line, bool isCut) {
+        lines.push_back(std::string(line) + (isCut ? "[cut]" : ""));
+    });
+    for (const std::string& piece : pieces)
+        splitter.take(piece);
+    splitter.finish();
+    return lines;
+}
+
+TEST(LineSplitter, CutsAtEveryLineEnd)
+{
+    using namespace std::string_literals;
+    struct Case {
+        std::vector<std::string> pieces;
+        std::vector<std::string> lines;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{{"a\nb\n"}, {"a", "b"}, "the last end makes no empty line"},
+          Case{{"a\r\nb\rc"}, {"a", "b", "c"}, "three kinds of ends, and none"},
+          Case{{"a\r", "\nb"}, {"a", "b"}, "one end, torn apart"},
+          Case{{"a\r", "", "\n\nb"}, {"a", "", "b"}, "an end and an empty line"},
+          Case{{"a\r\r\nb"}, {"a", "", "b"}, "two ends"},
+          Case{{"a\0\xFF\n"s}, {"a\0\xFF"s}, "any bytes"},
+          Case{{"12345678\n"}, {"12345678"}, "just as long as may be"},
+          Case{{"123456789", "more\nb\n"}, {"12345678[cut]", "b"}, "the rest is dropped"},
+          Case{{"12345678", "9"}, {"12345678[cut]"}, "cut at the very end"},
+          Case{{}, {}, "nothing"}})
+        EXPECT_EQ(split(c.pieces), c.lines) << c.because;
+}
+
+const Clock::time_point start{};
+
+TEST(StopLadder, LeavingKillsAReaderAndGivesAWriterAMoment)
+{
+    EXPECT_EQ(StopLadder(graceTimesFor(Access::ReadOnly)).pressHard(start), SIGKILL);
+    StopLadder writer(graceTimesFor(Access::ReadWrite));
+    EXPECT_EQ(writer.pressHard(start), SIGINT);
+    EXPECT_EQ(writer.pressHard(start + 1s), 0) << "once is enough";
+    EXPECT_EQ(writer.due(start + 2999ms), 0);
+    EXPECT_EQ(writer.due(start + 3s), SIGKILL);
+    EXPECT_FALSE(writer.deadline());
+    EXPECT_EQ(writer.press(start + 6s), 0) << "there is nothing harder";
+}
 
 /// Keeps the lines; presses the stop switch at the first one when asked to.
 class Lines final : public RunListener {
@@ -38,17 +86,17 @@ public:
 struct Runner {
     RunResult run(std::string_view script)
     {
-        request.command = {workshop.fakeTools(script) + "/e2fsck", {}};
+        request.command = {directory.fakeTools(script) + "/e2fsck", {}};
         return runTool(request, stop, lines);
     }
 
-    test::Workshop workshop;
+    test::TestDirectory directory;
     RunRequest request{{}, Access::ReadOnly, -1, {}, 0ms, {100ms, 100ms, 0ms}};
     StopSwitch stop;
     Lines lines;
 };
 
-/// Nothing of ours is left: not even an ended process that nobody has reaped.
+/// Nothing of ours is left: not even an ended process that is still to be reaped.
 void expectNoChildren()
 {
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
@@ -78,12 +126,12 @@ TEST(ProcessRunner, TellsHowAToolEnded)
 TEST(ProcessRunner, SaysWhyAToolDidNotStart)
 {
     Runner runner;
-    runner.request.command = {runner.workshop.path("nothing"), {}};
+    runner.request.command = {runner.directory.path("nothing"), {}};
     EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
               Ending(NotStarted{ENOENT}));
-    runner.workshop.write("text", "no program");
-    std::filesystem::permissions(runner.workshop.path("text"), std::filesystem::perms::owner_all);
-    runner.request.command = {runner.workshop.path("text"), {}};
+    runner.directory.write("text", "no program");
+    std::filesystem::permissions(runner.directory.path("text"), std::filesystem::perms::owner_all);
+    runner.request.command = {runner.directory.path("text"), {}};
     EXPECT_EQ(runTool(runner.request, runner.stop, runner.lines).ending,
               Ending(NotStarted{ENOEXEC}));
     expectNoChildren();
@@ -134,28 +182,51 @@ TEST(ProcessRunner, BoundsWhatAToolPrints)
 {
     struct Case {
         std::string_view script;
+        Access access;
+        bool ignoresStops;
+        OutputLimits limits;
         std::size_t lines;
+        int limitsTold;
         std::string_view because;
     };
-    for (const Case& c : {Case{"flood-lines", 1000, "lines without end"},
-                          Case{"flood-bytes", 1, "a line without end is one line, cut"}}) {
+    for (const Case& c : {
+             Case{"flood-lines", Access::ReadOnly, false, {1000, 1U << 20U}, 1000, 0, "lines"},
+             Case{"flood-bytes",
+                  Access::ReadOnly,
+                  false,
+                  {1000, 1U << 20U},
+                  1,
+                  0,
+                  "a line without end is one line, cut"},
+             Case{"flood-lines",
+                  Access::ReadWrite,
+                  false,
+                  {1000, 1U << 30U},
+                  1000,
+                  1,
+                  "a repair runs on unheard before it is ended"},
+             Case{"flood-lines",
+                  Access::ReadWrite,
+                  true,
+                  {100, 1U << 30U},
+                  100,
+                  1,
+                  "also one that ignores being asked"},
+         }) {
         Runner runner;
-        runner.request.limits = {1000, 1U << 20U};
+        runner.request.access = c.access;
+        runner.request.ignoresStops = c.ignoresStops;
+        runner.request.limits = c.limits;
+        runner.request.graceTimes = {c.ignoresStops ? 24h : 100ms, 100ms, 50ms};
         const RunResult result = runner.run(c.script);
         EXPECT_EQ(result.cause, StopCause::TooMuchOutput) << c.because;
         EXPECT_EQ(runner.lines.output.size(), c.lines) << c.because;
+        EXPECT_EQ(runner.lines.limits, c.limitsTold) << c.because;
+        ASSERT_FALSE(runner.lines.output.empty()) << c.because;
         EXPECT_LE(runner.lines.output.back().size(), longestToolLine) << c.because;
+        EXPECT_EQ(result.ending, Ending(Killed{c.ignoresStops ? SIGKILL : SIGINT})) << c.because;
     }
-}
-
-TEST(ProcessRunner, LetsARepairRunOnUnheardBeforeItEndsIt)
-{
-    Runner runner;
-    runner.request.access = Access::ReadWrite;
-    runner.request.limits = {1000, 1U << 30U};
-    EXPECT_EQ(runner.run("flood-lines").cause, StopCause::TooMuchOutput);
-    EXPECT_EQ(runner.lines.output.size(), 1000U);
-    EXPECT_EQ(runner.lines.limits, 1) << "one sentence says so";
+    expectNoChildren();
 }
 
 TEST(ProcessRunner, EndsASilentToolOnlyWhenAskedTo)
@@ -220,19 +291,6 @@ TEST(ProcessRunner, LetsAWriterComeToItsEndThatWouldBreakOff)
     EXPECT_EQ(insisting.run("say begun\nwait").ending, Ending(Killed{SIGKILL}))
         << "who asks three times has his way";
     expectNoChildren();
-}
-
-TEST(ProcessRunner, EndsAWriterThatIgnoresStopsAndPrintsWithoutEnd)
-{
-    Runner runner;
-    runner.request.access = Access::ReadWrite;
-    runner.request.ignoresStops = true;
-    runner.request.limits = {100, 10000};
-    runner.request.graceTimes = {24h, 24h, 50ms};
-    const RunResult result = runner.run("flood-lines");
-    EXPECT_EQ(result.ending, Ending(Killed{SIGKILL}));
-    EXPECT_EQ(result.cause, StopCause::TooMuchOutput);
-    EXPECT_EQ(runner.lines.limits, 1);
 }
 
 TEST(ProcessRunner, DoesNotStartWhatIsAlreadyStopped)

@@ -1,13 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// The real tools on real volumes, damaged on purpose; e2fsck has a file of its own. A tool that is
-// not installed is named, and its cases are skipped.
+// The real tools on real volumes, damaged on purpose. A tool that is not installed is named, and
+// its cases are skipped.
 
 #include "contract/pellar/ErrorCodes.h"
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
-#include "pellar/volumes/DiskUse.h"
-#include "pellar/volumes/LoopDevice.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
@@ -19,6 +18,7 @@
 
 #include <algorithm>
 #include <fstream>
+#include <random>
 
 namespace {
 
@@ -42,14 +42,6 @@ bool isInstalled(const VolumeMaker& maker)
     return !findProgram(maker.command.front(), toolPath).empty();
 }
 
-std::filesystem::path make(const test::Workshop& workshop, const VolumeMaker& maker)
-{
-    workshop.write("disk", {});
-    std::filesystem::resize_file(workshop.path("disk"), maker.bytes);
-    workshop.prepare(maker.command, workshop.path("disk"));
-    return workshop.path("disk");
-}
-
 void patch(const std::filesystem::path& image, const std::vector<Patch>& patches,
            std::uint64_t offset = 0)
 {
@@ -58,12 +50,12 @@ void patch(const std::filesystem::path& image, const std::vector<Patch>& patches
         file.seekp(static_cast<std::streamoff>(offset + p.offset)) << p.bytes;
 }
 
-std::filesystem::path make(const test::Workshop& workshop, const VolumeState& state)
+std::filesystem::path make(const test::TestDirectory& directory, const VolumeState& state)
 {
-    const auto image = make(workshop, makerOf(state.filesystem));
+    const auto image = directory.makeVolume("disk", state.filesystem);
     patch(image, state.patches);
     if (!state.command.empty())
-        workshop.prepare(state.command, image);
+        directory.prepare(state.command, image);
     return image;
 }
 
@@ -101,37 +93,26 @@ protected:
 TEST_P(RealTools, SayWhatIsTrue)
 {
     const VolumeState& state = GetParam();
-    const test::Workshop workshop;
-    const auto image = make(workshop, state);
+    const test::TestDirectory directory;
+    const auto image = make(directory, state);
     const auto disk = test::reference(image, std::string(state.filesystem));
-    test::Bench bench;
+    test::JobFixture library;
     const timespec before = lastWriteOf(image);
-    ASSERT_EQ(bench.verify(disk), 0);
-    EXPECT_EQ(bench.listener.verdict, state.verified) << bench.listener.message;
+    ASSERT_EQ(library.verify(test::reference(image, "")), 0) << "its kind is not known";
+    EXPECT_EQ(library.listener.verdict, state.verified) << library.listener.message;
     EXPECT_TRUE(isSame(lastWriteOf(image), before)) << "a verification wrote";
-    EXPECT_EQ(bench.listener.error == contract::kPLErrorDamagedForGood,
+    EXPECT_EQ(library.listener.error == contract::kPLErrorDamagedForGood,
               state.verified == "damaged" && state.filesystem == "btrfs")
         << "nobody is sent to a repair that there is not";
-    ASSERT_EQ(bench.repair(disk), 0);
-    EXPECT_EQ(bench.listener.verdict, state.repaired)
-        << state.because << ": " << bench.listener.message;
+    ASSERT_EQ(library.repair(disk), 0);
+    EXPECT_EQ(library.listener.verdict, state.repaired)
+        << state.because << ": " << library.listener.message;
     EXPECT_TRUE(state.verified != "sound" || isSame(lastWriteOf(image), before))
         << "a repair wrote to a sound volume";
-    ASSERT_EQ(bench.verify(disk), 0);
-    EXPECT_EQ(bench.listener.verdict, state.afterwards) << bench.listener.message;
-    EXPECT_EQ(bench.listener.finished, 3);
-    EXPECT_FALSE(bench.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
-}
-
-// Nobody has said what it is.
-TEST_P(RealTools, FindTheKindByThemselves)
-{
-    const VolumeState& state = GetParam();
-    const test::Workshop workshop;
-    const auto image = make(workshop, state);
-    test::Bench bench;
-    ASSERT_EQ(bench.verify(test::reference(image, "")), 0);
-    EXPECT_EQ(bench.listener.verdict, state.verified) << bench.listener.message;
+    ASSERT_EQ(library.verify(disk), 0);
+    EXPECT_EQ(library.listener.verdict, state.afterwards) << library.listener.message;
+    EXPECT_EQ(library.listener.finished, 3);
+    EXPECT_FALSE(library.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
 }
 
 INSTANTIATE_TEST_SUITE_P(EachState, RealTools, ::testing::ValuesIn(orvane::test::volumeStates()),
@@ -143,15 +124,15 @@ TEST(RealToolsOnOthers, NeverWrite)
     for (const VolumeMaker& maker : orvane::test::volumeMakers()) {
         if (!isInstalled(maker))
             continue;
-        const test::Workshop workshop;
-        const auto image = make(workshop, maker);
+        const test::TestDirectory directory;
+        const auto image = directory.makeVolume("disk", maker.filesystem);
         const timespec before = lastWriteOf(image);
         for (const VolumeMaker& other : orvane::test::volumeMakers()) {
             if (other.filesystem == maker.filesystem)
                 continue;
-            test::Bench bench;
-            ASSERT_EQ(bench.repair(test::reference(image, std::string(other.filesystem))), 0);
-            EXPECT_EQ(bench.listener.verdict, "failed")
+            test::JobFixture library;
+            ASSERT_EQ(library.repair(test::reference(image, std::string(other.filesystem))), 0);
+            EXPECT_EQ(library.listener.verdict, "failed")
                 << maker.filesystem << " as " << other.filesystem;
             EXPECT_TRUE(isSame(lastWriteOf(image), before))
                 << other.filesystem << " wrote to " << maker.filesystem;
@@ -159,10 +140,10 @@ TEST(RealToolsOnOthers, NeverWrite)
     }
 }
 
-bool mayUseLoopDevices(const test::Workshop& workshop)
+bool mayUseLoopDevices(const test::TestDirectory& directory)
 {
-    workshop.write("probe", std::string(4096, 'x'));
-    const FileDescriptor file(::open(workshop.path("probe").c_str(), O_RDONLY | O_CLOEXEC));
+    directory.write("probe", std::string(4096, 'x'));
+    const FileDescriptor file(::open(directory.path("probe").c_str(), O_RDONLY | O_CLOEXEC));
     return std::holds_alternative<LoopDevice>(
         LoopDevice::attach(file.get(), 0, 4096, Access::ReadOnly));
 }
@@ -175,44 +156,49 @@ bool isOnALoopDevice(const std::filesystem::path& image)
 }
 
 /// The volume, moved into the middle of a larger file.
-contract::DiskReferencePointer embed(const test::Workshop& workshop,
-                                    const std::filesystem::path& volume,
-                                    std::string_view filesystem)
+contract::DiskReferencePointer embed(const test::TestDirectory& directory,
+                                     const std::filesystem::path& volume,
+                                     std::string_view filesystem)
 {
     constexpr std::uint64_t margin = 1U << 20U;
     std::ifstream from(volume, std::ios::binary);
-    std::ofstream(workshop.path("whole"), std::ios::binary)
+    std::ofstream(directory.path("whole"), std::ios::binary)
         << std::string(margin, 'm') << from.rdbuf() << std::string(margin, 'm');
-    auto region = *test::reference(workshop.path("whole"), std::string(filesystem));
+    auto region = *test::reference(directory.path("whole"), std::string(filesystem));
     region.offset = margin;
     region.length -= 2 * margin;
     return std::make_shared<contract::DiskReference>(region);
 }
 
+void expectUntouchedMargins(const contract::DiskReference& disk)
+{
+    std::ifstream whole(disk.path, std::ios::binary);
+    std::string margin(1U << 20U, '\0');
+    for (const std::uint64_t at : {std::uint64_t{0}, disk.offset + disk.length}) {
+        whole.seekg(static_cast<std::streamoff>(at))
+            .read(margin.data(), static_cast<std::streamsize>(margin.size()));
+        EXPECT_EQ(margin.find_first_not_of('m'), std::string::npos) << "beside the volume";
+    }
+}
+
 TEST(RealToolsInAnImage, WorkOnARegionAndLeaveNoLoopDevice)
 {
-    const test::Workshop probe;
+    const test::TestDirectory probe;
     const bool mayUseThem = mayUseLoopDevices(probe);
     for (const VolumeState& state : orvane::test::volumeStates()) {
         if (state.repaired != "repaired" || !isInstalled(makerOf(state.filesystem)))
             continue;
-        const test::Workshop workshop;
-        const auto disk = embed(workshop, make(workshop, state), state.filesystem);
-        test::Bench bench;
-        ASSERT_EQ(bench.repair(disk), 0);
-        EXPECT_EQ(bench.listener.verdict, mayUseThem ? "repaired" : "failed")
-            << state.filesystem << ", " << state.state << ": " << bench.listener.message;
+        const test::TestDirectory directory;
+        const auto disk = embed(directory, make(directory, state), state.filesystem);
+        test::JobFixture library;
+        ASSERT_EQ(library.repair(disk), 0);
+        EXPECT_EQ(library.listener.verdict, mayUseThem ? "repaired" : "failed")
+            << state.filesystem << ", " << state.state << ": " << library.listener.message;
         EXPECT_TRUE(mayUseThem ||
-                    bench.listener.message.find("only an administrator") != std::string::npos)
-            << bench.listener.message;
+                    library.listener.message.find("only an administrator") != std::string::npos)
+            << library.listener.message;
         EXPECT_FALSE(isOnALoopDevice(disk->path));
-        std::ifstream whole(disk->path, std::ios::binary);
-        std::string margin(1U << 20U, '\0');
-        for (const std::uint64_t at : {std::uint64_t{0}, disk->offset + disk->length}) {
-            whole.seekg(static_cast<std::streamoff>(at))
-                .read(margin.data(), static_cast<std::streamsize>(margin.size()));
-            EXPECT_EQ(margin.find_first_not_of('m'), std::string::npos) << "beside the volume";
-        }
+        expectUntouchedMargins(*disk);
     }
 }
 
@@ -246,20 +232,209 @@ TEST(RealXfsLog, IsReplayedByMountingAndThenVerified)
 {
     if (!isInstalled(makerOf("xfs")))
         GTEST_SKIP() << "mkfs.xfs is not installed (package xfsprogs)";
-    const test::Workshop workshop;
-    const auto image = make(workshop, makerOf("xfs"));
+    const test::TestDirectory directory;
+    const auto image = directory.makeVolume("disk", "xfs");
     if (!leaveALog(image))
         GTEST_SKIP() << "needs the right to set up loop devices and to mount XFS";
-    test::Bench bench;
-    ASSERT_EQ(bench.verify(test::reference(image, "xfs")), 0);
-    EXPECT_EQ(bench.listener.verdict, "inconclusive") << bench.listener.message;
-    ASSERT_EQ(bench.repair(test::reference(image, "xfs")), 0);
-    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.listener.message;
-    EXPECT_EQ(bench.listener.message,
+    test::JobFixture library;
+    ASSERT_EQ(library.verify(test::reference(image, "xfs")), 0);
+    EXPECT_EQ(library.listener.verdict, "inconclusive") << library.listener.message;
+    ASSERT_EQ(library.repair(test::reference(image, "xfs")), 0);
+    EXPECT_EQ(library.listener.verdict, "repaired") << library.listener.message;
+    EXPECT_EQ(library.listener.message,
               "repaired “Disk”: its journal was replayed; nothing else was wrong");
-    ASSERT_EQ(bench.verify(test::reference(image, "xfs")), 0);
-    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
+    ASSERT_EQ(library.verify(test::reference(image, "xfs")), 0);
+    EXPECT_EQ(library.listener.verdict, "sound") << library.listener.message;
     EXPECT_FALSE(isOnALoopDevice(image));
+}
+
+std::string bytesOf(const std::filesystem::path& path)
+{
+    std::string bytes(std::filesystem::file_size(path), '\0');
+    std::ifstream(path, std::ios::binary)
+        .read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    return bytes;
+}
+
+/// A volume with a few files in it.
+std::filesystem::path makeVolume(const test::TestDirectory& directory,
+                                 std::vector<std::string> options)
+{
+    const auto image = directory.makeExt("disk", 16U << 20U, std::move(options));
+    directory.write("content", std::string(3000, 'x'));
+    for (int i = 0; i < 8; ++i)
+        directory.damage(image,
+                         "write " + directory.path("content").string() + " f" + std::to_string(i));
+    return image;
+}
+
+struct ExtDamage {
+    std::vector<std::string> commands;  ///< of debugfs
+    std::vector<Patch> patches;
+    std::string filesystem;  ///< that it is listed as
+    std::string_view verified;
+    std::string_view message;  ///< of the repair; empty: repaired, whatever it cost
+    std::string_view because;
+};
+
+// What a repair costs is said where everybody sees it, in numbers that are true.
+const std::vector<ExtDamage> extDamages{
+    {{"set_super_value free_blocks_count 1"},
+     {},
+     "ext4",
+     "damaged",
+     "no damage is left",
+     "a count that -n reports with exit 0"},
+    {{"set_inode_field f5 links_count 9"},
+     {},
+     "ext4",
+     "damaged",
+     "no damage is left",
+     "a wrong count of links"},
+    {{"clri f3"},
+     {},
+     "ext4",
+     "damaged",
+     "no damage is left, but 1 of 19 files is gone",
+     "a name without its file"},
+    {{"unlink f3", "unlink f4"},
+     {},
+     "ext4",
+     "damaged",
+     "no damage is left; 2 files are now in lost+found",
+     "files without names"},
+    {{"clri f1", "unlink f2", "set_super_value free_inodes_count 3"},
+     {},
+     "ext4",
+     "damaged",
+     "",
+     "all sorts"},
+    {{},
+     {{134 << 10, std::string(300U << 10U, '\xA5')}},
+     "ext4",
+     "damaged",
+     "no damage is left, but 8 of 19 files are gone",
+     "a table of inodes full of nonsense"},
+    {{}, {{1024, std::string(1024, '\0')}}, "", "damaged", "", "only a backup superblock is left"},
+    {{"feature needs_recovery"},
+     {},
+     "ext4",
+     "inconclusive",
+     "its journal was replayed; nothing else was wrong",
+     "a journal that is to be replayed"},
+};
+
+TEST(RealE2fsck, FindsDamageAndRepairsIt)
+{
+    for (const ExtDamage& damage : extDamages) {
+        const test::TestDirectory directory;
+        // From e2fsprogs 1.47.1 on a new volume has one inode more, of the orphan file.
+        const auto image = makeVolume(directory, {"-b", "1024", "-O", "^orphan_file"});
+        const auto disk = test::reference(image, damage.filesystem);
+        test::JobFixture library;
+        ASSERT_EQ(library.verify(disk), 0);
+        EXPECT_EQ(library.listener.verdict, "sound") << "before: " << damage.because;
+        EXPECT_TRUE(library.listener.hasPlainLine("The volume “Disk” appears to be OK.\n"));
+
+        for (const std::string& command : damage.commands)
+            directory.damage(image, command);
+        patch(image, damage.patches);
+        const std::string before = bytesOf(image);
+        ASSERT_EQ(library.verify(disk), 0);
+        EXPECT_EQ(library.listener.verdict, damage.verified) << damage.because;
+        EXPECT_EQ(library.listener.textsOf(contract::kFsckError).empty(),
+                  damage.verified != "damaged")
+            << damage.because;
+        EXPECT_TRUE(bytesOf(image) == before) << "a verification wrote: " << damage.because;
+
+        const std::size_t failures = library.listener.textsOf(contract::kFsckFail).size();
+        ASSERT_EQ(library.repair(disk), 0);
+        EXPECT_EQ(library.listener.verdict, "repaired") << damage.because;
+        if (!damage.message.empty()) {
+            EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
+            const auto warnings = library.listener.textsOf(contract::kFsckFail);
+            const bool isLoss = damage.message.find("files") != std::string::npos;
+            EXPECT_EQ(warnings.size() > failures, isLoss) << damage.because;
+            EXPECT_TRUE(!isLoss || warnings.back() == library.listener.message) << damage.because;
+        }
+        ASSERT_EQ(library.verify(disk), 0);
+        EXPECT_EQ(library.listener.verdict, "sound") << "after: " << damage.because;
+        EXPECT_EQ(library.listener.finished, 4);
+    }
+}
+
+TEST(RealE2fsck, WorksOnARegionAndTouchesNothingBesides)
+{
+    const test::TestDirectory directory;
+    const auto volume = makeVolume(directory, {});
+    directory.damage(volume, "set_super_value free_blocks_count 1");
+    const auto disk = embed(directory, volume, "");
+    test::JobFixture library;
+    ASSERT_EQ(library.verify(disk), 0);
+    EXPECT_EQ(library.listener.verdict, "damaged");
+    ASSERT_EQ(library.repair(disk), 0);
+    EXPECT_EQ(library.listener.verdict, "repaired");
+    EXPECT_TRUE(library.listener.hasPlainLine("Disk: "));
+    EXPECT_FALSE(library.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
+    expectUntouchedMargins(*disk);
+}
+
+TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)
+{
+    const test::TestDirectory directory;
+    const auto image = makeVolume(directory, {});
+    std::filesystem::resize_file(image, 8U << 20U);
+    const std::string before = bytesOf(image);
+    test::JobFixture library;
+    ASSERT_EQ(library.verify(test::reference(image)), 0);
+    EXPECT_EQ(library.listener.verdict, "damaged");
+    EXPECT_TRUE(library.listener.hasErrorWith("The volume is cut short"));
+    EXPECT_EQ(library.listener.error, contract::kPLErrorCutShort) << "nobody is sent to a repair";
+    EXPECT_FALSE(library.listener.hasPlainLine("needs to be repaired."));
+    ASSERT_EQ(library.repair(test::reference(image)), 0);
+    EXPECT_EQ(library.listener.error, contract::kPLErrorCutShort)
+        << "nor called damaged after a repair";
+    EXPECT_TRUE(bytesOf(image) == before) << "something was written";
+}
+
+TEST(RealE2fsck, SaysWhatIsNoFileSystem)
+{
+    const test::TestDirectory directory;
+    std::string noise(1U << 20U, '\0');
+    std::generate(noise.begin(), noise.end(),
+                  [random = std::mt19937(1)]() mutable { return static_cast<char>(random()); });
+    directory.write("noise", noise);
+    directory.write("empty", {});
+    directory.write("tiny", "x");
+    struct Case {
+        std::string_view name;
+        std::string filesystem;
+        contract::ErrorCode error;
+    };
+    for (const Case& c : {Case{"noise", "", contract::kPLErrorUnsupported},
+                          Case{"empty", "ext4", contract::kPLErrorUnsupported},
+                          Case{"tiny", "", contract::kPLErrorUnsupported},
+                          Case{"noise", "ext4", contract::kPLErrorDamaged}}) {
+        test::JobFixture library;
+        ASSERT_EQ(library.verify(test::reference(directory.path(c.name), c.filesystem)), 0);
+        EXPECT_EQ(library.listener.error, c.error) << c.name << c.filesystem;
+        EXPECT_NE(library.listener.message.find("“Disk”"), std::string::npos);
+    }
+}
+
+TEST(RealE2fsck, WritesNoExtOverAnotherKind)
+{
+    const test::TestDirectory directory;
+    const auto image = directory.makeExt("disk", 16U << 20U, {"-b", "1024"});
+    // Made into a swap area, as mkswap(8) would: the backup superblocks are still there.
+    patch(image, {{0, std::string(4096, '\0')},
+                  {1024, std::string("\x01\0\0\0\xFF\x0F\0\0", 8)},
+                  {4086, "SWAPSPACE2"}});
+    const std::string before = bytesOf(image);
+    test::JobFixture library;
+    ASSERT_EQ(library.repair(test::reference(image)), 0);
+    EXPECT_EQ(library.listener.error, contract::kPLErrorUnsupported);
+    EXPECT_TRUE(bytesOf(image) == before) << "something was written";
 }
 
 }  // namespace

@@ -1,53 +1,68 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/tools/E2fsckOutput.h"
+#include "pellar/process/ProcessOutput.h"
+#include "pellar/tools/ToolTable.h"
 
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <stdexcept>
 #include <string>
 #include <vector>
 
 namespace pellar::test {
 
-/// What e2fsck 1.47.0 really printed, standard output and standard error as they came; 1.47.2
-/// prints the same.
+/// What a tool really printed, standard output and standard error as they came, in the lines that a
+/// run would tell: what a tool writes over itself is two lines.
 inline std::vector<std::string> recordedLines(std::string_view name)
 {
-    std::ifstream file(std::filesystem::path(PELLAR_RECORDED_DIRECTORY) /
-                       (std::string(name) + ".txt"));
+    std::ifstream file(
+        std::filesystem::path(PELLAR_RECORDED_DIRECTORY) / (std::string(name) + ".txt"),
+        std::ios::binary);
     if (!file)
         throw std::runtime_error("no recording " + std::string(name));
     std::vector<std::string> lines;
-    for (std::string line; std::getline(file, line);)
-        lines.push_back(line);
+    LineSplitter splitter(4096,
+                          [&lines](std::string_view line, bool) { lines.emplace_back(line); });
+    splitter.take(std::string(std::istreambuf_iterator<char>(file), {}));
+    splitter.finish();
     return lines;
 }
 
-inline std::vector<std::string> recordings()
+/// The names of all that e2fsck has printed.
+inline std::vector<std::string> recordingsOfE2fsck()
 {
     std::vector<std::string> names;
-    for (const auto& entry : std::filesystem::directory_iterator(PELLAR_RECORDED_DIRECTORY))
-        if (entry.path().extension() == ".txt")
-            names.push_back(entry.path().stem());
+    for (const auto& entry : std::filesystem::directory_iterator(
+             std::filesystem::path(PELLAR_RECORDED_DIRECTORY) / "e2fsck"))
+        names.push_back("e2fsck/" + entry.path().stem().native());
     return names;
 }
 
-struct Reading {
+struct ReadOutput {
     std::vector<ToolLine> lines;
     Findings findings;
+
+    std::vector<std::string> problems() const
+    {
+        std::vector<std::string> problems;
+        for (const ToolLine& line : lines)
+            if (line.kind == ToolLine::Kind::Problem)
+                problems.push_back(line.text);
+        return problems;
+    }
 };
 
-inline Reading readAll(const std::vector<std::string>& lines)
+inline ReadOutput readAll(const Tool& tool, const std::vector<std::string>& lines)
 {
-    E2fsckOutput output;
-    Reading reading;
+    const auto reader = tool.makeReader();
+    ReadOutput output;
     for (const std::string& line : lines)
-        output.read(line, reading.lines);
-    output.finish(reading.lines);
-    reading.findings = output.findings();
-    return reading;
+        reader->read(line, output.lines);
+    reader->finish(output.lines);
+    output.findings = reader->findings();
+    return output;
 }
 
 }  // namespace pellar::test

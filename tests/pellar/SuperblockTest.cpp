@@ -1,100 +1,148 @@
 // SPDX-License-Identifier: Apache-2.0
 //
-// What is read of a disk before a tool may touch it. That it is read rightly is proven on real
-// volumes; here stands what no maker makes.
+// What is read of a disk before a tool may touch it. That volumes of their makers are read rightly
+// is proven with the real tools; here stands what no maker makes.
 
 #include "pellar/tools/ToolTable.h"
-#include "pellar/volumes/BtrfsSuperblock.h"
-#include "pellar/volumes/FatBootSector.h"
-#include "pellar/volumes/NtfsBootSector.h"
-#include "pellar/volumes/XfsSuperblock.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/mman.h>
 #include <unistd.h>
 
+#include <fstream>
 #include <random>
 
 namespace {
 
 using namespace pellar;
-using Sector = std::vector<std::uint8_t>;
+using orvane::test::Patch;
 
-void put(Sector& sector, std::size_t offset, std::string_view bytes)
+constexpr std::uint64_t mebibyte = 1U << 20U;
+
+/// A disk of zeros but for these bytes.
+VolumeFacts examined(std::string_view filesystem, const std::vector<Patch>& patches,
+                     std::uint64_t bytes = 80 * mebibyte)
 {
-    std::copy(bytes.begin(), bytes.end(), sector.begin() + static_cast<std::ptrdiff_t>(offset));
+    const FileDescriptor disk(::memfd_create("disk", MFD_CLOEXEC));
+    EXPECT_EQ(::ftruncate(disk.get(), static_cast<off_t>(bytes)), 0);
+    for (const Patch& patch : patches)
+        EXPECT_GT(::pwrite(disk.get(), patch.bytes.data(), patch.bytes.size(),
+                           static_cast<off_t>(patch.offset)),
+                  0);
+    return toolFor(filesystem)->examine(disk.get(), 0, bytes);
 }
 
-/// 20 MiB of FAT16, as mkfs.fat makes it.
-Sector fatSector()
+VolumeFacts examined(std::string_view filesystem, const std::filesystem::path& image)
 {
-    Sector sector(512);
-    put(sector, 0, std::string_view("\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24));
-    put(sector, 510, "\x55\xAA");
-    return sector;
+    const FileDescriptor disk(::open(image.c_str(), O_RDONLY | O_CLOEXEC));
+    return toolFor(filesystem)->examine(disk.get(), 0, std::filesystem::file_size(image));
 }
 
-TEST(FatBootSector, EveryFieldHasToMakeSense)
+TEST(Superblocks, EveryFieldOfAFatBootSectorHasToMakeSense)
 {
-    const auto read = parseFatBootSector(fatSector());
-    ASSERT_TRUE(read);
-    EXPECT_EQ(read->bits, 16);
-    EXPECT_EQ(read->volumeBytes, 20U << 20U);
+    // 20 MiB of FAT16, as mkfs.fat makes it.
+    const std::vector<Patch> sound{
+        {0, {"\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24}}, {510, "\x55\xAA"}};
+    EXPECT_TRUE(examined("vfat", sound).isRecognized);
+    EXPECT_EQ(examined("vfat", sound).volumeBytes, 20 * mebibyte);
     struct Case {
-        std::size_t offset;
-        std::string_view bytes;
+        Patch patch;
         std::string_view because;
     };
-    for (const Case& c : {Case{0, "\xFA", "no jump: the loader of an MBR"},
-                          Case{11, std::string_view("\0\0", 2), "sectors of no size"},
-                          Case{11, "\x01\x02", "sectors of 513 bytes"},
-                          Case{13, std::string_view("\0", 1), "clusters of no size"},
-                          Case{13, "\x03", "clusters of three sectors"},
-                          Case{14, std::string_view("\0\0", 2), "no room for itself"},
-                          Case{16, "\x07", "seven tables"},
-                          Case{19, std::string_view("\x10\0", 2), "shorter than its tables"},
-                          Case{21, "\x12", "no medium that there ever was"},
-                          Case{510, "\xAA\x55", "no signature"}}) {
-        Sector sector = fatSector();
-        put(sector, c.offset, c.bytes);
-        EXPECT_FALSE(parseFatBootSector(sector)) << c.because;
+    for (const Case& c :
+         {Case{{0, "\xFA"}, "no jump: the loader of an MBR"},
+          Case{{11, {"\0\0", 2}}, "sectors of no size"},
+          Case{{11, "\x01\x02"}, "sectors of 513 bytes"},
+          Case{{13, {"\0", 1}}, "clusters of no size"},
+          Case{{13, "\x03"}, "clusters of three sectors"},
+          Case{{14, {"\0\0", 2}}, "no room for itself"}, Case{{16, "\x07"}, "seven tables"},
+          Case{{19, {"\x10\0", 2}}, "shorter than its tables"},
+          Case{{21, "\x12"}, "no medium that there ever was"},
+          Case{{510, "\xAA\x55"}, "no signature"}}) {
+        std::vector<Patch> patches = sound;
+        patches.push_back(c.patch);
+        EXPECT_FALSE(examined("vfat", patches).isRecognized) << c.because;
     }
 }
 
 TEST(Superblocks, BelongWhereTheyStand)
 {
-    Sector block(4096);
-    put(block, 64, "_BHRfS_M");
-    put(block, 48, std::string_view("\0\0\1\0\0\0\0\0", 8));
-    put(block, 136, "\1");
-    EXPECT_TRUE(parseBtrfsSuperblock(block, 64U << 10U));
-    EXPECT_FALSE(parseBtrfsSuperblock(block, 64U << 20U)) << "a copy of something else's first";
+    for (const std::uint64_t place : {64U << 10U, 64U << 20U}) {
+        const VolumeFacts facts = examined(
+            "btrfs",
+            {{place + 64, "_BHRfS_M"}, {place + 48, {"\0\0\1\0\0\0\0\0", 8}}, {place + 136, "\1"}});
+        EXPECT_EQ(facts.isRecognized, place == 64U << 10U) << "a copy of something else's first";
+    }
 }
 
 TEST(Superblocks, HugeNumbersDoNotWrapAround)
 {
-    Sector xfs(512);
-    put(xfs, 0, std::string_view("XFSB\0\0\x10\0\xFF\xFF\xFF\xFF\xFF\xFF\xFF\xFF", 16));
-    put(xfs, 84, "\xFF\xFF\xFF\xFF");
-    ASSERT_TRUE(parseXfsSuperblock(xfs));
-    EXPECT_EQ(parseXfsSuperblock(xfs)->volumeBytes, ~std::uint64_t{0});
+    const std::string greatest(8, '\xFF');
+    struct Case {
+        std::string_view filesystem;
+        std::vector<Patch> patches;
+    };
+    for (const Case& c :
+         {Case{"xfs", {{0, {"XFSB\0\0\x10\0", 8}}, {8, greatest}, {84, greatest.substr(4)}}},
+          Case{"ntfs",
+               {{3, {"NTFS    \0\2\x08", 11}},
+                {40, "\xFF\xFF\xFF\xFF\xFF\xFF\xFF\x7F"},
+                {64, "\xF6"}}},
+          Case{"ext4",
+               {{1024 + 0x38, "\x53\xEF"},
+                {1024 + 0x60, "\x80"},
+                {1024 + 0x18, "\x06"},
+                {1024 + 0x04, greatest.substr(4)},
+                {1024 + 0x150, greatest.substr(4)}}}}) {
+        const VolumeFacts facts = examined(c.filesystem, c.patches);
+        EXPECT_TRUE(facts.isRecognized) << c.filesystem;
+        EXPECT_EQ(facts.volumeBytes, ~std::uint64_t{0}) << c.filesystem;
+    }
+}
 
-    Sector ntfs(512);
-    put(ntfs, 3, std::string_view("NTFS    \0\2\x08", 11));
-    put(ntfs, 40, "\xFF\xFF\xFF\xFF\xFF\xFF\xFF\x7F");
-    put(ntfs, 64, "\xF6");
-    ASSERT_TRUE(parseNtfsBootSector(ntfs));
-    EXPECT_EQ(parseNtfsBootSector(ntfs)->volumeBytes, ~std::uint64_t{0});
-    EXPECT_EQ(parseNtfsBootSector(ntfs)->fileRecordBytes, 1024U);
+TEST(Superblocks, ALostOneOfExtIsFoundInItsFirstBackup)
+{
+    const test::TestDirectory workshop;
+    struct Case {
+        std::string blockBytes;
+        std::uint64_t bytes;
+    };
+    for (const Case& c :
+         {Case{"1024", 16 * mebibyte}, Case{"2048", 64 * mebibyte}, Case{"4096", 256 * mebibyte}}) {
+        const auto image = workshop.makeExt("a", c.bytes, {"-b", c.blockBytes});
+        EXPECT_TRUE(examined("ext4", image).hasPrimary) << c.blockBytes;
+        std::fstream(image, std::ios::in | std::ios::out).seekp(1024 + 4) << '\1';
+        const VolumeFacts facts = examined("ext4", image);
+        EXPECT_TRUE(facts.isRecognized && !facts.hasPrimary) << "the checksum no longer fits";
+        EXPECT_EQ(facts.volumeBytes, c.bytes) << c.blockBytes;
+    }
+}
+
+TEST(Superblocks, WhatIsNoneOfExtIsRefused)
+{
+    const test::TestDirectory workshop;
+    struct Case {
+        std::streamoff offset;
+        char byte;
+        std::string_view because;
+    };
+    for (const Case& c : {Case{1024 + 0x18, 7, "blocks of 128 KiB"},
+                          Case{1024 + 0x38, 0x52, "another magic number"}}) {
+        const auto image = workshop.makeExt("a", 4 * mebibyte, {"-O", "^metadata_csum"});
+        std::fstream(image, std::ios::in | std::ios::out).seekp(c.offset) << c.byte;
+        EXPECT_FALSE(examined("ext4", image).isRecognized) << c.because;
+    }
+    EXPECT_FALSE(examined("ext4", {{1024 + 0x38, "\x53\xEF"}}, 2000).isRecognized) << "too short";
 }
 
 /// Damages the places that are read, and a few more, at random.
 TEST(Superblocks, AnyBytesAreExamined)
 {
     std::mt19937 random(7);
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     for (const auto& maker : orvane::test::volumeMakers()) {
         if (findProgram(maker.command.front(), "/usr/sbin:/usr/bin").empty())
             continue;

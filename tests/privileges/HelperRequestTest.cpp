@@ -22,8 +22,7 @@ bool isKnownDevice(const std::filesystem::path& path)
 HelperRequest request(Subject subject, Operation operation)
 {
     HelperRequest made;
-    made.subject = subject;
-    made.operation = operation;
+    made.task = {subject, operation};
     made.disk.path = made.disk.identifier = "/dev/sdb1";
     made.disk.name = "Mein “Stick” \x1b[31m%n\xff";
     made.disk.filesystem = "ext4";
@@ -51,7 +50,7 @@ TEST(HelperRequest, ArrivesAsItWasMade)
         const auto read = readHelperArguments(argumentsOf(made), isKnownDevice);
         ASSERT_TRUE(read) << read.error();
         EXPECT_EQ(argumentsOf(*read), argumentsOf(made));
-        EXPECT_EQ(read->subject, made.subject);
+        EXPECT_EQ(read->task, made.task);
         EXPECT_EQ(read->disk.path, made.disk.path);
         EXPECT_EQ(read->disk.isWhole, made.disk.isWhole);
     }
@@ -147,7 +146,7 @@ TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)
 {
     expectRefusals({"attach-verify", "7", "512", "1024", "id", "name", "vfat", "de"},
                    {
-                       {0, "attach-verify-map", "a part has no map"},
+                       {0, "attach-verify-partition-map", "a part has no map"},
                        {0, "attach-repair-permissions", "nor is it mounted"},
                        {0, "attach-", "no operation"},
                        {0, "attach", "an authorisation to look does not cover repairs"},

@@ -5,7 +5,7 @@
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/ProgramStart.h"
 #include "pellar/process/Command.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
 
@@ -40,7 +40,7 @@ TEST(AskingProgram, GivesWhatItHasOpenItself)
 {
     if (::geteuid() != 0)
         GTEST_SKIP() << "only root may take a file from any program (ptrace(2), Yama)";
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     workshop.write("file", "here");
     const FileDescriptor file(::open(workshop.path("file").c_str(), O_RDONLY | O_CLOEXEC));
     const auto reads = [&file](uid_t user) {
@@ -97,7 +97,7 @@ TEST(AskingProgram, OneThatHadOtherRightsIsNotTrusted)
 
 TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
 {
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     workshop.write("image", std::string(8192, 'x'));
     const std::string image = workshop.path("image");
     HelperRequest request;
@@ -122,7 +122,7 @@ TEST(AttachedRegion, TheWayInWhichItIsOpenIsTheLimit)
              Case{"/dev/null", O_RDWR, verify, 4096, noPart},
              Case{"/nonexistent", O_RDONLY, verify, 4096, noPart},
          }) {
-        request.operation = c.operation;
+        request.task.operation = c.operation;
         request.disk.length = c.length;
         const FileDescriptor file(::open(c.file.c_str(), c.mode | O_CLOEXEC));
         const auto attached = attachRegion(file, request);
@@ -153,7 +153,7 @@ TEST(ProgramStart, WhatWasIgnoredOrLimitedMakesNothingElseFail)
         setInheritanceRight();
         return inChild([] { return true; });
     })) << "the end of a child is not learnt";
-    const pellar::test::Workshop workshop;
+    const pellar::test::TestDirectory workshop;
     EXPECT_TRUE(inChild([&workshop] {
         const rlimit limit{4096, 4096};
         ::setrlimit(RLIMIT_FSIZE, &limit);

@@ -4,7 +4,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "orvane/privileges/PrivilegedScript.h"
 #include "pellar/jobs/Job.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
@@ -32,7 +32,7 @@ protected:
                                     asking_ += "ends ";
                                 }}};
         job_ = std::make_unique<pellar::Job>(
-            [this, how, job](pellar::StopSwitch& stop, pellar::EventRoad& road) {
+            [this, how, job](pellar::StopSwitch& stop, pellar::EventQueue& road) {
                 return std::make_unique<PrivilegedScript>(how, job, texts_, stop, road);
             },
             pellar::EventReceiver{&listener_,
@@ -48,7 +48,7 @@ protected:
     }
     static pellar::PrivilegedJob jobOn(const std::string& device, pellar::Operation operation)
     {
-        return {pellar::Subject::Filesystem, operation,
+        return {{pellar::Subject::Filesystem, operation},
                 *pellar::test::reference(device, "ext4", "Stick"), nullptr, false};
     }
     [[nodiscard]] bool finishes()
@@ -56,7 +56,7 @@ protected:
         return loop_.runUntil([this] { return listener_.finished == 1; });
     }
 
-    pellar::test::Workshop workshop_;
+    pellar::test::TestDirectory workshop_;
     pellar::test::TestLoop loop_;
     pellar::test::EnglishTexts texts_;
     pellar::test::Listener listener_;

@@ -2,9 +2,9 @@
 #include "TemporaryDirectory.h"
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/disks/DiskController.h"
-#include "orvane/support/disks/MountTable.h"
 #include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/loop/Notifications.h"
+#include "pellar/mounts/MountTable.h"
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
@@ -142,27 +142,6 @@ TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
     EXPECT_FALSE(disk->clearFsckHistory()) << "nothing was left";
 }
 
-TEST(MountTable, ReadsWhatTheKernelWrites)
-{
-    const auto mounts = parseMountInfo(
-        "22 1 8:2 / / rw,relatime shared:1 - ext4 /dev/sda2 rw\n"
-        "30 22 8:3 /sub /bind rw - ext4 /dev/sda3 rw\n"
-        "31 22 8:3 / /media/My\\040Disk\\134 ro,nosuid - ext4 /dev/sda3 rw\n"
-        "32 22 0:40 / /home rw master:2 shared:3 - btrfs /dev/sdb1 ro,errors=remount-ro\n"
-        "nonsense\n33 22 8:4\n");
-    ASSERT_EQ(mounts.size(), 4U) << "lines that are no mounts are left out";
-    const auto media = mountOfDevice(mounts, "8:3", "/dev/sda3");
-    ASSERT_TRUE(media);
-    EXPECT_EQ(media->mountPoint, "/media/My Disk\\") << "the whole goes before a part of it";
-    EXPECT_TRUE(media->isReadOnly);
-    EXPECT_EQ(mountOfDevice(mounts, "8:17", "/dev/sdb1")->mountPoint, "/home")
-        << "several devices, one number of its own";
-    EXPECT_FALSE(mounts[3].isReadOnly) << "the kernel's answer to an error is nobody's wish";
-    EXPECT_FALSE(mountOfDevice(mounts, "8:9", "/dev/sda9"));
-    EXPECT_EQ(mountHolding(mounts, "/home/me")->device, "0:40");
-    EXPECT_EQ(mountHolding(mounts, "/homes")->device, "8:2");
-}
-
 TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 {
     const TemporaryDirectory machine;
@@ -187,7 +166,7 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     test::write(machine / "udev/b8:16", "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=vfat\n");
 
     DiskSources sources{machine / "sys", machine / "dev", machine / "udev",
-                        parseMountInfo("22 1 8:1 / / rw - ext4 /dev/sda1 rw\n"
+                        pellar::parseMounts("22 1 8:1 / / rw - ext4 /dev/sda1 rw\n"
                                        "23 22 8:32 / /mnt rw - xfs /dev/sdc rw\n"),
                         "/root"};
     const auto disks = readSystemDisks(sources);

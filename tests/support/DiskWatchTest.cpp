@@ -45,7 +45,7 @@ TEST(DiskEvents, OnlyBlockDevicesMatter)
 TEST(DiskEvents, MountsWithoutADeviceDoNotMatter)
 {
     const auto kept = deviceMounts(
-        parseMountInfo("22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
+        pellar::parseMounts("22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
                        "32 22 0:40 / /home rw - btrfs /dev/sdb1 rw\n"
                        "33 22 0:50 / /c/1 rw - overlay overlay rw\n"));
     ASSERT_EQ(kept.size(), 2U);

@@ -6,7 +6,7 @@
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
 #include "orvane/support/udisks/UDisks.h"
-#include "pellar/volumes/DiskClaim.h"
+#include "pellar/disks/DiskClaim.h"
 #include "tests/support/BusDaemon.h"
 #include "tests/support/LoopDevice.h"
 
@@ -129,9 +129,9 @@ TEST_F(DirectTest, AnImageInUseComesOffLater)
 // With the one step that could do no harm to it.
 TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
 {
-    const auto mounts = currentMounts();
+    const auto mounts = pellar::currentMounts();
     const auto root = std::find_if(mounts.begin(), mounts.end(),
-                                   [](const Mount& mount) { return mount.mountPoint == "/"; });
+                                   [](const pellar::Mount& mount) { return mount.target == "/"; });
     if (root == mounts.end() || placesOf(root->source).empty())
         GTEST_SKIP() << "the root of this system is on no device";
     const auto detached =

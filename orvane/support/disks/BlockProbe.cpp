@@ -1,79 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/BlockProbe.h"
 
-#include <blkid/blkid.h>
 #include <unistd.h>
 
-#include <fmt/format.h>
 #include <algorithm>
 #include <array>
-#include <memory>
-#include <set>
 #include <string_view>
 
 namespace orvane {
 namespace {
-
-constexpr std::uint64_t sectorBytes = 512;  // the unit of libblkid's partitions
-
-struct FreeProbe {
-    void operator()(blkid_probe probe) const { blkid_free_probe(probe); }
-};
-using Probe = std::unique_ptr<std::remove_pointer_t<blkid_probe>, FreeProbe>;
-
-Probe probeOf(int descriptor, ByteRange range)
-{
-    Probe probe(blkid_new_probe());
-    if (probe &&
-        blkid_probe_set_device(probe.get(), descriptor, static_cast<blkid_loff_t>(range.offset),
-                               static_cast<blkid_loff_t>(range.length)) != 0)
-        probe.reset();
-    return probe;
-}
-
-std::string valueOf(const Probe& probe, const char* name)
-{
-    const char* data = nullptr;
-    std::size_t size = 0;
-    if (blkid_probe_lookup_value(probe.get(), name, &data, &size) != 0 || data == nullptr)
-        return {};
-    // The size counts the terminating zero of text.
-    std::string value(data, size);
-    while (value.ends_with('\0'))
-        value.pop_back();
-    return value;
-}
-
-std::string textOrNothing(const char* text)
-{
-    return text != nullptr ? text : "";
-}
-
-Partition read(blkid_partition entry, const std::set<blkid_partition>& containers)
-{
-    Partition partition;
-    partition.number = blkid_partition_get_partno(entry);
-    partition.range = {static_cast<std::uint64_t>(blkid_partition_get_start(entry)) * sectorBytes,
-                       static_cast<std::uint64_t>(blkid_partition_get_size(entry)) * sectorBytes};
-    partition.isContainer = blkid_partition_is_extended(entry) != 0 || containers.contains(entry);
-    const char* const guid = blkid_partition_get_type_string(entry);
-    partition.type = guid != nullptr ? guid : fmt::format("{:#x}", blkid_partition_get_type(entry));
-    partition.name = textOrNothing(blkid_partition_get_name(entry));
-    return partition;
-}
-
-// Tables may be nested: a BSD disklabel lies inside a partition of an MBR.
-std::set<blkid_partition> containersIn(blkid_partlist list)
-{
-    std::set<blkid_partition> containers;
-    for (int i = 0; i < blkid_partlist_numof_partitions(list); ++i) {
-        blkid_partition entry = blkid_partlist_get_partition(list, i);
-        if (blkid_parttable table = blkid_partition_get_table(entry))
-            if (blkid_partition parent = blkid_parttable_get_parent(table))
-                containers.insert(parent);
-    }
-    return containers;
-}
 
 bool hasBytes(int descriptor, std::uint64_t offset, std::string_view expected)
 {
@@ -86,42 +21,6 @@ bool hasBytes(int descriptor, std::uint64_t offset, std::string_view expected)
 
 }  // namespace
 
-Superblock readSuperblock(int descriptor, ByteRange range)
-{
-    const Probe probe = range.length > 0 ? probeOf(descriptor, range) : nullptr;
-    if (!probe)
-        return {};
-    blkid_probe_enable_superblocks(probe.get(), 1);
-    blkid_probe_set_superblocks_flags(probe.get(), BLKID_SUBLKS_TYPE | BLKID_SUBLKS_USAGE |
-                                                       BLKID_SUBLKS_LABEL | BLKID_SUBLKS_UUID);
-    if (blkid_do_safeprobe(probe.get()) != 0)
-        return {};
-    return {valueOf(probe, "USAGE"), valueOf(probe, "TYPE"), valueOf(probe, "LABEL"),
-            valueOf(probe, "UUID")};
-}
-
-std::optional<PartitionTable> readPartitionTable(int descriptor)
-{
-    const Probe probe = probeOf(descriptor, {});
-    if (!probe)
-        return std::nullopt;
-    blkid_probe_enable_superblocks(probe.get(), 0);
-    blkid_probe_enable_partitions(probe.get(), 1);
-    blkid_partlist list = blkid_probe_get_partitions(probe.get());
-    blkid_parttable table = list != nullptr ? blkid_partlist_get_table(list) : nullptr;
-    if (table == nullptr)
-        return std::nullopt;
-
-    PartitionTable result{textOrNothing(blkid_parttable_get_type(table)), {}};
-    const std::set<blkid_partition> containers = containersIn(list);
-    for (int i = 0; i < blkid_partlist_numof_partitions(list); ++i)
-        result.partitions.push_back(read(blkid_partlist_get_partition(list, i), containers));
-    return result;
-}
-
-// ext4(5) and mke2fs(8): the first backup stands at the start of group 1, which is 8193 blocks of
-// 1 KiB, 16384 of 2 KiB or 32768 of 4 KiB from the start. The magic number 0xEF53 lies 56 bytes
-// into the superblock, its group's number (here 1) 90 bytes into it.
 bool isBootSector(int descriptor, const PartitionTable& table, const Superblock& superblock)
 {
     if (table.type != "dos" || !table.partitions.empty())
@@ -130,17 +29,6 @@ bool isBootSector(int descriptor, const PartitionTable& table, const Superblock&
     return superblock.isFilesystem() || hasBytes(descriptor, 3, "NTFS    ") ||
            hasBytes(descriptor, 3, "EXFAT   ") || hasBytes(descriptor, 54, "FAT1") ||
            hasBytes(descriptor, 82, "FAT32   ");
-}
-
-bool hasExtBackupSuperblock(int descriptor, ByteRange range)
-{
-    constexpr std::array<std::uint64_t, 3> firstBackups{8193ULL << 10U, 16384ULL << 11U,
-                                                        32768ULL << 12U};
-    return std::any_of(firstBackups.begin(), firstBackups.end(), [&](std::uint64_t backup) {
-        return backup + 1024 <= range.length &&
-               hasBytes(descriptor, range.offset + backup + 56, "\x53\xEF") &&
-               hasBytes(descriptor, range.offset + backup + 90, std::string_view("\1\0", 2));
-    });
 }
 
 bool hasPartitionTableTraces(int descriptor)

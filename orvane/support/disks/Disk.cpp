@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/Disk.h"
 
-#include "pellar/permissions/InstalledSystem.h"
+#include "pellar/packages/InstalledSystem.h"
 
 #include <algorithm>
 #include <array>

@@ -5,6 +5,7 @@
 #include <linux/netlink.h>
 #include <poll.h>
 #include <sys/socket.h>
+#include <sys/sysmacros.h>
 
 #include <algorithm>
 #include <array>
@@ -30,11 +31,11 @@ bool isAboutBlockDevice(std::string_view message)
     return message.find("\0SUBSYSTEM=block\0"sv) != std::string_view::npos;
 }
 
-std::vector<Mount> deviceMounts(const std::vector<Mount>& mounts)
+std::vector<pellar::Mount> deviceMounts(const std::vector<pellar::Mount>& mounts)
 {
-    std::vector<Mount> kept;
-    std::copy_if(mounts.begin(), mounts.end(), std::back_inserter(kept), [](const Mount& mount) {
-        return !mount.device.starts_with("0:") || mount.source.starts_with("/dev/");
+    std::vector<pellar::Mount> kept;
+    std::copy_if(mounts.begin(), mounts.end(), std::back_inserter(kept), [](const auto& mount) {
+        return major(mount.device) != 0 || mount.source.starts_with("/dev/");
     });
     return kept;
 }
@@ -140,7 +141,7 @@ private:
 
     bool mountsHaveChanged()
     {
-        auto now = deviceMounts(currentMounts());
+        auto now = deviceMounts(pellar::currentMounts());
         return std::exchange(mounts_, now) != now;
     }
 
@@ -148,7 +149,7 @@ private:
     const int stop_;
     const std::function<void()> tell_;
     const pellar::FileDescriptor mountInfo_{::open("/proc/self/mountinfo", O_RDONLY | O_CLOEXEC)};
-    std::vector<Mount> mounts_ = deviceMounts(currentMounts());
+    std::vector<pellar::Mount> mounts_ = deviceMounts(pellar::currentMounts());
     EventBurst burst_;
 };
 

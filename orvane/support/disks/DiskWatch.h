@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/disks/MountTable.h"
 #include "orvane/support/files/Failure.h"
 #include "orvane/support/loop/EventLoop.h"
+#include "pellar/mounts/MountTable.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/process/StopSwitch.h"
+#include "pellar/process/Stopping.h"
 
 #include <chrono>
 #include <functional>
@@ -22,7 +22,7 @@ namespace orvane {
 [[nodiscard]] bool isAboutBlockDevice(std::string_view message);
 
 /// The mounts that have a device behind them. Containers come and go with dozens of others.
-[[nodiscard]] std::vector<Mount> deviceMounts(const std::vector<Mount>& mounts);
+[[nodiscard]] std::vector<pellar::Mount> deviceMounts(const std::vector<pellar::Mount>& mounts);
 
 /// Joins events that come in bursts: one stick that is plugged in makes a dozen. They are due when
 /// it has been quiet for a while, or when the first has waited long enough.

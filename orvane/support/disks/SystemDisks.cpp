@@ -13,6 +13,7 @@
 #include <fmt/format.h>
 #include <algorithm>
 #include <charconv>
+#include <cstdio>
 #include <map>
 #include <tuple>
 
@@ -99,26 +100,37 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
 
 // What the kernel has mounted it as is certain, also where the device may not be read. A file
 // system in user space ("fuseblk") does not tell which it is.
-std::string filesystemOf(const Mount& mount)
+std::string filesystemOf(const pellar::Mount& mount)
 {
     if (mount.filesystem == "ntfs3")
         return "ntfs";
     return mount.filesystem.starts_with("fuse") ? std::string() : mount.filesystem;
 }
 
+/// `number` is the device's, as sysfs and udev name it ("8:2").
+std::optional<pellar::Mount> mountOf(const DiskFacts& facts, const std::string& number,
+                                     const DiskSources& sources)
+{
+    unsigned major = 0;
+    unsigned minor = 0;
+    if (std::sscanf(number.c_str(), "%u:%u", &major, &minor) != 2)
+        return std::nullopt;
+    return pellar::mountOfDevice(sources.mounts, makedev(major, minor), facts.path);
+}
+
 void addMount(DiskFacts& facts, const std::string& number, const DiskSources& sources)
 {
-    const auto mount = mountOfDevice(sources.mounts, number, facts.path);
+    const auto mount = mountOf(facts, number, sources);
     if (!mount)
         return;
-    facts.mountPoint = mount->mountPoint;
+    facts.mountPoint = mount->target;
     if (facts.filesystem.empty())
         facts.filesystem = filesystemOf(*mount);
     facts.isWritable = facts.isWritable && !mount->isReadOnly;
-    facts.isBootVolume = mount->mountPoint == "/";
+    facts.isBootVolume = mount->target == "/";
     const auto home = sources.homeDirectory.empty()
                           ? std::nullopt
-                          : mountHolding(sources.mounts, sources.homeDirectory);
+                          : pellar::mountHolding(sources.mounts, sources.homeDirectory);
     // What holds both is known as the startup disk.
     facts.containsUserHome = home && home->device == mount->device && !facts.isBootVolume;
 }
@@ -220,7 +232,7 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
         if (!attribute(part, "partition").empty())
             tree.children.push_back(readPartition(part, contents.table, sources));
     facts.type = typeOfWhole(device, contents, !tree.children.empty(),
-                             mountOfDevice(sources.mounts, number, facts.path).has_value());
+                             mountOf(facts, number, sources).has_value());
     facts.isWhole = facts.type == diskType::whole;
     facts.isBlankOptical = facts.type == diskType::opticalDisc && contents.superblock.type.empty();
     if (!facts.isWhole) {
@@ -258,7 +270,7 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
     facts.type = isPartition
                      ? diskType::volume
                      : typeOfWhole(device, contents, false,
-                                   mountOfDevice(sources.mounts, number, facts.path).has_value());
+                                   mountOf(facts, number, sources).has_value());
     facts.isWhole = facts.type == diskType::whole;
     addSuperblock(facts, contents);
     addMount(facts, number, sources);

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/support/disks/DiskFacts.h"
-#include "orvane/support/disks/MountTable.h"
+#include "pellar/mounts/MountTable.h"
 
 #include <filesystem>
 #include <optional>
@@ -15,7 +15,7 @@ struct DiskSources {
     std::filesystem::path sysBlock = "/sys/block";
     std::filesystem::path dev = "/dev";
     std::filesystem::path udevData = "/run/udev/data";
-    std::vector<Mount> mounts = currentMounts();
+    std::vector<pellar::Mount> mounts = pellar::currentMounts();
     std::filesystem::path homeDirectory;  ///< of the user; empty when there is none
 };
 

@@ -3,7 +3,7 @@
 
 #include "contract/foundation/UTF8.h"
 #include "orvane/support/images/ImageFile.h"
-#include "pellar/volumes/DiskUse.h"
+#include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
 

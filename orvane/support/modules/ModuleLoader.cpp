@@ -5,7 +5,7 @@
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/settings/ValueJSON.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <dlfcn.h>
 #include <fcntl.h>
@@ -111,9 +111,9 @@ Result<const contract::ModuleEntry*, Failure> openLibrary(pellar::FileDescriptor
 Result<LoadedModule, Failure> loadModule(const std::filesystem::path& bundle)
 {
     const auto opened = pellar::openTrusted(bundle);
-    if (const auto* const reason = std::get_if<std::string>(&opened))
-        return cannot(attempt, bundle.native(), *reason);
-    const auto& directory = std::get<pellar::FileDescriptor>(opened);
+    if (!opened)
+        return cannot(attempt, bundle.native(), opened.error());
+    const pellar::FileDescriptor& directory = *opened;
     const auto json = openFile(directory, "module.json", bundle / "module.json");
     if (!json)
         return json.error();

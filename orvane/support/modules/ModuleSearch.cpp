@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/modules/ModuleSearch.h"
 
-#include "pellar/process/TrustedWay.h"
+#include "pellar/process/TrustedPath.h"
 
 #include <unistd.h>
 
@@ -23,14 +23,13 @@ std::vector<fs::path> directoriesNamedBy(const char* variable, const Environment
         if (!fs::path(directory).is_absolute())
             continue;
         const bool isLookedAt = ::geteuid() == 0 && fs::exists(directory, error);
-        const auto opened = isLookedAt ? pellar::openTrusted(directory)
-                                       : std::variant<pellar::FileDescriptor, std::string>();
-        const auto* const reason = std::get_if<std::string>(&opened);
-        if (reason == nullptr)
+        if (!isLookedAt)
+            directories.emplace_back(directory);
+        else if (const auto opened = pellar::openTrusted(directory))
             directories.emplace_back(directory);
         else if (refused)
-            refused(
-                cannot(fmt::format("use, as root, {}'s", variable), directory, *reason).message);
+            refused(cannot(fmt::format("use, as root, {}'s", variable), directory, opened.error())
+                        .message);
     }
     return directories;
 }

@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/udisks/DirectDisks.h"
 
-#include "pellar/mounts/MountCall.h"
-#include "pellar/mounts/MountContext.h"
+#include "pellar/disks/LoopDevice.h"
+#include "pellar/mounts/MountPoint.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/volumes/LoopDevice.h"
 
 #include <fcntl.h>
+#include <libmount/libmount.h>
 #include <linux/cdrom.h>
 #include <linux/loop.h>
 #include <sys/ioctl.h>
@@ -17,9 +17,9 @@
 
 namespace orvane {
 
-std::vector<pellar::MountPlace> placesOf(const std::string& node)
+std::vector<pellar::Mount> placesOf(const std::string& node)
 {
-    return pellar::mountPlacesOf(std::filesystem::path(node), pellar::SystemPaths());
+    return pellar::mountsOf(std::filesystem::path(node), pellar::SystemPaths());
 }
 
 namespace {
@@ -27,7 +27,24 @@ namespace {
 struct Free {
     void operator()(libmnt_table* table) const { mnt_unref_table(table); }
     void operator()(libmnt_cache* cache) const { mnt_unref_cache(cache); }
+    void operator()(libmnt_context* context) const { mnt_free_context(context); }
 };
+
+/// One mount or unmount by libmount; null when there is no memory.
+using MountContext = std::unique_ptr<libmnt_context, Free>;
+
+/// What libmount's answer to it means: 0, or an errno value. The library answers its own failures
+/// negative, and a system call's with a status of its own (libmount's documentation, "Mount
+/// context"). A helper, such as that of NTFS-3G, has neither and told its own standard error: EIO.
+int errorOf(const MountContext& context, int answer)
+{
+    const bool hasHelperFailed = mnt_context_helper_executed(context.get()) == 1 &&
+                                 mnt_context_get_helper_status(context.get()) != 0;
+    if (answer == 0)
+        return hasHelperFailed ? EIO : 0;
+    const int error = mnt_context_get_syscall_errno(context.get());
+    return error != 0 ? error : answer < 0 ? -answer : EINVAL;
+}
 
 Refusal refusalOf(int error)
 {
@@ -78,7 +95,7 @@ Result<void, Refusal> DirectDisks::mount(const std::string& node)
     const std::string target = targetInTable(node);
     if (target.empty())
         return Refusal{Refusal::Kind::NoTable, {}};
-    const pellar::MountContext context(mnt_new_context());
+    const MountContext context(mnt_new_context());
     if (!context)
         return refusalOf(ENOMEM);
     // By its target alone, libmount takes the rest from the table.
@@ -93,7 +110,7 @@ Result<void, Refusal> DirectDisks::unmount(const std::string& node)
         return Refusal{Refusal::Kind::AlreadySo, {}};
     // The last one first: it may lie over or below the others.
     for (; !places.empty(); places.pop_back()) {
-        const pellar::MountContext context(mnt_new_context());
+        const MountContext context(mnt_new_context());
         if (!context)
             return refusalOf(ENOMEM);
         if (isCovered(places.back(), places))

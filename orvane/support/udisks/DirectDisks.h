@@ -2,8 +2,8 @@
 #pragma once
 
 #include "orvane/support/udisks/Refusal.h"
-#include "pellar/mounts/MountPlace.h"
-#include "pellar/process/Access.h"
+#include "pellar/mounts/MountTable.h"
+#include "pellar/process/Command.h"
 
 #include <string>
 #include <vector>
@@ -11,7 +11,7 @@
 namespace orvane {
 
 /// Where the device with this node is mounted, in the order in which it was. Any thread.
-[[nodiscard]] std::vector<pellar::MountPlace> placesOf(const std::string& node);
+[[nodiscard]] std::vector<pellar::Mount> placesOf(const std::string& node);
 
 /// What root does without UDisks2, by libmount and ioctl(2). All take the node of a block device;
 /// any thread, and may take minutes.

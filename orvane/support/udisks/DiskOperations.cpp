@@ -3,9 +3,9 @@
 
 #include "orvane/support/udisks/DirectDisks.h"
 #include "orvane/support/udisks/UDisks.h"
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/mounts/Holders.h"
 #include "pellar/process/FileDescriptor.h"
-#include "pellar/volumes/DiskUse.h"
 
 #include <fcntl.h>
 #include <sys/file.h>
@@ -139,7 +139,7 @@ Result<void, Refusal> throughAny(UDisks& udisks, const DiskStep& step)
 
 // Asked of the mounts as they are now: the list of disks may be out of date. Root's own attempt
 // would take away what else of the device is mounted before it came to "/".
-bool holdsSystem(const std::vector<pellar::MountPlace>& places)
+bool holdsSystem(const std::vector<pellar::Mount>& places)
 {
     return std::any_of(places.begin(), places.end(),
                        [](const auto& place) { return place.target == "/"; });
@@ -172,10 +172,10 @@ Result<void, Refusal> attach(const std::filesystem::path& image, const std::stop
 }
 
 /// Who keeps these places busy, "name (number)", as far as this user may see; printable.
-std::string holdersText(const std::vector<pellar::MountPlace>& places)
+std::string holdersText(const std::vector<pellar::Mount>& places)
 {
     std::vector<std::string> holders;
-    for (const pellar::MountPlace& place : places)
+    for (const pellar::Mount& place : places)
         for (const std::string& holder : pellar::holdersOf(place.target))
             holders.push_back(holder);
     return pellar::shownNames(holders);

@@ -4,7 +4,7 @@
 #include "orvane/support/loop/EventLoop.h"
 #include "orvane/support/udisks/DiskRequest.h"
 #include "orvane/support/udisks/Refusal.h"
-#include "pellar/process/Access.h"
+#include "pellar/process/Command.h"
 
 #include <cstdint>
 #include <filesystem>

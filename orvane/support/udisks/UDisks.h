@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/support/udisks/Refusal.h"
-#include "pellar/process/Access.h"
+#include "pellar/process/Command.h"
 
 #include <chrono>
 #include <cstdint>

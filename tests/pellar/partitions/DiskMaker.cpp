@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/partitions/DiskMaker.h"
 
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 
@@ -34,14 +34,6 @@ void makeFile(const std::filesystem::path& path, std::uint64_t bytes)
 }
 
 }  // namespace
-
-std::optional<Bytes> MemorySectors::read(std::uint64_t first, std::uint64_t number) const
-{
-    if (!isOnDisk(first, number, count()))
-        return std::nullopt;
-    const auto begin = bytes.begin() + static_cast<std::ptrdiff_t>(first * sectorBytes_);
-    return Bytes(begin, begin + static_cast<std::ptrdiff_t>(number * sectorBytes_));
-}
 
 Bytes fileBytes(const std::filesystem::path& path)
 {
@@ -84,7 +76,7 @@ ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input)
 }
 
 // sfdisk waits a quarter of a second after every change, so each disk is made once and copied.
-DiskImage DiskImage::made(const Workshop& workshop, std::string_view name, std::uint64_t bytes,
+DiskImage DiskImage::made(const TestDirectory& workshop, std::string_view name, std::uint64_t bytes,
                           const std::string& script)
 {
     static std::map<std::string, Bytes> disks;
@@ -102,7 +94,7 @@ DiskImage DiskImage::made(const Workshop& workshop, std::string_view name, std::
 }
 
 // Three partitions out of order on 16 MiB, and marks between and behind them.
-DiskImage DiskImage::gpt(const Workshop& workshop, std::string_view name)
+DiskImage DiskImage::gpt(const TestDirectory& workshop, std::string_view name)
 {
     DiskImage image = made(workshop, name, 16 * mebibyte,
                            "label: gpt\n"
@@ -114,7 +106,7 @@ DiskImage DiskImage::gpt(const Workshop& workshop, std::string_view name)
     return image;
 }
 
-DiskImage DiskImage::smallGPT(const Workshop& workshop)
+DiskImage DiskImage::smallGPT(const TestDirectory& workshop)
 {
     DiskImage image = made(workshop, "small.img", 256U << 10U,
                            "label: gpt\nfirst-lba: 34\n"
@@ -125,7 +117,7 @@ DiskImage DiskImage::smallGPT(const Workshop& workshop)
     return image;
 }
 
-DiskImage DiskImage::mbr(const Workshop& workshop, std::string_view script, std::string_view name)
+DiskImage DiskImage::mbr(const TestDirectory& workshop, std::string_view script, std::string_view name)
 {
     return made(workshop, name, 16 * mebibyte, "label: dos\n" + std::string(script));
 }

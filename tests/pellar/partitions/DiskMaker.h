@@ -2,7 +2,7 @@
 #pragma once
 
 #include "pellar/partitions/PartitionMap.h"
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <filesystem>
 #include <string>
@@ -12,24 +12,6 @@
 namespace pellar::test {
 
 inline constexpr std::uint64_t mebibyte = 1U << 20U;
-
-/// A disk in memory.
-class MemorySectors final : public Sectors {
-public:
-    explicit MemorySectors(Bytes disk, std::uint32_t sectorBytes = 512)
-        : bytes(std::move(disk)), sectorBytes_(sectorBytes)
-    {
-    }
-
-    std::uint32_t sectorBytes() const override { return sectorBytes_; }
-    std::uint64_t count() const override { return bytes.size() / sectorBytes_; }
-    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override;
-
-    Bytes bytes;
-
-private:
-    std::uint32_t sectorBytes_;
-};
 
 Bytes fileBytes(const std::filesystem::path& path);
 
@@ -46,10 +28,10 @@ ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = 
 class DiskImage {
 public:
     /// Throws when the tools cannot make it.
-    static DiskImage gpt(const Workshop& workshop, std::string_view name = "disk.img");
+    static DiskImage gpt(const TestDirectory& workshop, std::string_view name = "disk.img");
     /// The same on 256 KiB: partitions at the sectors 64 to 319, nothing else between the copies.
-    static DiskImage smallGPT(const Workshop& workshop);
-    static DiskImage mbr(const Workshop& workshop, std::string_view script,
+    static DiskImage smallGPT(const TestDirectory& workshop);
+    static DiskImage mbr(const TestDirectory& workshop, std::string_view script,
                          std::string_view name = "disk.img");
 
     const std::filesystem::path& path() const { return path_; }
@@ -72,7 +54,7 @@ public:
     void seal(std::uint64_t headerPlace) const;
 
 private:
-    static DiskImage made(const Workshop& workshop, std::string_view name, std::uint64_t bytes,
+    static DiskImage made(const TestDirectory& workshop, std::string_view name, std::uint64_t bytes,
                           const std::string& script);
     explicit DiskImage(std::filesystem::path path) : path_(std::move(path)) {}
 

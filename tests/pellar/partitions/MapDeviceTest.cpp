@@ -38,7 +38,7 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
 {
     if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
         GTEST_SKIP() << obstacle;
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const DiskImage disk = DiskImage::gpt(workshop);
     const Bytes sound = [&] {
         workshop.makeExt("volume", 4 * test::mebibyte);
@@ -52,9 +52,9 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
     auto reference = std::make_shared<contract::DiskReference>(*test::wholeDisk(device.name()));
     reference->storage = contract::DiskReference::Storage::BlockDevice;
     reference->length = 0;
-    ManagerOptions options;
+    JobOptions options;
     options.savedSectorsDirectory = workshop.path("saved");
-    test::Bench bench(options);
+    test::JobFixture bench(options);
 
     if (test::runTool({"partx", "-a", "--nr", "1", device.name()}).status == 0) {
         std::filesystem::create_directory(workshop.path("mount"));

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/partitions/Checksum.h"
+#include "pellar/bytes/Checksums.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/partitions/RepairPlan.h"
 #include "tests/pellar/partitions/DiskMaker.h"
@@ -12,7 +12,24 @@ namespace {
 
 using namespace pellar;
 using test::DiskImage;
-using test::MemorySectors;
+
+/// A disk in memory.
+class MemorySectors final : public Sectors {
+public:
+    explicit MemorySectors(Bytes disk) : bytes(std::move(disk)) {}
+
+    std::uint32_t sectorBytes() const override { return 512; }
+    std::uint64_t count() const override { return bytes.size() / 512; }
+    std::optional<Bytes> read(std::uint64_t first, std::uint64_t number) const override
+    {
+        if (!isOnDisk(first, number, count()))
+            return std::nullopt;
+        const auto begin = bytes.begin() + static_cast<std::ptrdiff_t>(first * sectorBytes());
+        return Bytes(begin, begin + static_cast<std::ptrdiff_t>(number * sectorBytes()));
+    }
+
+    Bytes bytes;
+};
 
 MapReport reportOf(const MemorySectors& disk)
 {
@@ -44,7 +61,7 @@ void sealHeader(std::span<std::uint8_t> sector)
 // Each byte of a header and of a list is covered by a checksum, in either copy.
 TEST(MapFlips, EveryByteUnderAChecksumIsMissedAndComesBack)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     MemorySectors disk(sound);
     const std::size_t last = (disk.count() - 1) * 512;
@@ -69,7 +86,7 @@ TEST(MapFlips, EveryByteUnderAChecksumIsMissedAndComesBack)
 
 TEST(MapFlips, EveryByteOfTheProtectiveEntryIsSurvived)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     MemorySectors disk(sound);
     for (std::size_t at = 0; at < 512; ++at) {
@@ -88,7 +105,7 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
 {
     constexpr std::uint64_t values[] = {
         0, 1, 2, 34, 478, 511, 512, 0x7FFFFFFF, 0xFFFFFFFF, 1ULL << 62U, 1ULL << 63U, ~0ULL};
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     const std::size_t last = sound.size() - 512;
     for (const std::size_t header : {std::size_t{512}, last}) {
@@ -118,7 +135,7 @@ TEST(MapFlips, AnInterruptedRepairCanAlwaysBeFinished)
         std::size_t length;  ///< set to zero
         std::size_t grownBy;
     };
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     const std::size_t last = sound.size() - 512;
     for (const Case& c :

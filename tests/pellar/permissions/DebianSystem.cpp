@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/permissions/DebianSystem.h"
 
-#include "pellar/permissions/Digest.h"
+#include "pellar/packages/Digest.h"
 #include "pellar/process/ChildProcess.h"
 
 #include <fcntl.h>
@@ -52,9 +52,9 @@ int runProgram(const std::string& name, std::vector<std::string> arguments)
     if (program.empty())
         return -1;
     auto child = ChildProcess::start({program, std::move(arguments)}, {sink.get()});
-    if (!std::holds_alternative<ChildProcess>(child))
+    if (!child)
         return -1;
-    const Ending ending = std::get<ChildProcess>(child).reap();
+    const Ending ending = child->reap();
     const auto* const exited = std::get_if<Exited>(&ending);
     return exited != nullptr ? exited->status : -1;
 }
@@ -152,8 +152,8 @@ contract::DiskReferencePointer mountedAt(const fs::path& root)
 }
 
 PermissionBench::PermissionBench(const fs::path& store)
-    : Bench([&] {
-          ManagerOptions options;
+    : JobFixture([&] {
+          JobOptions options;
           options.permissionReferences = store;
           return options;
       }())

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "tests/pellar/Workshop.h"
+#include "tests/pellar/JobFixture.h"
 
 #include <sys/types.h>
 
@@ -49,12 +49,12 @@ public:
     contract::DiskReferencePointer disk() const;
 
 private:
-    Workshop workshop_;
+    TestDirectory workshop_;
     std::string status_;
 };
 
 /// Runs permission jobs.
-struct PermissionBench : Bench {
+struct PermissionBench : JobFixture {
     explicit PermissionBench(const DebianSystem& installed) : PermissionBench(installed.store()) {}
     explicit PermissionBench(const std::filesystem::path& store);
 

@@ -3,9 +3,9 @@
 // owners do.
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/permissions/InstalledSystem.h"
-#include "pellar/permissions/RootDirectory.h"
-#include "pellar/permissions/dpkg/DpkgReferences.h"
+#include "pellar/packages/InstalledSystem.h"
+#include "pellar/packages/RootDirectory.h"
+#include "pellar/packages/dpkg/DpkgReferences.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/permissions/DebianSystem.h"
 
@@ -268,7 +268,7 @@ TEST_F(PermissionJob, ADivertedFileIsTheOneThatWasPutAside)
 // nor to a file that it would open to others.
 TEST_F(PermissionJob, APlantedLinkIsNotFollowed)
 {
-    const test::Workshop outside;
+    const test::TestDirectory outside;
     outside.write("secret", "x");
     ::chmod(outside.path("secret").c_str(), 0600);
     fs::remove(path("var/lib/games/list"));
@@ -377,7 +377,7 @@ TEST_F(PermissionJob, StopsBetweenTwoFiles)
 
 TEST_F(PermissionJob, AVolumeThatIsNoSystemIsRefused)
 {
-    const test::Workshop workshop;
+    const test::TestDirectory workshop;
     PermissionBench bench(workshop.path("store"));
     fs::create_directory(workshop.path("empty"));
     EXPECT_EQ(bench.verifyPermissions(test::mountedAt(workshop.path("empty"))),
@@ -433,7 +433,7 @@ TEST(RPMJob, TheDatabaseIsAskedWithCapabilities)
         GTEST_SKIP() << "rpmbuild is not installed";
     const DebianSystem base;
     fs::remove_all(base.path("var/lib/dpkg"));
-    const test::Workshop work;
+    const test::TestDirectory work;
     work.write("one.spec",
                "Name: one\nVersion: 1\nRelease: 1\nSummary: x\nLicense: x\nBuildArch: noarch\n"
                "%description\nx\n%install\nmkdir -p %{buildroot}/usr/bin %{buildroot}/etc\n"

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/permissions/Comparison.h"
-#include "pellar/permissions/PackagedFile.h"
-#include "pellar/permissions/ScriptMentions.h"
-#include "pellar/permissions/TemporaryFileRules.h"
-#include "pellar/permissions/dpkg/ArchiveFetch.h"
-#include "pellar/permissions/dpkg/DpkgStatus.h"
-#include "pellar/permissions/rpm/RPMFiles.h"
+#include "pellar/packages/PackagedFile.h"
+#include "pellar/packages/RPMReferences.h"
+#include "pellar/packages/ScriptMentions.h"
+#include "pellar/packages/TemporaryFileRules.h"
+#include "pellar/packages/dpkg/AptArchives.h"
+#include "pellar/packages/dpkg/DpkgDatabase.h"
+#include "pellar/permissions/Inspection.h"
 
 #include <gtest/gtest.h>
 

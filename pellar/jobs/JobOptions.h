@@ -1,0 +1,91 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "contract/pellar/DiskReference.h"
+#include "pellar/disks/DiskClaim.h"
+#include "pellar/jobs/EventQueue.h"
+#include "pellar/outcome/Task.h"
+#include "pellar/process/KernelFiles.h"
+#include "pellar/process/ProcessOutput.h"
+#include "pellar/process/Stopping.h"
+
+#include <chrono>
+#include <filesystem>
+#include <functional>
+#include <memory>
+#include <string>
+#include <string_view>
+
+namespace pellar {
+
+class JobObserver;
+
+/// What a job does, on the thread that calls `run`. Whatever happens, it tells *started* once,
+/// first, and *finished* once, last.
+class Script {
+public:
+    virtual ~Script() = default;
+    virtual void run() = 0;
+};
+
+/// A job for which this user has no right: on a block device that they may not open, on files that
+/// are not theirs, or on a part of an image that the kernel has to make a device of.
+struct PrivilegedJob {
+    Task task;
+    contract::DiskReference disk;
+    /// The image file of which the disk is a part, as this user has opened it: the job may
+    /// do no more with it. None for a block device.
+    std::shared_ptr<const DiskClaim> image;
+    /// The user agrees that archives of packages are fetched (JobOptions::archiveFetching).
+    bool fetchesArchives = false;
+};
+
+/// Makes the script of such a job; empty where there is no way to get the right. Any thread.
+using PrivilegedScripts =
+    std::function<std::unique_ptr<Script>(const PrivilegedJob&, StopSwitch&, EventQueue&)>;
+
+/// Whether the archives of packages of the running system are fetched over the network, where
+/// nothing else says what permissions their files have.
+struct ArchiveFetching {
+    /// The user agrees. Asked as a job on permissions begins, on the main thread; never when empty.
+    std::function<bool()> isAllowed;
+    /// A sentence that says how to allow it, in the user's language; told where archives were
+    /// missing.
+    std::string howToAllow;
+};
+
+/// How the library is set up, for all its jobs.
+struct JobOptions {
+    /// Where tools are looked for: absolute directories, the first that has the tool wins.
+    std::string toolPath = "/usr/sbin:/usr/bin:/sbin:/bin";
+    /// For one run of a tool.
+    OutputLimits outputLimits;
+    /// A tool that prints nothing for so long is ended. None when 0: silence is no hang, a volume
+    /// with multiple-mount protection alone keeps e2fsck quiet for 11 s.
+    std::chrono::milliseconds silenceLimit{0};
+    /// Told every command before it runs, and why a tool was chosen or refused. Main thread; may be
+    /// empty. Not called after the PLRepairDisk has been destroyed.
+    std::function<void(std::string_view)> commandTrace;
+    SystemPaths systemPaths;
+    /// The user's. The volume that holds it is verified where it is mounted, in the way in which
+    /// that is possible, and not unmounted for it. Empty when there is none.
+    std::filesystem::path homeDirectory;
+    /// Where it is kept what archives have said about their packages' files, so that the next
+    /// verification of permissions needs no archive; absolute, made when it is needed, of no use
+    /// when others can write to it. Empty: nothing is kept.
+    std::filesystem::path permissionReferences;
+    ArchiveFetching archiveFetching;
+    /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
+    /// made when it is needed. Empty: no partition map is repaired.
+    std::filesystem::path savedSectorsDirectory;
+    PrivilegedScripts privileged;
+    JobObserver* observer = nullptr;  ///< outlives the manager; none when null
+};
+
+/// What a task may do to the disk.
+inline Access accessFor(Operation operation)
+{
+    return operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+}
+
+}  // namespace pellar

@@ -1,0 +1,42 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/ToolOutput.h"
+
+namespace pellar {
+
+using Kind = ToolLine::Kind;
+
+void LineOutput::read(std::string_view line, std::vector<ToolLine>& lines)
+{
+    if (line.find_first_not_of(" \t") != std::string_view::npos)
+        lines.push_back(tell(line));
+}
+
+ToolLine LineOutput::detail(std::string_view line)
+{
+    return {Kind::Detail, std::string(line), {}};
+}
+
+ToolLine LineOutput::phase(std::string_view line, std::string_view key)
+{
+    return {Kind::Phase, std::string(line), key};
+}
+
+ToolLine LineOutput::progress(double percent)
+{
+    return {Kind::Progress, {}, {}, percent};
+}
+
+void LineOutput::noteReadFault(const ReadFault& fault)
+{
+    if (!findings_.readFault || (findings_.readFault->isUnproven && !fault.isUnproven))
+        findings_.readFault = fault;
+}
+
+ToolLine LineOutput::problem(std::string_view line, Damage damage)
+{
+    ++findings_.problems;
+    findings_.damage.add(damage);
+    return {Kind::Problem, std::string(line), {}};
+}
+
+}  // namespace pellar

@@ -1,0 +1,165 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "pellar/tools/Judging.h"
+#include "pellar/tools/ToolOutput.h"
+#include "pellar/tools/ToolTable.h"
+#include "pellar/tools/VolumeFacts.h"
+#include "pellar/tools/btrfs/BtrfsSuperblock.h"
+
+#include <array>
+
+namespace pellar {
+namespace {
+
+constexpr std::string_view name = "btrfs";
+
+// "[3/7] checking free space tree": what stands behind the number.
+constexpr std::array phases{
+    PhaseSign{"checking root items", "Checking the roots of the trees"},
+    PhaseSign{"checking extents", "Checking which places are in use"},
+    PhaseSign{"checking free space", "Checking the maps of free space"},
+    PhaseSign{"checking fs roots", "Checking files and directories"},
+    PhaseSign{"checking only csums items", "Checking the list of checksums"},
+    PhaseSign{"checking csums", "Checking the list of checksums"},
+    PhaseSign{"checking root refs", "Checking subvolumes"},
+    PhaseSign{"checking quota groups", "Checking quotas"},
+};
+
+// btrfs-progs 6.2 and 6.14, check/. What stands in a line's beginning.
+constexpr std::array signs{
+    DamageSign{"checksum verify failed", Damage::Structure},
+    DamageSign{"parent transid verify failed", Damage::Structure},
+    DamageSign{"Csum didn't match", Damage::Structure},
+    DamageSign{"No valid Btrfs found", Damage::Structure},
+    DamageSign{"bad tree block", Damage::Structure},
+    DamageSign{"bad key order", Damage::Structure},
+    DamageSign{"couldn't ", Damage::Structure},
+    DamageSign{"Couldn't ", Damage::Structure},
+    DamageSign{"hunk[", Damage::Structure},
+    DamageSign{"ref mismatch on", Damage::Bookkeeping},
+    DamageSign{"backpointer mismatch", Damage::Bookkeeping},
+    DamageSign{"incorrect global backref count", Damage::Bookkeeping},
+    DamageSign{"owner ref check failed", Damage::Bookkeeping},
+    DamageSign{"block group", Damage::Bookkeeping},
+    DamageSign{"free space", Damage::Bookkeeping},
+    DamageSign{"errors found in", Damage::Contents},
+    DamageSign{" errors ", Damage::Contents},
+    DamageSign{"unresolved ref", Damage::LostPlaces},
+    DamageSign{"There are no extents for csum range", Damage::Contents},
+    DamageSign{"csum exists for", Damage::Contents},
+};
+
+/// Without the "[3/7] " before it.
+std::string_view withoutNumber(std::string_view line)
+{
+    const std::size_t end = line.starts_with('[') ? line.find("] ") : std::string_view::npos;
+    return end == std::string_view::npos ? line : line.substr(end + 2);
+}
+
+// Said of volumes on which no error is found: what they tell of is made anew by mounting.
+constexpr std::array<std::string_view, 2> remarks{
+    "cache and super generation don't match",
+    "a difference in qgroup ",
+};
+
+bool isAboutQuotas(std::string_view remark)
+{
+    return remark.find("qgroup") != std::string_view::npos;
+}
+
+bool isRemark(std::string_view line)
+{
+    for (const std::string_view remark : remarks)
+        if (line.find(remark) != std::string_view::npos)
+            return true;
+    return false;
+}
+
+/// Reads what btrfs check prints. A full run ends with "found N bytes used, no error found" or
+/// "found N bytes used, error(s) found", and a tally.
+class BtrfsOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        const PhaseSign* const step =
+            line.starts_with('[') ? phaseIn(phases, withoutNumber(line)) : nullptr;
+        if (step != nullptr)
+            return phase(line, step->key);
+        if (note(line))
+            return detail(line);
+        if (isRemark(line)) {
+            findings_.expectsDifference = findings_.expectsDifference || isAboutQuotas(line);
+            return detail(line);
+        }
+        if (line.starts_with("Error reading ") && line.ends_with(", -1"))
+            noteReadFault({});
+        const DamageSign* const sign = damageIn(signs, line);
+        return sign == nullptr ? detail(line) : problem(line, sign->kind);
+    }
+
+    /// YES for a line that tells of the check and not of the volume.
+    bool note(std::string_view line)
+    {
+        const bool isTally =
+            line.starts_with("found ") && line.find(" bytes used, ") != std::string_view::npos;
+        const bool isMissing =
+            line.starts_with("warning, device ") && line.ends_with(" is missing");
+        findings_.isComplete = findings_.isComplete || isTally;
+        findings_.hasErrorsLeft =
+            findings_.hasErrorsLeft || (isTally && line.ends_with("error(s) found"));
+        findings_.lacksOtherDisk = findings_.lacksOtherDisk || isMissing;
+        findings_.foundDiskInUse =
+            findings_.foundDiskInUse || line.find("is currently mounted") != std::string_view::npos;
+        return isTally || isMissing;
+    }
+};
+
+constexpr std::array damagedStatuses{1};
+
+VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
+{
+    const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);
+    VolumeFacts facts = factsFrom(superblock, "btrfs", disk, offset, availableBytes);
+    facts.volumeBytes = superblock ? superblock->diskBytes : 0;
+    facts.needsRecovery = facts.hasPrimary && superblock->hasLog;
+    return facts;
+}
+
+std::vector<std::string> arguments(Access, const std::string& disk, std::uint64_t)
+{
+    return {"check", "--readonly", disk};
+}
+
+// It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
+// only its words tell.
+Judgement judge(const RunEvidence& evidence)
+{
+    const Findings& found = evidence.findings;
+    RunEvidence weighed = evidence;
+    // With 1 as well where it expects the quotas to differ, and says that there is no error.
+    if (found.expectsDifference && found.isComplete && !hasDamage(evidence) &&
+        evidence.result.ending == Ending(Exited{1}))
+        weighed.result.ending = Exited{0};
+    return judgeRun(weighed, {name, damagedStatuses});
+}
+
+}  // namespace
+
+const Tool& btrfsCheck()
+{
+    static const Tool tool{
+        .name = name,
+        .repairName = name,
+        .package = "btrfs-progs",
+        .reasonAgainstRepair =
+            {"to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
+             "volume and make this one anew",
+             {},
+             {}},
+        .examine = examine,
+        .arguments = arguments,
+        .makeReader = readerFor<BtrfsOutput>,
+        .judge = judge,
+    };
+    return tool;
+}
+
+}  // namespace pellar

@@ -1,0 +1,125 @@
+// SPDX-License-Identifier: Apache-2.0
+#pragma once
+
+#include "contract/foundation/RunLoop.h"
+#include "contract/pellar/MessageKeys.h"
+#include "pellar/Manager.h"
+
+#include <chrono>
+#include <condition_variable>
+#include <deque>
+#include <filesystem>
+#include <functional>
+#include <mutex>
+#include <string>
+#include <thread>
+#include <vector>
+
+namespace pellar::test {
+
+/// A main loop that the test's thread turns by hand.
+class TestLoop final : public contract::RunLoop {
+public:
+    bool isMainThread() const override { return std::this_thread::get_id() == main_; }
+    void performOnMainThread(Task task, Wait wait) override;
+    void scheduleTimer(std::chrono::duration<double>, Task) override {}
+
+    /// Runs tasks until `isDone`; NO when that takes longer than a minute.
+    [[nodiscard]] bool runUntil(const std::function<bool()>& isDone);
+    /// Runs what is there.
+    void drain();
+    std::size_t waiting();
+
+private:
+    const std::thread::id main_ = std::this_thread::get_id();
+    std::mutex lock_;
+    std::condition_variable arrived_;
+    std::deque<Task> tasks_;
+};
+
+/// English.
+class EnglishTexts final : public Texts {
+public:
+    std::string text(std::string_view key) const override { return std::string(key); }
+    std::string resultText(std::string_view key) const override { return std::string(key); }
+};
+
+/// Writes down what a module would hear.
+class Listener final : public contract::PLAsyncDelegate {
+public:
+    void plAsyncStartedForDisk(const contract::DiskReferencePointer&) override { ++started; }
+    void plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
+                               const contract::Dictionary& dictionary) override;
+    void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
+    void plAsyncFinishedForDisk(const contract::DiskReferencePointer&,
+                                contract::ErrorCode mainError, contract::ErrorCode,
+                                const contract::Dictionary& result) override;
+
+    /// The texts of dictionaries of this type.
+    std::vector<std::string> textsOf(contract::Name type) const;
+    bool hasPlainLine(std::string_view part) const;
+    bool hasErrorWith(std::string_view part) const;
+
+    int started = 0;
+    int finished = 0;
+    int callsAfterFinished = 0;
+    contract::ErrorCode error = 0;
+    std::string verdict;
+    std::string message;
+    std::vector<std::string> plainLines;
+    std::vector<contract::Dictionary> dictionaries;
+    std::vector<double> progress;
+    std::function<void()> onMessage;
+    std::function<void()> onFinished;
+};
+
+/// A directory of one test, and what tests do with disks in it.
+class TestDirectory {
+public:
+    TestDirectory();
+    TestDirectory(const TestDirectory&) = delete;
+    TestDirectory& operator=(const TestDirectory&) = delete;
+    ~TestDirectory();
+
+    std::filesystem::path path(std::string_view name) const { return directory_ / name; }
+    void write(std::string_view name, std::string_view bytes) const;
+
+    /// A sparse file with a file system of e2fsprogs' own making.
+    std::filesystem::path makeExt(std::string_view name, std::uint64_t bytes,
+                                  std::vector<std::string> options = {}) const;
+    /// The same with another kind of file system; empty where the program that makes it is not
+    /// installed.
+    std::filesystem::path makeVolume(std::string_view name, std::string_view filesystem) const;
+    /// Runs a program with the image as its last argument; a failure fails the test.
+    void prepare(std::vector<std::string> command, const std::filesystem::path& image) const;
+    /// debugfs(8), writing.
+    void damage(const std::filesystem::path& image, std::string command) const;
+    /// A directory to be searched for tools, in which `tool` does what `script` says.
+    std::string fakeTools(std::string_view script, std::string_view tool = "e2fsck") const;
+
+private:
+    std::filesystem::path directory_;
+};
+
+contract::DiskReferencePointer reference(const std::filesystem::path& image,
+                                         std::string filesystem = "ext4",
+                                         std::string name = "Disk");
+
+/// One library, one listener, one loop.
+struct JobFixture {
+    explicit JobFixture(JobOptions options = {});
+
+    /// Runs a job to its *finished* and answers what the begin answered.
+    contract::ErrorCode verify(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode repair(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode finish(contract::ErrorCode begun);
+
+    TestLoop loop;
+    EnglishTexts texts;
+    Listener listener;
+    std::vector<std::string> traces;
+    Manager manager;
+    std::unique_ptr<contract::PLRepairDisk> tool;
+};
+
+}  // namespace pellar::test
