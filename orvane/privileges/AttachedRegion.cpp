@@ -56,11 +56,11 @@ std::variant<AttachedRegion, Undone> AttachedRegion::attach(const FileDescriptor
         return undone(contract::kPLErrorReadOnly, {"you may not write to the image", {}, {}});
     auto device =
         pellar::LoopDevice::attach(image.get(), request.disk.offset, request.disk.length, wanted);
-    if (const int* const error = std::get_if<int>(&device))
+    if (!device)
         return undone(
             contract::kPLErrorCannotOpen,
-            {"it could not be attached as a device: %1$@", ::strerrordesc_np(*error), {}});
-    return AttachedRegion(std::get<pellar::LoopDevice>(std::move(device)));
+            {"it could not be attached as a device: %1$@", ::strerrordesc_np(device.error()), {}});
+    return AttachedRegion(*std::move(device));
 }
 
 contract::DiskReference AttachedRegion::disk(const HelperRequest& request) const

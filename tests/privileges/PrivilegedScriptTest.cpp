@@ -20,7 +20,9 @@ protected:
     void launch(const std::string& script, pellar::Operation operation = pellar::Operation::Verify)
     {
         launch(script, {{pellar::Subject::Filesystem, operation},
-                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"), nullptr, false});
+                        *pellar::test::reference("/dev/sdz9", "ext4", "Stick"),
+                        nullptr,
+                        false});
     }
     void launch(const std::string& script, const pellar::PrivilegedJob& job)
     {
@@ -131,8 +133,7 @@ pellar::PrivilegedJob jobOnImage(const std::filesystem::path& image)
     job.disk.offset = 4096;
     job.disk.length = 8192;
     auto claim = pellar::DiskClaim::take(job.disk, pellar::Access::ReadOnly, {});
-    job.image =
-        std::make_shared<const pellar::DiskClaim>(std::get<pellar::DiskClaim>(std::move(claim)));
+    job.image = std::make_shared<const pellar::DiskClaim>(*std::move(claim));
     return job;
 }
 
@@ -198,7 +199,9 @@ TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
         listener_ = {};
         launch(c.meanwhile + "\nexec " PELLAR_HELPER " \"$@\"",
                {{pellar::Subject::Filesystem, pellar::Operation::Verify},
-                *pellar::test::reference(device.name(), "ext4", "Stick"), nullptr, false});
+                *pellar::test::reference(device.name(), "ext4", "Stick"),
+                nullptr,
+                false});
         ASSERT_TRUE(finishes());
         EXPECT_EQ(listener_.error, c.error) << listener_.message;
         EXPECT_EQ(listener_.verdict, c.verdict) << listener_.message;

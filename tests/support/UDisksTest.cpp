@@ -119,7 +119,7 @@ protected:
         disk.path = image;
         {
             const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
-            ASSERT_EQ(job.index(), 0U);
+            ASSERT_TRUE(job);
             EXPECT_EQ(kindOf(attachImage(image, Access::ReadWrite)), Kind::BeingUsed);
         }
         for (const Access access : {Access::ReadWrite, Access::ReadOnly}) {
@@ -132,13 +132,12 @@ protected:
             ASSERT_EQ(again.index(), 1U);
             EXPECT_EQ(std::get<Refusal>(again), (Refusal{Kind::Attached, node}));
             const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
-            EXPECT_EQ(job.index(), 1U) << "a job on the file, too";
+            EXPECT_FALSE(job) << "a job on the file, too";
             const auto request =
                 orvane::request(DiskAction::Detach, DiskStep::Kind::DetachLoop, node);
             EXPECT_EQ(carryOut(request).index(), 0U);
         }
-        EXPECT_EQ(pellar::DiskClaim::take(disk, Access::ReadWrite, {}).index(), 0U)
-            << "no lock is left";
+        EXPECT_TRUE(pellar::DiskClaim::take(disk, Access::ReadWrite, {})) << "no lock is left";
     }
 
     const TemporaryDirectory directory_;
@@ -295,11 +294,11 @@ public:
         root_ = add("");
         root_->addObjectManager();
         manager_ = add("/Manager");
-        addMethod(*manager_, "org.freedesktop.UDisks2.Manager", "ResolveDevice",
-                  [](const Options&, const Options&) {
-                      return std::vector{
-                          sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
-                  });
+        addMethod(
+            *manager_, "org.freedesktop.UDisks2.Manager", "ResolveDevice",
+            [](const Options&, const Options&) {
+                return std::vector{sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
+            });
         finish(*manager_);
         addVolume();
         addDrive();
@@ -330,19 +329,27 @@ private:
                           unanswered_.push_back(std::move(result));
                       isAsked = true;
                   });
-        addProperties(
-            *volume_, "org.freedesktop.UDisks2.Block",
-            std::pair{"Device",
-                      [] { return std::vector<std::uint8_t>{'/', 'd', 'e', 'v', '/', 'x', 0}; }},
-            std::pair{"Drive",
-                      [] { return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d"); }});
+        addProperties(*volume_, "org.freedesktop.UDisks2.Block",
+                      std::pair{"Device",
+                                [] {
+                                    return std::vector<std::uint8_t>{'/', 'd', 'e', 'v',
+                                                                     '/', 'x', 0};
+                                }},
+                      std::pair{"Drive", [] {
+                                    return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d");
+                                }});
     }
     void addDrive()
     {
         drive_ = add("/drives/d");
         addProperties(*drive_, "org.freedesktop.UDisks2.Drive.Ata",
-                      std::pair{"SmartUpdated", [] { return std::uint64_t{1700000000}; }},
-                      std::pair{"SmartFailing", [] { return true; }});
+                      std::pair{"SmartUpdated",
+                                [] {
+                                    return std::uint64_t{1700000000};
+                                }},
+                      std::pair{"SmartFailing", [] {
+                                    return true;
+                                }});
     }
 
     std::unique_ptr<sdbus::IConnection> connection_;

@@ -127,9 +127,9 @@ Answer<> detachLoop(const std::string& node)
 Answer<std::string> setUpLoop(int file, pellar::Access access)
 {
     const auto made = pellar::setUpLoop(file, 0, 0, access, pellar::LoopLife::UntilDetached);
-    if (const int* const error = std::get_if<int>(&made))
-        return std::get<Refusal>(answerOf(*error));
-    return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
+    if (!made)
+        return std::get<Refusal>(answerOf(made.error()));
+    return "/dev/" + made->name;
 }
 
 }  // namespace orvane::direct
