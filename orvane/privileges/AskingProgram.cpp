@@ -109,11 +109,11 @@ pellar::Result<pellar::LoopDevice, JobFailure> attachRegion(const FileDescriptor
         return JobFailure{contract::kPLErrorReadOnly, {"you may not write to the image", {}, {}}};
     auto device =
         pellar::LoopDevice::attach(image.get(), request.disk.offset, request.disk.length, wanted);
-    if (const int* const error = std::get_if<int>(&device))
+    if (!device)
         return JobFailure{
             contract::kPLErrorCannotOpen,
-            {"it could not be attached as a device: %1$@", ::strerrordesc_np(*error), {}}};
-    return std::get<pellar::LoopDevice>(std::move(device));
+            {"it could not be attached as a device: %1$@", ::strerrordesc_np(device.error()), {}}};
+    return *std::move(device);
 }
 
 std::filesystem::path homeDirectoryOf(uid_t user)

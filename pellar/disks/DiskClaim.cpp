@@ -99,8 +99,8 @@ std::variant<DiskClaim, ErrorCode, DiskClaim::Locked> DiskClaim::attempt(
     return DiskClaim(std::move(opened), disk.path, disk.offset, disk.length);
 }
 
-std::variant<DiskClaim, ErrorCode> DiskClaim::take(const contract::DiskReference& disk,
-                                                   Access access, const SystemPaths& paths)
+Result<DiskClaim, ErrorCode> DiskClaim::take(const contract::DiskReference& disk, Access access,
+                                             const SystemPaths& paths)
 {
     constexpr int attempts = 50;
     for (int i = 0; i < attempts; ++i) {
@@ -153,20 +153,19 @@ bool DiskClaim::isEndReadable() const
     return availableBytes_ == 0 || ::pread(disk_.get(), &last, 1, static_cast<off_t>(end - 1)) == 1;
 }
 
-std::variant<DiskForTool, int> DiskForTool::prepare(const DiskClaim& claim, Form form,
-                                                    Access access)
+Result<DiskForTool, int> DiskForTool::prepare(const DiskClaim& claim, Form form, Access access)
 {
     const bool isFit = form == Form::Itself || (form == Form::VolumeAlone && claim.isAllOfIt()) ||
                        (claim.isAllOfIt() && claim.isBlockDevice());
     DiskForTool disk(claim.descriptor(), isFit ? claim.offset() : 0);
     if (isFit)
-        return std::variant<DiskForTool, int>(std::move(disk));
+        return Result<DiskForTool, int>(std::move(disk));
     auto loop =
         LoopDevice::attach(claim.descriptor(), claim.offset(), claim.availableBytes(), access);
-    if (const int* const error = std::get_if<int>(&loop))
-        return *error;
-    disk.loop_.emplace(std::move(std::get<LoopDevice>(loop)));
-    return std::variant<DiskForTool, int>(std::move(disk));
+    if (!loop)
+        return loop.error();
+    disk.loop_.emplace(std::move(*loop));
+    return Result<DiskForTool, int>(std::move(disk));
 }
 
 }  // namespace pellar

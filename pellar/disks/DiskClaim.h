@@ -4,6 +4,7 @@
 #include "contract/pellar/DiskReference.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "pellar/disks/LoopDevice.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/process/KernelFiles.h"
@@ -30,7 +31,7 @@ public:
     [[nodiscard]] static std::variant<DiskClaim, contract::ErrorCode, Locked> attempt(
         const contract::DiskReference& disk, Access access, const SystemPaths& paths);
     /// The same; a locked device is waited for, a second at most, and is then in use.
-    [[nodiscard]] static std::variant<DiskClaim, contract::ErrorCode> take(
+    [[nodiscard]] static Result<DiskClaim, contract::ErrorCode> take(
         const contract::DiskReference& disk, Access access, const SystemPaths& paths);
 
     int descriptor() const { return disk_.get(); }
@@ -73,8 +74,8 @@ public:
     };
 
     /// An errno when there is no loop device to be had (LoopDevice::attach).
-    [[nodiscard]] static std::variant<DiskForTool, int> prepare(const DiskClaim& claim, Form form,
-                                                                Access access);
+    [[nodiscard]] static Result<DiskForTool, int> prepare(const DiskClaim& claim, Form form,
+                                                          Access access);
 
     int descriptor() const { return loop_ ? loop_->descriptor() : descriptor_; }
     std::uint64_t offset() const { return offset_; }

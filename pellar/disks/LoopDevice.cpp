@@ -46,8 +46,8 @@ bool isSameFile(const std::string& path, dev_t device, ino_t number)
 
 }  // namespace
 
-std::variant<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset, std::uint64_t length,
-                                           Access access, LoopLife life)
+Result<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset, std::uint64_t length,
+                                     Access access, LoopLife life)
 {
     if (offset % sectorBytes != 0)
         return EINVAL;
@@ -73,15 +73,15 @@ std::variant<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset, std::
     return EBUSY;
 }
 
-std::variant<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset,
-                                                 std::uint64_t length, Access access)
+Result<LoopDevice, int> LoopDevice::attach(int file, std::uint64_t offset, std::uint64_t length,
+                                           Access access)
 {
     if (length < sectorBytes)
         return EINVAL;
     auto made = setUpLoop(file, offset, length, access, LoopLife::UntilClosed);
-    if (const int* const error = std::get_if<int>(&made))
-        return *error;
-    auto& [device, name] = std::get<NewLoopDevice>(made);
+    if (!made)
+        return made.error();
+    auto& [device, name] = *made;
     return LoopDevice(std::move(device), name);
 }
 

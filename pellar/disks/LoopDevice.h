@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/process/KernelFiles.h"
@@ -11,7 +12,6 @@
 #include <filesystem>
 #include <optional>
 #include <string>
-#include <variant>
 
 namespace pellar {
 
@@ -29,9 +29,9 @@ enum class LoopLife { UntilClosed, UntilDetached };
 /// the kernel refuses: EACCES without the right to, ENOENT where there is no /dev/loop-control,
 /// EINVAL for a region that does not begin at a sector of 512 bytes. The device is read-only for
 /// Access::ReadOnly, whoever opens it.
-[[nodiscard]] std::variant<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset,
-                                                         std::uint64_t length, Access access,
-                                                         LoopLife life);
+[[nodiscard]] Result<NewLoopDevice, int> setUpLoop(int file, std::uint64_t offset,
+                                                   std::uint64_t length, Access access,
+                                                   LoopLife life);
 
 /// A region of a file, or of a disk, as a block device of its own, for tools that cannot be told
 /// where a volume begins (loop(4)). Needs the right to set up loop devices.
@@ -42,8 +42,8 @@ enum class LoopLife { UntilClosed, UntilDetached };
 class LoopDevice {
 public:
     /// An errno as setUpLoop; EINVAL as well for a region of less than a sector.
-    [[nodiscard]] static std::variant<LoopDevice, int> attach(int file, std::uint64_t offset,
-                                                              std::uint64_t length, Access access);
+    [[nodiscard]] static Result<LoopDevice, int> attach(int file, std::uint64_t offset,
+                                                        std::uint64_t length, Access access);
 
     LoopDevice(LoopDevice&&) = default;
     LoopDevice& operator=(LoopDevice&&) = delete;

@@ -25,12 +25,13 @@ std::optional<Outcome> JobDisk::take(Access access)
         if (auto refusal = unmount())
             return refusal;
     auto claim = DiskClaim::take(*disk_, access, paths_);
-    if (const auto* const error = std::get_if<contract::ErrorCode>(&claim))
-        return failedOutcome(*error, {unmounted_ ? "it was unmounted, but could not be opened"
-                                                 : "another program has it to itself",
-                                      {},
-                                      {}});
-    claim_.emplace(std::get<DiskClaim>(std::move(claim)));
+    if (!claim)
+        return failedOutcome(claim.error(),
+                             {unmounted_ ? "it was unmounted, but could not be opened"
+                                         : "another program has it to itself",
+                              {},
+                              {}});
+    claim_.emplace(*std::move(claim));
     return std::nullopt;
 }
 

@@ -72,10 +72,10 @@ int LiveVolumeScript::reachVolume()
     int error = ENODEV;
     for (const Mount& place : mounts_) {
         auto opened = MountedBtrfs::open(place.target);
-        if (const int* const openError = std::get_if<int>(&opened)) {
-            error = *openError;
-        } else if (superblock && std::get<MountedBtrfs>(opened).id() == superblock->id) {
-            volume_.emplace(std::get<MountedBtrfs>(std::move(opened)));
+        if (!opened) {
+            error = opened.error();
+        } else if (superblock && opened->id() == superblock->id) {
+            volume_.emplace(*std::move(opened));
             log_.trace("it is verified through " + contract::printable(place.target));
             return 0;
         }

@@ -64,14 +64,13 @@ void PartitionMapScript::run()
 
 // udev locks a device while it looks at it, as it does after every change (systemd's "Locking Block
 // Device Access"). That is over in a moment; a mount is not.
-std::variant<MapClaim, contract::ErrorCode> PartitionMapScript::claim() const
+Result<MapClaim, contract::ErrorCode> PartitionMapScript::claim() const
 {
     constexpr std::chrono::milliseconds pause{50};
     constexpr int mostTries = 40;
     for (int tries = 1;; ++tries) {
         auto taken = MapClaim::take(*disk_, accessFor(operation_), context_.options.systemPaths);
-        const auto* const error = std::get_if<contract::ErrorCode>(&taken);
-        const bool isBusy = error != nullptr && *error == contract::kPLErrorDiskInUse;
+        const bool isBusy = !taken && taken.error() == contract::kPLErrorDiskInUse;
         if (!isBusy || tries == mostTries || context_.stop.isPressed())
             return taken;
         std::this_thread::sleep_for(pause);
@@ -85,9 +84,9 @@ Outcome PartitionMapScript::carryOut()
     const auto taken = claim();
     if (context_.stop.isPressed())
         return stopped();
-    if (const auto* const error = std::get_if<contract::ErrorCode>(&taken))
-        return failedOutcome(*error, reasonOf(*error));
-    const auto& disk = std::get<MapClaim>(taken);
+    if (!taken)
+        return failedOutcome(taken.error(), reasonOf(taken.error()));
+    const auto& disk = *taken;
     const PartitionMap map = disk.readMap();
     const MapReport found = reportOn(map);
     tellMap(map);
@@ -107,9 +106,9 @@ Outcome PartitionMapScript::repair(const MapClaim& claim, const PartitionMap& ma
                                    const MapReport& report)
 {
     const auto planned = planRepair(map, report, claim.sectors());
-    if (const auto* const refusal = std::get_if<Sentence>(&planned))
-        return outcomeOfRefusedRepair(*refusal);
-    const auto& plan = std::get<RepairPlan>(planned);
+    if (!planned)
+        return outcomeOfRefusedRepair(planned.error());
+    const auto& plan = *planned;
     Outcome outcome;
     if (!save(claim, plan, outcome))
         return outcome;
@@ -130,12 +129,11 @@ bool PartitionMapScript::save(const MapClaim& claim, const RepairPlan& plan, Out
     const SavedDisk disk{disk_->path, claim.offset(), claim.sectors().sectorBytes(),
                          std::chrono::system_clock::now()};
     const auto saved = saveSectors(plan, disk, context_.options.savedSectorsDirectory);
-    if (const auto* const refusal = std::get_if<Sentence>(&saved)) {
-        outcome = outcomeOfRefusedRepair(*refusal);
+    if (!saved) {
+        outcome = outcomeOfRefusedRepair(saved.error());
         return false;
     }
-    const std::string directory =
-        contract::printable(std::get<std::filesystem::path>(saved).native());
+    const std::string directory = contract::printable(saved->native());
     log_.remark(
         {"The sectors that are overwritten are kept in %1$@; the README.txt there tells how "
          "to put them back.",

@@ -3,6 +3,7 @@
 
 #include "pellar/jobs/Job.h"
 #include "pellar/outcome/Outcome.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/partitions/RepairPlan.h"
@@ -20,7 +21,7 @@ public:
 
 private:
     Outcome carryOut();
-    std::variant<MapClaim, contract::ErrorCode> claim() const;
+    Result<MapClaim, contract::ErrorCode> claim() const;
     Outcome repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report);
     Outcome write(const MapClaim& claim, const RepairPlan& plan);
     bool save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome);

@@ -57,9 +57,9 @@ Outcome PermissionsScript::carryOut()
     tellDatabaseIsRead();
     accounts_ = accountsOf(*root);
     const auto read = readReferences(*root);
-    if (const auto* const reason = std::get_if<Sentence>(&read))
-        return outcomeWithoutReferences(*reason);
-    return treat(*root, std::get<References>(read));
+    if (!read)
+        return outcomeWithoutReferences(read.error());
+    return treat(*root, *read);
 }
 
 Outcome PermissionsScript::treat(const RootDirectory& root, const References& references)
@@ -80,7 +80,7 @@ Outcome PermissionsScript::treat(const RootDirectory& root, const References& re
                     : outcomeOfPermissionsVerification(*tally);
 }
 
-std::variant<References, Sentence> PermissionsScript::readReferences(const RootDirectory& root)
+Result<References, Sentence> PermissionsScript::readReferences(const RootDirectory& root)
 {
     log_.meter().setRange(databaseIsRead, databaseWasRead);
     const ReferenceSources sources{disk_->mountPoint,
@@ -120,13 +120,13 @@ void PermissionsScript::lookAt(const RootDirectory& root, const Reference& refer
                                Tally& tally)
 {
     const auto found = inspect(root, reference.path);
-    if (const auto* const unseen = std::get_if<Unseen>(&found)) {
-        tally.count(*unseen);
+    if (!found) {
+        tally.count(found.error());
         if (pass != Pass::Confirm)
-            tellUnseen(reference, *unseen);
+            tellUnseen(reference, found.error());
         return;
     }
-    const auto& file = std::get<FoundFile>(found);
+    const auto& file = *found;
     const Difference difference = compare(reference, file.permissions);
     const bool isUndecided = reference.doubt != Doubt::None;
     ++(isUndecided ? tally.undecided : tally.compared);

@@ -3,6 +3,7 @@
 
 #include "pellar/jobs/Job.h"
 #include "pellar/outcome/Outcome.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Reference.h"
 #include "pellar/packages/RootDirectory.h"
 #include "pellar/permissions/Inspection.h"
@@ -28,7 +29,7 @@ private:
 
     Outcome carryOut();
     Outcome treat(const RootDirectory& root, const References& references);
-    std::variant<References, Sentence> readReferences(const RootDirectory& root);
+    Result<References, Sentence> readReferences(const RootDirectory& root);
     std::optional<Tally> look(const RootDirectory& root, const References& references, Pass pass);
     void lookAt(const RootDirectory& root, const Reference& reference, Pass pass, Tally& tally);
     void tellUnseen(const Reference& reference, Unseen unseen);

@@ -266,10 +266,7 @@ VolumeScript::State VolumeScript::replay()
     log_.flush();
     const auto disk =
         DiskForTool::prepare(disk_.claim(), DiskForTool::Form::BlockDevice, Access::ReadWrite);
-    const int* const prepareError = std::get_if<int>(&disk);
-    const int error = prepareError != nullptr
-                          ? *prepareError
-                          : replayLog(filesystem, std::get<DiskForTool>(disk).descriptor());
+    const int error = disk ? replayLog(filesystem, disk->descriptor()) : disk.error();
     if (error != 0)
         return end(notReplayed(error));
     passes_.push_back({{Verdict::Inconclusive, contract::kPLErrorInconclusive, 0, {}, true}, true});
@@ -329,13 +326,13 @@ RunEvidence VolumeScript::runOnce(Access access, ToolRun::Problems problems)
     const auto form =
         tool_->habits.takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
     const auto disk = DiskForTool::prepare(disk_.claim(), form, access);
-    if (const int* const error = std::get_if<int>(&disk)) {
-        obstacle_ = notAttached(*tool_, *error);
-        return {access, {NotStarted{*error}}, {}, volume_};
+    if (!disk) {
+        obstacle_ = notAttached(*tool_, disk.error());
+        return {access, {NotStarted{disk.error()}}, {}, volume_};
     }
     ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access, problems,
                 context_);
-    return run.run(std::get<DiskForTool>(disk), volume_);
+    return run.run(*disk, volume_);
 }
 
 // What was found on a disk that then went away is no answer about the disk that is left.

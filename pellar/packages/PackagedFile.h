@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Accounts.h"
 #include "pellar/packages/Permissions.h"
 
@@ -10,7 +11,6 @@
 #include <optional>
 #include <string>
 #include <string_view>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -46,7 +46,7 @@ enum class PackageFault {
     Malformed,
     BeyondBounds,  ///< it is larger than a package may be, see the constants below
 };
-using PackagedFiles = std::variant<std::vector<PackagedFile>, PackageFault>;
+using PackagedFiles = Result<std::vector<PackagedFile>, PackageFault>;
 
 /// The largest packages of the distributions have a fifth of these.
 inline constexpr std::size_t mostFilesOfPackage = 500'000;

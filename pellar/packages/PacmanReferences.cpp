@@ -69,11 +69,11 @@ private:
         const PackagedFiles said = !scripts ? PackageFault::BeyondBounds
                                    : mtree  ? readMtree(mtree.get())
                                             : PackageFault::Malformed;
-        const auto* const files = std::get_if<std::vector<PackagedFile>>(&said);
+        const auto* const files = said ? &*said : nullptr;
         const bool hasSource = files && !files->empty();
         collector_.countPackage(hasSource);
         if (!hasSource) {
-            if (!files && std::get<PackageFault>(said) == PackageFault::BeyondBounds)
+            if (!files && said.error() == PackageFault::BeyondBounds)
                 collector_.countBeyondBounds();
             addWithoutSource(text(package, "files"));
             return;

@@ -167,9 +167,9 @@ RPMFile parseRPMFile(std::string_view line, const Accounts& accounts, const Path
     return {RPMLine::File, std::move(reference)};
 }
 
-std::variant<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
-                                                        const std::string& database,
-                                                        const StopSwitch& stop)
+Result<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
+                                                  const std::string& database,
+                                                  const StopSwitch& stop)
 {
     auto made = TemporaryDirectory::make("rpmdb");
     if (!made)
@@ -190,9 +190,8 @@ std::variant<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
     return *std::move(made);
 }
 
-std::variant<References, Sentence> readRPMReferences(const RootDirectory& root,
-                                                     const Accounts& accounts,
-                                                     const RPMQuery& query, StopSwitch& stop)
+Result<References, Sentence> readRPMReferences(const RootDirectory& root, const Accounts& accounts,
+                                               const RPMQuery& query, StopSwitch& stop)
 {
     AnswerReader reader(root, accounts);
     RunRequest request;

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Accounts.h"
 #include "pellar/packages/Reference.h"
 #include "pellar/packages/RootDirectory.h"
@@ -13,7 +14,6 @@
 #include <optional>
 #include <string>
 #include <string_view>
-#include <variant>
 
 namespace pellar {
 
@@ -39,9 +39,9 @@ RPMFile parseRPMFile(std::string_view line, const Accounts& accounts, const Path
 /// it is only asked (a lock, SQLite's shared memory), which a verification must not, and on a
 /// read-only volume cannot. As root it is given to the user that a program with reduced
 /// rights runs as. Otherwise why there is none; an empty sentence when it was stopped.
-[[nodiscard]] std::variant<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
-                                                                      const std::string& database,
-                                                                      const StopSwitch& stop);
+[[nodiscard]] Result<TemporaryDirectory, Sentence> copyDatabase(const RootFiles& root,
+                                                                const std::string& database,
+                                                                const StopSwitch& stop);
 
 /// Where a query of rpm(8) goes, and who hears of it.
 struct RPMQuery {
@@ -54,9 +54,9 @@ struct RPMQuery {
 /// What the packages of an RPM system say about their files, asked of this host's rpm. The
 /// database is named in the command: on a system of another kind rpm's own is in a home
 /// directory. Otherwise why it could not be asked; an empty sentence when it was stopped.
-[[nodiscard]] std::variant<References, Sentence> readRPMReferences(const RootDirectory& root,
-                                                                   const Accounts& accounts,
-                                                                   const RPMQuery& query,
-                                                                   StopSwitch& stop);
+[[nodiscard]] Result<References, Sentence> readRPMReferences(const RootDirectory& root,
+                                                             const Accounts& accounts,
+                                                             const RPMQuery& query,
+                                                             StopSwitch& stop);
 
 }  // namespace pellar

@@ -95,8 +95,8 @@ PartitionMap glanceAtMap(const contract::DiskReference& disk)
                      length);
 }
 
-std::variant<MapClaim, contract::ErrorCode> MapClaim::take(const contract::DiskReference& disk,
-                                                           Access access, const SystemPaths& paths)
+Result<MapClaim, contract::ErrorCode> MapClaim::take(const contract::DiskReference& disk,
+                                                     Access access, const SystemPaths& paths)
 {
     if (access == Access::ReadOnly) {
         auto opened = openDiskForReading(disk);
@@ -106,9 +106,9 @@ std::variant<MapClaim, contract::ErrorCode> MapClaim::take(const contract::DiskR
         return MapClaim(std::move(opened), std::nullopt, disk.offset, length);
     }
     auto taken = DiskClaim::take(disk, access, paths);
-    if (const auto* const error = std::get_if<contract::ErrorCode>(&taken))
-        return *error;
-    auto& claim = std::get<DiskClaim>(taken);
+    if (!taken)
+        return taken.error();
+    auto& claim = *taken;
     FileDescriptor opened = openClaimed(claim);
     if (!opened)
         return errno == EBUSY ? contract::kPLErrorDiskInUse : contract::kPLErrorCannotOpen;

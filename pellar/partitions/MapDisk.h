@@ -3,12 +3,12 @@
 
 #include "contract/pellar/DiskReference.h"
 #include "pellar/disks/DiskClaim.h"
+#include "pellar/outcome/Result.h"
 #include "pellar/partitions/PartitionMap.h"
 #include "pellar/partitions/Sectors.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <optional>
-#include <variant>
 
 namespace pellar {
 
@@ -39,7 +39,7 @@ class MapClaim {
 public:
     /// kPLErrorDiskInUse also when a partition is mounted or in use, kPLErrorReadOnly,
     /// kPLErrorCannotOpen.
-    [[nodiscard]] static std::variant<MapClaim, contract::ErrorCode> take(
+    [[nodiscard]] static Result<MapClaim, contract::ErrorCode> take(
         const contract::DiskReference& disk, Access access, const SystemPaths& paths);
 
     FileSectors sectors() const;

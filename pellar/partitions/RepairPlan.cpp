@@ -180,8 +180,8 @@ void addCopies(PlanWriter& writer, const Target& target, bool startsWithPrimary)
 
 }  // namespace
 
-std::variant<RepairPlan, Sentence> planRepair(const PartitionMap& map, const MapReport& report,
-                                              const Sectors& sectors)
+Result<RepairPlan, Sentence> planRepair(const PartitionMap& map, const MapReport& report,
+                                        const Sectors& sectors)
 {
     const GPTCopy* const valid = map.validCopy();
     if (report.verdict != MapVerdict::Repairable || valid == nullptr)

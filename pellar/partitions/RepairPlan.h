@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/partitions/MapReport.h"
 #include "pellar/texts/Sentence.h"
-
-#include <variant>
 
 namespace pellar {
 
@@ -23,8 +22,8 @@ struct RepairPlan {
 };
 
 /// The plan for a map that can be repaired, or why there is none. Reads, never writes.
-[[nodiscard]] std::variant<RepairPlan, Sentence> planRepair(const PartitionMap& map,
-                                                            const MapReport& report,
-                                                            const Sectors& sectors);
+[[nodiscard]] Result<RepairPlan, Sentence> planRepair(const PartitionMap& map,
+                                                      const MapReport& report,
+                                                      const Sectors& sectors);
 
 }  // namespace pellar

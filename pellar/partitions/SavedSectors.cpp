@@ -124,8 +124,8 @@ std::string instructionsFor(const RepairPlan& plan, const SavedDisk& disk, const
     return text;
 }
 
-std::variant<fs::path, Sentence> saveSectors(const RepairPlan& plan, const SavedDisk& disk,
-                                             const fs::path& directory)
+Result<fs::path, Sentence> saveSectors(const RepairPlan& plan, const SavedDisk& disk,
+                                       const fs::path& directory)
 {
     if (!directory.is_absolute())
         return Sentence{

@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/partitions/RepairPlan.h"
 #include "pellar/texts/Sentence.h"
 
 #include <chrono>
 #include <filesystem>
-#include <variant>
 
 namespace pellar {
 
@@ -22,7 +22,7 @@ struct SavedDisk {
 /// user's alone below `directory`, with one file for each stretch of sectors and a README.txt that
 /// tells the disk, the date, the places and the commands. Answers it when all of that has reached
 /// the medium, else why not.
-[[nodiscard]] std::variant<std::filesystem::path, Sentence> saveSectors(
+[[nodiscard]] Result<std::filesystem::path, Sentence> saveSectors(
     const RepairPlan& plan, const SavedDisk& disk, const std::filesystem::path& directory);
 
 /// The text of the README. Pure.

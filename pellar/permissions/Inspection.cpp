@@ -79,7 +79,7 @@ Contents contentsOf(const FoundFile& file, const Reference& reference)
     return *digest == reference.digest ? Contents::AsPackaged : Contents::NotAsPackaged;
 }
 
-std::variant<FoundFile, Unseen> inspect(const RootDirectory& root, const std::string& path)
+Result<FoundFile, Unseen> inspect(const RootDirectory& root, const std::string& path)
 {
     FileDescriptor object = root.openObject(path);
     if (!object)

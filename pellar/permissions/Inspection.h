@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Accounts.h"
 #include "pellar/packages/Permissions.h"
 #include "pellar/packages/Reference.h"
@@ -10,7 +11,6 @@
 #include <sys/stat.h>
 
 #include <string>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -30,8 +30,7 @@ enum class Unseen {
     Unreadable,        ///< an error, or no permission
 };
 
-[[nodiscard]] std::variant<FoundFile, Unseen> inspect(const RootDirectory& root,
-                                                      const std::string& path);
+[[nodiscard]] Result<FoundFile, Unseen> inspect(const RootDirectory& root, const std::string& path);
 
 /// Whether what was found holds what its package brought. Only asked of files that lend rights.
 enum class Contents {

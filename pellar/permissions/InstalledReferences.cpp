@@ -14,7 +14,7 @@
 namespace pellar {
 namespace {
 
-using Answer = std::variant<References, Sentence>;
+using Answer = Result<References, Sentence>;
 
 Answer askRPM(const RootDirectory& root, const Accounts& accounts, const ReferenceSources& sources,
               StopSwitch& stop)
@@ -23,10 +23,9 @@ Answer askRPM(const RootDirectory& root, const Accounts& accounts, const Referen
     if (program.empty())
         return Sentence{"%1$@ is not installed (package %2$@)", "rpm", "rpm"};
     const auto database = copyDatabase(root, rpmDatabaseOf(root).native(), stop);
-    if (const auto* const reason = std::get_if<Sentence>(&database))
-        return *reason;
-    const RPMQuery query{program, std::get<TemporaryDirectory>(database).path(),
-                         sources.outputLimits, sources.trace};
+    if (!database)
+        return database.error();
+    const RPMQuery query{program, database->path(), sources.outputLimits, sources.trace};
     return readRPMReferences(root, accounts, query, stop);
 }
 
@@ -53,11 +52,11 @@ Answer askDpkg(const RootDirectory& root, const Accounts& accounts, const Refere
 
 }  // namespace
 
-std::variant<References, Sentence> readInstalledReferences(const RootDirectory& root,
-                                                           const Accounts& accounts,
-                                                           const ReferenceSources& sources,
-                                                           StopSwitch& stop,
-                                                           const ReadingProgress& progress)
+Result<References, Sentence> readInstalledReferences(const RootDirectory& root,
+                                                     const Accounts& accounts,
+                                                     const ReferenceSources& sources,
+                                                     StopSwitch& stop,
+                                                     const ReadingProgress& progress)
 {
     switch (installedSystemAt(root)) {
         case PackageDatabase::Dpkg: return askDpkg(root, accounts, sources, stop, progress);

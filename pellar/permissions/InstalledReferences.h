@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Accounts.h"
 #include "pellar/packages/Reference.h"
 #include "pellar/packages/RootDirectory.h"
@@ -10,7 +11,6 @@
 
 #include <filesystem>
 #include <string>
-#include <variant>
 
 namespace pellar {
 
@@ -29,8 +29,10 @@ struct ReferenceSources {
 
 /// What all packages of the system at `root` say about their files. Otherwise why that is not
 /// known; an empty sentence when it was stopped.
-[[nodiscard]] std::variant<References, Sentence> readInstalledReferences(
-    const RootDirectory& root, const Accounts& accounts, const ReferenceSources& sources,
-    StopSwitch& stop, const ReadingProgress& progress);
+[[nodiscard]] Result<References, Sentence> readInstalledReferences(const RootDirectory& root,
+                                                                   const Accounts& accounts,
+                                                                   const ReferenceSources& sources,
+                                                                   StopSwitch& stop,
+                                                                   const ReadingProgress& progress);
 
 }  // namespace pellar

@@ -19,8 +19,7 @@ ErrorCode claimError(const std::filesystem::path& path, Access access = Access::
                      const SystemPaths& paths = {})
 {
     const auto claim = DiskClaim::take(*test::reference(path), access, paths);
-    const auto* const error = std::get_if<ErrorCode>(&claim);
-    return error == nullptr ? contract::kPLNoError : *error;
+    return claim ? contract::kPLNoError : claim.error();
 }
 
 TEST(DiskClaim, RefusesWhatIsNoDisk)
@@ -95,7 +94,7 @@ TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
     disk.offset = 4096;
     disk.length = 4096;
     const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
-    const auto& claim = std::get<DiskClaim>(taken);
+    const auto& claim = *taken;
     EXPECT_EQ(claim.availableBytes(), 4096U);
     std::filesystem::resize_file(disk.path, 8192);
     EXPECT_TRUE(claim.isStillWhole()) << "the region is still there";
@@ -110,7 +109,7 @@ TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
         directory.write("disk", std::string(10'000, 'x'));
         const auto disk = *test::reference(directory.path("disk"));
         const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
-        const auto& claim = std::get<DiskClaim>(taken);
+        const auto& claim = *taken;
         EXPECT_TRUE(claim.isStillInPlace());
         std::filesystem::rename(disk.path, directory.path("elsewhere"));
         if (what == std::string_view("deleted"))

@@ -319,8 +319,8 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
         part.length = 1 << 16;
         const auto disk = std::make_shared<const contract::DiskReference>(part);
         auto claim = DiskClaim::take(*disk, Access::ReadWrite, {});
-        auto request = std::make_shared<VolumeRequest>(VolumeRequest{
-            disk, c.operation, std::get<DiskClaim>(std::move(claim)), {}, toolFor(c.filesystem)});
+        auto request = std::make_shared<VolumeRequest>(
+            VolumeRequest{disk, c.operation, *std::move(claim), {}, toolFor(c.filesystem)});
         test::TestLoop loop;
         const test::EnglishTexts texts;
         test::Listener listener;

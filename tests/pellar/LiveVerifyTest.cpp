@@ -109,7 +109,7 @@ protected:
     bool isScrubbed() const
     {
         const auto volume = MountedBtrfs::open(place());
-        return std::get<MountedBtrfs>(volume).scrubbedBytes().has_value();
+        return volume->scrubbedBytes().has_value();
     }
 
     fs::path image() const { return directory_.path("image"); }

@@ -144,8 +144,7 @@ bool mayUseLoopDevices(const test::TestDirectory& directory)
 {
     directory.write("probe", std::string(4096, 'x'));
     const FileDescriptor file(::open(directory.path("probe").c_str(), O_RDONLY | O_CLOEXEC));
-    return std::holds_alternative<LoopDevice>(
-        LoopDevice::attach(file.get(), 0, 4096, Access::ReadOnly));
+    return bool(LoopDevice::attach(file.get(), 0, 4096, Access::ReadOnly));
 }
 
 bool isOnALoopDevice(const std::filesystem::path& image)
@@ -209,10 +208,9 @@ bool leaveALog(const std::filesystem::path& image)
     const FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
     const auto loop =
         LoopDevice::attach(file.get(), 0, std::filesystem::file_size(image), Access::ReadWrite);
-    if (!std::holds_alternative<LoopDevice>(loop))
+    if (!loop)
         return false;
-    const std::string source =
-        "/proc/self/fd/" + std::to_string(std::get<LoopDevice>(loop).descriptor());
+    const std::string source = "/proc/self/fd/" + std::to_string(loop->descriptor());
     const FileDescriptor context(::fsopen("xfs", FSOPEN_CLOEXEC));
     if (!context ||
         ::fsconfig(context.get(), FSCONFIG_SET_STRING, "source", source.c_str(), 0) != 0 ||

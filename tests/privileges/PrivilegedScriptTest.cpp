@@ -133,8 +133,7 @@ pellar::PrivilegedJob jobOnImage(const std::filesystem::path& image)
     job.disk.offset = 4096;
     job.disk.length = 8192;
     auto claim = pellar::DiskClaim::take(job.disk, pellar::Access::ReadOnly, {});
-    job.image =
-        std::make_shared<const pellar::DiskClaim>(std::get<pellar::DiskClaim>(std::move(claim)));
+    job.image = std::make_shared<const pellar::DiskClaim>(*std::move(claim));
     return job;
 }
 

@@ -138,9 +138,9 @@ Result<void, Refusal> DirectDisks::detachLoop(const std::string& node)
 Result<std::string, Refusal> DirectDisks::setUpLoop(int file, pellar::Access access)
 {
     const auto made = pellar::setUpLoop(file, 0, 0, access, pellar::LoopLife::UntilDetached);
-    if (const int* const error = std::get_if<int>(&made))
-        return refusalOf(*error);
-    return "/dev/" + std::get<pellar::NewLoopDevice>(made).name;
+    if (!made)
+        return refusalOf(made.error());
+    return "/dev/" + made->name;
 }
 
 }  // namespace orvane

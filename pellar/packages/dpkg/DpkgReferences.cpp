@@ -131,17 +131,12 @@ private:
         const std::vector<std::string>& digests = index_.digestsOf(packages_[index]);
         for (const std::string& digest : digests)
             if (const auto kept = sources_.kept ? sources_.kept->open(digest) : FileDescriptor())
-                if (PackagedFiles files = readMtree(kept.get()); isKnown(files))
+                if (PackagedFiles files = readMtree(kept.get()))
                     return files;
         FileDescriptor archive = ownArchiveOf(packages_[index]);
         if (!archive)
             archive = fetched(index);
         return archive ? read(archive.get(), digests) : PackageFault::Malformed;
-    }
-
-    static bool isKnown(const PackagedFiles& files)
-    {
-        return std::holds_alternative<std::vector<PackagedFile>>(files);
     }
 
     // An archive of this name that apt knows by another digest is not the package's. One of a
@@ -154,8 +149,8 @@ private:
         if (!digest || std::find(digests.begin(), digests.end(), *digest) == digests.end())
             return PackageFault::Malformed;
         PackagedFiles files = readDebArchive(archive);
-        if (sources_.kept && isKnown(files))
-            sources_.kept->keep(*digest, writeMtree(std::get<std::vector<PackagedFile>>(files)));
+        if (sources_.kept && files)
+            sources_.kept->keep(*digest, writeMtree(*files));
         return files;
     }
 
@@ -206,14 +201,13 @@ private:
         PackagedFiles said = PackageFault::Malformed;
         if (package.isConfigured)
             said = scripts ? archived(index) : PackageFault::BeyondBounds;
-        collector_.countPackage(isKnown(said));
-        if (!isKnown(said)) {
-            if (std::get<PackageFault>(said) == PackageFault::BeyondBounds)
+        collector_.countPackage(bool(said));
+        if (!said) {
+            if (said.error() == PackageFault::BeyondBounds)
                 collector_.countBeyondBounds();
             said = std::vector<PackagedFile>();
         }
-        addFiles(package, std::get<std::vector<PackagedFile>>(said),
-                 scripts.value_or(ScriptMentions()));
+        addFiles(package, *said, scripts.value_or(ScriptMentions()));
     }
 
     void addFiles(const DpkgPackage& package, std::vector<PackagedFile>& said,

@@ -127,7 +127,7 @@ bool ReaderRights::take() const noexcept
     return reduceRights(limits) && ::seccomp_load(filter_.get()) == 0;
 }
 
-using Answer = std::variant<References, Sentence>;
+using Answer = Result<References, Sentence>;
 
 constexpr std::size_t largestResult = 512U << 20U;
 constexpr int socketOfReader = 0;

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/packages/Reference.h"
 #include "pellar/packages/dpkg/DpkgReferences.h"
 #include "pellar/process/Stopping.h"
 #include "pellar/texts/Sentence.h"
 
 #include <functional>
-#include <variant>
 
 namespace pellar {
 
@@ -26,8 +26,7 @@ using Reading = std::function<std::optional<References>(
 /// process of its own: see ReaderRights. Pressing the switch ends it at once, whatever it is at.
 /// What it answers is checked to be references. Otherwise why there are none; an empty sentence
 /// when it was stopped. The calling thread serves it to its end; no process stays behind.
-[[nodiscard]] std::variant<References, Sentence> readApart(const ReaderServices& services,
-                                                           StopSwitch& stop,
-                                                           const Reading& reading);
+[[nodiscard]] Result<References, Sentence> readApart(const ReaderServices& services,
+                                                     StopSwitch& stop, const Reading& reading);
 
 }  // namespace pellar

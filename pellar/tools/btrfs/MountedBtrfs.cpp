@@ -43,7 +43,7 @@ std::vector<std::uint64_t> disksOf(int directory, const btrfs_ioctl_fs_info_args
 
 }  // namespace
 
-std::variant<MountedBtrfs, int> MountedBtrfs::open(const std::filesystem::path& directory)
+Result<MountedBtrfs, int> MountedBtrfs::open(const std::filesystem::path& directory)
 {
     FileDescriptor opened(::open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     btrfs_ioctl_fs_info_args volume = {};

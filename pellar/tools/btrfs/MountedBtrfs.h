@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <cstdint>
 #include <filesystem>
 #include <optional>
-#include <variant>
 #include <vector>
 
 namespace pellar {
@@ -18,8 +18,7 @@ namespace pellar {
 class MountedBtrfs {
 public:
     /// An errno; ENOTTY when the directory belongs to another file system.
-    [[nodiscard]] static std::variant<MountedBtrfs, int> open(
-        const std::filesystem::path& directory);
+    [[nodiscard]] static Result<MountedBtrfs, int> open(const std::filesystem::path& directory);
 
     int descriptor() const { return directory_.get(); }
     const BtrfsId& id() const { return id_; }

@@ -32,8 +32,8 @@ using Clock = std::chrono::steady_clock;
 
 namespace fs = std::filesystem;
 
-std::variant<References, Sentence> readIn(const fs::path& directory, const Reading& reading,
-                                          StopSwitch& stop)
+Result<References, Sentence> readIn(const fs::path& directory, const Reading& reading,
+                                    StopSwitch& stop)
 {
     const auto root = RootDirectory::open(directory);
     const ReadingProgress progress = [](double) {
@@ -77,8 +77,8 @@ TEST(ReaderProcess, ReachesNothingButTheFilesItIsGiven)
             return saying(word);
         },
         stop);
-    ASSERT_TRUE(std::holds_alternative<References>(answer)) << std::get<Sentence>(answer).key;
-    EXPECT_EQ(std::get<References>(answer).filesWithoutSource.at(0), "inside 2 names ");
+    ASSERT_TRUE(answer) << answer.error().key;
+    EXPECT_EQ(answer->filesWithoutSource.at(0), "inside 2 names ");
 }
 
 TEST(ReaderProcess, EndsWithASentenceWhateverItDoes)
@@ -104,8 +104,8 @@ TEST(ReaderProcess, EndsWithASentenceWhateverItDoes)
                "all memory"}}) {
         StopSwitch stop;
         const auto answer = readIn(workshop.path(""), c.reading, stop);
-        ASSERT_TRUE(std::holds_alternative<Sentence>(answer)) << c.because;
-        EXPECT_FALSE(std::get<Sentence>(answer).isEmpty()) << c.because;
+        ASSERT_TRUE(!answer) << c.because;
+        EXPECT_FALSE(answer.error().isEmpty()) << c.because;
     }
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << "nothing is left to be reaped";
 }
@@ -127,8 +127,8 @@ TEST(ReaderProcess, IsStoppedInTheMiddleOfALoop)
         },
         stop);
     user.join();
-    ASSERT_TRUE(std::holds_alternative<Sentence>(answer));
-    EXPECT_TRUE(std::get<Sentence>(answer).isEmpty());
+    ASSERT_TRUE(!answer);
+    EXPECT_TRUE(answer.error().isEmpty());
     EXPECT_LT(Clock::now() - begin, std::chrono::seconds(5));
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
 }
@@ -213,8 +213,8 @@ TEST(DebArchive, StartsNoProgramToBeUnpacked)
         workshop.write("x.deb", debWith(std::string(magic) + std::string(1000, 'x')));
         const FileDescriptor file(::open(workshop.path("x.deb").c_str(), O_RDONLY | O_CLOEXEC));
         const PackagedFiles files = readDebArchive(file.get());
-        ASSERT_TRUE(std::holds_alternative<PackageFault>(files));
-        EXPECT_EQ(std::get<PackageFault>(files), PackageFault::Malformed) << magic;
+        ASSERT_TRUE(!files);
+        EXPECT_EQ(files.error(), PackageFault::Malformed) << magic;
     }
     ::setenv("PATH", before.c_str(), 1);
     EXPECT_FALSE(fs::exists(workshop.path("ran")));
@@ -243,8 +243,8 @@ TEST(PackageBounds, MoreThanAPackageMayHaveIsNotRead)
     const FileDescriptor deb(::open(workshop.path("x.deb").c_str(), O_RDONLY | O_CLOEXEC));
     for (const PackagedFiles& files :
          {parseMtree(equal), parseMtree(many), readDebArchive(deb.get())}) {
-        ASSERT_TRUE(std::holds_alternative<PackageFault>(files));
-        EXPECT_EQ(std::get<PackageFault>(files), PackageFault::BeyondBounds);
+        ASSERT_TRUE(!files);
+        EXPECT_EQ(files.error(), PackageFault::BeyondBounds);
     }
 }
 
@@ -281,14 +281,13 @@ TEST(RPMDatabaseCopy, IsBoundedAndLeavesNothingBehind)
     };
     StopSwitch stop;
     const auto contents = [](const auto& copy) -> std::string {
-        const auto* const reason = std::get_if<Sentence>(&copy);
-        return reason != nullptr ? std::string(reason->key) : "copied";
+        return copy ? "copied" : std::string(copy.error().key);
     };
     {
         const auto sparse = copyOf(1U << 30U, stop);
         ASSERT_EQ(contents(sparse), "copied");
         struct stat status = {};
-        const auto file = std::get<TemporaryDirectory>(sparse).path() / "Packages";
+        const auto file = sparse->path() / "Packages";
         ASSERT_EQ(::stat(file.c_str(), &status), 0);
         EXPECT_EQ(status.st_size, 1 << 30);
         EXPECT_LT(status.st_blocks, 1000) << "its holes are holes";
