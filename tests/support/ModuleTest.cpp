@@ -53,7 +53,7 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
     };
     for (const Case& c :
          {Case{TEST_MODULE_WRONG, nothing,
-               "version 42 of the module contract, and this program has version 1"},
+               "of the module contract, and this program has version "},
           Case{TEST_MODULE_NO_ENTRY, nothing, "OVModuleEntry"},
           Case{TEST_MODULE_RIGHT, [](const fs::path& b) { fs::resize_file(b / "test.so", 100); },
                "cannot read file data"},
