@@ -3,7 +3,7 @@
 
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/disks/SystemDisks.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <string_view>
 

@@ -3,7 +3,7 @@
 
 #include "orvane/desktop/session/SessionBuses.h"
 #include "orvane/jobs/JobLedger.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <QObject>
 #include <QString>

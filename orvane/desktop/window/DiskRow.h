@@ -3,7 +3,7 @@
 
 #include "orvane/support/disks/Disk.h"
 #include "orvane/support/disks/DiskFacts.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <QDateTime>
 #include <QIcon>

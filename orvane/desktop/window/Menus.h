@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <QAction>
 #include <QMainWindow>

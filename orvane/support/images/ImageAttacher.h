@@ -5,7 +5,7 @@
 #include "orvane/support/disks/Disk.h"
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/files/Failure.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <chrono>
 #include <condition_variable>

@@ -4,7 +4,7 @@
 #include "orvane/support/disks/BlockProbe.h"
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/files/Failure.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <cstdint>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "contract/support/OVWindowController.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <functional>
 #include <optional>

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/support/files/Failure.h"
-#include "orvane/support/texts/Translator.h"
+#include "orvane/support/texts/Catalogue.h"
 
 #include <string>
 #include <string_view>
