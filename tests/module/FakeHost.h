@@ -3,6 +3,7 @@
 
 #include "contract/support/OVModule.h"
 #include "fixwell/Contract.h"
+#include "tests/module/FakeControls.h"
 
 #include <algorithm>
 #include <functional>
@@ -84,100 +85,13 @@ struct FakeDisk final : OVDisk {
     Array fsckHistory() const override;
     Array fsckHistoryNoChildren() const override { return history; }
     void setFsckHistory(const Array& records) override { history = records; }
-    bool clearFsckHistory() override;
-};
-
-struct FakeButton final : Button {
-    bool enabled = true;
-    std::string toolTip;
-    std::string reason;
-    std::string title;
-    std::string action;
-    std::string key = "unset";
-    std::int64_t value = -1;
-    std::int64_t tag = 0;
-
-    void setNeedsDisplay(bool) override {}
-    void setEnabled(bool isOn) override { enabled = isOn; }
-    bool isEnabled() const override { return enabled; }
-    void setToolTip(std::string_view text) override { toolTip = text; }
-    void setTitle(std::string_view text) override { title = text; }
-    void setAction(Selector selector) override { action = selector; }
-    void setIntegerValue(std::int64_t number) override { value = number; }
-    void setKeyEquivalent(std::string_view equivalent) override { key = equivalent; }
-    void setTag(std::int64_t number) override { tag = number; }
-    void setReason(std::string_view text) override { reason = text; }
-};
-
-struct FakeTextField final : TextField {
-    StyledText text;
-
-    void setNeedsDisplay(bool) override {}
-    void setEnabled(bool) override {}
-    bool isEnabled() const override { return true; }
-    void setToolTip(std::string_view) override {}
-    void setAttributedStringValue(const StyledText& value) override { text = value; }
-};
-
-struct FakeTextView final : TextView {
-    std::string text = "old";
-
-    void setNeedsDisplay(bool) override {}
-    void setString(std::string_view value) override { text = value; }
-};
-
-struct FakeScroller final : Scroller {
-    double position = 1.0;
-
-    double value() const override { return position; }
-};
-
-/// A widget without a screen: it counts its rows when it is told to reload, as a real one does.
-struct FakeOutlinePeer final : OutlineViewPeer {
-    OutlineViewDelegate* delegate = nullptr;
-    std::size_t rows = 0;
-    int reloads = 0;
-    int baseKeys = 0;
-    std::vector<std::size_t> selected;
-    std::vector<std::size_t> scrolledTo;
-    std::vector<Rect> redrawn;
-    FakeScroller scroller;
-    double indentation = 0;
-    bool enabled = true;
-
-    void reloadData() override;
-    std::size_t numberOfRows() const override { return rows; }
-    std::vector<std::size_t> selectedRowIndexes() const override { return selected; }
-    std::size_t numberOfSelectedRows() const override { return selected.size(); }
-    void scrollRowToVisible(std::size_t row) override { scrolledTo.push_back(row); }
-    Rect rectOfRow(std::size_t row) const override;
-    Rect frameOfCellAtColumnRow(std::size_t, std::size_t row) const override;
-    Rect frameOfOutlineCellAtRow(std::size_t) const override { return {0, 0, 10, 10}; }
-    void keyDown(const KeyEvent&) override { ++baseKeys; }
-    void selectAll() override {}
-    void setNeedsDisplay(bool) override {}
-    void setNeedsDisplayInRect(const Rect& rect) override { redrawn.push_back(rect); }
-    void setEnabled(bool isOn) override { enabled = isOn; }
-    bool isEnabled() const override { return enabled; }
-    void setToolTip(std::string_view) override {}
-    void setIndentationPerLevel(double points) override { indentation = points; }
-    void setDraggingSourceOperationMask(DragOperation, bool) override {}
-    Scroller* verticalScroller() override { return &scroller; }
-};
-
-struct FakeAlert final : Alert {
-    Text text;
-    FakeButton defaultButton;
-    FakeButton alternateButton;
-    std::function<void(Alert&, long)> end;
-    bool isOrderedOut = false;
-
-    std::vector<Button*> buttons() override { return {&defaultButton, &alternateButton}; }
-    void beginSheetModalForWindow(Window*, std::function<void(Alert&, long)> then) override
+    bool clearFsckHistory() override
     {
-        end = std::move(then);
+        const bool hadSome = !history.isEmpty();
+        if (hadSome)
+            history.removeAll();
+        return hadSome;
     }
-    void orderOut() override { isOrderedOut = true; }
 };
 
 struct FakeEstimator final : OVTimeEstimator {
@@ -195,45 +109,64 @@ private:
 
 /// The disk-management library: notes what it is asked, starts what it is not told to refuse.
 struct FakeRepairDisk final : PLRepairDisk {
+    using Disk = const DiskReferencePointer&;
     explicit FakeRepairDisk(struct FakeHost& owner) : host(owner) {}
 
-    ErrorCode beginStoragesystemFilesystemVerifyForDisk(const DiskReferencePointer& disk) override;
-    ErrorCode beginStoragesystemFilesystemRepairForDisk(const DiskReferencePointer& disk) override;
-    ErrorCode beginPermissionsVerifyForDisk(const DiskReferencePointer& disk) override;
-    ErrorCode beginPermissionsRepairForDisk(const DiskReferencePointer& disk) override;
-    ErrorCode beginPartitionMapVerifyForDisk(const DiskReferencePointer& disk) override;
-    ErrorCode beginPartitionMapRepairForDisk(const DiskReferencePointer& disk) override;
-    bool canRepairPartitionMapForDisk(const DiskReferencePointer& disk, ErrorCode* error) override;
-    bool canRepairStoragesystemFilesystemForDisk(const DiskReferencePointer&, ErrorCode*) override;
-    bool canVerifyStoragesystemFilesystemForDisk(const DiskReferencePointer&, ErrorCode*) override;
+    ErrorCode beginStoragesystemFilesystemVerifyForDisk(Disk disk) override
+    {
+        return begin("verify", disk);
+    }
+    ErrorCode beginStoragesystemFilesystemRepairForDisk(Disk disk) override
+    {
+        return begin("repair", disk);
+    }
+    ErrorCode beginPermissionsVerifyForDisk(Disk disk) override
+    {
+        return begin("verify permissions", disk);
+    }
+    ErrorCode beginPermissionsRepairForDisk(Disk disk) override
+    {
+        return begin("repair permissions", disk);
+    }
+    ErrorCode beginPartitionMapVerifyForDisk(Disk disk) override
+    {
+        return begin("verify map", disk);
+    }
+    ErrorCode beginPartitionMapRepairForDisk(Disk disk) override
+    {
+        return begin("repair map", disk);
+    }
+    bool canRepairPartitionMapForDisk(Disk disk, ErrorCode* error) override;
+    bool canRepairStoragesystemFilesystemForDisk(Disk, ErrorCode*) override { return true; }
+    bool canVerifyStoragesystemFilesystemForDisk(Disk, ErrorCode*) override { return true; }
     void cancelCurrentOperation() override;
 
-    ErrorCode begin(const char* what, const DiskReferencePointer& disk);
+    ErrorCode begin(const char* what, Disk disk);
 
     struct FakeHost& host;
 };
 
 /// A whole host in miniature, with a journal of what the module asked it to do.
 struct FakeHost : HostServices,
-                        ModuleSite,
-                        OVPreferences,
-                        OVDiskController,
-                        OVLog,
-                        NotificationCenter,
-                        RunLoop,
-                        Threads,
-                        UserDefaults,
-                        Bundle,
-                        ImageAttachment,
-                        Alerts,
-                        Events,
-                        HelpManager,
-                        InterfaceLoader,
-                        Pasteboard,
-                        Printing,
-                        OVWindowController,
-                        Window,
-                        PLManager {
+                  ModuleSite,
+                  OVPreferences,
+                  OVDiskController,
+                  OVLog,
+                  NotificationCenter,
+                  RunLoop,
+                  Threads,
+                  UserDefaults,
+                  Bundle,
+                  ImageAttachment,
+                  Alerts,
+                  Events,
+                  HelpManager,
+                  InterfaceLoader,
+                  Pasteboard,
+                  Printing,
+                  OVWindowController,
+                  Window,
+                  PLManager {
     Journal journal;
     bool has(std::string_view entry) const
     {
@@ -245,8 +178,8 @@ struct FakeHost : HostServices,
     }
 
     // The controls of the interface file.
-    FakeTextField instructionalTextField;
-    FakeTextView repairMessageTextView;
+    FakeTextField instructions;
+    FakeTextView messageText;
     std::map<std::string, FakeButton, std::less<>> buttons;
     FakeOutlinePeer outlinePeer;
     std::unique_ptr<OutlineView> outlineView;
@@ -297,7 +230,10 @@ struct FakeHost : HostServices,
 
     // OVDiskController
     OVDiskPointer diskWithIdentifier(std::string_view identifier) override;
-    OVDiskPointer diskWithKRDisk(const DiskReferencePointer& disk) override;
+    OVDiskPointer diskWithKRDisk(const DiskReferencePointer& disk) override
+    {
+        return disk ? diskWithIdentifier(disk->identifier) : nullptr;
+    }
     OVDiskPointer findOrCreateOVDisk(const DiskReferencePointer& disk) override
     {
         return diskWithKRDisk(disk);
@@ -313,7 +249,10 @@ struct FakeHost : HostServices,
 
     // OVLog
     bool keepsLevel(int) const override { return true; }
-    void ov_log(int level, int flags, std::string_view line) override;
+    void ov_log(int level, int /*flags*/, std::string_view line) override
+    {
+        developerLog.push_back(std::to_string(level) + " " + std::string(line));
+    }
     void log(std::string_view text) override { activity.emplace_back(text); }
     void logPriorityWithEOL(std::string_view text, int, bool) override
     {
@@ -332,13 +271,24 @@ struct FakeHost : HostServices,
     {
         registrations.push_back({observer, name, std::move(handler)});
     }
-    void removeObserver(const void* observer, Name name) override;
+    void removeObserver(const void* observer, Name name) override
+    {
+        std::erase_if(registrations, [&](const Registration& registration) {
+            return registration.observer == observer && registration.name == name;
+        });
+    }
     void post(const Notification& notification) override;
     std::vector<Registration> registrations;
 
     // RunLoop: tasks and timers wait for the test.
     bool isMainThread() const override { return true; }
-    void performOnMainThread(Task task, Wait wait) override;
+    void performOnMainThread(Task task, Wait wait) override
+    {
+        if (wait == Wait::UntilDone)
+            task();
+        else
+            tasks.push_back(std::move(task));
+    }
     void scheduleTimer(std::chrono::duration<double> delay, Task task) override;
     void runTasks();
     std::vector<Task> tasks;
@@ -352,8 +302,15 @@ struct FakeHost : HostServices,
     Date clock{std::chrono::seconds(1'000'000)};
 
     // UserDefaults
-    Value objectForKey(std::string_view key) const override;
-    void setObjectForKey(const Value& value, std::string_view key) override;
+    Value objectForKey(std::string_view key) const override
+    {
+        const auto found = defaults.find(key);
+        return found == defaults.end() ? Value() : found->second;
+    }
+    void setObjectForKey(const Value& value, std::string_view key) override
+    {
+        defaults[std::string(key)] = value;
+    }
     std::map<std::string, Value, std::less<>> defaults;
 
     // Bundle
@@ -366,15 +323,26 @@ struct FakeHost : HostServices,
 
     // ImageAttachment
     ErrorCode AttachImageWithURL(const std::filesystem::path& image, Dictionary& result) override;
-    OVDiskPointer TopLevelPLDiskForImageDict(const Dictionary& result) override;
+    OVDiskPointer TopLevelPLDiskForImageDict(const Dictionary& result) override
+    {
+        return images.at(std::string(result.string(Name("path"))));
+    }
     std::map<std::string, OVDiskPointer, std::less<>> images;  ///< by path; others fail
 
     // Alerts, Events, HelpManager
-    std::shared_ptr<Alert> makeAlert(const Alert::Text& text) override;
+    std::shared_ptr<Alert> makeAlert(const Alert::Text& text) override
+    {
+        sheet = std::make_shared<FakeAlert>();
+        sheet->text = text;
+        return sheet;
+    }
     void simpleModuleAlert(const std::string& title, const std::string& message,
                            std::int32_t error) override;
     std::uint64_t currentModifierFlags() const override { return modifiers; }
-    void openHelpAnchor(std::string_view anchor) override;
+    void openHelpAnchor(std::string_view anchor) override
+    {
+        journal.push_back("help " + std::string(anchor));
+    }
     std::shared_ptr<FakeAlert> sheet;
     std::uint64_t modifiers = 0;
 
@@ -383,14 +351,18 @@ struct FakeHost : HostServices,
     void disconnect(InterfaceOwner&) override { owner = nullptr; }
 
     // Pasteboard
-    void declareTypes(const std::vector<PasteboardType>& types, const void*) override;
+    void declareTypes(const std::vector<PasteboardType>& types, const void*) override
+    {
+        declared = types;
+        pasted.clear();
+    }
     void setData(std::string_view data, PasteboardType type) override { pasted[type] = data; }
     std::vector<PasteboardType> declared;
     std::map<PasteboardType, std::string> pasted;
 
     // Printing
     PrintInfo& sharedPrintInfo() override { return printInfo; }
-    void runPrintOperation(OutlineView&, const PrintInfo& info, bool showsPanel, Window*) override;
+    void runPrintOperation(OutlineView&, const PrintInfo&, bool, Window*) override {}
     PrintInfo printInfo;
 
     // OVWindowController and Window
@@ -409,13 +381,17 @@ struct FakeHost : HostServices,
         isLocked = false;
     }
     bool interfaceLock() const override { return isLocked; }
-    void activateGlobalProgressBar(bool isActive) override;
-    void activateGlobalProgressText(bool isActive) override;
-    void setGlobalProgressBarIndeterminate(bool isIndeterminate) override;
-    void startGlobalProgressBarAnimation(const void*) override { journal.emplace_back("animate"); }
-    void setGlobalProgressBarValue(double percent) override;
+    void activateGlobalProgressBar(bool) override {}
+    void activateGlobalProgressText(bool) override {}
+    void setGlobalProgressBarIndeterminate(bool isNow) override { isIndeterminate = isNow; }
+    void startGlobalProgressBarAnimation(const void*) override {}
+    void setGlobalProgressBarValue(double percent) override { progress = percent; }
     void setGlobalProgressText(std::string_view text) override { status = text; }
-    void notifyWindowOfCompletion(const Dictionary& completion) override;
+    void notifyWindowOfCompletion(const Dictionary& completion) override
+    {
+        journal.emplace_back("report");
+        report = completion;
+    }
     bool isMainWindow() const override { return isMain; }
     std::vector<OVDiskPointer> selection;
     bool isLocked = false;
@@ -427,11 +403,13 @@ struct FakeHost : HostServices,
 
     // PLManager
     void setDelegate(PLAsyncDelegate*) override {}
-    std::unique_ptr<PLRepairDisk> makeRepairDisk() override;
+    std::unique_ptr<PLRepairDisk> makeRepairDisk() override
+    {
+        return std::make_unique<FakeRepairDisk>(*this);
+    }
     std::map<std::string, ErrorCode, std::less<>> refusals;  ///< by disk identifier
     std::function<void()> whenBegun;                         ///< while a job is being begun
     bool canTreatPartitionMap = true;
-    bool toolAnswersYes = true;
 };
 
 }  // namespace fixwell::testing

@@ -105,7 +105,7 @@ TEST_F(OVFXWTest, RowsFollowTheShowDetailsSwitch)
          {Case{historyOf({-1, 0, 2, 1, 0, -2}), 3, 5, "the closing summary is hidden"},
           Case{historyOf({-1, -2, 1}), 2, 3, "an earlier summary is a row"},
           Case{historyOf({-2}), 0, 0, "nothing but a summary"},
-          Case{historyOf({}), 0, 0, "an empty history"}, Case{{}, 0, 0, "no history at all"}}) {
+          Case{{}, 0, 0, "no history at all"}}) {
         const auto disk = addDisk("d" + std::to_string(host.disks.size()));
         disk->history = c.history;
         select(disk);
@@ -136,7 +136,6 @@ TEST_F(OVFXWTest, RowsKeepUpWithAHistoryThatGrowsAndIsCleared)
     disk->history.append(record(0, {}, "again\n"));
     host.outlineView->reloadData();
     EXPECT_EQ(finalText(module->outlineViewChildOfItem(0, {})).characters(), "again\n");
-    EXPECT_EQ(module->outlineViewNumberOfChildrenOfItem(record(0)), 0U) << "one level only";
 }
 
 // The rows of a disk stand in the selection's order, also while a disk in front still grows.
@@ -158,10 +157,6 @@ TEST_F(OVFXWTest, RowsKeepUpWithSeveralHistories)
     host.outlineView->reloadData();
     EXPECT_EQ(host.outlinePeer.rows, 4U);
     EXPECT_EQ(verbosityOf(module->outlineViewChildOfItem(3, {})), 0) << "another list";
-    first->history.removeAll();
-    second->history.removeAll();
-    host.outlineView->reloadData();
-    EXPECT_EQ(host.outlinePeer.rows, 0U);
 }
 
 TEST_F(OVFXWTest, RecordsAreStyledByTypeAndLevel)
@@ -216,17 +211,13 @@ TEST_F(OVFXWTest, OnlyAFullSelectionCanBeDeleted)
             EXPECT_EQ(host.outlinePeer.baseKeys, c.deletes ? 0 : 1);
         }
     }
-    host.outlinePeer.rows = 2;
-    host.outlinePeer.selected = {0, 1};
-    view.keyDown({36, 0, nullptr});
-    EXPECT_EQ(host.outlinePeer.baseKeys, 1) << "any other key is the view's own";
     disk->history = historyOf({0});
     view.reloadData();
     host.outlinePeer.selected = {0};
+    view.keyDown({36, 0, nullptr});
+    EXPECT_FALSE(disk->history.isEmpty()) << "any other key is the view's own";
     view.delete_(nullptr);
     EXPECT_TRUE(disk->history.isEmpty());
-    host.outlinePeer.selected = {};
-    EXPECT_FALSE(view.validateMenuItem({"selectAll:"})) << "nothing there";
 }
 
 TEST_F(OVFXWTest, CopiesAndDragsCarryTheLogInFourTypes)
@@ -240,12 +231,6 @@ TEST_F(OVFXWTest, CopiesAndDragsCarryTheLogInFourTypes)
     EXPECT_EQ(host.declared, (std::vector{PlainString, TabularText, RTF, RTFD}));
     EXPECT_EQ(host.pasted[PlainString], "first {é}\nlast\n");
     EXPECT_EQ(host.pasted[TabularText], host.pasted[PlainString]);
-    EXPECT_NE(host.pasted[RTF].find("first \\{\\u233?\\}\\par"), std::string::npos);
-
-    host.outlinePeer.selected = {};
-    host.outlineView->copy(nullptr);
-    EXPECT_EQ(host.pasted[PlainString], "") << "an empty copy is still a copy";
-    EXPECT_EQ(host.pasted.size(), 4U);
 
     host.declared.clear();
     EXPECT_FALSE(module->outlineViewWriteItemsToPasteboard({}, host));
@@ -254,29 +239,16 @@ TEST_F(OVFXWTest, CopiesAndDragsCarryTheLogInFourTypes)
     EXPECT_TRUE(module->outlineViewWriteItemsToPasteboard(
         {module->outlineViewChildOfItem(2, {}), module->outlineViewChildOfItem(0, {})}, host));
     EXPECT_EQ(host.pasted[PlainString], "last\nfirst {é}\n") << "in the order given";
-    EXPECT_EQ(module->draggingSourceOperationMaskForLocal(true), DragOperation::Copy);
-    EXPECT_EQ(module->outlineViewValidateDrop({}, 0), DragOperation::None);
 }
 
-TEST_F(OVFXWTest, CellsShowOneLineCutInTheMiddle)
+TEST_F(OVFXWTest, CellsAreCutInTheMiddleAndUnknownRowsAreHarmless)
 {
     OVFXWBrowserCell cell;
-    EXPECT_EQ(cell.font(), Font::system(11));
-    EXPECT_FALSE(cell.hasBranchImage());
-    const Dictionary shown = record(0);
-    module->outlineViewWillDisplayCellForTableColumnItem(cell, shown);
-    EXPECT_TRUE(cell.isLeaf());
+    module->outlineViewWillDisplayCellForTableColumnItem(cell, record(0));
     EXPECT_EQ(cell.attributedStringValue().style().paragraph->lineBreak, LineBreak::TruncateMiddle);
-    EXPECT_EQ(finalText(shown).style().paragraph->lineBreak, LineBreak::TruncateMiddle)
-        << "copies carry it";
     module->outlineViewWillDisplayCellForTableColumnItem(cell, Dictionary::make());
     EXPECT_EQ(cell.attributedStringValue().characters(), " ");
-
-    EXPECT_EQ(host.outlineView->frameOfOutlineCellAtRow(0), Rect{});
-    EXPECT_EQ(host.outlineView->frameOfCellAtColumnRow(0, 1), (Rect{22, 17, 315, 17}));
-    EXPECT_EQ(host.outlineView->frameOfCellAtColumnRow(1, 1), (Rect{35, 17, 300, 17}));
-    auto& view = static_cast<OVFXWMessageOutlineView&>(*host.outlineView);
-    view.reloadRow(99);
+    static_cast<OVFXWMessageOutlineView&>(*host.outlineView).reloadRow(99);
     EXPECT_TRUE(host.outlinePeer.redrawn.empty()) << "no such row, nothing to redraw";
 }
 

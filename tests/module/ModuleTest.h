@@ -36,11 +36,41 @@ protected:
         return disk;
     }
 
+    std::shared_ptr<FakeDisk> addWholeDisk(const std::string& identifier)
+    {
+        auto disk = addDisk(identifier);
+        disk->type = OVDisk::typeWhole;
+        disk->whole = true;
+        return disk;
+    }
+    std::shared_ptr<FakeDisk> addStartupDisk()
+    {
+        auto disk = addDisk("root");
+        disk->boot = true;
+        disk->fileSystem.verifiesLive = true;
+        return disk;
+    }
+    std::shared_ptr<FakeDisk> addImage(const std::string& path)
+    {
+        auto disk = addDisk(path);
+        disk->type = OVDisk::typeDiskImage;
+        disk->imagePath = path;
+        disk->offlineImage = true;
+        return disk;
+    }
+
     template <class... Disks>
     void select(const Disks&... disks)
     {
         host.selection = {disks...};
         module->selectionDidChange({OVDiskChangedNotification, nullptr, {}});
+    }
+
+    template <class... Disks>
+    void verify(const Disks&... disks)
+    {
+        select(disks...);
+        module->verifyDisk(nullptr);
     }
 
     void finish(const std::shared_ptr<FakeDisk>& disk, ErrorCode error = kPLNoError)
