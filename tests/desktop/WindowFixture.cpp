@@ -84,6 +84,13 @@ void WindowFixture::openWith(SessionOptions options)
     session_->show();
 }
 
+void WindowFixture::openWithSystemDisks()
+{
+    SessionOptions wanted = options({});
+    wanted.scansSystemDisks = true;
+    openWith(std::move(wanted));
+}
+
 void WindowFixture::open(const std::vector<std::string>& images)
 {
     openWith(options(images));
@@ -110,6 +117,11 @@ bool WindowFixture::waitForJob()
 void WindowFixture::run(const char* name, const std::string& image)
 {
     select(image);
+    run(name);
+}
+
+void WindowFixture::run(const char* name)
+{
     button(name).press();
     ASSERT_TRUE(waitForJob());
 }
@@ -141,11 +153,6 @@ void WindowFixture::select(const std::string& image)
 std::string WindowFixture::cell(const std::string& image, DiskColumn column)
 {
     return fromQt(row(image).siblingAtColumn(static_cast<int>(column)).data().toString());
-}
-
-std::string WindowFixture::details(const std::string& image)
-{
-    return fromQt(row(image).data(DiskTreeModel::DetailsRole).toString());
 }
 
 QtButton& WindowFixture::button(const char* name)

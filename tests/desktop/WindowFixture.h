@@ -30,6 +30,7 @@ protected:
     SessionOptions options(const std::vector<std::string>& names);
     /// Opens the window without waiting for its disks.
     void openWith(SessionOptions options);
+    void openWithSystemDisks();
     /// Opens the window, and waits until the images are in the list.
     void open(const std::vector<std::string>& images);
     /// Makes an image, opens the window with it and selects it; its file name.
@@ -42,6 +43,7 @@ protected:
     void select(const std::string& image);
     /// Selects the image, and presses the button until the job is over.
     void run(const char* name, const std::string& image);
+    void run(const char* name);
     QtButton& button(const char* name);
     LogTable& log() { return session_->activeTab()->interface()->outlinePeer()->table(); }
     std::vector<std::string> logRows();
@@ -49,8 +51,6 @@ protected:
     /// What the disk list says about the image.
     std::string cell(const std::string& image, DiskColumn column);
     std::string verdict(const std::string& image) { return cell(image, DiskColumn::Verdict); }
-    /// The second line of its row.
-    std::string details(const std::string& image);
     QAction& command(const char* name);
     /// The sheet that is open; none when there is none.
     QMessageBox* sheet();

@@ -18,27 +18,19 @@ using WindowTest = WindowFixture;
 
 TEST_F(WindowTest, TheButtonsFindAndRepairWhatIsDamaged)
 {
-    struct Case {
-        std::string image;
-        std::string verdict;
-        std::string row;
-        bool alerts;
-    };
     const std::string sound = makeImage("sound");
     const std::string damaged = makeDamagedImage("damaged");
     open({sound, damaged});
-    for (const Case& c : {Case{sound, "sound", "appears to be OK", false},
-                          Case{damaged, "damaged", "needs to be repaired", true}}) {
-        select(c.image);
-        EXPECT_EQ(verdict(c.image), "") << "before it was checked";
+    for (const auto& [image, expected] :
+         {std::pair(sound, "sound"), std::pair(damaged, "damaged")}) {
+        select(image);
+        EXPECT_EQ(verdict(image), "") << "before it was checked";
         button("verifyDiskButton").press();
-        EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
         EXPECT_FALSE(button("repairDiskButton").isEnabled()) << "another job runs";
         ASSERT_TRUE(waitForJob());
-        EXPECT_EQ(verdict(c.image), c.verdict);
-        EXPECT_NE(cell(c.image, DiskColumn::LastCheck), "");
-        EXPECT_TRUE(logHolds(c.row)) << testing::PrintToString(logRows());
-        EXPECT_EQ(takeSheet().find("damaged") != std::string::npos, c.alerts);
+        EXPECT_EQ(verdict(image), expected);
+        EXPECT_NE(cell(image, DiskColumn::LastCheck), "");
+        EXPECT_EQ(takeSheet().empty(), image == sound) << "damage is said in a sheet as well";
     }
     run("repairDiskButton", damaged);
     EXPECT_EQ(verdict(damaged), "repaired");
@@ -56,10 +48,8 @@ TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
     log().setFocus();
     command("selectAll").trigger();
     command("copy").trigger();
-    const QMimeData& copied = *QApplication::clipboard()->mimeData();
-    EXPECT_NE(fromQt(copied.text()).find("“a <b>” appears to be OK"), std::string::npos);
-    EXPECT_NE(fromQt(copied.html()).find("“a &lt;b&gt;” appears to be OK"), std::string::npos)
-        << fromQt(copied.html());
+    const QString html = QApplication::clipboard()->mimeData()->html();
+    EXPECT_NE(fromQt(html).find("“a &lt;b&gt;” appears to be OK"), std::string::npos);
     command("delete").trigger();
     EXPECT_TRUE(logRows().empty());
 }
@@ -72,11 +62,8 @@ TEST_F(WindowTest, WhatWasClearedCanBeBroughtBack)
     QtButton& clear = button("clearHistoryButton");
     EXPECT_FALSE(clear.isEnabled()) << "never checked";
     window().disks().selectAll();
-    EXPECT_FALSE(clear.isEnabled());
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
+    run("verifyDiskButton");
     const auto rows = logRows();
-    EXPECT_TRUE(clear.isEnabled());
     clear.press();
     EXPECT_FALSE(clear.isEnabled());
     EXPECT_TRUE(logRows().empty());
@@ -84,7 +71,6 @@ TEST_F(WindowTest, WhatWasClearedCanBeBroughtBack)
         EXPECT_EQ(verdict(image), "") << "the list follows at once";
     command("undoClear").trigger();
     EXPECT_EQ(logRows(), rows);
-    EXPECT_TRUE(clear.isEnabled());
     command("undoClear").trigger();
     EXPECT_EQ(logRows(), rows) << "there is nothing more to bring back";
     close();
@@ -105,12 +91,10 @@ TEST_F(WindowTest, AJobCanBeStoppedAndTheLastVerdictStands)
     select(image);
     button("verifyDiskButton").press();
     ASSERT_TRUE(waitUntil([&] { return verdict(image) == "verifying…"; }));
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
+    run("verifyDiskButton");
     EXPECT_TRUE(logHolds("Stopped by user")) << testing::PrintToString(logRows());
     EXPECT_EQ(verdict(image), "sound");
-    EXPECT_NE(cell(image, DiskColumn::LastCheck).find("then stopped"), std::string::npos)
-        << cell(image, DiskColumn::LastCheck);
+    EXPECT_NE(cell(image, DiskColumn::LastCheck).find("then stopped"), std::string::npos);
 }
 
 TEST_F(WindowTest, ClosingDuringARepairAsks)
@@ -125,12 +109,10 @@ TEST_F(WindowTest, ClosingDuringARepairAsks)
     press(*sheet(), QStringLiteral("Keep Open"));
     EXPECT_TRUE(window().isVisible());
     EXPECT_EQ(button("repairDiskButton").title(), "Stop Repair") << "the job goes on";
-
     window().close();
     ASSERT_NE(sheet(), nullptr);
     press(*sheet(), QStringLiteral("Stop and Quit"));
     EXPECT_TRUE(waitUntil([&] { return wasClosed_; }));
-    EXPECT_FALSE(window().isVisible());
 }
 
 // As the system asks when it is shut down: no user is there to answer a question.
@@ -155,7 +137,6 @@ TEST_F(WindowTest, AnImageWithPartitionsShowsItsVolumes)
     ASSERT_EQ(disks.rowCount(), 1);
     ASSERT_EQ(disks.rowCount(disks.index(0, 0)), 2);
     const std::string volume = image + "#1";
-    EXPECT_EQ(cell(volume, DiskColumn::Format), "ext4");
     run("verifyDiskButton", volume);
     EXPECT_EQ(verdict(volume), "sound");
     EXPECT_EQ(disks.rowCount(disks.index(0, 0)), 2) << "they stay after the job";
@@ -172,17 +153,12 @@ TEST_F(WindowTest, TheMapOfAnImageIsVerifiedAndRepaired)
     std::fstream(image) << std::string(1024, '\0');  // the boot record and the primary header
     open({image});
     select(image);
-    EXPECT_NE(details(image).find("its partition map is damaged"), std::string::npos);
     command("verifyMap").trigger();
-    EXPECT_EQ(button("verifyDiskButton").title(), "Stop Verify");
     ASSERT_TRUE(waitForJob());
     EXPECT_TRUE(waitUntil([&] { return verdict(image) == "damaged"; }));
     takeSheet();
     command("repairMap").trigger();
     ASSERT_TRUE(waitForJob());
-    EXPECT_TRUE(waitUntil([&] {
-        return details(image).find("partition map is damaged") == std::string::npos;
-    })) << testing::PrintToString(logRows());
     EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}), 0);
 }
 
@@ -193,23 +169,17 @@ TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)
     useEndlessTool();
     open({image, locked});
     window().disks().clearSelection();
-    const auto toolTip = [this](const char* name) {
-        return fromQt(button(name).widget().toolTip());
+    const auto says = [this](const char* name, const std::string& reason) {
+        return waitUntil([&] {
+            return fromQt(button(name).widget().toolTip()).find(reason) != std::string::npos;
+        });
     };
-    const auto says = [&](const char* name, const std::string& reason) {
-        return waitUntil([&] { return toolTip(name).find(reason) != std::string::npos; });
-    };
-    EXPECT_TRUE(says("verifyDiskButton", "Select a disk first.")) << toolTip("verifyDiskButton");
-    select(image);
-    EXPECT_TRUE(says("clearHistoryButton", "There is no history to clear."));
+    EXPECT_TRUE(says("verifyDiskButton", "Select a disk first."));
     window().disks().selectAll();
-    EXPECT_TRUE(says("verifyPermissionsButton", "“locked.img”: "))
-        << toolTip("verifyPermissionsButton");
+    EXPECT_TRUE(says("verifyPermissionsButton", "“locked.img”: "));
     button("verifyDiskButton").press();
     EXPECT_TRUE(says("repairDiskButton", "Not available while a job runs."));
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitForJob());
-    EXPECT_EQ(toolTip("repairDiskButton").find("while a job runs"), std::string::npos);
+    run("verifyDiskButton");
 }
 
 TEST_F(WindowTest, TheEmptyLogSaysWhyNothingCanBeDone)
@@ -232,11 +202,7 @@ TEST_F(WindowTest, TheEmptyLogSaysWhyNothingCanBeDone)
         session().host().sharedDiskController().synchronize({disk});
         select(disk.facts.identifier);
         EXPECT_NE(fromQt(note->text()).find(c.said), std::string::npos) << fromQt(note->text());
-        const QtButton& verify = button("verifyDiskButton");
-        EXPECT_NE(verify.isEnabled(), c.isBootVolume);
-        EXPECT_TRUE(!c.isBootVolume || waitUntil([&] {
-            return fromQt(verify.widget().toolTip()).find(c.said) != std::string::npos;
-        })) << "also where a history stands in the log's place";
+        EXPECT_NE(button("verifyDiskButton").isEnabled(), c.isBootVolume);
     }
 }
 

@@ -22,13 +22,10 @@ class FakeNotifications : public QObject {
 
 public:
     struct Shown {
-        QString program;
         uint replaced;
-        QString icon;
         QString title;
         QString body;
         QStringList actions;
-        QVariantMap hints;
     };
 
     explicit FakeNotifications(QDBusConnection bus)
@@ -41,11 +38,11 @@ public:
     std::vector<Shown> shown;
 
 public slots:
-    uint Notify(const QString& program, uint replaced, const QString& icon, const QString& title,
-                const QString& body, const QStringList& actions, const QVariantMap& hints,
-                int /*milliseconds*/)
+    uint Notify(const QString& /*program*/, uint replaced, const QString& /*icon*/,
+                const QString& title, const QString& body, const QStringList& actions,
+                const QVariantMap& /*hints*/, int /*milliseconds*/)
     {
-        shown.push_back({program, replaced, icon, title, body, actions, hints});
+        shown.push_back({replaced, title, body, actions});
         return replaced != 0 ? replaced : 7;
     }
 

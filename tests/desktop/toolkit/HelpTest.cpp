@@ -13,8 +13,6 @@
 
 #include <gtest/gtest.h>
 
-#include <clocale>
-
 namespace orvane::desktop {
 namespace {
 
@@ -107,8 +105,6 @@ TEST(HelpBook, EveryLanguageHasTheSamePagesAndEveryLinkLeadsToOne)
 
 TEST(HelpBook, ExplainsEveryReasonInTheWordsOfTheButtons)
 {
-    std::setlocale(LC_ALL, "C.UTF-8");
-    std::setlocale(LC_NUMERIC, "C");
     const ModuleBundle module(MODULE_BUNDLE, "FXW");
     for (const char* const language : languages) {
         setLanguage(language);
@@ -172,13 +168,10 @@ TEST_F(HelpTest, FindsWordsOnEveryPageUntilEscapeClosesIt)
     find("no such words %@");
     EXPECT_EQ(page(), QStringLiteral("index.html"));
 
-    help.window()->resize(500, 400);
     ASSERT_TRUE(QTest::qWaitForWindowActive(help.window()));
     QTest::keyClick(help.window(), Qt::Key_Escape);
     QCoreApplication::sendPostedEvents(nullptr, QEvent::DeferredDelete);
-    ASSERT_EQ(help.window(), nullptr);
-    help.openHelpAnchor("");
-    EXPECT_EQ(help.window()->size(), QSize(500, 400)) << "the size is kept";
+    EXPECT_EQ(help.window(), nullptr);
 }
 
 }  // namespace

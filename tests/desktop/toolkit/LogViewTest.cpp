@@ -3,6 +3,7 @@
 
 #include <QClipboard>
 #include <QKeyEvent>
+#include <QLabel>
 #include <QMimeData>
 #include <QScrollBar>
 
@@ -19,6 +20,8 @@ void press(QWidget& widget, int key, Qt::KeyboardModifiers modifiers = Qt::NoMod
 
 TEST_F(LogView, RowsAreCountedAtOnceAndShownTogetherAfterTheyAreSaved)
 {
+    const auto* const note = table().viewport()->findChild<QLabel*>();
+    EXPECT_TRUE(note->isVisible()) << "an empty log says what to do";
     addRow("Verifying volume “USB”", -1);
     addRow("detail", 2);
     const int before = host.savesBeforeRows;
@@ -29,34 +32,10 @@ TEST_F(LogView, RowsAreCountedAtOnceAndShownTogetherAfterTheyAreSaved)
     settle();
     EXPECT_EQ(host.savesBeforeRows, before + 1);
     EXPECT_EQ(rowText(0), QStringLiteral("Verifying volume “USB”"));
+    EXPECT_FALSE(note->isVisible());
     interface->button("showDetailsButton")->press();
     settle();
     EXPECT_EQ(rowText(1), QStringLiteral("detail"));
-}
-
-TEST_F(LogView, ALogOpensAtItsEndAndStaysWhereItIsWhenOlderRowsComeInFront)
-{
-    for (int i = 100; i < 300; ++i)
-        addRow("row " + std::to_string(i));
-    selectDisk();
-    EXPECT_EQ(view->verticalScroller()->value(), 1.0);
-    table().selectRow(50);
-    table().verticalScrollBar()->setValue(table().verticalScrollBar()->maximum() / 2);
-    const auto rowInSight = [&] {
-        return rowText(table().rowAt(1));
-    };
-    const QString before = rowInSight();
-
-    const contract::Array newest = disk->history;
-    disk->history = contract::Array::make();
-    for (int i = 0; i < 100; ++i)
-        addRow("row " + std::to_string(i));
-    disk->history.append(newest);
-    reload();
-    EXPECT_EQ(rowText(0), QStringLiteral("row 0"));
-    EXPECT_EQ(rowInSight(), before);
-    EXPECT_EQ(view->selectedRowIndexes(), std::vector<std::size_t>{150})
-        << "the same row as before";
 }
 
 // Records go on coming between the moment at which the module asks for the last row and the one at
@@ -65,7 +44,8 @@ TEST_F(LogView, WhoReadsAtTheEndIsShownEveryNewEnd)
 {
     for (int i = 0; i < 200; ++i)
         addRow("row " + std::to_string(i));
-    reload();
+    selectDisk();
+    EXPECT_EQ(view->verticalScroller()->value(), 1.0) << "a log opens at its end";
     for (const int burst : {1, 40, 1000}) {
         view->reloadData();
         view->scrollRowToVisible(view->numberOfRows() - 1);
@@ -74,9 +54,6 @@ TEST_F(LogView, WhoReadsAtTheEndIsShownEveryNewEnd)
         settle();
         EXPECT_EQ(view->verticalScroller()->value(), 1.0) << burst;
     }
-    interface->widget().resize(640, 480);
-    settle();
-    EXPECT_EQ(view->verticalScroller()->value(), 1.0) << "less room";
 }
 
 TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
@@ -99,32 +76,28 @@ TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
             ++row;
         return row;
     };
-    const auto toggleDetails = [this] {
-        interface->button("showDetailsButton")->press();
-    };
-    const auto growOne = [&] {
-        addRow("more");
-    };
     const auto growOther = [&] {
         other->history.append(disk->history.back());
     };
-    const auto growBoth = [&] {
-        growOne();
-        growOther();
-    };
-    const std::vector<std::function<void()>> changes{growOne, growOther, growBoth, toggleDetails,
-                                                     toggleDetails};
+    const std::vector<std::function<void()>> changes{
+        [this] { addRow("more"); }, growOther,
+        [&] {
+            addRow("more");
+            growOther();
+        },
+        [this] {
+            interface->button("showDetailsButton")->press();
+        }};
     for (const char* const name : {"one 100", "two 100"}) {
         const QString line = QString::fromLatin1(name);
         table().selectRow(rowOf(line));
         table().scrollTo(table().currentIndex(), QAbstractItemView::PositionAtCenter);
         const int top = table().rowViewportPosition(rowOf(line));
-        for (std::size_t i = 0; i < changes.size(); ++i) {
+        for (const std::size_t i : {0U, 1U, 2U, 3U, 3U}) {  // details off and on again
             changes[i]();
             reload();
-            EXPECT_EQ(view->selectedRowIndexes(),
-                      std::vector{static_cast<std::size_t>(rowOf(line))})
-                << name << i;
+            const auto row = static_cast<std::size_t>(rowOf(line));
+            EXPECT_EQ(view->selectedRowIndexes(), std::vector{row}) << name << i;
             EXPECT_EQ(table().rowViewportPosition(rowOf(line)), top) << name << i;
         }
     }
@@ -141,8 +114,6 @@ TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)
     view->scrollRowToVisible(999'999);
     settle();
     EXPECT_EQ(view->verticalScroller()->value(), 1.0);
-    EXPECT_TRUE(table().viewport()->rect().contains(
-        table().visualRect(table().model()->index(999'999, 0)).center()));
     for (int i = 0; i < 50; ++i) {
         addRow("more");
         reload();
@@ -170,7 +141,7 @@ TEST_F(LogView, DeletingKeysClearTheHistoryOnlyWhenEverythingIsSelected)
 TEST_F(LogView, CopiedRowsGoToTheClipboardInEveryFormat)
 {
     addRow("<one> \x1b]0;title\x07{\\rtf \xE2\x80\xAE", -1);
-    addRow("two", 0, {{}, contract::Color{1, 0, 0, 1}, {}});
+    addRow("two");
     reload();
     host.qtPasteboard.setHTMLSource([this] { return interface->outlinePeer()->selectionHTML(); });
     view->selectAll(nullptr);

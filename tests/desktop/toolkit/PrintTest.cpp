@@ -11,8 +11,6 @@
 #include <QTemporaryDir>
 #include <QTest>
 
-#include <functional>
-
 namespace orvane::desktop {
 namespace {
 
@@ -94,15 +92,6 @@ protected:
     QTemporaryDir directory;
 };
 
-int count(const QImage& image, const std::function<bool(const QColor&, int x)>& matches)
-{
-    int pixels = 0;
-    for (int y = 0; y < image.height(); ++y)
-        for (int x = 0; x < image.width(); ++x)
-            pixels += matches(image.pixelColor(x, y), x) ? 1 : 0;
-    return pixels;
-}
-
 TEST_F(PrintTest, EveryWordIsOnThePaperOnceAndColoursAreKept)
 {
     constexpr int rowCount = 500;
@@ -125,18 +114,15 @@ TEST_F(PrintTest, EveryWordIsOnThePaperOnceAndColoursAreKept)
         EXPECT_TRUE(text.contains(QLatin1String(wanted))) << wanted;
 
     const QImage page = pageOf(pdf);
-    ASSERT_FALSE(page.isNull());
-    const int edge = page.width() - 8;  // no printer leaves less
-    EXPECT_EQ(count(page, [edge](const QColor& color,
-                                 int x) { return x > edge && color.lightness() < 250; }),
-              0)
-        << "something is cut at the right edge";
-    EXPECT_GT(count(page,
-                    [](const QColor& color, int) {
-                        return color.red() > 150 && color.green() < 100 && color.blue() < 100;
-                    }),
-              100)
-        << "the problem is red";
+    int reds = 0;
+    for (int y = 0; y < page.height(); ++y)
+        for (int x = 0; x < page.width(); ++x) {
+            const QColor color = page.pixelColor(x, y);
+            reds += color.red() > 150 && color.green() < 100 && color.blue() < 100 ? 1 : 0;
+            // No printer leaves a smaller edge than 8 points.
+            ASSERT_TRUE(x <= page.width() - 8 || color.lightness() >= 250) << "cut at the edge";
+        }
+    EXPECT_GT(reds, 100) << "the problem is red";
 }
 
 TEST_F(PrintTest, WhatCannotBeWrittenIsAFailure)
