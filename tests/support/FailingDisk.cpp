@@ -97,11 +97,14 @@ void FailingDisk::answer(const char* request, std::size_t bytes)
     const auto head = messageIn<fuse_in_header>({request, bytes});
     const std::string_view body(request + sizeof head, bytes - sizeof head);
     switch (head.opcode) {
-        case FUSE_INIT:
-            reply(head.unique, 0,
-                  bytesOf(fuse_init_out{
-                      .major = FUSE_KERNEL_VERSION, .minor = 31, .max_write = 131072}));
+        case FUSE_INIT: {
+            fuse_init_out out = {};
+            out.major = FUSE_KERNEL_VERSION;
+            out.minor = 31;
+            out.max_write = 131072;
+            reply(head.unique, 0, bytesOf(out));
             break;
+        }
         case FUSE_LOOKUP: look(head.unique, head.nodeid, body.substr(0, body.find('\0'))); break;
         case FUSE_GETATTR:
         case FUSE_SETATTR: {
