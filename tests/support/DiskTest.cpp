@@ -185,6 +185,7 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     EXPECT_TRUE(root.isBootVolume && !root.containsUserHome && root.isShown);
     EXPECT_EQ(disks[0].children[1].facts.number, 2) << "2 before 10";
     EXPECT_EQ(disks[0].children[2].facts.type, diskType::container);
+    EXPECT_EQ(disks[1].facts.type, diskType::bareVolume);
     EXPECT_EQ(disks[1].facts.sequence, 7U);
     EXPECT_EQ(disks[2].facts.type, diskType::bareVolume) << "it is mounted, so it is a volume";
     EXPECT_TRUE(disks[2].facts.containsUserHome);

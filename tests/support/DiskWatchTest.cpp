@@ -70,51 +70,37 @@ TEST(DiskEvents, ABurstIsOneChange)
     EXPECT_EQ(told, 9) << "events without end cannot keep the news back";
 }
 
-/// The machine's own disks, as a front end follows them.
-class DiskWatchTest : public testing::Test {
-protected:
-    void SetUp() override
-    {
-        if (const char* const obstacle = test::LoopDevice::obstacle())
-            GTEST_SKIP() << obstacle;
-        ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label_, image_, "8M"}),
-                  0);
-        ASSERT_TRUE(watch_.start());
-    }
-
-    std::shared_ptr<Disk> found()
-    {
-        return disks_.find([this](const Disk& disk) { return disk.facts().label == label_; });
-    }
-    bool waitUntil(const std::function<bool()>& isDone)
-    {
-        bool isLate = false;
-        loop_.scheduleTimer(20s, [&] { isLate = true; });
-        loop_.runUntil([&] { return isLate || isDone(); });
-        return isDone();
-    }
-
-    const TemporaryDirectory directory_;
-    const std::string image_ = directory_ / "watched.img";
-    /// Another test of these may run at the same time.
-    const std::string label_ = "watched" + std::to_string(::getpid());
-    MainLoop loop_;
-    Notifications center_;
-    DiskController disks_{center_, {}};
-    DiskWatch watch_{loop_, [this] {
-                         disks_.synchronize(readSystemDisks(DiskSources()));
-                     }};
-};
-
-TEST_F(DiskWatchTest, ARealDeviceComesIsMountedUnmountedAndGoes)
+// The machine's own disks, as a front end follows them.
+TEST(DiskWatch, ARealDeviceComesIsMountedUnmountedAndGoes)
 {
-    LoopDevice device(image_);
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const TemporaryDirectory directory;
+    const std::string image = directory / "watched.img";
+    // Another process may run this test at the same time.
+    const std::string label = "watched" + std::to_string(::getpid());
+    ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label, image, "8M"}), 0);
+    MainLoop loop;
+    Notifications center;
+    DiskController disks(center, {});
+    DiskWatch watch(loop, [&] { disks.synchronize(readSystemDisks(DiskSources())); });
+    ASSERT_TRUE(watch.start());
+    const auto found = [&] {
+        return disks.find([&](const Disk& disk) { return disk.facts().label == label; });
+    };
+    const auto waitUntil = [&loop](const std::function<bool()>& isDone) {
+        bool isLate = false;
+        loop.scheduleTimer(20s, [&] { isLate = true; });
+        loop.runUntil([&] { return isLate || isDone(); });
+        return isDone();
+    };
+    LoopDevice device(image);
     if (device.name().empty())
         GTEST_SKIP() << "no loop device can be set up here";
     ASSERT_TRUE(waitUntil([&] { return found() != nullptr; }));
     const auto disk = found();
     EXPECT_EQ(disk->diskIdentifier(), device.name());
-    const std::string mountPoint = directory_ / "mnt";
+    const std::string mountPoint = directory / "mnt";
     std::filesystem::create_directory(mountPoint);
     if (::mount(device.name().c_str(), mountPoint.c_str(), "ext4", 0, nullptr) == 0) {
         EXPECT_TRUE(waitUntil([&] { return disk->mountPoint() == mountPoint; }));

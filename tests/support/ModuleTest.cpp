@@ -25,18 +25,6 @@ fs::path makeBundle(const TemporaryDirectory& directory, const char* library)
     return bundle;
 }
 
-TEST(ModuleLoader, LoadsAModuleOfTheSameContract)
-{
-    const TemporaryDirectory directory;
-    makeBundle(directory, TEST_MODULE_RIGHT);
-    const auto bundles = findModuleBundles({directory / "missing", directory.path});
-    ASSERT_EQ(bundles.size(), 1U);
-    const auto loaded = loadModule(bundles.front());
-    ASSERT_TRUE(loaded) << loaded.error().message;
-    EXPECT_EQ(loaded->name, "Test");
-    EXPECT_NE(loaded->entry->make, nullptr);
-}
-
 TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
 {
     struct Case {

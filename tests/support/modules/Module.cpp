@@ -3,23 +3,8 @@
 
 namespace {
 
-constexpr std::uint32_t version = contract::moduleContractVersion;
-#ifdef WRONG_VERSION
-// A host that called anything of a module of another version would crash here.
-constexpr contract::ModuleEntry entry{version + 41, nullptr, nullptr};
-#else
-bool shouldRun(contract::HostServices&, contract::Bundle&)
-{
-    return true;
-}
-
-contract::OVModule* make(contract::HostServices&, contract::ModuleSite&)
-{
-    return nullptr;
-}
-
-constexpr contract::ModuleEntry entry{version, shouldRun, make};
-#endif
+// A host that called anything of a module that it refuses would crash here.
+constexpr contract::ModuleEntry entry{contract::moduleContractVersion + NEWER_BY, nullptr, nullptr};
 
 }  // namespace
 
