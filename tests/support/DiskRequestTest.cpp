@@ -62,9 +62,6 @@ TEST(DiskRequest, WhatIsPossibleFollowsFromTheDisk)
           Case{ejectable("/dev/sdb", {free, mounted}),
                {Kind::IsWhole, Kind::IsWhole, possible, Kind::IsNoLoop},
                "a stick"},
-          Case{ejectable("/dev/sda", {free, root}),
-               {Kind::IsWhole, Kind::IsWhole, Kind::HoldsSystem, Kind::IsNoLoop},
-               "a stick that the system runs from"},
           Case{ejectable("/dev/loop7", {free, mounted}),
                {Kind::IsWhole, Kind::IsWhole, possible, possible},
                "an attached image"},
@@ -138,8 +135,6 @@ TEST(Refusal, EveryOneThatIsNotSilentIsSaid)
                     !failureText(request, refusal, Translator()).ends_with(": "))
             << "no reason for " << kind;
     }
-    for (const Kind kind : {Kind::Busy, Kind::NotAllowed, Kind::NoAnswer, Kind::Lingers})
-        EXPECT_FALSE(isSilent({kind, {}}));
     EXPECT_EQ(failureText(request, {Kind::Busy, "sh (7)"}, Translator()),
               "cannot unmount “/d”: it is in use by sh (7)");
 }

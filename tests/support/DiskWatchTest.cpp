@@ -13,7 +13,6 @@
 #include <unistd.h>
 
 #include <chrono>
-#include <thread>
 
 namespace orvane {
 namespace {
@@ -44,10 +43,10 @@ TEST(DiskEvents, OnlyBlockDevicesMatter)
 
 TEST(DiskEvents, MountsWithoutADeviceDoNotMatter)
 {
-    const auto kept = deviceMounts(
-        pellar::parseMounts("22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
-                       "32 22 0:40 / /home rw - btrfs /dev/sdb1 rw\n"
-                       "33 22 0:50 / /c/1 rw - overlay overlay rw\n"));
+    const auto kept = deviceMounts(pellar::parseMounts(
+        "22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
+        "32 22 0:40 / /home rw - btrfs /dev/sdb1 rw\n"
+        "33 22 0:50 / /c/1 rw - overlay overlay rw\n"));
     ASSERT_EQ(kept.size(), 2U);
     EXPECT_EQ(kept[1].filesystem, "btrfs") << "it has a number of its own, but a device";
 }
@@ -56,14 +55,12 @@ TEST(DiskEvents, ABurstIsOneChange)
 {
     const EventBurst::Clock::time_point start{};
     EventBurst burst;
-    EXPECT_FALSE(burst.timeLeft(start));
     EXPECT_FALSE(burst.takeDue(start)) << "nothing has happened";
     burst.note(start);
     burst.note(start + 150ms);
     EXPECT_FALSE(burst.takeDue(start + 210ms)) << "not quiet yet";
     EXPECT_EQ(burst.timeLeft(start + 210ms), 140ms);
     EXPECT_TRUE(burst.takeDue(start + 350ms));
-    EXPECT_FALSE(burst.takeDue(start + 999ms)) << "told once";
 
     int told = 0;
     for (auto now = start; now < start + 10s; now += 100ms) {
@@ -73,52 +70,37 @@ TEST(DiskEvents, ABurstIsOneChange)
     EXPECT_EQ(told, 9) << "events without end cannot keep the news back";
 }
 
-/// The machine's own disks, as a front end follows them.
-class DiskWatchTest : public testing::Test {
-protected:
-    void SetUp() override
-    {
-        if (const char* const obstacle = test::LoopDevice::obstacle())
-            GTEST_SKIP() << obstacle;
-        ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label_, image_, "8M"}),
-                  0);
-        ASSERT_TRUE(watch_.start());
-    }
-
-    void read() { disks_.synchronize(readSystemDisks(DiskSources())); }
-    std::shared_ptr<Disk> found()
-    {
-        return disks_.find([this](const Disk& disk) { return disk.facts().label == label_; });
-    }
-    bool waitUntil(const std::function<bool()>& isDone)
-    {
-        bool isLate = false;
-        loop_.scheduleTimer(20s, [&] { isLate = true; });
-        loop_.runUntil([&] { return isLate || isDone(); });
-        return isDone();
-    }
-
-    const TemporaryDirectory directory_;
-    const std::string image_ = directory_ / "watched.img";
-    /// Another test of these may run at the same time.
-    const std::string label_ = "watched" + std::to_string(::getpid());
-    MainLoop loop_;
-    Notifications center_;
-    DiskController disks_{center_, {}};
-    DiskWatch watch_{loop_, [this] {
-                         read();
-                     }};
-};
-
-TEST_F(DiskWatchTest, ARealDeviceComesIsMountedUnmountedAndGoes)
+// The machine's own disks, as a front end follows them.
+TEST(DiskWatch, ARealDeviceComesIsMountedUnmountedAndGoes)
 {
-    LoopDevice device(image_);
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const TemporaryDirectory directory;
+    const std::string image = directory / "watched.img";
+    // Another process may run this test at the same time.
+    const std::string label = "watched" + std::to_string(::getpid());
+    ASSERT_EQ(test::runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label, image, "8M"}), 0);
+    MainLoop loop;
+    Notifications center;
+    DiskController disks(center, {});
+    DiskWatch watch(loop, [&] { disks.synchronize(readSystemDisks(DiskSources())); });
+    ASSERT_TRUE(watch.start());
+    const auto found = [&] {
+        return disks.find([&](const Disk& disk) { return disk.facts().label == label; });
+    };
+    const auto waitUntil = [&loop](const std::function<bool()>& isDone) {
+        bool isLate = false;
+        loop.scheduleTimer(20s, [&] { isLate = true; });
+        loop.runUntil([&] { return isLate || isDone(); });
+        return isDone();
+    };
+    LoopDevice device(image);
     if (device.name().empty())
         GTEST_SKIP() << "no loop device can be set up here";
     ASSERT_TRUE(waitUntil([&] { return found() != nullptr; }));
     const auto disk = found();
     EXPECT_EQ(disk->diskIdentifier(), device.name());
-    const std::string mountPoint = directory_ / "mnt";
+    const std::string mountPoint = directory / "mnt";
     std::filesystem::create_directory(mountPoint);
     if (::mount(device.name().c_str(), mountPoint.c_str(), "ext4", 0, nullptr) == 0) {
         EXPECT_TRUE(waitUntil([&] { return disk->mountPoint() == mountPoint; }));
@@ -128,29 +110,6 @@ TEST_F(DiskWatchTest, ARealDeviceComesIsMountedUnmountedAndGoes)
     device.detach();
     EXPECT_TRUE(waitUntil([&] { return found() == nullptr; }));
     EXPECT_TRUE(disk->hasGone());
-}
-
-TEST_F(DiskWatchTest, ADeviceThatIsGivenAnotherImageIsAnotherDisk)
-{
-    LoopDevice device(image_);
-    if (device.name().empty())
-        GTEST_SKIP() << "no loop device can be set up here";
-    read();
-    const auto before = found();
-    ASSERT_NE(before, nullptr);
-    if (before->facts().sequence == 0)
-        GTEST_SKIP() << "this kernel does not number its disks";
-    device.detach();
-    // Whoever looks at new disks has it open for a moment.
-    bool isAttached = device.attach(image_);
-    for (int tries = 0; !isAttached && tries < 500; ++tries) {
-        std::this_thread::sleep_for(10ms);
-        isAttached = device.attach(image_);
-    }
-    ASSERT_TRUE(isAttached);
-    read();
-    ASSERT_NE(found(), nullptr);
-    EXPECT_NE(found(), before) << "though all that can be read of it is the same";
 }
 
 }  // namespace

@@ -113,8 +113,7 @@ void FailingDisk::answer(const char* request, std::size_t bytes)
             reply(head.unique, 0, bytesOf(out));
             break;
         }
-        case FUSE_OPEN:
-        case FUSE_OPENDIR: reply(head.unique, 0, bytesOf(fuse_open_out{})); break;
+        case FUSE_OPEN: reply(head.unique, 0, bytesOf(fuse_open_out{})); break;
         case FUSE_READ: {
             const auto in = messageIn<fuse_read_in>(body);
             read(head.unique, in.offset, in.size);
@@ -126,14 +125,9 @@ void FailingDisk::answer(const char* request, std::size_t bytes)
             break;
         }
         case FUSE_STATFS: reply(head.unique, 0, bytesOf(fuse_statfs_out{})); break;
-        case FUSE_FSYNC:
-        case FUSE_FLUSH:
-        case FUSE_RELEASE:
-        case FUSE_RELEASEDIR:
-        case FUSE_ACCESS: reply(head.unique, 0); break;
         case FUSE_FORGET:
-        case FUSE_BATCH_FORGET: break;  // want no answer
-        default: reply(head.unique, ENOSYS);
+        case FUSE_BATCH_FORGET: break;        // want no answer
+        default: reply(head.unique, ENOSYS);  // with which the kernel helps itself
     }
 }
 
@@ -165,17 +159,13 @@ void FailingDisk::write(std::uint64_t id, std::uint64_t start, std::string_view 
         ::pwrite(backing_.get(), bytes.data(), bytes.size(), static_cast<off_t>(start));
     if (count < 0)
         return reply(id, errno);
-    fuse_write_out out = {};
-    out.size = static_cast<std::uint32_t>(count);
-    reply(id, 0, bytesOf(out));
+    reply(id, 0, bytesOf(fuse_write_out{static_cast<std::uint32_t>(count), 0}));
 }
 
 void FailingDisk::reply(std::uint64_t id, int error, std::string_view bytes)
 {
-    fuse_out_header head = {};
+    fuse_out_header head{0, -error, id};
     head.len = static_cast<std::uint32_t>(sizeof head + bytes.size());
-    head.error = -error;
-    head.unique = id;
     std::string message(bytesOf(head));
     message += bytes;
     static_cast<void>(!::write(fuse_.get(), message.data(), message.size()));

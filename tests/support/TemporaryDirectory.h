@@ -3,6 +3,7 @@
 
 #include <stdlib.h>
 
+#include <cstdint>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -46,6 +47,15 @@ inline void write(const std::filesystem::path& file, std::string_view contents)
 {
     std::filesystem::create_directories(file.parent_path());
     std::ofstream(file, std::ios::binary) << contents;
+}
+
+/// Replaces bytes of a file.
+inline void patch(const std::filesystem::path& file, std::uint64_t offset, std::string_view bytes)
+{
+    std::fstream opened(file, std::ios::binary | std::ios::in | std::ios::out);
+    opened.seekp(static_cast<std::streamoff>(offset));
+    if (!opened.write(bytes.data(), static_cast<std::streamsize>(bytes.size())))
+        throw std::runtime_error("cannot prepare the test: " + file.string());
 }
 
 }  // namespace orvane::test

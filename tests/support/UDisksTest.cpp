@@ -26,23 +26,13 @@ using test::LoopDevice;
 using test::TemporaryDirectory;
 using namespace std::chrono_literals;
 
-/// A variable of the environment, put back at the end.
-class Setting {
-public:
-    Setting(const char* name, const std::string& value) : name_(name)
+/// The bus on which UDisks2 is looked for, until this object ends.
+struct SystemBus {
+    explicit SystemBus(const std::string& address)
     {
-        const char* const old = std::getenv(name);
-        if (old != nullptr)
-            old_ = old;
-        ::setenv(name, value.c_str(), 1);
+        ::setenv("DBUS_SYSTEM_BUS_ADDRESS", address.c_str(), 1);
     }
-    Setting(const Setting&) = delete;
-    Setting& operator=(const Setting&) = delete;
-    ~Setting() { old_ ? ::setenv(name_, old_->c_str(), 1) : ::unsetenv(name_); }
-
-private:
-    const char* name_;
-    std::optional<std::string> old_;
+    ~SystemBus() { ::unsetenv("DBUS_SYSTEM_BUS_ADDRESS"); }
 };
 
 DiskRequest request(DiskAction action, DiskStep::Kind kind, const std::string& node)
@@ -78,14 +68,10 @@ protected:
             const std::filesystem::path node = *answer;
             std::ifstream isReadOnly("/sys/block" / node.filename() / "ro");
             EXPECT_EQ(isReadOnly.get(), access == Access::ReadOnly ? '1' : '0');
-            const auto again = attachImage(image, Access::ReadOnly);
-            ASSERT_FALSE(again);
-            EXPECT_EQ(again.error(), (Refusal{Kind::Attached, node}));
-            const auto job = pellar::DiskClaim::take(disk, Access::ReadOnly, {});
-            EXPECT_FALSE(job) << "a job on the file, too";
-            const auto request =
-                orvane::request(DiskAction::Detach, DiskStep::Kind::DetachLoop, node);
-            EXPECT_TRUE(carryOut(request));
+            EXPECT_EQ(attachImage(image, Access::ReadOnly).error(),
+                      (Refusal{Kind::Attached, node}));
+            EXPECT_FALSE(pellar::DiskClaim::take(disk, Access::ReadOnly, {})) << "a job, too";
+            EXPECT_TRUE(carryOut(request(DiskAction::Detach, DiskStep::Kind::DetachLoop, node)));
         }
         EXPECT_TRUE(pellar::DiskClaim::take(disk, Access::ReadWrite, {})) << "no lock is left";
     }
@@ -104,7 +90,7 @@ TEST_F(DeviceTest, AnImageIsAttachedByUDisksUntilItIsDetached)
 /// Without any UDisks2, as root.
 class DirectTest : public DeviceTest {
 protected:
-    const Setting nowhere_{"DBUS_SYSTEM_BUS_ADDRESS", "unix:path=/nonexistent/bus"};
+    const SystemBus nowhere_{"unix:path=/nonexistent/bus"};
 };
 
 TEST_F(DirectTest, RootAttachesAnImageUntilItIsDetached)
@@ -121,7 +107,6 @@ TEST_F(DirectTest, AnImageInUseComesOffLater)
     const pellar::FileDescriptor user(::open(device.name().c_str(), O_RDONLY | O_CLOEXEC));
     const auto detached =
         carryOut(request(DiskAction::Detach, DiskStep::Kind::DetachLoop, device.name()));
-    ASSERT_FALSE(detached);
     EXPECT_EQ(detached.error().kind, Kind::Lingers);
 }
 
@@ -135,7 +120,6 @@ TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
         GTEST_SKIP() << "the root of this system is on no device";
     const auto detached =
         carryOut(request(DiskAction::Eject, DiskStep::Kind::DetachLoop, root->source));
-    ASSERT_FALSE(detached);
     EXPECT_EQ(detached.error().kind, Kind::HoldsSystem);
 }
 
@@ -166,6 +150,15 @@ void addProperties(sdbus::IObject& object, const char* interface,
 #endif
 }
 
+/// What gives a property its value.
+template <class Value>
+auto always(Value value)
+{
+    return [value] {
+        return value;
+    };
+}
+
 /// When all has been added.
 void finish([[maybe_unused]] sdbus::IObject& object)
 {
@@ -189,9 +182,26 @@ public:
                 return std::vector{sdbus::ObjectPath("/org/freedesktop/UDisks2/block_devices/x")};
             });
         finish(*manager_);
-        addVolume();
-        addDrive();
+        volume_ = add("/block_devices/x");
+        addMethod(*volume_, "org.freedesktop.UDisks2.Filesystem", "Mount",
+                  [this](sdbus::Result<std::string>&& result, const Options&) {
+                      if (answers)
+                          result.returnResults("/mnt");
+                      else
+                          unanswered_.push_back(std::move(result));
+                      isAsked = true;
+                  });
+        const std::string node("/dev/x\0", 7);
+        const sdbus::ObjectPath drive("/org/freedesktop/UDisks2/drives/d");
+        addProperties(
+            *volume_, "org.freedesktop.UDisks2.Block",
+            std::pair{"Device", always(std::vector<std::uint8_t>(node.begin(), node.end()))},
+            std::pair{"Drive", always(drive)});
         finish(*volume_);
+        drive_ = add("/drives/d");
+        addProperties(*drive_, "org.freedesktop.UDisks2.Drive.Ata",
+                      std::pair{"SmartUpdated", always(std::uint64_t{1700000000})},
+                      std::pair{"SmartFailing", always(true)});
         finish(*drive_);
         connection_->requestName(BusServiceName("org.freedesktop.UDisks2"));
         connection_->enterEventLoopAsync();
@@ -206,39 +216,6 @@ private:
     {
         return sdbus::createObject(*connection_,
                                    sdbus::ObjectPath("/org/freedesktop/UDisks2" + path));
-    }
-    void addVolume()
-    {
-        volume_ = add("/block_devices/x");
-        addMethod(*volume_, "org.freedesktop.UDisks2.Filesystem", "Mount",
-                  [this](sdbus::Result<std::string>&& result, const Options&) {
-                      if (answers)
-                          result.returnResults("/mnt");
-                      else
-                          unanswered_.push_back(std::move(result));
-                      isAsked = true;
-                  });
-        addProperties(*volume_, "org.freedesktop.UDisks2.Block",
-                      std::pair{"Device",
-                                [] {
-                                    return std::vector<std::uint8_t>{'/', 'd', 'e', 'v',
-                                                                     '/', 'x', 0};
-                                }},
-                      std::pair{"Drive", [] {
-                                    return sdbus::ObjectPath("/org/freedesktop/UDisks2/drives/d");
-                                }});
-    }
-    void addDrive()
-    {
-        drive_ = add("/drives/d");
-        addProperties(*drive_, "org.freedesktop.UDisks2.Drive.Ata",
-                      std::pair{"SmartUpdated",
-                                [] {
-                                    return std::uint64_t{1700000000};
-                                }},
-                      std::pair{"SmartFailing", [] {
-                                    return true;
-                                }});
     }
 
     std::unique_ptr<sdbus::IConnection> connection_;
@@ -266,7 +243,7 @@ protected:
     }
 
     const test::BusDaemon bus_;
-    const Setting address_{"DBUS_SYSTEM_BUS_ADDRESS", bus_.address()};
+    const SystemBus address_{bus_.address()};
     const Translator texts_;
     MainLoop loop_;
     std::optional<std::vector<std::string>> told_;
@@ -277,8 +254,8 @@ TEST_F(FakeUDisksTest, ItMayEndInTheMiddleAndComeBack)
     DiskOperations operations(loop_, texts_);
     auto first = std::make_unique<FakeUDisks>(bus_.address());
     start(operations);
-    EXPECT_TRUE(operations.isUnderWay("/dev/x"));
     waitUntilAsked(*first);
+    EXPECT_TRUE(operations.isUnderWay("/dev/x"));
     first.reset();
     loop_.runUntil([&] { return told_.has_value(); });
     EXPECT_EQ(*told_,
@@ -306,14 +283,14 @@ TEST_F(FakeUDisksTest, TheProgramEndsWithoutWaitingForAnAnswer)
 
 TEST_F(FakeUDisksTest, TheHealthOfAllDrivesComesWithOneCall)
 {
-    const auto ask = [](std::chrono::milliseconds longest) {
+    const auto ask = [] {
         UDisks udisks;
         udisks.askForFailingDrives();
-        return udisks.failingDrives(longest);
+        return udisks.failingDrives(20s);
     };
-    EXPECT_EQ(ask(20s).error().kind, Kind::NoService);
+    EXPECT_EQ(ask().error().kind, Kind::NoService);
     const FakeUDisks fake(bus_.address());
-    EXPECT_EQ(*ask(20s), (std::set<std::string>{"/dev/x"}));
+    EXPECT_EQ(*ask(), (std::set<std::string>{"/dev/x"}));
 }
 
 }  // namespace

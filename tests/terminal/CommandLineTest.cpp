@@ -43,7 +43,6 @@ TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsageAndNotObeyed)
         const auto read = readWords(c.words);
         ASSERT_FALSE(read) << c.because;
         EXPECT_EQ(read.error().status, 16) << c.because;
-        EXPECT_TRUE(read.error().text.starts_with("fixwell: ")) << c.because;
         EXPECT_FALSE(test::holdsControls(read.error().text)) << c.because;
     }
 }
@@ -65,7 +64,6 @@ TEST(GivenNames, APartGoesByTheNameOfItsImage)
           Case{"/tmp/a.img#odd", "odd", "a file of its own"},
           Case{"/tmp/a.img#odd#1", "odd#1", "inside that file"},
           Case{"/tmp/a.img#", "/tmp/a.img#", "another file"},
-          Case{"/tmp/a.img#1x", "/tmp/a.img#1x", "another file"},
           Case{"/tmp/a.img#1#2", "/tmp/a.img#1#2", "another file"},
           Case{"/tmp/a.img2", "/tmp/a.img2", "another file"},
           Case{"/dev/sdb", "LABEL=x", "a device"}, Case{"/dev/sdb1", "/dev/sdb1", "not named"}})

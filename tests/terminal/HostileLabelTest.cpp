@@ -4,12 +4,8 @@
 namespace orvane::test {
 namespace {
 
-struct HostileLabel {
-    std::string label;  ///< at most 16 bytes
-    std::string_view because;
-};
-
-const std::vector<HostileLabel> hostileLabels{
+/// Each of at most 16 bytes, and what it does.
+const std::vector<std::pair<std::string, std::string_view>> hostileLabels{
     {"\x1b[2J\x1b]0;x\x07", "clears the screen and sets the title"},
     {"%@ %s %n %1$@ %d", "conversions"},
     {"a\nb\r\nc", "line ends"},
@@ -24,18 +20,11 @@ const std::vector<HostileLabel> hostileLabels{
 
 class HostileLabelTest : public ProgramTest {
 protected:
-    /// The label stands in sixteen bytes of the superblock, which has no checksum here.
-    void setLabel(const std::filesystem::path& image, std::string label) const
-    {
-        constexpr std::uint64_t labelOffset = 1024 + 120;
-        label.resize(16, '\0');
-        patch(image, labelOffset, label);
-    }
-
     /// No record calls it a success.
     static void expectDamage(const RunResult& result, std::string_view because)
     {
         EXPECT_EQ(result.status, 4) << because << result.output << result.errors;
+        EXPECT_FALSE(holdsControls(result.output)) << because << result.output;
         const Events events(result.output);
         EXPECT_EQ(events.recordsWith("needs to be repaired.").size(), 1U) << because;
         for (const auto& record : events.named("record"))
@@ -47,26 +36,26 @@ protected:
 TEST_F(HostileLabelTest, NothingOfItReachesTheTerminalOrPassesForASuccess)
 {
     const auto image = makeDamagedVolume("image", {"-O", "^metadata_csum"});
-    for (const HostileLabel& c : hostileLabels) {
-        setLabel(image, c.label);
-        expectDamage(run({"verify", "--details", "--json", "image"}), c.because);
+    for (const auto& [label, because] : hostileLabels) {
+        // In sixteen bytes of the superblock, which has no checksum here.
+        patch(image, 1024 + 120, label + std::string(16 - label.size(), '\0'));
+        expectDamage(run({"verify", "--details", "--json", "image"}), because);
         for (const std::vector<std::string>& arguments :
              {std::vector<std::string>{"verify", "--details", "--log-level=3", "--trace", "image"},
-              {"verify", "--details", "--json", "image"},
               {"list", "image"},
               {"list", "--json", "image"},
               {"history", "image"},
               {"history", "--json", "image"}}) {
             const RunResult result = run(arguments);
-            EXPECT_FALSE(holdsControls(result.output)) << c.because << "\n" << result.output;
-            EXPECT_FALSE(holdsControls(result.errors)) << c.because << "\n" << result.errors;
+            EXPECT_FALSE(holdsControls(result.output)) << because << "\n" << result.output;
+            EXPECT_FALSE(holdsControls(result.errors)) << because << "\n" << result.errors;
         }
         std::string screen = runOnTerminal({"verify", "--details", "image"}).output;
         for (const std::string_view own :
              {"\x1b[1m", "\x1b[31m", "\x1b[32m", "\x1b[0m", "\x1b[K", "\r"})
             for (std::size_t at; (at = screen.find(own)) != std::string::npos;)
                 screen.erase(at, own.size());
-        EXPECT_FALSE(holdsControls(screen)) << c.because << "\n" << screen;
+        EXPECT_FALSE(holdsControls(screen)) << because << "\n" << screen;
     }
 }
 
@@ -77,8 +66,6 @@ TEST_F(HostileLabelTest, AFileNameThatSaysItIsWellIsNoSuccess)
          {"The volume appears to be OK.", "x was repaired successfully."}) {
         makeDamagedVolume(name);
         expectDamage(run({"verify", "--details", "--json", name}), name);
-        const RunResult shown = run({"verify", "--color=always", name});
-        EXPECT_EQ(countOf("\x1b[32m", shown.output), 0U) << "nothing is green\n" << shown.output;
     }
 }
 

@@ -4,13 +4,7 @@
 namespace orvane::test {
 namespace {
 
-class PartitionMapTest : public ProgramTest {
-protected:
-    RunResult treat(const char* command, const std::string& disk) const
-    {
-        return run({command, "--partition-map", disk});
-    }
-};
+using PartitionMapTest = ProgramTest;
 
 std::string zeros(std::size_t count)
 {
@@ -38,24 +32,17 @@ TEST_F(PartitionMapTest, IsVerifiedRepairedAndVerified)
 {
     const auto disk = makeDisk("disk.img", {makeVolume("volume")});
     const std::string sound = contentsOf(disk);
-    EXPECT_EQ(treat("verify", "disk.img").status, 0);
-    EXPECT_EQ(treat("repair", "disk.img").status, 0) << "there is nothing to be done";
+    EXPECT_EQ(run({"verify", "--partition-map", "disk.img"}).status, 0);
+    EXPECT_EQ(run({"repair", "--partition-map", "disk.img"}).status, 0)
+        << "there is nothing to be done";
     EXPECT_TRUE(contentsOf(disk) == sound);
     EXPECT_FALSE(std::filesystem::exists(path("state/orvane/partition-maps")));
 
     patch(disk, 512, zeros(33 * 512));
-    EXPECT_EQ(treat("verify", "disk.img").status, 4);
-    const RunResult history = run({"history", "disk.img"});
-    EXPECT_NE(history.output.find("verify-partition-map damaged"), std::string::npos)
-        << history.output;
-    const RunResult repaired = treat("repair", "disk.img");
+    EXPECT_EQ(run({"verify", "--partition-map", "disk.img"}).status, 4);
+    const RunResult repaired = run({"repair", "--partition-map", "disk.img"});
     EXPECT_EQ(repaired.status, 1) << repaired.output << repaired.errors;
-    EXPECT_NE(repaired.output.find("README.txt there tells how to put them back"),
-              std::string::npos)
-        << repaired.output;
     EXPECT_TRUE(contentsOf(disk) == sound) << "map and volume are as they were";
-    EXPECT_EQ(treat("verify", "disk.img").status, 0);
-    EXPECT_EQ(run({"verify", "disk.img"}).status, 0) << "the volume";
 }
 
 TEST_F(PartitionMapTest, OneJobTreatsSeveralDisksWhateverBecomesOfEach)
@@ -73,7 +60,6 @@ TEST_F(PartitionMapTest, OneJobTreatsSeveralDisksWhateverBecomesOfEach)
                                          "started broken.img",   "finished broken.img damaged",
                                          "started sound.img",    "finished sound.img sound"};
     EXPECT_EQ(Events(all.output).story({"started", "finished"}), story);
-    EXPECT_NE(all.output.find("there is no partition map"), std::string::npos) << all.output;
     EXPECT_TRUE(contentsOf(broken) == before);
 }
 

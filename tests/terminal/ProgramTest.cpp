@@ -121,15 +121,6 @@ std::filesystem::path ProgramTest::makeDisk(std::string_view name,
     return path(name);
 }
 
-void ProgramTest::patch(const std::filesystem::path& image, std::uint64_t offset,
-                        std::string_view bytes) const
-{
-    std::fstream file(image, std::ios::binary | std::ios::in | std::ios::out);
-    file.seekp(static_cast<std::streamoff>(offset));
-    if (!file.write(bytes.data(), static_cast<std::streamsize>(bytes.size())))
-        throw std::runtime_error("cannot prepare the test: " + image.string());
-}
-
 void ProgramTest::useTool(std::string_view script)
 {
     std::filesystem::create_directories(path("tools"));

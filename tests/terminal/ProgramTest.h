@@ -68,9 +68,6 @@ protected:
     std::filesystem::path makeDisk(std::string_view name,
                                    const std::vector<std::filesystem::path>& volumes,
                                    std::string_view label = "gpt") const;
-    /// Replaces bytes of the file.
-    void patch(const std::filesystem::path& image, std::uint64_t offset,
-               std::string_view bytes) const;
 
     /// From now on e2fsck does what the script says; it is described in the fake tool's source.
     void useTool(std::string_view script);

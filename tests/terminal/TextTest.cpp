@@ -69,15 +69,6 @@ TEST_F(TerminalTextTest, HostileTextIsMadeHarmless)
     EXPECT_EQ(safeLines("\n\na\n"), "\n\na\n");
 }
 
-TEST_F(TerminalTextTest, TheLookEndsBeforeTheLineDoes)
-{
-    contract::TextStyle red;
-    red.color = contract::Color{1, 0, 0, 1};
-    const auto text = contract::StyledText::make("one\n\ntwo\n", red);
-    EXPECT_EQ(terminalText(text, true), "\x1b[31mone\x1b[0m\n\n\x1b[31mtwo\x1b[0m\n");
-    EXPECT_EQ(terminalText(text, false), "one\n\ntwo\n");
-}
-
 TEST(ByteCount, HasAtMostThreeDigits)
 {
     struct Case {

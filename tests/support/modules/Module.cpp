@@ -3,8 +3,8 @@
 
 namespace {
 
-// A host that called anything of a module of another version would crash here.
-constexpr contract::ModuleEntry entry{contract::moduleContractVersion + 41, nullptr, nullptr};
+// A host that called anything of a module that it refuses would crash here.
+constexpr contract::ModuleEntry entry{contract::moduleContractVersion + NEWER_BY, nullptr, nullptr};
 
 }  // namespace
 
