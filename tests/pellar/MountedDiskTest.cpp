@@ -3,6 +3,7 @@
 
 #include "pellar/mounts/Holders.h"
 #include "pellar/mounts/MountTable.h"
+#include "pellar/mounts/UnmountedDisk.h"
 #include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
 
@@ -279,6 +280,16 @@ TEST_F(MountedDisk, IsMountedAgainOverWhatLiesBelowWhenTheProgramIsKilled)
     for (const Mount& place : mounts())
         ::umount2(place.target.c_str(), MNT_DETACH);
     ::umount(covered.c_str());
+}
+
+// The program behind it would have to be started anew.
+TEST_F(MountedDisk, AFileSystemOfFUSEStaysMounted)
+{
+    std::vector<Mount> places = mounts();
+    for (Mount& place : places)
+        place.filesystem = "fuseblk";
+    EXPECT_FALSE(UnmountedDisk::take(places, {}));
+    EXPECT_EQ(mounts(), before_);
 }
 
 TEST_F(MountedDisk, WhoHoldsItIsNamedAndNothingIsChanged)

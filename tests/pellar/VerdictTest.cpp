@@ -140,6 +140,9 @@ TEST(ToolVerdict, OnlyACleanExitIsSound)
         for (const Ending& ending : {Ending(Killed{SIGKILL}), Ending(NotStarted{ENOENT})})
             EXPECT_EQ(judge(tool, lines, ending).verdict, Verdict::Failed) << c.recording;
     }
+    EXPECT_EQ(judge(*toolFor("ext4"), {"The volume “image” appears to be OK."}, Exited{4}).verdict,
+              Verdict::Damaged)
+        << "it lies in words";
 }
 
 // What the tools do not say, or do not know.

@@ -280,7 +280,7 @@ TEST(PartitionMaps, AGPTIsRestoredWhereItIsThereTwiceAndLeftAloneElsewhere)
          {Overlap, Overlap, BackupMissing},
          "and a lost backup"},
         {{entry(2, 24575, 20480)}, person, {EndBeforeStart}, ""},
-        {{entry(2, 20480, 40000)}, person, {BeyondDisk}, ""},
+        {{entry(2, 20480, 32768)}, person, {BeyondDisk}, "by one sector"},
         {{entry(2, 20480, 32740)}, person, {OutsideUsable}, "over the backup list"},
         {{entry(2, 40, 1000)}, person, {OutsideUsable}, "before the first usable sector"},
         {{entry(2, 20480, ~0ULL)}, person, {BeyondDisk}, "no overflow"},
