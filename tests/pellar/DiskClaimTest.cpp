@@ -93,13 +93,12 @@ TEST(DiskClaim, NoticesThatTheDiskBecameShorter)
     auto disk = *test::reference(directory.path("disk"));
     disk.offset = 4096;
     disk.length = 4096;
-    const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
-    const auto& claim = *taken;
-    EXPECT_EQ(claim.availableBytes(), 4096U);
+    const auto claim = DiskClaim::take(disk, Access::ReadOnly, {});
+    EXPECT_EQ(claim->availableBytes(), 4096U);
     std::filesystem::resize_file(disk.path, 8192);
-    EXPECT_TRUE(claim.isStillWhole()) << "the region is still there";
+    EXPECT_TRUE(claim->isStillWhole()) << "the region is still there";
     std::filesystem::resize_file(disk.path, 8191);
-    EXPECT_FALSE(claim.isStillWhole());
+    EXPECT_FALSE(claim->isStillWhole());
 }
 
 TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
@@ -108,16 +107,15 @@ TEST(DiskClaim, NoticesThatItsNameLeadsElsewhere)
     for (const char* const what : {"deleted", "moved", "replaced"}) {
         directory.write("disk", std::string(10'000, 'x'));
         const auto disk = *test::reference(directory.path("disk"));
-        const auto taken = DiskClaim::take(disk, Access::ReadOnly, {});
-        const auto& claim = *taken;
-        EXPECT_TRUE(claim.isStillInPlace());
+        const auto claim = DiskClaim::take(disk, Access::ReadOnly, {});
+        EXPECT_TRUE(claim->isStillInPlace());
         std::filesystem::rename(disk.path, directory.path("elsewhere"));
         if (what == std::string_view("deleted"))
             std::filesystem::remove(directory.path("elsewhere"));
         else if (what == std::string_view("replaced"))
             directory.write("disk", std::string(10'000, 'x'));
-        EXPECT_FALSE(claim.isStillInPlace()) << what;
-        EXPECT_TRUE(claim.isStillWhole()) << what;
+        EXPECT_FALSE(claim->isStillInPlace()) << what;
+        EXPECT_TRUE(claim->isStillWhole()) << what;
     }
 }
 
@@ -152,18 +150,15 @@ TEST(MountTable, WhatIsNotKnownToBeFreeIsMounted)
                     "36 35 8:17 / /mnt rw - ext4 /dev/sdb1 rw\n"
                     "37 36 0:21 /8:2 /proc rw - proc 8:3 rw\n38");
     directory.write("none", "");
-    struct Case {
-        std::filesystem::path list;
-        unsigned minor;
-        bool isMounted;
+    const auto isIn = [](const std::filesystem::path& list, unsigned minor) {
+        return isMounted(makedev(8, minor), {"/sys/block", list});
     };
-    for (const Case& c :
-         {Case{directory.path("mounts"), 17, true}, Case{directory.path("mounts"), 1, false},
-          Case{directory.path("mounts"), 2, false}, Case{directory.path("mounts"), 3, false},
-          Case{directory.path("none"), 17, false}, Case{"/nonexistent", 17, true},
-          Case{"/", 17, true}})
-        EXPECT_EQ(isMounted(makedev(8, c.minor), {"/sys/block", c.list}), c.isMounted)
-            << c.list << ' ' << c.minor;
+    EXPECT_TRUE(isIn(directory.path("mounts"), 17));
+    for (const unsigned minor : {1U, 2U, 3U})
+        EXPECT_FALSE(isIn(directory.path("mounts"), minor)) << minor;
+    EXPECT_FALSE(isIn(directory.path("none"), 17));
+    EXPECT_TRUE(isIn("/nonexistent", 17));
+    EXPECT_TRUE(isIn("/", 17));
 }
 
 }  // namespace

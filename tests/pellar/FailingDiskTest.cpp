@@ -72,7 +72,7 @@ void expectAdviceToCopy(const test::Listener& heard, std::string_view because)
 {
     EXPECT_EQ(heard.verdict, "failed") << because << ": " << heard.message;
     EXPECT_EQ(heard.error, contract::kPLErrorUnreadable) << because;
-    EXPECT_NE(heard.message.find("ddrescue"), std::string::npos) << heard.message;
+    EXPECT_TRUE(test::contains(heard.message, "ddrescue")) << heard.message;
     EXPECT_FALSE(heard.hasPlainLine("needs to be repaired.")) << because;
 }
 
@@ -127,7 +127,7 @@ TEST_F(FailingDiskTest, WhatOnlyARepairReadsIsReadBeforeIt)
     test::JobFixture library;
     ASSERT_EQ(library.repair(test::reference(failing.path())), 0);
     expectAdviceToCopy(library.listener, "a backup of the superblock");
-    EXPECT_NE(library.listener.message.find("byte 8388608 "), std::string::npos)
+    EXPECT_TRUE(test::contains(library.listener.message, "byte 8388608 "))
         << library.listener.message;
     EXPECT_FALSE(failing.wasWritten());
 }

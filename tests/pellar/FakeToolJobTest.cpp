@@ -45,41 +45,29 @@ void expectOneEnd(FakeToolFixture& fixture)
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << "a process is left";
 }
 
-JobOptions fewLines()
-{
-    JobOptions options;
-    options.outputLimits = {1000, 10U << 20U};
-    return options;
-}
-
 TEST(Job, VerifyAnswersWhatIsTrue)
 {
     struct Case {
         std::string script;
         contract::ErrorCode error;
         std::string_view verdict;
-        std::string_view because;
         std::size_t failures = 1;  ///< sentences that say so
     };
     for (const Case& c :
-         {Case{soundRun, 0, "sound", "all is said", 0},
-          Case{"say Pass 1: Checking inodes, blocks, and sizes\n", contract::kPLErrorInconclusive,
-               "inconclusive", "it never came to the end"},
-          Case{"", contract::kPLErrorInconclusive, "inconclusive", "it said nothing"},
-          Case{soundRun + "exit 16", contract::kPLErrorToolFailed, "failed", "usage"},
-          Case{soundRun + "kill 9", contract::kPLErrorToolFailed, "failed", "killed"},
-          Case{soundRun + "shrink 4194304", contract::kPLErrorDiskChanged, "failed",
-               "the file shrank below it"},
-          Case{"flood-lines", contract::kPLErrorDamaged, "damaged", "problems without end"},
-          Case{"flood-bytes", contract::kPLErrorToolMisbehaved, "failed", "noise without end",
-               2}}) {
-        FakeToolFixture fixture(c.script, fewLines());
+         {Case{soundRun, 0, "sound", 0},
+          Case{"say Pass 1: Checking inodes\n", contract::kPLErrorInconclusive, "inconclusive"},
+          Case{soundRun + "kill 9", contract::kPLErrorToolFailed, "failed"},
+          Case{soundRun + "shrink 4194304", contract::kPLErrorDiskChanged, "failed"},
+          Case{"flood-lines", contract::kPLErrorDamaged, "damaged"},
+          Case{"flood-bytes", contract::kPLErrorToolMisbehaved, "failed", 2}}) {
+        FakeToolFixture fixture(c.script,
+                                test::with(&JobOptions::outputLimits, {1000, 10U << 20U}));
         // The claim is read-only, so the tool needs write access of its own to cut the file.
-        EXPECT_EQ(fixture.library.verify(fixture.disk), contract::kPLNoError) << c.because;
-        EXPECT_EQ(fixture.heard.error, c.error) << c.because;
-        EXPECT_EQ(fixture.heard.verdict, c.verdict) << c.because;
-        EXPECT_FALSE(fixture.heard.message.empty()) << c.because;
-        EXPECT_EQ(fixture.heard.textsOf(contract::kFsckFail).size(), c.failures) << c.because;
+        EXPECT_EQ(fixture.library.verify(fixture.disk), contract::kPLNoError) << c.script;
+        EXPECT_EQ(fixture.heard.error, c.error) << c.script;
+        EXPECT_EQ(fixture.heard.verdict, c.verdict) << c.script;
+        EXPECT_FALSE(fixture.heard.message.empty()) << c.script;
+        EXPECT_EQ(fixture.heard.textsOf(contract::kFsckFail).size(), c.failures) << c.script;
         expectOneEnd(fixture);
     }
 }
@@ -180,50 +168,32 @@ TEST(Job, SaysWhyThereIsNoWay)
 {
     FakeToolFixture fixture(soundRun);
     std::filesystem::remove(fixture.directory.path("tools/e2fsck"));
-    struct Case {
-        std::string_view filesystem;
-        contract::ErrorCode error;
-        std::string_view says;
-    };
-    for (const Case& c :
-         {Case{"%@fs", contract::kPLErrorUnsupported, "no tool for the file system “%@fs”"},
-          Case{"swap", contract::kPLErrorUnsupported, "it is swap space"},
-          Case{"crypto_LUKS", contract::kPLErrorUnsupported, "it is encrypted"},
-          Case{"ext4", contract::kPLErrorToolMissing,
-               "e2fsck is not installed (package e2fsprogs)"}}) {
-        contract::DiskReference disk = *fixture.disk;
-        disk.filesystem = c.filesystem;
-        ASSERT_EQ(fixture.library.repair(std::make_shared<contract::DiskReference>(disk)), 0);
-        EXPECT_EQ(fixture.heard.error, c.error) << c.filesystem;
-        EXPECT_NE(fixture.heard.message.find(c.says), std::string::npos) << fixture.heard.message;
-        EXPECT_FALSE(fixture.library.manager.canRepair(c.filesystem));
-        EXPECT_NE(
-            fixture.library.manager.reasonAgainst(c.filesystem, Operation::Repair).find(c.says),
-            std::string::npos);
+    for (const auto& [filesystem, error, says] :
+         {std::tuple("%@fs", contract::kPLErrorUnsupported, "no tool for the file system “%@fs”"),
+          {"swap", contract::kPLErrorUnsupported, "it is swap space"},
+          {"ext4", contract::kPLErrorToolMissing, "e2fsck is not installed (package e2fsprogs)"}}) {
+        ASSERT_EQ(fixture.library.repair(test::reference(fixture.disk->path, filesystem)), 0);
+        EXPECT_EQ(fixture.heard.error, error) << filesystem;
+        EXPECT_TRUE(test::contains(fixture.heard.message, says)) << fixture.heard.message;
+        const Manager& manager = fixture.library.manager;
+        EXPECT_FALSE(manager.canRepair(filesystem));
+        EXPECT_TRUE(test::contains(manager.reasonAgainst(filesystem, Operation::Repair), says));
     }
 }
 
 /// A FAT16 volume that a fake fsck.fat treats: what it says depends on whether it may write.
 struct FakeFatFixture {
     explicit FakeFatFixture(std::string_view script)
+        : library(test::with(&JobOptions::toolPath, directory.fakeTools(script, "fsck.fat")))
     {
-        directory.write("disk", {});
-        std::filesystem::resize_file(directory.path("disk"), 20U << 20U);
-        directory.write("disk", fatBootSector());
-        std::filesystem::resize_file(directory.path("disk"), 20U << 20U);
-        options.toolPath = directory.fakeTools(script, "fsck.fat");
+        std::string volume(20U << 20U, '\0');
+        volume.replace(0, 24, {"\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24});
+        directory.write("disk", volume.replace(510, 2, "\x55\xAA"));
     }
-
-    static std::string fatBootSector()
-    {
-        std::string sector(512, '\0');
-        sector.replace(0, 24,
-                       std::string("\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24));
-        return sector.replace(510, 2, "\x55\xAA");
-    }
+    void repair() { EXPECT_EQ(library.repair(test::reference(directory.path("disk"), "vfat")), 0); }
 
     test::TestDirectory directory;
-    JobOptions options;
+    test::JobFixture library;
 };
 
 const std::string fatDamage =
@@ -233,40 +203,36 @@ const std::string fatDamage =
 TEST(Job, IsToldThatAWritingToolComesToItsEndBeforeItStops)
 {
     FakeFatFixture fixture(fatDamage + "await-in-repair pressed\nsay the end\nexit 1");
-    test::JobFixture library(fixture.options);
+    const test::Listener& heard = fixture.library.listener;
     bool isPressed = false;
-    library.listener.onMessage = [&] {
+    fixture.library.listener.onMessage = [&] {
         // The look has shown it as a problem; the repair tells it as a plain line.
-        if (!library.listener.hasPlainLine("FATs differ") || std::exchange(isPressed, true))
+        if (!heard.hasPlainLine("FATs differ") || std::exchange(isPressed, true))
             return;
-        library.tool->cancelCurrentOperation();
+        fixture.library.tool->cancelCurrentOperation();
         fixture.directory.write("tools/pressed", "");
     };
-    ASSERT_EQ(library.repair(test::reference(fixture.directory.path("disk"), "vfat")), 0);
-    EXPECT_EQ(library.listener.verdict, "stopped");
-    EXPECT_EQ(std::count(library.listener.plainLines.begin(), library.listener.plainLines.end(),
-                         "the end\n"),
-              2)
-        << "of the look, and of the repair";
-    EXPECT_EQ(
-        std::count_if(
-            library.listener.dictionaries.begin(), library.listener.dictionaries.end(),
-            [](const contract::Dictionary& message) {
-                return message.string(contract::kFsckMessageString).find("fsck.fat is writing") !=
-                       std::string::npos;
-            }),
-        1);
+    fixture.repair();
+    EXPECT_EQ(heard.verdict, "stopped");
+    EXPECT_EQ(std::ranges::count(heard.plainLines, "the end\n"), 2) << "of look and repair";
+    EXPECT_EQ(std::ranges::count_if(heard.dictionaries,
+                                    [](const contract::Dictionary& message) {
+                                        return test::contains(
+                                            message.string(contract::kFsckMessageString),
+                                            "fsck.fat is writing");
+                                    }),
+              1);
 }
 
 TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
 {
     FakeFatFixture fixture(fatDamage + "exit 1");
-    test::JobFixture library(fixture.options);
-    ASSERT_EQ(library.repair(test::reference(fixture.directory.path("disk"), "vfat")), 0);
-    EXPECT_EQ(library.listener.verdict, "damaged") << "it never says that it has changed anything";
-    EXPECT_EQ(library.listener.textsOf(contract::kFsckError).size(), 2U)
+    fixture.repair();
+    const test::Listener& heard = fixture.library.listener;
+    EXPECT_EQ(heard.verdict, "damaged") << "it never says that it has changed anything";
+    EXPECT_EQ(heard.textsOf(contract::kFsckError).size(), 2U)
         << "once before the repair, and once for what is left";
-    EXPECT_EQ(library.listener.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";
+    EXPECT_EQ(heard.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";
 }
 
 /// Of those who have the right; it ends the job at once.
@@ -291,43 +257,34 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
     const std::string tools = directory.fakeTools("exit 0");
     for (const char* tool : {"fsck.fat", "btrfs"})
         static_cast<void>(directory.fakeTools("exit 0", tool));
-    struct Case {
-        std::string filesystem;
-        Operation operation;
-        bool isAsked;
-        std::string_view because;
-    };
-    for (const Case& c : {
-             Case{"vfat", Operation::Verify, true, "fsck.fat knows no offsets"},
-             Case{"vfat", Operation::Repair, true, "nor does it when it repairs"},
-             Case{"ext4", Operation::Repair, false, "e2fsck finds it in the file"},
-             Case{"btrfs", Operation::Verify, true, "a check of it is possible"},
-             Case{"btrfs", Operation::Repair, false, "but no repair, whoever does it"},
-             Case{"f2fs", Operation::Verify, false, "its tool is not installed"},
-             Case{"swap", Operation::Verify, false, "nothing checks it"},
-             Case{"", Operation::Verify, false, "nothing recognises it"},
-         }) {
-        JobOptions options;
-        options.toolPath = tools;
+    for (const auto& [filesystem, operation, isAsked] :
+         {std::tuple("vfat", Operation::Verify, true),  // fsck.fat knows no offsets
+          {"vfat", Operation::Repair, true},
+          {"ext4", Operation::Repair, false},  // e2fsck finds it in the file
+          {"btrfs", Operation::Verify, true},
+          {"btrfs", Operation::Repair, false},  // nobody repairs it
+          {"f2fs", Operation::Verify, false},   // its tool is not installed
+          {"swap", Operation::Verify, false},
+          {"", Operation::Verify, false}}) {
+        JobOptions options = test::with(&JobOptions::toolPath, tools);
         std::optional<PrivilegedJob> asked;
         options.privileged = [&asked](const PrivilegedJob& job, StopSwitch&, EventQueue& events) {
             asked = job;
             return std::make_unique<EmptyScript>(events);
         };
-        auto part = *test::reference(directory.path("image"), c.filesystem);
+        auto part = *test::reference(directory.path("image"), filesystem);
         part.offset = 4096;
         part.length = 1 << 16;
         const auto disk = std::make_shared<const contract::DiskReference>(part);
         auto claim = DiskClaim::take(*disk, Access::ReadWrite, {});
-        auto request = std::make_shared<VolumeRequest>(
-            VolumeRequest{disk, c.operation, *std::move(claim), {}, toolFor(c.filesystem)});
+        VolumeRequest request{disk, operation, *std::move(claim), {}, toolFor(filesystem)};
         test::TestLoop loop;
         const test::EnglishTexts texts;
         test::Listener listener;
         const Job job(
             [&](StopSwitch& stop, EventQueue& events) {
                 return std::make_unique<PartOfImageScript>(
-                    std::move(*request), JobContext{*disk, options, texts, stop, events});
+                    std::move(request), JobContext{*disk, options, texts, stop, events});
             },
             EventReceiver{&listener,
                           disk,
@@ -335,14 +292,14 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
                           [] {
                           }},
             loop);
-        ASSERT_TRUE(loop.runUntil([&] { return listener.finished == 1; })) << c.because;
-        EXPECT_EQ(listener.started, 1) << c.because;
-        ASSERT_EQ(asked.has_value(), c.isAsked) << c.because;
+        ASSERT_TRUE(loop.runUntil([&] { return listener.finished == 1; })) << filesystem;
+        EXPECT_EQ(listener.started, 1) << filesystem;
+        ASSERT_EQ(asked.has_value(), isAsked) << filesystem;
         if (!asked)
             continue;
         ASSERT_TRUE(asked->image);
         EXPECT_EQ(asked->image->offset(), 4096U);
-        EXPECT_EQ(asked->task.operation, c.operation);
+        EXPECT_EQ(asked->task.operation, operation);
     }
 }
 

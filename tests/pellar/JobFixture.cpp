@@ -2,11 +2,14 @@
 #include "tests/pellar/JobFixture.h"
 
 #include "contract/foundation/Array.h"
-#include "pellar/process/ChildProcess.h"
+#include "pellar/process/Command.h"
+#include "pellar/process/FileDescriptor.h"
 #include "tests/support/VolumeStates.h"
 
-#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <spawn.h>
+#include <sys/mman.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -19,16 +22,49 @@ namespace {
 constexpr std::string_view systemPath = "/usr/sbin:/usr/bin:/sbin:/bin";
 
 /// Fails the test that cannot be prepared, loudly.
-void runProgram(std::string_view name, std::vector<std::string> arguments)
+void prepareWith(const std::vector<std::string>& arguments)
 {
-    const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
-    auto child =
-        ChildProcess::start({findProgram(name, systemPath), std::move(arguments)}, {sink.get()});
-    if (!child || child->reap() != Ending(Exited{0}))
-        throw std::runtime_error("cannot prepare the test: " + std::string(name) + " failed");
+    const ToolAnswer answer = runTool(arguments);
+    if (answer.status != 0)
+        throw std::runtime_error("cannot prepare the test: " + arguments[0] + answer.output);
 }
 
 }  // namespace
+
+ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input)
+{
+    const FileDescriptor in(::memfd_create("input", MFD_CLOEXEC));
+    const FileDescriptor out(::memfd_create("output", MFD_CLOEXEC));
+    if (::pwrite(in.get(), input.data(), input.size(), 0) != std::ssize(input))
+        return {};
+    posix_spawn_file_actions_t actions;
+    ::posix_spawn_file_actions_init(&actions);
+    ::posix_spawn_file_actions_adddup2(&actions, in.get(), 0);
+    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 1);
+    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 2);
+    std::vector<char*> words;
+    for (std::string& argument : arguments)
+        words.push_back(argument.data());
+    words.push_back(nullptr);
+    std::string path = "PATH=" + std::string(systemPath);
+    std::string locale = "LC_ALL=C";
+    char* environment[] = {path.data(), locale.data(), nullptr};
+    const std::string program = findProgram(arguments.front(), systemPath);
+    pid_t child = 0;
+    const int error =
+        ::posix_spawn(&child, program.c_str(), &actions, nullptr, words.data(), environment);
+    ::posix_spawn_file_actions_destroy(&actions);
+    int status = 0;
+    if (error != 0 || ::waitpid(child, &status, 0) != child || !WIFEXITED(status))
+        return {};
+    const std::string output = "/proc/self/fd/" + std::to_string(out.get());
+    return {WEXITSTATUS(status), orvane::test::contentsOf(output)};
+}
+
+bool contains(std::string_view text, std::string_view part)
+{
+    return text.find(part) != std::string_view::npos;
+}
 
 void TestLoop::performOnMainThread(Task task, Wait)
 {
@@ -54,13 +90,7 @@ bool TestLoop::runUntil(const std::function<bool()>& isDone)
 
 void TestLoop::drain()
 {
-    while (waiting() > 0) {
-        std::unique_lock guard(lock_);
-        const Task task = std::move(tasks_.front());
-        tasks_.pop_front();
-        guard.unlock();
-        task();
-    }
+    static_cast<void>(runUntil([this] { return waiting() == 0; }));
 }
 
 std::size_t TestLoop::waiting()
@@ -106,31 +136,14 @@ std::vector<std::string> Listener::textsOf(contract::Name type) const
 
 bool Listener::hasPlainLine(std::string_view part) const
 {
-    return std::any_of(plainLines.begin(), plainLines.end(), [part](const std::string& line) {
-        return line.find(part) != std::string::npos;
-    });
+    return std::ranges::any_of(plainLines,
+                               [part](const auto& line) { return contains(line, part); });
 }
 
 bool Listener::hasErrorWith(std::string_view part) const
 {
     const auto errors = textsOf(contract::kFsckError);
-    return std::any_of(errors.begin(), errors.end(), [part](const std::string& line) {
-        return line.find(part) != std::string::npos;
-    });
-}
-
-TestDirectory::TestDirectory()
-{
-    std::string pattern = (std::filesystem::temp_directory_path() / "pellar-XXXXXX").string();
-    if (::mkdtemp(pattern.data()) == nullptr)
-        throw std::runtime_error("cannot make a directory for the test");
-    directory_ = pattern;
-}
-
-TestDirectory::~TestDirectory()
-{
-    std::error_code error;
-    std::filesystem::remove_all(directory_, error);
+    return std::ranges::any_of(errors, [part](const auto& line) { return contains(line, part); });
 }
 
 void TestDirectory::write(std::string_view name, std::string_view bytes) const
@@ -138,44 +151,42 @@ void TestDirectory::write(std::string_view name, std::string_view bytes) const
     std::ofstream(path(name), std::ios::binary) << bytes;
 }
 
-std::filesystem::path TestDirectory::makeExt(std::string_view name, std::uint64_t bytes,
-                                             std::vector<std::string> options) const
+std::filesystem::path TestDirectory::makeFile(std::string_view name, std::uint64_t bytes) const
 {
     write(name, {});
     std::filesystem::resize_file(path(name), bytes);
-    options.insert(options.begin(), {"-q", "-F", "-t", "ext4"});
-    options.push_back(path(name));
-    runProgram("mke2fs", std::move(options));
+    return path(name);
+}
+
+std::filesystem::path TestDirectory::makeExt(std::string_view name, std::uint64_t bytes,
+                                             std::vector<std::string> options) const
+{
+    options.insert(options.begin(), {"mke2fs", "-q", "-F", "-t", "ext4"});
+    prepare(std::move(options), makeFile(name, bytes));
     return path(name);
 }
 
 std::filesystem::path TestDirectory::makeVolume(std::string_view name,
                                                 std::string_view filesystem) const
 {
-    const auto& makers = orvane::test::volumeMakers();
-    const auto maker = std::find_if(makers.begin(), makers.end(), [filesystem](const auto& known) {
-        return known.filesystem == filesystem;
-    });
+    const auto maker = std::ranges::find(orvane::test::volumeMakers(), filesystem,
+                                         &orvane::test::VolumeMaker::filesystem);
     if (findProgram(maker->command.front(), systemPath).empty())
         return {};
-    write(name, {});
-    std::filesystem::resize_file(path(name), maker->bytes);
-    prepare(maker->command, path(name));
+    prepare(maker->command, makeFile(name, maker->bytes));
     return path(name);
 }
 
 void TestDirectory::prepare(std::vector<std::string> command,
                             const std::filesystem::path& image) const
 {
-    const std::string name = command.front();
-    command.erase(command.begin());
     command.push_back(image);
-    runProgram(name, std::move(command));
+    prepareWith(command);
 }
 
 void TestDirectory::damage(const std::filesystem::path& image, std::string command) const
 {
-    runProgram("debugfs", {"-w", "-R", std::move(command), image});
+    prepareWith({"debugfs", "-w", "-R", std::move(command), image});
 }
 
 std::string TestDirectory::fakeTools(std::string_view script, std::string_view tool) const

@@ -4,6 +4,7 @@
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/Manager.h"
+#include "tests/support/TemporaryDirectory.h"
 
 #include <chrono>
 #include <condition_variable>
@@ -16,6 +17,16 @@
 #include <vector>
 
 namespace pellar::test {
+
+struct ToolAnswer {
+    int status = -1;  ///< -1 when the tool is not installed or was killed
+    std::string output;
+};
+
+/// Runs a system tool to its end.
+ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = {});
+
+bool contains(std::string_view text, std::string_view part);
 
 /// A main loop that the test's thread turns by hand.
 class TestLoop final : public contract::RunLoop {
@@ -76,13 +87,10 @@ public:
 /// A directory of one test, and what tests do with disks in it.
 class TestDirectory {
 public:
-    TestDirectory();
-    TestDirectory(const TestDirectory&) = delete;
-    TestDirectory& operator=(const TestDirectory&) = delete;
-    ~TestDirectory();
-
     std::filesystem::path path(std::string_view name) const { return directory_ / name; }
     void write(std::string_view name, std::string_view bytes) const;
+    /// A sparse file.
+    std::filesystem::path makeFile(std::string_view name, std::uint64_t bytes) const;
 
     /// A sparse file with a file system of e2fsprogs' own making.
     std::filesystem::path makeExt(std::string_view name, std::uint64_t bytes,
@@ -98,12 +106,21 @@ public:
     std::string fakeTools(std::string_view script, std::string_view tool = "e2fsck") const;
 
 private:
-    std::filesystem::path directory_;
+    orvane::test::TemporaryDirectory directory_;
 };
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image,
                                          std::string filesystem = "ext4",
                                          std::string name = "Disk");
+
+/// The usual options but for one.
+template <class T>
+JobOptions with(T JobOptions::*option, std::type_identity_t<T> value)
+{
+    JobOptions options;
+    options.*option = std::move(value);
+    return options;
+}
 
 /// One library, one listener, one loop.
 struct JobFixture {

@@ -13,9 +13,27 @@ namespace {
 using namespace std::chrono_literals;
 using namespace pellar;
 
-struct LogFixture {
+struct QueueFixture {
+    void waitUntilFull()
+    {
+        while (loop.waiting() < EventQueue::batchesUnderWay)
+            std::this_thread::yield();
+    }
+    void deliver()
+    {
+        queue.flush();
+        loop.drain();
+    }
+
+    test::TestLoop loop;
+    test::Listener listener;
+    EventQueue queue{loop, {&listener, {}, {}, [] {
+                            }}};
+};
+
+struct LogFixture : QueueFixture {
     explicit LogFixture(const Texts& texts = english(), std::string name = "Disk")
-        : log(*test::reference("/dev/sdz9", "ext4", std::move(name)), texts, events)
+        : log(*test::reference("/dev/sdz9", "ext4", std::move(name)), texts, queue)
     {
     }
 
@@ -24,30 +42,8 @@ struct LogFixture {
         static const test::EnglishTexts texts;
         return texts;
     }
-    void deliver()
-    {
-        events.flush();
-        loop.drain();
-    }
 
-    test::TestLoop loop;
-    test::Listener listener;
-    EventQueue events{loop, {&listener, {}, {}, [] {
-                             }}};
     JobLog log;
-};
-
-struct QueueFixture {
-    void waitUntilFull()
-    {
-        while (loop.waiting() < EventQueue::batchesUnderWay)
-            std::this_thread::yield();
-    }
-
-    test::TestLoop loop;
-    test::Listener listener;
-    EventQueue queue{loop, {&listener, {}, {}, [] {
-                            }}};
 };
 
 TEST(EventQueue, HoldsAFloodBackAndLosesNothing)
@@ -67,33 +63,6 @@ TEST(EventQueue, HoldsAFloodBackAndLosesNothing)
     ASSERT_EQ(fixture.listener.plainLines.size(), events);
     for (std::size_t i = 0; i < events; ++i)
         ASSERT_EQ(fixture.listener.plainLines[i], std::to_string(i));
-}
-
-TEST(EventQueue, TellsNothingOnceItIsClosed)
-{
-    QueueFixture fixture;
-    std::jthread job([&] {
-        for (int i = 0; i < 100'000; ++i)  // would wait for room that is never made
-            fixture.queue.add(Message{"x", {}});
-    });
-    fixture.waitUntilFull();
-    fixture.queue.close();
-    job.join();
-    fixture.loop.drain();
-    EXPECT_TRUE(fixture.listener.plainLines.empty());
-}
-
-TEST(EventQueue, StopsInTheMiddleOfABatch)
-{
-    QueueFixture fixture;
-    fixture.listener.onMessage = [&fixture] {
-        fixture.queue.close();
-    };
-    fixture.queue.add(Message{"first", {}});
-    fixture.queue.add(Message{"second", {}});
-    fixture.queue.flush();
-    fixture.loop.drain();
-    EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{"first"});
 }
 
 TEST(JobLog, LetsNothingPassForAVerdict)
@@ -123,40 +92,31 @@ TEST(JobLog, ShowsNoControlCharacters)
 
 TEST(JobLog, NamesTheDiskSoThatItCannotLie)
 {
-    struct Case {
-        std::string name;
-        std::string identifier;
-        std::string shown;
-    };
     const VerdictPhrases phrases(LogFixture::english());
-    for (const Case& c :
-         {Case{"My Disk", "/dev/sdb1", "My Disk"},
-          Case{"it appears to be ok.", "/dev/sdb1", "sdb1"}, Case{"", "/dev/sdb1", "sdb1"},
-          Case{"[31mred", "/x/needs to be repaired.", "volume"}, Case{"a\nb", "x", "a\uFFFDb"}}) {
+    for (const auto& [name, identifier, shown] : {std::tuple("My Disk", "/dev/sdb1", "My Disk"),
+                                                  {"it appears to be ok.", "/dev/sdb1", "sdb1"},
+                                                  {"", "/dev/sdb1", "sdb1"},
+                                                  {"[31mred", "/x/needs to be repaired.", "volume"},
+                                                  {"a\nb", "x", "a\uFFFDb"}}) {
         contract::DiskReference disk;
-        disk.name = c.name;
-        disk.identifier = c.identifier;
-        EXPECT_EQ(shownNameOf(disk, phrases), c.shown);
+        disk.name = name;
+        disk.identifier = identifier;
+        EXPECT_EQ(shownNameOf(disk, phrases), shown);
     }
 }
 
 TEST(JobLog, SaysVerdictsInTheModulesPhrases)
 {
-    struct Case {
-        Verdict verdict;
-        Operation operation;
-        std::string line;
-    };
-    for (const Case& c :
-         {Case{Verdict::Sound, Operation::Verify, "The volume “%@” appears to be OK.\n"},
-          Case{Verdict::Damaged, Operation::Verify, "The volume “%@” needs to be repaired."},
-          Case{Verdict::Damaged, Operation::Repair, "The volume “%@” could not be repaired."},
-          Case{Verdict::Repaired, Operation::Repair,
-               "The volume “%@” was repaired successfully.\n"}}) {
+    for (const auto& [verdict, operation, line] :
+         {std::tuple(Verdict::Sound, Operation::Verify, "The volume “%@” appears to be OK.\n"),
+          std::tuple(Verdict::Damaged, Operation::Verify, "The volume “%@” needs to be repaired."),
+          std::tuple(Verdict::Damaged, Operation::Repair, "The volume “%@” could not be repaired."),
+          std::tuple(Verdict::Repaired, Operation::Repair,
+                     "The volume “%@” was repaired successfully.\n")}) {
         LogFixture fixture(LogFixture::english(), "%@");
-        fixture.log.verdict(c.verdict, c.operation);
+        fixture.log.verdict(verdict, operation);
         fixture.deliver();
-        EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{c.line});
+        EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{line});
     }
 }
 
@@ -235,15 +195,8 @@ TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
 
 TEST(ToolRun, ReplacesOurNameForTheDisk)
 {
-    struct Case {
-        std::string_view line;
-        std::string_view shown;
-    };
-    for (const Case& c :
-         {Case{"/proc/self/fd/3: 11/16 files", "X: 11/16 files"},
-          Case{"while trying to open /proc/self/fd/3?offset=1048576", "while trying to open X"},
-          Case{"/proc/self/fd/33 /proc/self/fd/3", "/proc/self/fd/33 X"}, Case{"", ""}})
-        EXPECT_EQ(withDiskName(c.line, "X"), c.shown);
+    EXPECT_EQ(withDiskName("/proc/self/fd/33 /proc/self/fd/3", "X"), "/proc/self/fd/33 X");
+    EXPECT_EQ(withDiskName("open /proc/self/fd/3?offset=1048576", "X"), "open X");
 }
 
 }  // namespace

@@ -19,14 +19,9 @@ namespace {
 
 using namespace pellar;
 
-namespace fs = std::filesystem;
+using orvane::test::contentsOf;
 
-std::string bytesOf(const fs::path& file)
-{
-    std::string bytes(fs::file_size(file), '\0');
-    std::ifstream(file, std::ios::binary).read(bytes.data(), std::ssize(bytes));
-    return bytes;
-}
+namespace fs = std::filesystem;
 
 /// A btrfs volume with one copy of its files and two of everything else, mounted as the place of
 /// the user's home.
@@ -39,8 +34,7 @@ protected:
     {
         if (::geteuid() != 0)
             GTEST_SKIP() << "mounting needs root";
-        directory_.write("image", {});
-        fs::resize_file(image(), 128U << 20U);
+        directory_.makeFile("image", 128U << 20U);
         if (findProgram("mkfs.btrfs", JobOptions().toolPath).empty())
             GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
         directory_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
@@ -76,20 +70,13 @@ protected:
         device_.reset();
     }
 
-    /// Where the text stands in the image; of two copies the second.
-    std::size_t placeOf(std::string_view text) const { return bytesOf(image()).rfind(text); }
-    /// Also the first of two copies when there are to be none left.
-    void damage(std::string_view text, bool everywhere)
+    /// Of two copies the second.
+    void damage(std::string_view text)
     {
         unmount();
-        const std::string bytes = bytesOf(image());
-        std::fstream file(image(), std::ios::in | std::ios::out | std::ios::binary);
-        std::size_t at = bytes.rfind(text);
+        const std::size_t at = contentsOf(image()).rfind(text);
         ASSERT_NE(at, std::string::npos);
-        for (; at != std::string::npos;
-             at = everywhere && at > 0 ? bytes.rfind(text, at - 1) : std::string::npos)
-            file.seekp(static_cast<std::streamoff>(at)) << '#';
-        file.close();
+        std::fstream(image(), std::ios::in | std::ios::out).seekp(std::streamoff(at)) << '#';
         ASSERT_TRUE(mount());
     }
 
@@ -120,9 +107,7 @@ protected:
     }
     std::unique_ptr<test::JobFixture> library() const
     {
-        JobOptions options;
-        options.homeDirectory = place();
-        return std::make_unique<test::JobFixture>(options);
+        return std::make_unique<test::JobFixture>(test::with(&JobOptions::homeDirectory, place()));
     }
 
     test::TestDirectory directory_;
@@ -131,58 +116,38 @@ protected:
 
 TEST_F(LiveVerify, FindsDamageAndWritesNothing)
 {
-    struct Case {
-        std::string_view text;
-        bool everywhere;
-        const char* verdict;
-        const char* says;
-    };
-    for (const Case& c : {
-             Case{"", false, "sound", "no damage was found"},
-             Case{leafText, false, "damaged", "has another, good copy"},
-             Case{fileText, false, "damaged", "blocks without any good copy: 1;"},
-         }) {
-        if (!c.text.empty())
-            damage(c.text, c.everywhere);
-        const std::string before = bytesOf(image());
+    for (const auto& [text, says] : {std::pair(std::string_view(), "no damage was found"),
+                                     {leafText, "has another, good copy"},
+                                     {fileText, "blocks without any good copy: 1;"}}) {
+        if (!text.empty())
+            damage(text);
+        ::sync();  // what mounting it has written
+        const std::string before = contentsOf(image());
         const auto library = this->library();
         EXPECT_EQ(library->verify(disk()), 0);
-        EXPECT_EQ(library->listener.verdict, c.verdict) << library->listener.message;
-        EXPECT_NE(library->listener.message.find(c.says), std::string::npos)
-            << library->listener.message;
-        EXPECT_TRUE(bytesOf(image()) == before) << c.says;
+        EXPECT_EQ(library->listener.verdict, text.empty() ? "sound" : "damaged");
+        EXPECT_TRUE(test::contains(library->listener.message, says)) << library->listener.message;
+        EXPECT_TRUE(contentsOf(image()) == before) << says;
         EXPECT_FALSE(mountsOf(fs::path(device_->name()), {}).empty()) << "it stays mounted";
     }
 }
 
-TEST_F(LiveVerify, IsStoppedInTheKernelToo)
+TEST_F(LiveVerify, IsStoppedInTheKernelTooAndLeavesTheScrubOfOthersAlone)
 {
     if (!slowDown())
         GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
-    const auto library = this->library();
-    ASSERT_EQ(library->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
-    ASSERT_TRUE(library->loop.runUntil([&] { return !library->listener.progress.empty(); }));
+    const auto first = library();
+    ASSERT_EQ(first->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
+    ASSERT_TRUE(first->loop.runUntil([&] { return !first->listener.progress.empty(); }));
+    const auto second = library();
+    second->verify(disk());
+    EXPECT_EQ(second->listener.verdict, "failed");
+    EXPECT_TRUE(test::contains(second->listener.message, "another program is checking"));
     EXPECT_TRUE(isScrubbed());
-    library->tool->cancelCurrentOperation();
-    ASSERT_TRUE(library->loop.runUntil([&] { return library->listener.finished == 1; }));
-    EXPECT_EQ(library->listener.verdict, "stopped");
+    first->tool->cancelCurrentOperation();
+    ASSERT_TRUE(first->loop.runUntil([&] { return first->listener.finished == 1; }));
+    EXPECT_EQ(first->listener.verdict, "stopped");
     EXPECT_FALSE(isScrubbed());
-}
-
-TEST_F(LiveVerify, LeavesTheScrubOfOthersAlone)
-{
-    if (!slowDown())
-        GTEST_SKIP() << "this kernel's scrub cannot be slowed down, so it is over at once";
-    const auto other = library();
-    ASSERT_EQ(other->tool->beginStoragesystemFilesystemVerifyForDisk(disk()), 0);
-    ASSERT_TRUE(other->loop.runUntil([&] { return !other->listener.progress.empty(); }));
-    const auto library = this->library();
-    library->verify(disk());
-    EXPECT_EQ(library->listener.verdict, "failed");
-    EXPECT_NE(library->listener.message.find("another program is checking"), std::string::npos);
-    EXPECT_TRUE(isScrubbed());
-    other->tool->cancelCurrentOperation();
-    ASSERT_TRUE(other->loop.runUntil([&] { return other->listener.finished == 1; }));
 }
 
 TEST_F(LiveVerify, IsNotForAVolumeThatCanBeUnmounted)

@@ -15,10 +15,10 @@ namespace {
 using namespace std::chrono_literals;
 using namespace pellar;
 
-std::vector<std::string> split(const std::vector<std::string>& pieces, std::size_t longest = 8)
+std::vector<std::string> split(const std::vector<std::string>& pieces)
 {
     std::vector<std::string> lines;
-    LineSplitter splitter(longest, [&lines](std::string_view line, bool isCut) {
+    LineSplitter splitter(8, [&lines](std::string_view line, bool isCut) {
         lines.push_back(std::string(line) + (isCut ? "[cut]" : ""));
     });
     for (const std::string& piece : pieces)
@@ -30,23 +30,18 @@ std::vector<std::string> split(const std::vector<std::string>& pieces, std::size
 TEST(LineSplitter, CutsAtEveryLineEnd)
 {
     using namespace std::string_literals;
-    struct Case {
-        std::vector<std::string> pieces;
-        std::vector<std::string> lines;
-        std::string_view because;
-    };
-    for (const Case& c :
-         {Case{{"a\nb\n"}, {"a", "b"}, "the last end makes no empty line"},
-          Case{{"a\r\nb\rc"}, {"a", "b", "c"}, "three kinds of ends, and none"},
-          Case{{"a\r", "\nb"}, {"a", "b"}, "one end, torn apart"},
-          Case{{"a\r", "", "\n\nb"}, {"a", "", "b"}, "an end and an empty line"},
-          Case{{"a\r\r\nb"}, {"a", "", "b"}, "two ends"},
-          Case{{"a\0\xFF\n"s}, {"a\0\xFF"s}, "any bytes"},
-          Case{{"12345678\n"}, {"12345678"}, "just as long as may be"},
-          Case{{"123456789", "more\nb\n"}, {"12345678[cut]", "b"}, "the rest is dropped"},
-          Case{{"12345678", "9"}, {"12345678[cut]"}, "cut at the very end"},
-          Case{{}, {}, "nothing"}})
-        EXPECT_EQ(split(c.pieces), c.lines) << c.because;
+    using Texts = std::vector<std::string>;
+    for (const auto& [pieces, lines] :
+         {std::pair(Texts{"a\nb\n"}, Texts{"a", "b"}),  // the last end makes no empty line
+          {{"a\r\nb\rc"}, {"a", "b", "c"}},             // three kinds of ends, and none
+          {{"a\r", "\nb"}, {"a", "b"}},                 // one end, torn apart
+          {{"a\r", "", "\n\nb"}, {"a", "", "b"}},
+          {{"a\r\r\nb"}, {"a", "", "b"}},
+          {{"a\0\xFF\n"s}, {"a\0\xFF"s}},
+          {{"12345678\n"}, {"12345678"}},  // just as long as may be
+          {{"123456789", "more\nb\n"}, {"12345678[cut]", "b"}},
+          {{"12345678", "9"}, {"12345678[cut]"}}})
+        EXPECT_EQ(split(pieces), lines) << lines.front();
 }
 
 const Clock::time_point start{};
@@ -105,20 +100,14 @@ void expectNoChildren()
 
 TEST(ProcessRunner, TellsHowAToolEnded)
 {
-    struct Case {
-        std::string_view script;
-        Ending ending;
-        std::string_view because;
-    };
-    for (const Case& c : {Case{"say a\nexit 0", Exited{0}, "sound"},
-                          Case{"say a\nexit 137", Exited{137}, "a status is no signal"},
-                          Case{"say a\nkill 9", Killed{9}, "killed from outside"},
-                          Case{"say a\nkill 11", Killed{11}, "crashed"}}) {
+    for (const auto& [script, ending] : {std::pair("say a\nexit 0", Ending(Exited{0})),
+                                         {"say a\nexit 137", Exited{137}},
+                                         {"say a\nkill 9", Killed{9}}}) {
         Runner runner;
-        const RunResult result = runner.run(c.script);
-        EXPECT_EQ(result.ending, c.ending) << c.because;
-        EXPECT_EQ(result.cause, StopCause::None) << c.because;
-        EXPECT_EQ(runner.lines.output, std::vector<std::string>{"a"}) << c.because;
+        const RunResult result = runner.run(script);
+        EXPECT_EQ(result.ending, ending) << script;
+        EXPECT_EQ(result.cause, StopCause::None) << script;
+        EXPECT_EQ(runner.lines.output, std::vector<std::string>{"a"}) << script;
         expectNoChildren();
     }
 }
@@ -158,22 +147,16 @@ TEST(ProcessRunner, GivesTheToolNothingButItsOwn)
 
 TEST(ProcessRunner, EndsAToolThatWillNotStop)
 {
-    struct Case {
-        std::string_view script;
-        Ending ending;
-        std::string_view because;
-    };
-    for (const Case& c :
-         {Case{"say a\nwait", Killed{SIGINT}, "it heeds the first signal"},
-          Case{"ignore 2\nsay a\nwait", Killed{SIGTERM}, "it heeds the second"},
-          Case{"ignore 2\nignore 15\nsay a\nwait", Killed{SIGKILL}, "it heeds none"}}) {
+    for (const auto& [script, signal] : {std::pair("say a\nwait", SIGINT),
+                                         {"ignore 2\nsay a\nwait", SIGTERM},
+                                         {"ignore 2\nignore 15\nsay a\nwait", SIGKILL}}) {
         Runner runner;
         runner.lines.onLine = [&runner] {
             runner.stop.press();
         };
-        const RunResult result = runner.run(c.script);
-        EXPECT_EQ(result.ending, c.ending) << c.because;
-        EXPECT_EQ(result.cause, StopCause::User) << c.because;
+        const RunResult result = runner.run(script);
+        EXPECT_EQ(result.ending, Ending(Killed{signal})) << script;
+        EXPECT_EQ(result.cause, StopCause::User) << script;
         expectNoChildren();
     }
 }
@@ -184,44 +167,26 @@ TEST(ProcessRunner, BoundsWhatAToolPrints)
         std::string_view script;
         Access access;
         bool ignoresStops;
-        OutputLimits limits;
+        std::size_t mostBytes;
         std::size_t lines;
-        int limitsTold;
         std::string_view because;
     };
+    constexpr std::size_t many = 1U << 30U;
     for (const Case& c : {
-             Case{"flood-lines", Access::ReadOnly, false, {1000, 1U << 20U}, 1000, 0, "lines"},
-             Case{"flood-bytes",
-                  Access::ReadOnly,
-                  false,
-                  {1000, 1U << 20U},
-                  1,
-                  0,
-                  "a line without end is one line, cut"},
-             Case{"flood-lines",
-                  Access::ReadWrite,
-                  false,
-                  {1000, 1U << 30U},
-                  1000,
-                  1,
-                  "a repair runs on unheard before it is ended"},
-             Case{"flood-lines",
-                  Access::ReadWrite,
-                  true,
-                  {100, 1U << 30U},
-                  100,
-                  1,
-                  "also one that ignores being asked"},
+             Case{"flood-lines", Access::ReadOnly, false, many, 1000, "lines"},
+             Case{"flood-bytes", Access::ReadOnly, false, 1U << 20U, 1, "one line, cut"},
+             Case{"flood-lines", Access::ReadWrite, false, many, 1000, "a repair, unheard first"},
+             Case{"flood-lines", Access::ReadWrite, true, many, 1000, "it ignores being asked"},
          }) {
         Runner runner;
         runner.request.access = c.access;
         runner.request.ignoresStops = c.ignoresStops;
-        runner.request.limits = c.limits;
+        runner.request.limits = {1000, c.mostBytes};
         runner.request.graceTimes = {c.ignoresStops ? 24h : 100ms, 100ms, 50ms};
         const RunResult result = runner.run(c.script);
         EXPECT_EQ(result.cause, StopCause::TooMuchOutput) << c.because;
         EXPECT_EQ(runner.lines.output.size(), c.lines) << c.because;
-        EXPECT_EQ(runner.lines.limits, c.limitsTold) << c.because;
+        EXPECT_EQ(runner.lines.limits, c.access == Access::ReadWrite ? 1 : 0) << c.because;
         ASSERT_FALSE(runner.lines.output.empty()) << c.because;
         EXPECT_LE(runner.lines.output.back().size(), longestToolLine) << c.because;
         EXPECT_EQ(result.ending, Ending(Killed{c.ignoresStops ? SIGKILL : SIGINT})) << c.because;

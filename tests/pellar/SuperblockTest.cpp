@@ -13,6 +13,7 @@
 #include <unistd.h>
 
 #include <fstream>
+#include <map>
 #include <random>
 
 namespace {
@@ -48,23 +49,19 @@ TEST(Superblocks, EveryFieldOfAFatBootSectorHasToMakeSense)
         {0, {"\xEB\x3C\x90mkfs.fat\0\2\4\4\0\2\0\2\0\xA0\xF8\x28\0", 24}}, {510, "\x55\xAA"}};
     EXPECT_TRUE(examined("vfat", sound).isRecognized);
     EXPECT_EQ(examined("vfat", sound).volumeBytes, 20 * mebibyte);
-    struct Case {
-        Patch patch;
-        std::string_view because;
-    };
-    for (const Case& c :
-         {Case{{0, "\xFA"}, "no jump: the loader of an MBR"},
-          Case{{11, {"\0\0", 2}}, "sectors of no size"},
-          Case{{11, "\x01\x02"}, "sectors of 513 bytes"},
-          Case{{13, {"\0", 1}}, "clusters of no size"},
-          Case{{13, "\x03"}, "clusters of three sectors"},
-          Case{{14, {"\0\0", 2}}, "no room for itself"}, Case{{16, "\x07"}, "seven tables"},
-          Case{{19, {"\x10\0", 2}}, "shorter than its tables"},
-          Case{{21, "\x12"}, "no medium that there ever was"},
-          Case{{510, "\xAA\x55"}, "no signature"}}) {
+    for (const Patch& patch : {Patch{0, "\xFA"},           // no jump: the loader of an MBR
+                               Patch{11, {"\0\0", 2}},     // sectors of no size
+                               Patch{11, "\x01\x02"},      // sectors of 513 bytes
+                               Patch{13, {"\0", 1}},       // clusters of no size
+                               Patch{13, "\x03"},          // clusters of three sectors
+                               Patch{14, {"\0\0", 2}},     // no room for itself
+                               Patch{16, "\x07"},          // seven tables
+                               Patch{19, {"\x10\0", 2}},   // shorter than its tables
+                               Patch{21, "\x12"},          // no medium that there ever was
+                               Patch{510, "\xAA\x55"}}) {  // no signature
         std::vector<Patch> patches = sound;
-        patches.push_back(c.patch);
-        EXPECT_FALSE(examined("vfat", patches).isRecognized) << c.because;
+        patches.push_back(patch);
+        EXPECT_FALSE(examined("vfat", patches).isRecognized) << patch.offset;
     }
 }
 
@@ -81,59 +78,43 @@ TEST(Superblocks, BelongWhereTheyStand)
 TEST(Superblocks, HugeNumbersDoNotWrapAround)
 {
     const std::string greatest(8, '\xFF');
-    struct Case {
-        std::string_view filesystem;
-        std::vector<Patch> patches;
-    };
-    for (const Case& c :
-         {Case{"xfs", {{0, {"XFSB\0\0\x10\0", 8}}, {8, greatest}, {84, greatest.substr(4)}}},
-          Case{"ntfs",
-               {{3, {"NTFS    \0\2\x08", 11}},
-                {40, "\xFF\xFF\xFF\xFF\xFF\xFF\xFF\x7F"},
-                {64, "\xF6"}}},
-          Case{"ext4",
-               {{1024 + 0x38, "\x53\xEF"},
-                {1024 + 0x60, "\x80"},
-                {1024 + 0x18, "\x06"},
-                {1024 + 0x04, greatest.substr(4)},
-                {1024 + 0x150, greatest.substr(4)}}}}) {
-        const VolumeFacts facts = examined(c.filesystem, c.patches);
-        EXPECT_TRUE(facts.isRecognized) << c.filesystem;
-        EXPECT_EQ(facts.volumeBytes, ~std::uint64_t{0}) << c.filesystem;
+    const std::map<std::string_view, std::vector<Patch>> volumes{
+        {"xfs", {{0, {"XFSB\0\0\x10\0", 8}}, {8, greatest}, {84, greatest.substr(4)}}},
+        {"ntfs", {{3, {"NTFS    \0\2\x08", 11}}, {40, greatest}, {47, "\x7F"}, {64, "\xF6"}}},
+        {"ext4",
+         {{1024 + 0x38, "\x53\xEF"},
+          {1024 + 0x60, "\x80"},
+          {1024 + 0x18, "\x06"},
+          {1024 + 0x04, greatest.substr(4)},
+          {1024 + 0x150, greatest.substr(4)}}}};
+    for (const auto& [filesystem, patches] : volumes) {
+        const VolumeFacts facts = examined(filesystem, patches);
+        EXPECT_TRUE(facts.isRecognized) << filesystem;
+        EXPECT_EQ(facts.volumeBytes, ~std::uint64_t{0}) << filesystem;
     }
 }
 
 TEST(Superblocks, ALostOneOfExtIsFoundInItsFirstBackup)
 {
     const test::TestDirectory workshop;
-    struct Case {
-        std::string blockBytes;
-        std::uint64_t bytes;
-    };
-    for (const Case& c :
-         {Case{"1024", 16 * mebibyte}, Case{"2048", 64 * mebibyte}, Case{"4096", 256 * mebibyte}}) {
-        const auto image = workshop.makeExt("a", c.bytes, {"-b", c.blockBytes});
-        EXPECT_TRUE(examined("ext4", image).hasPrimary) << c.blockBytes;
+    for (const auto& [blockBytes, bytes] :
+         {std::pair("1024", 16 * mebibyte), {"2048", 64 * mebibyte}, {"4096", 256 * mebibyte}}) {
+        const auto image = workshop.makeExt("a", bytes, {"-b", blockBytes});
+        EXPECT_TRUE(examined("ext4", image).hasPrimary) << blockBytes;
         std::fstream(image, std::ios::in | std::ios::out).seekp(1024 + 4) << '\1';
         const VolumeFacts facts = examined("ext4", image);
         EXPECT_TRUE(facts.isRecognized && !facts.hasPrimary) << "the checksum no longer fits";
-        EXPECT_EQ(facts.volumeBytes, c.bytes) << c.blockBytes;
+        EXPECT_EQ(facts.volumeBytes, bytes) << blockBytes;
     }
 }
 
 TEST(Superblocks, WhatIsNoneOfExtIsRefused)
 {
     const test::TestDirectory workshop;
-    struct Case {
-        std::streamoff offset;
-        char byte;
-        std::string_view because;
-    };
-    for (const Case& c : {Case{1024 + 0x18, 7, "blocks of 128 KiB"},
-                          Case{1024 + 0x38, 0x52, "another magic number"}}) {
+    for (const auto& [offset, byte] : {std::pair(1024 + 0x18, '\x07'), {1024 + 0x38, '\x52'}}) {
         const auto image = workshop.makeExt("a", 4 * mebibyte, {"-O", "^metadata_csum"});
-        std::fstream(image, std::ios::in | std::ios::out).seekp(c.offset) << c.byte;
-        EXPECT_FALSE(examined("ext4", image).isRecognized) << c.because;
+        std::fstream(image, std::ios::in | std::ios::out).seekp(offset) << byte;
+        EXPECT_FALSE(examined("ext4", image).isRecognized) << offset;
     }
     EXPECT_FALSE(examined("ext4", {{1024 + 0x38, "\x53\xEF"}}, 2000).isRecognized) << "too short";
 }
@@ -144,12 +125,10 @@ TEST(Superblocks, AnyBytesAreExamined)
     std::mt19937 random(7);
     const test::TestDirectory workshop;
     for (const auto& maker : orvane::test::volumeMakers()) {
-        if (findProgram(maker.command.front(), "/usr/sbin:/usr/bin").empty())
+        const auto image = workshop.makeVolume("disk", maker.filesystem);
+        if (image.empty())
             continue;
-        workshop.write("disk", {});
-        std::filesystem::resize_file(workshop.path("disk"), maker.bytes);
-        workshop.prepare(maker.command, workshop.path("disk"));
-        const FileDescriptor disk(::open(workshop.path("disk").c_str(), O_RDWR | O_CLOEXEC));
+        const FileDescriptor disk(::open(image.c_str(), O_RDWR | O_CLOEXEC));
         const Tool& tool = *toolFor(maker.filesystem);
         for (int i = 0; i < 2000; ++i) {
             const std::uint64_t places[] = {0, 1024, 16384, 16384 + 2048, 16384 + 3072, 65536};

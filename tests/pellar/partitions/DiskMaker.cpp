@@ -2,77 +2,16 @@
 #include "tests/pellar/partitions/DiskMaker.h"
 
 #include "pellar/bytes/Checksums.h"
-#include "pellar/process/Command.h"
-#include "pellar/process/FileDescriptor.h"
 
-#include <fcntl.h>
-#include <spawn.h>
-#include <sys/mman.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
-#include <algorithm>
 #include <fstream>
 #include <map>
 #include <stdexcept>
 
 namespace pellar::test {
-namespace {
-
-std::string contentsOf(int descriptor)
-{
-    std::string text(static_cast<std::size_t>(::lseek(descriptor, 0, SEEK_END)), '\0');
-    const ssize_t count = ::pread(descriptor, text.data(), text.size(), 0);
-    text.resize(static_cast<std::size_t>(std::max<ssize_t>(count, 0)));
-    return text;
-}
-
-void makeFile(const std::filesystem::path& path, std::uint64_t bytes)
-{
-    std::ofstream(path, std::ios::binary | std::ios::trunc).flush();
-    std::filesystem::resize_file(path, bytes);
-}
-
-}  // namespace
-
 Bytes fileBytes(const std::filesystem::path& path)
 {
-    std::ifstream file(path, std::ios::binary);
-    Bytes bytes(std::filesystem::file_size(path));
-    file.read(reinterpret_cast<char*>(bytes.data()), static_cast<std::streamsize>(bytes.size()));
-    if (!file)
-        throw std::runtime_error("cannot read " + path.string());
-    return bytes;
-}
-
-ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input)
-{
-    const FileDescriptor in(::memfd_create("input", MFD_CLOEXEC));
-    const FileDescriptor out(::memfd_create("output", MFD_CLOEXEC));
-    if (::write(in.get(), input.data(), input.size()) != static_cast<ssize_t>(input.size()))
-        return {};
-    ::lseek(in.get(), 0, SEEK_SET);
-    posix_spawn_file_actions_t actions;
-    ::posix_spawn_file_actions_init(&actions);
-    ::posix_spawn_file_actions_adddup2(&actions, in.get(), 0);
-    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 1);
-    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 2);
-    std::vector<char*> words;
-    for (std::string& argument : arguments)
-        words.push_back(argument.data());
-    words.push_back(nullptr);
-    std::string path = "PATH=/usr/sbin:/usr/bin:/sbin:/bin";
-    std::string locale = "LC_ALL=C";
-    char* environment[] = {path.data(), locale.data(), nullptr};
-    const std::string program = findProgram(arguments.front(), "/usr/sbin:/usr/bin:/sbin:/bin");
-    pid_t child = 0;
-    const int error =
-        ::posix_spawn(&child, program.c_str(), &actions, nullptr, words.data(), environment);
-    ::posix_spawn_file_actions_destroy(&actions);
-    int status = 0;
-    if (error != 0 || ::waitpid(child, &status, 0) != child || !WIFEXITED(status))
-        return {};
-    return {WEXITSTATUS(status), contentsOf(out.get())};
+    const std::string bytes = orvane::test::contentsOf(path);
+    return {bytes.begin(), bytes.end()};
 }
 
 // sfdisk waits a quarter of a second after every change, so each disk is made once and copied.
@@ -80,8 +19,7 @@ DiskImage DiskImage::made(const TestDirectory& workshop, std::string_view name, 
                           const std::string& script)
 {
     static std::map<std::string, Bytes> disks;
-    DiskImage image(workshop.path(name));
-    makeFile(image.path(), bytes);
+    const DiskImage image(workshop.makeFile(name, bytes));
     if (const auto known = disks.find(script); known != disks.end()) {
         image.put(0, known->second);
         return image;
@@ -117,22 +55,13 @@ DiskImage DiskImage::smallGPT(const TestDirectory& workshop)
     return image;
 }
 
-DiskImage DiskImage::mbr(const TestDirectory& workshop, std::string_view script, std::string_view name)
+DiskImage DiskImage::mbr(const TestDirectory& workshop, std::string_view script,
+                         std::string_view name)
 {
     return made(workshop, name, 16 * mebibyte, "label: dos\n" + std::string(script));
 }
 
-Bytes DiskImage::bytes() const
-{
-    return fileBytes(path_);
-}
-
-std::uint64_t DiskImage::sectorCount() const
-{
-    return std::filesystem::file_size(path_) / 512;
-}
-
-void DiskImage::put(std::uint64_t offset, ByteView bytes) const
+const DiskImage& DiskImage::put(std::uint64_t offset, ByteView bytes) const
 {
     std::fstream file(path_, std::ios::binary | std::ios::in | std::ios::out);
     file.seekp(static_cast<std::streamoff>(offset));
@@ -140,38 +69,34 @@ void DiskImage::put(std::uint64_t offset, ByteView bytes) const
                static_cast<std::streamsize>(bytes.size()));
     if (!file)
         throw std::runtime_error("cannot prepare the test: " + path_.string());
+    return *this;
 }
 
-void DiskImage::fill(std::uint64_t offset, std::uint64_t length, std::uint8_t value) const
+const DiskImage& DiskImage::flip(std::uint64_t offset) const
 {
-    put(offset, Bytes(length, value));
+    return fill(offset, 1, part(offset, 1).front() ^ 0xFFU);
 }
 
-void DiskImage::flip(std::uint64_t offset) const
-{
-    std::ifstream file(path_, std::ios::binary);
-    file.seekg(static_cast<std::streamoff>(offset));
-    put(offset, Bytes{static_cast<std::uint8_t>(file.get() ^ 0xFF)});
-}
-
-void DiskImage::resize(std::uint64_t bytes) const
+const DiskImage& DiskImage::resize(std::uint64_t bytes) const
 {
     std::filesystem::resize_file(path_, bytes);
+    return *this;
 }
 
-void DiskImage::set(std::uint64_t offset, std::size_t length, std::uint64_t value) const
+const DiskImage& DiskImage::set(std::uint64_t offset, std::size_t length, std::uint64_t value) const
 {
     Bytes number(length);
     putLittleEndian(number, 0, length, value);
-    put(offset, number);
+    return put(offset, number);
 }
 
-void DiskImage::setEntry(std::uint32_t number, std::uint64_t first, std::uint64_t last) const
+const DiskImage& DiskImage::setEntry(std::uint32_t number, std::uint64_t first,
+                                     std::uint64_t last) const
 {
     Bytes place(16);
     putLittleEndian(place, 0, 8, first);
     putLittleEndian(place, 8, 8, last);
-    putIntoEntries((number - 1) * 128ULL + 32, place);
+    return putIntoEntries((number - 1) * 128ULL + 32, place);
 }
 
 Bytes DiskImage::part(std::uint64_t offset, std::uint64_t length) const
@@ -183,15 +108,16 @@ Bytes DiskImage::part(std::uint64_t offset, std::uint64_t length) const
     return bytes;
 }
 
-void DiskImage::putIntoEntries(std::uint64_t offset, ByteView bytes) const
+const DiskImage& DiskImage::putIntoEntries(std::uint64_t offset, ByteView bytes) const
 {
     for (const std::uint64_t header : {std::uint64_t{1}, sectorCount() - 1}) {
         put(littleEndian(part(header * 512, 512), 72, 8) * 512 + offset, bytes);
         seal(header);
     }
+    return *this;
 }
 
-void DiskImage::seal(std::uint64_t headerPlace) const
+const DiskImage& DiskImage::seal(std::uint64_t headerPlace) const
 {
     Bytes header = part(headerPlace * 512, 512);
     const Bytes entries = part(littleEndian(header, 72, 8) * 512,
@@ -199,7 +125,7 @@ void DiskImage::seal(std::uint64_t headerPlace) const
     putLittleEndian(header, 88, 4, crc32(entries));
     putLittleEndian(header, 16, 4, 0);
     putLittleEndian(header, 16, 4, crc32(ByteView(header).first(92)));
-    put(headerPlace * 512, header);
+    return put(headerPlace * 512, header);
 }
 
 contract::DiskReferencePointer wholeDisk(const std::filesystem::path& path)

@@ -15,14 +15,6 @@ inline constexpr std::uint64_t mebibyte = 1U << 20U;
 
 Bytes fileBytes(const std::filesystem::path& path);
 
-struct ToolAnswer {
-    int status = -1;  ///< -1 when the tool is not installed or was killed
-    std::string output;
-};
-
-/// Runs a system tool to its end.
-ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = {});
-
 /// A disk image that real tools have partitioned, and the ways in which it gets damaged. Sectors
 /// have 512 bytes.
 class DiskImage {
@@ -35,23 +27,27 @@ public:
                          std::string_view name = "disk.img");
 
     const std::filesystem::path& path() const { return path_; }
-    Bytes bytes() const;
+    Bytes bytes() const { return fileBytes(path_); }
     Bytes part(std::uint64_t offset, std::uint64_t length) const;
-    std::uint64_t sectorCount() const;
+    std::uint64_t sectorCount() const { return std::filesystem::file_size(path_) / 512; }
 
-    void put(std::uint64_t offset, ByteView bytes) const;
-    void fill(std::uint64_t offset, std::uint64_t length, std::uint8_t value) const;
-    void flip(std::uint64_t offset) const;
-    void resize(std::uint64_t bytes) const;
+    // Each returns the disk itself.
+    const DiskImage& put(std::uint64_t offset, ByteView bytes) const;
+    const DiskImage& fill(std::uint64_t offset, std::uint64_t length, std::uint8_t value) const
+    {
+        return put(offset, Bytes(length, value));
+    }
+    const DiskImage& flip(std::uint64_t offset) const;
+    const DiskImage& resize(std::uint64_t bytes) const;
     /// A number, least significant byte first.
-    void set(std::uint64_t offset, std::size_t length, std::uint64_t value) const;
+    const DiskImage& set(std::uint64_t offset, std::size_t length, std::uint64_t value) const;
 
     /// Changes entry `number` (from 1) of both lists and gives both copies right checksums again.
-    void setEntry(std::uint32_t number, std::uint64_t first, std::uint64_t last) const;
+    const DiskImage& setEntry(std::uint32_t number, std::uint64_t first, std::uint64_t last) const;
     /// Puts bytes into the same place of both lists, and seals them.
-    void putIntoEntries(std::uint64_t offset, ByteView bytes) const;
+    const DiskImage& putIntoEntries(std::uint64_t offset, ByteView bytes) const;
     /// Gives the copy whose header is at this sector right checksums for what stands there.
-    void seal(std::uint64_t headerPlace) const;
+    const DiskImage& seal(std::uint64_t headerPlace) const;
 
 private:
     static DiskImage made(const TestDirectory& workshop, std::string_view name, std::uint64_t bytes,

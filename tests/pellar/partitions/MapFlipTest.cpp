@@ -66,15 +66,13 @@ TEST(MapFlips, EveryByteUnderAChecksumIsMissedAndComesBack)
     MemorySectors disk(sound);
     const std::size_t last = (disk.count() - 1) * 512;
     const std::size_t list = 128UL * 128;
-    struct Range {
-        std::size_t begin;
-        std::size_t length;
-        std::size_t step;
-    };
     // The lists are mostly zeros; a stride that shares no factor with anything visits all columns.
-    for (const Range& range : {Range{512, 92, 1}, Range{last, 92, 1}, Range{1024, 3 * 128, 1},
-                               Range{1024, list, 101}, Range{last - list, list, 101}}) {
-        for (std::size_t at = range.begin; at < range.begin + range.length; at += range.step) {
+    for (const auto& [begin, length, step] : {std::tuple(512UL, 92UL, 1UL),
+                                              {last, 92UL, 1UL},
+                                              {1024UL, 3 * 128UL, 1UL},
+                                              {1024UL, list, 101UL},
+                                              {last - list, list, 101UL}}) {
+        for (std::size_t at = begin; at < begin + length; at += step) {
             disk.bytes[at] ^= 0xFFU;
             const MapReport report = reportOf(disk);
             EXPECT_EQ(report.verdict, MapVerdict::Repairable) << "byte " << at;
@@ -116,10 +114,8 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
                 putLittleEndian(sector, field, field == 12 || field >= 80 ? 4 : 8, value);
                 sealHeader(sector);
                 const Bytes after = repaired(disk);
-                const auto begin = static_cast<std::ptrdiff_t>(64 * 512);
-                const auto end = static_cast<std::ptrdiff_t>(320 * 512);
-                EXPECT_TRUE(
-                    std::equal(sound.begin() + begin, sound.begin() + end, after.begin() + begin))
+                EXPECT_TRUE(std::equal(sound.begin() + 64 * 512, sound.begin() + 320 * 512,
+                                       after.begin() + 64 * 512))
                     << "field " << field << ", value " << value;
             }
         }
@@ -129,40 +125,37 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
 // The power may fail at any moment of a repair: after a write, or with half of one on the disk.
 TEST(MapFlips, AnInterruptedRepairCanAlwaysBeFinished)
 {
-    struct Case {
-        std::string_view because;
-        std::size_t from;
-        std::size_t length;  ///< set to zero
-        std::size_t grownBy;
-    };
     const test::TestDirectory workshop;
     const Bytes sound = DiskImage::smallGPT(workshop).bytes();
     const std::size_t last = sound.size() - 512;
-    for (const Case& c :
-         {Case{"main copy lost", 512, 33UL * 512, 0}, Case{"main list lost", 1024, 512, 0},
-          Case{"backup lost", last - 32UL * 512, 33UL * 512, 0},
-          Case{"everything but the backup lost", 0, 34UL * 512, 0}, Case{"grown", 0, 0, 100},
-          Case{"grown by less than a copy takes", 0, 0, 5},
-          Case{"grown, main copy lost", 512, 33UL * 512, 100},
-          Case{"grown a little, main copy lost", 512, 33UL * 512, 5}}) {
+    // What is set to zero, and by how many sectors the disk has grown.
+    for (const auto& [from, length, grownBy] : {std::tuple(512UL, 33UL * 512, 0UL),
+                                                {1024UL, 512UL, 0UL},
+                                                {last - 32UL * 512, 33UL * 512, 0UL},
+                                                {0UL, 34UL * 512, 0UL},
+                                                {0UL, 0UL, 100UL},
+                                                {0UL, 0UL, 5UL},
+                                                {512UL, 33UL * 512, 100UL},
+                                                {512UL, 33UL * 512, 5UL}}) {
+        SCOPED_TRACE(testing::Message() << from << ' ' << length << ' ' << grownBy);
         MemorySectors disk(sound);
-        std::fill_n(disk.bytes.begin() + static_cast<std::ptrdiff_t>(c.from), c.length,
+        std::fill_n(disk.bytes.begin() + static_cast<std::ptrdiff_t>(from), length,
                     std::uint8_t{0});
-        disk.bytes.resize(sound.size() + c.grownBy * 512);
+        disk.bytes.resize(sound.size() + grownBy * 512);
         const Bytes finished = repaired(disk);
         const PartitionMap map = readPartitionMap(disk, {});
         const auto planned = planRepair(map, reportOn(map), disk);
-        ASSERT_TRUE(planned) << c.because;
+        ASSERT_TRUE(planned);
         for (const SectorWrite& write : planned->writes) {
             const auto place = static_cast<std::ptrdiff_t>(write.first * 512);
             for (std::size_t done = 0; done <= write.after.size(); done += 512) {
                 std::copy_n(write.after.begin(), done, disk.bytes.begin() + place);
                 if (disk.bytes != finished) {
                     EXPECT_EQ(reportOf(disk).verdict, MapVerdict::Repairable)
-                        << c.because << ", sector " << write.first << ", byte " << done;
+                        << "sector " << write.first << ", byte " << done;
                 }
                 EXPECT_TRUE(repaired(disk) == finished)
-                    << c.because << ", sector " << write.first << ", byte " << done;
+                    << "sector " << write.first << ", byte " << done;
             }
         }
     }

@@ -2,7 +2,7 @@
 #include "tests/pellar/permissions/DebianSystem.h"
 
 #include "pellar/packages/Digest.h"
-#include "pellar/process/ChildProcess.h"
+#include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
@@ -15,12 +15,6 @@ namespace pellar::test {
 namespace {
 
 namespace fs = std::filesystem;
-
-void writeFile(const fs::path& path, std::string_view bytes)
-{
-    fs::create_directories(path.parent_path());
-    std::ofstream(path, std::ios::binary) << bytes;
-}
 
 std::string nameOf(const PackageFile& file)
 {
@@ -37,27 +31,13 @@ void make(const fs::path& tree, const PackageFile& file)
     else if (arrow != std::string::npos)
         fs::create_symlink(file.path.substr(arrow + 4), path);
     else
-        writeFile(path, "contents\n");
+        orvane::test::write(path, "contents\n");
     EXPECT_EQ(::lchown(path.c_str(), file.user, file.group), 0);
     if (arrow == std::string::npos)
         ::chmod(path.c_str(), file.mode);
 }
 
 }  // namespace
-
-int runProgram(const std::string& name, std::vector<std::string> arguments)
-{
-    const FileDescriptor sink(::open("/dev/null", O_WRONLY | O_CLOEXEC));
-    const fs::path program = findProgram(name, "/usr/sbin:/usr/bin:/sbin:/bin");
-    if (program.empty())
-        return -1;
-    auto child = ChildProcess::start({program, std::move(arguments)}, {sink.get()});
-    if (!child)
-        return -1;
-    const Ending ending = child->reap();
-    const auto* const exited = std::get_if<Exited>(&ending);
-    return exited != nullptr ? exited->status : -1;
-}
 
 Rights rightsOf(const fs::path& path)
 {
@@ -85,7 +65,7 @@ fs::path DebianSystem::path(std::string_view name) const
 
 void DebianSystem::write(std::string_view name, std::string_view bytes) const
 {
-    writeFile(path(name), bytes);
+    orvane::test::write(path(name), bytes);
 }
 
 fs::path DebianSystem::archiveOf(const std::string& name) const
@@ -100,7 +80,7 @@ void DebianSystem::install(const std::string& name, const std::vector<PackageFil
     const std::string control = "Package: " + name +
                                 "\nVersion: 1:2.0-1\nArchitecture: all\n"
                                 "Maintainer: Nobody <nobody@example.org>\nDescription: test\n";
-    writeFile(tree / "DEBIAN/control", control);
+    orvane::test::write(tree / "DEBIAN/control", control);
     std::string list = "/.\n";
     std::string sums;
     for (const PackageFile& file : files) {
@@ -110,7 +90,7 @@ void DebianSystem::install(const std::string& name, const std::vector<PackageFil
         digester.add("contents\n");
         sums += digester.finish() + "  " + nameOf(file) + '\n';
     }
-    ASSERT_EQ(runProgram("dpkg-deb", {"-b", tree, archiveOf(name)}), 0);
+    ASSERT_EQ(runTool({"dpkg-deb", "-b", tree, archiveOf(name)}).status, 0);
     // dpkg unpacks "bin/x" behind the link; dpkg-deb would put a directory in its place.
     for (const PackageFile& file : files)
         make(path(), file);
@@ -135,11 +115,6 @@ void DebianSystem::writeIndex() const
     write("var/lib/apt/lists/example_main_Packages", index);
 }
 
-contract::DiskReferencePointer DebianSystem::disk() const
-{
-    return mountedAt(path());
-}
-
 contract::DiskReferencePointer mountedAt(const fs::path& root)
 {
     contract::DiskReference disk;
@@ -149,25 +124,6 @@ contract::DiskReferencePointer mountedAt(const fs::path& root)
     disk.filesystem = "ext4";
     disk.mountPoint = root;
     return std::make_shared<const contract::DiskReference>(std::move(disk));
-}
-
-PermissionBench::PermissionBench(const fs::path& store)
-    : JobFixture([&] {
-          JobOptions options;
-          options.permissionReferences = store;
-          return options;
-      }())
-{
-}
-
-contract::ErrorCode PermissionBench::verifyPermissions(const contract::DiskReferencePointer& disk)
-{
-    return finish(tool->beginPermissionsVerifyForDisk(disk));
-}
-
-contract::ErrorCode PermissionBench::repairPermissions(const contract::DiskReferencePointer& disk)
-{
-    return finish(tool->beginPermissionsRepairForDisk(disk));
 }
 
 std::string PermissionBench::problems() const

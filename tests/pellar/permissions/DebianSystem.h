@@ -12,9 +12,6 @@
 
 namespace pellar::test {
 
-/// The program's exit status; -1 when it is not there or was killed.
-int runProgram(const std::string& name, std::vector<std::string> arguments);
-
 /// Mode and owner of a file itself, not of what a link leads to.
 struct Rights {
     mode_t mode = 0;
@@ -24,6 +21,9 @@ struct Rights {
     friend bool operator==(const Rights&, const Rights&) = default;
 };
 Rights rightsOf(const std::filesystem::path& path);
+
+/// A mounted volume, as the host would name it.
+contract::DiskReferencePointer mountedAt(const std::filesystem::path& root);
 
 struct PackageFile {
     std::string path;  ///< "usr/bin/x"; with "/" behind it a directory, with " -> " in it a link
@@ -46,7 +46,7 @@ public:
     std::filesystem::path path(std::string_view name = {}) const;
     std::filesystem::path archiveOf(const std::string& name) const;
     std::filesystem::path store() const { return workshop_.path("store"); }
-    contract::DiskReferencePointer disk() const;
+    contract::DiskReferencePointer disk() const { return mountedAt(path()); }
 
 private:
     TestDirectory workshop_;
@@ -56,17 +56,23 @@ private:
 /// Runs permission jobs.
 struct PermissionBench : JobFixture {
     explicit PermissionBench(const DebianSystem& installed) : PermissionBench(installed.store()) {}
-    explicit PermissionBench(const std::filesystem::path& store);
+    explicit PermissionBench(const std::filesystem::path& store)
+        : JobFixture(with(&JobOptions::permissionReferences, store))
+    {
+    }
 
-    contract::ErrorCode verifyPermissions(const contract::DiskReferencePointer& disk);
-    contract::ErrorCode repairPermissions(const contract::DiskReferencePointer& disk);
+    contract::ErrorCode verifyPermissions(const contract::DiskReferencePointer& disk)
+    {
+        return finish(tool->beginPermissionsVerifyForDisk(disk));
+    }
+    contract::ErrorCode repairPermissions(const contract::DiskReferencePointer& disk)
+    {
+        return finish(tool->beginPermissionsRepairForDisk(disk));
+    }
     /// The problems of all runs so far, with line ends.
     std::string problems() const;
     /// The numbers and other lines that are always shown.
     std::string remarks() const;
 };
-
-/// A mounted volume, as the host would name it.
-contract::DiskReferencePointer mountedAt(const std::filesystem::path& root);
 
 }  // namespace pellar::test

@@ -24,14 +24,12 @@ PathAliases merged()
 
 TEST(PathAliases, LeadToThePathWithoutLinks)
 {
-    struct Case {
-        const char* path;
-        const char* canonical;
-    };
-    for (const Case& c :
-         {Case{"/bin/x", "usr/bin/x"}, Case{"./sbin/x", "usr/bin/x"}, Case{"bin", "usr/bin"},
-          Case{"binary/x", "binary/x"}, Case{"//usr//lib/./x/", "usr/lib/x"}})
-        EXPECT_EQ(merged().canonical(c.path), c.canonical) << c.path;
+    for (const auto& [path, canonical] : {std::pair("/bin/x", "usr/bin/x"),
+                                          {"./sbin/x", "usr/bin/x"},
+                                          {"bin", "usr/bin"},
+                                          {"binary/x", "binary/x"},
+                                          {"//usr//lib/./x/", "usr/lib/x"}})
+        EXPECT_EQ(merged().canonical(path), canonical) << path;
     PathAliases loop;
     loop.add("a", "b");
     loop.add("b", "a");
@@ -40,17 +38,9 @@ TEST(PathAliases, LeadToThePathWithoutLinks)
 
 TEST(ModeText, IsThatOfLs)
 {
-    struct Case {
-        FileKind kind;
-        mode_t mode;
-        const char* text;
-    };
-    for (const Case& c :
-         {Case{FileKind::Regular, 0664, "-rw-rw-r--"}, Case{FileKind::Regular, 04755, "-rwsr-xr-x"},
-          Case{FileKind::Regular, 06644, "-rwSr-Sr--"},
-          Case{FileKind::Directory, 01777, "drwxrwxrwt"},
-          Case{FileKind::Directory, 01770, "drwxrwx--T"}})
-        EXPECT_EQ(modeText(c.kind, c.mode), c.text);
+    EXPECT_EQ(modeText(FileKind::Regular, 06644), "-rwSr-Sr--");
+    EXPECT_EQ(modeText(FileKind::Directory, 01777), "drwxrwxrwt");
+    EXPECT_EQ(modeText(FileKind::Directory, 01770), "drwxrwx--T");
 }
 
 TEST(Comparison, SeesWhatAFileOfItsKindHas)
@@ -70,39 +60,31 @@ TEST(Comparison, SeesWhatAFileOfItsKindHas)
 
 TEST(ScriptMentions, DoubtWhatAScriptMaySet)
 {
-    struct Case {
-        const char* script;
-        const char* path;
-        FileKind kind;
-        bool isConcerned;
-        std::string_view because;
-    };
     constexpr auto regular = FileKind::Regular;
     constexpr auto directory = FileKind::Directory;
-    for (const Case& c : {
-             Case{"chmod 4755 /bin/fusermount3", "usr/bin/fusermount3", regular, true, "by alias"},
-             Case{"echo /bin/x", "usr/bin/x", regular, false, "sets nothing"},
-             Case{"F=/usr/bin/x\nchmod u+s \"$F\"", "usr/bin/x", regular, true, "a variable"},
-             Case{"for f in su mount; do chmod u+s /bin/$f; done", "usr/bin/su", regular, true,
-                  "a loop over names"},
-             Case{"D=/var/lib/x\nchown u $D/y", "var/lib/x/y", regular, true, "a path's end"},
-             Case{"chown -R u:g /var/lib/x", "var/lib/x/deep/file", regular, true, "a whole tree"},
-             Case{"chown -R u:g /var/lib/x", "var/lib/xy", regular, false, "another's name"},
-             Case{"install -m 644 a /etc/b\nls /usr/bin", "usr/bin", directory, false,
-                  "only spoken of"},
-             Case{"chmod 644 /usr/share/x/*.so", "usr/share/x/a.so", regular, true, "a pattern"},
-             Case{"chmod 4755 /usr/bin/$x", "usr/bin", directory, false, "only what is in it"},
-             Case{"chmod \\\n 700 /usr/lib", "usr/lib", directory, true, "a continued line"},
-             Case{"set_perms polkitd root 700 /etc/polkit-1/rules.d\nchown a \"$1\"",
-                  "etc/polkit-1/rules.d", directory, true, "a function"},
-             Case{"dpkg-statoverride --add root g 710 \"/etc/ssl/private\"", "etc/ssl/private",
-                  directory, true, "quoted"},
-             Case{"D=/var/lib/x\nchown u $D/y", "var/lib/x/yy", regular, false, "another's end"},
-             Case{"setcap cap_net_raw+ep /bin/ping", "usr/bin/ping", regular, true, "capabilities"},
-         }) {
+    const std::string inLoop = "for f in su mount; do chmod u+s /bin/$f; done";
+    const std::string inFunction =
+        "set_perms polkitd root 700 /etc/polkit-1/rules.d\nchown a \"$1\"";
+    const std::string override = "dpkg-statoverride --add root g 710 \"/etc/ssl/private\"";
+    for (const auto& [script, path, kind, isConcerned] :
+         {std::tuple(std::string("chmod 4755 /bin/su"), "usr/bin/su", regular, true),
+          {"echo /bin/x", "usr/bin/x", regular, false},
+          {"F=/usr/bin/x\nchmod u+s \"$F\"", "usr/bin/x", regular, true},
+          {inLoop, "usr/bin/su", regular, true},
+          {"D=/var/lib/x\nchown u $D/y", "var/lib/x/y", regular, true},
+          {"D=/var/lib/x\nchown u $D/y", "var/lib/x/yy", regular, false},
+          {"chown -R u:g /var/lib/x", "var/lib/x/deep/file", regular, true},
+          {"chown -R u:g /var/lib/x", "var/lib/xy", regular, false},
+          {"install -m 644 a /etc/b\nls /usr/bin", "usr/bin", directory, false},
+          {"chmod 644 /usr/share/x/*.so", "usr/share/x/a.so", regular, true},
+          {"chmod 4755 /usr/bin/$x", "usr/bin", directory, false},
+          {"chmod \\\n 700 /usr/lib", "usr/lib", directory, true},
+          {inFunction, "etc/polkit-1/rules.d", directory, true},
+          {override, "etc/ssl/private", directory, true},
+          {"setcap cap_net_raw+ep /bin/ping", "usr/bin/ping", regular, true}}) {
         ScriptMentions mentions;
-        mentions.add(c.script, merged());
-        EXPECT_EQ(mentions.mayConcernOwn(c.path, c.kind), c.isConcerned) << c.because;
+        mentions.add(script, merged());
+        EXPECT_EQ(mentions.mayConcernOwn(path, kind), isConcerned) << script << ' ' << path;
     }
 }
 
@@ -113,14 +95,10 @@ TEST(TemporaryFileRules, ConcernWhatTheySet)
         "# a comment\nd /run/a 1777 root root 10d -\nd /var/b - - -\nz /etc/c* 0600 - -\n"
         "Z /var/log/d 0750\nx /tmp/e 0700\nf+ \"/etc/f\" 0644 root root\n",
         {});
-    struct Case {
-        const char* path;
-        bool isConcerned;
-    };
-    for (const Case& c : {Case{"run/a", true}, Case{"var/b", false}, Case{"etc/cat", true},
-                          Case{"etc/c/x", false}, Case{"var/log/d/deep/x", true},
-                          Case{"tmp/e", false}, Case{"etc/f", true}, Case{"etc", false}})
-        EXPECT_EQ(rules.concern(c.path), c.isConcerned) << c.path;
+    for (const char* const path : {"run/a", "etc/cat", "var/log/d/deep/x", "etc/f"})
+        EXPECT_TRUE(rules.concern(path)) << path;
+    for (const char* const path : {"var/b", "etc/c/x", "tmp/e", "etc"})
+        EXPECT_FALSE(rules.concern(path)) << path;
 }
 
 TEST(DpkgStatus, TellsWhatIsThere)

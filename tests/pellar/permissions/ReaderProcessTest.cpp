@@ -84,28 +84,21 @@ TEST(ReaderProcess, ReachesNothingButTheFilesItIsGiven)
 TEST(ReaderProcess, EndsWithASentenceWhateverItDoes)
 {
     const test::TestDirectory workshop;
-    struct Case {
-        Reading reading;
-        std::string_view because;
+    const Reading crash = [](auto&&...) -> std::optional<References> {
+        ::abort();
     };
-    for (const Case& c :
-         {Case{
-              [](const auto&, const auto&, const auto&) -> std::optional<References> { ::abort(); },
-              "a crash"},
-          Case{[](const auto&, const auto&, const auto&) {
-                   return std::optional(saying(std::string(1U << 20U, 'x')));
-               },
-               "no path is so long"},
-          Case{[](const auto&, const auto&, const auto&) -> std::optional<References> {
-                   std::string all;
-                   for (;;)
-                       all.append(1U << 24U, 'x');
-               },
-               "all memory"}}) {
+    const Reading longPath = [](auto&&...) {
+        return std::optional(saying(std::string(1U << 20U, 'x')));
+    };
+    const Reading allMemory = [](auto&&...) -> std::optional<References> {
+        for (std::string all;;)
+            all.append(1U << 24U, 'x');
+    };
+    for (const Reading& reading : {crash, longPath, allMemory}) {
         StopSwitch stop;
-        const auto answer = readIn(workshop.path(""), c.reading, stop);
-        ASSERT_TRUE(!answer) << c.because;
-        EXPECT_FALSE(answer.error().isEmpty()) << c.because;
+        const auto answer = readIn(workshop.path(""), reading, stop);
+        ASSERT_TRUE(!answer);
+        EXPECT_FALSE(answer.error().isEmpty());
     }
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1) << "nothing is left to be reaped";
 }
