@@ -24,15 +24,6 @@ bool limit(__rlimit_resource resource, unsigned long most) noexcept
     return ::setrlimit(resource, &now) == 0;
 }
 
-bool limitAddresses([[maybe_unused]] std::uint64_t bytes) noexcept
-{
-#if defined(__SANITIZE_ADDRESS__)
-    return true;  // the sanitizer's shadow takes terabytes of addresses, and no memory
-#else
-    return limit(RLIMIT_AS, bytes);
-#endif
-}
-
 bool becomeNobody() noexcept
 {
     return ::geteuid() != 0 || (::setgroups(0, nullptr) == 0 &&
@@ -46,7 +37,7 @@ bool becomeNobody() noexcept
 // (prctl(2)).
 bool reduceRights(const ReducedLimits& limits) noexcept
 {
-    return limitAddresses(limits.addressSpace) && limit(RLIMIT_CPU, limits.processorTime) &&
+    return limit(RLIMIT_AS, limits.addressSpace) && limit(RLIMIT_CPU, limits.processorTime) &&
            limit(RLIMIT_FSIZE, limits.fileBytes) && limit(RLIMIT_NOFILE, limits.descriptors) &&
            limit(RLIMIT_CORE, 0) && becomeNobody() && ::prctl(PR_SET_DUMPABLE, 0) == 0 &&
            ::prctl(PR_SET_NO_NEW_PRIVS, 1, 0, 0, 0) == 0 && ::prctl(PR_SET_PDEATHSIG, SIGKILL) == 0;
