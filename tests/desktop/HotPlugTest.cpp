@@ -2,10 +2,9 @@
 #include "tests/desktop/WindowFixture.h"
 
 #include "tests/support/LoopDevice.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <sys/mount.h>
-#include <unistd.h>
 
 namespace orvane::desktop::test {
 namespace {
@@ -29,8 +28,6 @@ TEST_F(HotPlugTest, TheListFollowsADeviceWithoutARescan)
     const std::string image = makeImage("plugged");
     openWithSystemDisks();
     LoopDevice device(image);
-    if (device.name().empty())
-        GTEST_SKIP() << "no loop device can be set up here";
     ASSERT_TRUE(waitUntil(
         [&] { return cell(device.name(), DiskColumn::Name).starts_with("plugged (loop"); }));
 

@@ -3,7 +3,7 @@
 #include "orvane/support/udisks/UDisks.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/LoopDevice.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QMenu>
 
@@ -27,8 +27,6 @@ protected:
         if (const char* const obstacle = LoopDevice::obstacle())
             GTEST_SKIP() << obstacle;
         device_ = std::make_unique<LoopDevice>(makeImage("volume"));
-        if (device_->name().empty())
-            GTEST_SKIP() << "no loop device can be set up here";
         if (asked() == Refusal::Kind::NoService)
             GTEST_SKIP() << "no UDisks2 runs here";
         ASSERT_TRUE(waitUntil([&] { return asked() == Refusal::Kind::AlreadySo; }));

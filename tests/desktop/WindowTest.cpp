@@ -2,12 +2,11 @@
 #include "tests/desktop/WindowFixture.h"
 
 #include "orvane/desktop/toolkit/Text.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QApplication>
 #include <QClipboard>
 #include <QMimeData>
-#include <QTest>
 
 #include <fstream>
 
@@ -159,7 +158,7 @@ TEST_F(WindowTest, TheMapOfAnImageIsVerifiedAndRepaired)
     takeSheet();
     command("repairMap").trigger();
     ASSERT_TRUE(waitForJob());
-    EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}), 0);
+    EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}).status, 0);
 }
 
 TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)

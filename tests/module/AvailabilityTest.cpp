@@ -104,16 +104,6 @@ TEST(ButtonDecision, FollowsTheRulesDiskByDisk)
         EXPECT_EQ(decide(c.disks), c.expected) << c.because;
 }
 
-TEST_F(OVFXWTest, ReasonsAreSentencesForOneAndForSeveral)
-{
-    EXPECT_EQ(reason(0, false), "");
-    EXPECT_EQ(reason(10, true), "");
-    EXPECT_EQ(reason(7, false), "Not available for the selected disk.");
-    EXPECT_EQ(reason(5, true), "Not available for one or more of the selected disks.");
-    for (int code = 1; code <= 9; ++code)
-        EXPECT_NE(reason(code, true), "") << code;
-}
-
 TEST_F(OVFXWTest, AButtonStopsItsOwnJobAndSaysSo)
 {
     struct Case {

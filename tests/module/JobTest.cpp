@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/history/CompletionReport.h"
 #include "tests/module/ModuleTest.h"
 
 namespace fixwell {
@@ -45,21 +44,6 @@ TEST_F(OVFXWTest, WholeDisksAreQueuedForTheirPartitionMapAlone)
     module->verifyDisk(nullptr);
     EXPECT_FALSE(host.has("verify map disk"));
     EXPECT_EQ(action(), FXWActionNone);
-}
-
-TEST_F(OVFXWTest, EntriesCarryWhatTheJobNeedsToKnow)
-{
-    const auto disk = addDisk("a");
-    disk->name = "Data";
-    disk->mount = "/mnt";
-    disk->fileSystem.type = "qvfs";
-    select(disk);
-    module->repairDisk(nullptr);
-    const Dictionary entry = inflightItem();
-    EXPECT_EQ(entry.size(), 7U);
-    EXPECT_EQ(entry.integer(kEntryAction), 6);
-    EXPECT_EQ(entry.integer(kFXW_OperationType), 2);
-    EXPECT_TRUE(entry.boolean(kEntryIsQVFS));
 }
 
 TEST_F(OVFXWTest, StartupDiskWarningAsksBeforeAVerification)
@@ -207,13 +191,16 @@ TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
         bool isBoot;
         bool isHome;
         ErrorCode shown;
+        std::string_view reported;
     };
-    for (const Case& c : {Case{FXWActionVerifyDisk, true, false, -19997},
-                          Case{FXWActionVerifyDisk, false, true, -19997},
-                          Case{FXWActionVerifyDisk, false, false, -19998},
-                          Case{FXWActionRepairDisk, true, false, -19996},
-                          Case{FXWActionVerifyPermissions, false, true, -19998},
-                          Case{FXWActionRepairPermissions, true, false, -19997}}) {
+    for (const Case& c :
+         {Case{FXWActionVerifyDisk, true, false, -19997, "kOVOP_VerifyDiskKey"},
+          Case{FXWActionVerifyDisk, false, true, -19997, "kOVOP_VerifyDiskKey"},
+          Case{FXWActionVerifyDisk, false, false, -19998, "kOVOP_VerifyDiskKey"},
+          Case{FXWActionRepairDisk, true, false, -19996, "kOVOP_RepairDiskKey"},
+          Case{FXWActionVerifyPermissions, false, true, -19998, "kOVOP_VerifyDiskPermissionsKey"},
+          Case{FXWActionRepairPermissions, true, false, -19997,
+               "kOVOP_RepairDiskPermissionsKey"}}) {
         const auto disk = addDisk("d" + std::to_string(host.disks.size()));
         disk->boot = c.isBoot;
         disk->home = c.isHome;
@@ -225,6 +212,7 @@ TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
         module->perform(selectors[c.action], nullptr);
         EXPECT_NE(linesOf(disk)[1].find("error " + std::to_string(c.shown)), std::string::npos)
             << c.action << " " << linesOf(disk)[1];
+        EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), c.reported);
     }
 }
 
@@ -339,49 +327,13 @@ TEST_F(OVFXWTest, OneReportAndOneWarningPerJob)
     EXPECT_EQ(linesOf(second).back(), "\n");
     EXPECT_TRUE(host.has("mount b with children")) << "a failed disk is mounted at once";
     EXPECT_FALSE(host.has("mount a with children"));
-}
-
-TEST(CompletionReport, NamesTheFirstEntryAndItsAction)
-{
-    struct Case {
-        FXWAction action;
-        std::string_view key;
-    };
-    const auto disk = std::make_shared<testing::FakeDisk>("a");
-    for (const Case& c : {Case{FXWActionVerifyPermissions, "kOVOP_VerifyDiskPermissionsKey"},
-                          Case{FXWActionRepairPermissions, "kOVOP_RepairDiskPermissionsKey"},
-                          Case{FXWActionRepairPartitionMap, "kOVOP_VerifyDiskKey"},
-                          Case{FXWActionVerifyDisk, "kOVOP_VerifyDiskKey"},
-                          Case{FXWActionRepairDisk, "kOVOP_RepairDiskKey"}})
-        EXPECT_EQ(makeCompletionReport(Array::of({makeActionListEntry(disk, c.action)}))
-                      .string(kOVOP_ActionTypeKey),
-                  c.key);
-}
-
-TEST(Warnings, TheFirstDiskOperationWithAWarningSpeaks)
-{
-    const auto entry = [](FXWOperationType type, Value warning) {
-        const Dictionary made = Dictionary::of(
-            {{kFXW_OperationType, static_cast<int>(type)}, {kEntryPostWarningTitle, "title"}});
-        made.set(kEntryPostWarning, std::move(warning));
-        return made;
-    };
-    struct Case {
-        Array completed;
-        std::optional<PostedWarning> expected;
-        std::string_view because;
-    };
-    for (const Case& c :
-         {Case{Array::of({entry(FXWOperationRepairPermissions, "w")}), std::nullopt,
-               "permission runs never warn"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, {}), entry(FXWOperationRepairDisk, "x"),
-                          entry(FXWOperationRepairDisk, "y")}),
-               PostedWarning{"title", "x"}, "the first"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, "")}), PostedWarning{},
-               "an empty warning still closes the job with an empty alert"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, ""), entry(FXWOperationVerifyDisk, {})}),
-               std::nullopt, "only the last entry's counts then"}})
-        EXPECT_EQ(warningToPost(c.completed), c.expected) << c.because;
+    host.journal.clear();
+    module->repairPermissions(nullptr);
+    for (const auto& disk : {first, second, third})
+        finish(disk, kPLErrorToolFailed);
+    EXPECT_TRUE(std::ranges::none_of(host.journal, [](const auto& entry) {
+        return entry.starts_with("alert");
+    })) << "permission runs never warn";
 }
 
 }  // namespace fixwell

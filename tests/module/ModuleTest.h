@@ -114,10 +114,6 @@ protected:
     }
     Array historyOfSelection() const { return module->allFsckHistoryOfSelection(); }
     void appendMessage(std::string_view text) { module->appendTitleToMessageText(text); }
-    std::string reason(std::int32_t code, bool multiple)
-    {
-        return module->reasonString(code, multiple);
-    }
     void fileAsCompleted(const Dictionary& entry) { module->addDiskToCompletedList(entry); }
     OVDiskPointer inflightDisk() const { return module->searchForInflightDisk(); }
 

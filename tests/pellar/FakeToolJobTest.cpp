@@ -230,6 +230,7 @@ TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
     fixture.repair();
     const test::Listener& heard = fixture.library.listener;
     EXPECT_EQ(heard.verdict, "damaged") << "it never says that it has changed anything";
+    EXPECT_TRUE(heard.hasPlainLine("The volume “Disk” could not be repaired."));
     EXPECT_EQ(heard.textsOf(contract::kFsckError).size(), 2U)
         << "once before the repair, and once for what is left";
     EXPECT_EQ(heard.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";

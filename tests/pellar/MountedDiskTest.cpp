@@ -28,12 +28,10 @@ class MountedDisk : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "mounting needs root";
+        if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
         device_ =
             std::make_unique<orvane::test::LoopDevice>(directory_.makeExt("disk", 16U << 20U));
-        if (device_->name().empty())
-            GTEST_SKIP() << "the system gives no loop device";
         for (const char* name : {"place", "other"})
             fs::create_directory(directory_.path(name));
         if (::mount(device_->name().c_str(), place().c_str(), "ext4",

@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/loop/Notifications.h"
 #include "pellar/mounts/MountTable.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 #include <unistd.h>
@@ -12,7 +12,7 @@
 namespace orvane {
 namespace {
 
-using test::TemporaryDirectory;
+using test::TestDirectory;
 namespace fs = std::filesystem;
 
 DiskTree tree(const std::string& identifier, std::vector<DiskTree> children = {})
@@ -127,40 +127,20 @@ TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)
     EXPECT_EQ(mounted, "sda2 ");
 }
 
-TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
-{
-    const auto record = [](int number) {
-        return contract::Dictionary::of({{contract::Name("n"), number}});
-    };
-    const auto disk = Disk::make(tree("sda", {tree("sda1"), tree("sda2")}), {});
-    const auto shown = [&] {
-        return contract::Value(disk->fsckHistory()).description();
-    };
-    disk->fsckHistoryNoChildren().append(record(1));
-    disk->parts()[1]->fsckHistoryNoChildren().append(record(3));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
-    disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 3}, {n = 2})") << "the newest is the last";
-    disk->parts()[0]->clearFsckHistory();
-    disk->parts()[0]->fsckHistoryNoChildren().append(record(4));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 4}, {n = 3})") << "as many as before, but others";
-    EXPECT_TRUE(disk->clearFsckHistory());
-    EXPECT_FALSE(disk->clearFsckHistory()) << "nothing was left";
-}
-
 TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 {
-    const TemporaryDirectory machine;
+    const TestDirectory machine;
     const auto device = [&](const std::string& name, const char* number, const char* size) {
-        test::write(machine.path / "sys" / name / "dev", std::string(number) + "\n");
-        test::write(machine.path / "sys" / name / "size", std::string(size) + "\n");
+        test::write(machine.path() / "sys" / name / "dev", std::string(number) + "\n");
+        test::write(machine.path() / "sys" / name / "size", std::string(size) + "\n");
     };
     device("sda", "8:0", "2048");
     device("sda/sda1", "8:1", "1024");
     device("sda/sda10", "8:10", "2");
     device("sda/sda2", "8:2", "1024");
     for (const char* const number : {"1", "2", "10"})
-        test::write(machine.path / "sys/sda" / ("sda" + std::string(number)) / "partition", number);
+        test::write(machine.path() / "sys/sda" / ("sda" + std::string(number)) / "partition",
+                    number);
     test::write(machine / "sys/sda/device/model", "Model \x1b[1m X  \n");
     device("loop0", "7:0", "0");
     device("zram0", "252:0", "4096");
@@ -193,11 +173,11 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 
 TEST(DiskLookup, ABadNameGetsOneClearSentence)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "empty.img", "");
     test::write(directory / "secret.img", "x");
     fs::permissions(directory / "secret.img", fs::perms::none);
-    const std::string path = directory.path.native() + "/";
+    const std::string path = directory.path().native() + "/";
 
     struct Case {
         std::string name;
@@ -208,7 +188,7 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
           Case{path + "empty.img", "the file is empty"},
           Case{path + "secret.img", "Permission denied"},
           Case{"/dev/null", "it is neither a disk nor a disk image"},
-          Case{directory.path, "this directory is no mount point"},
+          Case{directory.path(), "this directory is no mount point"},
           Case{"/proc", "no disk is mounted on this directory"},
           Case{"LABEL=", "no disk has this label"}, Case{"UUID=1234", "no disk has this UUID"}}) {
         if (c.reason == "Permission denied" && ::geteuid() == 0)
@@ -223,14 +203,14 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
 
 TEST(DiskLookup, FindsByEveryKindOfName)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "a.img", std::string(512, '\0'));
     fs::create_symlink("a.img", directory / "link");
     Host host;
     DiskTree volume = tree("/dev/x1");
     volume.facts.label = "Hostile \x1b[2J %s";
     volume.facts.uuid = "u-1";
-    volume.facts.mountPoint = directory.path;
+    volume.facts.mountPoint = directory.path();
     DiskTree twin = tree("/dev/x2");
     twin.facts.uuid = "u-2";
     DiskTree other = tree("/dev/x3");
@@ -239,7 +219,7 @@ TEST(DiskLookup, FindsByEveryKindOfName)
     const Translator translator;
     DiskLookup lookup(host.controller, translator);
     for (const std::string& name : {std::string("/dev/x1"), std::string("LABEL=Hostile \x1b[2J %s"),
-                                    std::string("UUID=u-1"), directory.path.native()}) {
+                                    std::string("UUID=u-1"), directory.path().native()}) {
         const auto found = lookup.find(name);
         ASSERT_TRUE(found) << found.error().message;
         EXPECT_EQ((*found)->diskIdentifier(), "/dev/x1");

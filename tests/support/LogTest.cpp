@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "orvane/support/files/ActivityLog.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
@@ -8,7 +8,7 @@ namespace orvane {
 namespace {
 
 using test::contentsOf;
-using test::TemporaryDirectory;
+using test::TestDirectory;
 
 TEST(LogText, NothingInALogCommandsATerminal)
 {
@@ -33,9 +33,9 @@ TEST(LogText, NothingInALogCommandsATerminal)
 
 TEST(ActivityLog, EntriesWithAndWithoutLineEnds)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     {
-        ActivityLog log({directory.path}, [](const std::string& text) { ADD_FAILURE() << text; });
+        ActivityLog log({directory.path()}, [](const std::string& text) { ADD_FAILURE() << text; });
         log.logPriorityWithEOL("one", 0, true);
         log.logPriorityWithEOL("two ", 0, false);
         log.logPriorityWithEOL("halves", 0, true);
@@ -51,8 +51,8 @@ TEST(ActivityLog, EntriesWithAndWithoutLineEnds)
 
 TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
 {
-    const TemporaryDirectory directory;
-    ActivityLog log({directory.path, contract::OVLog::error}, {});
+    const TestDirectory directory;
+    ActivityLog log({directory.path(), contract::OVLog::error}, {});
     log.ov_log(contract::OVLog::trace, 0, "unheard");
     log.ov_log(contract::OVLog::error, 0, "bad \x1b[31mthing %s\n");
     const std::string text = contentsOf(directory / "fixwell.log");
@@ -62,8 +62,8 @@ TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
 
 TEST(ActivityLog, NeverGrowsWithoutBound)
 {
-    const TemporaryDirectory directory;
-    ActivityLog::Options options{directory.path};
+    const TestDirectory directory;
+    ActivityLog::Options options{directory.path()};
     options.limits = {200'000, 2};
     {
         ActivityLog log(options, [](const std::string& text) { ADD_FAILURE() << text; });
@@ -71,7 +71,7 @@ TEST(ActivityLog, NeverGrowsWithoutBound)
             log.logPriorityWithEOL("a line of the checking tool", 0, true);
     }
     std::uintmax_t bytes = 0;
-    for (const auto& file : std::filesystem::directory_iterator(directory.path))
+    for (const auto& file : std::filesystem::directory_iterator(directory.path()))
         bytes += file.file_size();
     EXPECT_LE(bytes, 3 * 200'000U);
     EXPECT_GE(bytes, 2 * 100'000U) << "the old files hold what was before";
@@ -80,7 +80,7 @@ TEST(ActivityLog, NeverGrowsWithoutBound)
 TEST(ActivityLog, AFullDiskIsSaidOnceAndOverlooked)
 {
     for (const std::string_view trouble : {"a full disk", "a file in the way"}) {
-        const TemporaryDirectory directory;
+        const TestDirectory directory;
         // Every write to /dev/full answers that there is no space left (full(4)), but a link in
         // the log's place is refused before that.
         if (trouble == "a full disk")
@@ -88,7 +88,7 @@ TEST(ActivityLog, AFullDiskIsSaidOnceAndOverlooked)
         else
             test::write(directory / "file", "");
         int warnings = 0;
-        ActivityLog log({trouble == "a full disk" ? directory.path : directory / "file"},
+        ActivityLog log({trouble == "a full disk" ? directory.path() : directory / "file"},
                         [&](const std::string&) { ++warnings; });
         for (int i = 0; i < 3; ++i) {
             log.log("text\n");

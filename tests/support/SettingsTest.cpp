@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/XDGPaths.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
@@ -12,7 +12,7 @@ namespace orvane {
 namespace {
 
 using test::contentsOf;
-using test::TemporaryDirectory;
+using test::TestDirectory;
 
 TEST(XDGPaths, VariablesHomesAndNothingAtAll)
 {
@@ -62,7 +62,7 @@ struct Settings {
 
 TEST(SettingsFile, KeepsValuesAndTheirKinds)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "new/settings.json", {}};
     settings.open().setObjectForKey(true, "flag");
     settings.open().setObjectForKey(7, "number");
@@ -81,7 +81,7 @@ TEST(SettingsFile, KeepsValuesAndTheirKinds)
 
 TEST(SettingsFile, AnotherProgramsChangeIsKept)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "settings.json", {}};
     SettingsFile mine = settings.open();
     settings.open().setObjectForKey(1, "theirs");
@@ -96,7 +96,7 @@ TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
          {std::string("{\"a\": tru"), std::string("[1, 2]"), std::string(), std::string("\xFF\xFE"),
           std::string("{\"a\":{\"dictionary\":[3]}}"),
           "{\"a\":" + deep + std::string(deep.size(), ']') + "}"}) {
-        const TemporaryDirectory directory;
+        const TestDirectory directory;
         Settings settings{directory / "settings.json", {}};
         test::write(settings.file, broken);
         SettingsFile read = settings.open();
@@ -109,7 +109,7 @@ TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
 
 TEST(SettingsFile, WhereNothingCanBeWrittenTheyHoldInMemory)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "file", "in the way");
     Settings settings{directory / "file/settings.json", {}};
     SettingsFile mine = settings.open();
@@ -121,7 +121,7 @@ TEST(SettingsFile, WhereNothingCanBeWrittenTheyHoldInMemory)
 
 TEST(SettingsFile, AReplacedFileIsNeverPartlyThere)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "settings.json", {}};
     SettingsFile mine = settings.open();
     mine.setObjectForKey("old", "a");
@@ -129,7 +129,7 @@ TEST(SettingsFile, AReplacedFileIsNeverPartlyThere)
     std::filesystem::create_hard_link(settings.file, link);
     mine.setObjectForKey("new", "a");
     EXPECT_NE(contentsOf(link).find("old"), std::string::npos) << "written beside, not into it";
-    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory.path), {}), 2)
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory.path()), {}), 2)
         << "no temporary file is left";
 }
 

@@ -2,7 +2,7 @@
 // Mounting, ejecting and attaching as root where there is no UDisks2.
 
 #include "tests/support/LoopDevice.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 #include "tests/terminal/ProgramTest.h"
 
 #include <fstream>

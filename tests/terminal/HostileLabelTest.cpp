@@ -18,19 +18,7 @@ const std::vector<std::pair<std::string, std::string_view>> hostileLabels{
     {"appears to be OK", "as near to a success as fits"},
 };
 
-class HostileLabelTest : public ProgramTest {
-protected:
-    /// No record calls it a success.
-    static void expectDamage(const RunResult& result, std::string_view because)
-    {
-        EXPECT_EQ(result.status, 4) << because << result.output << result.errors;
-        EXPECT_FALSE(holdsControls(result.output)) << because << result.output;
-        const Events events(result.output);
-        EXPECT_EQ(events.recordsWith("needs to be repaired.").size(), 1U) << because;
-        for (const auto& record : events.named("record"))
-            EXPECT_NE(record["type"], "SUCCESS") << because << record;
-    }
-};
+using HostileLabelTest = ProgramTest;
 
 // People look at events too; JSON can say every character in letters.
 TEST_F(HostileLabelTest, NothingOfItReachesTheTerminalOrPassesForASuccess)
@@ -39,16 +27,22 @@ TEST_F(HostileLabelTest, NothingOfItReachesTheTerminalOrPassesForASuccess)
     for (const auto& [label, because] : hostileLabels) {
         // In sixteen bytes of the superblock, which has no checksum here.
         patch(image, 1024 + 120, label + std::string(16 - label.size(), '\0'));
-        expectDamage(run({"verify", "--details", "--json", "image"}), because);
+        const RunResult result = run({"verify", "--details", "--json", "image"});
+        EXPECT_EQ(result.status, 4) << because << result.output << result.errors;
+        EXPECT_FALSE(holdsControls(result.output)) << because << result.output;
+        const Events events(result.output);
+        EXPECT_EQ(events.recordsWith("needs to be repaired.").size(), 1U) << because;
+        for (const auto& record : events.named("record"))
+            EXPECT_NE(record["type"], "SUCCESS") << because << record;
         for (const std::vector<std::string>& arguments :
              {std::vector<std::string>{"verify", "--details", "--log-level=3", "--trace", "image"},
               {"list", "image"},
               {"list", "--json", "image"},
               {"history", "image"},
               {"history", "--json", "image"}}) {
-            const RunResult result = run(arguments);
-            EXPECT_FALSE(holdsControls(result.output)) << because << "\n" << result.output;
-            EXPECT_FALSE(holdsControls(result.errors)) << because << "\n" << result.errors;
+            const RunResult other = run(arguments);
+            EXPECT_FALSE(holdsControls(other.output)) << because << "\n" << other.output;
+            EXPECT_FALSE(holdsControls(other.errors)) << because << "\n" << other.errors;
         }
         std::string screen = runOnTerminal({"verify", "--details", "image"}).output;
         for (const std::string_view own :
@@ -56,16 +50,6 @@ TEST_F(HostileLabelTest, NothingOfItReachesTheTerminalOrPassesForASuccess)
             for (std::size_t at; (at = screen.find(own)) != std::string::npos;)
                 screen.erase(at, own.size());
         EXPECT_FALSE(holdsControls(screen)) << because << "\n" << screen;
-    }
-}
-
-// A file name has room for a whole sentence.
-TEST_F(HostileLabelTest, AFileNameThatSaysItIsWellIsNoSuccess)
-{
-    for (const std::string name :
-         {"The volume appears to be OK.", "x was repaired successfully."}) {
-        makeDamagedVolume(name);
-        expectDamage(run({"verify", "--details", "--json", name}), name);
     }
 }
 

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/terminal/ProgramTest.h"
 
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <sys/prctl.h>
 #include <sys/wait.h>
@@ -10,21 +10,9 @@
 #include <csignal>
 #include <cstdlib>
 #include <fstream>
-#include <stdexcept>
 #include <thread>
 
 namespace orvane::test {
-namespace {
-
-/// Fails the test that cannot be prepared, loudly.
-void prepareWith(const std::vector<std::string>& arguments)
-{
-    if (const int status = runTool(arguments); status != 0)
-        throw std::runtime_error("cannot prepare the test: " + arguments.front() + " answered " +
-                                 std::to_string(status));
-}
-
-}  // namespace
 
 // A sanitizer's settings belong to the machine, everything else to the test.
 ProgramTest::ProgramTest()
@@ -56,7 +44,7 @@ Launch ProgramTest::launch(std::vector<std::string> arguments) const
     Launch started;
     started.arguments = std::move(arguments);
     started.environment = environment_;
-    started.directory = directory_.path;
+    started.directory = directory_.path();
     return started;
 }
 
@@ -72,27 +60,10 @@ RunResult ProgramTest::runOnTerminal(std::vector<std::string> arguments) const
     return Program(started).finish();
 }
 
-std::filesystem::path ProgramTest::makeVolume(std::string_view name, std::uint64_t bytes,
-                                              const std::vector<std::string>& options) const
-{
-    write(path(name), {});
-    std::filesystem::resize_file(path(name), bytes);
-    std::vector<std::string> arguments{"mke2fs", "-q", "-F", "-t", "ext4"};
-    arguments.insert(arguments.end(), options.begin(), options.end());
-    arguments.push_back(path(name));
-    prepareWith(arguments);
-    return path(name);
-}
-
 // Without marks of unused inodes all tables are read; they are holes and cost no room.
 std::filesystem::path ProgramTest::makeSlowVolume(std::string_view name) const
 {
     return makeVolume(name, 6144 * mebibyte, {"-O", "^metadata_csum,^uninit_bg", "-N", "3000000"});
-}
-
-void ProgramTest::change(const std::filesystem::path& image, const std::string& command) const
-{
-    prepareWith({"debugfs", "-w", "-R", command, image});
 }
 
 std::filesystem::path ProgramTest::makeDamagedVolume(std::string_view name,
@@ -116,18 +87,8 @@ std::filesystem::path ProgramTest::makeDisk(std::string_view name,
         contents += bytes;
     }
     write(path(name), contents + std::string(1 * mebibyte, '\0'));
-    if (runTool({"sfdisk", "-q", path(name)}, script) != 0)
-        throw std::runtime_error("cannot prepare the test: sfdisk failed");
+    prepareWith({"sfdisk", "-q", path(name)}, script);
     return path(name);
-}
-
-void ProgramTest::useTool(std::string_view script)
-{
-    std::filesystem::create_directories(path("tools"));
-    std::filesystem::copy_file(TERMINAL_FAKE_TOOL, path("tools/e2fsck"),
-                               std::filesystem::copy_options::overwrite_existing);
-    write(path("tools/script"), script);
-    environment_["FIXWELL_TOOL_PATH"] = path("tools");
 }
 
 // A tool whose program was killed is killed by the kernel a moment later: two seconds are waited,

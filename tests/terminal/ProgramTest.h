@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 #include "tests/terminal/Program.h"
 
 #include <gtest/gtest.h>
@@ -55,11 +55,17 @@ protected:
 
     /// A sparse file with a sound volume.
     std::filesystem::path makeVolume(std::string_view name, std::uint64_t bytes = 8 * mebibyte,
-                                     const std::vector<std::string>& options = {}) const;
+                                     const std::vector<std::string>& options = {}) const
+    {
+        return directory_.makeExt(name, bytes, options);
+    }
     /// A volume that a check has to read for a second or longer.
     std::filesystem::path makeSlowVolume(std::string_view name) const;
     /// debugfs(8), writing.
-    void change(const std::filesystem::path& image, const std::string& command) const;
+    void change(const std::filesystem::path& image, const std::string& command) const
+    {
+        directory_.damage(image, command);
+    }
     /// A volume that has lost its root directory.
     std::filesystem::path makeDamagedVolume(std::string_view name,
                                             const std::vector<std::string>& options = {}) const;
@@ -70,10 +76,13 @@ protected:
                                    std::string_view label = "gpt") const;
 
     /// From now on e2fsck does what the script says; it is described in the fake tool's source.
-    void useTool(std::string_view script);
+    void useTool(std::string_view script)
+    {
+        environment_["FIXWELL_TOOL_PATH"] = directory_.fakeTools(script);
+    }
 
 private:
-    TemporaryDirectory directory_;  // before the environment, which names it
+    TestDirectory directory_;  // before the environment, which names it
 
 protected:
     std::map<std::string, std::string> environment_;

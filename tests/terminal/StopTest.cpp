@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 #include "tests/terminal/ProgramTest.h"
 
 #include <csignal>
@@ -88,7 +88,7 @@ TEST_F(StopTest, ARepairThatWasCutOffIsMadeGoodByTheNext)
         EXPECT_EQ(endStrayProcesses(), 0) << "the tool goes with the program";
         const RunResult repaired = run({"repair", "image"});
         EXPECT_LE(repaired.status, 1) << repaired.output << repaired.errors;
-        EXPECT_EQ(runTool({"e2fsck", "-fn", image}), 0);
+        EXPECT_EQ(runTool({"e2fsck", "-fn", image}).status, 0);
     }
 }
 
@@ -127,7 +127,7 @@ TEST_F(StopTest, OutputThatNobodyReadsEndsNothing)
     Program program(launch({"repair", "image"}));
     program.stopReading();
     static_cast<void>(program.finish());
-    EXPECT_EQ(runTool({"e2fsck", "-fn", image}), 0) << "the repair was not finished";
+    EXPECT_EQ(runTool({"e2fsck", "-fn", image}).status, 0) << "the repair was not finished";
 }
 
 }  // namespace

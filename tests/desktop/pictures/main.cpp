@@ -5,7 +5,7 @@
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/texts/Language.h"
 #include "tests/desktop/WindowFixture.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QApplication>
 #include <QPainter>
@@ -125,10 +125,8 @@ TEST_F(Pictures, OfARepairWhoseLogIsLong)
 {
     const std::string image = makeImage("Archive");
     for (int inode = 11; inode < 200; ++inode)
-        EXPECT_EQ(orvane::test::runTool(
-                      {"debugfs", "-w", "-R", "setb " + std::to_string(200 + inode), image}),
-                  0);
-    EXPECT_EQ(orvane::test::runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
+        directory_.damage(image, "setb " + std::to_string(200 + inode));
+    directory_.damage(image, "clri /lost+found");
     open({image});
     window().resize(820, 560);
     treat("verifyDiskButton", image);

@@ -5,7 +5,6 @@
 #include <QKeyEvent>
 #include <QLabel>
 #include <QMessageBox>
-#include <QPushButton>
 
 #include <gtest/gtest.h>
 
@@ -60,19 +59,6 @@ TEST(Alerts, TheAnswerIsTheTagOfTheButtonAndComesOnceAndLater)
         QApplication::processEvents();
         EXPECT_EQ(openBox(window), nullptr);
     }
-}
-
-TEST(Alerts, WarningDoesNotWaitAndExplainsTheError)
-{
-    QWidget window;
-    QtAlerts alerts([](std::int32_t code) { return "code " + std::to_string(code); });
-    alerts.setWindow(&window);
-    window.show();
-    alerts.simpleModuleAlert("Cannot mount", "“USB” is busy.", 16);
-    QMessageBox* const box = openBox(window);
-    ASSERT_NE(box, nullptr);
-    EXPECT_EQ(box->text(), QStringLiteral("Cannot mount"));
-    EXPECT_EQ(box->informativeText(), QStringLiteral("“USB” is busy.\n\ncode 16"));
 }
 
 }  // namespace

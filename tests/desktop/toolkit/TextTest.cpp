@@ -95,17 +95,5 @@ TEST(StyledLine, AMegabyteInOneLineIsCutInTheMiddle)
     EXPECT_EQ(lengthOfRuns(line), line.text.size());
 }
 
-TEST(HTML, EverythingIsEscapedAndStylesAreKept)
-{
-    const StyledText text = StyledText::make("<b>&\x1b\"\xff\n", {Font::boldSystem(11), {}, {}});
-    text.append(StyledText::make("red\n", {{}, Color{1, 0, 0, 1}, {}}));
-    const std::string made = html(text);
-    EXPECT_NE(made.find("&lt;b&gt;&amp;\xEF\xBF\xBD&quot;\xEF\xBF\xBD"), std::string::npos) << made;
-    EXPECT_NE(made.find("font-weight:bold;font-size:11.0pt"), std::string::npos) << made;
-    EXPECT_NE(made.find("color:#ff0000"), std::string::npos) << made;
-    EXPECT_EQ(toQtToolTip("<img src=x>"),
-              QStringLiteral("<p style=\"white-space:pre-wrap\">&lt;img src=x&gt;</p>"));
-}
-
 }  // namespace
 }  // namespace orvane::desktop

@@ -9,12 +9,10 @@
 #include <gtest/gtest.h>
 #include <sys/file.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <cstring>
 #include <fstream>
-#include <map>
 #include <set>
 
 namespace {

@@ -22,7 +22,6 @@
 
 #include <chrono>
 #include <csignal>
-#include <fstream>
 #include <thread>
 
 namespace {
