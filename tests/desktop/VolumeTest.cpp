@@ -54,6 +54,25 @@ protected:
     std::unique_ptr<LoopDevice> device_;
 };
 
+using SystemDisksTest = WindowFixture;
+
+TEST_F(SystemDisksTest, TheListFollowsADeviceWithoutARescan)
+{
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const std::string image = makeImage("plugged");
+    openWithSystemDisks();
+    LoopDevice device(image);
+    ASSERT_TRUE(waitUntil(
+        [&] { return cell(device.name(), DiskColumn::Name).starts_with("plugged (loop"); }));
+
+    run("verifyDiskButton", device.name());
+    EXPECT_EQ(verdict(device.name()), "sound");
+    device.detach();
+    EXPECT_TRUE(waitUntil([&] { return cell(device.name(), DiskColumn::Name).empty(); }));
+    EXPECT_TRUE(waitUntil([&] { return !button("verifyDiskButton").isEnabled(); }));
+}
+
 TEST_F(VolumeTest, AVolumeIsMountedUnmountedAndEjectedFromTheMenu)
 {
     EXPECT_EQ(offered(), "me");

@@ -181,30 +181,6 @@ TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)
     run("verifyDiskButton");
 }
 
-TEST_F(WindowTest, TheEmptyLogSaysWhyNothingCanBeDone)
-{
-    open({});
-    DiskTree disk;
-    disk.facts.identifier = "/dev/none";
-    disk.facts.type = diskType::bareVolume;
-    disk.facts.storage = contract::DiskReference::Storage::BlockDevice;
-    disk.facts.filesystem = "ext4";
-    const EmptyNote* const note = session().activeTab()->interface()->emptyNote();
-    ASSERT_NE(note, nullptr);
-    struct Case {
-        bool isBootVolume;
-        std::string_view said;
-    };
-    for (const Case& c : {Case{true, "rescue system"}, Case{false, "no history"}}) {
-        disk.facts.isBootVolume = c.isBootVolume;
-        session().host().sharedDiskController().synchronize({});
-        session().host().sharedDiskController().synchronize({disk});
-        select(disk.facts.identifier);
-        EXPECT_NE(fromQt(note->text()).find(c.said), std::string::npos) << fromQt(note->text());
-        EXPECT_NE(button("verifyDiskButton").isEnabled(), c.isBootVolume);
-    }
-}
-
 TEST_F(WindowTest, WhatCannotBeOpenedIsSaidInOneSheet)
 {
     const std::string image = makeImage("sound");

@@ -191,16 +191,13 @@ TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
         bool isBoot;
         bool isHome;
         ErrorCode shown;
-        std::string_view reported;
     };
-    for (const Case& c :
-         {Case{FXWActionVerifyDisk, true, false, -19997, "kOVOP_VerifyDiskKey"},
-          Case{FXWActionVerifyDisk, false, true, -19997, "kOVOP_VerifyDiskKey"},
-          Case{FXWActionVerifyDisk, false, false, -19998, "kOVOP_VerifyDiskKey"},
-          Case{FXWActionRepairDisk, true, false, -19996, "kOVOP_RepairDiskKey"},
-          Case{FXWActionVerifyPermissions, false, true, -19998, "kOVOP_VerifyDiskPermissionsKey"},
-          Case{FXWActionRepairPermissions, true, false, -19997,
-               "kOVOP_RepairDiskPermissionsKey"}}) {
+    for (const Case& c : {Case{FXWActionVerifyDisk, true, false, -19997},
+                          Case{FXWActionVerifyDisk, false, true, -19997},
+                          Case{FXWActionVerifyDisk, false, false, -19998},
+                          Case{FXWActionRepairDisk, true, false, -19996},
+                          Case{FXWActionVerifyPermissions, false, true, -19998},
+                          Case{FXWActionRepairPermissions, true, false, -19997}}) {
         const auto disk = addDisk("d" + std::to_string(host.disks.size()));
         disk->boot = c.isBoot;
         disk->home = c.isHome;
@@ -212,7 +209,6 @@ TEST_F(OVFXWTest, FailuresOfALauncherAreRestatedByTheKindOfDisk)
         module->perform(selectors[c.action], nullptr);
         EXPECT_NE(linesOf(disk)[1].find("error " + std::to_string(c.shown)), std::string::npos)
             << c.action << " " << linesOf(disk)[1];
-        EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), c.reported);
     }
 }
 
@@ -228,18 +224,13 @@ TEST_F(OVFXWTest, ADiskThatAFailedStartUnmountedIsMountedAgain)
     };
     module->verifyDisk(nullptr);
     EXPECT_TRUE(host.has("mount a"));
-}
 
-TEST_F(OVFXWTest, AMountPointWithoutALengthWasNeverMounted)
-{
-    const auto disk = addDisk("a");
+    // A mount point without a length was never one.
+    host.journal.clear();
+    host.whenBegun = {};
     disk->mount = "";
-    host.refusals["a"] = kPLErrorToolMissing;
-    verify(disk);
-    EXPECT_FALSE(host.has("mount a"));
-    host.refusals.clear();
     module->verifyDisk(nullptr);
-    EXPECT_FALSE(inflightItem().boolean(kEntryDiskWasMounted));
+    EXPECT_FALSE(host.has("mount a"));
 }
 
 // Disk images
@@ -334,6 +325,21 @@ TEST_F(OVFXWTest, OneReportAndOneWarningPerJob)
     EXPECT_TRUE(std::ranges::none_of(host.journal, [](const auto& entry) {
         return entry.starts_with("alert");
     })) << "permission runs never warn";
+}
+
+TEST_F(OVFXWTest, TheReportNamesTheAction)
+{
+    const auto disk = addDisk("a");
+    select(disk);
+    for (const auto& [selector, key] :
+         {std::pair("verifyPermissions:", "kOVOP_VerifyDiskPermissionsKey"),
+          {"repairPermissions:", "kOVOP_RepairDiskPermissionsKey"},
+          {"verifyDisk:", "kOVOP_VerifyDiskKey"},
+          {"repairDisk:", "kOVOP_RepairDiskKey"}}) {
+        module->perform(selector, nullptr);
+        finish(disk);
+        EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), key);
+    }
 }
 
 }  // namespace fixwell

@@ -47,7 +47,7 @@ protected:
     {
         auto disk = addDisk("root");
         disk->boot = true;
-        disk->fileSystem.verifiesLive = true;
+        disk->verifiesLive = true;
         return disk;
     }
     std::shared_ptr<FakeDisk> addImage(const std::string& path)
@@ -114,6 +114,7 @@ protected:
     }
     Array historyOfSelection() const { return module->allFsckHistoryOfSelection(); }
     void appendMessage(std::string_view text) { module->appendTitleToMessageText(text); }
+    ButtonDecision buttonDecision() { return module->decideButtons(); }
     void fileAsCompleted(const Dictionary& entry) { module->addDiskToCompletedList(entry); }
     OVDiskPointer inflightDisk() const { return module->searchForInflightDisk(); }
 

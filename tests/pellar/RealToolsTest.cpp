@@ -7,6 +7,7 @@
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/JobFixture.h"
+#include "tests/support/LoopDevice.h"
 #include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
@@ -126,13 +127,6 @@ TEST(RealToolsOnOthers, NeverWrite)
     }
 }
 
-bool mayUseLoopDevices(const test::TestDirectory& directory)
-{
-    directory.write("probe", std::string(4096, 'x'));
-    const FileDescriptor file(::open(directory.path("probe").c_str(), O_RDONLY | O_CLOEXEC));
-    return bool(LoopDevice::attach(file.get(), 0, 4096, Access::ReadOnly));
-}
-
 bool isOnALoopDevice(const std::filesystem::path& image)
 {
     struct stat status = {};
@@ -168,8 +162,7 @@ void expectUntouchedMargins(const contract::DiskReference& disk)
 
 TEST(RealToolsInAnImage, WorkOnARegionAndLeaveNoLoopDevice)
 {
-    const test::TestDirectory probe;
-    const bool mayUseThem = mayUseLoopDevices(probe);
+    const bool mayUseThem = orvane::test::LoopDevice::obstacle() == nullptr;
     for (const VolumeState& state : orvane::test::volumeStates()) {
         if (state.repaired != "repaired" || !isInstalled(makerOf(state.filesystem)))
             continue;

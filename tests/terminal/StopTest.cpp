@@ -41,21 +41,6 @@ TEST_F(StopTest, TheFirstOfThreeImagesIsTheLast)
     EXPECT_TRUE(contentsOf(path("a")) + contentsOf(path("b")) + contentsOf(path("c")) == before);
 }
 
-TEST_F(StopTest, ControlCOnATerminalIsTheStopButtonAndDamageThatWasFoundIsTold)
-{
-    makeDamagedVolume("a");
-    makeSlowVolume("b");
-    Launch started = launch({"verify", "a", "b"});
-    started.columns = 80;
-    Program program(started);
-    ASSERT_TRUE(program.waitFor("Verifying volume “b”"));
-    program.type(controlC);
-    const RunResult result = program.finish();
-    EXPECT_EQ(result.status, 4 | 32) << result.output;
-    EXPECT_EQ(countOf("Stopped by user", result.output), 1U) << result.output;
-    EXPECT_EQ(countOf("appears to be OK.", result.output), 0U) << result.output;
-}
-
 // One press would leave a repair twenty seconds to come to an order by itself.
 TEST_F(StopTest, AToolThatDoesNotListenIsEndedByTheThirdControlC)
 {

@@ -32,25 +32,6 @@ TEST(Contrast, EveryColourOfTheLogIsReadableOnEveryPalette)
     EXPECT_GT(red.red(), 2 * red.green()) << "it is still red";
 }
 
-TEST(ColorScheme, EveryWordIsReadableInTheDark)
-{
-    const QPalette dark = darkPalette();
-    struct Case {
-        QPalette::ColorRole text;
-        QPalette::ColorRole ground;
-    };
-    for (const Case& c :
-         {Case{QPalette::WindowText, QPalette::Window}, Case{QPalette::Text, QPalette::Base},
-          Case{QPalette::Text, QPalette::AlternateBase},
-          Case{QPalette::ButtonText, QPalette::Button}, Case{QPalette::Link, QPalette::Base},
-          Case{QPalette::LinkVisited, QPalette::Base},
-          Case{QPalette::PlaceholderText, QPalette::Base},
-          Case{QPalette::ToolTipText, QPalette::ToolTipBase},
-          Case{QPalette::HighlightedText, QPalette::Highlight}})
-        EXPECT_GE(contrastRatio(dark.color(c.text), dark.color(c.ground)), readableContrast)
-            << "role " << c.text << " on " << c.ground;
-}
-
 TEST(StyledLine, HostileTextIsOneHarmlessLine)
 {
     struct Case {
