@@ -397,7 +397,7 @@ TEST(PartitionMaps, ADiskThatIsInUseIsOnlyRead)
     disk.fill(512, 512, 0);
     const Bytes damaged = disk.bytes();
     const FileDescriptor other(::open(disk.path().c_str(), O_RDWR | O_CLOEXEC));
-    ASSERT_EQ(::flock(other.get(), LOCK_EX | LOCK_NB), 0);
+    ASSERT_EQ(::flock(other.get(), LOCK_SH | LOCK_NB), 0);
     MapBench bench(workshop.path("saved"));
     bench.repairMap(disk.path());
     EXPECT_EQ(bench.listener.error, contract::kPLErrorDiskInUse);
