@@ -46,6 +46,8 @@ public:
     std::string reasonAgainstPartitionMap(const contract::DiskReference& disk) const;
 
 private:
+    RepairWay repairWay() const { return repairWayFor(options_, policyFor(options_)); }
+
     contract::RunLoop& loop_;
     const Texts& texts_;
     const JobOptions options_;

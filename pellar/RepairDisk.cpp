@@ -180,7 +180,7 @@ bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
         return false;
     const auto& isAllowed = options_.archiveFetching.isAllowed;
     const bool fetches = task.subject == Subject::Permissions && isAllowed && isAllowed();
-    const PrivilegedJob job{task, *disk, nullptr, fetches};
+    const PrivilegedJob job{task, *disk, nullptr, fetches, policyFor(options_)};
     start(disk, [job, this](StopSwitch& stop, EventQueue& events) {
         return options_.privileged(job, stop, events);
     });
@@ -274,7 +274,9 @@ void RepairDisk::traceTool(const contract::DiskReference& disk, Operation operat
 {
     if (disk.filesystem.empty())
         return;
-    const Capability capability = capabilityFor(disk.filesystem, operation, options_.toolPath);
+    const Capability capability =
+        capabilityFor(disk.filesystem, operation, options_.toolPath,
+                      repairWayFor(options_, policyFor(options_)));
     trace(contract::printable(disk.filesystem) + ": " +
           (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
 }

@@ -37,6 +37,10 @@ inline constexpr ErrorCode kPLErrorBusy = -69711;  ///< another job of this tool
 
 /// Verified: damaged, and this kind of volume is not repaired here.
 inline constexpr ErrorCode kPLErrorDamagedForGood = -69712;
+/// A repair was tried, would leave damage, and was not applied: the disk is as it was.
+inline constexpr ErrorCode kPLErrorNotProven = -69713;
+inline constexpr ErrorCode kPLErrorNotTried = -69714;     ///< a repair could not be tried first
+inline constexpr ErrorCode kPLErrorInterrupted = -69715;  ///< an earlier repair is half applied
 
 /// A repair of what is not repaired here, though it can be verified.
 inline constexpr ErrorCode kPLErrorNoRepairHere = -69740;
@@ -85,6 +89,12 @@ inline constexpr std::array errorTexts{
     ErrorText{kPLErrorCutShort,
               "The end of the volume is missing, and no repair brings it back; copy what matters "
               "to another disk."},
+    ErrorText{kPLErrorNotProven,
+              "A repair was tried and would leave damage, so nothing was written to the volume."},
+    ErrorText{kPLErrorNotTried,
+              "The repair could not be tried first, so nothing was written to the volume."},
+    ErrorText{kPLErrorInterrupted,
+              "An earlier repair of the disk was interrupted; finish it or undo it first."},
     ErrorText{kPLErrorNotRepaired, "The volume is still damaged after the repair."},
     ErrorText{kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},

@@ -13,6 +13,15 @@ namespace pellar {
 using Bytes = std::vector<std::uint8_t>;
 using ByteView = std::span<const std::uint8_t>;
 
+/// A stretch of a file, a device or a region of one, in bytes.
+struct ByteRange {
+    std::uint64_t offset = 0;
+    std::uint64_t length = 0;
+
+    constexpr std::uint64_t end() const { return offset + length; }
+    friend bool operator==(const ByteRange&, const ByteRange&) = default;
+};
+
 /// All of `count` bytes at `place`, or none.
 std::optional<Bytes> readDisk(int descriptor, std::uint64_t place, std::size_t count);
 

@@ -18,12 +18,20 @@ struct JobContext {
     StopSwitch& stop;
     EventQueue& events;
     JobLog log;
+    RepairPolicy policy;
 
     JobContext(const contract::DiskReference& disk, const JobOptions& options_, const Texts& texts_,
                StopSwitch& stop_, EventQueue& events_)
-        : options(options_), texts(texts_), stop(stop_), events(events_), log(disk, texts, events)
+        : options(options_),
+          texts(texts_),
+          stop(stop_),
+          events(events_),
+          log(disk, texts, events),
+          policy(policyFor(options))
     {
     }
+
+    RepairWay repairWay() const { return repairWayFor(options, policy); }
 };
 
 /// Makes a script that heeds the switch and tells its events to the queue. Both outlive it.

@@ -5,6 +5,7 @@
 #include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/EventQueue.h"
 #include "pellar/outcome/Task.h"
+#include "pellar/overlay/Overlay.h"
 #include "pellar/process/KernelFiles.h"
 #include "pellar/process/ProcessOutput.h"
 #include "pellar/process/Stopping.h"
@@ -28,6 +29,30 @@ public:
     virtual void run() = 0;
 };
 
+/// How one job is to repair.
+struct RepairPolicy {
+    bool isDirect = false;         ///< the tool writes to the disk itself, which nothing takes back
+    bool isPreview = false;        ///< the repair is tried, and not applied
+    bool appliesUnproven = false;  ///< it is applied as well where damage would be left
+    bool keepsUndo = true;         ///< what it overwrites is kept, so that it can be taken back
+    bool isThorough = false;       ///< a verification that finds nothing tries a repair as well
+    std::filesystem::path keptImage;  ///< where a preview leaves the repaired volume; or empty
+
+    friend bool operator==(const RepairPolicy&, const RepairPolicy&) = default;
+};
+
+/// What it takes to try repairs, and to take them back.
+struct Trials {
+    /// Where what a tool would write is kept, and, below it, what repairs have overwritten. Without
+    /// a directory no repair is tried: the tools write to the disks themselves.
+    OverlayRoom room;
+    /// Sentences in the user's language: how a repair is taken back, how one is applied that is
+    /// not proven, how one is done without a trial. Empty ones are not told.
+    std::string howToUndo;
+    std::string howToApply;
+    std::string howToRepairDirectly;
+};
+
 /// A job for which this user has no right: on a block device that they may not open, on files that
 /// are not theirs, or on a part of an image that the kernel has to make a device of.
 struct PrivilegedJob {
@@ -38,6 +63,7 @@ struct PrivilegedJob {
     std::shared_ptr<const DiskClaim> image;
     /// The user agrees that archives of packages are fetched (JobOptions::archiveFetching).
     bool fetchesArchives = false;
+    RepairPolicy policy = {};
 };
 
 /// Makes the script of such a job; empty where there is no way to get the right. Any thread.
@@ -78,9 +104,23 @@ struct JobOptions {
     /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
     /// made when it is needed. Empty: no partition map is repaired.
     std::filesystem::path savedSectorsDirectory;
+    Trials trials;
+    /// Asked as a job begins, on the main thread; may be empty.
+    std::function<RepairPolicy()> repairPolicy;
     PrivilegedScripts privileged;
     JobObserver* observer = nullptr;  ///< outlives the manager; none when null
 };
+
+inline RepairPolicy policyFor(const JobOptions& options)
+{
+    return options.repairPolicy ? options.repairPolicy() : RepairPolicy();
+}
+
+inline RepairWay repairWayFor(const JobOptions& options, const RepairPolicy& policy)
+{
+    const bool isTried = !policy.isDirect && !options.trials.room.directory.empty();
+    return isTried ? RepairWay::TriedFirst : RepairWay::Direct;
+}
 
 /// What a task may do to the disk.
 inline Access accessFor(Operation operation)

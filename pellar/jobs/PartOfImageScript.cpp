@@ -32,7 +32,7 @@ bool PartOfImageScript::needsDevice() const
         return false;
     const bool isRepair = request_.operation == Operation::Repair;
     return !findProgram(tool->name, context_.options.toolPath).empty() &&
-           (!isRepair || (tool->canRepair() &&
+           (!isRepair || (tool->repairs(context_.repairWay()) &&
                           !findProgram(tool->repairName, context_.options.toolPath).empty()));
 }
 

@@ -14,6 +14,10 @@ enum class Subject { Filesystem, PartitionMap, Permissions };
 /// What the user asked for. A repair reads as well: it verifies what it has done.
 enum class Operation { Verify, Repair };
 
+/// Whether a tool writes to the disk itself, or its repair is tried first and, once it is proven,
+/// applied.
+enum class RepairWay { Direct, TriedFirst };
+
 /// One of the six things that a job does.
 struct Task {
     Subject subject = Subject::Filesystem;

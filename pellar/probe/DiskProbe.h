@@ -1,18 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/bytes/Bytes.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
 
 namespace pellar {
-
-/// A stretch of an open file or device, in bytes.
-struct ByteRange {
-    std::uint64_t offset = 0;
-    std::uint64_t length = 0;
-};
 
 /// What a superblock says of itself, in the words of libblkid; empty where it says nothing.
 struct Superblock {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "pellar/outcome/Judgement.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/tools/ToolOutput.h"
@@ -48,8 +49,8 @@ struct Tool {
     std::string_view name;        ///< of the executable that verifies
     std::string_view repairName;  ///< of the executable that repairs
     std::string_view package;     ///< the Debian package that brings them
-    /// Why it does not repair; empty where it does.
-    Sentence reasonAgainstRepair = {};
+    /// Why it is not let repair a disk without a trial before; empty where it is.
+    Sentence reasonAgainstDirectRepair = {};
     ToolHabits habits = {};
 
     /// Reads the disk a little; never writes.
@@ -65,7 +66,10 @@ struct Tool {
     };
     Judgement (*judge)(const RunEvidence& evidence);
 
-    bool canRepair() const { return reasonAgainstRepair.isEmpty(); }
+    bool repairs(RepairWay way) const
+    {
+        return way == RepairWay::TriedFirst || reasonAgainstDirectRepair.isEmpty();
+    }
 };
 
 }  // namespace pellar

@@ -23,7 +23,7 @@ struct VolumeFacts {
     bool differsFromBackup =
         false;  ///< the two copies of the main superblock contradict each other
     std::optional<std::uint64_t> files;  ///< by its own books, where these agree with each other
-    std::vector<DiskPiece> backups;      ///< what a repair uses and a verification does not read
+    std::vector<ByteRange> backups;      ///< what a repair uses and a verification does not read
 
     bool isCutShort() const { return volumeBytes > availableBytes; }
 };

@@ -123,8 +123,11 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     return facts;
 }
 
-std::vector<std::string> arguments(Access, const std::string& disk, std::uint64_t)
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
+    // --force lets it begin without the ten seconds in which it warns.
+    if (access == Access::ReadWrite)
+        return {"check", "--repair", "--force", disk};
     return {"check", "--readonly", disk};
 }
 
@@ -149,7 +152,7 @@ const Tool& btrfsCheck()
         .name = name,
         .repairName = name,
         .package = "btrfs-progs",
-        .reasonAgainstRepair =
+        .reasonAgainstDirectRepair =
             {"to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
              "volume and make this one anew",
              {},
