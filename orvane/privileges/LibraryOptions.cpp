@@ -55,6 +55,7 @@ pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& te
     if (!paths.state.empty()) {
         options.savedSectorsDirectory = paths.state / "partition-maps";
         options.permissionReferences = paths.state / "permissions";
+        options.trials.room.directory = paths.state / "repairs";
     }
     const auto launcher = helperLauncher();
     if (!launcher.empty())

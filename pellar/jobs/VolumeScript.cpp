@@ -189,9 +189,13 @@ std::optional<Outcome> VolumeScript::objectionToSize()
 
 VolumeScript::State VolumeScript::verify()
 {
-    const bool isThorough = context_.policy.isThorough && context_.repairWay() == RepairWay::TriedFirst;
-    log_.meter().setRange(0, isThorough ? readingEnds : 100);
-    const RunEvidence evidence = runs_.run(Access::ReadOnly, ToolRun::Problems::Shown);
+    const bool isTried = context_.repairWay() == RepairWay::TriedFirst;
+    const bool isThorough = context_.policy.isThorough && isTried;
+    // What is wrong before a journal is replayed may not be wrong afterwards.
+    const bool hasJournal = runs_.volume().needsRecovery && isTried;
+    log_.meter().setRange(0, isThorough || hasJournal ? readingEnds : 100);
+    const RunEvidence evidence = runs_.run(
+        Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = runs_.judge(evidence);
     const bool canBeRepaired = tool_->repairs(context_.repairWay());
     if (judgement.verdict == Verdict::Damaged && !runs_.volume().isCutShort())
@@ -201,7 +205,7 @@ VolumeScript::State VolumeScript::verify()
         evidence.findings.skippedJournal && !tool_->habits.logReplayedAs.empty();
     const bool isWorthATrial =
         isOpen(judgement, evidence) || (isThorough && judgement.verdict == Verdict::Sound);
-    const bool isPossible = context_.repairWay() == RepairWay::TriedFirst && canBeRepaired &&
+    const bool isPossible = isTried && canBeRepaired &&
                             !runs_.program(Access::ReadWrite).empty() &&
                             !runs_.volume().isCutShort();
     return isWorthATrial && isPossible ? State::Deciding : State::Done;
