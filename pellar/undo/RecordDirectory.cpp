@@ -107,9 +107,14 @@ Result<RecordDirectory, int> RecordDirectory::make(std::shared_ptr<const StoreDi
             continue;
         }
         auto made = open(store, tried);
-        // Until it is locked it looks left over, and another process may remove it.
-        if (made && made->lock() == 0)
+        const int error = made ? made->lock() : made.error();
+        if (error == 0)
             return made;
+        // Until it is locked it looks left over, and another process may be removing it.
+        if (error != EWOULDBLOCK && error != ENOENT) {
+            ::unlinkat(store->descriptor(), tried.c_str(), AT_REMOVEDIR);
+            return error;
+        }
     }
     return EEXIST;
 }
@@ -134,22 +139,21 @@ bool RecordDirectory::isStillInPlace() const
            ours.st_dev == named.st_dev && ours.st_ino == named.st_ino;
 }
 
-int RecordDirectory::lock()
+int RecordDirectory::lockAs(int kind) const
 {
-    if (::flock(directory_.get(), LOCK_EX | LOCK_NB) != 0)
+    if (::flock(directory_.get(), kind | LOCK_NB) != 0)
         return errno;
-    isLocked_ = true;
     return isStillInPlace() ? 0 : ENOENT;
 }
 
-bool RecordDirectory::isLockedByAnother()
+int RecordDirectory::lock() const
 {
-    if (isLocked_)
-        return false;
-    if (::flock(directory_.get(), LOCK_SH | LOCK_NB) != 0)
-        return true;
-    ::flock(directory_.get(), LOCK_UN);
-    return false;
+    return lockAs(LOCK_EX);
+}
+
+int RecordDirectory::lockForReading() const
+{
+    return lockAs(LOCK_SH);
 }
 
 Result<FileDescriptor, int> RecordDirectory::makeFile(const char* name) const
@@ -192,8 +196,8 @@ Result<std::string, int> RecordDirectory::readFile(const char* name, std::uint64
     if (static_cast<std::uint64_t>(status.st_size) > most)
         return EFBIG;
     std::string text(static_cast<std::size_t>(status.st_size), '\0');
-    if (const int error = readAll(
-            file->get(), 0, {reinterpret_cast<std::uint8_t*>(text.data()), text.size()}))
+    if (const int error =
+            readAll(file->get(), 0, {reinterpret_cast<std::uint8_t*>(text.data()), text.size()}))
         return error;
     return text;
 }
@@ -209,13 +213,13 @@ int RecordDirectory::writeFile(const char* name, std::string_view text) const
     return sync(*file);
 }
 
-int RecordDirectory::replaceFile(const char* name, std::string_view text) const
+int RecordDirectory::replaceFacts(std::string_view text) const
 {
     if (const int error = removeFile(unfinishedFactsName))
         return error;
     if (const int error = writeFile(unfinishedFactsName, text))
         return error;
-    if (::renameat(directory_.get(), unfinishedFactsName, directory_.get(), name) != 0)
+    if (::renameat(directory_.get(), unfinishedFactsName, directory_.get(), factsName) != 0)
         return errno;
     return store_->sync(directory_.get());
 }

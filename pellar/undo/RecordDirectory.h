@@ -63,9 +63,9 @@ public:
     const std::string& name() const { return name_; }
 
     /// EWOULDBLOCK when another has it; ENOENT when it was removed in the meantime.
-    [[nodiscard]] int lock();
-    /// Looks by taking the lock for a moment, unless this object has it.
-    [[nodiscard]] bool isLockedByAnother();
+    [[nodiscard]] int lock() const;
+    /// Keeps others from working on the record until this object is gone, and lets them read it.
+    [[nodiscard]] int lockForReading() const;
 
     /// A new file for writing.
     [[nodiscard]] Result<FileDescriptor, int> makeFile(const char* name) const;
@@ -75,8 +75,10 @@ public:
     [[nodiscard]] Result<std::string, int> readFile(const char* name, std::uint64_t most) const;
     /// A new file of these bytes, on the medium.
     [[nodiscard]] int writeFile(const char* name, std::string_view text) const;
-    /// The same in place of an old one: at every moment one of the two is there, whole.
-    [[nodiscard]] int replaceFile(const char* name, std::string_view text) const;
+    /// New facts in place of the old ones, if any: at every moment one of the two is there, whole.
+    /// After an error it may be either.
+    [[nodiscard]] int replaceFacts(std::string_view text) const;
+    /// 0 as well when it is not there.
     [[nodiscard]] int removeFile(const char* name) const;
 
     [[nodiscard]] int sync(const FileDescriptor& file) const { return store_->sync(file.get()); }
@@ -93,12 +95,12 @@ private:
     {
     }
 
+    int lockAs(int kind) const;
     bool isStillInPlace() const;
 
     std::shared_ptr<const StoreDirectory> store_;
     std::string name_;
     FileDescriptor directory_;
-    bool isLocked_ = false;
 };
 
 }  // namespace pellar

@@ -44,9 +44,8 @@ std::string charactersFrom(std::string_view bytes)
 std::string bytesFrom(const json& text)
 {
     std::string bytes;
-    contract::forEachCharacter(text.get_ref<const std::string&>(), [&](char32_t character) {
-        bytes += static_cast<char>(character);
-    });
+    contract::forEachCharacter(text.get_ref<const std::string&>(),
+                               [&](char32_t character) { bytes += static_cast<char>(character); });
     return bytes;
 }
 
@@ -62,9 +61,12 @@ json jsonFrom(const RecordedDisk& disk)
 
 RecordedDisk diskFrom(const json& values)
 {
-    return {bytesFrom(values.at("path")),       values.at("offset").get<std::uint64_t>(),
-            values.at("length").get<std::uint64_t>(), bytesFrom(values.at("uuid")),
-            bytesFrom(values.at("filesystem")), bytesFrom(values.at("name"))};
+    return {bytesFrom(values.at("path")),
+            values.at("offset").get<std::uint64_t>(),
+            values.at("length").get<std::uint64_t>(),
+            bytesFrom(values.at("uuid")),
+            bytesFrom(values.at("filesystem")),
+            bytesFrom(values.at("name"))};
 }
 
 std::optional<RecordFacts> factsFrom(const json& values)
@@ -79,14 +81,13 @@ std::optional<RecordFacts> factsFrom(const json& values)
     if (!task || state == stateNames.end())
         return std::nullopt;
     const system_clock::time_point time{seconds(values.at("time").get<std::int64_t>())};
-    return RecordFacts{
-        {diskFrom(values.at("disk")), *task, values.at("user").get<uid_t>(), time},
-        state->state,
-        values.at("ranges").get<std::uint64_t>(),
-        values.at("changedBytes").get<std::uint64_t>(),
-        values.at("rangesDigest").get<std::string>(),
-        values.at("beforeDigest").get<std::string>(),
-        values.at("afterDigest").get<std::string>()};
+    return RecordFacts{{diskFrom(values.at("disk")), *task, values.at("user").get<uid_t>(), time},
+                       state->state,
+                       values.at("ranges").get<std::uint64_t>(),
+                       values.at("changedBytes").get<std::uint64_t>(),
+                       values.at("rangesDigest").get<std::string>(),
+                       values.at("beforeDigest").get<std::string>(),
+                       values.at("afterDigest").get<std::string>()};
 }
 
 }  // namespace
