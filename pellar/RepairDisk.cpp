@@ -162,7 +162,8 @@ ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& dis
 
 ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation operation)
 {
-    auto claim = DiskClaim::attempt(*disk, accessFor(operation), options_.systemPaths);
+    auto claim = DiskClaim::attempt(
+        *disk, accessFor(operation, policyFor(options_)), options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
     VolumeRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};

@@ -25,6 +25,12 @@ struct ByteRange {
 /// All of `count` bytes at `place`, or none.
 std::optional<Bytes> readDisk(int descriptor, std::uint64_t place, std::size_t count);
 
+// All of the bytes, however many calls that takes; 0, or errno. A file that ends before them, or
+// takes none of them, is EIO; a place that no file has is EFBIG.
+
+[[nodiscard]] int readAll(int descriptor, std::uint64_t place, std::span<std::uint8_t> bytes);
+[[nodiscard]] int writeAll(int descriptor, std::uint64_t place, ByteView bytes);
+
 // The number of `length` bytes, 8 at most, that stands at `offset`. All of them must be there.
 
 constexpr std::uint64_t littleEndian(ByteView bytes, std::size_t offset, std::size_t length)

@@ -9,6 +9,9 @@
 #include "pellar/process/KernelFiles.h"
 #include "pellar/process/ProcessOutput.h"
 #include "pellar/process/Stopping.h"
+#include "pellar/undo/UndoStore.h"
+
+#include <unistd.h>
 
 #include <chrono>
 #include <filesystem>
@@ -46,12 +49,20 @@ struct Trials {
     /// Where what a tool would write is kept, and, below it, what repairs have overwritten. Without
     /// a directory no repair is tried: the tools write to the disks themselves.
     OverlayRoom room;
+    RecordLimits limits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
+    uid_t user = ::geteuid();  ///< who asks, and may take a repair back
     /// Sentences in the user's language: how a repair is taken back, how one is applied that is
     /// not proven, how one is done without a trial. Empty ones are not told.
     std::string howToUndo;
     std::string howToApply;
     std::string howToRepairDirectly;
 };
+
+/// Where the records are of what repairs have overwritten (UndoStore).
+inline std::filesystem::path recordsIn(const Trials& trials)
+{
+    return trials.room.directory / "records";
+}
 
 /// A job for which this user has no right: on a block device that they may not open, on files that
 /// are not theirs, or on a part of an image that the kernel has to make a device of.
@@ -123,9 +134,10 @@ inline RepairWay repairWayFor(const JobOptions& options, const RepairPolicy& pol
 }
 
 /// What a task may do to the disk.
-inline Access accessFor(Operation operation)
+inline Access accessFor(Operation operation, const RepairPolicy& policy = {})
 {
-    return operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    return operation == Operation::Verify || policy.isPreview ? Access::ReadOnly
+                                                              : Access::ReadWrite;
 }
 
 }  // namespace pellar

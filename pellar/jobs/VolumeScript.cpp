@@ -5,6 +5,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/disks/DiskClaim.h"
+#include "pellar/jobs/RepairApplication.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/probe/DiskProbe.h"
 #include "pellar/tools/Capability.h"
@@ -66,7 +67,7 @@ void VolumeScript::run()
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
     disk_.giveBack();
-    log_.outcomeOfVolume(outcome_, operation_);
+    log_.outcomeOfVolume(outcome_, context_.policy.isPreview ? Operation::Verify : operation_);
 }
 
 VolumeScript::State VolumeScript::next(State state)
@@ -88,7 +89,7 @@ VolumeScript::State VolumeScript::examine()
 {
     if (const auto objection = objectionToJob())
         return end(*objection);
-    if (const auto refusal = disk_.take(accessFor(operation_)))
+    if (const auto refusal = disk_.take(accessFor(operation_, context_.policy)))
         return end(*refusal);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
@@ -307,20 +308,29 @@ VolumeScript::State VolumeScript::tryRepair()
                                   log_.diskName(),
                                   {}});
     mark_ = WriteMark::of(disk_.claim().descriptor());
-    if (const auto obstacle = beginTrial())
+    if (const auto obstacle = beginTrial()) {
+        if (!context_.options.trials.howToRepairDirectly.empty())
+            log_.remark(context_.options.trials.howToRepairDirectly);
         return end(failedOutcome(contract::kPLErrorNotTried,
                                  {"the repair cannot be tried first: %1$@", log_.text(*obstacle),
                                   {}}));
+    }
     outcome_ = RepairPasses(runs_, context_, look_, {lookEnds, trialEnds}).run();
     runs_.workOn(nullptr);
     const bool isWanted = isProven(outcome_) || (outcome_.verdict == Verdict::Damaged &&
                                                  context_.policy.appliesUnproven);
-    return isWanted || context_.policy.isPreview ? State::Applying : end(notProven(outcome_));
+    if (isWanted || context_.policy.isPreview)
+        return State::Applying;
+    if (outcome_.verdict == Verdict::Damaged && !context_.options.trials.howToApply.empty())
+        log_.remark(context_.options.trials.howToApply);
+    return end(notProven(outcome_));
 }
 
 VolumeScript::State VolumeScript::apply()
 {
-    return end(outcome_);
+    RepairApplication application(context_, disk_, *trial_, mark_);
+    return end(context_.policy.isPreview ? application.preview(outcome_)
+                                         : application.apply(outcome_));
 }
 
 /// Why there is none; the tool works on it from now on.

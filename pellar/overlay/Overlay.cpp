@@ -16,37 +16,6 @@ namespace {
 
 constexpr std::uint64_t sector = 512;
 
-/// 0 for all of them, ENODATA where the file ends before.
-int readAll(int file, std::uint64_t place, std::span<std::uint8_t> bytes)
-{
-    while (!bytes.empty()) {
-        const ssize_t count =
-            ::pread(file, bytes.data(), bytes.size(), static_cast<off_t>(place));
-        if (count < 0 && errno == EINTR)
-            continue;
-        if (count <= 0)
-            return count == 0 ? ENODATA : errno;
-        place += static_cast<std::uint64_t>(count);
-        bytes = bytes.subspan(static_cast<std::size_t>(count));
-    }
-    return 0;
-}
-
-int writeAll(int file, std::uint64_t place, std::span<const std::uint8_t> bytes)
-{
-    while (!bytes.empty()) {
-        const ssize_t count =
-            ::pwrite(file, bytes.data(), bytes.size(), static_cast<off_t>(place));
-        if (count < 0 && errno == EINTR)
-            continue;
-        if (count < 0)
-            return errno;
-        place += static_cast<std::uint64_t>(count);
-        bytes = bytes.subspan(static_cast<std::size_t>(count));
-    }
-    return 0;
-}
-
 /// Without a name from the beginning where the file system can do that (open(2), O_TMPFILE).
 FileDescriptor namelessFileIn(const std::filesystem::path& directory)
 {
