@@ -26,6 +26,11 @@ std::unique_ptr<contract::PLRepairDisk> Manager::makeRepairDisk()
     return tool;
 }
 
+std::unique_ptr<RepairDisk> Manager::makeTool(contract::PLAsyncDelegate& delegate)
+{
+    return std::make_unique<RepairDisk>(loop_, texts_, options_, delegate);
+}
+
 void Manager::cancelAgain()
 {
     if (const auto tool = latest_.lock())

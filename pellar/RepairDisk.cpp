@@ -7,6 +7,7 @@
 #include "pellar/jobs/PartOfImageScript.h"
 #include "pellar/jobs/PartitionMapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/jobs/UndoScript.h"
 #include "pellar/jobs/VolumeScript.h"
 #include "pellar/packages/InstalledSystem.h"
 #include "pellar/partitions/MapDisk.h"
@@ -41,8 +42,9 @@ bool needsPrivileges(Task task, const contract::DiskReference& disk, const Syste
     if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return false;
     if (task.subject == Subject::Permissions)
-        return task.isRepair();
-    return ::access(disk.path.c_str(), task.isRepair() ? R_OK | W_OK : R_OK) != 0 ||
+        return task.operation != Operation::Verify;
+    const bool isRead = accessFor(task.operation) == Access::ReadOnly;
+    return ::access(disk.path.c_str(), isRead ? R_OK : R_OK | W_OK) != 0 ||
            !mountsOf(status.st_rdev, paths).empty();
 }
 
@@ -54,6 +56,12 @@ bool holdsDirectory(const std::vector<Mount>& places, const std::filesystem::pat
     return holder && std::any_of(places.begin(), places.end(), [&](const Mount& place) {
                return place.target == holder->target;
            });
+}
+
+bool isMountedAtRoot(const std::vector<Mount>& places)
+{
+    return std::any_of(places.begin(), places.end(),
+                       [](const Mount& place) { return place.target == "/"; });
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -149,6 +157,8 @@ ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& dis
         return error;
     if (beginPrivileged(task, disk))
         return contract::kPLNoError;
+    if (task.isUndo())
+        return beginUndo(task, disk);
     switch (task.subject) {
         case Subject::Filesystem: return beginVolume(disk, task.operation);
         // The disk is claimed by the job: why it cannot be had is then said in the log, where a
@@ -174,6 +184,19 @@ ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation op
     return contract::kPLNoError;
 }
 
+ErrorCode RepairDisk::beginUndo(Task task, const DiskReferencePointer& disk)
+{
+    UndoRequest request{task, disk, {}};
+    if (task.subject == Subject::Filesystem)
+        request.mounts = mountsOf(disk->path, options_.systemPaths);
+    if (isMountedAtRoot(request.mounts))
+        return contract::kPLErrorCouldNotUnmount;
+    start(disk, [=, this](StopSwitch& stop, EventQueue& events) {
+        return std::make_unique<UndoScript>(request, context(*disk, stop, events));
+    });
+    return contract::kPLNoError;
+}
+
 /// NO when the job needs no other rights, or there is no way to them.
 bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
 {
@@ -196,8 +219,7 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     if (error != contract::kPLErrorCouldNotUnmount && error != contract::kPLErrorDiskInUse)
         return error;
     auto mounts = mountsOf(disk->path, options_.systemPaths);
-    const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
-                                    [](const Mount& place) { return place.target == "/"; });
+    const bool isRoot = isMountedAtRoot(mounts);
     const bool staysMounted =
         isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
@@ -254,7 +276,7 @@ ErrorCode RepairDisk::refusal(Task task, const DiskReferencePointer& disk) const
         return refusalOfPermissions(*disk);
     if (disk->isWhole != (task.subject == Subject::PartitionMap))
         return contract::kPLErrorUnsupported;
-    if (task.subject == Subject::Filesystem)
+    if (task.subject == Subject::Filesystem && !task.isUndo())
         traceTool(*disk, task.operation);
     return contract::kPLNoError;
 }

@@ -41,6 +41,8 @@ inline constexpr ErrorCode kPLErrorDamagedForGood = -69712;
 inline constexpr ErrorCode kPLErrorNotProven = -69713;
 inline constexpr ErrorCode kPLErrorNotTried = -69714;     ///< a repair could not be tried first
 inline constexpr ErrorCode kPLErrorInterrupted = -69715;  ///< an earlier repair is half applied
+inline constexpr ErrorCode kPLErrorNothingToUndo = -69716;
+inline constexpr ErrorCode kPLErrorNotUndone = -69717;  ///< and the disk is as it was
 
 /// A repair of what is not repaired here, though it can be verified.
 inline constexpr ErrorCode kPLErrorNoRepairHere = -69740;
@@ -95,6 +97,8 @@ inline constexpr std::array errorTexts{
               "The repair could not be tried first, so nothing was written to the volume."},
     ErrorText{kPLErrorInterrupted,
               "An earlier repair of the disk was interrupted; finish it or undo it first."},
+    ErrorText{kPLErrorNothingToUndo, "There is no repair of the disk that could be undone."},
+    ErrorText{kPLErrorNotUndone, "The repair was not undone; the disk is as the repair left it."},
     ErrorText{kPLErrorNotRepaired, "The volume is still damaged after the repair."},
     ErrorText{kPLErrorInconclusive,
               "It could not be determined whether the volume is damaged."},

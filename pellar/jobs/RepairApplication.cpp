@@ -72,15 +72,15 @@ constexpr double keptAt = 85;
 
 }  // namespace
 
-RecordedDisk recordedDisk(const contract::DiskReference& reference, const DiskClaim& claim)
+RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
+                          ByteRange region)
 {
     std::error_code error;
     const auto path = std::filesystem::canonical(reference.path, error);
-    const ByteRange region{claim.offset(), claim.availableBytes()};
     return {error ? reference.path : path,
             region.offset,
             region.length,
-            readSuperblock(claim.descriptor(), region).uuid,
+            readSuperblock(descriptor, region).uuid,
             reference.filesystem,
             reference.name};
 }
@@ -144,7 +144,8 @@ Result<UndoRecord, Sentence> RepairApplication::save(const UndoStore& store,
     const DiskClaim& claim = disk_.claim();
     FileRegion before(claim.descriptor(), claim.offset(), claim.availableBytes());
     TriedRegion after(trial_.overlay());
-    const RecordedRepair repair{recordedDisk(disk_.reference(), claim),
+    const RecordedRepair repair{recordedDisk(disk_.reference(), claim.descriptor(),
+                                             {claim.offset(), claim.availableBytes()}),
                                 {Subject::Filesystem, Operation::Repair},
                                 context_.options.trials.user,
                                 std::chrono::system_clock::now()};

@@ -13,8 +13,8 @@
 namespace pellar {
 
 /// Which disk this is, for a record of what a repair overwrites there.
-[[nodiscard]] RecordedDisk recordedDisk(const contract::DiskReference& reference,
-                                        const DiskClaim& claim);
+[[nodiscard]] RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
+                                        ByteRange region);
 
 /// What a repair has come to where it was tried: kept, and brought to the disk; or only shown. The
 /// job's thread; the references outlive it.

@@ -44,7 +44,9 @@ public:
 
     FileSectors sectors() const;
     [[nodiscard]] PartitionMap readMap() const;
+    int descriptor() const { return disk_.get(); }
     std::uint64_t offset() const { return offset_; }
+    std::uint64_t length() const { return length_; }
     /// Asks the kernel to read a device's map again; NO when it refuses. Nothing to do for a file.
     [[nodiscard]] bool rereadPartitions() const;
 
