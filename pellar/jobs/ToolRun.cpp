@@ -70,7 +70,10 @@ RunRequest ToolRun::requestFor(const DiskForTool& disk) const
     RunRequest request;
     request.wantsTerminal = tool_.habits.wantsTerminal;
     request.ignoresStops = isUnstoppable();
-    request.command = {program_, tool_.arguments(access_, diskArgumentOfTool(), disk.offset())};
+    request.command = {program_,
+                       logParts_.empty()
+                           ? tool_.arguments(access_, diskArgumentOfTool(), disk.offset())
+                           : tool_.logArguments(logParts_, diskArgumentOfTool())};
     request.access = access_;
     request.disk = disk.descriptor();
     request.limits = context_.options.outputLimits;
@@ -145,7 +148,10 @@ void ToolRun::tellToolLines()
             case ToolLine::Kind::Problem:
                 problems_ == Problems::Kept ? log.detail(text) : log.problem(text);
                 break;
-            case ToolLine::Kind::Detail: log.detail(text); break;
+            case ToolLine::Kind::Detail:
+                if (logParts_.empty())
+                    log.detail(text);
+                break;
             case ToolLine::Kind::Progress: log.progress(line.percent); break;
         }
     }

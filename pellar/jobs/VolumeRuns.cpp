@@ -80,6 +80,12 @@ Result<DiskForTool, int> VolumeRuns::prepare(DiskForTool::Form form, Access acce
 RunEvidence VolumeRuns::run(Access access, ToolRun::Problems problems)
 {
     volume_ = facts();  // the run before may have changed what is to be seen
+    return runOn(access, problems, {});
+}
+
+RunEvidence VolumeRuns::runOn(Access access, ToolRun::Problems problems,
+                              const std::vector<std::uint64_t>& logParts)
+{
     const auto form =
         tool_->habits.takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
     const auto disk = prepare(form, access);
@@ -88,6 +94,7 @@ RunEvidence VolumeRuns::run(Access access, ToolRun::Problems problems)
         return {access, {NotStarted{disk.error()}}, {}, volume_};
     }
     ToolRun run(*tool_, program(access), access, problems, context_);
+    run.readLog(logParts);
     return run.run(*disk, volume_);
 }
 
@@ -117,6 +124,30 @@ Judgement VolumeRuns::judge(const RunEvidence& evidence) const
     if (!claim.isEndReadable())
         return unreadable(claim.availableBytes() - 1);
     return asKernelSays(judgement, evidence);
+}
+
+Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
+{
+    const Judgement judgement = judge(evidence);
+    const bool isLeftOut = tool_->logArguments != nullptr && evidence.volume.log != 0 &&
+                           judgement.verdict == Verdict::Inconclusive &&
+                           !evidence.findings.lacksOtherDisk;
+    if (!isLeftOut)
+        return judgement;
+    context_.log.step(Operation::Verify, {"Reading the log that waits to be replayed", {}, {}});
+    const auto first =
+        runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
+    const auto rest = first.findings.logParts.empty()
+                          ? first
+                          : runOn(Access::ReadOnly, ToolRun::Problems::Shown,
+                                  first.findings.logParts);
+    for (const RunEvidence& part : {first, rest})
+        if (part.result.ending != Ending(Exited{0}))
+            return judgement;
+    if (first.findings.problems > 0 || rest.findings.problems > 0)
+        return damaged(0, {"its log, which waits to be replayed, is damaged", {}, {}});
+    evidence.volume.needsRecovery = false;
+    return judge(evidence);
 }
 
 /// What a tool takes for damage may be a disk that cannot be read, which not every tool says.

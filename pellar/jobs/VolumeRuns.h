@@ -36,6 +36,9 @@ public:
 
     RunEvidence run(Access access, ToolRun::Problems problems);
     Judgement judge(const RunEvidence& evidence) const;
+    /// The same of a verification, after a log that waits was read as well, where the tool passes
+    /// over it.
+    Judgement judgeWithLog(RunEvidence evidence);
     /// The kernel brings a log that waits to its place (ToolHabits::logReplayedAs); 0 or an errno.
     int replayLog();
 
@@ -49,6 +52,8 @@ public:
 private:
     VolumeFacts facts() const;
     Result<DiskForTool, int> prepare(DiskForTool::Form form, Access access) const;
+    RunEvidence runOn(Access access, ToolRun::Problems problems,
+                      const std::vector<std::uint64_t>& logParts);
     Judgement asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const;
 
     const JobDisk& disk_;

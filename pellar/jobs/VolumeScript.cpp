@@ -91,6 +91,8 @@ VolumeScript::State VolumeScript::examine()
         return end(*objection);
     if (const auto refusal = disk_.take(accessFor(operation_, context_.policy)))
         return end(*refusal);
+    if (const auto objection = objectionToHistory())
+        return end(*objection);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
     if (tool_ == nullptr && disk_.reference().filesystem.empty())
@@ -116,6 +118,33 @@ std::optional<Outcome> VolumeScript::objectionToJob() const
                                                 context_.options.toolPath, context_.repairWay());
     return capability.isGiven() ? std::nullopt
                                 : std::optional(failedOutcome(capability.error, capability.reason));
+}
+
+/// What is half repaired is as it was neither before nor after.
+std::optional<Outcome> VolumeScript::objectionToHistory()
+{
+    const auto directory = recordsIn(context_.options.trials);
+    if (context_.options.trials.room.directory.empty() || !std::filesystem::exists(directory))
+        return std::nullopt;
+    const auto store = UndoStore::open(directory);
+    if (!store)
+        return std::nullopt;
+    const DiskClaim& claim = disk_.claim();
+    const RecordList list = store->list();
+    const ListedRecord* const newest =
+        newestOf(recordedDisk(disk_.reference(), claim.descriptor(),
+                              {claim.offset(), claim.availableBytes()}),
+                 list);
+    if (newest == nullptr || !newest->isInterrupted())
+        return std::nullopt;
+    const Sentence reason{
+        "an earlier repair of it was interrupted; finish it or undo it first", {}, {}};
+    if (operation_ == Operation::Repair && !context_.policy.isPreview)
+        return failedOutcome(contract::kPLErrorInterrupted, reason);
+    log_.error(Sentence{"An earlier repair of “%1$@” was interrupted; finish it or undo it first.",
+                        log_.diskName(),
+                        {}});
+    return std::nullopt;
 }
 
 /// Where no file system is found in its place, that may be for want of reading.
@@ -197,11 +226,13 @@ VolumeScript::State VolumeScript::verify()
     log_.meter().setRange(0, isThorough || hasJournal ? readingEnds : 100);
     const RunEvidence evidence = runs_.run(
         Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
-    const Judgement judgement = runs_.judge(evidence);
+    const Judgement judgement = runs_.judgeWithLog(evidence);
     const bool canBeRepaired = tool_->repairs(context_.repairWay());
     if (judgement.verdict == Verdict::Damaged && !runs_.volume().isCutShort())
         tellMeaning(evidence);
     outcome_ = canBeRepaired ? outcomeOfVerification(judgement) : outcomeWithoutRepair(judgement);
+    if (judgement.verdict == Verdict::Sound && hasJournal)
+        tellJournal();
     look_.waitsForMount =
         evidence.findings.skippedJournal && !tool_->habits.logReplayedAs.empty();
     const bool isWorthATrial =
@@ -219,6 +250,14 @@ void VolumeScript::tellMeaning(const RunEvidence& evidence)
         damage.add(Damage::Unsurveyed);
     for (const std::string_view meaning : meaningOf(damage, tool_->repairs(context_.repairWay())))
         log_.remark(Sentence{meaning, {}, {}});
+}
+
+void VolumeScript::tellJournal()
+{
+    log_.remark(Sentence{"Its journal waits to be replayed, which mounting it does; with that, no "
+                         "damage was found.",
+                         {},
+                         {}});
 }
 
 /// What a repair finds and changes is known once it is done; so it is done where the disk stays as
@@ -250,10 +289,7 @@ Outcome VolumeScript::decidedBy(const Outcome& tried, bool foundProblems)
         return outcome_;
     if (isProven(tried) && !foundProblems) {
         if (outcome_.verdict == Verdict::Inconclusive)
-            log_.remark(Sentence{"Its journal waits to be replayed, which mounting it does; with "
-                                 "that, no damage was found.",
-                                 {},
-                                 {}});
+            tellJournal();
         return outcome_.code == contract::kPLErrorToolFailed
                    ? outcome_  // the tool broke off, and has not said over what
                    : outcomeOfVerification(sound(0));
@@ -274,7 +310,7 @@ VolumeScript::State VolumeScript::look()
     const bool hasJournal = runs_.volume().needsRecovery;
     const RunEvidence evidence = runs_.run(
         Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
-    const Judgement judgement = runs_.judge(evidence);
+    const Judgement judgement = runs_.judgeWithLog(evidence);
     look_.counts.collectedOne = tool_->habits.collectedOne;
     look_.counts.collectedMany = tool_->habits.collectedMany;
     look_.counts.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;

@@ -68,7 +68,9 @@ private:
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToDisk();
     std::optional<Outcome> objectionToSize();
+    std::optional<Outcome> objectionToHistory();
     Outcome withoutTool() const;
+    void tellJournal();
     void tellMeaning(const RunEvidence& evidence);
     std::optional<Sentence> beginTrial();
     Outcome decidedBy(const Outcome& tried, bool foundProblems);

@@ -58,6 +58,10 @@ struct Tool {
     /// `disk` is a name that the tool can open; `offset` is where in it the volume starts, bytes.
     std::vector<std::string> (*arguments)(Access access, const std::string& disk,
                                           std::uint64_t offset);
+    /// To read those parts of a log that waits, which the verification passes over; null where
+    /// there is none. What they are, but damage, is not told.
+    std::vector<std::string> (*logArguments)(const std::vector<std::uint64_t>& parts,
+                                             const std::string& disk) = nullptr;
     std::unique_ptr<OutputReader> (*makeReader)();
     /// Of a line from the progress descriptor. From 0 to 100, of one run; none when the line is no
     /// progress report.

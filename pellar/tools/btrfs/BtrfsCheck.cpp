@@ -6,6 +6,7 @@
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <array>
+#include <charconv>
 
 namespace pellar {
 namespace {
@@ -31,6 +32,7 @@ constexpr std::array signs{
     DamageSign{"Csum didn't match", Damage::Structure},
     DamageSign{"No valid Btrfs found", Damage::Structure},
     DamageSign{"bad tree block", Damage::Structure},
+    DamageSign{"failed to read tree block", Damage::Structure},
     DamageSign{"bad key order", Damage::Structure},
     DamageSign{"couldn't ", Damage::Structure},
     DamageSign{"Couldn't ", Damage::Structure},
@@ -83,6 +85,7 @@ class BtrfsOutput final : public LineOutput {
             line.starts_with('[') ? phaseIn(phases, withoutNumber(line)) : nullptr;
         if (step != nullptr)
             return phase(line, step->key);
+        noteLogPart(line);
         if (note(line))
             return detail(line);
         if (isRemark(line)) {
@@ -93,6 +96,22 @@ class BtrfsOutput final : public LineOutput {
             noteReadFault({});
         const DamageSign* const sign = damageIn(signs, line);
         return sign == nullptr ? detail(line) : problem(line, sign->kind);
+    }
+
+    /// Of a log's tree of trees:
+    ///     "	item 0 key (TREE_LOG ROOT_ITEM 5) itemoff 15844 itemsize 439"
+    ///     "		generation 8 root_dirid 0 bytenr 30736384 byte_limit 0 bytes_used 0"
+    void noteLogPart(std::string_view line)
+    {
+        constexpr std::string_view sign = " bytenr ";
+        const std::size_t at = line.find(sign);
+        if (isLogItem_ && at != std::string_view::npos) {
+            std::uint64_t part = 0;
+            const char* const number = line.data() + at + sign.size();
+            if (std::from_chars(number, line.data() + line.size(), part).ec == std::errc())
+                findings_.logParts.push_back(part);
+        }
+        isLogItem_ = line.find("key (TREE_LOG ROOT_ITEM ") != std::string_view::npos;
     }
 
     /// YES for a line that tells of the check and not of the volume.
@@ -110,6 +129,8 @@ class BtrfsOutput final : public LineOutput {
             findings_.foundDiskInUse || line.find("is currently mounted") != std::string_view::npos;
         return isTally || isMissing;
     }
+
+    bool isLogItem_ = false;  ///< the line before begins one
 };
 
 constexpr std::array damagedStatuses{1};
@@ -119,7 +140,8 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(superblock, "btrfs", disk, offset, availableBytes);
     facts.volumeBytes = superblock ? superblock->diskBytes : 0;
-    facts.needsRecovery = facts.hasPrimary && superblock->hasLog;
+    facts.log = facts.hasPrimary ? superblock->log : 0;
+    facts.needsRecovery = facts.log != 0;
     return facts;
 }
 
@@ -129,6 +151,17 @@ std::vector<std::string> arguments(Access access, const std::string& disk, std::
     if (access == Access::ReadWrite)
         return {"check", "--repair", "--force", disk};
     return {"check", "--readonly", disk};
+}
+
+// The log is a tree of trees; each is read with all that is below it.
+std::vector<std::string> logArguments(const std::vector<std::uint64_t>& parts,
+                                      const std::string& disk)
+{
+    std::vector<std::string> arguments{"inspect-internal", "dump-tree", "--hide-names", "--follow"};
+    for (const std::uint64_t part : parts)
+        arguments.insert(arguments.end(), {"-b", std::to_string(part)});
+    arguments.push_back(disk);
+    return arguments;
 }
 
 // It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
@@ -159,6 +192,7 @@ const Tool& btrfsCheck()
              {}},
         .examine = examine,
         .arguments = arguments,
+        .logArguments = logArguments,
         .makeReader = readerFor<BtrfsOutput>,
         .judge = judge,
     };
