@@ -92,7 +92,7 @@ Judgement RepairPasses::confirm()
     log_.meter().setRange(share_.from + whole * repairShare, share_.to);
     const RunEvidence evidence = runs_.run(Access::ReadOnly, ToolRun::Problems::Shown);
     look_.counts.after = evidence.findings.files;
-    Judgement judgement = runs_.judge(evidence);
+    Judgement judgement = runs_.judgeWithLog(evidence);
     leftDamage_ = leftDamage_ || judgement.verdict == Verdict::Damaged;
     return judgement;
 }

@@ -50,6 +50,12 @@ ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access,
 {
 }
 
+void ToolRun::readLog(std::vector<std::uint64_t> parts)
+{
+    logParts_ = std::move(parts);
+    reader_ = tool_.logReading->makeReader();
+}
+
 RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 {
     JobLog& log = context_.log;
@@ -73,7 +79,7 @@ RunRequest ToolRun::requestFor(const DiskForTool& disk) const
     request.command = {program_,
                        logParts_.empty()
                            ? tool_.arguments(access_, diskArgumentOfTool(), disk.offset())
-                           : tool_.logArguments(logParts_, diskArgumentOfTool())};
+                           : tool_.logReading->arguments(logParts_, diskArgumentOfTool())};
     request.access = access_;
     request.disk = disk.descriptor();
     request.limits = context_.options.outputLimits;

@@ -31,8 +31,8 @@ public:
     ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
             JobContext& context);
 
-    /// It is to read these parts of a log (Tool::logArguments) instead of verifying.
-    void readLog(std::vector<std::uint64_t> parts) { logParts_ = std::move(parts); }
+    /// It is to read these parts of a log (Tool::logReading) instead of verifying.
+    void readLog(std::vector<std::uint64_t> parts);
 
     /// Runs the tool to its end. `volume` is what was seen of the disk before.
     [[nodiscard]] RunEvidence run(const DiskForTool& disk, const VolumeFacts& volume);

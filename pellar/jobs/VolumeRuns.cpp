@@ -94,7 +94,8 @@ RunEvidence VolumeRuns::runOn(Access access, ToolRun::Problems problems,
         return {access, {NotStarted{disk.error()}}, {}, volume_};
     }
     ToolRun run(*tool_, program(access), access, problems, context_);
-    run.readLog(logParts);
+    if (!logParts.empty())
+        run.readLog(logParts);
     return run.run(*disk, volume_);
 }
 
@@ -129,18 +130,21 @@ Judgement VolumeRuns::judge(const RunEvidence& evidence) const
 Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
 {
     const Judgement judgement = judge(evidence);
-    const bool isLeftOut = tool_->logArguments != nullptr && evidence.volume.log != 0 &&
+    const bool isLeftOut = tool_->logReading != nullptr && evidence.volume.log != 0 &&
                            judgement.verdict == Verdict::Inconclusive &&
                            !evidence.findings.lacksOtherDisk;
     if (!isLeftOut)
         return judgement;
     context_.log.step(Operation::Verify, {"Reading the log that waits to be replayed", {}, {}});
+    // On the disk: its log is no other, and btrfs takes no file without a name (realpath(3)).
+    const TrialDisk* const trial = std::exchange(trial_, nullptr);
     const auto first =
         runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
     const auto rest = first.findings.logParts.empty()
                           ? first
                           : runOn(Access::ReadOnly, ToolRun::Problems::Shown,
                                   first.findings.logParts);
+    trial_ = trial;
     for (const RunEvidence& part : {first, rest})
         if (part.result.ending != Ending(Exited{0}))
             return judgement;

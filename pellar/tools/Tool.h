@@ -43,6 +43,14 @@ struct ToolHabits {
     std::string_view collectedMany = "no damage is left; %1$@ files are now in lost+found";
 };
 
+/// How a tool reads a log that waits to be replayed, which its verification passes over: by the
+/// places of its parts. What is not damage is not told.
+struct LogReading {
+    std::vector<std::string> (*arguments)(const std::vector<std::uint64_t>& parts,
+                                          const std::string& disk);
+    std::unique_ptr<OutputReader> (*makeReader)();
+};
+
 /// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
 /// any thread.
 struct Tool {
@@ -58,10 +66,6 @@ struct Tool {
     /// `disk` is a name that the tool can open; `offset` is where in it the volume starts, bytes.
     std::vector<std::string> (*arguments)(Access access, const std::string& disk,
                                           std::uint64_t offset);
-    /// To read those parts of a log that waits, which the verification passes over; null where
-    /// there is none. What they are, but damage, is not told.
-    std::vector<std::string> (*logArguments)(const std::vector<std::uint64_t>& parts,
-                                             const std::string& disk) = nullptr;
     std::unique_ptr<OutputReader> (*makeReader)();
     /// Of a line from the progress descriptor. From 0 to 100, of one run; none when the line is no
     /// progress report.
@@ -69,6 +73,8 @@ struct Tool {
         return std::optional<double>();
     };
     Judgement (*judge)(const RunEvidence& evidence);
+    /// Null where a verification leaves nothing out of a log, or no tool can read it.
+    const LogReading* logReading = nullptr;
 
     bool repairs(RepairWay way) const
     {

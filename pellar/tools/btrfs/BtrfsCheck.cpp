@@ -32,7 +32,6 @@ constexpr std::array signs{
     DamageSign{"Csum didn't match", Damage::Structure},
     DamageSign{"No valid Btrfs found", Damage::Structure},
     DamageSign{"bad tree block", Damage::Structure},
-    DamageSign{"failed to read tree block", Damage::Structure},
     DamageSign{"bad key order", Damage::Structure},
     DamageSign{"couldn't ", Damage::Structure},
     DamageSign{"Couldn't ", Damage::Structure},
@@ -85,7 +84,6 @@ class BtrfsOutput final : public LineOutput {
             line.starts_with('[') ? phaseIn(phases, withoutNumber(line)) : nullptr;
         if (step != nullptr)
             return phase(line, step->key);
-        noteLogPart(line);
         if (note(line))
             return detail(line);
         if (isRemark(line)) {
@@ -96,22 +94,6 @@ class BtrfsOutput final : public LineOutput {
             noteReadFault({});
         const DamageSign* const sign = damageIn(signs, line);
         return sign == nullptr ? detail(line) : problem(line, sign->kind);
-    }
-
-    /// Of a log's tree of trees:
-    ///     "	item 0 key (TREE_LOG ROOT_ITEM 5) itemoff 15844 itemsize 439"
-    ///     "		generation 8 root_dirid 0 bytenr 30736384 byte_limit 0 bytes_used 0"
-    void noteLogPart(std::string_view line)
-    {
-        constexpr std::string_view sign = " bytenr ";
-        const std::size_t at = line.find(sign);
-        if (isLogItem_ && at != std::string_view::npos) {
-            std::uint64_t part = 0;
-            const char* const number = line.data() + at + sign.size();
-            if (std::from_chars(number, line.data() + line.size(), part).ec == std::errc())
-                findings_.logParts.push_back(part);
-        }
-        isLogItem_ = line.find("key (TREE_LOG ROOT_ITEM ") != std::string_view::npos;
     }
 
     /// YES for a line that tells of the check and not of the volume.
@@ -128,6 +110,34 @@ class BtrfsOutput final : public LineOutput {
         findings_.foundDiskInUse =
             findings_.foundDiskInUse || line.find("is currently mounted") != std::string_view::npos;
         return isTally || isMissing;
+    }
+};
+
+/// Reads what btrfs inspect-internal dump-tree prints of a log's tree of trees, and of these. It
+/// ends with 0 also where it could not read.
+class BtrfsLogOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        noteLogPart(line);
+        const bool isDamage = line.starts_with("checksum verify failed") ||
+                              line.starts_with("parent transid verify failed") ||
+                              line.starts_with("bad tree block") || line.starts_with("ERROR: ");
+        return isDamage ? problem(line, Damage::Structure) : detail(line);
+    }
+
+    ///     "	item 0 key (TREE_LOG ROOT_ITEM 5) itemoff 15844 itemsize 439"
+    ///     "		generation 8 root_dirid 0 bytenr 30736384 byte_limit 0 bytes_used 0"
+    void noteLogPart(std::string_view line)
+    {
+        constexpr std::string_view sign = " bytenr ";
+        const std::size_t at = line.find(sign);
+        if (isLogItem_ && at != std::string_view::npos) {
+            std::uint64_t part = 0;
+            const char* const number = line.data() + at + sign.size();
+            if (std::from_chars(number, line.data() + line.size(), part).ec == std::errc())
+                findings_.logParts.push_back(part);
+        }
+        isLogItem_ = line.find("key (TREE_LOG ROOT_ITEM ") != std::string_view::npos;
     }
 
     bool isLogItem_ = false;  ///< the line before begins one
@@ -181,6 +191,7 @@ Judgement judge(const RunEvidence& evidence)
 
 const Tool& btrfsCheck()
 {
+    static constexpr LogReading logReading{logArguments, readerFor<BtrfsLogOutput>};
     static const Tool tool{
         .name = name,
         .repairName = name,
@@ -192,9 +203,9 @@ const Tool& btrfsCheck()
              {}},
         .examine = examine,
         .arguments = arguments,
-        .logArguments = logArguments,
         .makeReader = readerFor<BtrfsOutput>,
         .judge = judge,
+        .logReading = &logReading,
     };
     return tool;
 }
