@@ -8,7 +8,6 @@
 #include <QAccessible>
 #include <QAction>
 #include <QMenu>
-#include <QMenuBar>
 
 #include <map>
 

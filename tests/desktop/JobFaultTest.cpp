@@ -13,37 +13,23 @@ namespace {
 namespace fs = std::filesystem;
 
 /// What happens to the disk or to the tool while a real job runs.
-class JobFaultTest : public WindowFixture {
-protected:
-    /// The real e2fsck, which begins when `go` is called.
-    void useWaitingTool()
-    {
-        const fs::path tool = directory_ / "tools/e2fsck";
-        orvane::test::write(tool, "#!/bin/sh\necho $$ >'" + waits().native() + "'\n" +
-                                      "while [ ! -e '" + mayGo().native() +
-                                      "' ]; do sleep 0.02; done\nexec /usr/sbin/e2fsck \"$@\"\n");
-        fs::permissions(tool, fs::perms::owner_all);
-        ::setenv("FIXWELL_TOOL_PATH", tool.parent_path().c_str(), 1);
-    }
-    fs::path waits() const { return directory_ / "waits"; }
-    fs::path mayGo() const { return directory_ / "go"; }
-};
+using JobFaultTest = WindowFixture;
 
 TEST_F(JobFaultTest, AnImageThatIsLostDuringItsCheckIsNeverTakenForAnother)
 {
     for (const std::string name : {"deleted", "replaced"}) {
-        fs::remove(mayGo());
-        fs::remove(waits());
-        useWaitingTool();
+        const fs::path tools = directory_.fakeTools("say Pass 1: Checking inodes\nawait go\n");
+        fs::remove(tools / "go");
+        ::setenv("FIXWELL_TOOL_PATH", tools.c_str(), 1);
         const std::string image = openImage(name);
         button("verifyDiskButton").press();
-        ASSERT_TRUE(waitUntil([&] { return fs::exists(waits()); }));
+        ASSERT_TRUE(waitUntil([&] { return logHolds("Verifying"); }));
         const bool isReplaced = name == "replaced";
         if (isReplaced)
             fs::rename(makeImage("other"), image);
         else
             fs::remove(image);
-        orvane::test::write(mayGo(), "");
+        orvane::test::write(tools / "go", "");
         ASSERT_TRUE(waitForJob());
         EXPECT_TRUE(waitUntil([&] { return verdict(image) == (isReplaced ? "" : "failed"); }))
             << name << ": " << verdict(image) << "; the other was never checked";

@@ -3,7 +3,7 @@
 #include "orvane/support/udisks/UDisks.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/LoopDevice.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QMenu>
 
@@ -27,8 +27,6 @@ protected:
         if (const char* const obstacle = LoopDevice::obstacle())
             GTEST_SKIP() << obstacle;
         device_ = std::make_unique<LoopDevice>(makeImage("volume"));
-        if (device_->name().empty())
-            GTEST_SKIP() << "no loop device can be set up here";
         if (asked() == Refusal::Kind::NoService)
             GTEST_SKIP() << "no UDisks2 runs here";
         ASSERT_TRUE(waitUntil([&] { return asked() == Refusal::Kind::AlreadySo; }));
@@ -55,6 +53,25 @@ protected:
 
     std::unique_ptr<LoopDevice> device_;
 };
+
+using SystemDisksTest = WindowFixture;
+
+TEST_F(SystemDisksTest, TheListFollowsADeviceWithoutARescan)
+{
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const std::string image = makeImage("plugged");
+    openWithSystemDisks();
+    LoopDevice device(image);
+    ASSERT_TRUE(waitUntil(
+        [&] { return cell(device.name(), DiskColumn::Name).starts_with("plugged (loop"); }));
+
+    run("verifyDiskButton", device.name());
+    EXPECT_EQ(verdict(device.name()), "sound");
+    device.detach();
+    EXPECT_TRUE(waitUntil([&] { return cell(device.name(), DiskColumn::Name).empty(); }));
+    EXPECT_TRUE(waitUntil([&] { return !button("verifyDiskButton").isEnabled(); }));
+}
 
 TEST_F(VolumeTest, AVolumeIsMountedUnmountedAndEjectedFromTheMenu)
 {

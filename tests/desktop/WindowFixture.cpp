@@ -2,60 +2,44 @@
 #include "tests/desktop/WindowFixture.h"
 
 #include "orvane/desktop/toolkit/Text.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QAbstractButton>
-#include <QApplication>
 #include <QTest>
 
 #include <cstdlib>
 
 namespace orvane::desktop::test {
 
-using orvane::test::runTool;
-
-namespace fs = std::filesystem;
+using orvane::test::prepareWith;
 
 std::string WindowFixture::makeImage(const std::string& name)
 {
-    const std::string image = directory_ / (name + ".img");
-    orvane::test::write(image, "");
-    fs::resize_file(image, 8 << 20);
-    EXPECT_EQ(runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", name, image}), 0);
-    return image;
+    return directory_.makeExt(name + ".img", 8 << 20, {"-L", name});
 }
 
 std::string WindowFixture::makeDamagedImage(const std::string& name)
 {
     const std::string image = makeImage(name);
-    EXPECT_EQ(runTool({"debugfs", "-w", "-R", "set_super_value free_blocks_count 7", image}), 0);
-    EXPECT_EQ(runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
+    directory_.damage(image, "set_super_value free_blocks_count 7");
+    directory_.damage(image, "clri /lost+found");
     return image;
 }
 
 std::string WindowFixture::makePartitionedImage(const std::string& name)
 {
-    const std::string image = directory_ / (name + ".img");
-    orvane::test::write(image, "");
-    fs::resize_file(image, 24 << 20);
-    EXPECT_EQ(runTool({"sfdisk", "-q", image}, "label: gpt\nstart=2048,size=16384\nsize=16384\n"),
-              0);
-    EXPECT_EQ(runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "inner", "-E", "offset=1048576",
-                       image, "8192k"}),
-              0);
+    const std::string image = directory_.makeFile(name + ".img", 24 << 20);
+    prepareWith({"sfdisk", "-q", image}, "label: gpt\nstart=2048,size=16384\nsize=16384\n");
+    prepareWith({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "inner", "-E", "offset=1048576", image,
+                 "8192k"});
     return image;
 }
 
 void WindowFixture::useEndlessTool()
 {
-    const fs::path tool = directory_ / "tools/e2fsck";
-    orvane::test::write(tool,
-                        "#!/bin/sh\n"
-                        "trap 'exit 32' INT TERM\n"
-                        "echo 'Pass 1: Checking inodes, blocks, and sizes'\n"
-                        "while :; do sleep 0.05; done\n");
-    fs::permissions(tool, fs::perms::owner_all);
-    ::setenv("FIXWELL_TOOL_PATH", tool.parent_path().c_str(), 1);
+    const std::string tools =
+        directory_.fakeTools("say Pass 1: Checking inodes, blocks, and sizes\nwait");
+    ::setenv("FIXWELL_TOOL_PATH", tools.c_str(), 1);
 }
 
 void WindowFixture::TearDown()

@@ -2,7 +2,7 @@
 #pragma once
 
 #include "orvane/desktop/DesktopSession.h"
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
@@ -61,7 +61,7 @@ protected:
     DesktopSession& session() { return *session_; }
     MainWindow& window() { return session_->window(); }
 
-    orvane::test::TemporaryDirectory directory_;
+    orvane::test::TestDirectory directory_;
     bool wasClosed_ = false;
     std::unique_ptr<DesktopSession> session_;
 

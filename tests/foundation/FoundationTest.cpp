@@ -216,14 +216,4 @@ TEST(RichText, EscapesEverythingThatRTFWouldObey)
               std::string::npos);
 }
 
-TEST(Locks, MayBeGivenBackByOneWhoDidNotGetThem)
-{
-    Lock lock;
-    EXPECT_TRUE(lock.tryLock());
-    EXPECT_FALSE(lock.tryLock());
-    lock.unlock();
-    lock.unlock();
-    EXPECT_TRUE(lock.tryLock());
-}
-
 }  // namespace contract

@@ -79,19 +79,26 @@ TEST_F(OVFXWTest, LibraryMessagesBecomeRecords)
         Dictionary message;
         std::int64_t level;
         bool isBold;
+        std::optional<Color> color;
     };
+    const Color red{1, 0, 0, 1};
+    const Color green{0, 0.8, 0.2, 1};
     const auto disk = addDisk("a");
     select(disk);
     module->repairDisk(nullptr);
     for (const Case& c :
-         {Case{message("VERIFY", "step", 2), 1, false}, Case{message("REPAIR", "step"), 1, false},
-          Case{message("ERROR", "bad", 2), -1, false}, Case{message("ERROR", "bad", -1), -1, true},
-          Case{message("FAIL", "no", 0), 0, false}, Case{message("", "x", 2), 2, false},
-          Case{message("", "x"), 0, false}}) {
+         {Case{message("VERIFY", "step", 2), 1, false, {}},
+          Case{message("REPAIR", "step"), 1, false, {}},
+          Case{message("ERROR", "bad", 2), -1, false, red},
+          Case{message("ERROR", "bad", -1), -1, true, red},
+          Case{message("FAIL", "no", 0), 0, false, red},
+          Case{message("SUCCESS", "ok", -1), -1, true, green},
+          Case{message("", "x", 2), 2, false, {}}, Case{message("", "x"), 0, false, {}}}) {
         say(disk, c.message);
         const Dictionary record = lastRecord(disk);
         EXPECT_EQ(verbosityOf(record), c.level);
-        EXPECT_EQ(finalText(record).style().font->isBold, c.isBold);
+        EXPECT_EQ(finalText(record).style().font, (Font{c.isBold, 11}));
+        EXPECT_EQ(finalText(record).style().color, c.color);
         EXPECT_EQ(finalText(record).characters().back(), '\n');
         EXPECT_FALSE(record.isSameAs(c.message)) << "the library's dictionary is copied";
     }

@@ -38,6 +38,14 @@ bool FakeRepairDisk::canRepairPartitionMapForDisk(const DiskReferencePointer&, E
         *error = kPLNoError;
     return host.canTreatPartitionMap;
 }
+bool FakeRepairDisk::canRepairStoragesystemFilesystemForDisk(Disk, ErrorCode*)
+{
+    return host.canTreatFilesystem;
+}
+bool FakeRepairDisk::canVerifyStoragesystemFilesystemForDisk(Disk, ErrorCode*)
+{
+    return host.canTreatFilesystem;
+}
 void FakeRepairDisk::cancelCurrentOperation()
 {
     host.journal.emplace_back("cancel");

@@ -17,21 +17,31 @@ namespace fixwell::testing {
 /// What the module asked of the host, in order.
 using Journal = std::vector<std::string>;
 
-struct FakeFilesystem final : OVFilesystem {
-    std::string type = "ext4";
+/// What a test says of a disk; a volume that is not mounted, with everything in order.
+struct FakeFacts {
+    std::int32_t type = 3;
+    std::int64_t number = 0;
+    bool whole = false;
+    std::optional<std::string> mount = {};
+    bool writable = true;
+    bool boot = false;
+    bool home = false;
+    bool smartError = false;
+    bool dvdRAM = false;
+    bool blankMedia = false;
+    bool offlineImage = false;
+    std::string imagePath = {};
+    bool ownership = true;
+    bool permissionsRepairable = true;
+    std::string format = "ext4";
     bool repairs = true;
     bool verifies = true;
     bool verifiesLive = false;
-
-    std::string filesystemType() const override { return type; }
-    bool canBeRepaired() const override { return repairs; }
-    bool canBeVerified() const override { return verifies; }
-    bool supportsLiveVerify() const override { return verifiesLive; }
 };
 
-/// A volume with everything in order, until a test says otherwise.
-struct FakeDisk final : OVDisk {
-    explicit FakeDisk(std::string id) : identifier(std::move(id)), name(identifier)
+struct FakeDisk final : OVDisk, OVFilesystem, FakeFacts {
+    explicit FakeDisk(std::string id, const FakeFacts& facts = {})
+        : FakeFacts(facts), identifier(std::move(id)), name(identifier)
     {
         auto made = std::make_shared<DiskReference>();
         made->identifier = identifier;
@@ -41,23 +51,8 @@ struct FakeDisk final : OVDisk {
 
     std::string identifier;
     std::string name;
-    std::int32_t type = 3;
-    std::int64_t number = 0;
-    bool whole = false;
     std::weak_ptr<OVDisk> parent;
     std::vector<OVDiskPointer> volumes;
-    std::optional<std::string> mount;
-    bool writable = true;
-    bool boot = false;
-    bool home = false;
-    bool smartError = false;
-    bool dvdRAM = false;
-    bool blankMedia = false;
-    bool offlineImage = false;
-    std::string imagePath;
-    bool ownership = true;
-    bool permissionsRepairable = true;
-    FakeFilesystem fileSystem;
     DiskReferencePointer reference;
     Array history;
 
@@ -80,7 +75,11 @@ struct FakeDisk final : OVDisk {
     std::string diskImagePath() const override { return imagePath; }
     bool permissionsEnabled() const override { return ownership; }
     bool canRepairPermissions() const override { return permissionsRepairable; }
-    const OVFilesystem* filesystem() const override { return &fileSystem; }
+    const OVFilesystem* filesystem() const override { return this; }
+    std::string filesystemType() const override { return format; }
+    bool canBeRepaired() const override { return repairs; }
+    bool canBeVerified() const override { return verifies; }
+    bool supportsLiveVerify() const override { return verifiesLive; }
     DiskReferencePointer theKRDisk() const override { return reference; }
     Array fsckHistory() const override;
     Array fsckHistoryNoChildren() const override { return history; }
@@ -137,8 +136,8 @@ struct FakeRepairDisk final : PLRepairDisk {
         return begin("repair map", disk);
     }
     bool canRepairPartitionMapForDisk(Disk disk, ErrorCode* error) override;
-    bool canRepairStoragesystemFilesystemForDisk(Disk, ErrorCode*) override { return true; }
-    bool canVerifyStoragesystemFilesystemForDisk(Disk, ErrorCode*) override { return true; }
+    bool canRepairStoragesystemFilesystemForDisk(Disk, ErrorCode*) override;
+    bool canVerifyStoragesystemFilesystemForDisk(Disk, ErrorCode*) override;
     void cancelCurrentOperation() override;
 
     ErrorCode begin(const char* what, Disk disk);
@@ -410,6 +409,7 @@ struct FakeHost : HostServices,
     std::map<std::string, ErrorCode, std::less<>> refusals;  ///< by disk identifier
     std::function<void()> whenBegun;                         ///< while a job is being begun
     bool canTreatPartitionMap = true;
+    bool canTreatFilesystem = true;
 };
 
 }  // namespace fixwell::testing

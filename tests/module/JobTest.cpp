@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "fixwell/history/CompletionReport.h"
 #include "tests/module/ModuleTest.h"
 
 namespace fixwell {
@@ -45,21 +44,6 @@ TEST_F(OVFXWTest, WholeDisksAreQueuedForTheirPartitionMapAlone)
     module->verifyDisk(nullptr);
     EXPECT_FALSE(host.has("verify map disk"));
     EXPECT_EQ(action(), FXWActionNone);
-}
-
-TEST_F(OVFXWTest, EntriesCarryWhatTheJobNeedsToKnow)
-{
-    const auto disk = addDisk("a");
-    disk->name = "Data";
-    disk->mount = "/mnt";
-    disk->fileSystem.type = "qvfs";
-    select(disk);
-    module->repairDisk(nullptr);
-    const Dictionary entry = inflightItem();
-    EXPECT_EQ(entry.size(), 7U);
-    EXPECT_EQ(entry.integer(kEntryAction), 6);
-    EXPECT_EQ(entry.integer(kFXW_OperationType), 2);
-    EXPECT_TRUE(entry.boolean(kEntryIsQVFS));
 }
 
 TEST_F(OVFXWTest, StartupDiskWarningAsksBeforeAVerification)
@@ -240,18 +224,13 @@ TEST_F(OVFXWTest, ADiskThatAFailedStartUnmountedIsMountedAgain)
     };
     module->verifyDisk(nullptr);
     EXPECT_TRUE(host.has("mount a"));
-}
 
-TEST_F(OVFXWTest, AMountPointWithoutALengthWasNeverMounted)
-{
-    const auto disk = addDisk("a");
+    // A mount point without a length was never one.
+    host.journal.clear();
+    host.whenBegun = {};
     disk->mount = "";
-    host.refusals["a"] = kPLErrorToolMissing;
-    verify(disk);
-    EXPECT_FALSE(host.has("mount a"));
-    host.refusals.clear();
     module->verifyDisk(nullptr);
-    EXPECT_FALSE(inflightItem().boolean(kEntryDiskWasMounted));
+    EXPECT_FALSE(host.has("mount a"));
 }
 
 // Disk images
@@ -339,49 +318,28 @@ TEST_F(OVFXWTest, OneReportAndOneWarningPerJob)
     EXPECT_EQ(linesOf(second).back(), "\n");
     EXPECT_TRUE(host.has("mount b with children")) << "a failed disk is mounted at once";
     EXPECT_FALSE(host.has("mount a with children"));
+    host.journal.clear();
+    module->repairPermissions(nullptr);
+    for (const auto& disk : {first, second, third})
+        finish(disk, kPLErrorToolFailed);
+    EXPECT_TRUE(std::ranges::none_of(host.journal, [](const auto& entry) {
+        return entry.starts_with("alert");
+    })) << "permission runs never warn";
 }
 
-TEST(CompletionReport, NamesTheFirstEntryAndItsAction)
+TEST_F(OVFXWTest, TheReportNamesTheAction)
 {
-    struct Case {
-        FXWAction action;
-        std::string_view key;
-    };
-    const auto disk = std::make_shared<testing::FakeDisk>("a");
-    for (const Case& c : {Case{FXWActionVerifyPermissions, "kOVOP_VerifyDiskPermissionsKey"},
-                          Case{FXWActionRepairPermissions, "kOVOP_RepairDiskPermissionsKey"},
-                          Case{FXWActionRepairPartitionMap, "kOVOP_VerifyDiskKey"},
-                          Case{FXWActionVerifyDisk, "kOVOP_VerifyDiskKey"},
-                          Case{FXWActionRepairDisk, "kOVOP_RepairDiskKey"}})
-        EXPECT_EQ(makeCompletionReport(Array::of({makeActionListEntry(disk, c.action)}))
-                      .string(kOVOP_ActionTypeKey),
-                  c.key);
-}
-
-TEST(Warnings, TheFirstDiskOperationWithAWarningSpeaks)
-{
-    const auto entry = [](FXWOperationType type, Value warning) {
-        const Dictionary made = Dictionary::of(
-            {{kFXW_OperationType, static_cast<int>(type)}, {kEntryPostWarningTitle, "title"}});
-        made.set(kEntryPostWarning, std::move(warning));
-        return made;
-    };
-    struct Case {
-        Array completed;
-        std::optional<PostedWarning> expected;
-        std::string_view because;
-    };
-    for (const Case& c :
-         {Case{Array::of({entry(FXWOperationRepairPermissions, "w")}), std::nullopt,
-               "permission runs never warn"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, {}), entry(FXWOperationRepairDisk, "x"),
-                          entry(FXWOperationRepairDisk, "y")}),
-               PostedWarning{"title", "x"}, "the first"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, "")}), PostedWarning{},
-               "an empty warning still closes the job with an empty alert"},
-          Case{Array::of({entry(FXWOperationVerifyDisk, ""), entry(FXWOperationVerifyDisk, {})}),
-               std::nullopt, "only the last entry's counts then"}})
-        EXPECT_EQ(warningToPost(c.completed), c.expected) << c.because;
+    const auto disk = addDisk("a");
+    select(disk);
+    for (const auto& [selector, key] :
+         {std::pair("verifyPermissions:", "kOVOP_VerifyDiskPermissionsKey"),
+          {"repairPermissions:", "kOVOP_RepairDiskPermissionsKey"},
+          {"verifyDisk:", "kOVOP_VerifyDiskKey"},
+          {"repairDisk:", "kOVOP_RepairDiskKey"}}) {
+        module->perform(selector, nullptr);
+        finish(disk);
+        EXPECT_EQ(host.report[kOVOP_ActionTypeKey].string(), key);
+    }
 }
 
 }  // namespace fixwell

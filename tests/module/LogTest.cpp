@@ -159,31 +159,6 @@ TEST_F(OVFXWTest, RowsKeepUpWithSeveralHistories)
     EXPECT_EQ(verbosityOf(module->outlineViewChildOfItem(3, {})), 0) << "another list";
 }
 
-TEST_F(OVFXWTest, RecordsAreStyledByTypeAndLevel)
-{
-    struct Case {
-        std::string_view type;
-        std::int64_t level;
-        bool isBold;
-        std::optional<Color> color;
-    };
-    const Color red{1, 0, 0, 1};
-    const Color green{0, 0.8, 0.2, 1};
-    for (const Case& c :
-         {Case{"SUCCESS", -1, true, green}, Case{"REPAIR", 0, false, {}},
-          Case{"ERROR", 0, false, red}, Case{"FAIL", -1, true, red}, Case{"", 2, false, {}}}) {
-        const auto disk = addDisk("a");
-        setInflightItem(makeActionListEntry(disk, FXWActionVerifyDisk));
-        disk->history = Array::make();
-        say(disk, Dictionary::of({{kFsckMessageType, c.type},
-                                  {kFsckMessageString, "x"},
-                                  {kFsckVerbosity, c.level}}));
-        const TextStyle style = finalText(disk->history.back().dictionary()).style();
-        EXPECT_EQ(style.font, (Font{c.isBold, 11})) << c.type;
-        EXPECT_EQ(style.color, c.color) << c.type;
-    }
-}
-
 TEST_F(OVFXWTest, OnlyAFullSelectionCanBeDeleted)
 {
     const auto disk = addDisk("a");

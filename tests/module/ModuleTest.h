@@ -47,7 +47,7 @@ protected:
     {
         auto disk = addDisk("root");
         disk->boot = true;
-        disk->fileSystem.verifiesLive = true;
+        disk->verifiesLive = true;
         return disk;
     }
     std::shared_ptr<FakeDisk> addImage(const std::string& path)
@@ -114,10 +114,7 @@ protected:
     }
     Array historyOfSelection() const { return module->allFsckHistoryOfSelection(); }
     void appendMessage(std::string_view text) { module->appendTitleToMessageText(text); }
-    std::string reason(std::int32_t code, bool multiple)
-    {
-        return module->reasonString(code, multiple);
-    }
+    ButtonDecision buttonDecision() { return module->decideButtons(); }
     void fileAsCompleted(const Dictionary& entry) { module->addDiskToCompletedList(entry); }
     OVDiskPointer inflightDisk() const { return module->searchForInflightDisk(); }
 

@@ -72,35 +72,6 @@ TEST(Job, VerifyAnswersWhatIsTrue)
     }
 }
 
-TEST(Job, ARepairIsEndedWhereTheDiskCannotBeRead)
-{
-    FakeToolFixture fixture(
-        "say Free blocks count wrong (1, counted=2).  Fix? no\n"
-        "say-in-repair Error reading block 5 (Input/output error).  Ignore error? yes\n"
-        "await-in-repair never\nexit 4");
-    ASSERT_EQ(fixture.library.repair(fixture.disk), 0);
-    EXPECT_EQ(fixture.heard.error, contract::kPLErrorUnreadable) << fixture.heard.message;
-    EXPECT_EQ(fixture.heard.verdict, "failed");
-    expectOneEnd(fixture);
-}
-
-TEST(Job, CancelIsHeardAndReported)
-{
-    FakeToolFixture fixture("ignore 2\nignore 15\nsay e2fsck 1.47.0\nwait");
-    const auto press = [&fixture] {
-        fixture.library.tool->cancelCurrentOperation();
-    };
-    fixture.heard.onMessage = [&] {
-        for (int i = 0; fixture.heard.hasPlainLine("e2fsck 1.47.0") && i < 3; ++i)
-            press();
-    };
-    ASSERT_EQ(fixture.library.verify(fixture.disk), 0);
-    EXPECT_EQ(fixture.heard.error, contract::kPLErrorCancelled);
-    EXPECT_EQ(fixture.heard.verdict, "stopped");
-    press();  // nothing runs
-    expectOneEnd(fixture);
-}
-
 TEST(Job, DestroyingTheToolEndsEverything)
 {
     for (const std::string_view script : {"wait", "flood-lines", "ignore 2\nignore 15\nwait"}) {
@@ -230,6 +201,7 @@ TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
     fixture.repair();
     const test::Listener& heard = fixture.library.listener;
     EXPECT_EQ(heard.verdict, "damaged") << "it never says that it has changed anything";
+    EXPECT_TRUE(heard.hasPlainLine("The volume “Disk” could not be repaired."));
     EXPECT_EQ(heard.textsOf(contract::kFsckError).size(), 2U)
         << "once before the repair, and once for what is left";
     EXPECT_EQ(heard.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";
@@ -281,19 +253,12 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
         test::TestLoop loop;
         const test::EnglishTexts texts;
         test::Listener listener;
-        const Job job(
-            [&](StopSwitch& stop, EventQueue& events) {
-                return std::make_unique<PartOfImageScript>(
-                    std::move(request), JobContext{*disk, options, texts, stop, events});
-            },
-            EventReceiver{&listener,
-                          disk,
-                          {},
-                          [] {
-                          }},
-            loop);
-        ASSERT_TRUE(loop.runUntil([&] { return listener.finished == 1; })) << filesystem;
-        EXPECT_EQ(listener.started, 1) << filesystem;
+        StopSwitch stop;
+        EventQueue events(loop, {&listener, disk, {}, [] {
+                                 }});
+        PartOfImageScript(std::move(request), {*disk, options, texts, stop, events}).run();
+        loop.drain();
+        EXPECT_EQ(listener.started + listener.finished, 2) << filesystem;
         ASSERT_EQ(asked.has_value(), isAsked) << filesystem;
         if (!asked)
             continue;

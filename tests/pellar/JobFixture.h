@@ -4,12 +4,11 @@
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/Manager.h"
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 
 #include <chrono>
 #include <condition_variable>
 #include <deque>
-#include <filesystem>
 #include <functional>
 #include <mutex>
 #include <string>
@@ -18,13 +17,9 @@
 
 namespace pellar::test {
 
-struct ToolAnswer {
-    int status = -1;  ///< -1 when the tool is not installed or was killed
-    std::string output;
-};
-
-/// Runs a system tool to its end.
-ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = {});
+using orvane::test::runTool;
+using orvane::test::TestDirectory;
+using orvane::test::ToolAnswer;
 
 bool contains(std::string_view text, std::string_view part);
 
@@ -82,31 +77,6 @@ public:
     std::vector<double> progress;
     std::function<void()> onMessage;
     std::function<void()> onFinished;
-};
-
-/// A directory of one test, and what tests do with disks in it.
-class TestDirectory {
-public:
-    std::filesystem::path path(std::string_view name) const { return directory_ / name; }
-    void write(std::string_view name, std::string_view bytes) const;
-    /// A sparse file.
-    std::filesystem::path makeFile(std::string_view name, std::uint64_t bytes) const;
-
-    /// A sparse file with a file system of e2fsprogs' own making.
-    std::filesystem::path makeExt(std::string_view name, std::uint64_t bytes,
-                                  std::vector<std::string> options = {}) const;
-    /// The same with another kind of file system; empty where the program that makes it is not
-    /// installed.
-    std::filesystem::path makeVolume(std::string_view name, std::string_view filesystem) const;
-    /// Runs a program with the image as its last argument; a failure fails the test.
-    void prepare(std::vector<std::string> command, const std::filesystem::path& image) const;
-    /// debugfs(8), writing.
-    void damage(const std::filesystem::path& image, std::string command) const;
-    /// A directory to be searched for tools, in which `tool` does what `script` says.
-    std::string fakeTools(std::string_view script, std::string_view tool = "e2fsck") const;
-
-private:
-    orvane::test::TemporaryDirectory directory_;
 };
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image,

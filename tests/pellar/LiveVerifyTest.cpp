@@ -6,11 +6,9 @@
 #include "pellar/tools/btrfs/MountedBtrfs.h"
 #include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
-#include "tests/support/ScrubRecords.h"
 
 #include <gtest/gtest.h>
 #include <sys/mount.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <fstream>
@@ -32,15 +30,16 @@ protected:
 
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "mounting needs root";
+        if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
         directory_.makeFile("image", 128U << 20U);
         if (findProgram("mkfs.btrfs", JobOptions().toolPath).empty())
             GTEST_SKIP() << "mkfs.btrfs is not installed (package btrfs-progs)";
-        directory_.prepare({"/usr/sbin/mkfs.btrfs", "-q", "-d", "single", "-m", "dup"}, image());
+        orvane::test::prepareWith(
+            {"mkfs.btrfs", "-q", "-U", uuid_, "-d", "single", "-m", "dup", image()});
         fs::create_directory(place());
         if (!mount())
-            GTEST_SKIP() << "the system gives no loop device, or mounts no btrfs";
+            GTEST_SKIP() << "the system mounts no btrfs";
         std::string contents(16U << 20U, 'x');
         contents.replace(contents.size() / 2, fileText.size(), fileText);
         std::ofstream(place() / "large") << contents;
@@ -51,7 +50,9 @@ protected:
     void TearDown() override
     {
         unmount();
-        orvane::test::forgetScrubsOf(image());
+        std::error_code ignored;
+        fs::remove("/var/lib/btrfs/scrub.status." + uuid_, ignored);
+        fs::remove("/var/lib/btrfs", ignored);  // unless somebody else's are there
     }
 
     /// The image as it stays when nothing else is written: mounting leaves work to the kernel.
@@ -69,8 +70,7 @@ protected:
     bool mount()
     {
         device_ = std::make_unique<orvane::test::LoopDevice>(image());
-        return !device_->name().empty() &&
-               ::mount(device_->name().c_str(), place().c_str(), "btrfs", MS_NOATIME, nullptr) == 0;
+        return ::mount(device_->name().c_str(), place().c_str(), "btrfs", MS_NOATIME, nullptr) == 0;
     }
     // Not only detached: the image is at rest when it is read or damaged.
     void unmount()
@@ -123,6 +123,9 @@ protected:
     }
 
     test::TestDirectory directory_;
+    /// btrfs-scrub(8) keeps by it what it has found in a volume. Another process may run a test.
+    const std::string uuid_ =
+        "5c7b0000-0000-4000-8000-" + std::to_string(100'000'000'000 + ::getpid());
     std::unique_ptr<orvane::test::LoopDevice> device_;
 };
 

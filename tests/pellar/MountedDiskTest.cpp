@@ -1,10 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
 // Jobs on volumes that are mounted, on real loop devices. Needs root.
 
+#include "contract/pellar/ErrorCodes.h"
 #include "pellar/mounts/Holders.h"
 #include "pellar/mounts/MountTable.h"
 #include "pellar/mounts/UnmountedDisk.h"
 #include "tests/pellar/JobFixture.h"
+#include "tests/pellar/partitions/DiskMaker.h"
 #include "tests/support/LoopDevice.h"
 
 #include <gtest/gtest.h>
@@ -28,12 +30,10 @@ class MountedDisk : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "mounting needs root";
+        if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
         device_ =
             std::make_unique<orvane::test::LoopDevice>(directory_.makeExt("disk", 16U << 20U));
-        if (device_->name().empty())
-            GTEST_SKIP() << "the system gives no loop device";
         for (const char* name : {"place", "other"})
             fs::create_directory(directory_.path(name));
         if (::mount(device_->name().c_str(), place().c_str(), "ext4",
@@ -326,6 +326,51 @@ TEST(Holders, AreFoundByEveryWayOfHolding)
     std::ofstream(directory.path("block/loop3/loop/backing_file")) << (mount / "a.img").native();
     EXPECT_EQ(holdersOf(mount.native(), "/none", directory.path("block")),
               std::vector<std::string>{"loop3"});
+}
+
+using test::DiskImage;
+
+// The kernel here may know no partition tables, so partx(8) adds the partition.
+TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
+{
+    if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const test::TestDirectory workshop;
+    const DiskImage disk = DiskImage::gpt(workshop);
+    const Bytes sound = [&] {
+        workshop.makeExt("volume", 4 * test::mebibyte);
+        disk.put(2048 * 512, test::fileBytes(workshop.path("volume")));
+        return disk.bytes();
+    }();
+    disk.fill(512, 512, 0);
+    const orvane::test::LoopDevice device(disk.path());
+    auto reference = std::make_shared<contract::DiskReference>(*test::wholeDisk(device.name()));
+    reference->storage = contract::DiskReference::Storage::BlockDevice;
+    reference->length = 0;
+    test::JobFixture bench(test::with(&JobOptions::savedSectorsDirectory, workshop.path("saved")));
+
+    if (test::runTool({"partx", "-a", "--nr", "1", device.name()}).status == 0) {
+        std::filesystem::create_directory(workshop.path("mount"));
+        if (test::runTool({"mount", device.name() + "p1", workshop.path("mount")}).status == 0) {
+            bench.finish(bench.tool->beginPartitionMapRepairForDisk(reference));
+            EXPECT_EQ(bench.listener.error, contract::kPLErrorDiskInUse) << bench.listener.message;
+            bench.finish(bench.tool->beginPartitionMapVerifyForDisk(reference));
+            EXPECT_EQ(bench.listener.error, contract::kPLErrorMapDamaged) << bench.listener.message;
+            test::runTool({"umount", workshop.path("mount")});
+        } else {
+            ADD_FAILURE() << "a partition could not be mounted, so its use is not tested";
+        }
+    }
+    bench.finish(bench.tool->beginPartitionMapRepairForDisk(reference));
+    EXPECT_EQ(bench.listener.verdict, "repaired") << bench.listener.message;
+    bench.finish(bench.tool->beginPartitionMapVerifyForDisk(reference));
+    EXPECT_EQ(bench.listener.verdict, "sound") << bench.listener.message;
+    // The device manager may have the partition open for a moment, and a partition that stays would
+    // be found on whatever the device is used for next.
+    for (int i = 0; i < 50 && test::runTool({"partx", "-d", device.name()}).status != 0; ++i)
+        ::usleep(100'000);
+    const Bytes after = disk.bytes();
+    EXPECT_TRUE(std::equal(after.begin(), after.begin() + 34 * 512, sound.begin()));
 }
 
 }  // namespace

@@ -2,7 +2,6 @@
 #include "pellar/outcome/Outcome.h"
 
 #include "pellar/outcome/Damage.h"
-#include "pellar/texts/ErrorTexts.h"
 #include "pellar/tools/ext/E2fsckOutput.h"
 #include "tests/pellar/JobFixture.h"
 
@@ -64,17 +63,6 @@ TEST(Outcome, RepairsAgainOnlyWhileThatHelps)
     EXPECT_FALSE(isWorthAnotherPass(many, damaged())) << "goes on for ever";
 }
 
-TEST(Outcome, SaysSoWhenOnlyTheJournalWasReplayed)
-{
-    const test::EnglishTexts texts;
-    const auto message = [&texts](bool foundProblems) {
-        return messageOf(outcomeOfRepair({{sound(), true, foundProblems}}, sound()),
-                         Operation::Repair, "%2$@", texts);
-    };
-    EXPECT_EQ(message(false), "repaired “%2$@”: its journal was replayed; nothing else was wrong");
-    EXPECT_EQ(message(true), "repaired “%2$@”: no damage is left");
-}
-
 TEST(E2fsckDamage, ProblemsAreToldApartByWhatTheyMean)
 {
     using enum Damage::Kind;
@@ -108,11 +96,6 @@ TEST(Damage, OnlyMereBookkeepingIsCalledHarmless)
         ASSERT_EQ(sentences.size(), 1U);
         EXPECT_FALSE(test::contains(sentences.front(), "no file is affected"));
     }
-}
-
-TEST(ErrorTexts, AnUnknownCodeIsNamed)
-{
-    EXPECT_EQ(errorText(-12345, test::EnglishTexts()), "Error -12345.");
 }
 
 }  // namespace

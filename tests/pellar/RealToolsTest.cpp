@@ -7,6 +7,7 @@
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/JobFixture.h"
+#include "tests/support/LoopDevice.h"
 #include "tests/support/VolumeStates.h"
 
 #include <fcntl.h>
@@ -14,7 +15,6 @@
 #include <sys/ioctl.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
-#include <unistd.h>
 
 #include <algorithm>
 #include <fstream>
@@ -41,24 +41,23 @@ bool isInstalled(const VolumeMaker& maker)
 
 void patch(const std::filesystem::path& image, const std::vector<Patch>& patches)
 {
-    std::fstream file(image, std::ios::in | std::ios::out | std::ios::binary);
     for (const Patch& p : patches)
-        file.seekp(static_cast<std::streamoff>(p.offset)) << p.bytes;
+        orvane::test::patch(image, p.offset, p.bytes);
 }
 
 std::filesystem::path make(const test::TestDirectory& directory, const VolumeState& state)
 {
     const auto image = directory.makeVolume("disk", state.filesystem);
     patch(image, state.patches);
-    if (!state.command.empty())
-        directory.prepare(state.command, image);
+    if (!state.command.empty()) {
+        std::vector<std::string> command = state.command;
+        command.push_back(image);
+        orvane::test::prepareWith(command);
+    }
     return image;
 }
 
-std::filesystem::file_time_type lastWriteOf(const std::filesystem::path& image)
-{
-    return std::filesystem::last_write_time(image);
-}
+using std::filesystem::last_write_time;
 
 std::string caseName(const ::testing::TestParamInfo<VolumeState>& info)
 {
@@ -85,17 +84,17 @@ TEST_P(RealTools, SayWhatIsTrue)
     const auto image = make(directory, state);
     const auto disk = test::reference(image, std::string(state.filesystem));
     test::JobFixture library;
-    const auto before = lastWriteOf(image);
+    const auto before = last_write_time(image);
     ASSERT_EQ(library.verify(test::reference(image, "")), 0) << "its kind is not known";
     EXPECT_EQ(library.listener.verdict, state.verified) << library.listener.message;
-    EXPECT_EQ(lastWriteOf(image), before) << "a verification wrote";
+    EXPECT_EQ(last_write_time(image), before) << "a verification wrote";
     EXPECT_EQ(library.listener.error == contract::kPLErrorDamagedForGood,
               state.verified == "damaged" && state.filesystem == "btrfs")
         << "nobody is sent to a repair that there is not";
     ASSERT_EQ(library.repair(disk), 0);
     EXPECT_EQ(library.listener.verdict, state.repaired)
         << state.because << ": " << library.listener.message;
-    EXPECT_TRUE(state.verified != "sound" || lastWriteOf(image) == before)
+    EXPECT_TRUE(state.verified != "sound" || last_write_time(image) == before)
         << "a repair wrote to a sound volume";
     ASSERT_EQ(library.verify(disk), 0);
     EXPECT_EQ(library.listener.verdict, state.afterwards) << library.listener.message;
@@ -114,7 +113,7 @@ TEST(RealToolsOnOthers, NeverWrite)
             continue;
         const test::TestDirectory directory;
         const auto image = directory.makeVolume("disk", maker.filesystem);
-        const auto before = lastWriteOf(image);
+        const auto before = last_write_time(image);
         for (const VolumeMaker& other : orvane::test::volumeMakers()) {
             if (other.filesystem == maker.filesystem)
                 continue;
@@ -122,17 +121,10 @@ TEST(RealToolsOnOthers, NeverWrite)
             ASSERT_EQ(library.repair(test::reference(image, std::string(other.filesystem))), 0);
             EXPECT_EQ(library.listener.verdict, "failed")
                 << maker.filesystem << " as " << other.filesystem;
-            EXPECT_TRUE(lastWriteOf(image) == before)
+            EXPECT_TRUE(last_write_time(image) == before)
                 << other.filesystem << " wrote to " << maker.filesystem;
         }
     }
-}
-
-bool mayUseLoopDevices(const test::TestDirectory& directory)
-{
-    directory.write("probe", std::string(4096, 'x'));
-    const FileDescriptor file(::open(directory.path("probe").c_str(), O_RDONLY | O_CLOEXEC));
-    return bool(LoopDevice::attach(file.get(), 0, 4096, Access::ReadOnly));
 }
 
 bool isOnALoopDevice(const std::filesystem::path& image)
@@ -170,8 +162,7 @@ void expectUntouchedMargins(const contract::DiskReference& disk)
 
 TEST(RealToolsInAnImage, WorkOnARegionAndLeaveNoLoopDevice)
 {
-    const test::TestDirectory probe;
-    const bool mayUseThem = mayUseLoopDevices(probe);
+    const bool mayUseThem = orvane::test::LoopDevice::obstacle() == nullptr;
     for (const VolumeState& state : orvane::test::volumeStates()) {
         if (state.repaired != "repaired" || !isInstalled(makerOf(state.filesystem)))
             continue;
@@ -293,11 +284,12 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         const std::size_t failures = library.listener.textsOf(contract::kFsckFail).size();
         ASSERT_EQ(library.repair(disk), 0);
         EXPECT_EQ(library.listener.verdict, "repaired");
+        EXPECT_TRUE(library.listener.hasPlainLine("“Disk” was repaired successfully.\n"));
         if (!damage.message.empty()) {
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
             const bool isLoss = test::contains(damage.message, "files");
-            EXPECT_EQ(warnings.size() > failures, isLoss);
+            ASSERT_EQ(warnings.size() > failures, isLoss) << damage.message;
             EXPECT_TRUE(!isLoss || warnings.back() == library.listener.message);
         }
         ASSERT_EQ(library.verify(disk), 0);

@@ -276,19 +276,6 @@ TEST(ToolVerdict, ACrashDoesNotUndoWhatWasFound)
         << "it caught it itself";
 }
 
-TEST(ToolVerdict, AMarkOfImproperUnmountingIsNeverSound)
-{
-    VolumeFacts marked = plainVolume();
-    marked.isMarkedDirty = true;
-    const auto verdictOf = [&marked](std::string_view filesystem, std::string_view recording) {
-        return judge(*toolFor(filesystem), recordedLines(recording), Exited{0}, marked).verdict;
-    };
-    EXPECT_EQ(verdictOf("exfat", "fsck.exfat/sound"), Verdict::Damaged)
-        << "fsck.exfat pays no heed to it, and takes it off";
-    EXPECT_EQ(verdictOf("ntfs", "ntfs/sound"), Verdict::Inconclusive)
-        << "only its own system can deal with it";
-}
-
 TEST(ToolVerdict, OfRepairingRuns)
 {
     struct Repair {

@@ -176,8 +176,6 @@ TEST_F(PrivilegedScriptTest, AnotherDiskUnderTheNameIsRefused)
     if (const char* const obstacle = test::LoopDevice::obstacle())
         GTEST_SKIP() << obstacle;
     test::LoopDevice device(workshop_.makeExt("disk", 4U << 20U));
-    if (device.name().empty())
-        GTEST_SKIP() << "the system gives no loop device";
     const std::string other = workshop_.makeExt("other", 4U << 20U);
     struct Case {
         std::string meanwhile;

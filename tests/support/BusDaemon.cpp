@@ -14,7 +14,7 @@ namespace orvane::test {
 BusDaemon::BusDaemon()
 {
     const std::string file = directory_ / "bus.conf";
-    write(file, "<busconfig><type>session</type><listen>unix:dir=" + directory_.path.native() +
+    write(file, "<busconfig><type>session</type><listen>unix:dir=" + directory_.path().native() +
                     "</listen><policy context=\"default\"><allow send_destination=\"*\" "
                     "eavesdrop=\"true\"/><allow eavesdrop=\"true\"/><allow own=\"*\"/></policy>"
                     "</busconfig>\n");

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 
 #include <sys/types.h>
 
@@ -22,7 +22,7 @@ public:
     const std::string& address() const { return address_; }
 
 private:
-    const TemporaryDirectory directory_;
+    const TestDirectory directory_;
     pid_t daemon_ = 0;
     std::string address_;
 };

@@ -1,18 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/disks/DiskController.h"
+#include "orvane/support/disks/DiskWatch.h"
 #include "orvane/support/disks/SystemDisks.h"
+#include "orvane/support/loop/MainLoop.h"
 #include "orvane/support/loop/Notifications.h"
 #include "pellar/mounts/MountTable.h"
+#include "tests/support/LoopDevice.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
+#include <sys/mount.h>
 #include <unistd.h>
+
+#include <chrono>
 
 namespace orvane {
 namespace {
 
-using test::TemporaryDirectory;
+using test::TestDirectory;
 namespace fs = std::filesystem;
 
 DiskTree tree(const std::string& identifier, std::vector<DiskTree> children = {})
@@ -127,40 +133,20 @@ TEST(DiskController, WhatWasNotMountedBeforeAJobIsNotMountedAfterIt)
     EXPECT_EQ(mounted, "sda2 ");
 }
 
-TEST(Disk, TheMergedHistoryFollowsEveryChangeOfItsParts)
-{
-    const auto record = [](int number) {
-        return contract::Dictionary::of({{contract::Name("n"), number}});
-    };
-    const auto disk = Disk::make(tree("sda", {tree("sda1"), tree("sda2")}), {});
-    const auto shown = [&] {
-        return contract::Value(disk->fsckHistory()).description();
-    };
-    disk->fsckHistoryNoChildren().append(record(1));
-    disk->parts()[1]->fsckHistoryNoChildren().append(record(3));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 3})");
-    disk->parts()[0]->fsckHistoryNoChildren().append(record(2));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 3}, {n = 2})") << "the newest is the last";
-    disk->parts()[0]->clearFsckHistory();
-    disk->parts()[0]->fsckHistoryNoChildren().append(record(4));
-    EXPECT_EQ(shown(), "({n = 1}, {n = 4}, {n = 3})") << "as many as before, but others";
-    EXPECT_TRUE(disk->clearFsckHistory());
-    EXPECT_FALSE(disk->clearFsckHistory()) << "nothing was left";
-}
-
 TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 {
-    const TemporaryDirectory machine;
+    const TestDirectory machine;
     const auto device = [&](const std::string& name, const char* number, const char* size) {
-        test::write(machine.path / "sys" / name / "dev", std::string(number) + "\n");
-        test::write(machine.path / "sys" / name / "size", std::string(size) + "\n");
+        test::write(machine.path() / "sys" / name / "dev", std::string(number) + "\n");
+        test::write(machine.path() / "sys" / name / "size", std::string(size) + "\n");
     };
     device("sda", "8:0", "2048");
     device("sda/sda1", "8:1", "1024");
     device("sda/sda10", "8:10", "2");
     device("sda/sda2", "8:2", "1024");
     for (const char* const number : {"1", "2", "10"})
-        test::write(machine.path / "sys/sda" / ("sda" + std::string(number)) / "partition", number);
+        test::write(machine.path() / "sys/sda" / ("sda" + std::string(number)) / "partition",
+                    number);
     test::write(machine / "sys/sda/device/model", "Model \x1b[1m X  \n");
     device("loop0", "7:0", "0");
     device("zram0", "252:0", "4096");
@@ -193,11 +179,11 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
 
 TEST(DiskLookup, ABadNameGetsOneClearSentence)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "empty.img", "");
     test::write(directory / "secret.img", "x");
     fs::permissions(directory / "secret.img", fs::perms::none);
-    const std::string path = directory.path.native() + "/";
+    const std::string path = directory.path().native() + "/";
 
     struct Case {
         std::string name;
@@ -208,7 +194,7 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
           Case{path + "empty.img", "the file is empty"},
           Case{path + "secret.img", "Permission denied"},
           Case{"/dev/null", "it is neither a disk nor a disk image"},
-          Case{directory.path, "this directory is no mount point"},
+          Case{directory.path(), "this directory is no mount point"},
           Case{"/proc", "no disk is mounted on this directory"},
           Case{"LABEL=", "no disk has this label"}, Case{"UUID=1234", "no disk has this UUID"}}) {
         if (c.reason == "Permission denied" && ::geteuid() == 0)
@@ -223,14 +209,14 @@ TEST(DiskLookup, ABadNameGetsOneClearSentence)
 
 TEST(DiskLookup, FindsByEveryKindOfName)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "a.img", std::string(512, '\0'));
     fs::create_symlink("a.img", directory / "link");
     Host host;
     DiskTree volume = tree("/dev/x1");
     volume.facts.label = "Hostile \x1b[2J %s";
     volume.facts.uuid = "u-1";
-    volume.facts.mountPoint = directory.path;
+    volume.facts.mountPoint = directory.path();
     DiskTree twin = tree("/dev/x2");
     twin.facts.uuid = "u-2";
     DiskTree other = tree("/dev/x3");
@@ -239,7 +225,7 @@ TEST(DiskLookup, FindsByEveryKindOfName)
     const Translator translator;
     DiskLookup lookup(host.controller, translator);
     for (const std::string& name : {std::string("/dev/x1"), std::string("LABEL=Hostile \x1b[2J %s"),
-                                    std::string("UUID=u-1"), directory.path.native()}) {
+                                    std::string("UUID=u-1"), directory.path().native()}) {
         const auto found = lookup.find(name);
         ASSERT_TRUE(found) << found.error().message;
         EXPECT_EQ((*found)->diskIdentifier(), "/dev/x1");
@@ -251,6 +237,97 @@ TEST(DiskLookup, FindsByEveryKindOfName)
     const auto disk = *image;
     EXPECT_EQ(disk->diskIdentifier(), (directory / "a.img").native());
     EXPECT_EQ(*lookup.find((directory / "a.img").native()), disk);
+}
+
+using namespace std::string_view_literals;
+using namespace std::chrono_literals;
+using test::LoopDevice;
+
+TEST(DiskEvents, OnlyBlockDevicesMatter)
+{
+    struct Case {
+        std::string_view message;
+        bool isMeant;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{"change@/devices/virtual/block/loop0\0ACTION=change\0SUBSYSTEM=block\0MAJOR=7\0"sv,
+               true, "as the kernel says it"},
+          Case{"libudev\0\xfe\xed\xca\xfe\x28\0\0\0ACTION=add\0SUBSYSTEM=block\0"sv, true,
+               "as udevd says it"},
+          Case{"add@/devices/x\0ACTION=add\0SUBSYSTEM=usb\0"sv, false, "another device"},
+          Case{"add@/devices/x\0SUBSYSTEM=blocks\0"sv, false, "a longer name"},
+          Case{"add@/devices/x\0MY=SUBSYSTEM=block\0"sv, false, "the value of another field"},
+          Case{"\0SUBSYSTEM=block"sv, false, "cut off"}, Case{""sv, false, "empty"}})
+        EXPECT_EQ(isAboutBlockDevice(c.message), c.isMeant) << c.because;
+}
+
+TEST(DiskEvents, MountsWithoutADeviceDoNotMatter)
+{
+    const auto kept = deviceMounts(pellar::parseMounts(
+        "22 1 8:2 / / rw - ext4 /dev/sda2 rw\n30 22 0:5 / /proc rw - proc proc rw\n"
+        "32 22 0:40 / /home rw - btrfs /dev/sdb1 rw\n"
+        "33 22 0:50 / /c/1 rw - overlay overlay rw\n"));
+    ASSERT_EQ(kept.size(), 2U);
+    EXPECT_EQ(kept[1].filesystem, "btrfs") << "it has a number of its own, but a device";
+}
+
+TEST(DiskEvents, ABurstIsOneChange)
+{
+    const EventBurst::Clock::time_point start{};
+    EventBurst burst;
+    EXPECT_FALSE(burst.takeDue(start)) << "nothing has happened";
+    burst.note(start);
+    burst.note(start + 150ms);
+    EXPECT_FALSE(burst.takeDue(start + 210ms)) << "not quiet yet";
+    EXPECT_EQ(burst.timeLeft(start + 210ms), 140ms);
+    EXPECT_TRUE(burst.takeDue(start + 350ms));
+
+    int told = 0;
+    for (auto now = start; now < start + 10s; now += 100ms) {
+        burst.note(now);
+        told += burst.takeDue(now) ? 1 : 0;
+    }
+    EXPECT_EQ(told, 9) << "events without end cannot keep the news back";
+}
+
+// The machine's own disks, as a front end follows them.
+TEST(DiskWatch, ARealDeviceComesIsMountedUnmountedAndGoes)
+{
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const TestDirectory directory;
+    // Another process may run this test at the same time.
+    const std::string label = "watched" + std::to_string(::getpid());
+    const std::string image = directory.makeExt("watched.img", 8 << 20, {"-L", label});
+    MainLoop loop;
+    Notifications center;
+    DiskController disks(center, {});
+    DiskWatch watch(loop, [&] { disks.synchronize(readSystemDisks(DiskSources())); });
+    ASSERT_TRUE(watch.start());
+    const auto found = [&] {
+        return disks.find([&](const Disk& disk) { return disk.facts().label == label; });
+    };
+    const auto waitUntil = [&loop](const std::function<bool()>& isDone) {
+        bool isLate = false;
+        loop.scheduleTimer(20s, [&] { isLate = true; });
+        loop.runUntil([&] { return isLate || isDone(); });
+        return isDone();
+    };
+    LoopDevice device(image);
+    ASSERT_TRUE(waitUntil([&] { return found() != nullptr; }));
+    const auto disk = found();
+    EXPECT_EQ(disk->diskIdentifier(), device.name());
+    const std::string mountPoint = directory / "mnt";
+    std::filesystem::create_directory(mountPoint);
+    if (::mount(device.name().c_str(), mountPoint.c_str(), "ext4", 0, nullptr) == 0) {
+        EXPECT_TRUE(waitUntil([&] { return disk->mountPoint() == mountPoint; }));
+        ASSERT_EQ(::umount(mountPoint.c_str()), 0);
+        EXPECT_TRUE(waitUntil([&] { return !disk->isMounted(); }));
+    }
+    device.detach();
+    EXPECT_TRUE(waitUntil([&] { return found() == nullptr; }));
+    EXPECT_TRUE(disk->hasGone());
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "contract/foundation/StyledText.h"
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/support/disks/Disk.h"
@@ -7,12 +6,10 @@
 #include "orvane/support/history/DiskHistories.h"
 #include "orvane/support/history/HistoryStore.h"
 #include "orvane/support/settings/ValueJSON.h"
-#include "pellar/process/FileDescriptor.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
-#include <signal.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <cmath>
@@ -81,7 +78,7 @@ protected:
                 }};
     }
 
-    const test::TemporaryDirectory directory_;
+    const test::TestDirectory directory_;
     fs::path file_ = directory_ / "state/history.sqlite3";
     HistoryStore::Limits limits_ = {};
     std::vector<std::string> warnings_;
@@ -117,39 +114,6 @@ TEST_F(HistoryTest, RecordsComeBackAsTheyWere)
     struct stat status = {};
     ASSERT_EQ(::stat(file_.c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 0777U, 0600U);
-}
-
-TEST_F(HistoryTest, WhatWasSavedIsThereAfterTheProgramWasKilled)
-{
-    int ends[2];
-    ASSERT_EQ(::pipe(ends), 0);
-    const pellar::FileDescriptor readEnd(ends[0]);
-    const pellar::FileDescriptor writeEnd(ends[1]);
-    const pid_t child = ::fork();
-    ASSERT_GE(child, 0);
-    if (child == 0) {
-        HistoryStore mine = open();
-        const Array history = Array::make();
-        for (int count = 0;; ++count) {
-            history.append(line(count));
-            const bool isSaved = mine.append("v", history, static_cast<std::size_t>(count));
-            if (!isSaved || ::write(writeEnd.get(), "x", 1) != 1)
-                ::_exit(1);
-        }
-    }
-    char saved = 0;
-    int savedCount = 0;
-    for (; savedCount < 200 && ::read(readEnd.get(), &saved, 1) == 1; ++savedCount) {
-    }
-    ::kill(child, SIGKILL);
-    int status = 0;
-    ::waitpid(child, &status, 0);
-    ASSERT_TRUE(WIFSIGNALED(status)) << "the child must not have ended by itself";
-
-    HistoryStore mine = open();
-    const Array history = loaded(mine, "v");
-    ASSERT_GE(history.size(), static_cast<std::size_t>(savedCount));
-    EXPECT_EQ(exactly(history), exactly(lines(0, static_cast<int>(history.size()))));
 }
 
 TEST_F(HistoryTest, TwoProgramsAddToOneVolume)
@@ -278,13 +242,10 @@ TEST_F(HistoryTest, WhatAnotherProgramHoldsUpIsWrittenLater)
     ASSERT_TRUE(mine.append("v", lines(1, 2), 0));
     Database other = Database::open(file_);
     ASSERT_TRUE(other.execute("BEGIN IMMEDIATE"));
-    const auto before = std::chrono::steady_clock::now();
     const auto run = mine.beginRun("v", "verify", {});
     for (int i = 0; i < 20; ++i)
         EXPECT_FALSE(mine.append("v", lines(1, 3), 1));
     mine.endRun(run, {"sound", 0, ""}, {});
-    EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(20))
-        << "it is waited for once, and not for each record";
     ASSERT_TRUE(other.execute("COMMIT"));
     EXPECT_TRUE(mine.append("v", lines(1, 3), 1));
     ASSERT_TRUE(mine.lastRun("v"));
@@ -400,7 +361,30 @@ TEST_F(HistoryTest, AWholeDiskShowsItsRecordsInTheOrderOfTime)
         histories.saveNew();
         ::usleep(3000);
         EXPECT_EQ(shown(), all);
+        if (isWatched)
+            continue;
+        // As many as before, but others.
+        disk->parts()[0]->clearFsckHistory();
+        for (const int number : {5, 6, 7, 8})
+            disk->parts()[0]->fsckHistoryNoChildren().append(
+                Dictionary::of({{contract::kFsckVerbosity, number}}));
+        EXPECT_NE(shown(), all);
+        EXPECT_TRUE(disk->clearFsckHistory());
+        EXPECT_FALSE(disk->clearFsckHistory()) << "nothing was left";
     }
+}
+
+// As a device that cannot be read for a moment has none.
+TEST_F(HistoryTest, OnlyAnotherUUIDMakesAnotherHistory)
+{
+    HistoryStore store = open();
+    DiskHistories histories(store);
+    const auto disk = Disk::make({device("sda1", "u"), {}}, {{}, &histories});
+    disk->fsckHistoryNoChildren().append(line(1));
+    disk->setFacts(device("sda1"));
+    EXPECT_EQ(disk->fsckHistoryNoChildren().size(), 1U);
+    disk->setFacts(device("sda1", "other"));
+    EXPECT_EQ(disk->fsckHistoryNoChildren().size(), 0U) << "it was formatted anew";
 }
 
 }  // namespace

@@ -1,36 +1,27 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
-#include "ToolRun.h"
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/images/ImageAttacher.h"
 #include "orvane/support/images/ImageFile.h"
 #include "orvane/support/loop/Notifications.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
 namespace orvane {
 namespace {
 
-using test::runTool;
-using test::TemporaryDirectory;
+using test::prepareWith;
+using test::TestDirectory;
 namespace fs = std::filesystem;
 
 constexpr std::uint64_t mebibyte = 1U << 20U;
 
-fs::path makeImage(const TemporaryDirectory& directory, std::uint64_t bytes)
+void makeExt(const fs::path& image, std::uint64_t offset, std::uint64_t bytes,
+             const std::string& label)
 {
-    const fs::path image = directory / "disk.img";
-    test::write(image, "");
-    fs::resize_file(image, bytes);
-    return image;
-}
-
-int makeExt(const fs::path& image, std::uint64_t offset, std::uint64_t bytes,
-            const std::string& label)
-{
-    return runTool({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label, "-E",
-                    "offset=" + std::to_string(offset), image.native(),
-                    std::to_string(bytes / 1024) + "k"});
+    prepareWith({"mke2fs", "-q", "-F", "-t", "ext4", "-L", label, "-E",
+                 "offset=" + std::to_string(offset), image.native(),
+                 std::to_string(bytes / 1024) + "k"});
 }
 
 DiskTree disksIn(const fs::path& image)
@@ -55,33 +46,31 @@ std::string outline(const DiskTree& tree)
 
 TEST(ImageDisks, ABareFileSystemIsOneVolume)
 {
-    const TemporaryDirectory directory;
-    const fs::path image = makeImage(directory, 8 * mebibyte);
-    ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "B\x1b[31m\xff%s"), 0) << "mke2fs is needed";
+    const TestDirectory directory;
+    const fs::path image = directory.makeFile("disk.img", 8 * mebibyte);
+    makeExt(image, 0, 8 * mebibyte, "B\x1b[31m\xff%s");
     const DiskTree disk = disksIn(image);
     EXPECT_EQ(outline(disk), "0:type6:ext4");
     EXPECT_EQ(disk.facts.name, "B\x1b[31m\xff%s") << "a label is any bytes";
 
-    const fs::path larger = makeImage(directory, 32 * mebibyte);
+    const fs::path larger = directory.makeFile("disk.img", 32 * mebibyte);
     EXPECT_EQ(outline(disksIn(larger)), "0:type6:") << "unknown contents are still a volume";
-    ASSERT_EQ(makeExt(larger, 0, 32 * mebibyte, "X"), 0);
+    makeExt(larger, 0, 32 * mebibyte, "X");
     test::patch(larger, 1024, std::string(1024, '\0'));
     EXPECT_EQ(outline(disksIn(larger)), "0:type6:ext4") << "known by the superblock's backup";
 }
 
 TEST(ImageDisks, PartitionsOfAGPT)
 {
-    const TemporaryDirectory directory;
-    const fs::path image = makeImage(directory, 64 * mebibyte);
-    ASSERT_EQ(runTool({"sfdisk", "-q", image.native()},
-                      "label: gpt\n"
-                      "start=2048, size=32768, type=linux\n"
-                      "size=16384, type=swap\n"
-                      "size=16384, type=linux\n"
-                      "size=16384, type=E6D6D379-F507-44C2-A23C-238F2A3DF928\n"),
-              0)
-        << "sfdisk is needed";
-    ASSERT_EQ(makeExt(image, mebibyte, 16 * mebibyte, ""), 0);
+    const TestDirectory directory;
+    const fs::path image = directory.makeFile("disk.img", 64 * mebibyte);
+    prepareWith({"sfdisk", "-q", image.native()},
+                "label: gpt\n"
+                "start=2048, size=32768, type=linux\n"
+                "size=16384, type=swap\n"
+                "size=16384, type=linux\n"
+                "size=16384, type=E6D6D379-F507-44C2-A23C-238F2A3DF928\n");
+    makeExt(image, mebibyte, 16 * mebibyte, "");
     const DiskTree disk = disksIn(image);
     EXPECT_EQ(outline(disk), "0:type1: 1:type3:ext4 2:type3::hidden 3:type3: 4:type3::hidden")
         << "a Linux partition without a file system may be a damaged one";
@@ -98,16 +87,14 @@ TEST(ImageDisks, PartitionsOfAGPT)
 
 TEST(ImageDisks, LogicalPartitionsOfAnMBRAndOneBeyondTheEnd)
 {
-    const TemporaryDirectory directory;
-    const fs::path image = makeImage(directory, 64 * mebibyte);
-    ASSERT_EQ(runTool({"sfdisk", "-q", image.native()},
-                      "label: dos\n"
-                      "start=2048, size=16384, type=83\n"
-                      "start=20480, size=65536, type=5\n"
-                      "start=22528, size=16384, type=83\n"
-                      "start=43008, size=16384, type=82\n"),
-              0)
-        << "sfdisk is needed";
+    const TestDirectory directory;
+    const fs::path image = directory.makeFile("disk.img", 64 * mebibyte);
+    prepareWith({"sfdisk", "-q", image.native()},
+                "label: dos\n"
+                "start=2048, size=16384, type=83\n"
+                "start=20480, size=65536, type=5\n"
+                "start=22528, size=16384, type=83\n"
+                "start=43008, size=16384, type=82\n");
     const std::string expected = "0:type1: 1:type3: 2:type2::hidden 5:type3:";
     EXPECT_EQ(outline(disksIn(image)).substr(0, expected.size()), expected)
         << "the extended partition is a container";
@@ -119,9 +106,9 @@ TEST(ImageDisks, LogicalPartitionsOfAnMBRAndOneBeyondTheEnd)
 
 TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
 {
-    const TemporaryDirectory directory;
-    const fs::path image = makeImage(directory, 8 * mebibyte);
-    ASSERT_EQ(makeExt(image, 0, 8 * mebibyte, "Data"), 0) << "mke2fs is needed";
+    const TestDirectory directory;
+    const fs::path image = directory.makeFile("disk.img", 8 * mebibyte);
+    makeExt(image, 0, 8 * mebibyte, "Data");
     Notifications center;
     DiskController controller(center, {});
     const auto offline = controller.add(factsOfImage(*openImage(image, Translator())));
@@ -145,7 +132,7 @@ TEST(ImageAttacher, TheWayOfAnImageThroughTheHost)
 
 TEST(ImageAttacher, AFailureIsACodeWithASentence)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "x\x1b.img", "");
     test::write(directory / "notes.txt", "Grüße\n");
     ImageAttacher attacher({}, Translator());

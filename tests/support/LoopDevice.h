@@ -8,6 +8,7 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
+#include <stdexcept>
 #include <string>
 #include <utility>
 
@@ -21,9 +22,13 @@ public:
     {
         if (::geteuid() != 0)
             return "only root can set up a loop device";
-        return ::access("/sys/block", R_OK) != 0 ? "/sys is not mounted" : nullptr;
+        const pellar::FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
+        const bool isGiven = control && ::ioctl(control.get(), LOOP_CTL_GET_FREE) >= 0;
+        return isGiven && ::access("/sys/block", R_OK) == 0 ? nullptr
+                                                            : "the system gives no loop device";
     }
 
+    /// Throws when the system gives none after all.
     explicit LoopDevice(const std::string& image)
     {
         // Another test may take the free one first.
@@ -34,16 +39,14 @@ public:
             if (!attach(image))
                 number_ = -1;
         }
+        if (number_ < 0)
+            throw std::runtime_error("cannot prepare the test: no loop device");
     }
     LoopDevice(const LoopDevice&) = delete;
     LoopDevice& operator=(const LoopDevice&) = delete;
     ~LoopDevice() { detach(); }
 
-    /// Empty when the system gives none.
-    std::string name() const
-    {
-        return number_ < 0 ? std::string() : "/dev/loop" + std::to_string(number_);
-    }
+    std::string name() const { return "/dev/loop" + std::to_string(number_); }
 
     /// NO while somebody else still has the device open from before.
     [[nodiscard]] bool attach(const std::string& image)

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "orvane/support/modules/ModuleSearch.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
@@ -12,10 +12,10 @@
 namespace orvane {
 namespace {
 
-using test::TemporaryDirectory;
+using test::TestDirectory;
 namespace fs = std::filesystem;
 
-fs::path makeBundle(const TemporaryDirectory& directory, const char* library)
+fs::path makeBundle(const TestDirectory& directory, const char* library)
 {
     const fs::path bundle = directory / "Test.ovmodule";
     test::write(bundle / "module.json", R"({"name": "Test", "library": "test.so"})");
@@ -62,7 +62,7 @@ TEST(ModuleLoader, RefusesWithASentenceThatSaysWhy)
           Case{TEST_MODULE_RIGHT,
                [](const fs::path& b) { test::write(b / "module.json", R"({"name": 3)"); },
                "does not name the module"}}) {
-        const TemporaryDirectory directory;
+        const TestDirectory directory;
         const fs::path bundle = makeBundle(directory, c.library);
         c.change(bundle);
         const auto loaded = loadModule(bundle);
@@ -77,7 +77,7 @@ TEST(ModuleLoader, ForRootTheWayIsLookedAtAsWell)
 {
     if (::geteuid() != 0)
         GTEST_SKIP() << "only root can give directories away";
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     const fs::path bundle = makeBundle(directory, TEST_MODULE_RIGHT);
     constexpr uid_t somebody = 65534;
     const fs::path others = directory / "others";

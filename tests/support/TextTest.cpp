@@ -2,7 +2,7 @@
 #include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/support/texts/TimeEstimator.h"
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
@@ -90,7 +90,7 @@ TEST(MessageFile, ACutFileIsReadAsFarAsItGoes)
     const std::string whole = test::contentsOf(std::filesystem::path(TEST_BUILD_DIRECTORY) /
                                                "locale/tlh/LC_MESSAGES/SupportTest.mo");
     ASSERT_GT(whole.size(), 28U);
-    const test::TemporaryDirectory directory;
+    const test::TestDirectory directory;
     for (std::size_t length = 0; length < whole.size(); ++length) {
         std::ofstream(directory / "cut.mo", std::ios::binary) << whole.substr(0, length);
         const auto file = MessageFile::read(directory / "cut.mo");

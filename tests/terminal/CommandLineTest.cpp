@@ -1,7 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/Reporter.h"
+#include "orvane/terminal/TerminalText.h"
 #include "tests/terminal/ProgramTest.h"
+
+#include <clocale>
 
 namespace orvane {
 namespace {
@@ -68,6 +71,56 @@ TEST(GivenNames, APartGoesByTheNameOfItsImage)
           Case{"/tmp/a.img2", "/tmp/a.img2", "another file"},
           Case{"/dev/sdb", "LABEL=x", "a device"}, Case{"/dev/sdb1", "/dev/sdb1", "not named"}})
         EXPECT_EQ(names.nameOf(c.identifier), c.name) << c.because;
+}
+
+using test::holdsControls;
+
+/// Widths of characters are the locale's to know.
+class TerminalTextTest : public ::testing::Test {
+protected:
+    void SetUp() override { ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr); }
+};
+
+TEST_F(TerminalTextTest, TextIsCutWhereTheColumnsEnd)
+{
+    struct Case {
+        std::string_view text;
+        std::size_t columns;
+        std::string_view fitted;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{"disk", 4, "disk", "fits"}, Case{"disk", 3, "dis", "is cut"},
+          Case{"disk", 0, "", "no room"}, Case{"", 5, "", "nothing"},
+          Case{"äöü", 2, "äö", "columns, not bytes"}, Case{"日本", 4, "日本", "two columns each"},
+          Case{"日本", 3, "日", "half a character is none"},
+          Case{"日本", 1, "", "not even the first"},
+          Case{"e\xcc\x81x", 1, "e\xcc\x81", "an accent takes no column"}})
+        EXPECT_EQ(fittedTo(c.text, c.columns), c.fitted) << c.because;
+}
+
+TEST_F(TerminalTextTest, AProgressLineFitsAnyTerminal)
+{
+    for (const JobProgress& progress :
+         {JobProgress{{}, "Überprüfe „日本\x1b[2J“", std::chrono::hours(100)},
+          JobProgress{400.0, "Überprüfe „日本\x1b[2J“", {}}})
+        for (std::size_t columns = 0; columns < 90; ++columns) {
+            const std::string line = progressLine(progress, columns);
+            EXPECT_EQ(fittedTo(line, columns), line);
+            EXPECT_FALSE(holdsControls(line)) << line;
+        }
+}
+
+TEST(ExitStatus, AnUnknownVerdictIsNoSuccess)
+{
+    struct Case {
+        std::string_view verdict;
+        int status;
+    };
+    for (const Case& c : {Case{"sound", 0}, Case{"repaired", 1}, Case{"damaged", 4},
+                          Case{"inconclusive", 8}, Case{"failed", 8}, Case{"stopped", 32},
+                          Case{"", 8}, Case{"Sound", 8}, Case{"soundly", 8}})
+        EXPECT_EQ(exitStatusFor(c.verdict), c.status) << c.verdict;
 }
 
 }  // namespace

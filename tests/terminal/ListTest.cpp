@@ -1,5 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
+// What is known of disks, and what root does with them where there is no UDisks2.
+
+#include "tests/support/LoopDevice.h"
+#include "tests/support/TestDirectory.h"
 #include "tests/terminal/ProgramTest.h"
+
+#include <fstream>
 
 namespace orvane::test {
 namespace {
@@ -24,18 +30,82 @@ TEST_F(ListTest, TellsWhatIsKnownOfAnImage)
         "reason":"Not available because the selected disk is not mounted."}}})"));
 }
 
-// What the list shows is what commands take.
-TEST_F(ListTest, APartitionedImageShowsItsVolumesBelow)
+class HistoryCommandTest : public ProgramTest {
+protected:
+    std::vector<std::string> verdicts(const std::string& image) const
+    {
+        std::vector<std::string> found;
+        for (const auto& one : Events(run({"history", "--json", image}).output).named("run"))
+            found.push_back(one["verdict"]);
+        return found;
+    }
+};
+
+TEST_F(HistoryCommandTest, RunsOutliveTheProgramUntilTheyAreCleared)
 {
-    write(path("nothing"), std::string(8 * mebibyte, '\0'));
-    makeDisk("disk.img", {path("nothing"), makeVolume("second", 8 * mebibyte, {"-L", "Second"})});
-    const auto disks = Events(run({"list", "--json", "disk.img"}).output).named("disk");
-    ASSERT_EQ(disks.size(), 3U);
-    EXPECT_EQ(disks[0]["disk"], "disk.img");
-    EXPECT_EQ(disks[1]["disk"], "disk.img#1");
-    EXPECT_TRUE(disks[1]["filesystem"].is_null());
-    EXPECT_EQ(disks[2]["disk"], "disk.img#2");
-    EXPECT_EQ(disks[2]["name"], "Second");
+    makeDamagedVolume("a");
+    makeVolume("b");
+    for (const char* const command : {"verify", "repair", "verify"})
+        static_cast<void>(run({command, "a"}));
+    EXPECT_EQ(verdicts("a"), (std::vector<std::string>{"damaged", "repaired", "sound"}));
+    EXPECT_NE(run({"history", "b"}).output.find("never checked"), std::string::npos);
+
+    static_cast<void>(run({"verify", "b"}));
+    for (int times = 0; times < 2; ++times)
+        EXPECT_EQ(run({"history", "--clear", "a"}).status, 0) << "there may be nothing to clear";
+    EXPECT_TRUE(verdicts("a").empty());
+    EXPECT_EQ(verdicts("b").size(), 1U) << "each image has its own";
+}
+
+class DiskActionTest : public ProgramTest {
+protected:
+    void SetUp() override
+    {
+        ProgramTest::SetUp();
+        if (const char* const obstacle = LoopDevice::obstacle())
+            GTEST_SKIP() << obstacle;
+        environment_["DBUS_SYSTEM_BUS_ADDRESS"] = "unix:path=/nonexistent/bus";
+    }
+    void TearDown() override
+    {
+        if (!device_.empty())
+            runTool({"losetup", "-d", device_});
+        ProgramTest::TearDown();
+    }
+
+    std::string device_;  ///< attached by the program, and not detached yet
+};
+
+TEST_F(DiskActionTest, AnImageIsAttachedMountedAndDetached)
+{
+    const auto image = makeVolume("\x1b[31mvolume.img");
+    const RunResult refused = run({"eject", image});
+    EXPECT_EQ(refused.status, 8);
+    EXPECT_NE(refused.errors.find("cannot eject"), std::string::npos) << refused.errors;
+    const RunResult attached = run({"attach", image});
+    ASSERT_EQ(attached.status, 0) << attached.errors;
+    ASSERT_TRUE(attached.output.starts_with("/dev/loop") && attached.output.ends_with('\n'));
+    device_ = attached.output.substr(0, attached.output.size() - 1);
+
+    const RunResult again = run({"attach", image});
+    EXPECT_NE(again.errors.find("it is attached already, as " + device_), std::string::npos);
+    EXPECT_FALSE(holdsControls(again.errors));
+    EXPECT_EQ(run({"verify", image}).status, 8) << "two would work on one volume";
+
+    EXPECT_EQ(run({"mount", device_}).status, 8) << "nothing says where to";
+    std::filesystem::create_directory(path("place"));
+    std::ofstream(path("fstab")) << device_ << " " << path("place").native() << " ext4 ro 0 0\n";
+    environment_["LIBMOUNT_FSTAB"] = path("fstab");
+    const RunResult mounted = run({"mount", "--json", device_});
+    EXPECT_EQ(mounted.status, 0) << mounted.errors;
+    EXPECT_EQ(Events(mounted.output).named("done").at(0)["place"], path("place").native());
+
+    const RunResult detached = run({"detach", "--json", image});
+    EXPECT_EQ(detached.status, 0) << detached.errors;
+    EXPECT_EQ(Events(detached.output).named("done").at(0)["disk"], image.native())
+        << "as the user named it";
+    device_.clear();
+    EXPECT_EQ(run({"verify", image}).status, 0);
 }
 
 }  // namespace

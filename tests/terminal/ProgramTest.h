@@ -1,20 +1,86 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "tests/support/TemporaryDirectory.h"
-#include "tests/terminal/Program.h"
+#include "pellar/process/FileDescriptor.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include <sys/types.h>
+#include <chrono>
 #include <cstdint>
 #include <filesystem>
 #include <map>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
 
 namespace orvane::test {
+
+using pellar::FileDescriptor;
+
+/// How the program is to be started.
+struct Launch {
+    std::vector<std::string> arguments;
+    std::map<std::string, std::string> environment;  ///< all of it
+    std::string directory;                           ///< where it is started
+    std::optional<uid_t> user;                       ///< else the test's own
+    std::chrono::seconds limit{60};                  ///< a longer run is killed
+    enum class Output { Read, Closed, Full };
+    Output output = Output::Read;           ///< in pipes: or none at all, or a device that is full
+    std::optional<unsigned short> columns;  ///< on a pseudo-terminal of this width, else in pipes
+};
+
+/// What a run left behind.
+struct RunResult {
+    int status = -1;     ///< -1 when a signal ended it
+    int signal = 0;      ///< 0 when it exited
+    std::string output;  ///< standard output; on a terminal all that came on the screen
+    std::string errors;  ///< standard error; on a terminal nothing
+};
+
+/// One run of the program, ended with this object at the latest. A run that takes longer than the
+/// limit is killed and fails the test.
+class Program {
+public:
+    explicit Program(const Launch& launch);
+    Program(const Program&) = delete;
+    Program& operator=(const Program&) = delete;
+    ~Program();
+
+    /// Reads until standard output holds `text` so many times; NO when the program ended, or the
+    /// limit came, without it.
+    [[nodiscard]] bool waitFor(std::string_view text, int times = 1);
+    /// Types on the terminal.
+    void type(std::string_view bytes);
+    void signal(int number);
+    /// Until the program has taken up every signal it was sent; two of a kind that wait are one.
+    void waitUntilSignalsAreTaken() const;
+    /// Closes the reading ends, as a pager does that the user has left.
+    void stopReading();
+    /// What has come on standard output so far.
+    const std::string& output() const { return result_.output; }
+    /// Reads all that is left, and waits for the end.
+    const RunResult& finish();
+
+private:
+    using Clock = std::chrono::steady_clock;
+
+    void startInPipes(const Launch& launch);
+    void startOnTerminal(const Launch& launch);
+    bool readMore();
+    void take(FileDescriptor& from, std::string& into);
+    void reap();
+
+    const Clock::time_point deadline_;
+    pid_t id_ = 0;  ///< 0 when there is none to wait for
+    FileDescriptor end_;
+    FileDescriptor output_;
+    FileDescriptor errors_;
+    RunResult result_;
+};
 
 inline constexpr std::uint64_t mebibyte = 1U << 20U;
 
@@ -55,11 +121,17 @@ protected:
 
     /// A sparse file with a sound volume.
     std::filesystem::path makeVolume(std::string_view name, std::uint64_t bytes = 8 * mebibyte,
-                                     const std::vector<std::string>& options = {}) const;
+                                     const std::vector<std::string>& options = {}) const
+    {
+        return directory_.makeExt(name, bytes, options);
+    }
     /// A volume that a check has to read for a second or longer.
     std::filesystem::path makeSlowVolume(std::string_view name) const;
     /// debugfs(8), writing.
-    void change(const std::filesystem::path& image, const std::string& command) const;
+    void change(const std::filesystem::path& image, const std::string& command) const
+    {
+        directory_.damage(image, command);
+    }
     /// A volume that has lost its root directory.
     std::filesystem::path makeDamagedVolume(std::string_view name,
                                             const std::vector<std::string>& options = {}) const;
@@ -70,10 +142,13 @@ protected:
                                    std::string_view label = "gpt") const;
 
     /// From now on e2fsck does what the script says; it is described in the fake tool's source.
-    void useTool(std::string_view script);
+    void useTool(std::string_view script)
+    {
+        environment_["FIXWELL_TOOL_PATH"] = directory_.fakeTools(script);
+    }
 
 private:
-    TemporaryDirectory directory_;  // before the environment, which names it
+    TestDirectory directory_;  // before the environment, which names it
 
 protected:
     std::map<std::string, std::string> environment_;

@@ -1,40 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 #include "tests/terminal/ProgramTest.h"
 
 namespace orvane::test {
 namespace {
 
-class VerdictTest : public ProgramTest {
-protected:
-    /// A verification writes nothing; and only what is sound is called so.
-    void expect(const std::string& image, const std::string& command, int status,
-                std::string_view says) const
-    {
-        const std::string before = contentsOf(path(image));
-        const RunResult result = run({command, image});
-        const std::string all = image + ", " + command + "\n" + result.output;
-        EXPECT_EQ(result.status, status) << all << result.errors;
-        EXPECT_NE(result.output.find(says), std::string::npos) << all;
-        EXPECT_EQ(result.output.find("appears to be OK.") != std::string::npos, status == 0) << all;
-        EXPECT_TRUE(command == "repair" || contentsOf(path(image)) == before) << all;
-    }
-};
-
-TEST_F(VerdictTest, ExitStatusAndWordsTellWhatIsTrue)
-{
-    makeVolume("sound");
-    change(makeVolume("rootless"), "clri <2>");
-    change(makeVolume("counts"), "ssv free_blocks_count 1");
-    change(makeVolume("journal"), "feature needs_recovery");
-    expect("sound", "repair", 0, "appears to be OK.");
-    expect("rootless", "verify", 4, "Root inode is not a directory");
-    expect("rootless", "repair", 1, "was repaired successfully.");
-    expect("rootless", "verify", 0, "appears to be OK.");
-    expect("counts", "verify", 4, "needs to be repaired.");  // where e2fsck exits with 0
-    expect("journal", "verify", 8, "journal has not been replayed");
-    expect("journal", "repair", 1, "was repaired successfully.");
-}
+using VerdictTest = ProgramTest;
 
 TEST_F(VerdictTest, EachVolumeOfAPartitionedImageIsTreatedAndNothingBesides)
 {
@@ -50,8 +21,73 @@ TEST_F(VerdictTest, EachVolumeOfAPartitionedImageIsTreatedAndNothingBesides)
     EXPECT_TRUE(contentsOf(disk).substr(0, mebibyte) == untilThere) << "the partition map";
     for (const std::uint64_t start : {1, 21}) {
         write(path("volume"), contentsOf(disk).substr(start * mebibyte, 20 * mebibyte));
-        EXPECT_EQ(runTool({"e2fsck", "-fn", path("volume")}), 0) << start;
+        EXPECT_EQ(runTool({"e2fsck", "-fn", path("volume")}).status, 0) << start;
     }
+}
+
+using PartitionMapTest = ProgramTest;
+
+std::string zeros(std::size_t count)
+{
+    return std::string(count, '\0');
+}
+
+TEST_F(PartitionMapTest, ADamagedMapOfAnImageIsNamedWhateverElseIsChecked)
+{
+    const auto disk = makeDisk("disk.img", {makeVolume("volume")});
+    const auto names = [this](const char* command) {
+        const RunResult result = run({command, "disk.img"});
+        return result.errors.find(
+                   "the partition map of “disk.img” is damaged; --partition-map "
+                   "checks and repairs it") != std::string::npos;
+    };
+    EXPECT_FALSE(names("verify")) << "both copies are sound";
+    patch(disk, 512, zeros(512));
+    EXPECT_TRUE(names("verify")) << "its volume is checked, and the map is not";
+    EXPECT_TRUE(names("list"));
+    patch(disk, 10 * mebibyte - 512, zeros(512));
+    EXPECT_TRUE(names("verify")) << "neither copy says where its volume is";
+}
+
+TEST_F(PartitionMapTest, OneJobTreatsSeveralDisksWhateverBecomesOfEach)
+{
+    const auto broken = makeDisk("broken.img", {makeVolume("volume")});
+    makeDisk("sound.img", {makeVolume("volume")}, "dos");
+    makeVolume("bare.img");
+    patch(broken, 1024, zeros(8));
+    patch(broken, 10 * mebibyte - 33 * 512, zeros(8));
+    const std::string before = contentsOf(broken);
+    const RunResult all =
+        run({"repair", "--json", "--partition-map", "broken.img", "sound.img", "bare.img", "none"});
+    EXPECT_EQ(all.status, 4 | 8) << all.output << all.errors;
+    const std::vector<std::string> story{"finished none failed",
+                                         "finished bare.img failed",
+                                         "started broken.img",
+                                         "finished broken.img damaged",
+                                         "started sound.img",
+                                         "finished sound.img sound",
+                                         "report",
+                                         "alert"};
+    const Events events(all.output);
+    EXPECT_EQ(events.story({"started", "finished", "report", "alert"}), story);
+    const auto records = events.recordsWith("Neither copy of the partition map");
+    ASSERT_FALSE(records.empty()) << all.output;
+    EXPECT_EQ(records.front()["disk"], "broken.img")
+        << "who reads along can show each with its disk";
+    EXPECT_EQ(records.front()["verbosity"], -1);
+    EXPECT_TRUE(contentsOf(broken) == before);
+}
+
+TEST_F(PartitionMapTest, SpeaksTheUsersLanguage)
+{
+    environment_["LANGUAGE"] = "de";
+    patch(makeDisk("disk.img", {makeVolume("volume")}), 512, zeros(512));
+    const RunResult repaired = run({"repair", "--details", "--partition-map", "disk.img"});
+    EXPECT_NE(repaired.output.find("Die Hauptkopie der Partitionstabelle fehlt."),
+              std::string::npos)
+        << repaired.output;
+    for (const std::string_view english : {"The ", "Writing", "Reading", " is ", "sectors"})
+        EXPECT_EQ(repaired.output.find(english), std::string::npos) << repaired.output;
 }
 
 }  // namespace

@@ -5,7 +5,7 @@
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/texts/Language.h"
 #include "tests/desktop/WindowFixture.h"
-#include "tests/support/ToolRun.h"
+#include "tests/support/TestDirectory.h"
 
 #include <QApplication>
 #include <QPainter>
@@ -13,7 +13,6 @@
 
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
 
 namespace orvane::desktop::test {
 namespace {
@@ -80,61 +79,6 @@ TEST_F(Pictures, OfADamagedDiskThatWasVerified)
     QWidget& help = *session().host().sharedHelpManager().window();
     save(help.grab(), "-help");
     EXPECT_LE(window().minimumSizeHint().width(), 1180) << "it has room on a small screen";
-}
-
-// What happens to images and maps, and what is in work.
-TEST_F(Pictures, OfWhatIsOutOfTheOrdinary)
-{
-    const std::string sound = makeImage("Photos");
-    const std::string map = makePartitionedImage("Camera");
-    std::fstream(map) << std::string(1024, '\0');
-    const std::string gone = makeImage("Letters");
-    openInOneSize({sound, map, gone});
-    treat("verifyDiskButton", sound);
-    treat("verifyDiskButton", map);
-    std::filesystem::remove(gone);
-    select(gone);
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; }));
-    QTest::qWait(50);
-    takePicture("-gone");
-    sheet()->close();
-    select(map);
-    command("verifyMap").trigger();
-    finishJob();
-    takePicture("-map");
-    window().disks().selectAll();
-    QTest::qWait(50);
-    takePicture("-all");
-    close();
-
-    useEndlessTool();
-    openInOneSize({sound, map});
-    select(sound);
-    const std::string before = verdict(sound);
-    button("verifyDiskButton").press();
-    ASSERT_TRUE(waitUntil([&] { return verdict(sound) != before; }));
-    QTest::qWait(300);
-    takePicture("-working");
-    button("verifyDiskButton").press();
-    finishJob();
-    takePicture("-stopped");
-}
-
-TEST_F(Pictures, OfARepairWhoseLogIsLong)
-{
-    const std::string image = makeImage("Archive");
-    for (int inode = 11; inode < 200; ++inode)
-        EXPECT_EQ(orvane::test::runTool(
-                      {"debugfs", "-w", "-R", "setb " + std::to_string(200 + inode), image}),
-                  0);
-    EXPECT_EQ(orvane::test::runTool({"debugfs", "-w", "-R", "clri /lost+found", image}), 0);
-    open({image});
-    window().resize(820, 560);
-    treat("verifyDiskButton", image);
-    button("showDetailsButton").press();
-    treat("repairDiskButton", image);
-    takePicture("-repaired");
 }
 
 }  // namespace

@@ -5,7 +5,6 @@
 #include <QKeyEvent>
 #include <QLabel>
 #include <QMimeData>
-#include <QScrollBar>
 
 namespace orvane::desktop {
 namespace {

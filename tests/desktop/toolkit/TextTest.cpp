@@ -32,25 +32,6 @@ TEST(Contrast, EveryColourOfTheLogIsReadableOnEveryPalette)
     EXPECT_GT(red.red(), 2 * red.green()) << "it is still red";
 }
 
-TEST(ColorScheme, EveryWordIsReadableInTheDark)
-{
-    const QPalette dark = darkPalette();
-    struct Case {
-        QPalette::ColorRole text;
-        QPalette::ColorRole ground;
-    };
-    for (const Case& c :
-         {Case{QPalette::WindowText, QPalette::Window}, Case{QPalette::Text, QPalette::Base},
-          Case{QPalette::Text, QPalette::AlternateBase},
-          Case{QPalette::ButtonText, QPalette::Button}, Case{QPalette::Link, QPalette::Base},
-          Case{QPalette::LinkVisited, QPalette::Base},
-          Case{QPalette::PlaceholderText, QPalette::Base},
-          Case{QPalette::ToolTipText, QPalette::ToolTipBase},
-          Case{QPalette::HighlightedText, QPalette::Highlight}})
-        EXPECT_GE(contrastRatio(dark.color(c.text), dark.color(c.ground)), readableContrast)
-            << "role " << c.text << " on " << c.ground;
-}
-
 TEST(StyledLine, HostileTextIsOneHarmlessLine)
 {
     struct Case {
@@ -93,18 +74,6 @@ TEST(StyledLine, AMegabyteInOneLineIsCutInTheMiddle)
     EXPECT_TRUE(line.text.startsWith(u'<') && line.text.endsWith(u'>'));
     EXPECT_TRUE(line.text.contains(QChar(0x2026)));
     EXPECT_EQ(lengthOfRuns(line), line.text.size());
-}
-
-TEST(HTML, EverythingIsEscapedAndStylesAreKept)
-{
-    const StyledText text = StyledText::make("<b>&\x1b\"\xff\n", {Font::boldSystem(11), {}, {}});
-    text.append(StyledText::make("red\n", {{}, Color{1, 0, 0, 1}, {}}));
-    const std::string made = html(text);
-    EXPECT_NE(made.find("&lt;b&gt;&amp;\xEF\xBF\xBD&quot;\xEF\xBF\xBD"), std::string::npos) << made;
-    EXPECT_NE(made.find("font-weight:bold;font-size:11.0pt"), std::string::npos) << made;
-    EXPECT_NE(made.find("color:#ff0000"), std::string::npos) << made;
-    EXPECT_EQ(toQtToolTip("<img src=x>"),
-              QStringLiteral("<p style=\"white-space:pre-wrap\">&lt;img src=x&gt;</p>"));
 }
 
 }  // namespace

@@ -3,9 +3,7 @@
 
 #include "pellar/bytes/Checksums.h"
 
-#include <fstream>
 #include <map>
-#include <stdexcept>
 
 namespace pellar::test {
 Bytes fileBytes(const std::filesystem::path& path)
@@ -24,9 +22,7 @@ DiskImage DiskImage::made(const TestDirectory& workshop, std::string_view name, 
         image.put(0, known->second);
         return image;
     }
-    const ToolAnswer answer = runTool({"sfdisk", "-q", image.path()}, script);
-    if (answer.status != 0)
-        throw std::runtime_error("cannot prepare the test: " + answer.output);
+    orvane::test::prepareWith({"sfdisk", "-q", image.path()}, script);
     disks[script] = image.bytes();
     return image;
 }
@@ -63,12 +59,7 @@ DiskImage DiskImage::mbr(const TestDirectory& workshop, std::string_view script,
 
 const DiskImage& DiskImage::put(std::uint64_t offset, ByteView bytes) const
 {
-    std::fstream file(path_, std::ios::binary | std::ios::in | std::ios::out);
-    file.seekp(static_cast<std::streamoff>(offset));
-    file.write(reinterpret_cast<const char*>(bytes.data()),
-               static_cast<std::streamsize>(bytes.size()));
-    if (!file)
-        throw std::runtime_error("cannot prepare the test: " + path_.string());
+    orvane::test::patch(path_, offset, {reinterpret_cast<const char*>(bytes.data()), bytes.size()});
     return *this;
 }
 
@@ -101,11 +92,8 @@ const DiskImage& DiskImage::setEntry(std::uint32_t number, std::uint64_t first,
 
 Bytes DiskImage::part(std::uint64_t offset, std::uint64_t length) const
 {
-    Bytes bytes(length);
-    std::ifstream file(path_, std::ios::binary);
-    file.seekg(static_cast<std::streamoff>(offset));
-    file.read(reinterpret_cast<char*>(bytes.data()), static_cast<std::streamsize>(length));
-    return bytes;
+    const std::string all = orvane::test::contentsOf(path_).substr(offset, length);
+    return {all.begin(), all.end()};
 }
 
 const DiskImage& DiskImage::putIntoEntries(std::uint64_t offset, ByteView bytes) const

@@ -4,7 +4,6 @@
 #include "pellar/packages/PackagedFile.h"
 #include "pellar/packages/RPMReferences.h"
 #include "pellar/packages/RootDirectory.h"
-#include "pellar/packages/ScriptMentions.h"
 #include "pellar/packages/TemporaryDirectory.h"
 #include "pellar/packages/reader/ReaderProcess.h"
 #include "pellar/packages/reader/ReferenceBytes.h"
@@ -22,13 +21,11 @@
 
 #include <chrono>
 #include <csignal>
-#include <fstream>
 #include <thread>
 
 namespace {
 
 using namespace pellar;
-using Clock = std::chrono::steady_clock;
 
 namespace fs = std::filesystem;
 
@@ -107,7 +104,6 @@ TEST(ReaderProcess, IsStoppedInTheMiddleOfALoop)
 {
     const test::TestDirectory workshop;
     StopSwitch stop;
-    const auto begin = Clock::now();
     std::thread user([&stop] {
         std::this_thread::sleep_for(std::chrono::milliseconds(100));
         stop.press();
@@ -122,7 +118,6 @@ TEST(ReaderProcess, IsStoppedInTheMiddleOfALoop)
     user.join();
     ASSERT_TRUE(!answer);
     EXPECT_TRUE(answer.error().isEmpty());
-    EXPECT_LT(Clock::now() - begin, std::chrono::seconds(5));
     EXPECT_EQ(::waitpid(-1, nullptr, WNOHANG), -1);
 }
 
@@ -241,29 +236,11 @@ TEST(PackageBounds, MoreThanAPackageMayHaveIsNotRead)
     }
 }
 
-TEST(PackageBounds, MentionsAndFilesAreNotMultiplied)
-{
-    constexpr int count = 60'000;
-    std::string script = "chmod 1 x\n";
-    for (int i = 0; i < count; ++i)
-        script += "$d/e" + std::to_string(i) + "\n/t/t/t" + std::to_string(i) + "/*\n";
-    const auto begin = Clock::now();
-    ScriptMentions mentions;
-    mentions.add(script, {});
-    for (int i = 0; i < count; ++i)
-        EXPECT_FALSE(mentions.mayConcernOwn("u/f" + std::to_string(i), FileKind::Regular));
-    EXPECT_LT(Clock::now() - begin, std::chrono::seconds(10)) << "3,600 million comparisons";
-    EXPECT_TRUE(mentions.mayConcernOwn("u/e7", FileKind::Regular));
-    EXPECT_TRUE(mentions.mayConcernOwn("t/t/t7/x", FileKind::Regular));
-}
-
 TEST(RPMDatabaseCopy, IsBoundedAndLeavesNothingBehind)
 {
     const test::TestDirectory workshop;
     fs::create_directory(workshop.path("tmp"));
     fs::create_directory(workshop.path("db"));
-    const char* const before = std::getenv("TMPDIR");
-    const std::string kept = before != nullptr ? before : "/tmp";
     ::setenv("TMPDIR", workshop.path("tmp").c_str(), 1);
     workshop.write("db/Packages", "SQLite format 3");
     const auto root = RootDirectory::open(workshop.path(""));
@@ -304,7 +281,7 @@ TEST(RPMDatabaseCopy, IsBoundedAndLeavesNothingBehind)
     EXPECT_FALSE(fs::exists(workshop.path("tmp/orvane-rpmdb.killed")));
     EXPECT_TRUE(fs::exists(workshop.path("tmp/orvane-rpmdb.young")));
     EXPECT_TRUE(fs::exists(workshop.path("tmp/orvane-rpmdb.held")));
-    ::setenv("TMPDIR", kept.c_str(), 1);
+    ::unsetenv("TMPDIR");
 }
 
 }  // namespace

@@ -1,7 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "TemporaryDirectory.h"
+#include "orvane/support/files/ActivityLog.h"
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/XDGPaths.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 #include <sys/stat.h>
@@ -12,7 +13,7 @@ namespace orvane {
 namespace {
 
 using test::contentsOf;
-using test::TemporaryDirectory;
+using test::TestDirectory;
 
 TEST(XDGPaths, VariablesHomesAndNothingAtAll)
 {
@@ -62,7 +63,7 @@ struct Settings {
 
 TEST(SettingsFile, KeepsValuesAndTheirKinds)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "new/settings.json", {}};
     settings.open().setObjectForKey(true, "flag");
     settings.open().setObjectForKey(7, "number");
@@ -81,7 +82,7 @@ TEST(SettingsFile, KeepsValuesAndTheirKinds)
 
 TEST(SettingsFile, AnotherProgramsChangeIsKept)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "settings.json", {}};
     SettingsFile mine = settings.open();
     settings.open().setObjectForKey(1, "theirs");
@@ -96,7 +97,7 @@ TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
          {std::string("{\"a\": tru"), std::string("[1, 2]"), std::string(), std::string("\xFF\xFE"),
           std::string("{\"a\":{\"dictionary\":[3]}}"),
           "{\"a\":" + deep + std::string(deep.size(), ']') + "}"}) {
-        const TemporaryDirectory directory;
+        const TestDirectory directory;
         Settings settings{directory / "settings.json", {}};
         test::write(settings.file, broken);
         SettingsFile read = settings.open();
@@ -109,7 +110,7 @@ TEST(SettingsFile, BrokenFilesAreKeptAsideAndSaid)
 
 TEST(SettingsFile, WhereNothingCanBeWrittenTheyHoldInMemory)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     test::write(directory / "file", "in the way");
     Settings settings{directory / "file/settings.json", {}};
     SettingsFile mine = settings.open();
@@ -121,7 +122,7 @@ TEST(SettingsFile, WhereNothingCanBeWrittenTheyHoldInMemory)
 
 TEST(SettingsFile, AReplacedFileIsNeverPartlyThere)
 {
-    const TemporaryDirectory directory;
+    const TestDirectory directory;
     Settings settings{directory / "settings.json", {}};
     SettingsFile mine = settings.open();
     mine.setObjectForKey("old", "a");
@@ -129,8 +130,96 @@ TEST(SettingsFile, AReplacedFileIsNeverPartlyThere)
     std::filesystem::create_hard_link(settings.file, link);
     mine.setObjectForKey("new", "a");
     EXPECT_NE(contentsOf(link).find("old"), std::string::npos) << "written beside, not into it";
-    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory.path), {}), 2)
+    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory.path()), {}), 2)
         << "no temporary file is left";
+}
+
+TEST(LogText, NothingInALogCommandsATerminal)
+{
+    struct Case {
+        std::string_view text;
+        std::string_view logged;
+        const char* because;
+    };
+    for (const Case& c :
+         {Case{"plain text of more than eight bytes\n", "plain text of more than eight bytes\n",
+               "as it is"},
+          Case{"12345678\x1b[2J", "12345678\uFFFD[2J", "an escape behind a whole word"},
+          Case{"\x1b", "\uFFFD", "alone"},
+          Case{"1234567\x7f", "1234567\uFFFD", "DEL as the last of eight"},
+          Case{"a\rb\tc", "a\uFFFDb c", "a carriage return would overwrite the line"},
+          Case{"Grüße\xff\n\n", "Grüße\uFFFD\n\n", "UTF-8 stays, other bytes go"}}) {
+        std::string log;
+        appendLogText(log, c.text);
+        EXPECT_EQ(log, c.logged) << c.because;
+    }
+}
+
+TEST(ActivityLog, EntriesWithAndWithoutLineEnds)
+{
+    const TestDirectory directory;
+    {
+        ActivityLog log({directory.path()}, [](const std::string& text) { ADD_FAILURE() << text; });
+        log.logPriorityWithEOL("one", 0, true);
+        log.logPriorityWithEOL("two ", 0, false);
+        log.logPriorityWithEOL("halves", 0, true);
+        log.logPriorityWithEOL("unfinished", 0, false);
+        log.log("ended\n");
+    }
+    const std::string text = contentsOf(directory / "activity.log");
+    EXPECT_EQ(text.find(" one\n"), std::string_view("2024-05-06 07:08:09").size());
+    EXPECT_NE(text.find(" two halves\n"), std::string::npos) << "one stamp for one line";
+    for (const char* const line : {" unfinished\n", " ended\n"})
+        EXPECT_NE(text.find(line), std::string::npos) << "a line of its own:" << line << text;
+}
+
+TEST(ActivityLog, KeepsTheLevelsItWasAskedFor)
+{
+    const TestDirectory directory;
+    ActivityLog log({directory.path(), contract::OVLog::error}, {});
+    log.ov_log(contract::OVLog::trace, 0, "unheard");
+    log.ov_log(contract::OVLog::error, 0, "bad \x1b[31mthing %s\n");
+    const std::string text = contentsOf(directory / "fixwell.log");
+    EXPECT_EQ(text.find("unheard"), std::string::npos);
+    EXPECT_NE(text.find("notice bad \uFFFD[31mthing %s\n"), std::string::npos) << "there at once";
+}
+
+TEST(ActivityLog, NeverGrowsWithoutBound)
+{
+    const TestDirectory directory;
+    ActivityLog::Options options{directory.path()};
+    options.limits = {200'000, 2};
+    {
+        ActivityLog log(options, [](const std::string& text) { ADD_FAILURE() << text; });
+        for (int i = 0; i < 50000; ++i)
+            log.logPriorityWithEOL("a line of the checking tool", 0, true);
+    }
+    std::uintmax_t bytes = 0;
+    for (const auto& file : std::filesystem::directory_iterator(directory.path()))
+        bytes += file.file_size();
+    EXPECT_LE(bytes, 3 * 200'000U);
+    EXPECT_GE(bytes, 2 * 100'000U) << "the old files hold what was before";
+}
+
+TEST(ActivityLog, AFullDiskIsSaidOnceAndOverlooked)
+{
+    for (const std::string_view trouble : {"a full disk", "a file in the way"}) {
+        const TestDirectory directory;
+        // Every write to /dev/full answers that there is no space left (full(4)), but a link in
+        // the log's place is refused before that.
+        if (trouble == "a full disk")
+            std::filesystem::create_symlink("/dev/full", directory / "activity.log");
+        else
+            test::write(directory / "file", "");
+        int warnings = 0;
+        ActivityLog log({trouble == "a full disk" ? directory.path() : directory / "file"},
+                        [&](const std::string&) { ++warnings; });
+        for (int i = 0; i < 3; ++i) {
+            log.log("text\n");
+            log.flush();
+        }
+        EXPECT_EQ(warnings, 1) << trouble;
+    }
 }
 
 }  // namespace
