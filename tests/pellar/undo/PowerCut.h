@@ -3,7 +3,7 @@
 
 #include "pellar/process/FileDescriptor.h"
 #include "pellar/undo/UndoStore.h"
-#include "tests/support/TemporaryDirectory.h"
+#include "tests/support/TestDirectory.h"
 
 #include <cstdint>
 #include <functional>

@@ -19,7 +19,7 @@ namespace {
 namespace fs = std::filesystem;
 using namespace std::chrono_literals;
 using orvane::test::contentsOf;
-using orvane::test::TemporaryDirectory;
+using orvane::test::TestDirectory;
 using Left = UndoFailure::Left;
 
 constexpr auto today = std::chrono::system_clock::time_point(20000 * 24h);
@@ -100,7 +100,7 @@ struct World {
         return record.id();
     }
 
-    TemporaryDirectory directory;
+    TestDirectory directory;
     CachedDisk disk;
     CachedDisk view;
     std::optional<UndoStore> store;
@@ -282,7 +282,7 @@ TEST(UndoKill, AtAnyPointLeavesAWayBackAndForth)
     int kills = 0;
     int interruptions = 0;
     for (int event = 1;; ++event) {
-        TemporaryDirectory directory;
+        TestDirectory directory;
         orvane::test::write(directory / "disk", before);
         const FileDescriptor file(::open((directory / "disk").c_str(), O_RDWR | O_CLOEXEC));
         const bool isKilled = killedAt(event, [&](const std::function<void()>& happens) {
