@@ -39,13 +39,22 @@ bool isProven(const Outcome& outcome)
     return outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired;
 }
 
-/// How a job ends whose trial has left damage.
-Outcome notProven(Outcome outcome)
+/// How a job ends whose trial did not end in a sound volume.
+Outcome notProven(Outcome outcome, bool foundDamage)
 {
-    if (outcome.verdict != Verdict::Damaged)
+    const bool isUnknown = outcome.verdict == Verdict::Inconclusive && foundDamage;
+    if (outcome.verdict != Verdict::Damaged && !isUnknown)
         return outcome;
+    if (isUnknown)
+        outcome.reason = {"a repair was tried, and it cannot be told whether it makes it sound; "
+                          "nothing was written",
+                          {},
+                          {}};
+    else
+        outcome.reason = {
+            "a repair was tried, and would leave damage; nothing was written", {}, {}};
+    outcome.verdict = Verdict::Damaged;
     outcome.code = contract::kPLErrorNotProven;
-    outcome.reason = {"a repair was tried, and would leave damage; nothing was written", {}, {}};
     return outcome;
 }
 
@@ -353,13 +362,14 @@ VolumeScript::State VolumeScript::tryRepair()
     }
     outcome_ = RepairPasses(runs_, context_, look_, {lookEnds, trialEnds}).run();
     runs_.workOn(nullptr);
-    const bool isWanted = isProven(outcome_) || (outcome_.verdict == Verdict::Damaged &&
-                                                 context_.policy.appliesUnproven);
-    if (isWanted || context_.policy.isPreview)
+    if (context_.policy.isPreview || isProven(outcome_))
         return State::Applying;
-    if (outcome_.verdict == Verdict::Damaged && !context_.options.trials.howToApply.empty())
+    const Outcome end = notProven(outcome_, look_.foundDamage);
+    if (end.code == contract::kPLErrorNotProven && context_.policy.appliesUnproven)
+        return State::Applying;
+    if (end.code == contract::kPLErrorNotProven && !context_.options.trials.howToApply.empty())
         log_.remark(context_.options.trials.howToApply);
-    return end(notProven(outcome_));
+    return this->end(end);
 }
 
 VolumeScript::State VolumeScript::apply()

@@ -129,6 +129,12 @@ contract::ErrorCode JobFixture::repair(const contract::DiskReferencePointer& dis
     return finish(tool->beginStoragesystemFilesystemRepairForDisk(disk));
 }
 
+contract::ErrorCode JobFixture::run(Task task, const contract::DiskReferencePointer& disk)
+{
+    const auto own = manager.makeTool(listener);
+    return finish(own->begin(task, disk));
+}
+
 contract::ErrorCode JobFixture::finish(contract::ErrorCode begun)
 {
     const int before = listener.finished;

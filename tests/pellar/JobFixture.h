@@ -4,6 +4,7 @@
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/Manager.h"
+#include "pellar/RepairDisk.h"
 #include "tests/support/TestDirectory.h"
 
 #include <chrono>
@@ -99,6 +100,8 @@ struct JobFixture {
     /// Runs a job to its *finished* and answers what the begin answered.
     contract::ErrorCode verify(const contract::DiskReferencePointer& disk);
     contract::ErrorCode repair(const contract::DiskReferencePointer& disk);
+    /// The same of the tasks that a module does not know.
+    contract::ErrorCode run(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode finish(contract::ErrorCode begun);
 
     TestLoop loop;
