@@ -111,6 +111,20 @@ TEST_F(TerminalTextTest, AProgressLineFitsAnyTerminal)
         }
 }
 
+TEST_F(TerminalTextTest, HostileTextIsMadeHarmless)
+{
+    for (const std::string_view text : {"\x1b[2Jx", "a\rb", "a\bb", "\x07",
+                                        "\xc2\x9b"
+                                        "2J",
+                                        "\xff\xfe", "a\x7f", "\x1b]0;t\x07"}) {
+        const auto plain = contract::StyledText::make(text, {});
+        for (const bool colors : {false, true})
+            EXPECT_FALSE(holdsControls(terminalText(plain, colors))) << text;
+        EXPECT_FALSE(holdsControls(safeLines(text))) << text;
+    }
+    EXPECT_EQ(safeLines("\n\na\n"), "\n\na\n");
+}
+
 TEST(ExitStatus, AnUnknownVerdictIsNoSuccess)
 {
     struct Case {

@@ -5,7 +5,9 @@
 #include "pellar/process/FileDescriptor.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -386,6 +388,22 @@ TEST(PartitionMaps, KeepsTheOldSectorsPrivatelyAndTellsHowToPutThemBack)
     EXPECT_TRUE(test::contains(text, "bs=512 seek=1 conv=notrunc,fsync")) << text;
     EXPECT_TRUE(test::contains(text, "it'\\''s $HOME")) << text;
     EXPECT_FALSE(test::contains(text, "HOME\n")) << "a line end in a name forges no line";
+}
+
+TEST(PartitionMaps, ADiskThatIsInUseIsOnlyRead)
+{
+    const test::TestDirectory workshop;
+    const DiskImage disk = DiskImage::gpt(workshop);
+    disk.fill(512, 512, 0);
+    const Bytes damaged = disk.bytes();
+    const FileDescriptor other(::open(disk.path().c_str(), O_RDWR | O_CLOEXEC));
+    ASSERT_EQ(::flock(other.get(), LOCK_SH | LOCK_NB), 0);
+    MapBench bench(workshop.path("saved"));
+    bench.repairMap(disk.path());
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorDiskInUse);
+    EXPECT_TRUE(disk.bytes() == damaged);
+    bench.verifyMap(disk.path());
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorMapDamaged);
 }
 
 TEST(PartitionMaps, CapabilityAnswersWithoutAJob)
