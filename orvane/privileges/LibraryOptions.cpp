@@ -53,7 +53,6 @@ pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& te
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
     if (!paths.state.empty()) {
-        options.savedSectorsDirectory = paths.state / "partition-maps";
         options.permissionReferences = paths.state / "permissions";
         options.trials.room.directory = paths.state / "repairs";
     }
