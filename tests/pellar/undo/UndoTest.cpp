@@ -394,34 +394,40 @@ TEST(UndoRecord, UndoAndFinishAreTakenUpAgainAfterAFailure)
 
 TEST(UndoRecord, ADiskThatWasChangedSinceIsNotWritten)
 {
+    const auto expectRefusal = [](World& world, const auto& work) {
+        const std::string disk = world.disk.cached;
+        const auto done = work();
+        ASSERT_FALSE(done);
+        EXPECT_EQ(done.error().sentence.key, "nothing was changed: the disk was changed since");
+        EXPECT_EQ(world.disk.cached, disk);
+    };
     // A byte that the repair changes, in the last range; one that stays as it is; the disk's end.
     for (const std::size_t place : {std::size_t{6191}, std::size_t{5005}, std::size_t{6192}}) {
-        const auto expectRefusal = [place](World& world, const auto& work) {
-            if (place == world.disk.cached.size())
-                world.disk.cached.pop_back();
+        const auto change = [place](CachedDisk& disk) {
+            if (place == disk.cached.size())
+                disk.cached.pop_back();
             else
-                world.disk.cached[place] = '#';
-            const std::string disk = world.disk.cached;
-            const auto done = work();
-            ASSERT_FALSE(done);
-            EXPECT_EQ(done.error().sentence.key, "nothing was changed: the disk was changed since");
-            EXPECT_EQ(world.disk.cached, disk);
+                disk.cached[place] = '#';
         };
         World fresh;
-        expectRefusal(fresh, [&] { return fresh.save().apply(fresh.disk); });
-        EXPECT_TRUE(place != 6191 || fresh.store->list().records.empty());
+        {
+            UndoRecord record = fresh.save();
+            change(fresh.disk);
+            expectRefusal(fresh, [&] { return record.apply(fresh.disk); });
+        }
+        EXPECT_TRUE(fs::is_empty(fresh.storePath()));
+
         World applied;
-        const std::string id = applied.apply();
-        expectRefusal(applied, [&] { return applied.store->take(id)->undo(applied.disk); });
-        EXPECT_EQ(applied.store->list().records.at(0).facts.state, RecordState::Applied);
+        auto record = applied.store->take(applied.apply());
+        change(applied.disk);
+        expectRefusal(applied, [&] { return record->undo(applied.disk); });
+        EXPECT_EQ(record->facts().state, RecordState::Applied);
+
         World interrupted;
-        const std::string other = interrupted.interrupt();
-        for (const Way way : {Way::Undo, Way::Finish})
-            expectRefusal(interrupted, [&] {
-                auto record = interrupted.store->take(other);
-                return way == Way::Undo ? record->undo(interrupted.disk)
-                                        : record->finish(interrupted.disk);
-            });
+        auto other = interrupted.store->take(interrupted.interrupt());
+        change(interrupted.disk);
+        expectRefusal(interrupted, [&] { return other->undo(interrupted.disk); });
+        expectRefusal(interrupted, [&] { return other->finish(interrupted.disk); });
     }
 }
 
