@@ -335,6 +335,9 @@ TEST(UndoRecord, ADiskThatDoesNotTakeTheRepairIsPutBack)
          {Case{[](CachedDisk& disk) { disk.failingWrites = {2}; },
                "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
                "a write fails once"},
+          Case{[](CachedDisk& disk) { disk.badPlace = 4096; },
+               "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
+               "a place cannot be written, and still has what it had"},
           Case{[](CachedDisk& disk) { disk.failingSyncs = 1; },
                "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
                "the cache cannot be written"},
@@ -371,6 +374,15 @@ TEST(UndoRecord, ADiskThatDoesNotTakeTheRepairIsPutBack)
         EXPECT_TRUE(world.store->take(id)->undo(world.disk)) << c.because;
         EXPECT_EQ(world.disk.medium, oldDisk()) << c.because;
     }
+}
+
+TEST(UndoRecord, WhatCanBePutBackIs)
+{
+    World world;
+    UndoRecord record = world.save();
+    world.disk.failingWrites = {3, 4};  // the third range, and putting back the first
+    EXPECT_FALSE(record.apply(world.disk));
+    EXPECT_EQ(world.disk.medium, repaired(oldDisk(), {ranges.front()}));
 }
 
 TEST(UndoRecord, UndoAndFinishAreTakenUpAgainAfterAFailure)
@@ -465,8 +477,9 @@ TEST(UndoStore, WithoutRoomNothingIsTouched)
     World world;
     {
         const FileSizeLimit limit(4000);
-        EXPECT_EQ(world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
-                  "nothing was changed: the bytes to be saved cannot be kept (%1$@)");
+        EXPECT_EQ(
+            world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
+            "nothing was changed: the bytes kept for undoing cannot be written or read (%1$@)");
     }
     EXPECT_TRUE(fs::is_empty(world.storePath()));
     {
@@ -617,10 +630,14 @@ TEST(UndoStore, KeepsToLimitsAndNeverRemovesWhatIsInterrupted)
         return days;
     };
     EXPECT_EQ(kept({5, 200h, 1 << 20}), (std::vector{4, 3, 2, 1, 0}));
-    EXPECT_EQ(kept({5, 90h, 1 << 20}), (std::vector{4, 3, 2, 0})) << "age";
-    EXPECT_EQ(kept({5, 200h, 4705 + 200}), (std::vector{4, 3, 0})) << "bytes";
-    const auto inUse = world.store->take(world.store->list().records.at(1).id);
-    EXPECT_EQ(kept({0, 0h, 0}), (std::vector{3, 0})) << "number, and what is in use";
+    EXPECT_EQ(kept({4, 200h, 1 << 20}), (std::vector{4, 3, 2, 0})) << "number";
+    EXPECT_EQ(kept({5, 60h, 1 << 20}), (std::vector{4, 3, 0})) << "age";
+    EXPECT_EQ(kept({5, 200h, 4705 + 100}), (std::vector{4, 0})) << "bytes";
+    {
+        const auto inUse = world.store->take(world.store->list().records.at(0).id);
+        EXPECT_EQ(kept({0, 0h, 0}), (std::vector{4, 0}));
+    }
+    EXPECT_EQ(kept({0, 0h, 0}), (std::vector{0}));
 }
 
 }  // namespace
