@@ -105,8 +105,7 @@ TEST_P(RealTools, SayWhatIsTrue)
 /// A library that tries repairs before it applies them.
 JobOptions trying(const test::TestDirectory& directory, RepairPolicy& policy)
 {
-    JobOptions options;
-    options.trials.room.directory = directory.path("repairs");
+    JobOptions options = test::tryingIn(directory.path("repairs"));
     options.repairPolicy = [&policy] {
         return policy;
     };
