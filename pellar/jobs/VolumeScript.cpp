@@ -6,6 +6,7 @@
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/RepairApplication.h"
+#include "pellar/jobs/RepairPreview.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/probe/DiskProbe.h"
 #include "pellar/tools/Capability.h"
@@ -360,7 +361,9 @@ VolumeScript::State VolumeScript::tryRepair()
                                  {"the repair cannot be tried first: %1$@", log_.text(*obstacle),
                                   {}}));
     }
-    outcome_ = RepairPasses(runs_, context_, look_, {lookEnds, trialEnds}).run();
+    RepairPasses passes(runs_, context_, look_, {lookEnds, trialEnds});
+    outcome_ = passes.run();
+    look_.counts = passes.counts();
     runs_.workOn(nullptr);
     if (context_.policy.isPreview || isProven(outcome_))
         return State::Applying;
@@ -374,9 +377,9 @@ VolumeScript::State VolumeScript::tryRepair()
 
 VolumeScript::State VolumeScript::apply()
 {
-    RepairApplication application(context_, disk_, *trial_, mark_);
-    return end(context_.policy.isPreview ? application.preview(outcome_)
-                                         : application.apply(outcome_));
+    if (context_.policy.isPreview)
+        return end(RepairPreview(context_, *tool_, *trial_).tell(outcome_, look_.counts));
+    return end(applyTrial(*trial_, mark_, disk_, context_, outcome_));
 }
 
 /// Why there is none; the tool works on it from now on.
