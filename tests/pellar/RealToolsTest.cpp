@@ -351,13 +351,13 @@ TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
     test::JobFixture library(trying(directory, policy));
     ASSERT_EQ(library.repair(test::reference(image)), 0);
     EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
-    const auto isTold = [&library](std::string_view text) {
-        return std::ranges::any_of(library.listener.dictionaries, [text](const auto& message) {
-            return message.string(contract::kFsckMessageString) == text;
-        });
-    };
-    EXPECT_TRUE(isTold("In lost+found after the repair: “#15”, 3000 bytes"));
-    EXPECT_TRUE(isTold("After the repair: no damage is left; 1 file is now in lost+found."));
+    EXPECT_TRUE(
+        library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
+    const auto& told = library.listener.dictionaries;
+    EXPECT_TRUE(std::ranges::any_of(told, [](const contract::Dictionary& message) {
+        return message.string(contract::kFsckMessageString) ==
+               "After the repair: no damage is left; 1 file is now in lost+found.";
+    }));
 }
 
 TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)
