@@ -61,13 +61,22 @@ std::optional<Outcome> RecordedWriting::write(const std::vector<ByteRange>& rang
         return notWritten(record.error());
     log.step(Operation::Repair, {"Writing the proven repair to “%1$@”", log.diskName(), {}});
     log.flush();
-    const auto applied = record->apply(disk, workOf(context_));
-    if (!applied && applied.error().left == UndoFailure::Left::Unchanged)
-        return notWritten(applied.error().sentence);
-    if (!applied)
-        return failedOutcome(contract::kPLErrorInterrupted, applied.error().sentence);
-    keepWithinLimits(*store, record->id());
+    const std::string id = record->id();
+    if (auto failure = apply(*std::move(record), disk))
+        return failure;
+    keepWithinLimits(*store, id);
     return std::nullopt;
+}
+
+/// The record is not in use any more when this answers.
+std::optional<Outcome> RecordedWriting::apply(UndoRecord record, Region& disk) const
+{
+    const auto applied = record.apply(disk, workOf(context_));
+    if (applied)
+        return std::nullopt;
+    return applied.error().left == UndoFailure::Left::Unchanged
+               ? notWritten(applied.error().sentence)
+               : failedOutcome(contract::kPLErrorInterrupted, applied.error().sentence);
 }
 
 /// The user's stop comes before all other reasons.
