@@ -46,7 +46,7 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
 }  // namespace
 
 pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
-                                      const Asking& asking, const WarningSink& refused)
+                                  const Asking& asking, const WarningSink& refused)
 {
     pellar::JobOptions options;
     if (const std::string path = toolPathFromEnvironment(refused); !path.empty())

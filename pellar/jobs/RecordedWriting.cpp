@@ -22,12 +22,8 @@ RecordedDisk recordedDisk(const contract::DiskReference& reference, int descript
 {
     std::error_code error;
     const auto path = std::filesystem::canonical(reference.path, error);
-    return {error ? reference.path : path,
-            region.offset,
-            region.length,
-            readSuperblock(descriptor, region).uuid,
-            reference.filesystem,
-            reference.name};
+    return {error ? reference.path : path,           region.offset,        region.length,
+            readSuperblock(descriptor, region).uuid, reference.filesystem, reference.name};
 }
 
 std::uint64_t lengthOf(const std::vector<ByteRange>& ranges)

@@ -38,7 +38,9 @@ Outcome applyTrial(const TrialDisk& trial, const WriteMark& mark, const JobDisk&
     if (!(WriteMark::of(disk.claim().descriptor()) == mark))
         return failedOutcome(
             contract::kPLErrorDiskChanged,
-            {"another program wrote to it while the repair was tried; nothing was written", {}, {}});
+            {"another program wrote to it while the repair was tried; nothing was written",
+             {},
+             {}});
     const DiskClaim& claim = disk.claim();
     const ByteRange place{claim.offset(), claim.availableBytes()};
     FileRegion region(claim.descriptor(), place.offset, place.length);

@@ -29,8 +29,8 @@ int copyInto(int file, Overlay& overlay, const std::function<bool()>& isStopped)
 {
     Bytes buffer(1U << 20U);
     for (std::uint64_t at = 0; at < overlay.bytes(); at += buffer.size()) {
-        const std::span part(buffer.data(), std::min<std::uint64_t>(buffer.size(),
-                                                                    overlay.bytes() - at));
+        const std::span part(buffer.data(),
+                             std::min<std::uint64_t>(buffer.size(), overlay.bytes() - at));
         if (isStopped())
             return ECANCELED;
         if (const int error = overlay.read(at, part))
@@ -139,7 +139,8 @@ std::optional<Sentence> RepairPreview::writeImage()
     const std::string shown = contract::printable(path.native());
     log_.step(Operation::Repair, {"Writing the repaired volume to %1$@", shown, {}});
     const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
-    const int error = file ? copyInto(file.get(), trial_.overlay(), workOf(context_).isStopped) : errno;
+    const int error =
+        file ? copyInto(file.get(), trial_.overlay(), workOf(context_).isStopped) : errno;
     if (error == 0) {
         log_.remark(Sentence{"The repaired volume is in %1$@.", shown, {}});
         return std::nullopt;

@@ -351,8 +351,7 @@ TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
     test::JobFixture library(trying(directory, policy));
     ASSERT_EQ(library.repair(test::reference(image)), 0);
     EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
-    EXPECT_TRUE(
-        library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
+    EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
     const auto& told = library.listener.dictionaries;
     EXPECT_TRUE(std::ranges::any_of(told, [](const contract::Dictionary& message) {
         return message.string(contract::kFsckMessageString) ==

@@ -63,8 +63,9 @@ TEST_F(TriedRepair, IsNotAppliedToADiskThatAnotherHasWrittenTo)
     bool isChanged = false;
     library().listener.onMessage = [&] {
         const auto& heard = library().listener.dictionaries;
-        const bool isTrying = !heard.empty() && test::contains(heard.back().string(contract::kFsckMessageString),
-                                                               "Trying the repair");
+        const bool isTrying =
+            !heard.empty() &&
+            test::contains(heard.back().string(contract::kFsckMessageString), "Trying the repair");
         if (!isTrying || std::exchange(isChanged, true))
             return;
         // The tool waits until this is done; the trial has begun by then.
@@ -85,7 +86,8 @@ TEST_F(TriedRepair, WritesNothingWhereWhatItWouldWriteCannotBeKept)
 {
     options_.trials.room.mostBytes = 1024;
     repair();
-    EXPECT_TRUE(test::contains(library().listener.message, "no room")) << library().listener.message;
+    EXPECT_TRUE(test::contains(library().listener.message, "no room"))
+        << library().listener.message;
     EXPECT_TRUE(contentsOf(image_) == before_);
     library_.reset();
     options_.trials.room = {directory_.path("disk") / "below", 1U << 20U};
