@@ -9,6 +9,7 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -302,8 +303,9 @@ TEST_F(PermissionUndo, ADamagedLineCostsItsFileAlone)
     EXPECT_EQ(rightsOf(path("usr/bin/score")), (Rights{02755, 0, 60}));
 }
 
-// Killed at whatever moment, the repair and the undo after it.
-TEST_F(PermissionUndo, KilledInTheMiddleNothingIsLost)
+// The kernel kills the process (SIGXFSZ) in the write by which a file of it grows too long, here
+// the record: within a line, before the changes or between two of them.
+TEST_F(PermissionUndo, KilledOrOutOfSpaceInTheMiddleNothingIsLost)
 {
     std::vector<test::PackageFile> files;
     for (int i = 0; i < 400; ++i)
@@ -317,41 +319,49 @@ TEST_F(PermissionUndo, KilledInTheMiddleNothingIsLost)
     };
     damageMany();
     const auto before = all();
-    const auto killAt = [&](std::uintmax_t size, const auto& work) {
+    const auto endingAt = [&](std::uintmax_t size, sighandler_t atSize, const auto& work) {
         const pid_t child = ::fork();
         if (child == 0) {
+            const rlimit none{0, 0};
+            const rlimit longest{size, size};
+            ::setrlimit(RLIMIT_CORE, &none);
+            ::setrlimit(RLIMIT_FSIZE, &longest);
+            ::signal(SIGXFSZ, atSize);
             Bench bench(options_);
             work(bench);
-            ::_exit(0);
+            ::_exit(contains(bench.listener.message, "could not be kept") ? 1 : 0);
         }
         int status = 0;
-        const auto sizeOfRecord = [this] {
-            std::error_code error;
-            std::uintmax_t largest = 0;
-            for (const auto& entry : fs::directory_iterator(records(), error))
-                largest = std::max(largest, fs::file_size(entry.path(), error));
-            return largest;
-        };
-        while (::waitpid(child, &status, WNOHANG) == 0)
-            if (const auto now = sizeOfRecord(); now >= size && now < 1U << 30U) {
-                ::kill(child, SIGKILL);
-                ::waitpid(child, &status, 0);
-                break;
-            }
-        return WIFSIGNALED(status);
+        ::waitpid(child, &status, 0);
+        return status;
     };
-    int kills = 0;
-    for (const std::uintmax_t size : {1'000U, 30'000U, 60'000U, 100'000U, 140'000U}) {
-        kills += killAt(size, [&](Bench& bench) { bench.repairPermissions(system_.disk()); });
+    const auto isKilledAt = [&](std::uintmax_t size, const auto& work) {
+        const int status = endingAt(size, SIG_DFL, work);
+        return WIFSIGNALED(status) && WTERMSIG(status) == SIGXFSZ;
+    };
+    for (const std::uintmax_t size : {61'234U, 75'000U, 80'001U, 100'001U, 140'000U}) {
+        EXPECT_TRUE(isKilledAt(
+            size, [&](Bench& bench) { bench.repairPermissions(system_.disk()); }));
+        EXPECT_NE(all(), before) << size;
         const std::uintmax_t recorded = fs::file_size(onlyRecord());
-        kills += killAt(recorded + size / 10, [&](Bench& bench) { bench.run(undo, system_.disk()); });
+        EXPECT_TRUE(isKilledAt(recorded + size / 30,
+                               [&](Bench& bench) { bench.run(undo, system_.disk()); }));
         Bench bench(options_);
-        if (!list().records.empty())
-            bench.run(undo, system_.disk());
+        bench.run(undo, system_.disk());
+        EXPECT_EQ(bench.listener.verdict, "undone");
+        EXPECT_TRUE(contains(bench.listener.message, "left alone: 0")) << bench.listener.message;
         EXPECT_EQ(all(), before) << size << bench.problems();
         EXPECT_TRUE(list().records.empty());
     }
-    EXPECT_GE(kills, 5) << "most come in the middle";
+    // The medium is full in the middle.
+    const int status = endingAt(80'000, SIG_IGN, [&](Bench& bench) {
+        bench.repairPermissions(system_.disk());
+    });
+    EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 1) << "it says why it went no further";
+    EXPECT_NE(all(), before);
+    Bench bench(options_);
+    bench.run(undo, system_.disk());
+    EXPECT_EQ(all(), before) << bench.problems();
 }
 
 TEST_F(PermissionUndo, WhereNoRecordCanBeKeptNothingIsChanged)
