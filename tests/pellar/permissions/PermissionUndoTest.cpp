@@ -165,6 +165,7 @@ TEST_F(PermissionUndo, EveryFileHasAgainWhatItHadBefore)
     Bench bench(options_);
     bench.repairPermissions(system_.disk());
     EXPECT_EQ(bench.listener.verdict, "repaired") << bench.problems();
+    EXPECT_FALSE(contains(bench.problems(), "changed while it was looked at"));
     expectRepaired();
     EXPECT_TRUE(bench.remarks("This is how."));
     const auto listed = list().records;
@@ -276,16 +277,22 @@ TEST_F(PermissionUndo, AFileOfAnInterruptedRepairThatWasWrittenToIsLeftAlone)
     const std::string text = contentsOfFile(record);
     fs::resize_file(record, text.find("\"stage\"") - 30);
     system_.write("usr/share/games/levels", "another's\n");
-    // With the old time put back, as an owner can.
-    struct stat status = {};
-    ASSERT_EQ(::stat(path("usr/bin/play").c_str(), &status), 0);
-    system_.write("usr/bin/play", "another's\n");
-    const std::array<timespec, 2> times{status.st_atim, status.st_mtim};
-    ASSERT_EQ(::utimensat(AT_FDCWD, path("usr/bin/play").c_str(), times.data(), 0), 0);
+    // With the old time put back, as an owner can; the second is another file.
+    for (const char* const name : {"usr/bin/play", "usr/bin/two"}) {
+        struct stat status = {};
+        ASSERT_EQ(::stat(path(name).c_str(), &status), 0);
+        if (path(name).filename() == "two")
+            fs::rename(path(name), path("aside"));
+        system_.write(name, "another's\n");
+        ::chmod(path(name).c_str(), 0755);
+        const std::array<timespec, 2> times{status.st_atim, status.st_mtim};
+        ASSERT_EQ(::utimensat(AT_FDCWD, path(name).c_str(), times.data(), 0), 0);
+    }
     bench.run(undo, system_.disk());
     EXPECT_EQ(rightsOf(path("usr/share/games/levels")), (Rights{0644, 0, 0}));
     EXPECT_EQ(rightsOf(path("usr/bin/play")), (Rights{0755, 0, 0})) << "not the contents of then";
-    EXPECT_TRUE(contains(bench.listener.message, "5 files were put back; left alone: 2"))
+    EXPECT_EQ(rightsOf(path("usr/bin/two")), (Rights{0755, 0, 0}));
+    EXPECT_TRUE(contains(bench.listener.message, "4 files were put back; left alone: 3"))
         << bench.listener.message;
 }
 
@@ -339,6 +346,17 @@ TEST_F(PermissionUndo, KilledOrOutOfSpaceInTheMiddleNothingIsLost)
         const int status = endingAt(size, SIG_DFL, work);
         return WIFSIGNALED(status) && WTERMSIG(status) == SIGXFSZ;
     };
+    // As if the undo had been killed between a file's owner and its mode.
+    const auto bringOnTheWay = [&] {
+        const auto store = PermissionRecords::open(records());
+        const auto record = store->take(onlyRecord().filename());
+        for (const RecordedChange& change : record->changes())
+            if (change.stage == ChangeStage::TakingBack && change.after &&
+                rightsOf(path(change.path)).user == 0)
+                return ::chown(path(change.path).c_str(), player, 60) == 0;
+        return false;
+    };
+    int onTheWay = 0;
     for (const std::uintmax_t size : {61'234U, 75'000U, 80'001U, 100'001U, 140'000U}) {
         EXPECT_TRUE(isKilledAt(
             size, [&](Bench& bench) { bench.repairPermissions(system_.disk()); }));
@@ -346,13 +364,16 @@ TEST_F(PermissionUndo, KilledOrOutOfSpaceInTheMiddleNothingIsLost)
         const std::uintmax_t recorded = fs::file_size(onlyRecord());
         EXPECT_TRUE(isKilledAt(recorded + size / 30,
                                [&](Bench& bench) { bench.run(undo, system_.disk()); }));
+        onTheWay += bringOnTheWay() ? 1 : 0;
         Bench bench(options_);
         bench.run(undo, system_.disk());
         EXPECT_EQ(bench.listener.verdict, "undone");
         EXPECT_TRUE(contains(bench.listener.message, "left alone: 0")) << bench.listener.message;
+        EXPECT_FALSE(contains(bench.problems(), "damaged")) << "what was cut off is no damage";
         EXPECT_EQ(all(), before) << size << bench.problems();
         EXPECT_TRUE(list().records.empty());
     }
+    EXPECT_GT(onTheWay, 0);
     // The medium is full in the middle.
     const int status = endingAt(80'000, SIG_IGN, [&](Bench& bench) {
         bench.repairPermissions(system_.disk());
