@@ -83,22 +83,25 @@ PermissionsUndoScript::Failure PermissionsUndoScript::work(const RootDirectory& 
     for (std::size_t i = record.changes().size(); i-- > 0;)
         if (record.changes()[i].stage != ChangeStage::Settled)
             places.push_back(i);
-    log_.step(Operation::Undo, sentenceAbout(places.size(), "Putting back the permissions of %1$@ file",
-                                             "Putting back the permissions of %1$@ files"));
+    log_.step(Operation::Undo,
+              sentenceAbout(places.size(), "Putting back the permissions of %1$@ file",
+                            "Putting back the permissions of %1$@ files"));
     log_.flush();
     for (std::size_t i = 0; i < places.size() && !context_.stop.isPressed(); i += batchSize) {
         const std::size_t end = std::min(i + batchSize, places.size());
-        takeBackBatch(root, record, {places.begin() + static_cast<std::ptrdiff_t>(i),
-                                     places.begin() + static_cast<std::ptrdiff_t>(end)});
+        takeBackBatch(root, record,
+                      {places.begin() + static_cast<std::ptrdiff_t>(i),
+                       places.begin() + static_cast<std::ptrdiff_t>(end)});
         log_.progress(100.0 * static_cast<double>(end) / static_cast<double>(places.size()));
         log_.flushIfDue();
     }
     log_.endOfRun();
     if (record.damagedLines() > 0)
-        log_.error(sentenceAbout(record.damagedLines(),
-                                 "%1$@ entry of the record is damaged; what it tells is not undone.",
-                                 "%1$@ entries of the record are damaged; what they tell is not "
-                                 "undone."));
+        log_.error(
+            sentenceAbout(record.damagedLines(),
+                          "%1$@ entry of the record is damaged; what it tells is not undone.",
+                          "%1$@ entries of the record are damaged; what they tell is not "
+                          "undone."));
     return end(record);
 }
 
@@ -192,9 +195,9 @@ PermissionsUndoScript::Failure PermissionsUndoScript::end(PermissionRecord& reco
                             std::generic_category().message(error),
                             {}});
     if (putBack_ + asBefore_ == 0 && leftAlone_ > 0)
-        return failedOutcome(contract::kPLErrorNotUndone,
-                             sentenceAbout(leftAlone_, "%1$@ file was left alone",
-                                           "%1$@ files were left alone"));
+        return failedOutcome(
+            contract::kPLErrorNotUndone,
+            sentenceAbout(leftAlone_, "%1$@ file was left alone", "%1$@ files were left alone"));
     return std::nullopt;
 }
 
@@ -207,21 +210,20 @@ Sentence PermissionsUndoScript::numbers() const
 void PermissionsUndoScript::report(const Failure& failure)
 {
     if (!failure) {
-        const std::string message = log_.text(
-            {"undid the repair of the permissions on “%1$@”: %2$@", log_.diskName(),
-             log_.text(numbers())});
+        const std::string message =
+            log_.text({"undid the repair of the permissions on “%1$@”: %2$@", log_.diskName(),
+                       log_.text(numbers())});
         log_.verdict(true, message);
         log_.finished(contract::kPLNoError, 0, contract::kPLVerdictUndone, message);
         return;
     }
     const bool isStopped = failure->verdict == Verdict::Stopped;
     const std::string message = log_.text(
-        isStopped
-            ? Sentence{"stopped while undoing the repair of the permissions on “%1$@”",
-                       log_.diskName(),
-                       {}}
-            : Sentence{"cannot undo the repair of the permissions on “%1$@”: %2$@",
-                       log_.diskName(), log_.text(failure->reason)});
+        isStopped ? Sentence{"stopped while undoing the repair of the permissions on “%1$@”",
+                             log_.diskName(),
+                             {}}
+                  : Sentence{"cannot undo the repair of the permissions on “%1$@”: %2$@",
+                             log_.diskName(), log_.text(failure->reason)});
     if (!isStopped)
         log_.failure(message);
     log_.finished(*failure, message);

@@ -65,8 +65,7 @@ bool RecordedRestoring::isToBeRecorded() const
 
 bool RecordedRestoring::isWaiting(const FoundFile& file) const
 {
-    return file.status.st_nlink > 1 &&
-           std::ranges::any_of(waiting_, [&](const Waiting& waiting) {
+    return file.status.st_nlink > 1 && std::ranges::any_of(waiting_, [&](const Waiting& waiting) {
                return waiting.file.status.st_dev == file.status.st_dev &&
                       waiting.file.status.st_ino == file.status.st_ino;
            });

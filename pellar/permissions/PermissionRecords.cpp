@@ -62,10 +62,9 @@ bool isSameSystem(const PermissionsRun& a, const PermissionsRun& b)
 
 std::uint64_t unsettledIn(const std::vector<RecordedChange>& changes)
 {
-    return static_cast<std::uint64_t>(
-        std::ranges::count_if(changes, [](const RecordedChange& change) {
-            return change.stage != ChangeStage::Settled;
-        }));
+    return static_cast<std::uint64_t>(std::ranges::count_if(
+        changes,
+        [](const RecordedChange& change) { return change.stage != ChangeStage::Settled; }));
 }
 
 }  // namespace
@@ -73,17 +72,16 @@ std::uint64_t unsettledIn(const std::vector<RecordedChange>& changes)
 const ListedPermissionRecord* newestOf(const PermissionsRun& system,
                                        const PermissionRecordList& list)
 {
-    const auto found =
-        std::ranges::find_if(list.records, [&](const ListedPermissionRecord& record) {
-            return isSameSystem(record.run, system);
-        });
+    const auto found = std::ranges::find_if(
+        list.records,
+        [&](const ListedPermissionRecord& record) { return isSameSystem(record.run, system); });
     return found == list.records.end() ? nullptr : &*found;
 }
 
 int PermissionRecord::append(const std::string& text)
 {
-    const int error = writeAll(
-        file_.get(), length_, {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()});
+    const int error = writeAll(file_.get(), length_,
+                               {reinterpret_cast<const std::uint8_t*>(text.data()), text.size()});
     if (error == 0)
         length_ += text.size();
     return error;
@@ -192,8 +190,7 @@ Result<PermissionRecord, int> PermissionRecords::begin(const PermissionsRun& run
 }
 
 // O_NONBLOCK: a FIFO in a file's place must not keep the process waiting; it is refused.
-Result<PermissionRecord, int> PermissionRecords::openLocked(const std::string& name,
-                                                            int kind) const
+Result<PermissionRecord, int> PermissionRecords::openLocked(const std::string& name, int kind) const
 {
     if (name.empty() || name.front() == '.' || name.find('/') != std::string::npos)
         return ENOENT;
@@ -259,8 +256,7 @@ void PermissionRecords::removeBeyond(const RecordLimits& limits,
     const PermissionRecordList list = this->list();
     std::size_t left = list.records.size();
     for (auto listed = list.records.rbegin(); listed != list.records.rend(); ++listed) {
-        const bool isBeyond =
-            left > limits.records || now - listed->run.repair.time > limits.age;
+        const bool isBeyond = left > limits.records || now - listed->run.repair.time > limits.age;
         if (!isBeyond)
             continue;
         const auto record = openLocked(listed->id, LOCK_EX);

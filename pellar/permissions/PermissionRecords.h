@@ -103,8 +103,7 @@ private:
     {
     }
 
-    [[nodiscard]] Result<PermissionRecord, int> openLocked(const std::string& name,
-                                                           int kind) const;
+    [[nodiscard]] Result<PermissionRecord, int> openLocked(const std::string& name, int kind) const;
 
     std::shared_ptr<const StoreDirectory> directory_;
 };

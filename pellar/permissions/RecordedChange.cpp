@@ -172,11 +172,12 @@ RecordedChange changeOf(const Reference& reference, const FoundFile& file)
     change.wanted = {file.permissions.kind, reference.mode, reference.user, reference.group,
                      reference.capabilities.value_or(file.permissions.capabilities)};
     if (lendsRights(file.permissions)) {
-        const FileDescriptor readable(::open(pathOfDescriptor(file.object.get()).c_str(),
-                                             O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+        const FileDescriptor readable(
+            ::open(pathOfDescriptor(file.object.get()).c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
         change.digest =
-            readable ? digestOfFile(readable.get(), DigestKind::SHA256, largestContents).value_or("")
-                     : "";
+            readable
+                ? digestOfFile(readable.get(), DigestKind::SHA256, largestContents).value_or("")
+                : "";
     }
     return change;
 }

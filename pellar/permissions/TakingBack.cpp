@@ -11,8 +11,7 @@ namespace {
 bool isSameObject(const RootDirectory& root, std::uint64_t recordedRoot,
                   const RecordedChange& change, const FoundFile& file)
 {
-    const std::uint64_t device =
-        change.device == recordedRoot ? deviceOf(root) : change.device;
+    const std::uint64_t device = change.device == recordedRoot ? deviceOf(root) : change.device;
     return file.status.st_dev == device && file.status.st_ino == change.inode &&
            file.permissions.kind == change.before.permissions.kind;
 }

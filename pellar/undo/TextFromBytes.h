@@ -21,8 +21,8 @@ inline std::string charactersFrom(std::string_view bytes)
 inline std::string bytesFrom(std::string_view characters)
 {
     std::string bytes;
-    contract::forEachCharacter(
-        characters, [&](char32_t character) { bytes += static_cast<char>(character); });
+    contract::forEachCharacter(characters,
+                               [&](char32_t character) { bytes += static_cast<char>(character); });
     return bytes;
 }
 

@@ -180,8 +180,9 @@ TEST_F(PermissionUndo, EveryFileHasAgainWhatItHadBefore)
 
     bench.run(undo, system_.disk());
     EXPECT_EQ(bench.listener.verdict, "undone") << bench.listener.message;
-    EXPECT_EQ(bench.listener.message,
-              "undid the repair of the permissions on “Disk”: 7 files were put back; left alone: 0");
+    EXPECT_EQ(
+        bench.listener.message,
+        "undid the repair of the permissions on “Disk”: 7 files were put back; left alone: 0");
     EXPECT_EQ(all(), before);
     EXPECT_TRUE(list().records.empty());
     bench.run(undo, system_.disk());
@@ -206,8 +207,8 @@ TEST_F(PermissionUndo, AFileThatWasChangedSinceIsLeftAlone)
     EXPECT_TRUE(contains(bench.listener.message, "3 files were put back; left alone: 4"))
         << bench.listener.message;
     for (const char* const name : {"usr/bin/play", "usr/bin/score", "usr/share/games/link"}) {
-        EXPECT_TRUE(contains(bench.problems(), "“" + std::string(name) +
-                                                   "” was changed since and was left alone."))
+        EXPECT_TRUE(contains(bench.problems(),
+                             "“" + std::string(name) + "” was changed since and was left alone."))
             << bench.problems();
         EXPECT_EQ(rightsOf(path(name)), repaired.at(path(name)).rights) << name;
     }
@@ -220,8 +221,8 @@ TEST_F(PermissionUndo, NoneOfTheFilesIsAsItWasLeft)
 {
     Bench bench(options_);
     bench.repairPermissions(system_.disk());
-    for (const char* const name : {"bin/play", "bin/score", "bin/two", "share/games", "share/games/levels",
-                                   "share/games/link", "share/games/ping"})
+    for (const char* const name : {"bin/play", "bin/score", "bin/two", "share/games",
+                                   "share/games/levels", "share/games/link", "share/games/ping"})
         ASSERT_EQ(::lchown(path(std::string("usr/") + name).c_str(), 77, 77), 0);
     bench.run(undo, system_.disk());
     EXPECT_EQ(bench.listener.error, contract::kPLErrorNotUndone) << bench.listener.message;
@@ -306,7 +307,8 @@ TEST_F(PermissionUndo, ADamagedLineCostsItsFileAlone)
     std::ofstream(record) << text;
     bench.run(undo, system_.disk());
     EXPECT_TRUE(contains(bench.problems(), "1 entry of the record is damaged")) << bench.problems();
-    EXPECT_TRUE(contains(bench.listener.message, "6 files were put back")) << bench.listener.message;
+    EXPECT_TRUE(contains(bench.listener.message, "6 files were put back"))
+        << bench.listener.message;
     EXPECT_EQ(rightsOf(path("usr/bin/score")), (Rights{02755, 0, 60}));
 }
 
@@ -358,8 +360,8 @@ TEST_F(PermissionUndo, KilledOrOutOfSpaceInTheMiddleNothingIsLost)
     };
     int onTheWay = 0;
     for (const std::uintmax_t size : {61'234U, 75'000U, 80'001U, 100'001U, 140'000U}) {
-        EXPECT_TRUE(isKilledAt(
-            size, [&](Bench& bench) { bench.repairPermissions(system_.disk()); }));
+        EXPECT_TRUE(
+            isKilledAt(size, [&](Bench& bench) { bench.repairPermissions(system_.disk()); }));
         EXPECT_NE(all(), before) << size;
         const std::uintmax_t recorded = fs::file_size(onlyRecord());
         EXPECT_TRUE(isKilledAt(recorded + size / 30,
@@ -375,9 +377,8 @@ TEST_F(PermissionUndo, KilledOrOutOfSpaceInTheMiddleNothingIsLost)
     }
     EXPECT_GT(onTheWay, 0);
     // The medium is full in the middle.
-    const int status = endingAt(80'000, SIG_IGN, [&](Bench& bench) {
-        bench.repairPermissions(system_.disk());
-    });
+    const int status =
+        endingAt(80'000, SIG_IGN, [&](Bench& bench) { bench.repairPermissions(system_.disk()); });
     EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 1) << "it says why it went no further";
     EXPECT_NE(all(), before);
     Bench bench(options_);
