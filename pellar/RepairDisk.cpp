@@ -7,6 +7,7 @@
 #include "pellar/jobs/PartOfImageScript.h"
 #include "pellar/jobs/PartitionMapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/jobs/PermissionsUndoScript.h"
 #include "pellar/jobs/UndoScript.h"
 #include "pellar/jobs/VolumeScript.h"
 #include "pellar/packages/InstalledSystem.h"
@@ -186,6 +187,12 @@ ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation op
 
 ErrorCode RepairDisk::beginUndo(Task task, const DiskReferencePointer& disk)
 {
+    if (task.subject == Subject::Permissions) {
+        start(disk, [=, this](StopSwitch& stop, EventQueue& events) {
+            return std::make_unique<PermissionsUndoScript>(disk, context(*disk, stop, events));
+        });
+        return contract::kPLNoError;
+    }
     UndoRequest request{task, disk, {}};
     if (task.subject == Subject::Filesystem)
         request.mounts = mountsOf(disk->path, options_.systemPaths);
@@ -273,7 +280,8 @@ ErrorCode RepairDisk::refusal(Task task, const DiskReferencePointer& disk) const
     if (!disk || disk->path.empty())
         return contract::kPLErrorNoDiskReference;
     if (task.subject == Subject::Permissions)
-        return refusalOfPermissions(*disk);
+        return task.operation == Operation::Finish ? contract::kPLErrorUnsupported
+                                                   : refusalOfPermissions(*disk);
     if (disk->isWhole != (task.subject == Subject::PartitionMap))
         return contract::kPLErrorUnsupported;
     if (task.subject == Subject::Filesystem && !task.isUndo())

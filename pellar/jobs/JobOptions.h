@@ -64,6 +64,12 @@ inline std::filesystem::path recordsIn(const Trials& trials)
     return trials.room.directory / "records";
 }
 
+/// Where the records are of the permissions that repairs have changed (PermissionRecords).
+inline std::filesystem::path permissionRecordsIn(const Trials& trials)
+{
+    return trials.room.directory / "permission-records";
+}
+
 /// A job for which this user has no right: on a block device that they may not open, on files that
 /// are not theirs, or on a part of an image that the kernel has to make a device of.
 struct PrivilegedJob {

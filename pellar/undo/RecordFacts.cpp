@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/undo/RecordFacts.h"
 
-#include "contract/foundation/UTF8.h"
 #include "pellar/bytes/Digest.h"
+#include "pellar/undo/TextFromBytes.h"
 
 #include <nlohmann/json.hpp>
 
@@ -32,23 +32,6 @@ std::string sha256(std::string_view text)
     return digester.finish();
 }
 
-// Paths and names are any bytes, and JSON is UTF-8: each byte becomes the character of its number.
-std::string charactersFrom(std::string_view bytes)
-{
-    std::string text;
-    for (const char byte : bytes)
-        contract::appendUTF8(text, static_cast<unsigned char>(byte));
-    return text;
-}
-
-std::string bytesFrom(const json& text)
-{
-    std::string bytes;
-    contract::forEachCharacter(text.get_ref<const std::string&>(),
-                               [&](char32_t character) { bytes += static_cast<char>(character); });
-    return bytes;
-}
-
 json jsonFrom(const RecordedDisk& disk)
 {
     return {{"path", charactersFrom(disk.path.native())},
@@ -59,14 +42,19 @@ json jsonFrom(const RecordedDisk& disk)
             {"name", charactersFrom(disk.name)}};
 }
 
+std::string bytesIn(const json& values, const char* key)
+{
+    return bytesFrom(values.at(key).get_ref<const std::string&>());
+}
+
 RecordedDisk diskFrom(const json& values)
 {
-    return {bytesFrom(values.at("path")),
+    return {bytesIn(values, "path"),
             values.at("offset").get<std::uint64_t>(),
             values.at("length").get<std::uint64_t>(),
-            bytesFrom(values.at("uuid")),
-            bytesFrom(values.at("filesystem")),
-            bytesFrom(values.at("name"))};
+            bytesIn(values, "uuid"),
+            bytesIn(values, "filesystem"),
+            bytesIn(values, "name")};
 }
 
 std::optional<RecordFacts> factsFrom(const json& values)
