@@ -25,7 +25,8 @@ constexpr double repairWasTried = 80;
 PermissionsScript::PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
                                      JobContext context)
     : disk_(std::move(disk)),
-      operation_(operation),
+      // What a repair would set is what a verification tells.
+      operation_(context.policy.isPreview ? Operation::Verify : operation),
       context_(std::move(context)),
       fetchesArchives_(context_.options.archiveFetching.isAllowed &&
                        context_.options.archiveFetching.isAllowed())

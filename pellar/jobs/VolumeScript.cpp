@@ -179,6 +179,9 @@ std::optional<Outcome> VolumeScript::objection() const
                               {}});
     if (tool_ == nullptr)
         return withoutTool();
+    if (context_.policy.isPreview && context_.repairWay() == RepairWay::Direct)
+        return failedOutcome(contract::kPLErrorNotTried,
+                             {"there is no directory to keep what it would write", {}, {}});
     if (operation_ == Operation::Repair && !tool_->repairs(context_.repairWay()))
         return failedOutcome(contract::kPLErrorNoRepairHere, tool_->reasonAgainstDirectRepair);
     if (runs_.volume().isForeign)
