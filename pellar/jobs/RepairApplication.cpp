@@ -169,8 +169,7 @@ void RepairApplication::keepWithinLimits(const UndoStore& store, const std::stri
         return;
     }
     store.removeBeyond(trials.limits, std::chrono::system_clock::now());
-    if (!trials.howToUndo.empty())
-        log_.remark(trials.howToUndo);
+    log_.advice(adviceFor(disk_.reference(), trials.howToUndo));
 }
 
 Outcome RepairApplication::preview(const Outcome& tried)

@@ -345,8 +345,8 @@ VolumeScript::State VolumeScript::tryRepair()
                                   {}});
     mark_ = WriteMark::of(disk_.claim().descriptor());
     if (const auto obstacle = beginTrial()) {
-        if (!context_.options.trials.howToRepairDirectly.empty())
-            log_.remark(context_.options.trials.howToRepairDirectly);
+        log_.advice(
+            adviceFor(disk_.reference(), context_.options.trials.howToRepairDirectly));
         return end(failedOutcome(contract::kPLErrorNotTried,
                                  {"the repair cannot be tried first: %1$@", log_.text(*obstacle),
                                   {}}));
@@ -357,8 +357,8 @@ VolumeScript::State VolumeScript::tryRepair()
                                                  context_.policy.appliesUnproven);
     if (isWanted || context_.policy.isPreview)
         return State::Applying;
-    if (outcome_.verdict == Verdict::Damaged && !context_.options.trials.howToApply.empty())
-        log_.remark(context_.options.trials.howToApply);
+    if (outcome_.verdict == Verdict::Damaged)
+        log_.advice(adviceFor(disk_.reference(), context_.options.trials.howToApply));
     return end(notProven(outcome_));
 }
 
