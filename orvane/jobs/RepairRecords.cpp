@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/RepairRecords.h"
 
-#include <algorithm>
+#include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
+
 #include <chrono>
 #include <system_error>
 #include <utility>
@@ -28,6 +30,19 @@ bool mayBeAnother(const RecordedDisk& repaired, const RecordedDisk& disk)
         return !repaired.uuid.empty() && !disk.uuid.empty() && repaired.uuid != disk.uuid;
     std::error_code error;
     return std::filesystem::exists(repaired.path, error) || error;
+}
+
+/// As far as its end tells.
+bool hasWritten(const Run& run)
+{
+    return !run.end || run.end->verdict == contract::kPLVerdictRepaired.text() ||
+           run.end->errorCode == contract::kPLErrorInterrupted;
+}
+
+bool hasNotWritten(const Run& run)
+{
+    return !hasWritten(run) && (run.end->verdict == contract::kPLVerdictFailed.text() ||
+                                run.end->verdict == contract::kPLVerdictStopped.text());
 }
 
 }  // namespace
@@ -61,16 +76,20 @@ const ListedRecord* RepairRecords::newestOf(const DiskFacts& disk) const
     return isUsers && !mayBeAnother(repair.disk, wanted) ? newest : nullptr;
 }
 
-// The record's time is kept in whole seconds, so it may lie before the run's.
+// The record's time is kept in whole seconds, so it may lie before the run's, and other runs may
+// lie in the same second.
 const Run* runOf(const pellar::RecordedRepair& repair, const std::vector<Run>& runs)
 {
-    const auto wrote = [&repair](const Run& run) {
-        return run.action == nameOf(repair.task) &&
-               std::chrono::floor<std::chrono::seconds>(run.started) <= repair.time &&
-               (!run.finished || repair.time <= *run.finished);
-    };
-    const auto found = std::find_if(runs.rbegin(), runs.rend(), wrote);
-    return found == runs.rend() ? nullptr : &*found;
+    const Run* possible = nullptr;
+    for (const Run& run : runs) {
+        const bool isInTime = std::chrono::floor<std::chrono::seconds>(run.started) <= repair.time &&
+                              (!run.finished || repair.time <= *run.finished);
+        if (!isInTime || run.action != nameOf(repair.task) || hasNotWritten(run))
+            continue;
+        if (possible == nullptr || hasWritten(run) || !hasWritten(*possible))
+            possible = &run;
+    }
+    return possible;
 }
 
 }  // namespace orvane
