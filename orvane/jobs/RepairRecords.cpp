@@ -26,6 +26,8 @@ RecordedDisk recordedDisk(const DiskFacts& facts)
 /// taken for the disk that was repaired.
 bool mayBeAnother(const RecordedDisk& repaired, const RecordedDisk& disk)
 {
+    if (repaired.path == disk.path && repaired.offset != disk.offset)
+        return true;
     if (repaired.path == disk.path)
         return !repaired.uuid.empty() && !disk.uuid.empty() && repaired.uuid != disk.uuid;
     std::error_code error;

@@ -34,9 +34,7 @@ using contract::DiskReference;
 using contract::ErrorCode;
 using pellar::Subject;
 
-// Where sectors are kept that the repair of a partition map overwrites, and what archives have
-// said about their packages' files.
-constexpr const char* savedSectors = "/var/lib/orvane/partition-maps";
+// Where it is kept what archives have said about their packages' files.
 constexpr const char* permissionReferences = "/var/lib/orvane/permissions";
 
 bool write(const std::string& line)
@@ -200,7 +198,6 @@ private:
     void work()
     {
         pellar::JobOptions options;
-        options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
         if (user_)
             options.homeDirectory = homeDirectoryOf(*user_);
@@ -232,6 +229,9 @@ private:
         pellar::Trials trials;
         trials.room.directory = systemRepairs;
         trials.user = user_.value_or(::getuid());
+        // The user's own commands do not find what is kept here of an image.
+        if (request_.isOnImage())
+            return trials;
         const auto asked = [this](Advice advice) {
             return [mark = printer_.markOf(advice)](const DiskReference&) { return mark; };
         };

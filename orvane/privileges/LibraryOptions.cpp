@@ -86,7 +86,6 @@ pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& te
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
     if (!paths.state.empty()) {
-        options.savedSectorsDirectory = paths.state / "partition-maps";
         options.permissionReferences = paths.state / "permissions";
     }
     setTrials(options, paths, advice);

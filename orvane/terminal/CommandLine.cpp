@@ -75,7 +75,8 @@ void addRepairOptions(CLI::App& command, Request& request)
         command.add_flag("--preview", policy.isPreview, "Try the repair, and write nothing");
     command.add_option("--keep", policy.keptImage, "Write the repaired volume to this new file")
         ->type_name("FILE")
-        ->needs(preview);
+        ->needs(preview)
+        ->excludes("--partition-map");
     CLI::Option* const direct = command.add_flag(
         "--direct", policy.isDirect, "Let the tool write to the disk itself; cannot be undone");
     CLI::Option* const unproven =
@@ -84,11 +85,9 @@ void addRepairOptions(CLI::App& command, Request& request)
     CLI::Option* const noUndo = command.add_flag_callback(
         "--no-undo", [&policy] { policy.keepsUndo = false; },
         "Do not keep what the repair overwrites");
-    CLI::Option* const map = command.get_option("--partition-map");
-    for (CLI::Option* const other : {direct, unproven, noUndo, map})
+    for (CLI::Option* const other : {direct, unproven, noUndo})
         preview->excludes(other);
     direct->excludes(unproven);
-    unproven->excludes(map);
 }
 
 /// What the parser's rules cannot say; none when there is nothing to object to.

@@ -225,12 +225,6 @@ void JobLog::remark(std::string_view text, const contract::Array& parameters)
     add(Level::Main, std::nullopt, text, parameters);
 }
 
-void JobLog::advice(std::string_view text)
-{
-    if (!text.empty())
-        remark(text);
-}
-
 void JobLog::failure(std::string_view text)
 {
     add(Level::Main, contract::kFsckFail, text);

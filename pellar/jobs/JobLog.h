@@ -119,8 +119,6 @@ public:
     /// Always shown.
     void remark(std::string_view text, const contract::Array& parameters = {});
     void remark(const Sentence& sentence) { remark(text(sentence)); }
-    /// What the user can do next; nothing when it is empty.
-    void advice(std::string_view text);
     /// A failure, or why the check was ended.
     void failure(std::string_view text);
     void failure(const Sentence& sentence) { failure(text(sentence)); }

@@ -3,7 +3,6 @@
 
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/probe/DiskProbe.h"
 #include "pellar/tools/Judging.h"
 
 #include <fcntl.h>
@@ -12,8 +11,6 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
-#include <numeric>
-#include <system_error>
 #include <utility>
 
 namespace pellar {
@@ -33,13 +30,6 @@ public:
 private:
     Overlay& overlay_;
 };
-
-std::uint64_t lengthOf(const std::vector<ByteRange>& ranges)
-{
-    return std::accumulate(
-        ranges.begin(), ranges.end(), std::uint64_t{0},
-        [](std::uint64_t sum, const ByteRange& range) { return sum + range.length; });
-}
 
 bool isZero(ByteView bytes)
 {
@@ -67,37 +57,12 @@ int copyInto(int file, Overlay& overlay, const std::function<bool()>& isStopped)
                : errno;
 }
 
-// The shares of the progress, in per cent.
-constexpr double keptAt = 85;
-
 }  // namespace
-
-RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
-                          ByteRange region)
-{
-    std::error_code error;
-    const auto path = std::filesystem::canonical(reference.path, error);
-    return {error ? reference.path : path,
-            region.offset,
-            region.length,
-            readSuperblock(descriptor, region).uuid,
-            reference.filesystem,
-            reference.name};
-}
 
 RepairApplication::RepairApplication(JobContext& context, const JobDisk& disk,
                                      const TrialDisk& trial, const WriteMark& mark)
     : context_(context), disk_(disk), trial_(trial), mark_(mark)
 {
-}
-
-UndoWork RepairApplication::work() const
-{
-    return {[this] { return context_.stop.isPressed(); },
-            [this](std::uint64_t done, std::uint64_t total) {
-                log_.progress(100.0 * static_cast<double>(done) /
-                              static_cast<double>(std::max<std::uint64_t>(total, 1)));
-            }};
 }
 
 Outcome RepairApplication::apply(Outcome tried)
@@ -111,65 +76,18 @@ Outcome RepairApplication::apply(Outcome tried)
         return failedOutcome(
             contract::kPLErrorDiskChanged,
             {"another program wrote to it while the repair was tried; nothing was written", {}, {}});
-    return write(*ranges, std::move(tried));
-}
-
-Outcome RepairApplication::write(const std::vector<ByteRange>& ranges, Outcome tried)
-{
-    const auto store = UndoStore::open(recordsIn(context_.options.trials));
-    if (!store)
-        return notWritten(store.error());
-    log_.meter().setRange(keptAt, 100);
-    log_.step(Operation::Repair, {"Keeping what the repair overwrites (%1$@ bytes in %2$@ places)",
-                                  std::to_string(lengthOf(ranges)), std::to_string(ranges.size())});
-    auto record = save(*store, ranges);
-    if (!record)
-        return notWritten(record.error());
-    log_.step(Operation::Repair, {"Writing the proven repair to “%1$@”", log_.diskName(), {}});
-    log_.flush();
     const DiskClaim& claim = disk_.claim();
-    FileRegion region(claim.descriptor(), claim.offset(), claim.availableBytes());
-    const auto applied = record->apply(region, work());
-    if (!applied && applied.error().left == UndoFailure::Left::Unchanged)
-        return notWritten(applied.error().sentence);
-    if (!applied)
-        return failedOutcome(contract::kPLErrorInterrupted, applied.error().sentence);
-    keepWithinLimits(*store, record->id());
-    return tried;
-}
-
-Result<UndoRecord, Sentence> RepairApplication::save(const UndoStore& store,
-                                                     const std::vector<ByteRange>& ranges)
-{
-    const DiskClaim& claim = disk_.claim();
-    FileRegion before(claim.descriptor(), claim.offset(), claim.availableBytes());
+    const ByteRange place{claim.offset(), claim.availableBytes()};
+    FileRegion region(claim.descriptor(), place.offset, place.length);
     TriedRegion after(trial_.overlay());
-    const RecordedRepair repair{recordedDisk(disk_.reference(), claim.descriptor(),
-                                             {claim.offset(), claim.availableBytes()}),
-                                {Subject::Filesystem, Operation::Repair},
-                                context_.options.trials.user,
-                                std::chrono::system_clock::now()};
-    return store.save(repair, ranges, before, after, work());
-}
-
-/// The user's stop comes before all other reasons.
-Outcome RepairApplication::notWritten(const Sentence& reason) const
-{
-    if (context_.stop.isPressed())
-        return outcomeOfVerification(stopped(0));
-    return {Verdict::Damaged, contract::kPLErrorNotRepaired, 0, reason, {}};
-}
-
-void RepairApplication::keepWithinLimits(const UndoStore& store, const std::string& id)
-{
-    const Trials& trials = context_.options.trials;
-    if (!context_.policy.keepsUndo) {
-        if (const auto removed = store.remove(id); !removed)
-            log_.remark(removed.error());
-        return;
-    }
-    store.removeBeyond(trials.limits, std::chrono::system_clock::now());
-    log_.advice(adviceFor(disk_.reference(), trials.howToUndo));
+    RecordedWriting writing(context_,
+                            {recordedDisk(disk_.reference(), claim.descriptor(), place),
+                             {Subject::Filesystem, Operation::Repair},
+                             context_.options.trials.user,
+                             std::chrono::system_clock::now()},
+                            contract::kPLErrorNotRepaired);
+    const auto failure = writing.write(*ranges, region, after);
+    return failure ? *failure : std::move(tried);
 }
 
 Outcome RepairApplication::preview(const Outcome& tried)
@@ -215,7 +133,7 @@ std::optional<Sentence> RepairApplication::writeImage()
     const std::string shown = contract::printable(path.native());
     log_.step(Operation::Repair, {"Writing the repaired volume to %1$@", shown, {}});
     const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
-    const int error = file ? copyInto(file.get(), trial_.overlay(), work().isStopped) : errno;
+    const int error = file ? copyInto(file.get(), trial_.overlay(), workOf(context_).isStopped) : errno;
     if (error == 0) {
         log_.remark(Sentence{"The repaired volume is in %1$@.", shown, {}});
         return std::nullopt;

@@ -4,17 +4,13 @@
 #include "pellar/disks/WriteMark.h"
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobDisk.h"
+#include "pellar/jobs/RecordedWriting.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/overlay/TrialDisk.h"
-#include "pellar/undo/UndoStore.h"
 
 #include <vector>
 
 namespace pellar {
-
-/// Which disk this is, for a record of what a repair overwrites there.
-[[nodiscard]] RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
-                                        ByteRange region);
 
 /// What a repair has come to where it was tried: kept, and brought to the disk; or only shown. The
 /// job's thread; the references outlive it.
@@ -31,15 +27,8 @@ public:
     [[nodiscard]] Outcome preview(const Outcome& tried);
 
 private:
-    [[nodiscard]] Outcome write(const std::vector<ByteRange>& ranges, Outcome tried);
-    [[nodiscard]] Result<UndoRecord, Sentence> save(const UndoStore& store,
-                                                    const std::vector<ByteRange>& ranges);
-    [[nodiscard]] Outcome notWritten(const Sentence& reason) const;
-    void keepWithinLimits(const UndoStore& store, const std::string& id);
     void tellLoss(const Outcome& tried);
     [[nodiscard]] std::optional<Sentence> writeImage();
-    UndoWork work() const;
-
     JobContext& context_;
     JobLog& log_ = context_.log;
     const JobDisk& disk_;

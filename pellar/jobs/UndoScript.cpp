@@ -3,10 +3,9 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/jobs/RepairApplication.h"
+#include "pellar/jobs/RecordedWriting.h"
 #include "pellar/partitions/MapDisk.h"
 
-#include <algorithm>
 #include <utility>
 
 namespace pellar {
@@ -99,11 +98,7 @@ UndoScript::Failure UndoScript::work(UndoRecord& record, Region& region)
                std::to_string(record.facts().changedBytes),
                std::to_string(record.facts().rangeCount)});
     log_.flush();
-    const UndoWork work{[this] { return context_.stop.isPressed(); },
-                        [this](std::uint64_t done, std::uint64_t total) {
-                            log_.progress(100.0 * static_cast<double>(done) /
-                                          static_cast<double>(std::max<std::uint64_t>(total, 1)));
-                        }};
+    const UndoWork work = workOf(context_);
     const auto done = isUndo() ? record.undo(region, work) : record.finish(region, work);
     if (done)
         return std::nullopt;

@@ -70,11 +70,29 @@ VolumeFacts VolumeRuns::facts() const
     return tool_->examine(claim.descriptor(), claim.offset(), claim.availableBytes());
 }
 
-Result<DiskForTool, int> VolumeRuns::prepare(DiskForTool::Form form, Access access) const
+Result<DiskForTool, int> VolumeRuns::prepare(DiskForTool::Form form, Access access)
 {
-    return trial_ != nullptr
-               ? DiskForTool::prepare(trial_->descriptor(), trial_->bytes(), form, access)
-               : DiskForTool::prepare(disk_.claim(), form, access);
+    if (trial_ != nullptr)
+        return DiskForTool::prepare(trial_->descriptor(), trial_->bytes(), form, access);
+    auto disk = DiskForTool::prepare(disk_.claim(), form, access);
+    const bool isRefused = !disk && (disk.error() == EPERM || disk.error() == EACCES);
+    const bool isView = form == DiskForTool::Form::VolumeAlone && access == Access::ReadOnly &&
+                        context_.repairWay() == RepairWay::TriedFirst;
+    return isRefused && isView ? prepareView() : std::move(disk);
+}
+
+/// What a tool reads of a part of an image needs no device, which takes root: a trial shows it that
+/// part.
+Result<DiskForTool, int> VolumeRuns::prepareView()
+{
+    const DiskClaim& claim = disk_.claim();
+    auto view = TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
+                              context_.options.trials.room);
+    if (!view)
+        return EPERM;
+    view_.emplace(*std::move(view));
+    return DiskForTool::prepare(view_->descriptor(), view_->bytes(),
+                                DiskForTool::Form::VolumeAlone, Access::ReadOnly);
 }
 
 RunEvidence VolumeRuns::run(Access access, ToolRun::Problems problems)

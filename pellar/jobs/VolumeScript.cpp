@@ -39,13 +39,22 @@ bool isProven(const Outcome& outcome)
     return outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired;
 }
 
-/// How a job ends whose trial has left damage.
-Outcome notProven(Outcome outcome)
+/// How a job ends whose trial did not end in a sound volume.
+Outcome notProven(Outcome outcome, bool foundDamage)
 {
-    if (outcome.verdict != Verdict::Damaged)
+    const bool isUnknown = outcome.verdict == Verdict::Inconclusive && foundDamage;
+    if (outcome.verdict != Verdict::Damaged && !isUnknown)
         return outcome;
+    if (isUnknown)
+        outcome.reason = {"a repair was tried, and it cannot be told whether it makes it sound; "
+                          "nothing was written",
+                          {},
+                          {}};
+    else
+        outcome.reason = {
+            "a repair was tried, and would leave damage; nothing was written", {}, {}};
+    outcome.verdict = Verdict::Damaged;
     outcome.code = contract::kPLErrorNotProven;
-    outcome.reason = {"a repair was tried, and would leave damage; nothing was written", {}, {}};
     return outcome;
 }
 
@@ -345,21 +354,21 @@ VolumeScript::State VolumeScript::tryRepair()
                                   {}});
     mark_ = WriteMark::of(disk_.claim().descriptor());
     if (const auto obstacle = beginTrial()) {
-        log_.advice(
-            adviceFor(disk_.reference(), context_.options.trials.howToRepairDirectly));
+        context_.advise(context_.options.trials.howToRepairDirectly);
         return end(failedOutcome(contract::kPLErrorNotTried,
                                  {"the repair cannot be tried first: %1$@", log_.text(*obstacle),
                                   {}}));
     }
     outcome_ = RepairPasses(runs_, context_, look_, {lookEnds, trialEnds}).run();
     runs_.workOn(nullptr);
-    const bool isWanted = isProven(outcome_) || (outcome_.verdict == Verdict::Damaged &&
-                                                 context_.policy.appliesUnproven);
-    if (isWanted || context_.policy.isPreview)
+    if (context_.policy.isPreview || isProven(outcome_))
         return State::Applying;
-    if (outcome_.verdict == Verdict::Damaged)
-        log_.advice(adviceFor(disk_.reference(), context_.options.trials.howToApply));
-    return end(notProven(outcome_));
+    const Outcome end = notProven(outcome_, look_.foundDamage);
+    if (end.code == contract::kPLErrorNotProven && context_.policy.appliesUnproven)
+        return State::Applying;
+    if (end.code == contract::kPLErrorNotProven)
+        context_.advise(context_.options.trials.howToApply);
+    return this->end(end);
 }
 
 VolumeScript::State VolumeScript::apply()

@@ -72,6 +72,36 @@ TEST(Job, VerifyAnswersWhatIsTrue)
     }
 }
 
+TEST(Job, ARepairIsEndedWhereTheDiskCannotBeRead)
+{
+    FakeToolFixture fixture(
+        "say Free blocks count wrong (1, counted=2).  Fix? no\n"
+        "say-in-repair Error reading block 5 (Input/output error).  Ignore error? yes\n"
+        "await-in-repair never\nexit 4");
+    ASSERT_EQ(fixture.library.repair(fixture.disk), 0);
+    EXPECT_EQ(fixture.heard.error, contract::kPLErrorUnreadable) << fixture.heard.message;
+    EXPECT_EQ(fixture.heard.verdict, "failed");
+    expectOneEnd(fixture);
+}
+
+// Nothing here replays that journal, so nothing is written over it.
+TEST(Job, AHibernatedVolumeIsLeftToItsOwnSystem)
+{
+    const test::TestDirectory directory;
+    const auto image = directory.makeVolume("disk", "ntfs");
+    if (image.empty())
+        GTEST_SKIP() << "mkntfs is not installed (package ntfs-3g)";
+    const std::string script = "say The NTFS partition is hibernated.\nexit 0";
+    static_cast<void>(directory.fakeTools(script, "ntfsfix"));
+    test::JobFixture library(
+        test::with(&JobOptions::toolPath, directory.fakeTools(script, "ntfsresize")));
+    ASSERT_EQ(library.repair(test::reference(image, "ntfs")), 0);
+    EXPECT_EQ(library.listener.verdict, "inconclusive") << library.listener.message;
+    EXPECT_TRUE(std::ranges::none_of(library.traces, [](const std::string& line) {
+        return line.starts_with("run: ") && test::contains(line, "ntfsfix");
+    }));
+}
+
 TEST(Job, DestroyingTheToolEndsEverything)
 {
     for (const std::string_view script : {"wait", "flood-lines", "ignore 2\nignore 15\nwait"}) {

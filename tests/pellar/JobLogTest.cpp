@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "contract/foundation/Array.h"
 #include "pellar/jobs/JobLog.h"
+#include "pellar/jobs/ToolRun.h"
 #include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
@@ -148,6 +149,12 @@ TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
     ProgressMeter other;
     EXPECT_EQ(other.report(20, now), 20.05) << "20 itself means something else";
     EXPECT_EQ(other.report(30, now + 50ms), std::nullopt) << "too soon";
+}
+
+TEST(ToolRun, ReplacesOurNameForTheDisk)
+{
+    EXPECT_EQ(withDiskName("/proc/self/fd/33 /proc/self/fd/3", "X"), "/proc/self/fd/33 X");
+    EXPECT_EQ(withDiskName("open /proc/self/fd/3?offset=1048576", "X"), "open X");
 }
 
 }  // namespace

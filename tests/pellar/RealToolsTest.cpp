@@ -94,12 +94,51 @@ TEST_P(RealTools, SayWhatIsTrue)
     ASSERT_EQ(library.repair(disk), 0);
     EXPECT_EQ(library.listener.verdict, state.repaired)
         << state.because << ": " << library.listener.message;
-    EXPECT_TRUE(state.verified != "sound" || last_write_time(image) == before)
-        << "a repair wrote to a sound volume";
+    EXPECT_TRUE(state.verified == "damaged" || last_write_time(image) == before)
+        << "a repair wrote to what is not known to be damaged";
     ASSERT_EQ(library.verify(disk), 0);
     EXPECT_EQ(library.listener.verdict, state.afterwards) << library.listener.message;
     EXPECT_EQ(library.listener.finished, 3);
     EXPECT_FALSE(library.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
+}
+
+/// A library that tries repairs before it applies them.
+JobOptions trying(const test::TestDirectory& directory, RepairPolicy& policy)
+{
+    JobOptions options = test::tryingIn(directory.path("repairs"));
+    options.repairPolicy = [&policy] {
+        return policy;
+    };
+    return options;
+}
+
+TEST_P(RealTools, AreTriedBeforeAnythingIsWrittenAndUndone)
+{
+    constexpr Task undo{Subject::Filesystem, Operation::Undo};
+    const VolumeState& state = GetParam();
+    const test::TestDirectory directory;
+    const auto image = make(directory, state);
+    const auto disk = test::reference(image, std::string(state.filesystem));
+    const std::string before = contentsOf(image);
+    RepairPolicy policy;
+    test::JobFixture library(trying(directory, policy));
+    policy.isPreview = true;
+    policy.keptImage = directory.path("kept");
+    ASSERT_EQ(library.repair(disk), 0);
+    EXPECT_TRUE(contentsOf(image) == before) << "a preview wrote";
+    policy = {};
+    ASSERT_EQ(library.repair(disk), 0);
+    const bool isRepaired = library.listener.verdict == "repaired";
+    EXPECT_EQ(isRepaired, contentsOf(image) != before) << library.listener.message;
+    EXPECT_TRUE(!isRepaired || contentsOf(directory.path("kept")) == contentsOf(image))
+        << "the preview shows another repair";
+    EXPECT_TRUE(isRepaired || state.repaired != "repaired") << library.listener.message;
+    ASSERT_EQ(library.verify(disk), 0);
+    EXPECT_TRUE(!isRepaired || library.listener.verdict == "sound") << library.listener.message;
+    ASSERT_EQ(library.run(undo, disk), 0);
+    EXPECT_EQ(library.listener.verdict, isRepaired ? "undone" : "failed")
+        << library.listener.message;
+    EXPECT_TRUE(contentsOf(image) == before) << "it is not as it was";
 }
 
 INSTANTIATE_TEST_SUITE_P(EachState, RealTools, ::testing::ValuesIn(orvane::test::volumeStates()),
@@ -268,6 +307,10 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         ASSERT_EQ(library.verify(test::reference(image)), 0);
         EXPECT_EQ(library.listener.verdict, "sound") << "before";
         EXPECT_TRUE(library.listener.hasPlainLine("The volume “Disk” appears to be OK.\n"));
+        const std::string sound = contentsOf(image);
+        ASSERT_EQ(library.repair(test::reference(image)), 0);
+        EXPECT_EQ(library.listener.verdict, "sound");
+        EXPECT_TRUE(contentsOf(image) == sound) << "a repair wrote to a sound volume";
 
         for (const std::string& command : damage.commands)
             directory.damage(image, command);
@@ -294,7 +337,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         }
         ASSERT_EQ(library.verify(disk), 0);
         EXPECT_EQ(library.listener.verdict, "sound") << "after";
-        EXPECT_EQ(library.listener.finished, 4);
+        EXPECT_EQ(library.listener.finished, 5);
     }
 }
 
