@@ -244,7 +244,7 @@ private:
     void refuse(const JobFailure& failure)
     {
         pellar::EventQueue events(loop_, {&printer_, nullptr, {}, [] {
-                                       }});
+                                          }});
         pellar::JobLog log(request_.disk, texts_, events);
         log.started();
         reportFailure(failure, request_, texts_, log);

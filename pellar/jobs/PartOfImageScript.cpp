@@ -49,11 +49,8 @@ bool PartOfImageScript::canBeTried() const
 
 std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()
 {
-    PrivilegedJob job{{Subject::Filesystem, request_.operation},
-                      *request_.disk,
-                      nullptr,
-                      false,
-                      context_.policy};
+    PrivilegedJob job{
+        {Subject::Filesystem, request_.operation}, *request_.disk, nullptr, false, context_.policy};
     job.image = std::make_shared<const DiskClaim>(*std::exchange(request_.claim, std::nullopt));
     return context_.options.privileged(job, context_.stop, context_.events);
 }

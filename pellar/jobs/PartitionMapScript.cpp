@@ -79,8 +79,7 @@ public:
         for (const SectorWrite& write : plan_.writes) {
             const std::uint64_t start = write.first * sectorBytes_;
             const std::uint64_t from = std::max(place, start);
-            const std::uint64_t end =
-                std::min(place + bytes.size(), start + write.after.size());
+            const std::uint64_t end = std::min(place + bytes.size(), start + write.after.size());
             if (from < end)
                 std::ranges::copy(ByteView(write.after).subspan(from - start, end - from),
                                   bytes.begin() + static_cast<std::ptrdiff_t>(from - place));
@@ -120,7 +119,8 @@ Result<MapClaim, contract::ErrorCode> PartitionMapScript::claim() const
     constexpr std::chrono::milliseconds pause{50};
     constexpr int mostTries = 40;
     for (int tries = 1;; ++tries) {
-        auto taken = MapClaim::take(*disk_, accessFor(operation_, context_.policy), context_.options.systemPaths);
+        auto taken = MapClaim::take(*disk_, accessFor(operation_, context_.policy),
+                                    context_.options.systemPaths);
         const bool isBusy = !taken && taken.error() == contract::kPLErrorDiskInUse;
         if (!isBusy || tries == mostTries || context_.stop.isPressed())
             return taken;
@@ -195,13 +195,13 @@ Outcome PartitionMapScript::write(const MapClaim& claim, const RepairPlan& plan)
 {
     FileRegion disk(claim.descriptor(), claim.offset(), claim.length());
     PlannedRegion after(disk, plan, claim.sectors().sectorBytes());
-    RecordedWriting writing(context_,
-                            {recordedDisk(*disk_, claim.descriptor(),
-                                          {claim.offset(), claim.length()}),
-                             {Subject::PartitionMap, Operation::Repair},
-                             context_.options.trials.user,
-                             std::chrono::system_clock::now()},
-                            contract::kPLErrorMapNotRepaired);
+    RecordedWriting writing(
+        context_,
+        {recordedDisk(*disk_, claim.descriptor(), {claim.offset(), claim.length()}),
+         {Subject::PartitionMap, Operation::Repair},
+         context_.options.trials.user,
+         std::chrono::system_clock::now()},
+        contract::kPLErrorMapNotRepaired);
     if (auto failure = writing.write(after.ranges(), disk, after))
         return *std::move(failure);
     step({"Verifying the repaired partition map of “%1$@”", log_.diskName(), {}}, 95);

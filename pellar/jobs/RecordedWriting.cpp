@@ -22,12 +22,8 @@ RecordedDisk recordedDisk(const contract::DiskReference& reference, int descript
 {
     std::error_code error;
     const auto path = std::filesystem::canonical(reference.path, error);
-    return {error ? reference.path : path,
-            region.offset,
-            region.length,
-            readSuperblock(descriptor, region).uuid,
-            reference.filesystem,
-            reference.name};
+    return {error ? reference.path : path,           region.offset,        region.length,
+            readSuperblock(descriptor, region).uuid, reference.filesystem, reference.name};
 }
 
 std::uint64_t lengthOf(const std::vector<ByteRange>& ranges)
@@ -61,15 +57,22 @@ std::optional<Outcome> RecordedWriting::write(const std::vector<ByteRange>& rang
         return notWritten(record.error());
     log.step(Operation::Repair, {"Writing the proven repair to “%1$@”", log.diskName(), {}});
     log.flush();
-    const auto applied = record->apply(disk, workOf(context_));
-    if (!applied && applied.error().left == UndoFailure::Left::Unchanged)
-        return notWritten(applied.error().sentence);
-    if (!applied)
-        return failedOutcome(contract::kPLErrorInterrupted, applied.error().sentence);
     const std::string id = record->id();
-    { const UndoRecord unlocked = *std::move(record); }
+    if (auto failure = apply(*std::move(record), disk))
+        return failure;
     keepWithinLimits(*store, id);
     return std::nullopt;
+}
+
+/// The record is not in use any more when this answers.
+std::optional<Outcome> RecordedWriting::apply(UndoRecord record, Region& disk) const
+{
+    const auto applied = record.apply(disk, workOf(context_));
+    if (applied)
+        return std::nullopt;
+    return applied.error().left == UndoFailure::Left::Unchanged
+               ? notWritten(applied.error().sentence)
+               : failedOutcome(contract::kPLErrorInterrupted, applied.error().sentence);
 }
 
 /// The user's stop comes before all other reasons.

@@ -36,6 +36,7 @@ public:
                                                RegionReader& after);
 
 private:
+    [[nodiscard]] std::optional<Outcome> apply(UndoRecord record, Region& disk) const;
     [[nodiscard]] Outcome notWritten(const Sentence& reason) const;
     void keepWithinLimits(const UndoStore& store, const std::string& id);
 

@@ -91,8 +91,8 @@ Result<DiskForTool, int> VolumeRuns::prepareView()
     if (!view)
         return EPERM;
     view_.emplace(*std::move(view));
-    return DiskForTool::prepare(view_->descriptor(), view_->bytes(),
-                                DiskForTool::Form::VolumeAlone, Access::ReadOnly);
+    return DiskForTool::prepare(view_->descriptor(), view_->bytes(), DiskForTool::Form::VolumeAlone,
+                                Access::ReadOnly);
 }
 
 RunEvidence VolumeRuns::run(Access access, ToolRun::Problems problems)
@@ -156,12 +156,11 @@ Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
     context_.log.step(Operation::Verify, {"Reading the log that waits to be replayed", {}, {}});
     // On the disk: its log is no other, and btrfs takes no file without a name (realpath(3)).
     const TrialDisk* const trial = std::exchange(trial_, nullptr);
-    const auto first =
-        runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
-    const auto rest = first.findings.logParts.empty()
-                          ? first
-                          : runOn(Access::ReadOnly, ToolRun::Problems::Shown,
-                                  first.findings.logParts);
+    const auto first = runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
+    const auto rest =
+        first.findings.logParts.empty()
+            ? first
+            : runOn(Access::ReadOnly, ToolRun::Problems::Shown, first.findings.logParts);
     trial_ = trial;
     for (const RunEvidence& part : {first, rest})
         if (part.result.ending != Ending(Exited{0}))
@@ -206,8 +205,7 @@ std::optional<std::uint64_t> VolumeRuns::unreadableByte(const ReadFault& fault) 
     return firstUnreadable(pieces);
 }
 
-std::optional<std::uint64_t> VolumeRuns::firstUnreadable(
-    const std::vector<ByteRange>& pieces) const
+std::optional<std::uint64_t> VolumeRuns::firstUnreadable(const std::vector<ByteRange>& pieces) const
 {
     const auto deadline = Clock::now() + std::chrono::seconds(30);
     return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces, [&] {

@@ -45,8 +45,7 @@ std::uint64_t roomBeside(int file)
 void addRange(std::vector<ByteRange>& ranges, ByteRange range)
 {
     if (!ranges.empty() && ranges.back().end() >= range.offset)
-        ranges.back().length =
-            std::max(ranges.back().end(), range.end()) - ranges.back().offset;
+        ranges.back().length = std::max(ranges.back().end(), range.end()) - ranges.back().offset;
     else
         ranges.push_back(range);
 }
@@ -73,8 +72,7 @@ Result<std::unique_ptr<Overlay>, int> Overlay::over(int disk, ByteRange region,
     FileDescriptor file = namelessFileIn(room.directory);
     if (!file)
         return errno;
-    return std::unique_ptr<Overlay>(
-        new Overlay(disk, region, std::move(file), room.mostBytes));
+    return std::unique_ptr<Overlay>(new Overlay(disk, region, std::move(file), room.mostBytes));
 }
 
 Overlay::Piece Overlay::firstPieceOf(ByteRange range) const

@@ -26,8 +26,8 @@ namespace pellar {
 [[nodiscard]] FileSectors sectorsOf(int descriptor, std::uint64_t offset, std::uint64_t length);
 
 /// The map of an open disk, with what fills the whole of it.
-[[nodiscard]] PartitionMap readMapOf(int descriptor, const Sectors& sectors,
-                                     std::uint64_t offset, std::uint64_t length);
+[[nodiscard]] PartitionMap readMapOf(int descriptor, const Sectors& sectors, std::uint64_t offset,
+                                     std::uint64_t length);
 
 /// Opens the disk for a look and reads its map; a map of no kind when it cannot be opened. Reads a
 /// few sectors.

@@ -191,9 +191,10 @@ std::optional<Bytes> PlannedSectors::read(std::uint64_t first, std::uint64_t num
         const std::uint64_t from = std::max(first, write.first);
         const std::uint64_t end = std::min(first + number, writeEnd);
         if (from < end)
-            std::copy_n(write.after.begin() + static_cast<std::ptrdiff_t>((from - write.first) * size),
-                        (end - from) * size,
-                        bytes->begin() + static_cast<std::ptrdiff_t>((from - first) * size));
+            std::copy_n(
+                write.after.begin() + static_cast<std::ptrdiff_t>((from - write.first) * size),
+                (end - from) * size,
+                bytes->begin() + static_cast<std::ptrdiff_t>((from - first) * size));
     }
     return bytes;
 }

@@ -65,10 +65,7 @@ void expectReport(const fs::path& image, const DamageCase& c)
 }
 
 struct MapBench : test::JobFixture {
-    explicit MapBench(const fs::path& saved)
-        : JobFixture(test::tryingIn(saved))
-    {
-    }
+    explicit MapBench(const fs::path& saved) : JobFixture(test::tryingIn(saved)) {}
 
     void verifyMap(const fs::path& disk)
     {
