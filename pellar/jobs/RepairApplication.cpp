@@ -13,7 +13,7 @@ namespace {
 /// The disk as it was left by the trial.
 class TriedRegion final : public RegionReader {
 public:
-    explicit TriedRegion(Overlay& overlay) : overlay_(overlay) {}
+    explicit TriedRegion(WorkingCopy& overlay) : overlay_(overlay) {}
 
     std::uint64_t length() const override { return overlay_.bytes(); }
     int read(std::uint64_t place, std::span<std::uint8_t> bytes) override
@@ -22,7 +22,7 @@ public:
     }
 
 private:
-    Overlay& overlay_;
+    WorkingCopy& overlay_;
 };
 
 }  // namespace
@@ -30,9 +30,9 @@ private:
 Outcome applyTrial(const TrialDisk& trial, const WriteMark& mark, const JobDisk& disk,
                    JobContext& context, Outcome tried)
 {
-    const auto ranges = trial.overlay().differences();
+    const auto ranges = trial.contents().differences();
     if (!ranges)
-        return outcomeOfVerification(unreadable(trial.overlay().firstUnreadable()));
+        return outcomeOfVerification(unreadable(trial.contents().firstUnreadable()));
     if (ranges->empty())
         return tried.verdict == Verdict::Repaired ? outcomeOfVerification(sound(0)) : tried;
     if (!(WriteMark::of(disk.claim().descriptor()) == mark))
@@ -44,7 +44,7 @@ Outcome applyTrial(const TrialDisk& trial, const WriteMark& mark, const JobDisk&
     const DiskClaim& claim = disk.claim();
     const ByteRange place{claim.offset(), claim.availableBytes()};
     FileRegion region(claim.descriptor(), place.offset, place.length);
-    TriedRegion after(trial.overlay());
+    TriedRegion after(trial.contents());
     RecordedWriting writing(context,
                             {recordedDisk(disk.reference(), claim.descriptor(), place),
                              {Subject::Filesystem, Operation::Repair},

@@ -25,7 +25,7 @@ bool isZero(ByteView bytes)
 }
 
 /// 0 or an errno. Where there is nothing but zeros the file has holes.
-int copyInto(int file, Overlay& overlay, const std::function<bool()>& isStopped)
+int copyInto(int file, WorkingCopy& overlay, const std::function<bool()>& isStopped)
 {
     Bytes buffer(1U << 20U);
     for (std::uint64_t at = 0; at < overlay.bytes(); at += buffer.size()) {
@@ -73,9 +73,9 @@ Outcome RepairPreview::tell(const Outcome& tried, const FileCounts& counts)
     const bool isProven = tried.verdict == Verdict::Sound || tried.verdict == Verdict::Repaired;
     if (!isProven && tried.verdict != Verdict::Damaged)
         return tried;
-    const auto ranges = trial_.overlay().differences();
+    const auto ranges = trial_.contents().differences();
     if (!ranges)
-        return outcomeOfVerification(unreadable(trial_.overlay().firstUnreadable()));
+        return outcomeOfVerification(unreadable(trial_.contents().firstUnreadable()));
     tellChanges(*ranges, tried, counts);
     if (const auto failure = writeImage())
         return failedOutcome(contract::kPLErrorCannotOpen, *failure);
@@ -140,7 +140,7 @@ std::optional<Sentence> RepairPreview::writeImage()
     log_.step(Operation::Repair, {"Writing the repaired volume to %1$@", shown, {}});
     const FileDescriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
     const int error =
-        file ? copyInto(file.get(), trial_.overlay(), workOf(context_).isStopped) : errno;
+        file ? copyInto(file.get(), trial_.contents(), workOf(context_).isStopped) : errno;
     if (error == 0) {
         log_.remark(Sentence{"The repaired volume is in %1$@.", shown, {}});
         return std::nullopt;

@@ -175,9 +175,9 @@ Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
 Judgement VolumeRuns::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
 {
     if (trial_ != nullptr) {
-        if (const auto byte = trial_->overlay().firstUnreadable())
+        if (const auto byte = trial_->contents().firstUnreadable())
             return unreadable(byte);
-        return trial_->overlay().isOutOfRoom() ? outOfRoom() : judgement;
+        return trial_->contents().isOutOfRoom() ? outOfRoom() : judgement;
     }
     const bool isAnswer = judgement.code == contract::kPLErrorUnreadable ||
                           judgement.code == contract::kPLErrorDamaged ||

@@ -385,8 +385,9 @@ VolumeScript::State VolumeScript::apply()
 std::optional<Sentence> VolumeScript::beginTrial()
 {
     const DiskClaim& claim = disk_.claim();
-    auto trial = TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
-                               context_.options.trials.room);
+    auto trial =
+        TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
+                      context_.options.trials.room, [this] { return context_.stop.isPressed(); });
     if (!trial)
         return trial.error();
     trial_.emplace(*std::move(trial));
