@@ -3,6 +3,7 @@
 
 #include "orvane/jobs/RepairRecords.h"
 #include "pellar/undo/UndoStore.h"
+#include "tests/support/LoopDevice.h"
 #include "tests/terminal/ProgramTest.h"
 
 #include <fcntl.h>
@@ -179,6 +180,20 @@ TEST_F(UndoTest, AnInterruptedRepairIsPointedOutAndFinishedOrUndone)
                     (command == "undo" ? before : contentsOf(path("repaired"))));
         EXPECT_FALSE(isInterrupted("a"));
     }
+}
+
+TEST_F(UndoTest, ADeviceIsTreatedAsAnImageIs)
+{
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const auto image = makeDamagedVolume("a");
+    const std::string before = contentsOf(image);
+    const LoopDevice device(image.native());
+    EXPECT_EQ(run({"repair", "--preview", device.name()}).status, 4);
+    EXPECT_EQ(run({"repair", device.name()}).status, 1);
+    EXPECT_EQ(undoable(device.name()), std::vector<std::string>{"repaired"});
+    EXPECT_EQ(run({"undo", device.name()}).status, 0);
+    EXPECT_TRUE(contentsOf(device.name()) == before);
 }
 
 TEST_F(UndoTest, OfSeveralVolumesTheOneThatIsNamedIsUndone)
