@@ -17,18 +17,27 @@ struct JobContext {
     const Texts& texts;
     StopSwitch& stop;
     EventQueue& events;
+    contract::DiskReference disk;
     JobLog log;
     RepairPolicy policy;
 
-    JobContext(const contract::DiskReference& disk, const JobOptions& options_, const Texts& texts_,
+    JobContext(const contract::DiskReference& disk_, const JobOptions& options_, const Texts& texts_,
                StopSwitch& stop_, EventQueue& events_)
         : options(options_),
           texts(texts_),
           stop(stop_),
           events(events_),
+          disk(disk_),
           log(disk, texts, events),
           policy(policyFor(options))
     {
+    }
+
+    /// Tells what the user can do next, where there is something to be told.
+    void advise(const Trials::Advice& advice)
+    {
+        if (const std::string sentence = adviceFor(disk, advice); !sentence.empty())
+            log.remark(sentence);
     }
 
     RepairWay repairWay() const { return repairWayFor(options, policy); }

@@ -51,12 +51,18 @@ struct Trials {
     OverlayRoom room;
     RecordLimits limits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
     uid_t user = ::geteuid();  ///< who asks, and may take a repair back
-    /// Sentences in the user's language: how a repair is taken back, how one is applied that is
-    /// not proven, how one is done without a trial. Empty ones are not told.
-    std::string howToUndo;
-    std::string howToApply;
-    std::string howToRepairDirectly;
+    /// Makes a sentence in the user's language about a disk; asked on the job's thread, while the
+    /// main thread runs. May be empty, and answer nothing, which is not told.
+    using Advice = std::function<std::string(const contract::DiskReference&)>;
+    Advice howToUndo;            ///< how a repair is taken back
+    Advice howToApply;           ///< how one is applied that is not proven
+    Advice howToRepairDirectly;  ///< how one is done without a trial
 };
+
+inline std::string adviceFor(const contract::DiskReference& disk, const Trials::Advice& advice)
+{
+    return advice ? advice(disk) : std::string();
+}
 
 /// Where the records are of what repairs have overwritten (UndoStore).
 inline std::filesystem::path recordsIn(const Trials& trials)

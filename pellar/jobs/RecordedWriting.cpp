@@ -92,8 +92,7 @@ void RecordedWriting::keepWithinLimits(const UndoStore& store, const std::string
         return;
     }
     store.removeBeyond(trials.limits, std::chrono::system_clock::now());
-    if (!trials.howToUndo.empty())
-        context_.log.remark(trials.howToUndo);
+    context_.advise(trials.howToUndo);
 }
 
 }  // namespace pellar

@@ -358,8 +358,7 @@ VolumeScript::State VolumeScript::tryRepair()
                                   {}});
     mark_ = WriteMark::of(disk_.claim().descriptor());
     if (const auto obstacle = beginTrial()) {
-        if (!context_.options.trials.howToRepairDirectly.empty())
-            log_.remark(context_.options.trials.howToRepairDirectly);
+        context_.advise(context_.options.trials.howToRepairDirectly);
         return end(
             failedOutcome(contract::kPLErrorNotTried,
                           {"the repair cannot be tried first: %1$@", log_.text(*obstacle), {}}));
@@ -373,8 +372,8 @@ VolumeScript::State VolumeScript::tryRepair()
     const Outcome end = notProven(outcome_, look_.foundDamage);
     if (end.code == contract::kPLErrorNotProven && context_.policy.appliesUnproven)
         return State::Applying;
-    if (end.code == contract::kPLErrorNotProven && !context_.options.trials.howToApply.empty())
-        log_.remark(context_.options.trials.howToApply);
+    if (end.code == contract::kPLErrorNotProven)
+        context_.advise(context_.options.trials.howToApply);
     return this->end(end);
 }
 

@@ -3,10 +3,12 @@
 // Repairs that are tried first, and what keeps them from being applied.
 
 #include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "tests/pellar/JobFixture.h"
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <filesystem>
 
 namespace {
@@ -91,8 +93,13 @@ TEST_F(TriedRepair, WritesNothingWhereWhatItWouldWriteCannotBeKept)
     EXPECT_TRUE(contentsOf(image_) == before_);
     library_.reset();
     options_.trials.room = {directory_.path("disk") / "below", 1U << 20U};
-    options_.trials.howToRepairDirectly = "Directly: so.";
+    options_.trials.howToRepairDirectly = [](const contract::DiskReference& disk) {
+        return "Directly: " + disk.path.native();
+    };
     repair();
+    EXPECT_TRUE(std::ranges::any_of(library().listener.dictionaries, [this](const auto& message) {
+        return message.string(contract::kFsckMessageString) == "Directly: " + image_.native();
+    }));
     EXPECT_EQ(library().listener.error, contract::kPLErrorNotTried);
     EXPECT_TRUE(contentsOf(image_) == before_);
     library_.reset();
