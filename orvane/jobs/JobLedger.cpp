@@ -32,7 +32,8 @@ bool hasAnswer(const Run& run)
     const std::string& verdict = run.end->verdict;
     return verdict == contract::kPLVerdictSound.text() ||
            verdict == contract::kPLVerdictDamaged.text() ||
-           verdict == contract::kPLVerdictRepaired.text();
+           verdict == contract::kPLVerdictRepaired.text() ||
+           verdict == contract::kPLVerdictUndone.text();
 }
 
 // As the modules make the heading of an error (fixwell/messagelog).
