@@ -8,6 +8,12 @@
 #include <utility>
 
 namespace orvane::desktop {
+namespace {
+
+constexpr const char* hostTable = "Orvane";
+
+}  // namespace
+
 
 DesktopSession::DesktopSession(SessionOptions options)
     : options_(std::move(options)),
@@ -19,7 +25,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       controller_(window_),
       ledger_(host_, ledgerEvents()),
       tabs_(host_, window_, controller_),
-      disks_(host_, loop_, window_.disks(), ledger_, options_.disksToOpen,
+      repairs_(libraryOptions().trials),
+      disks_(host_, loop_, window_.disks(), ledger_, repairs_, options_.disksToOpen,
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -28,8 +35,13 @@ DesktopSession::DesktopSession(SessionOptions options)
       hints_(parts(), library_),
       closer_(parts(), options_.closed),
       jobs_(parts(), disks_, closer_, options_.buses, options_.longestGlanceAway,
-            [this] { update(); }),
-      commands_(parts(), disks_, library_, [this] { update(); })
+            [this] {
+                update();
+                choices_.offer();
+            }),
+      undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
+      choices_(parts(), disks_, repairs_, undoing_, closer_, jobPolicy_),
+      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
@@ -80,7 +92,34 @@ pellar::JobOptions DesktopSession::libraryOptions()
                                libraryTexts_.text("The archives of these packages are downloaded "
                                                   "when “Download Package Archives” is switched "
                                                   "on in the Edit menu.")};
+    setRepairOptions(options);
     return options;
+}
+
+pellar::JobOptions DesktopSession::observedOptions()
+{
+    pellar::JobOptions options = libraryOptions();
+    options.observer = &ledger_;
+    return options;
+}
+
+void DesktopSession::setRepairOptions(pellar::JobOptions& options)
+{
+    options.repairPolicy = [this] {
+        pellar::RepairPolicy policy = jobPolicy_;
+        policy.isThorough = verifiesThoroughly(host_);
+        return policy;
+    };
+    const auto text = [this](std::string_view key) {
+        return hostTexts_.translate(hostTable, key);
+    };
+    options.trials.howToUndo = text("To take the repair back, choose Undo Repair in the Disk menu.");
+    options.trials.howToApply =
+        text("To apply the repair although it would leave damage, choose Apply Anyway when you are "
+             "asked after it.");
+    options.trials.howToRepairDirectly =
+        text("To let the tool write to the disk itself, which cannot be undone, choose Repair "
+             "Directly when you are asked after it.");
 }
 
 JobLedger::Events DesktopSession::ledgerEvents()
@@ -88,7 +127,7 @@ JobLedger::Events DesktopSession::ledgerEvents()
     return {[this](const StartedRun& run, const contract::DiskReferencePointer& /*disk*/) {
                 jobs_.runBegan(run);
             },
-            [this](const StartedRun& run, const RunEnd& end) { jobs_.runEnded(run, end); },
+            [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
             [this] {
                 jobs_.stopAsked();
             }};
@@ -96,9 +135,7 @@ JobLedger::Events DesktopSession::ledgerEvents()
 
 void DesktopSession::loadModules()
 {
-    pellar::JobOptions options = libraryOptions();
-    options.observer = &ledger_;
-    tabs_.load(findModuleBundles(options_.moduleDirectories), options,
+    tabs_.load(findModuleBundles(options_.moduleDirectories), observedOptions(),
                [this](const std::string& sentence) { warn(sentence); });
 }
 
@@ -113,6 +150,9 @@ void DesktopSession::connectHost()
             // What the user clears later is another step.
             loop_.post([this] { host_.histories().closeClearing(); });
         };
+    host_.alerts().setWithheld([this] {
+        return controller_.interfaceLock() && choices_.saysMoreThanModule();
+    });
     host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
     host_.printing().setTitle([this] {
         std::string names;
@@ -134,16 +174,30 @@ void DesktopSession::connectWindow()
         [this] { update(); },
         [this] { windowAppeared(); },
     });
-    controller_.setEvents({[this](bool isLocked) {
-                               jobs_.lockChanged(isLocked);
-                               if (isLocked)
-                                   hints_.refresh();
-                               else
-                                   closer_.jobEnded();
-                           },
+    controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
                            [this](const contract::Dictionary& report) {
                                jobs_.reported(report);
                            }});
+}
+
+void DesktopSession::lockChanged(bool isLocked)
+{
+    jobs_.lockChanged(isLocked);
+    choices_.lockChanged(isLocked);
+    if (isLocked)
+        hints_.refresh();
+    else
+        closer_.jobEnded();
+}
+
+// What is kept is read before the list shows it.
+void DesktopSession::runEnded(const StartedRun& run, const RunEnd& end)
+{
+    if (run.task.operation != pellar::Operation::Verify)
+        repairs_.read();
+    jobs_.runEnded(run, end);
+    choices_.runEnded(run, end);
+    undoing_.runEnded(run, end);
 }
 
 void DesktopSession::update()
