@@ -115,11 +115,11 @@ void DesktopSession::setRepairOptions(pellar::JobOptions& options)
     };
     options.trials.howToUndo = text("To take the repair back, choose Undo Repair in the Disk menu.");
     options.trials.howToApply =
-        text("To apply the repair although it would leave damage, choose Apply Anyway when you are "
-             "asked after it.");
+        text("“Apply Anyway”, in the question that follows a repair, applies it although it may "
+             "leave damage. That can be undone as well.");
     options.trials.howToRepairDirectly =
-        text("To let the tool write to the disk itself, which cannot be undone, choose Repair "
-             "Directly when you are asked after it.");
+        text("“Repair Directly”, in the question that follows a repair, lets the tool write to the "
+             "disk itself. That cannot be undone.");
 }
 
 JobLedger::Events DesktopSession::ledgerEvents()

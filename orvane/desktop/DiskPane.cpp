@@ -35,7 +35,7 @@ std::string_view activityIn(pellar::Operation operation)
 {
     switch (operation) {
         case pellar::Operation::Verify: return "verifying…";
-        case pellar::Operation::Undo: return "undoing the repair…";
+        case pellar::Operation::Undo: return "undoing…";
         case pellar::Operation::Repair:
         case pellar::Operation::Finish: break;
     }

@@ -84,8 +84,8 @@ Question RepairChoices::questionAbout(const Offer& offer)
     const auto disk = offer.disk;
     if (offer.error == contract::kPLErrorNotProven)
         return {"unprovenQuestion",
-                sentence("A repair was tried, and would leave damage. “%@” is as it was.", *disk),
-                text("What was found is in the log."),
+                sentence("A repair was tried, and may leave damage. “%@” is as it was.", *disk),
+                offer.message,
                 {{text("Apply Anyway…"), [this, offer] { confirmUnproven(offer); }}},
                 text("Close")};
     if (offer.error == contract::kPLErrorNotTried)
@@ -108,8 +108,8 @@ void RepairChoices::confirmUnproven(const Offer& offer)
 {
     ask(at_.window,
         {"unprovenConfirmation",
-         sentence("Apply the repair of “%@”, although damage is left?", *offer.disk),
-         text("The volume stays damaged, and the repair may remove files, or parts of them, that "
+         sentence("Apply the repair of “%@”, although it may leave damage?", *offer.disk),
+         text("The volume may stay damaged, and the repair may remove files, or parts of them, that "
               "could still be read before. What it overwrites is kept, so it can be undone."),
          {{text("Apply Repair"),
            [this, disk = offer.disk] { repair(*disk, &pellar::RepairPolicy::appliesUnproven); }}},

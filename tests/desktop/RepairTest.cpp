@@ -127,10 +127,15 @@ TEST_F(RepairTest, ARepairIsPreviewedDoneAndTakenBack)
     EXPECT_TRUE(sheet()->informativeText().contains(QStringLiteral(" bytes in ")));
     answer("undoQuestion", "Undo Repair");
     QCoreApplication::sendPostedEvents(&window());
-    EXPECT_EQ(verdict(image), "undoing the repair…");
+    EXPECT_EQ(verdict(image), "undoing…");
     EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "no other job begins meanwhile";
     EXPECT_NE(whyGrey("undoRepair").find("while a job runs"), std::string::npos);
+    EXPECT_TRUE(window().findChild<QPushButton*>(QStringLiteral("stopButton"))->isVisible());
+    window().close();
+    EXPECT_TRUE(window().isVisible()) << "it asks first";
     ASSERT_TRUE(isFree());
+    EXPECT_FALSE(window().findChild<QPushButton*>(QStringLiteral("stopButton"))->isVisible());
+    EXPECT_TRUE(waitUntil([&] { return sheet() == nullptr; })) << "there is nothing left to ask";
     EXPECT_EQ(verdict(image), "undone");
     EXPECT_TRUE(contentsOf(image) == before) << "it is as it was, to the byte";
     EXPECT_TRUE(logHolds("undid the repair of “damaged”")) << testing::PrintToString(logRows());

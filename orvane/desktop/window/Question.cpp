@@ -8,6 +8,11 @@
 #include <QPushButton>
 
 namespace orvane::desktop {
+namespace {
+
+constexpr int widthInCharacters = 60;
+
+}  // namespace
 
 QMessageBox* ask(QWidget& window, const Question& question)
 {
@@ -17,8 +22,12 @@ QMessageBox* ask(QWidget& window, const Question& question)
     box->setObjectName(QLatin1String(question.objectName));
     box->setInformativeText(toQt(question.details));
     // The box's own text format is not that of the informative text, and both hold disk labels.
-    for (QLabel* label : box->findChildren<QLabel*>())
+    for (QLabel* label : box->findChildren<QLabel*>()) {
         label->setTextFormat(Qt::PlainText);
+        // Else a short question above it makes a long text narrow and high.
+        if (label->text() == box->informativeText())
+            label->setMinimumWidth(label->fontMetrics().averageCharWidth() * widthInCharacters);
+    }
     box->setWindowModality(Qt::WindowModal);
     box->setAttribute(Qt::WA_DeleteOnClose);
     for (const Question::Answer& answer : question.answers) {
