@@ -14,7 +14,6 @@ constexpr const char* hostTable = "Orvane";
 
 }  // namespace
 
-
 DesktopSession::DesktopSession(SessionOptions options)
     : options_(std::move(options)),
       hostTexts_(hostBundleDirectory(runningExecutable()) / "locale"),
@@ -113,13 +112,14 @@ void DesktopSession::setRepairOptions(pellar::JobOptions& options)
     const auto text = [this](std::string_view key) {
         return hostTexts_.translate(hostTable, key);
     };
-    options.trials.howToUndo = text("To take the repair back, choose Undo Repair in the Disk menu.");
-    options.trials.howToApply =
-        text("“Apply Anyway”, in the question that follows a repair, applies it although it may "
-             "leave damage. That can be undone as well.");
-    options.trials.howToRepairDirectly =
-        text("“Repair Directly”, in the question that follows a repair, lets the tool write to the "
-             "disk itself. That cannot be undone.");
+    options.trials.howToUndo =
+        text("To take the repair back, choose Undo Repair in the Disk menu.");
+    options.trials.howToApply = text(
+        "“Apply Anyway”, in the question that follows a repair, applies it although it may "
+        "leave damage. That can be undone as well.");
+    options.trials.howToRepairDirectly = text(
+        "“Repair Directly”, in the question that follows a repair, lets the tool write to the "
+        "disk itself. That cannot be undone.");
 }
 
 JobLedger::Events DesktopSession::ledgerEvents()
@@ -150,9 +150,8 @@ void DesktopSession::connectHost()
             // What the user clears later is another step.
             loop_.post([this] { host_.histories().closeClearing(); });
         };
-    host_.alerts().setWithheld([this] {
-        return controller_.interfaceLock() && choices_.saysMoreThanModule();
-    });
+    host_.alerts().setWithheld(
+        [this] { return controller_.interfaceLock() && choices_.saysMoreThanModule(); });
     host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
     host_.printing().setTitle([this] {
         std::string names;

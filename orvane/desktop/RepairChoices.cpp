@@ -86,22 +86,35 @@ Question RepairChoices::questionAbout(const Offer& offer)
         return {"unprovenQuestion",
                 sentence("A repair was tried, and may leave damage. “%@” is as it was.", *disk),
                 offer.message,
-                {{text("Apply Anyway…"), [this, offer] { confirmUnproven(offer); }}},
+                {{text("Apply Anyway…"),
+                  [this, offer] {
+                      confirmUnproven(offer);
+                  }}},
                 text("Close")};
     if (offer.error == contract::kPLErrorNotTried)
-        return {"untriedQuestion",
-                sentence("The repair of “%@” could not be tried first, so nothing was written.",
-                         *disk),
-                offer.message,
-                {{text("Repair Directly…"), [this, offer] { confirmDirect(offer); }}},
-                text("Close")};
-    return {"interruptedQuestion",
-            sentence("A repair of “%@” was interrupted, and only a part of it is written.", *disk),
-            text("Finishing it writes the rest. Undoing it puts back what it has overwritten. Until "
-                 "then, the disk is neither as before nor repaired; do not use it."),
-            {{text("Finish Repair…"), [this, disk] { undo(*disk, pellar::Operation::Finish); }},
-             {text("Undo Repair…"), [this, disk] { undo(*disk, pellar::Operation::Undo); }}},
+        return {
+            "untriedQuestion",
+            sentence("The repair of “%@” could not be tried first, so nothing was written.", *disk),
+            offer.message,
+            {{text("Repair Directly…"),
+              [this, offer] {
+                  confirmDirect(offer);
+              }}},
             text("Close")};
+    return {
+        "interruptedQuestion",
+        sentence("A repair of “%@” was interrupted, and only a part of it is written.", *disk),
+        text("Finishing it writes the rest. Undoing it puts back what it has overwritten. Until "
+             "then, the disk is neither as before nor repaired; do not use it."),
+        {{text("Finish Repair…"),
+          [this, disk] {
+              undo(*disk, pellar::Operation::Finish);
+          }},
+         {text("Undo Repair…"),
+          [this, disk] {
+              undo(*disk, pellar::Operation::Undo);
+          }}},
+        text("Close")};
 }
 
 void RepairChoices::confirmUnproven(const Offer& offer)
@@ -109,22 +122,28 @@ void RepairChoices::confirmUnproven(const Offer& offer)
     ask(at_.window,
         {"unprovenConfirmation",
          sentence("Apply the repair of “%@”, although it may leave damage?", *offer.disk),
-         text("The volume may stay damaged, and the repair may remove files, or parts of them, that "
-              "could still be read before. What it overwrites is kept, so it can be undone."),
+         text(
+             "The volume may stay damaged, and the repair may remove files, or parts of them, that "
+             "could still be read before. What it overwrites is kept, so it can be undone."),
          {{text("Apply Repair"),
-           [this, disk = offer.disk] { repair(*disk, &pellar::RepairPolicy::appliesUnproven); }}},
+           [this, disk = offer.disk] {
+               repair(*disk, &pellar::RepairPolicy::appliesUnproven);
+           }}},
          text("Cancel")});
 }
 
 void RepairChoices::confirmDirect(const Offer& offer)
 {
     ask(at_.window,
-        {"directConfirmation", sentence("Repair “%@” directly?", *offer.disk),
+        {"directConfirmation",
+         sentence("Repair “%@” directly?", *offer.disk),
          text("The checking tool then writes to the disk itself. That cannot be undone: what it "
               "removes is gone, also where the repair fails or is stopped. Copy what matters to "
               "another disk first."),
          {{text("Repair Directly"),
-           [this, disk = offer.disk] { repair(*disk, &pellar::RepairPolicy::isDirect); }}},
+           [this, disk = offer.disk] {
+               repair(*disk, &pellar::RepairPolicy::isDirect);
+           }}},
          text("Cancel")});
 }
 

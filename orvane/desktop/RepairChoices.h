@@ -16,8 +16,8 @@
 
 namespace orvane::desktop {
 
-/// What the user can choose about a repair beyond the module's button: to see what it would do, and,
-/// where it came to nothing, what to do instead. Main thread.
+/// What the user can choose about a repair beyond the module's button: to see what it would do,
+/// and, where it came to nothing, what to do instead. Main thread.
 class RepairChoices {
 public:
     /// All outlive this object. `policy` is what the library asks for as a job begins: other than

@@ -75,15 +75,16 @@ void RepairUndoing::ask(Operation operation)
     const auto disk = this->disk();
     const pellar::Task task = taskFor(operation, *disk);
     const bool isUndo = operation == Operation::Undo;
-    desktop::ask(at_.window,
-                 {"undoQuestion",
-                  at_.host.translator().sentence(isUndo ? "Undo the repair of “%@”?"
-                                                        : "Finish the repair of “%@”?",
-                                                 {disk->displayName()}),
-                  meaningOf(operation, kept_.newestOf(*disk)),
-                  {{text(isUndo ? "Undo Repair" : "Finish Repair"),
-                    [this, task, disk] { begin(task, disk); }}},
-                  text("Cancel")});
+    desktop::ask(at_.window, {"undoQuestion",
+                              at_.host.translator().sentence(isUndo ? "Undo the repair of “%@”?"
+                                                                    : "Finish the repair of “%@”?",
+                                                             {disk->displayName()}),
+                              meaningOf(operation, kept_.newestOf(*disk)),
+                              {{text(isUndo ? "Undo Repair" : "Finish Repair"),
+                                [this, task, disk] {
+                                    begin(task, disk);
+                                }}},
+                              text("Cancel")});
 }
 
 std::string RepairUndoing::meaningOf(Operation operation, const pellar::ListedRecord* record)
@@ -115,13 +116,13 @@ void RepairUndoing::begin(pellar::Task task, const std::shared_ptr<Disk>& disk)
     at_.controller.setInterfaceLock();
     update_();
     showProgress(title_);
-    job_ = std::make_unique<HostJob>(library_, at_.host, disk,
-                                     HostJob::Events{[this] { at_.tabs.reloadLog(); },
-                                                     [this](double percent) {
-                                                         at_.window.progress().setIndeterminate(
-                                                             false);
-                                                         at_.window.progress().setPercent(percent);
-                                                     }});
+    job_ =
+        std::make_unique<HostJob>(library_, at_.host, disk,
+                                  HostJob::Events{[this] { at_.tabs.reloadLog(); },
+                                                  [this](double percent) {
+                                                      at_.window.progress().setIndeterminate(false);
+                                                      at_.window.progress().setPercent(percent);
+                                                  }});
     const auto stop = [this] {
         job_->stop();
     };

@@ -16,9 +16,8 @@ constexpr int widthInCharacters = 60;
 
 QMessageBox* ask(QWidget& window, const Question& question)
 {
-    auto* const box =
-        new QMessageBox(QMessageBox::Warning, QApplication::applicationDisplayName(),
-                        toQt(question.text), QMessageBox::NoButton, &window);
+    auto* const box = new QMessageBox(QMessageBox::Warning, QApplication::applicationDisplayName(),
+                                      toQt(question.text), QMessageBox::NoButton, &window);
     box->setObjectName(QLatin1String(question.objectName));
     box->setInformativeText(toQt(question.details));
     // The box's own text format is not that of the informative text, and both hold disk labels.

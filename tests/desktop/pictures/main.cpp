@@ -51,8 +51,7 @@ protected:
     void takePicture(const std::string& name)
     {
         QPixmap picture = window().grab();
-        QWidget* const above =
-            sheet() != nullptr ? sheet() : QApplication::activePopupWidget();
+        QWidget* const above = sheet() != nullptr ? sheet() : QApplication::activePopupWidget();
         if (above != nullptr) {
             const QPoint corner = above->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
             QPainter(&picture).drawPixmap(corner, above->grab());
