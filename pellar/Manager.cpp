@@ -44,12 +44,14 @@ bool Manager::canVerify(std::string_view filesystemType) const
 
 bool Manager::canRepair(std::string_view filesystemType) const
 {
-    return capabilityFor(filesystemType, Operation::Repair, options_.toolPath, repairWay()).isGiven();
+    return capabilityFor(filesystemType, Operation::Repair, options_.toolPath, repairWay())
+        .isGiven();
 }
 
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
 {
-    return capabilityFor(filesystemType, operation, options_.toolPath, repairWay()).reason.in(texts_);
+    return capabilityFor(filesystemType, operation, options_.toolPath, repairWay())
+        .reason.in(texts_);
 }
 
 bool Manager::canVerifyLive(std::string_view filesystemType) const

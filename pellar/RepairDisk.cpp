@@ -172,8 +172,8 @@ ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& dis
 
 ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation operation)
 {
-    auto claim = DiskClaim::attempt(
-        *disk, accessFor(operation, policyFor(options_)), options_.systemPaths);
+    auto claim =
+        DiskClaim::attempt(*disk, accessFor(operation, policyFor(options_)), options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
     VolumeRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
@@ -297,9 +297,8 @@ void RepairDisk::traceTool(const contract::DiskReference& disk, Operation operat
 {
     if (disk.filesystem.empty())
         return;
-    const Capability capability =
-        capabilityFor(disk.filesystem, operation, options_.toolPath,
-                      repairWayFor(options_, policyFor(options_)));
+    const Capability capability = capabilityFor(disk.filesystem, operation, options_.toolPath,
+                                                repairWayFor(options_, policyFor(options_)));
     trace(contract::printable(disk.filesystem) + ": " +
           (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
 }

@@ -56,7 +56,7 @@ inline constexpr ErrorCode kPLErrorMapDamaged = -69721;      ///< a repair can r
 inline constexpr ErrorCode kPLErrorMapNeedsPerson = -69722;  ///< and none can
 inline constexpr ErrorCode kPLErrorMapNotRepaired = -69723;  ///< damage is left
 
-inline constexpr ErrorCode kPLErrorNoReferences = -69730;  ///< nothing could be compared
+inline constexpr ErrorCode kPLErrorNoReferences = -69730;            ///< nothing could be compared
 inline constexpr ErrorCode kPLErrorPermissionsNotRepaired = -69731;  ///< some still differ
 
 inline constexpr ErrorCode kPLErrorNotAdministrator = -69732;  ///< only root may
@@ -71,12 +71,10 @@ struct ErrorText {
 /// Every code there is, but 0, with what it means.
 inline constexpr std::array errorTexts{
     ErrorText{kPLErrorNoDiskReference, "The disk is no longer available."},
-    ErrorText{kPLErrorCouldNotUnmount,
-              "The volume is mounted and could not be unmounted."},
+    ErrorText{kPLErrorCouldNotUnmount, "The volume is mounted and could not be unmounted."},
     ErrorText{kPLErrorDiskInUse, "The disk is in use by another program."},
     ErrorText{kPLErrorCancelled, "The operation was stopped."},
-    ErrorText{kOVErrorCannotRepairInUse,
-              "The disk cannot be repaired while it is in use."},
+    ErrorText{kOVErrorCannotRepairInUse, "The disk cannot be repaired while it is in use."},
     ErrorText{kOVErrorSystemDiskInUse,
               "The disk is in use by the running system and cannot be checked now."},
     ErrorText{kOVErrorDiskInUse, "The disk is in use and cannot be checked now."},
@@ -100,10 +98,8 @@ inline constexpr std::array errorTexts{
     ErrorText{kPLErrorNothingToUndo, "There is no repair of the disk that could be undone."},
     ErrorText{kPLErrorNotUndone, "The repair was not undone; the disk is as the repair left it."},
     ErrorText{kPLErrorNotRepaired, "The volume is still damaged after the repair."},
-    ErrorText{kPLErrorInconclusive,
-              "It could not be determined whether the volume is damaged."},
-    ErrorText{kPLErrorToolMissing,
-              "The checking tool for this file system is not installed."},
+    ErrorText{kPLErrorInconclusive, "It could not be determined whether the volume is damaged."},
+    ErrorText{kPLErrorToolMissing, "The checking tool for this file system is not installed."},
     ErrorText{kPLErrorToolFailed, "The checking tool failed."},
     ErrorText{kPLErrorNoReferences,
               "It is not known here what permissions the installed files should have."},

@@ -30,7 +30,6 @@ using pellar::Subject;
 
 // Where sectors are kept that the repair of a partition map overwrites, and what archives have
 // said about their packages' files.
-constexpr const char* savedSectors = "/var/lib/orvane/partition-maps";
 constexpr const char* permissionReferences = "/var/lib/orvane/permissions";
 
 bool write(const std::string& line)
@@ -177,7 +176,6 @@ private:
     void work()
     {
         pellar::JobOptions options;
-        options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
         if (user_)
             options.homeDirectory = homeDirectoryOf(*user_);
@@ -220,7 +218,7 @@ private:
     void refuse(const JobFailure& failure)
     {
         pellar::EventQueue events(loop_, {&printer_, nullptr, {}, [] {
-                                       }});
+                                          }});
         pellar::JobLog log(request_.disk, texts_, events);
         log.started();
         reportFailure(failure, request_, texts_, log);

@@ -46,14 +46,13 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
 }  // namespace
 
 pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
-                                      const Asking& asking, const WarningSink& refused)
+                                  const Asking& asking, const WarningSink& refused)
 {
     pellar::JobOptions options;
     if (const std::string path = toolPathFromEnvironment(refused); !path.empty())
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
     if (!paths.state.empty()) {
-        options.savedSectorsDirectory = paths.state / "partition-maps";
         options.permissionReferences = paths.state / "permissions";
         options.trials.room.directory = paths.state / "repairs";
     }

@@ -22,10 +22,9 @@ std::string textOf(const timespec& time)
 /// twelfth and fourteenth the same of what was discarded.
 std::string writesOf(dev_t device)
 {
-    std::istringstream numbers(
-        readKernelFile("/sys/dev/block/" + std::to_string(major(device)) + ":" +
-                       std::to_string(minor(device)) + "/stat")
-            .value_or(""));
+    std::istringstream numbers(readKernelFile("/sys/dev/block/" + std::to_string(major(device)) +
+                                              ":" + std::to_string(minor(device)) + "/stat")
+                                   .value_or(""));
     std::string result;
     std::string number;
     for (int i = 1; numbers >> number; ++i)
@@ -43,9 +42,10 @@ WriteMark WriteMark::of(int disk)
     ::fsync(disk);
     if (::fstat(disk, &status) != 0)
         return mark;
-    mark.text_ = S_ISBLK(status.st_mode) ? writesOf(status.st_rdev)
-                                         : std::to_string(status.st_size) + " " +
-                                               textOf(status.st_mtim) + " " + textOf(status.st_ctim);
+    mark.text_ = S_ISBLK(status.st_mode)
+                     ? writesOf(status.st_rdev)
+                     : std::to_string(status.st_size) + " " + textOf(status.st_mtim) + " " +
+                           textOf(status.st_ctim);
     return mark;
 }
 

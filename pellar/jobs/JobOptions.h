@@ -112,9 +112,6 @@ struct JobOptions {
     /// when others can write to it. Empty: nothing is kept.
     std::filesystem::path permissionReferences;
     ArchiveFetching archiveFetching;
-    /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
-    /// made when it is needed. Empty: no partition map is repaired.
-    std::filesystem::path savedSectorsDirectory;
     Trials trials;
     /// Asked as a job begins, on the main thread; may be empty.
     std::function<RepairPolicy()> repairPolicy;

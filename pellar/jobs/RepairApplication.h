@@ -4,47 +4,16 @@
 #include "pellar/disks/WriteMark.h"
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobDisk.h"
+#include "pellar/jobs/RecordedWriting.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/overlay/TrialDisk.h"
-#include "pellar/undo/UndoStore.h"
-
-#include <vector>
 
 namespace pellar {
 
-/// Which disk this is, for a record of what a repair overwrites there.
-[[nodiscard]] RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
-                                        ByteRange region);
-
-/// What a repair has come to where it was tried: kept, and brought to the disk; or only shown. The
-/// job's thread; the references outlive it.
-class RepairApplication {
-public:
-    /// `mark` is the disk's from before the trial.
-    RepairApplication(JobContext& context, const JobDisk& disk, const TrialDisk& trial,
-                      const WriteMark& mark);
-
-    /// Writes what was changed to the disk. Answers `tried`, or why that is not what the disk has
-    /// come to; then the disk is as it was, unless it is said otherwise.
-    [[nodiscard]] Outcome apply(Outcome tried);
-    /// Tells what would be changed, and answers what a verification with that knowledge would.
-    [[nodiscard]] Outcome preview(const Outcome& tried);
-
-private:
-    [[nodiscard]] Outcome write(const std::vector<ByteRange>& ranges, Outcome tried);
-    [[nodiscard]] Result<UndoRecord, Sentence> save(const UndoStore& store,
-                                                    const std::vector<ByteRange>& ranges);
-    [[nodiscard]] Outcome notWritten(const Sentence& reason) const;
-    void keepWithinLimits(const UndoStore& store, const std::string& id);
-    void tellLoss(const Outcome& tried);
-    [[nodiscard]] std::optional<Sentence> writeImage();
-    UndoWork work() const;
-
-    JobContext& context_;
-    JobLog& log_ = context_.log;
-    const JobDisk& disk_;
-    const TrialDisk& trial_;
-    const WriteMark& mark_;
-};
+/// Brings to the disk what a repair has come to where it was tried (RecordedWriting). `mark` is the
+/// disk's from before the trial. Answers `tried`, or why that is not what the disk has come to;
+/// then the disk is as it was, unless it is said otherwise. The job's thread.
+[[nodiscard]] Outcome applyTrial(const TrialDisk& trial, const WriteMark& mark, const JobDisk& disk,
+                                 JobContext& context, Outcome tried);
 
 }  // namespace pellar

@@ -75,9 +75,8 @@ std::optional<Outcome> RepairPasses::repair()
 {
     const double whole = share_.to - share_.from;
     log_.meter().setRange(share_.from, share_.from + whole * repairShare);
-    const RunEvidence evidence =
-        runs_.run(Access::ReadWrite,
-                  look_.foundDamage ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
+    const RunEvidence evidence = runs_.run(
+        Access::ReadWrite, look_.foundDamage ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = runs_.judge(evidence);
     passes_.push_back({judgement, evidence.findings.replayedJournal,
                        evidence.findings.problems > 0 || look_.foundDamage});
@@ -99,9 +98,8 @@ Judgement RepairPasses::confirm()
 
 bool RepairPasses::foundProblems() const
 {
-    return leftDamage_ || std::any_of(passes_.begin(), passes_.end(), [](const RepairPass& pass) {
-               return pass.foundProblems;
-           });
+    return leftDamage_ || std::any_of(passes_.begin(), passes_.end(),
+                                      [](const RepairPass& pass) { return pass.foundProblems; });
 }
 
 }  // namespace pellar

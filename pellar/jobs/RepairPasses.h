@@ -35,6 +35,7 @@ public:
 
     /// Of the last `run`: something was found that no replaying of a journal explains.
     bool foundProblems() const;
+    const FileCounts& counts() const { return look_.counts; }
 
 private:
     std::optional<Outcome> replay();

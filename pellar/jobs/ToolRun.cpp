@@ -76,10 +76,9 @@ RunRequest ToolRun::requestFor(const DiskForTool& disk) const
     RunRequest request;
     request.wantsTerminal = tool_.habits.wantsTerminal;
     request.ignoresStops = isUnstoppable();
-    request.command = {program_,
-                       logParts_.empty()
-                           ? tool_.arguments(access_, diskArgumentOfTool(), disk.offset())
-                           : tool_.logReading->arguments(logParts_, diskArgumentOfTool())};
+    request.command = {
+        program_, logParts_.empty() ? tool_.arguments(access_, diskArgumentOfTool(), disk.offset())
+                                    : tool_.logReading->arguments(logParts_, diskArgumentOfTool())};
     request.access = access_;
     request.disk = disk.descriptor();
     request.limits = context_.options.outputLimits;

@@ -3,10 +3,9 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/jobs/RepairApplication.h"
+#include "pellar/jobs/RecordedWriting.h"
 #include "pellar/partitions/MapDisk.h"
 
-#include <algorithm>
 #include <utility>
 
 namespace pellar {
@@ -35,7 +34,7 @@ UndoScript::Failure UndoScript::onVolume()
     const DiskClaim& claim = disk.claim();
     FileRegion region(claim.descriptor(), claim.offset(), claim.availableBytes());
     Failure failure = carryOutOn(region, recordedDisk(*request_.disk, claim.descriptor(),
-                                                   {claim.offset(), claim.availableBytes()}));
+                                                      {claim.offset(), claim.availableBytes()}));
     disk.giveBack();
     return failure;
 }
@@ -48,7 +47,7 @@ UndoScript::Failure UndoScript::onMap()
         return failedOutcome(claim.error(), {"the disk, or a part of it, is in use", {}, {}});
     FileRegion region(claim->descriptor(), claim->offset(), claim->length());
     Failure failure = carryOutOn(region, recordedDisk(*request_.disk, claim->descriptor(),
-                                                   {claim->offset(), claim->length()}));
+                                                      {claim->offset(), claim->length()}));
     if (!failure && !claim->rereadPartitions())
         log_.remark(
             Sentence{"The system has not taken up the repaired map yet; it does when "
@@ -93,17 +92,12 @@ UndoScript::Failure UndoScript::objectionTo(const ListedRecord* record) const
 
 UndoScript::Failure UndoScript::work(UndoRecord& record, Region& region)
 {
-    log_.step(request_.task.operation,
-              {isUndo() ? "Putting back %1$@ bytes in %2$@ places"
-                        : "Writing %1$@ bytes in %2$@ places once more",
-               std::to_string(record.facts().changedBytes),
-               std::to_string(record.facts().rangeCount)});
+    log_.step(request_.task.operation, {isUndo() ? "Putting back %1$@ bytes in %2$@ places"
+                                                 : "Writing %1$@ bytes in %2$@ places once more",
+                                        std::to_string(record.facts().changedBytes),
+                                        std::to_string(record.facts().rangeCount)});
     log_.flush();
-    const UndoWork work{[this] { return context_.stop.isPressed(); },
-                        [this](std::uint64_t done, std::uint64_t total) {
-                            log_.progress(100.0 * static_cast<double>(done) /
-                                          static_cast<double>(std::max<std::uint64_t>(total, 1)));
-                        }};
+    const UndoWork work = workOf(context_);
     const auto done = isUndo() ? record.undo(region, work) : record.finish(region, work);
     if (done)
         return std::nullopt;
@@ -125,15 +119,16 @@ void UndoScript::report(const Failure& failure)
                        {}});
         log_.verdict(true, message);
         log_.finished(contract::kPLNoError, 0,
-                      isUndo() ? contract::kPLVerdictUndone : contract::kPLVerdictRepaired, message);
+                      isUndo() ? contract::kPLVerdictUndone : contract::kPLVerdictRepaired,
+                      message);
         return;
     }
-    const std::string message = log_.text(
-        failure->verdict == Verdict::Stopped
-            ? Sentence{"stopped; “%1$@” is as it was", log_.diskName(), {}}
-            : Sentence{isUndo() ? "cannot undo the repair of “%1$@”: %2$@"
-                                : "cannot finish the repair of “%1$@”: %2$@",
-                       log_.diskName(), log_.text(failure->reason)});
+    const std::string message =
+        log_.text(failure->verdict == Verdict::Stopped
+                      ? Sentence{"stopped; “%1$@” is as it was", log_.diskName(), {}}
+                      : Sentence{isUndo() ? "cannot undo the repair of “%1$@”: %2$@"
+                                          : "cannot finish the repair of “%1$@”: %2$@",
+                                 log_.diskName(), log_.text(failure->reason)});
     log_.failure(message);
     log_.finished(*failure, message);
 }

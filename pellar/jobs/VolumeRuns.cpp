@@ -70,11 +70,29 @@ VolumeFacts VolumeRuns::facts() const
     return tool_->examine(claim.descriptor(), claim.offset(), claim.availableBytes());
 }
 
-Result<DiskForTool, int> VolumeRuns::prepare(DiskForTool::Form form, Access access) const
+Result<DiskForTool, int> VolumeRuns::prepare(DiskForTool::Form form, Access access)
 {
-    return trial_ != nullptr
-               ? DiskForTool::prepare(trial_->descriptor(), trial_->bytes(), form, access)
-               : DiskForTool::prepare(disk_.claim(), form, access);
+    if (trial_ != nullptr)
+        return DiskForTool::prepare(trial_->descriptor(), trial_->bytes(), form, access);
+    auto disk = DiskForTool::prepare(disk_.claim(), form, access);
+    const bool isRefused = !disk && (disk.error() == EPERM || disk.error() == EACCES);
+    const bool isView = form == DiskForTool::Form::VolumeAlone && access == Access::ReadOnly &&
+                        context_.repairWay() == RepairWay::TriedFirst;
+    return isRefused && isView ? prepareView() : std::move(disk);
+}
+
+/// What a tool reads of a part of an image needs no device, which takes root: a trial shows it that
+/// part.
+Result<DiskForTool, int> VolumeRuns::prepareView()
+{
+    const DiskClaim& claim = disk_.claim();
+    auto view = TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
+                              context_.options.trials.room);
+    if (!view)
+        return EPERM;
+    view_.emplace(*std::move(view));
+    return DiskForTool::prepare(view_->descriptor(), view_->bytes(), DiskForTool::Form::VolumeAlone,
+                                Access::ReadOnly);
 }
 
 RunEvidence VolumeRuns::run(Access access, ToolRun::Problems problems)
@@ -138,12 +156,11 @@ Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
     context_.log.step(Operation::Verify, {"Reading the log that waits to be replayed", {}, {}});
     // On the disk: its log is no other, and btrfs takes no file without a name (realpath(3)).
     const TrialDisk* const trial = std::exchange(trial_, nullptr);
-    const auto first =
-        runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
-    const auto rest = first.findings.logParts.empty()
-                          ? first
-                          : runOn(Access::ReadOnly, ToolRun::Problems::Shown,
-                                  first.findings.logParts);
+    const auto first = runOn(Access::ReadOnly, ToolRun::Problems::Shown, {evidence.volume.log});
+    const auto rest =
+        first.findings.logParts.empty()
+            ? first
+            : runOn(Access::ReadOnly, ToolRun::Problems::Shown, first.findings.logParts);
     trial_ = trial;
     for (const RunEvidence& part : {first, rest})
         if (part.result.ending != Ending(Exited{0}))
@@ -158,9 +175,9 @@ Judgement VolumeRuns::judgeWithLog(RunEvidence evidence)
 Judgement VolumeRuns::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
 {
     if (trial_ != nullptr) {
-        if (const auto byte = trial_->overlay().firstUnreadable())
+        if (const auto byte = trial_->contents().firstUnreadable())
             return unreadable(byte);
-        return trial_->overlay().isOutOfRoom() ? outOfRoom() : judgement;
+        return trial_->contents().isOutOfRoom() ? outOfRoom() : judgement;
     }
     const bool isAnswer = judgement.code == contract::kPLErrorUnreadable ||
                           judgement.code == contract::kPLErrorDamaged ||
@@ -188,8 +205,7 @@ std::optional<std::uint64_t> VolumeRuns::unreadableByte(const ReadFault& fault) 
     return firstUnreadable(pieces);
 }
 
-std::optional<std::uint64_t> VolumeRuns::firstUnreadable(
-    const std::vector<ByteRange>& pieces) const
+std::optional<std::uint64_t> VolumeRuns::firstUnreadable(const std::vector<ByteRange>& pieces) const
 {
     const auto deadline = Clock::now() + std::chrono::seconds(30);
     return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces, [&] {

@@ -51,7 +51,8 @@ public:
 
 private:
     VolumeFacts facts() const;
-    Result<DiskForTool, int> prepare(DiskForTool::Form form, Access access) const;
+    Result<DiskForTool, int> prepare(DiskForTool::Form form, Access access);
+    Result<DiskForTool, int> prepareView();
     RunEvidence runOn(Access access, ToolRun::Problems problems,
                       const std::vector<std::uint64_t>& logParts);
     Judgement asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const;
@@ -59,6 +60,7 @@ private:
     const JobDisk& disk_;
     JobContext& context_;
     const TrialDisk* trial_ = nullptr;
+    std::optional<TrialDisk> view_;  ///< of a part of a disk, for a tool that reads it alone
     const Tool* tool_ = nullptr;
     std::filesystem::path program_;
     std::filesystem::path repairProgram_;

@@ -6,6 +6,7 @@
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/RepairApplication.h"
+#include "pellar/jobs/RepairPreview.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/probe/DiskProbe.h"
 #include "pellar/tools/Capability.h"
@@ -46,10 +47,11 @@ Outcome notProven(Outcome outcome, bool foundDamage)
     if (outcome.verdict != Verdict::Damaged && !isUnknown)
         return outcome;
     if (isUnknown)
-        outcome.reason = {"a repair was tried, and it cannot be told whether it makes it sound; "
-                          "nothing was written",
-                          {},
-                          {}};
+        outcome.reason = {
+            "a repair was tried, and it cannot be told whether it makes it sound; "
+            "nothing was written",
+            {},
+            {}};
     else
         outcome.reason = {
             "a repair was tried, and would leave damage; nothing was written", {}, {}};
@@ -242,12 +244,10 @@ VolumeScript::State VolumeScript::verify()
     outcome_ = canBeRepaired ? outcomeOfVerification(judgement) : outcomeWithoutRepair(judgement);
     if (judgement.verdict == Verdict::Sound && hasJournal)
         tellJournal();
-    look_.waitsForMount =
-        evidence.findings.skippedJournal && !tool_->habits.logReplayedAs.empty();
+    look_.waitsForMount = evidence.findings.skippedJournal && !tool_->habits.logReplayedAs.empty();
     const bool isWorthATrial =
         isOpen(judgement, evidence) || (isThorough && judgement.verdict == Verdict::Sound);
-    const bool isPossible = isTried && canBeRepaired &&
-                            !runs_.program(Access::ReadWrite).empty() &&
+    const bool isPossible = isTried && canBeRepaired && !runs_.program(Access::ReadWrite).empty() &&
                             !runs_.volume().isCutShort();
     return isWorthATrial && isPossible ? State::Deciding : State::Done;
 }
@@ -263,24 +263,25 @@ void VolumeScript::tellMeaning(const RunEvidence& evidence)
 
 void VolumeScript::tellJournal()
 {
-    log_.remark(Sentence{"Its journal waits to be replayed, which mounting it does; with that, no "
-                         "damage was found.",
-                         {},
-                         {}});
+    log_.remark(
+        Sentence{"Its journal waits to be replayed, which mounting it does; with that, no "
+                 "damage was found.",
+                 {},
+                 {}});
 }
 
 /// What a repair finds and changes is known once it is done; so it is done where the disk stays as
 /// it is.
 VolumeScript::State VolumeScript::decide()
 {
-    log_.step(Operation::Verify, {"Trying a repair to know more; nothing is written to “%1$@”",
-                                  log_.diskName(),
-                                  {}});
+    log_.step(Operation::Verify,
+              {"Trying a repair to know more; nothing is written to “%1$@”", log_.diskName(), {}});
     if (const auto obstacle = beginTrial()) {
-        log_.remark(Sentence{"More could be known by trying a repair, which cannot be done here: "
-                             "%1$@.",
-                             log_.text(*obstacle),
-                             {}});
+        log_.remark(
+            Sentence{"More could be known by trying a repair, which cannot be done here: "
+                     "%1$@.",
+                     log_.text(*obstacle),
+                     {}});
         return State::Done;
     }
     RepairPasses passes(runs_, context_, look_, {readingEnds, 100});
@@ -356,11 +357,13 @@ VolumeScript::State VolumeScript::tryRepair()
     if (const auto obstacle = beginTrial()) {
         if (!context_.options.trials.howToRepairDirectly.empty())
             log_.remark(context_.options.trials.howToRepairDirectly);
-        return end(failedOutcome(contract::kPLErrorNotTried,
-                                 {"the repair cannot be tried first: %1$@", log_.text(*obstacle),
-                                  {}}));
+        return end(
+            failedOutcome(contract::kPLErrorNotTried,
+                          {"the repair cannot be tried first: %1$@", log_.text(*obstacle), {}}));
     }
-    outcome_ = RepairPasses(runs_, context_, look_, {lookEnds, trialEnds}).run();
+    RepairPasses passes(runs_, context_, look_, {lookEnds, trialEnds});
+    outcome_ = passes.run();
+    look_.counts = passes.counts();
     runs_.workOn(nullptr);
     if (context_.policy.isPreview || isProven(outcome_))
         return State::Applying;
@@ -374,17 +377,18 @@ VolumeScript::State VolumeScript::tryRepair()
 
 VolumeScript::State VolumeScript::apply()
 {
-    RepairApplication application(context_, disk_, *trial_, mark_);
-    return end(context_.policy.isPreview ? application.preview(outcome_)
-                                         : application.apply(outcome_));
+    if (context_.policy.isPreview)
+        return end(RepairPreview(context_, *tool_, *trial_).tell(outcome_, look_.counts));
+    return end(applyTrial(*trial_, mark_, disk_, context_, outcome_));
 }
 
 /// Why there is none; the tool works on it from now on.
 std::optional<Sentence> VolumeScript::beginTrial()
 {
     const DiskClaim& claim = disk_.claim();
-    auto trial = TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
-                               context_.options.trials.room);
+    auto trial =
+        TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
+                      context_.options.trials.room, [this] { return context_.stop.isPressed(); });
     if (!trial)
         return trial.error();
     trial_.emplace(*std::move(trial));

@@ -43,16 +43,7 @@ public:
     void run() override;
 
 private:
-    enum class State {
-        Examining,
-        Verifying,
-        Deciding,
-        Looking,
-        Repairing,
-        Trying,
-        Applying,
-        Done
-    };
+    enum class State { Examining, Verifying, Deciding, Looking, Repairing, Trying, Applying, Done };
 
     State next(State state);
     State examine();

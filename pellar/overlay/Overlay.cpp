@@ -1,80 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/overlay/Overlay.h"
 
-#include <fcntl.h>
-#include <sys/statvfs.h>
-#include <unistd.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <memory>
-#include <string>
-#include <system_error>
 
 namespace pellar {
 namespace {
 
-constexpr std::uint64_t sector = 512;
-
-/// Without a name from the beginning where the file system can do that (open(2), O_TMPFILE).
-FileDescriptor namelessFileIn(const std::filesystem::path& directory)
-{
-    FileDescriptor file(::open(directory.c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0600));
-    if (file || (errno != EOPNOTSUPP && errno != EISDIR))
-        return file;
-    std::string name = directory / "overlay-XXXXXX";
-    FileDescriptor named(::mkostemp(name.data(), O_CLOEXEC));
-    if (named)
-        ::unlink(name.c_str());
-    return named;
-}
-
-/// What others need of the file system stays free.
-std::uint64_t roomBeside(int file)
-{
-    constexpr std::uint64_t mostReserved = 64U << 20U;
-    struct statvfs status = {};
-    if (::fstatvfs(file, &status) != 0)
-        return 0;
-    const std::uint64_t all = status.f_blocks * status.f_frsize;
-    const std::uint64_t free = status.f_bavail * status.f_frsize;
-    const std::uint64_t reserved = std::min(mostReserved, all / 20);
-    return free > reserved ? free - reserved : 0;
-}
-
-void addRange(std::vector<ByteRange>& ranges, ByteRange range)
-{
-    if (!ranges.empty() && ranges.back().end() >= range.offset)
-        ranges.back().length =
-            std::max(ranges.back().end(), range.end()) - ranges.back().offset;
-    else
-        ranges.push_back(range);
-}
-
-/// Of what starts at `start`, the sectors in which the two differ.
-void addDifferences(std::vector<ByteRange>& ranges, std::uint64_t start,
-                    std::span<const std::uint8_t> before, std::span<const std::uint8_t> after)
-{
-    for (std::size_t at = 0, count = 0; at < before.size(); at += count) {
-        const std::size_t toBoundary = sector - (start + at) % sector;
-        count = std::min(toBoundary, before.size() - at);
-        if (!std::ranges::equal(before.subspan(at, count), after.subspan(at, count)))
-            addRange(ranges, {start + at, count});
-    }
-}
+constexpr std::uint64_t sectorBytes = 512;
 
 }  // namespace
-
 Result<std::unique_ptr<Overlay>, int> Overlay::over(int disk, ByteRange region,
                                                     const OverlayRoom& room)
 {
-    std::error_code error;
-    std::filesystem::create_directories(room.directory, error);
-    FileDescriptor file = namelessFileIn(room.directory);
+    FileDescriptor file = makeNamelessFile(room);
     if (!file)
         return errno;
-    return std::unique_ptr<Overlay>(
-        new Overlay(disk, region, std::move(file), room.mostBytes));
+    return std::unique_ptr<Overlay>(new Overlay(disk, region, std::move(file), room.mostBytes));
 }
 
 Overlay::Piece Overlay::firstPieceOf(ByteRange range) const
@@ -113,12 +56,6 @@ int Overlay::read(std::uint64_t start, std::span<std::uint8_t> bytes)
         bytes = bytes.subspan(part.size());
     }
     return 0;
-}
-
-int Overlay::readOriginal(std::uint64_t start, std::span<std::uint8_t> bytes)
-{
-    const std::lock_guard lock(mutex_);
-    return readDisk(start, bytes);
 }
 
 int Overlay::write(std::uint64_t start, std::span<const std::uint8_t> bytes)
@@ -185,7 +122,7 @@ Result<std::vector<ByteRange>, int> Overlay::differences()
             // Up to a sector's boundary, so that the sectors are the disk's.
             const std::uint64_t place = start + done;
             const auto count = static_cast<std::size_t>(
-                std::min<std::uint64_t>(most - place % sector, extent.bytes - done));
+                std::min<std::uint64_t>(most - place % sectorBytes, extent.bytes - done));
             const std::span original(before.data(), count);
             const std::span written(after.data(), count);
             if (const int error = readDisk(place, original))

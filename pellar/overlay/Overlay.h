@@ -1,53 +1,31 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
-#include "pellar/bytes/Bytes.h"
-#include "pellar/outcome/Result.h"
-#include "pellar/process/FileDescriptor.h"
+#include "pellar/overlay/WorkingCopy.h"
 
 #include <cstdint>
-#include <filesystem>
 #include <map>
+#include <memory>
 #include <mutex>
-#include <optional>
-#include <span>
-#include <vector>
 
 namespace pellar {
 
-/// How much an overlay may keep, and where.
-struct OverlayRoom {
-    /// Absolute; made when it is needed. The file in it has no name, so none is left behind.
-    std::filesystem::path directory;
-    std::uint64_t mostBytes = ~std::uint64_t{0};
-};
-
 /// A region of a disk as it would be if it were written to: reads come from the disk until a place
 /// is written, writes go to a file of ours, and the disk is never written to. Any thread.
-class Overlay {
+class Overlay final : public WorkingCopy {
 public:
     /// `disk` outlives it, open for reading. An errno when the file cannot be made.
     [[nodiscard]] static Result<std::unique_ptr<Overlay>, int> over(int disk, ByteRange region,
                                                                     const OverlayRoom& room);
 
-    std::uint64_t bytes() const { return region_.length; }
+    std::uint64_t bytes() const override { return region_.length; }
 
-    /// All of `bytes` from `start`, which lie within the region, or the errno: EIO where the disk
-    /// cannot be read.
-    [[nodiscard]] int read(std::uint64_t start, std::span<std::uint8_t> bytes);
+    [[nodiscard]] int read(std::uint64_t start, std::span<std::uint8_t> bytes) override;
     /// EFBIG past the end; ENOSPC when there is no room.
     [[nodiscard]] int write(std::uint64_t start, std::span<const std::uint8_t> bytes);
-    /// As `read`, but what the disk itself has there.
-    [[nodiscard]] int readOriginal(std::uint64_t start, std::span<std::uint8_t> bytes);
-
-    /// Where it differs from the disk, in ascending order, to the sector of 512 bytes. An errno
-    /// where the disk, or the file, cannot be read.
-    [[nodiscard]] Result<std::vector<ByteRange>, int> differences();
-
-    /// The first place, in time, that the disk refused to read; bytes from the region's start.
-    std::optional<std::uint64_t> firstUnreadable() const;
-    /// A write was refused for want of room.
-    bool isOutOfRoom() const;
+    [[nodiscard]] Result<std::vector<ByteRange>, int> differences() override;
+    std::optional<std::uint64_t> firstUnreadable() const override;
+    bool isOutOfRoom() const override;
     /// Bytes in the file: each place that was written counts as often as it is long, once.
     std::uint64_t keptBytes() const;
 

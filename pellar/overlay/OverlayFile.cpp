@@ -69,8 +69,8 @@ void tellStatus(fuse_req_t request, fuse_ino_t number, fuse_file_info*)
 void changeStatus(fuse_req_t request, fuse_ino_t number, struct stat* wanted, int which,
                   fuse_file_info* file)
 {
-    const bool isResized = (which & FUSE_SET_ATTR_SIZE) != 0 &&
-                           wanted->st_size != statusOf(request, number).st_size;
+    const bool isResized =
+        (which & FUSE_SET_ATTR_SIZE) != 0 && wanted->st_size != statusOf(request, number).st_size;
     if (isResized)
         ::fuse_reply_err(request, EPERM);
     else
@@ -147,8 +147,7 @@ public:
         fuse_args list = FUSE_ARGS_INIT(1, arguments);
         static const fuse_lowlevel_ops table = operations();
         ::fuse_set_log_func([](fuse_log_level, const char*, va_list) {});
-        fuse_session* const session =
-            ::fuse_session_new(&list, &table, sizeof table, &overlay);
+        fuse_session* const session = ::fuse_session_new(&list, &table, sizeof table, &overlay);
         if (session == nullptr)
             return nullptr;
         auto server = std::unique_ptr<Server>(new Server(session, std::move(mount)));

@@ -27,15 +27,25 @@ Sentence cannotPresent(int error)
 
 }  // namespace
 
-Result<TrialDisk, Sentence> TrialDisk::of(int disk, ByteRange region, const OverlayRoom& room)
+Result<TrialDisk, Sentence> TrialDisk::of(int disk, ByteRange region, const OverlayRoom& room,
+                                          const std::function<bool()>& isStopped)
 {
     auto overlay = Overlay::over(disk, region, room);
     if (!overlay)
         return cannotKeep(room, overlay.error());
     auto file = OverlayFile::present(**overlay);
-    if (!file)
-        return cannotPresent(file.error());
-    return TrialDisk(*std::move(overlay), *std::move(file));
+    if (file)
+        return TrialDisk(*std::move(overlay), *std::move(file));
+    auto copy = FullCopy::of(disk, region, room, isStopped);
+    if (copy)
+        return TrialDisk(*std::move(copy));
+    if (copy.error() == ENOSPC)
+        return Sentence{
+            "this system cannot show a disk through FUSE, and there is no room for a "
+            "copy of the image in %1$@",
+            room.directory.native(),
+            {}};
+    return cannotPresent(file.error());
 }
 
 }  // namespace pellar

@@ -39,8 +39,8 @@ struct PartitionTable {
 // Both only read, from any thread, and leave the descriptor open. Contents that make no sense count
 // as none.
 
-/// Nothing for an empty range. Ambiguous contents (signatures of two file systems) are nothing, too:
-/// a guess could be the wrong one, and a tool let loose on it would destroy what is there.
+/// Nothing for an empty range. Ambiguous contents (signatures of two file systems) are nothing,
+/// too: a guess could be the wrong one, and a tool let loose on it would destroy what is there.
 [[nodiscard]] Superblock readSuperblock(int descriptor, ByteRange range);
 /// Of a whole disk.
 [[nodiscard]] std::optional<PartitionTable> readPartitionTable(int descriptor);

@@ -51,6 +51,20 @@ struct LogReading {
     std::unique_ptr<OutputReader> (*makeReader)();
 };
 
+/// A file to which a repair gave a name of its own.
+struct CollectedFile {
+    std::string name;  ///< any bytes
+    std::uint64_t bytes = 0;
+};
+
+/// How the directory is listed in which a repair collects files that have lost their names.
+struct CollectedFilesReading {
+    std::string_view program;
+    std::vector<std::string> (*arguments)(const std::string& disk);
+    /// Of a line of what it prints.
+    std::optional<CollectedFile> (*fileIn)(std::string_view line);
+};
+
 /// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
 /// any thread.
 struct Tool {
@@ -75,6 +89,8 @@ struct Tool {
     Judgement (*judge)(const RunEvidence& evidence);
     /// Null where a verification leaves nothing out of a log, or no tool can read it.
     const LogReading* logReading = nullptr;
+    /// Null where no tool can list it.
+    const CollectedFilesReading* collectedFiles = nullptr;
 
     bool repairs(RepairWay way) const
     {

@@ -76,7 +76,9 @@ Sentence unchangedBecause(UndoFault fault)
             return {"nothing was changed: the saved bytes are damaged", {}, {}};
         case Cause::RecordFailed: break;
     }
-    return {"nothing was changed: the bytes to be saved cannot be kept (%1$@)", error, {}};
+    return {"nothing was changed: the bytes kept for undoing cannot be written or read (%1$@)",
+            error,
+            {}};
 }
 
 UndoRecord::UndoRecord(UndoRecord&& other) noexcept

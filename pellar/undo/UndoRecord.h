@@ -32,7 +32,7 @@ struct UndoFailure {
 /// later.
 ///
 /// The record is locked for as long as this object lives. Its work takes up to three buffers of a
-/// mebibyte, and 16 bytes a range. One thread at a time; it blocks.
+/// mebibyte, and 32 bytes a range. One thread at a time; it blocks.
 class UndoRecord {
 public:
     UndoRecord(UndoRecord&& other) noexcept;

@@ -223,9 +223,11 @@ std::size_t UndoStore::removeBeyond(const RecordLimits& limits,
     for (auto record = list.records.rbegin(); record != list.records.rend(); ++record) {
         const bool isBeyond = records > limits.records || bytes > limits.bytes ||
                               now - record->facts.repair.time > limits.age;
-        if (!isBeyond || record->isInUse || record->facts.state != RecordState::Applied)
+        if (!isBeyond || record->isInUse)
             continue;
-        if (!remove(record->id))
+        const auto directory = openLocked(record->id);
+        const auto facts = directory ? factsIn(*directory) : std::nullopt;
+        if (!facts || facts->state != RecordState::Applied || directory->remove() != 0)
             continue;
         --records;
         bytes -= record->facts.changedBytes;

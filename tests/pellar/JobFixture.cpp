@@ -107,6 +107,13 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image, std
     return disk;
 }
 
+JobOptions tryingIn(const std::filesystem::path& directory)
+{
+    JobOptions options;
+    options.trials.room.directory = directory;
+    return options;
+}
+
 JobFixture::JobFixture(JobOptions options)
     : manager(loop, texts, [this, &options] {
           options.commandTrace = [this](std::string_view line) {

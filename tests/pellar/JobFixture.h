@@ -93,6 +93,9 @@ JobOptions with(T JobOptions::*option, std::type_identity_t<T> value)
     return options;
 }
 
+/// By which repairs are tried, and kept to be undone, below this directory.
+JobOptions tryingIn(const std::filesystem::path& directory);
+
 /// One library, one listener, one loop.
 struct JobFixture {
     explicit JobFixture(JobOptions options = {});

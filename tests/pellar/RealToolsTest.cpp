@@ -105,8 +105,7 @@ TEST_P(RealTools, SayWhatIsTrue)
 /// A library that tries repairs before it applies them.
 JobOptions trying(const test::TestDirectory& directory, RepairPolicy& policy)
 {
-    JobOptions options;
-    options.trials.room.directory = directory.path("repairs");
+    JobOptions options = test::tryingIn(directory.path("repairs"));
     options.repairPolicy = [&policy] {
         return policy;
     };
@@ -340,6 +339,24 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         EXPECT_EQ(library.listener.verdict, "sound") << "after";
         EXPECT_EQ(library.listener.finished, 5);
     }
+}
+
+TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
+{
+    const test::TestDirectory directory;
+    const auto image = makeVolume(directory, {});
+    directory.damage(image, "unlink f3");
+    RepairPolicy policy;
+    policy.isPreview = true;
+    test::JobFixture library(trying(directory, policy));
+    ASSERT_EQ(library.repair(test::reference(image)), 0);
+    EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
+    EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
+    const auto& told = library.listener.dictionaries;
+    EXPECT_TRUE(std::ranges::any_of(told, [](const contract::Dictionary& message) {
+        return message.string(contract::kFsckMessageString) ==
+               "After the repair: no damage is left; 1 file is now in lost+found.";
+    }));
 }
 
 TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)

@@ -2,6 +2,7 @@
 //
 // A disk that is written to without being written to.
 
+#include "pellar/overlay/FullCopy.h"
 #include "pellar/overlay/OverlayFile.h"
 #include "tests/pellar/JobFixture.h"
 
@@ -144,6 +145,36 @@ TEST(Overlay, KnowsWhereTheDiskCannotBeRead)
     EXPECT_EQ(disk.overlay->read(110'000, bytes), EIO);
     EXPECT_EQ(disk.overlay->firstUnreadable(), 110'000U);
     EXPECT_FALSE(disk.overlay->differences()) << "nobody knows what stands below what was written";
+}
+
+// Holes are left out of it, and what is written into a hole, or over with zeros, is told.
+TEST(FullCopy, IsTheImageWithWhatWasWrittenToIt)
+{
+    constexpr ByteRange part{4'096, 40U << 20U};
+    const TestDirectory directory;
+    const auto image = directory.makeFile("disk", 64U << 20U);
+    orvane::test::patch(image, part.offset + (9U << 20U), std::string(5'000, 'x'));
+    orvane::test::patch(image, 60U << 20U, "beyond");
+    const std::string before = contentsOf(image);
+    const FileDescriptor disk(::open(image.c_str(), O_RDONLY | O_CLOEXEC));
+    const auto isStopped = [] {
+        return false;
+    };
+    const auto copy = FullCopy::of(disk.get(), part, {directory.path("room")}, isStopped);
+    ASSERT_TRUE(copy) << copy.error();
+    EXPECT_TRUE((*copy)->differences()->empty());
+    const int file = (*copy)->descriptor();
+    EXPECT_EQ(::pwrite(file, "new", 3, 30 << 20), 3);
+    EXPECT_EQ(::pwrite(file, std::string(600, '\0').data(), 600, 9 << 20), 600);
+    EXPECT_EQ(*(*copy)->differences(),
+              (std::vector<ByteRange>{{9U << 20U, 1'024}, {30U << 20U, 512}}));
+    EXPECT_TRUE(contentsOf(image) == before);
+    const auto tooLarge = FullCopy::of(disk.get(), part, {directory.path("room"), 100}, isStopped);
+    EXPECT_TRUE(tooLarge || tooLarge.error() == ENOSPC) << "or its blocks are shared";
+    const auto stopped = FullCopy::of(disk.get(), part, {directory.path("room")}, [] {
+        return true;
+    });
+    EXPECT_TRUE(stopped || stopped.error() == ECANCELED);
 }
 
 /// The tool's own way: by the name of a descriptor that it inherits.

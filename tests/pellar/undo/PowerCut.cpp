@@ -43,7 +43,7 @@ int CachedDisk::read(std::uint64_t place, std::span<std::uint8_t> bytes)
 int CachedDisk::write(std::uint64_t place, ByteView bytes)
 {
     ++writes;
-    if (failingWrites.contains(writes) || writes >= failingFrom)
+    if (failingWrites.contains(writes) || writes >= failingFrom || place == badPlace)
         return EIO;
     if (writes == lostWrite)
         return 0;

@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <functional>
 #include <map>
+#include <optional>
 #include <random>
 #include <set>
 #include <string>
@@ -36,8 +37,9 @@ public:
     // Faults. Writes are counted from 1.
     int writes = 0;
     std::set<int> failingWrites;
-    int failingFrom = 1 << 30;  ///< all writes from this one on
-    int lostWrite = 0;          ///< told to be written, and is not
+    int failingFrom = 1 << 30;              ///< all writes from this one on
+    std::optional<std::uint64_t> badPlace;  ///< no write that begins there succeeds
+    int lostWrite = 0;                      ///< told to be written, and is not
     int failingSyncs = 0;
     int failingReadsFrom = 1 << 30;
     int reads = 0;

@@ -335,6 +335,9 @@ TEST(UndoRecord, ADiskThatDoesNotTakeTheRepairIsPutBack)
          {Case{[](CachedDisk& disk) { disk.failingWrites = {2}; },
                "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
                "a write fails once"},
+          Case{[](CachedDisk& disk) { disk.badPlace = 4096; },
+               "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
+               "a place cannot be written, and still has what it had"},
           Case{[](CachedDisk& disk) { disk.failingSyncs = 1; },
                "nothing was changed: the disk cannot be written (%1$@)", Left::Unchanged,
                "the cache cannot be written"},
@@ -373,6 +376,15 @@ TEST(UndoRecord, ADiskThatDoesNotTakeTheRepairIsPutBack)
     }
 }
 
+TEST(UndoRecord, WhatCanBePutBackIs)
+{
+    World world;
+    UndoRecord record = world.save();
+    world.disk.failingWrites = {3, 4};  // the third range, and putting back the first
+    EXPECT_FALSE(record.apply(world.disk));
+    EXPECT_EQ(world.disk.medium, repaired(oldDisk(), {ranges.front()}));
+}
+
 TEST(UndoRecord, UndoAndFinishAreTakenUpAgainAfterAFailure)
 {
     World world;
@@ -394,34 +406,40 @@ TEST(UndoRecord, UndoAndFinishAreTakenUpAgainAfterAFailure)
 
 TEST(UndoRecord, ADiskThatWasChangedSinceIsNotWritten)
 {
+    const auto expectRefusal = [](World& world, const auto& work) {
+        const std::string disk = world.disk.cached;
+        const auto done = work();
+        ASSERT_FALSE(done);
+        EXPECT_EQ(done.error().sentence.key, "nothing was changed: the disk was changed since");
+        EXPECT_EQ(world.disk.cached, disk);
+    };
     // A byte that the repair changes, in the last range; one that stays as it is; the disk's end.
     for (const std::size_t place : {std::size_t{6191}, std::size_t{5005}, std::size_t{6192}}) {
-        const auto expectRefusal = [place](World& world, const auto& work) {
-            if (place == world.disk.cached.size())
-                world.disk.cached.pop_back();
+        const auto change = [place](CachedDisk& disk) {
+            if (place == disk.cached.size())
+                disk.cached.pop_back();
             else
-                world.disk.cached[place] = '#';
-            const std::string disk = world.disk.cached;
-            const auto done = work();
-            ASSERT_FALSE(done);
-            EXPECT_EQ(done.error().sentence.key, "nothing was changed: the disk was changed since");
-            EXPECT_EQ(world.disk.cached, disk);
+                disk.cached[place] = '#';
         };
         World fresh;
-        expectRefusal(fresh, [&] { return fresh.save().apply(fresh.disk); });
-        EXPECT_TRUE(place != 6191 || fresh.store->list().records.empty());
+        {
+            UndoRecord record = fresh.save();
+            change(fresh.disk);
+            expectRefusal(fresh, [&] { return record.apply(fresh.disk); });
+        }
+        EXPECT_TRUE(fs::is_empty(fresh.storePath()));
+
         World applied;
-        const std::string id = applied.apply();
-        expectRefusal(applied, [&] { return applied.store->take(id)->undo(applied.disk); });
-        EXPECT_EQ(applied.store->list().records.at(0).facts.state, RecordState::Applied);
+        auto record = applied.store->take(applied.apply());
+        change(applied.disk);
+        expectRefusal(applied, [&] { return record->undo(applied.disk); });
+        EXPECT_EQ(record->facts().state, RecordState::Applied);
+
         World interrupted;
-        const std::string other = interrupted.interrupt();
-        for (const Way way : {Way::Undo, Way::Finish})
-            expectRefusal(interrupted, [&] {
-                auto record = interrupted.store->take(other);
-                return way == Way::Undo ? record->undo(interrupted.disk)
-                                        : record->finish(interrupted.disk);
-            });
+        auto other = interrupted.store->take(interrupted.interrupt());
+        change(interrupted.disk);
+        expectRefusal(interrupted, [&] { return other->undo(interrupted.disk); });
+        expectRefusal(interrupted, [&] { return other->finish(interrupted.disk); });
     }
 }
 
@@ -459,8 +477,9 @@ TEST(UndoStore, WithoutRoomNothingIsTouched)
     World world;
     {
         const FileSizeLimit limit(4000);
-        EXPECT_EQ(world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
-                  "nothing was changed: the bytes to be saved cannot be kept (%1$@)");
+        EXPECT_EQ(
+            world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
+            "nothing was changed: the bytes kept for undoing cannot be written or read (%1$@)");
     }
     EXPECT_TRUE(fs::is_empty(world.storePath()));
     {
@@ -611,10 +630,14 @@ TEST(UndoStore, KeepsToLimitsAndNeverRemovesWhatIsInterrupted)
         return days;
     };
     EXPECT_EQ(kept({5, 200h, 1 << 20}), (std::vector{4, 3, 2, 1, 0}));
-    EXPECT_EQ(kept({5, 90h, 1 << 20}), (std::vector{4, 3, 2, 0})) << "age";
-    EXPECT_EQ(kept({5, 200h, 4705 + 200}), (std::vector{4, 3, 0})) << "bytes";
-    const auto inUse = world.store->take(world.store->list().records.at(1).id);
-    EXPECT_EQ(kept({0, 0h, 0}), (std::vector{3, 0})) << "number, and what is in use";
+    EXPECT_EQ(kept({4, 200h, 1 << 20}), (std::vector{4, 3, 2, 0})) << "number";
+    EXPECT_EQ(kept({5, 60h, 1 << 20}), (std::vector{4, 3, 0})) << "age";
+    EXPECT_EQ(kept({5, 200h, 4705 + 100}), (std::vector{4, 0})) << "bytes";
+    {
+        const auto inUse = world.store->take(world.store->list().records.at(0).id);
+        EXPECT_EQ(kept({0, 0h, 0}), (std::vector{4, 0}));
+    }
+    EXPECT_EQ(kept({0, 0h, 0}), (std::vector{0}));
 }
 
 }  // namespace
