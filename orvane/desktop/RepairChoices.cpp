@@ -18,18 +18,14 @@ constexpr pellar::Task repairOfVolume{pellar::Subject::Filesystem, pellar::Opera
 
 }  // namespace
 
-// The module repairs the map of a device that is selected whole; that is not tried first.
 std::string RepairChoices::reasonAgainstPreview()
 {
     if (at_.controller.interfaceLock())
         return text("Not available while a job runs.");
-    const auto disks = disks_.selected();
-    if (disks.empty())
+    if (disks_.selected().empty())
         return text("Select a disk first.");
     if (!kept_.canTry())
         return text("There is no place to keep what a repair would write.");
-    if (std::ranges::any_of(disks, [](const auto& disk) { return disk->isWhole(); }))
-        return text("Select volumes only: the repair of a partition map has no preview.");
     const QtButton* const button = at_.tabs.button(contract::outlet::repairDisk);
     if (button != nullptr && button->isEnabled())
         return {};
