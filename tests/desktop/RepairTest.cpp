@@ -142,6 +142,23 @@ TEST_F(RepairTest, ARepairIsPreviewedDoneAndTakenBack)
     EXPECT_NE(whyGrey("undoRepair"), "") << "what was put back is not kept any longer";
 }
 
+TEST_F(RepairTest, TheRepairOfAMapIsTakenBack)
+{
+    const std::string image = makePartitionedImage("partitioned");
+    orvane::test::patch(image, 0, std::string(1024, '\0'));
+    const std::string before = contentsOf(image);
+    open({image});
+    select(image);
+    command("repairMap").trigger();
+    ASSERT_TRUE(waitForJob());
+    ASSERT_TRUE(waitUntil([&] { return whyGrey("undoRepair").empty(); })) << whyGrey("undoRepair");
+    EXPECT_FALSE(contentsOf(image) == before);
+    command("undoRepair").trigger();
+    answer("undoQuestion", "Undo Repair");
+    EXPECT_TRUE(waitUntil([&] { return contentsOf(image) == before; }));
+    ASSERT_TRUE(isFree());
+}
+
 TEST_F(RepairTest, WhatIsNotProvenIsAppliedOnlyWhereTheUserSaysSoTwice)
 {
     const std::string image = makeImage("image");
