@@ -4,6 +4,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
 
+#include <algorithm>
 #include <chrono>
 #include <system_error>
 #include <utility>
@@ -76,6 +77,14 @@ const ListedRecord* RepairRecords::newestOf(const DiskFacts& disk) const
     const pellar::RecordedRepair& repair = newest->facts.repair;
     const bool isUsers = user_ == 0 || repair.user == user_;
     return isUsers && !mayBeAnother(repair.disk, wanted) ? newest : nullptr;
+}
+
+bool RepairRecords::hasInterrupted() const
+{
+    const auto isInterrupted = [](const pellar::RecordList& list) {
+        return std::ranges::any_of(list.records, &ListedRecord::isInterrupted);
+    };
+    return isInterrupted(ofVolumes_) || isInterrupted(ofMaps_);
 }
 
 // The record's time is kept in whole seconds, so it may lie before the run's, and other runs may

@@ -21,6 +21,8 @@ public:
     /// its partition map. Null where there is none, or where it may be another disk's of this name.
     /// Valid as long as this object.
     [[nodiscard]] const pellar::ListedRecord* newestOf(const DiskFacts& disk) const;
+    /// Of any disk.
+    [[nodiscard]] bool hasInterrupted() const;
 
 private:
     pellar::RecordList ofVolumes_;

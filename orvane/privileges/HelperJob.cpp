@@ -236,6 +236,7 @@ private:
             return [mark = printer_.markOf(advice)](const DiskReference&) { return mark; };
         };
         trials.howToUndo = asked(Advice::Undo);
+        trials.howToUndoPermissions = asked(Advice::Undo);
         trials.howToApply = asked(Advice::Apply);
         trials.howToRepairDirectly = asked(Advice::RepairDirectly);
         return trials;

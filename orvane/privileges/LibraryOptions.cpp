@@ -66,9 +66,10 @@ void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairA
                              std::chrono::hours(24 * settings.keptRepairDays),
                              settings.keptRepairMegabytes << 20U};
     options.trials.howToUndo = advice.undo;
+    options.trials.howToUndoPermissions = advice.undoPermissions;
     options.trials.howToApply = advice.apply;
     options.trials.howToRepairDirectly = advice.repairDirectly;
-    options.repairPolicy = [isThorough = settings.verifiesThoroughly] {
+    options.repairPolicy = [isThorough = settings.thoroughVerification] {
         pellar::RepairPolicy policy;
         policy.isThorough = isThorough;
         return policy;
@@ -85,9 +86,8 @@ pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& te
     if (const std::string path = toolPathFromEnvironment(refused); !path.empty())
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
-    if (!paths.state.empty()) {
+    if (!paths.state.empty())
         options.permissionReferences = paths.state / "permissions";
-    }
     setTrials(options, paths, advice);
     const auto launcher = helperLauncher();
     if (!launcher.empty())

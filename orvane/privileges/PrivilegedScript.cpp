@@ -265,7 +265,10 @@ void PrivilegedScript::take(pellar::Event event)
 std::string PrivilegedScript::sentenceFor(Advice advice) const
 {
     switch (advice) {
-        case Advice::Undo: return pellar::adviceFor(job_.disk, launch_.advice.undo);
+        case Advice::Undo:
+            return pellar::adviceFor(job_.disk, job_.task.subject == pellar::Subject::Permissions
+                                                    ? launch_.advice.undoPermissions
+                                                    : launch_.advice.undo);
         case Advice::Apply: return pellar::adviceFor(job_.disk, launch_.advice.apply);
         case Advice::RepairDirectly: break;
     }

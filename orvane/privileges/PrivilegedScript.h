@@ -25,6 +25,7 @@ struct Asking {
 /// empty.
 struct RepairAdvice {
     pellar::Trials::Advice undo;
+    pellar::Trials::Advice undoPermissions;
     pellar::Trials::Advice apply;
     pellar::Trials::Advice repairDirectly;
 };

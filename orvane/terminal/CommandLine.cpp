@@ -126,6 +126,11 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
     if (treatsMaps(text.command))
         command.add_flag("--partition-map", request.treatsPartitionMap,
                          "Treat the disk's partition map (GPT or MBR) instead of its volumes");
+    if (text.command == Command::Undo)
+        command
+            .add_flag("--permissions", request.treatsPermissions,
+                      "Take back what repair-permissions did")
+            ->excludes("--partition-map");
     if (text.command == Command::Verify)
         command.add_flag("--thorough", request.repairPolicy.isThorough,
                          "Try a repair as well where reading finds nothing");

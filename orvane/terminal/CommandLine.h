@@ -47,6 +47,7 @@ struct Request {
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
+    bool treatsPermissions = false;    ///< of installed files; to undo alone
     pellar::RepairPolicy repairPolicy;  ///< the image to keep is named by an absolute path
     bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences

@@ -113,6 +113,10 @@ RepairAdvice Session::repairAdvice() const
                                names_.nameOf(disk.identifier));
             },
             [this, command](const contract::DiskReference& disk) {
+                return command("To take the repair back: %1$@", "undo --permissions", disk,
+                               names_.nameOf(disk.identifier));
+            },
+            [this, command](const contract::DiskReference& disk) {
                 return command("To apply it although damage would be left, which can be undone as "
                                "well: %1$@",
                                "repair --apply-unproven", disk, names_.namedOf(disk.identifier));

@@ -92,6 +92,14 @@ Result<std::shared_ptr<Disk>, std::string> diskFor(const Request& request, const
     return volumeIn(image.top(), number, session, named.name);
 }
 
+pellar::Subject subjectOf(const Request& request)
+{
+    if (request.treatsPermissions)
+        return pellar::Subject::Permissions;
+    return request.treatsPartitionMap ? pellar::Subject::PartitionMap
+                                      : pellar::Subject::Filesystem;
+}
+
 int treat(const Request& request, const NamedDisk& named, const std::string& number,
           Session& session, Reporter& reporter)
 {
@@ -101,8 +109,7 @@ int treat(const Request& request, const NamedDisk& named, const std::string& num
         reporter.failure(named.name, disk.error());
         return exitUnchecked;
     }
-    const pellar::Task task{request.treatsPartitionMap ? pellar::Subject::PartitionMap
-                                                       : pellar::Subject::Filesystem,
+    const pellar::Task task{subjectOf(request),
                             request.command == Command::Undo ? pellar::Operation::Undo
                                                              : pellar::Operation::Finish};
     const RunEnd end = session.carryOut(task, *disk);

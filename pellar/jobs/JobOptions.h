@@ -55,6 +55,7 @@ struct Trials {
     /// main thread runs. May be empty, and answer nothing, which is not told.
     using Advice = std::function<std::string(const contract::DiskReference&)>;
     Advice howToUndo;            ///< how a repair is taken back
+    Advice howToUndoPermissions;  ///< how one of permissions is
     Advice howToApply;           ///< how one is applied that is not proven
     Advice howToRepairDirectly;  ///< how one is done without a trial
 };

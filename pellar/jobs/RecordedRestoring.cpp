@@ -174,8 +174,8 @@ void RecordedRestoring::finish()
     const Trials& trials = context_.options.trials;
     if (const auto records = PermissionRecords::open(permissionRecordsIn(trials)))
         records->removeBeyond(trials.limits, std::chrono::system_clock::now());
-    if (isKept && !trials.howToUndo.empty())
-        log_.remark(trials.howToUndo);
+    if (isKept)
+        context_.advise(trials.howToUndoPermissions);
 }
 
 }  // namespace pellar

@@ -83,11 +83,19 @@ void removeLeftOver(const RecordDirectory& directory)
         (void)directory.remove();  // it is tried again with the next listing
 }
 
-bool isSameDisk(const RecordedDisk& a, const RecordedDisk& b)
+/// A copy of the disk has its UUID as well; so by that alone it is known only where its own place
+/// is empty.
+bool isSameDisk(const RecordedDisk& recorded, const RecordedDisk& disk)
 {
-    if (a.length != b.length)
+    if (recorded.length != disk.length)
         return false;
-    return (a.path == b.path && a.offset == b.offset) || (!a.uuid.empty() && a.uuid == b.uuid);
+    const bool hasOtherIdentity =
+        !recorded.uuid.empty() && !disk.uuid.empty() && recorded.uuid != disk.uuid;
+    if (recorded.path == disk.path)
+        return recorded.offset == disk.offset && !hasOtherIdentity;
+    std::error_code error;
+    return !recorded.uuid.empty() && recorded.uuid == disk.uuid &&
+           !std::filesystem::exists(recorded.path, error) && !error;
 }
 
 }  // namespace

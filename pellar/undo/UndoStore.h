@@ -32,8 +32,8 @@ struct RecordList {
     std::vector<std::string> broken;
 };
 
-/// The newest of this disk: at the same place of the same path, or with the same UUID and length
-/// wherever it is now. Null when there is none.
+/// The newest of this disk: at the same place of the same path; or with the same UUID and length
+/// where that path is no longer there. Null when there is none. Looks whether paths exist.
 [[nodiscard]] const ListedRecord* newestOf(const RecordedDisk& disk, const RecordList& list);
 
 /// What may be kept.

@@ -3,6 +3,7 @@
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
+//   write-in-repair TEXT: at the beginning of the disk, when it was called with -a or -y
 //   say-in-repair TEXT: when it was called with -a or -y
 //   await NAME: until there is such a file beside it
 //   await-in-repair NAME: the same, when it was called with -a or -y
@@ -77,6 +78,13 @@ bool isRepairing()
     return false;
 }
 
+void writeToDisk(const std::string& text)
+{
+    const int disk = ::open("/proc/self/fd/3", O_WRONLY | O_CLOEXEC);
+    put(disk, text);
+    ::close(disk);
+}
+
 void await(const std::string& name)
 {
     const auto self = std::filesystem::read_symlink("/proc/self/exe");
@@ -95,6 +103,8 @@ void act(const std::string& action, const std::string& text, char** arguments)
     const int number = std::atoi(text.c_str());
     if (action == "say" || (action == "say-in-repair" && isRepairing()))
         put(STDOUT_FILENO, text + "\n");
+    else if (action == "write-in-repair" && isRepairing())
+        writeToDisk(text);
     else if (action == "progress")
         put(4, text + "\n");
     else if (action == "exit")

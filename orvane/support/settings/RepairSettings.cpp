@@ -34,8 +34,8 @@ RepairSettings readRepairSettings(const std::filesystem::path& file)
     take(settings, "keptRepairs", read.keptRepairs);
     take(settings, "keptRepairDays", read.keptRepairDays);
     take(settings, "keptRepairMegabytes", read.keptRepairMegabytes);
-    const auto thorough = settings.find("verifiesThoroughly");
-    read.verifiesThoroughly =
+    const auto thorough = settings.find("thoroughVerification");
+    read.thoroughVerification =
         thorough != settings.end() && thorough->is_boolean() && thorough->get<bool>();
     return read;
 }

@@ -12,7 +12,7 @@ struct RepairSettings {
     std::uint64_t keptRepairDays = 90;
     std::uint64_t keptRepairMegabytes = 4096;  ///< of 2^20 bytes, all repairs together
     /// A verification that finds nothing tries a repair as well.
-    bool verifiesThoroughly = false;
+    bool thoroughVerification = false;
 
     friend bool operator==(const RepairSettings&, const RepairSettings&) = default;
 };
