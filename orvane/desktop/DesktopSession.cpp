@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
-#include "orvane/privileges/LibraryOptions.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <cstdio>

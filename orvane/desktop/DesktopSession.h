@@ -6,6 +6,7 @@
 #include "orvane/desktop/ModuleHints.h"
 #include "orvane/desktop/RepairChoices.h"
 #include "orvane/desktop/RepairUndoing.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
 #include <chrono>

@@ -36,6 +36,7 @@ protected:
                                     return "type: undo " + disk.name;
                                 },
                                 {},
+                                {},
                                 {}}};
         job_ = std::make_unique<pellar::Job>(
             [this, how, job](pellar::StopSwitch& stop, pellar::EventQueue& road) {

@@ -59,7 +59,9 @@ protected:
                                   {"usr/share/games/ping", 0755},
                                   {"usr/bin/two", 0755}});
         options_ = test::tryingIn(state_.path("trials"));
-        options_.trials.howToUndo = "This is how.";
+        options_.trials.howToUndoPermissions = [](const contract::DiskReference&) {
+            return "This is how.";
+        };
         damage();
     }
 
