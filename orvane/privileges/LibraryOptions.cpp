@@ -49,10 +49,12 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
 }
 
 /// Root's repairs are kept with those that the helper makes for others, so that root sees them all;
-/// unless a directory of root's own is asked for.
+/// unless other directories are asked for.
 std::filesystem::path repairsDirectory(const XDGPaths& paths)
 {
-    if (::geteuid() == 0 && !environmentValue("XDG_STATE_HOME"))
+    const bool isUsual =
+        !environmentValue("XDG_STATE_HOME") && paths.state == userXDGPaths().state;
+    if (::geteuid() == 0 && isUsual)
         return systemRepairs;
     return fileIn(paths.state, "repairs");
 }

@@ -87,10 +87,10 @@ TEST(RepairSettings, WhatIsNoSensibleNumberIsAsItWas)
     const auto file = directory / "settings.json";
     EXPECT_EQ(readRepairSettings(file), RepairSettings()) << "no file";
     test::write(file, R"({"keptRepairs": 3, "keptRepairDays": 0, "keptRepairMegabytes": 10,
-                    "verifiesThoroughly": true})");
+                    "thoroughVerification": true})");
     EXPECT_EQ(readRepairSettings(file), (RepairSettings{3, 0, 10, true}));
     test::write(file, R"({"keptRepairs": -1, "keptRepairDays": "3", "keptRepairMegabytes": 1e30,
-                    "verifiesThoroughly": "perhaps"})");
+                    "thoroughVerification": "perhaps"})");
     EXPECT_EQ(readRepairSettings(file), RepairSettings());
     test::write(file, R"({"keptRepairs": 99999999999999999999})");
     EXPECT_EQ(readRepairSettings(file), RepairSettings());

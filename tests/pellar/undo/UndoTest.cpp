@@ -612,14 +612,27 @@ TEST(UndoStore, KeepsToLimitsAndNeverRemovesWhatIsInterrupted)
         auto record = world.store->save(repair, {{8, 100}}, world.disk, world.disk);
         ASSERT_TRUE(record && record->apply(world.disk));
     }
-    repair.disk.uuid = "other";
     repair.disk.path = "/dev/sd2";
     const RecordList list = world.store->list();
-    EXPECT_EQ(newestOf(repair.disk, list)->facts.repair.time, today + 2 * 24h) << "by its path";
-    repair.disk.offset = 512;
-    EXPECT_EQ(newestOf(repair.disk, list), nullptr);
-    repair.disk.uuid = "1234-ABCD";
-    EXPECT_EQ(newestOf(repair.disk, list)->facts.repair.time, today + 4 * 24h) << "by its UUID";
+    const auto dayOf = [&](const std::string& uuid, std::uint64_t offset) {
+        repair.disk.uuid = uuid;
+        repair.disk.offset = offset;
+        const ListedRecord* const newest = newestOf(repair.disk, list);
+        return newest == nullptr ? 0 : (newest->facts.repair.time - today) / 24h;
+    };
+    EXPECT_EQ(dayOf("", 0), 2) << "by its path";
+    EXPECT_EQ(dayOf("other", 0), 0) << "another file system has its place";
+    EXPECT_EQ(dayOf("", 512), 0);
+    repair.disk.path = "/dev/elsewhere";
+    EXPECT_EQ(dayOf("1234-ABCD", 0), 4) << "by its UUID";
+    world.directory.write("there", "");
+    repair.disk.path = world.directory.path("there");
+    repair.time = today + 5 * 24h;
+    ASSERT_TRUE(world.store->save(repair, {{8, 100}}, world.disk, world.disk)->apply(world.disk));
+    repair.disk.path = "/dev/elsewhere";
+    EXPECT_EQ(newestOf(repair.disk, world.store->list())->facts.repair.time, today + 4 * 24h)
+        << "a copy has the UUID, too";
+    ASSERT_TRUE(world.store->remove(world.store->list().records.front().id));
 
     const auto now = today + 5 * 24h;
     const auto kept = [&](RecordLimits limits) {
