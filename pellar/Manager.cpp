@@ -26,6 +26,11 @@ std::unique_ptr<contract::PLRepairDisk> Manager::makeRepairDisk()
     return tool;
 }
 
+std::unique_ptr<RepairDisk> Manager::makeTool(contract::PLAsyncDelegate& delegate)
+{
+    return std::make_unique<RepairDisk>(loop_, texts_, options_, delegate);
+}
+
 void Manager::cancelAgain()
 {
     if (const auto tool = latest_.lock())
@@ -39,12 +44,14 @@ bool Manager::canVerify(std::string_view filesystemType) const
 
 bool Manager::canRepair(std::string_view filesystemType) const
 {
-    return capabilityFor(filesystemType, Operation::Repair, options_.toolPath).isGiven();
+    return capabilityFor(filesystemType, Operation::Repair, options_.toolPath, repairWay())
+        .isGiven();
 }
 
 std::string Manager::reasonAgainst(std::string_view filesystemType, Operation operation) const
 {
-    return capabilityFor(filesystemType, operation, options_.toolPath).reason.in(texts_);
+    return capabilityFor(filesystemType, operation, options_.toolPath, repairWay())
+        .reason.in(texts_);
 }
 
 bool Manager::canVerifyLive(std::string_view filesystemType) const

@@ -25,6 +25,9 @@ public:
     /// Null when there is no delegate yet.
     std::unique_ptr<contract::PLRepairDisk> makeRepairDisk() override;
 
+    /// For the host's own jobs: what they tell goes to this delegate, which outlives them.
+    [[nodiscard]] std::unique_ptr<RepairDisk> makeTool(contract::PLAsyncDelegate& delegate);
+
     /// Presses the running job of the tool that was made last harder to end; nothing happens when
     /// none runs.
     void cancelAgain();
@@ -46,6 +49,8 @@ public:
     std::string reasonAgainstPartitionMap(const contract::DiskReference& disk) const;
 
 private:
+    RepairWay repairWay() const { return repairWayFor(options_, policyFor(options_)); }
+
     contract::RunLoop& loop_;
     const Texts& texts_;
     const JobOptions options_;

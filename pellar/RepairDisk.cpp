@@ -7,6 +7,8 @@
 #include "pellar/jobs/PartOfImageScript.h"
 #include "pellar/jobs/PartitionMapScript.h"
 #include "pellar/jobs/PermissionsScript.h"
+#include "pellar/jobs/PermissionsUndoScript.h"
+#include "pellar/jobs/UndoScript.h"
 #include "pellar/jobs/VolumeScript.h"
 #include "pellar/packages/InstalledSystem.h"
 #include "pellar/partitions/MapDisk.h"
@@ -41,8 +43,9 @@ bool needsPrivileges(Task task, const contract::DiskReference& disk, const Syste
     if (::geteuid() == 0 || ::stat(disk.path.c_str(), &status) != 0 || !S_ISBLK(status.st_mode))
         return false;
     if (task.subject == Subject::Permissions)
-        return task.isRepair();
-    return ::access(disk.path.c_str(), task.isRepair() ? R_OK | W_OK : R_OK) != 0 ||
+        return task.operation != Operation::Verify;
+    const bool isRead = accessFor(task.operation) == Access::ReadOnly;
+    return ::access(disk.path.c_str(), isRead ? R_OK : R_OK | W_OK) != 0 ||
            !mountsOf(status.st_rdev, paths).empty();
 }
 
@@ -54,6 +57,12 @@ bool holdsDirectory(const std::vector<Mount>& places, const std::filesystem::pat
     return holder && std::any_of(places.begin(), places.end(), [&](const Mount& place) {
                return place.target == holder->target;
            });
+}
+
+bool isMountedAtRoot(const std::vector<Mount>& places)
+{
+    return std::any_of(places.begin(), places.end(),
+                       [](const Mount& place) { return place.target == "/"; });
 }
 
 bool answer(bool value, ErrorCode* error)
@@ -149,6 +158,8 @@ ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& dis
         return error;
     if (beginPrivileged(task, disk))
         return contract::kPLNoError;
+    if (task.isUndo())
+        return beginUndo(task, disk);
     switch (task.subject) {
         case Subject::Filesystem: return beginVolume(disk, task.operation);
         // The disk is claimed by the job: why it cannot be had is then said in the log, where a
@@ -162,7 +173,8 @@ ErrorCode RepairDisk::beginUnobserved(Task task, const DiskReferencePointer& dis
 
 ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation operation)
 {
-    auto claim = DiskClaim::attempt(*disk, accessFor(operation), options_.systemPaths);
+    auto claim =
+        DiskClaim::attempt(*disk, accessFor(operation, policyFor(options_)), options_.systemPaths);
     if (const auto* const error = std::get_if<ErrorCode>(&claim))
         return beginMounted(disk, operation, *error);
     VolumeRequest request{disk, operation, std::nullopt, {}, toolFor(disk->filesystem)};
@@ -173,6 +185,25 @@ ErrorCode RepairDisk::beginVolume(const DiskReferencePointer& disk, Operation op
     return contract::kPLNoError;
 }
 
+ErrorCode RepairDisk::beginUndo(Task task, const DiskReferencePointer& disk)
+{
+    if (task.subject == Subject::Permissions) {
+        start(disk, [=, this](StopSwitch& stop, EventQueue& events) {
+            return std::make_unique<PermissionsUndoScript>(disk, context(*disk, stop, events));
+        });
+        return contract::kPLNoError;
+    }
+    UndoRequest request{task, disk, {}};
+    if (task.subject == Subject::Filesystem)
+        request.mounts = mountsOf(disk->path, options_.systemPaths);
+    if (isMountedAtRoot(request.mounts))
+        return contract::kPLErrorCouldNotUnmount;
+    start(disk, [=, this](StopSwitch& stop, EventQueue& events) {
+        return std::make_unique<UndoScript>(request, context(*disk, stop, events));
+    });
+    return contract::kPLNoError;
+}
+
 /// NO when the job needs no other rights, or there is no way to them.
 bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
 {
@@ -180,7 +211,7 @@ bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
         return false;
     const auto& isAllowed = options_.archiveFetching.isAllowed;
     const bool fetches = task.subject == Subject::Permissions && isAllowed && isAllowed();
-    const PrivilegedJob job{task, *disk, nullptr, fetches};
+    const PrivilegedJob job{task, *disk, nullptr, fetches, policyFor(options_)};
     start(disk, [job, this](StopSwitch& stop, EventQueue& events) {
         return options_.privileged(job, stop, events);
     });
@@ -195,8 +226,7 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     if (error != contract::kPLErrorCouldNotUnmount && error != contract::kPLErrorDiskInUse)
         return error;
     auto mounts = mountsOf(disk->path, options_.systemPaths);
-    const bool isRoot = std::any_of(mounts.begin(), mounts.end(),
-                                    [](const Mount& place) { return place.target == "/"; });
+    const bool isRoot = isMountedAtRoot(mounts);
     const bool staysMounted =
         isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
@@ -250,10 +280,11 @@ ErrorCode RepairDisk::refusal(Task task, const DiskReferencePointer& disk) const
     if (!disk || disk->path.empty())
         return contract::kPLErrorNoDiskReference;
     if (task.subject == Subject::Permissions)
-        return refusalOfPermissions(*disk);
+        return task.operation == Operation::Finish ? contract::kPLErrorUnsupported
+                                                   : refusalOfPermissions(*disk);
     if (disk->isWhole != (task.subject == Subject::PartitionMap))
         return contract::kPLErrorUnsupported;
-    if (task.subject == Subject::Filesystem)
+    if (task.subject == Subject::Filesystem && !task.isUndo())
         traceTool(*disk, task.operation);
     return contract::kPLNoError;
 }
@@ -274,7 +305,8 @@ void RepairDisk::traceTool(const contract::DiskReference& disk, Operation operat
 {
     if (disk.filesystem.empty())
         return;
-    const Capability capability = capabilityFor(disk.filesystem, operation, options_.toolPath);
+    const Capability capability = capabilityFor(disk.filesystem, operation, options_.toolPath,
+                                                repairWayFor(options_, policyFor(options_)));
     trace(contract::printable(disk.filesystem) + ": " +
           (capability.isGiven() ? capability.program.string() : capability.reason.in(texts_)));
 }

@@ -41,17 +41,20 @@ public:
 
     void cancelCurrentOperation() override;
 
+    /// As the six above, and as they answer; of the tasks that a module does not know as well.
+    contract::ErrorCode begin(Task task, const contract::DiskReferencePointer& disk);
+
     /// Points here as long as the tool is there.
     std::weak_ptr<RepairDisk*> liveness() const { return self_; }
 
 private:
-    contract::ErrorCode begin(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode beginUnobserved(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode refusal(Task task, const contract::DiskReferencePointer& disk) const;
     contract::ErrorCode refusalOfPermissions(const contract::DiskReference& disk) const;
     bool beginPrivileged(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode beginVolume(const contract::DiskReferencePointer& disk,
                                     Operation operation);
+    contract::ErrorCode beginUndo(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode beginMounted(const contract::DiskReferencePointer& disk,
                                      Operation operation, contract::ErrorCode error);
     bool isPartThatOthersAttach(const VolumeRequest& request) const;

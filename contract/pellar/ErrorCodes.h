@@ -37,6 +37,12 @@ inline constexpr ErrorCode kPLErrorBusy = -69711;  ///< another job of this tool
 
 /// Verified: damaged, and this kind of volume is not repaired here.
 inline constexpr ErrorCode kPLErrorDamagedForGood = -69712;
+/// A repair was tried, would leave damage, and was not applied: the disk is as it was.
+inline constexpr ErrorCode kPLErrorNotProven = -69713;
+inline constexpr ErrorCode kPLErrorNotTried = -69714;     ///< a repair could not be tried first
+inline constexpr ErrorCode kPLErrorInterrupted = -69715;  ///< an earlier repair is half applied
+inline constexpr ErrorCode kPLErrorNothingToUndo = -69716;
+inline constexpr ErrorCode kPLErrorNotUndone = -69717;  ///< and the disk is as it was
 
 /// A repair of what is not repaired here, though it can be verified.
 inline constexpr ErrorCode kPLErrorNoRepairHere = -69740;
@@ -50,7 +56,7 @@ inline constexpr ErrorCode kPLErrorMapDamaged = -69721;      ///< a repair can r
 inline constexpr ErrorCode kPLErrorMapNeedsPerson = -69722;  ///< and none can
 inline constexpr ErrorCode kPLErrorMapNotRepaired = -69723;  ///< damage is left
 
-inline constexpr ErrorCode kPLErrorNoReferences = -69730;  ///< nothing could be compared
+inline constexpr ErrorCode kPLErrorNoReferences = -69730;            ///< nothing could be compared
 inline constexpr ErrorCode kPLErrorPermissionsNotRepaired = -69731;  ///< some still differ
 
 inline constexpr ErrorCode kPLErrorNotAdministrator = -69732;  ///< only root may
@@ -65,12 +71,10 @@ struct ErrorText {
 /// Every code there is, but 0, with what it means.
 inline constexpr std::array errorTexts{
     ErrorText{kPLErrorNoDiskReference, "The disk is no longer available."},
-    ErrorText{kPLErrorCouldNotUnmount,
-              "The volume is mounted and could not be unmounted."},
+    ErrorText{kPLErrorCouldNotUnmount, "The volume is mounted and could not be unmounted."},
     ErrorText{kPLErrorDiskInUse, "The disk is in use by another program."},
     ErrorText{kPLErrorCancelled, "The operation was stopped."},
-    ErrorText{kOVErrorCannotRepairInUse,
-              "The disk cannot be repaired while it is in use."},
+    ErrorText{kOVErrorCannotRepairInUse, "The disk cannot be repaired while it is in use."},
     ErrorText{kOVErrorSystemDiskInUse,
               "The disk is in use by the running system and cannot be checked now."},
     ErrorText{kOVErrorDiskInUse, "The disk is in use and cannot be checked now."},
@@ -85,11 +89,17 @@ inline constexpr std::array errorTexts{
     ErrorText{kPLErrorCutShort,
               "The end of the volume is missing, and no repair brings it back; copy what matters "
               "to another disk."},
+    ErrorText{kPLErrorNotProven,
+              "A repair was tried and would leave damage, so nothing was written to the volume."},
+    ErrorText{kPLErrorNotTried,
+              "The repair could not be tried first, so nothing was written to the volume."},
+    ErrorText{kPLErrorInterrupted,
+              "An earlier repair of the disk was interrupted; finish it or undo it first."},
+    ErrorText{kPLErrorNothingToUndo, "There is no repair of the disk that could be undone."},
+    ErrorText{kPLErrorNotUndone, "The repair was not undone; the disk is as the repair left it."},
     ErrorText{kPLErrorNotRepaired, "The volume is still damaged after the repair."},
-    ErrorText{kPLErrorInconclusive,
-              "It could not be determined whether the volume is damaged."},
-    ErrorText{kPLErrorToolMissing,
-              "The checking tool for this file system is not installed."},
+    ErrorText{kPLErrorInconclusive, "It could not be determined whether the volume is damaged."},
+    ErrorText{kPLErrorToolMissing, "The checking tool for this file system is not installed."},
     ErrorText{kPLErrorToolFailed, "The checking tool failed."},
     ErrorText{kPLErrorNoReferences,
               "It is not known here what permissions the installed files should have."},

@@ -46,5 +46,6 @@ inline const Name kPLVerdictRepaired{"repaired"};          ///< damage was found
 inline const Name kPLVerdictInconclusive{"inconclusive"};  ///< it could not be known
 inline const Name kPLVerdictFailed{"failed"};              ///< the check did not run to an answer
 inline const Name kPLVerdictStopped{"stopped"};            ///< by the user
+inline const Name kPLVerdictUndone{"undone"};              ///< a repair was taken back
 
 }  // namespace contract

@@ -1,13 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
-#include "orvane/privileges/LibraryOptions.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <cstdio>
 #include <utility>
 
 namespace orvane::desktop {
+namespace {
+
+constexpr const char* hostTable = "Orvane";
+
+}  // namespace
 
 DesktopSession::DesktopSession(SessionOptions options)
     : options_(std::move(options)),
@@ -19,7 +23,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       controller_(window_),
       ledger_(host_, ledgerEvents()),
       tabs_(host_, window_, controller_),
-      disks_(host_, loop_, window_.disks(), ledger_, options_.disksToOpen,
+      repairs_(libraryOptions().trials),
+      disks_(host_, loop_, window_.disks(), ledger_, repairs_, options_.disksToOpen,
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -28,8 +33,13 @@ DesktopSession::DesktopSession(SessionOptions options)
       hints_(parts(), library_),
       closer_(parts(), options_.closed),
       jobs_(parts(), disks_, closer_, options_.buses, options_.longestGlanceAway,
-            [this] { update(); }),
-      commands_(parts(), disks_, library_, [this] { update(); })
+            [this] {
+                update();
+                choices_.offer();
+            }),
+      undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
+      choices_(parts(), disks_, repairs_, undoing_, closer_, jobPolicy_),
+      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
@@ -74,13 +84,44 @@ SupportOptions DesktopSession::supportOptions()
 
 pellar::JobOptions DesktopSession::libraryOptions()
 {
-    pellar::JobOptions options = orvane::libraryOptions(options_.paths, libraryTexts_);
+    pellar::JobOptions options =
+        orvane::libraryOptions(options_.paths, libraryTexts_, {}, {}, repairAdvice());
     options.outputLimits = options_.outputLimits;
     options.archiveFetching = {[this] { return fetchesArchives(host_); },
                                libraryTexts_.text("The archives of these packages are downloaded "
                                                   "when “Download Package Archives” is switched "
                                                   "on in the Edit menu.")};
+    options.repairPolicy = [this] {
+        pellar::RepairPolicy policy = jobPolicy_;
+        policy.isThorough = verifiesThoroughly(host_);
+        return policy;
+    };
     return options;
+}
+
+pellar::JobOptions DesktopSession::observedOptions()
+{
+    pellar::JobOptions options = libraryOptions();
+    options.observer = &ledger_;
+    return options;
+}
+
+RepairAdvice DesktopSession::repairAdvice()
+{
+    const auto advice = [this](std::string_view key) {
+        return [sentence = hostTexts_.translate(hostTable, key)](const contract::DiskReference&) {
+            return sentence;
+        };
+    };
+    RepairAdvice all;
+    all.undo = advice("To take the repair back, choose Undo Repair in the Disk menu.");
+    all.apply =
+        advice("“Apply Anyway”, in the question that follows a repair, applies it although it may "
+               "leave damage. That can be undone as well.");
+    all.repairDirectly =
+        advice("“Repair Directly”, in the question that follows a repair, lets the tool write to "
+               "the disk itself. That cannot be undone.");
+    return all;
 }
 
 JobLedger::Events DesktopSession::ledgerEvents()
@@ -88,7 +129,7 @@ JobLedger::Events DesktopSession::ledgerEvents()
     return {[this](const StartedRun& run, const contract::DiskReferencePointer& /*disk*/) {
                 jobs_.runBegan(run);
             },
-            [this](const StartedRun& run, const RunEnd& end) { jobs_.runEnded(run, end); },
+            [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
             [this] {
                 jobs_.stopAsked();
             }};
@@ -96,9 +137,7 @@ JobLedger::Events DesktopSession::ledgerEvents()
 
 void DesktopSession::loadModules()
 {
-    pellar::JobOptions options = libraryOptions();
-    options.observer = &ledger_;
-    tabs_.load(findModuleBundles(options_.moduleDirectories), options,
+    tabs_.load(findModuleBundles(options_.moduleDirectories), observedOptions(),
                [this](const std::string& sentence) { warn(sentence); });
 }
 
@@ -113,6 +152,8 @@ void DesktopSession::connectHost()
             // What the user clears later is another step.
             loop_.post([this] { host_.histories().closeClearing(); });
         };
+    host_.alerts().setWithheld(
+        [this] { return controller_.interfaceLock() && choices_.saysMoreThanModule(); });
     host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
     host_.printing().setTitle([this] {
         std::string names;
@@ -134,16 +175,30 @@ void DesktopSession::connectWindow()
         [this] { update(); },
         [this] { windowAppeared(); },
     });
-    controller_.setEvents({[this](bool isLocked) {
-                               jobs_.lockChanged(isLocked);
-                               if (isLocked)
-                                   hints_.refresh();
-                               else
-                                   closer_.jobEnded();
-                           },
+    controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
                            [this](const contract::Dictionary& report) {
                                jobs_.reported(report);
                            }});
+}
+
+void DesktopSession::lockChanged(bool isLocked)
+{
+    jobs_.lockChanged(isLocked);
+    choices_.lockChanged(isLocked);
+    if (isLocked)
+        hints_.refresh();
+    else
+        closer_.jobEnded();
+}
+
+// What is kept is read before the list shows it.
+void DesktopSession::runEnded(const StartedRun& run, const RunEnd& end)
+{
+    if (run.task.operation != pellar::Operation::Verify)
+        repairs_.read();
+    jobs_.runEnded(run, end);
+    choices_.runEnded(run, end);
+    undoing_.runEnded(run, end);
 }
 
 void DesktopSession::update()

@@ -4,6 +4,9 @@
 #include "orvane/desktop/JobWatch.h"
 #include "orvane/desktop/MenuCommands.h"
 #include "orvane/desktop/ModuleHints.h"
+#include "orvane/desktop/RepairChoices.h"
+#include "orvane/desktop/RepairUndoing.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
 #include <chrono>
@@ -49,11 +52,15 @@ private:
     SessionParts parts() { return {host_, window_, controller_, tabs_, ledger_}; }
     SupportOptions supportOptions();
     pellar::JobOptions libraryOptions();
+    pellar::JobOptions observedOptions();
+    RepairAdvice repairAdvice();
     JobLedger::Events ledgerEvents();
     void loadModules();
     void connectWindow();
     void connectHost();
 
+    void runEnded(const StartedRun& run, const RunEnd& end);
+    void lockChanged(bool isLocked);
     void update();
     void selectionChanged();
     void windowAppeared();
@@ -61,6 +68,7 @@ private:
     void showWarnings();
 
     const SessionOptions options_;
+    pellar::RepairPolicy jobPolicy_;     ///< of the job at hand
     std::vector<std::string> warnings_;  ///< not shown yet
     bool hasAppeared_ = false;
 
@@ -73,10 +81,13 @@ private:
     WindowController controller_;
     JobLedger ledger_;
     ModuleTabs tabs_;
+    KeptRepairs repairs_;
     DiskPane disks_;
     ModuleHints hints_;
     WindowCloser closer_;
     JobWatch jobs_;
+    RepairUndoing undoing_;
+    RepairChoices choices_;
     MenuCommands commands_;
 };
 

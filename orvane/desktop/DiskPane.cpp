@@ -31,6 +31,17 @@ Check checkOf(const Run& run)
             QDateTime::fromMSecsSinceEpoch(started.count())};
 }
 
+std::string_view activityIn(pellar::Operation operation)
+{
+    switch (operation) {
+        case pellar::Operation::Verify: return "verifying…";
+        case pellar::Operation::Undo: return "undoing…";
+        case pellar::Operation::Repair:
+        case pellar::Operation::Finish: break;
+    }
+    return "repairing…";
+}
+
 }  // namespace
 
 void DiskScan::start()
@@ -62,10 +73,11 @@ void DiskScan::finish(const std::vector<DiskTree>& disks)
 }
 
 DiskPane::DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
-                   std::vector<std::string> named, bool scansSystemDisks, Events events)
+                   const KeptRepairs& repairs, std::vector<std::string> named, bool scansSystemDisks, Events events)
     : host_(host),
       list_(list),
       ledger_(ledger),
+      repairs_(repairs),
       named_(std::move(named)),
       scansSystemDisks_(scansSystemDisks),
       events_(std::move(events)),
@@ -144,6 +156,19 @@ void DiskPane::refresh(const std::vector<std::shared_ptr<Disk>>& disks)
         images_.refresh(*disk);
 }
 
+bool DiskPane::selectOnly(const Disk& disk)
+{
+    const auto image = host_.sharedDiskController().find([&disk](const Disk& other) {
+        return other.contents() && other.contents()->diskIdentifier() == disk.diskIdentifier();
+    });
+    const auto isSelected = [this](const Disk& wanted) {
+        list_.select(wanted);
+        const auto disks = selected();
+        return disks.size() == 1 && disks.front()->diskIdentifier() == wanted.diskIdentifier();
+    };
+    return isSelected(disk) || (image && isSelected(*image));
+}
+
 void DiskPane::hold(const std::vector<contract::OVDiskPointer>& others)
 {
     auto disks = selected();
@@ -172,7 +197,7 @@ DiskStates DiskPane::states()
     return {[this](const Disk& disk) { return lastCheckOf(disk); },
             [this](const Disk& disk) { return activityOn(disk); },
             [this](const Disk& disk) {
-                return images_.noteOn(disk);
+                return noteOn(disk);
             }};
 }
 
@@ -189,12 +214,18 @@ std::optional<LastCheck> DiskPane::lastCheckOf(const Disk& disk)
     return check;
 }
 
+std::string DiskPane::noteOn(const Disk& disk)
+{
+    return repairs_.isInterrupted(disk) ? host_.translator().text("repair interrupted")
+                                        : images_.noteOn(disk);
+}
+
 std::string DiskPane::activityOn(const Disk& disk)
 {
     const StartedRun* const run = ledger_.currentRun();
     if (run == nullptr || run->identifier != disk.facts().identifier)
         return {};
-    return host_.translator().text(run->task.isRepair() ? "repairing…" : "verifying…");
+    return host_.translator().text(activityIn(run->task.operation));
 }
 
 std::vector<DiskRequest> DiskPane::requestsFor(DiskAction action) const

@@ -3,6 +3,7 @@
 
 #include "orvane/desktop/DesktopHost.h"
 #include "orvane/desktop/ImageOpener.h"
+#include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/window/DiskList.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskWatch.h"
@@ -61,7 +62,7 @@ public:
     /// `named` are opened at the start, as orvane/support/disks/DiskLookup.h takes them. All but
     /// the events and names outlive this object. The list follows the host's disks from here on.
     DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
-             std::vector<std::string> named, bool scansSystemDisks, Events events);
+             const KeptRepairs& repairs, std::vector<std::string> named, bool scansSystemDisks, Events events);
     DiskPane(const DiskPane&) = delete;
     DiskPane& operator=(const DiskPane&) = delete;
     ~DiskPane();
@@ -76,6 +77,9 @@ public:
     void refresh(const std::vector<std::shared_ptr<Disk>>& disks);
 
     std::vector<std::shared_ptr<Disk>> selected() const { return list_.selectedDisks(); }
+    /// Selects the disk's row or, of what fills an image, the image's, and no other; NO when it is
+    /// in the list no longer.
+    bool selectOnly(const Disk& disk);
     DiskList& list() { return list_; }
 
     bool canDo(DiskAction action) const;
@@ -89,6 +93,7 @@ private:
     DiskStates states();
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
     std::string activityOn(const Disk& disk);
+    std::string noteOn(const Disk& disk);
     void adoptDisks(const std::vector<DiskTree>& disks);
     void openNamed(bool areFiles);
     void synchronize();
@@ -98,6 +103,7 @@ private:
     DesktopHost& host_;
     DiskList& list_;
     const JobLedger& ledger_;
+    const KeptRepairs& repairs_;
     const std::vector<std::string> named_;
     const bool scansSystemDisks_;
     const Events events_;

@@ -51,7 +51,7 @@ void JobWatch::reported(const contract::Dictionary& report)
 // The repair does not wait for the lock, which only makes it less likely to be cut off.
 void JobWatch::runBegan(const StartedRun& run)
 {
-    if (run.task.isRepair())
+    if (run.task.isRepair() || run.task.isUndo())
         wakefulness_.hold(
             at_.host.translator().sentence("Repairing “%@”", {contract::printable(run.disk)}));
     else

@@ -18,6 +18,7 @@ namespace outlet = contract::outlet;
 namespace {
 
 constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
+constexpr std::string_view verifiesThoroughlyKey = "thoroughVerification";
 constexpr const char* diskMenu = "diskMenu";
 const MenuCommand line{};
 
@@ -26,6 +27,11 @@ const MenuCommand line{};
 bool fetchesArchives(SupportHost& host)
 {
     return host.standardUserDefaults().objectForKey(fetchesArchivesKey).boolean();
+}
+
+bool verifiesThoroughly(SupportHost& host)
+{
+    return host.standardUserDefaults().objectForKey(verifiesThoroughlyKey).boolean();
 }
 
 void MenuCommands::addMenus()
@@ -43,12 +49,7 @@ std::vector<Menu> MenuCommands::menus()
 {
     return {{"&File", fileCommands()},
             {"&Edit", editCommands()},
-            {"Dis&k",
-             {buttonCommand("verifyDisk", "&Verify Disk", outlet::verifyDisk),
-              buttonCommand("repairDisk", "&Repair Disk", outlet::repairDisk), line,
-              mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
-              mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)},
-             diskMenu},
+            {"Dis&k", diskCommands(), diskMenu},
             {"&View", {detailsCommand()}},
             {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
                             at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
@@ -98,13 +99,6 @@ std::vector<MenuCommand> MenuCommands::editCommands()
     const auto canUndo = [this] {
         return !isLocked() && at_.host.histories().hasCleared();
     };
-    const auto fetches = [this] {
-        return fetchesArchives(at_.host);
-    };
-    const auto switchFetching = [this] {
-        at_.host.standardUserDefaults().setObjectForKey(!fetchesArchives(at_.host),
-                                                        fetchesArchivesKey);
-    };
     const auto copy = [this] {
         at_.tabs.log()->copy(&at_.window);
     };
@@ -119,7 +113,48 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
          canUndo},
         line,
-        {"fetchArchives", "Download &Package Archives", {}, switchFetching, {}, fetches}};
+        settingCommand("fetchArchives", "Download &Package Archives", fetchesArchivesKey),
+        settingCommand("verifyThoroughly", "&Try a Repair When Verifying (Thorough)",
+                       verifiesThoroughlyKey)};
+}
+
+std::vector<MenuCommand> MenuCommands::diskCommands()
+{
+    return {buttonCommand("verifyDisk", "&Verify Disk", outlet::verifyDisk),
+            buttonCommand("repairDisk", "&Repair Disk", outlet::repairDisk),
+            {.objectName = "previewRepair",
+             .title = "Previe&w Repair",
+             .shortcut = {},
+             .perform = [this] { choices_.preview(); },
+             .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }},
+            line,
+            undoCommand("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
+            undoCommand("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
+            line,
+            mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
+            mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)};
+}
+
+MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view title,
+                                      pellar::Operation operation)
+{
+    return {.objectName = objectName,
+            .title = title,
+            .shortcut = {},
+            .perform = [this, operation] { undoing_.ask(operation); },
+            .reasonAgainst = [this, operation] { return undoing_.reasonAgainst(operation); }};
+}
+
+MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,
+                                         std::string_view key)
+{
+    const auto isOn = [this, key] {
+        return at_.host.standardUserDefaults().objectForKey(key).boolean();
+    };
+    const auto change = [this, key, isOn] {
+        at_.host.standardUserDefaults().setObjectForKey(!isOn(), key);
+    };
+    return {objectName, title, {}, change, {}, isOn};
 }
 
 MenuCommand MenuCommands::detailsCommand()

@@ -3,6 +3,8 @@
 
 #include "orvane/desktop/DiskPane.h"
 #include "orvane/desktop/ModuleTabs.h"
+#include "orvane/desktop/RepairChoices.h"
+#include "orvane/desktop/RepairUndoing.h"
 #include "orvane/desktop/window/Menus.h"
 
 #include <functional>
@@ -15,13 +17,21 @@ namespace orvane::desktop {
 /// Whether the user agrees that archives of packages are fetched over the network.
 [[nodiscard]] bool fetchesArchives(SupportHost& host);
 
+/// Whether a verification that finds nothing tries a repair as well.
+[[nodiscard]] bool verifiesThoroughly(SupportHost& host);
+
 /// What the window's menus do. Main thread.
 class MenuCommands {
 public:
-    /// The disks and the library outlive this object. `update` shows what a command has changed.
+    /// All but `update` outlive this object; it shows what a command has changed.
     MenuCommands(const SessionParts& parts, DiskPane& disks, const pellar::Manager& library,
-                 std::function<void()> update)
-        : at_(parts), disks_(disks), library_(library), update_(std::move(update))
+                 RepairChoices& choices, RepairUndoing& undoing, std::function<void()> update)
+        : at_(parts),
+          disks_(disks),
+          library_(library),
+          choices_(choices),
+          undoing_(undoing),
+          update_(std::move(update))
     {
     }
     MenuCommands(const MenuCommands&) = delete;
@@ -34,7 +44,12 @@ private:
     std::vector<Menu> menus();
     std::vector<MenuCommand> fileCommands();
     std::vector<MenuCommand> editCommands();
+    std::vector<MenuCommand> diskCommands();
     MenuCommand detailsCommand();
+    MenuCommand undoCommand(const char* objectName, std::string_view title,
+                            pellar::Operation operation);
+    MenuCommand settingCommand(const char* objectName, std::string_view title,
+                               std::string_view key);
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
                             DiskAction action);
     MenuCommand buttonCommand(const char* objectName, std::string_view title,
@@ -56,6 +71,8 @@ private:
     const SessionParts at_;
     DiskPane& disks_;
     const pellar::Manager& library_;
+    RepairChoices& choices_;
+    RepairUndoing& undoing_;
     const std::function<void()> update_;
 };
 

@@ -164,6 +164,10 @@ void ModuleTabs::offer()
 
 void ModuleTabs::stopJob()
 {
+    if (stopHostJob_) {
+        stopHostJob_();
+        return;
+    }
     const bool isStopped =
         std::any_of(tabs_.begin(), tabs_.end(), [](const auto& tab) { return tab->stopJob(); });
     if (!isStopped)
@@ -172,6 +176,8 @@ void ModuleTabs::stopJob()
 
 void ModuleTabs::stopHarder()
 {
+    if (stopHostJob_)
+        stopHostJob_();
     for (const auto& tab : tabs_)
         tab->stopHarder();
 }

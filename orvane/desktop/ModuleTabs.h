@@ -9,6 +9,7 @@
 #include "pellar/Manager.h"
 
 #include <filesystem>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -94,8 +95,11 @@ public:
     void update();
     /// Enables the tabs that are offered for what is selected.
     void offer();
-    /// Stops the job that runs, by its Stop button or, where that cannot be pressed, by itself.
+    /// Stops the job that runs: the host's own or, of a module, by its Stop button or, where that
+    /// cannot be pressed, by itself.
     void stopJob();
+    /// How the host's own job is stopped while it runs, and pressed harder; empty when none does.
+    void setStopOfHostJob(std::function<void()> stop) { stopHostJob_ = std::move(stop); }
     void stopHarder();
 
     // Of the tab that is shown; none when there is no such thing.
@@ -119,6 +123,7 @@ private:
     WindowController& controller_;
     std::vector<std::unique_ptr<ModuleTab>> tabs_;
     std::string lastAction_;
+    std::function<void()> stopHostJob_;
 };
 
 /// What the parts of a session work with; all outlive them.

@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/WindowCloser.h"
 
-#include "orvane/desktop/toolkit/Text.h"
-
-#include <QPushButton>
+#include "orvane/desktop/window/Question.h"
 
 namespace orvane::desktop {
 
@@ -28,24 +26,13 @@ void WindowCloser::askWhetherToStop()
         return;
     }
     const Translator& texts = at_.host.translator();
-    question_ = new QMessageBox(QMessageBox::Warning, toQt("Orvane"),
-                                toQt(texts.text("A disk is still being verified or repaired.")),
-                                QMessageBox::NoButton, &at_.window);
-    question_->setObjectName(QStringLiteral("closingQuestion"));
-    question_->setTextFormat(Qt::PlainText);
-    question_->setInformativeText(
-        toQt(texts.text("The job must be stopped before the window can be closed. A repair that is "
-                        "stopped may leave damage behind.")));
-    question_->setWindowModality(Qt::WindowModal);
-    question_->setAttribute(Qt::WA_DeleteOnClose);
-    QPushButton* const stop =
-        question_->addButton(toQtTitle(texts.text("Stop and Quit")), QMessageBox::DestructiveRole);
-    QPushButton* const keep =
-        question_->addButton(toQtTitle(texts.text("Keep Open")), QMessageBox::RejectRole);
-    question_->setDefaultButton(keep);
-    question_->setEscapeButton(keep);
-    QObject::connect(stop, &QPushButton::clicked, &at_.window, [this] { stopAndClose(); });
-    question_->open();
+    question_ = ask(
+        at_.window,
+        {"closingQuestion", texts.text("A disk is still being verified or repaired."),
+         texts.text("The job must be stopped before the window can be closed. A repair that is "
+                    "stopped may leave damage behind."),
+         {{texts.text("Stop and Quit"), [this] { stopAndClose(); }}},
+         texts.text("Keep Open")});
 }
 
 // A job whose images are still being read cannot be stopped yet; it is as soon as a tool begins.

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/JobLedger.h"
 
-#include "contract/foundation/StyledText.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
+#include "orvane/jobs/LogRecord.h"
 #include "pellar/disks/LoopDevice.h"
 
 #include <sys/stat.h>
@@ -32,21 +32,8 @@ bool hasAnswer(const Run& run)
     const std::string& verdict = run.end->verdict;
     return verdict == contract::kPLVerdictSound.text() ||
            verdict == contract::kPLVerdictDamaged.text() ||
-           verdict == contract::kPLVerdictRepaired.text();
-}
-
-// As the modules make the heading of an error (fixwell/messagelog).
-contract::Dictionary headingOfError(const std::string& sentence)
-{
-    constexpr double points = 11;
-    const contract::Color red{1, 0, 0, 1};
-    return contract::Dictionary::of(
-        {{contract::kFsckMessageType, contract::kFsckFail},
-         {contract::kFsckMessageString, std::string_view(sentence)},
-         {contract::kFsckVerbosity, contract::verbosity::heading},
-         {contract::Name("kOV_finalAttributedString_type"),
-          contract::StyledText::make(sentence + "\n",
-                                     {contract::Font::boldSystem(points), red, {}})}});
+           verdict == contract::kPLVerdictRepaired.text() ||
+           verdict == contract::kPLVerdictUndone.text();
 }
 
 }  // namespace
@@ -135,7 +122,8 @@ void keepUnreached(SupportHost& host, Disk& image, pellar::Operation operation,
         store.beginRun(host.histories().keyOf(image.facts()),
                        nameOf(pellar::Task{pellar::Subject::Filesystem, operation}), time);
     store.endRun(run, {failedVerdict(), contract::kPLErrorCannotOpen, sentence}, time);
-    image.fsckHistoryNoChildren().append(headingOfError(sentence));
+    image.fsckHistoryNoChildren().append(
+        logRecord(contract::kFsckFail, sentence, contract::verbosity::heading));
     host.histories().saveNew();
 }
 

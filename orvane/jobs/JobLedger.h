@@ -58,7 +58,8 @@ private:
 };
 
 /// What is known of a disk by its runs: a run that was stopped, or failed, says nothing about the
-/// disk, and does not take the place of the last one that did.
+/// disk, and does not take the place of the last one that did. One that was undone does: what the
+/// repair had come to is no longer true.
 struct LastRuns {
     /// The last run that came to an answer; where none did, the last one.
     Run told;

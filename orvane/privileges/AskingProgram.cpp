@@ -99,8 +99,7 @@ FileDescriptor AskingProgram::take(int descriptor) const
 pellar::Result<pellar::LoopDevice, JobFailure> attachRegion(const FileDescriptor& image,
                                                             const HelperRequest& request)
 {
-    const Access wanted =
-        request.task.operation == pellar::Operation::Repair ? Access::ReadWrite : Access::ReadOnly;
+    const Access wanted = accessFor(request.task.operation, request.policy);
     const auto given = accessOf(image.get());
     if (!given || !isInside(request.disk, image.get()))
         return JobFailure{contract::kPLErrorCannotOpen,

@@ -1,24 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/HelperJob.h"
 
+#include "contract/pellar/MessageKeys.h"
 #include "contract/pellar/PLRepairDisk.h"
 #include "orvane/privileges/AskingProgram.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "pellar/Manager.h"
+#include "pellar/RepairDisk.h"
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/jobs/EventQueue.h"
 
 #include <fcntl.h>
 #include <poll.h>
+#include <sys/random.h>
 #include <unistd.h>
 
+#include <array>
 #include <cerrno>
 #include <cstring>
 #include <functional>
 #include <memory>
 #include <optional>
 #include <string>
+#include <system_error>
 #include <utility>
 
 namespace orvane {
@@ -28,9 +34,7 @@ using contract::DiskReference;
 using contract::ErrorCode;
 using pellar::Subject;
 
-// Where sectors are kept that the repair of a partition map overwrites, and what archives have
-// said about their packages' files.
-constexpr const char* savedSectors = "/var/lib/orvane/partition-maps";
+// Where it is kept what archives have said about their packages' files.
 constexpr const char* permissionReferences = "/var/lib/orvane/permissions";
 
 bool write(const std::string& line)
@@ -55,6 +59,9 @@ public:
     void plAsyncMessageForDisk(const contract::DiskReferencePointer&, std::string_view string,
                                const contract::Dictionary& dictionary) override
     {
+        for (const Advice advice : {Advice::Undo, Advice::Apply, Advice::RepairDirectly})
+            if (dictionary.string(contract::kFsckMessageString) == markOf(advice))
+                return print(messageOf(advice));
         print(pellar::Message{std::string(string), dictionary});
     }
     void plAsyncProgressForDisk(const contract::DiskReferencePointer&, bool, float) override {}
@@ -67,12 +74,26 @@ public:
 
     void trace(std::string_view line) { print(pellar::Trace{std::string(line)}); }
     bool isOver() const { return isOver_; }
+    /// What the library is given to tell instead of a sentence; nothing on a disk can know it.
+    std::string markOf(Advice advice) const
+    {
+        return secret_ + std::to_string(static_cast<int>(advice));
+    }
 
 private:
+    static std::string makeSecret()
+    {
+        std::array<std::uint64_t, 2> random{};
+        if (::getrandom(random.data(), sizeof random, 0) != sizeof random)
+            throw std::system_error(errno, std::generic_category(), "getrandom");
+        return std::to_string(random[0]) + "-" + std::to_string(random[1]) + "-";
+    }
+
     void print(const pellar::Event& event) { isRead_ = isRead_ && write(lineFromEvent(event)); }
 
     bool isOver_ = false;
     bool isRead_ = true;
+    const std::string secret_ = makeSecret();
 };
 
 /// Reads from standard input what is wanted: each "stop" presses, and so does the end of the input,
@@ -177,7 +198,6 @@ private:
     void work()
     {
         pellar::JobOptions options;
-        options.savedSectorsDirectory = savedSectors;
         options.permissionReferences = permissionReferences;
         if (user_)
             options.homeDirectory = homeDirectoryOf(*user_);
@@ -187,11 +207,15 @@ private:
         options.commandTrace = [this](std::string_view line) {
             printer_.trace(line);
         };
+        options.repairPolicy = [this] {
+            return request_.policy;
+        };
+        options.trials = trials();
         pellar::Manager manager(loop_, texts_, options);
-        manager.setDelegate(&printer_);
-        const auto tool = manager.makeRepairDisk();
+        const auto tool = manager.makeTool(printer_);
         // A refusal to begin has no events of its own; its number goes to the program that asked.
-        if (const ErrorCode error = begin(*tool)) {
+        if (const ErrorCode error =
+                tool->begin(request_.task, std::make_shared<const DiskReference>(disk_))) {
             printer_.plAsyncStartedForDisk(nullptr);
             printer_.plAsyncFinishedForDisk(nullptr, error, 0, {});
             return;
@@ -200,27 +224,28 @@ private:
         loop_.runUntil([this] { return printer_.isOver(); });
     }
 
-    ErrorCode begin(contract::PLRepairDisk& tool) const
+    pellar::Trials trials() const
     {
-        const auto disk = std::make_shared<const DiskReference>(disk_);
-        const bool isRepair = request_.task.isRepair();
-        switch (request_.task.subject) {
-            case Subject::PartitionMap:
-                return isRepair ? tool.beginPartitionMapRepairForDisk(disk)
-                                : tool.beginPartitionMapVerifyForDisk(disk);
-            case Subject::Permissions:
-                return isRepair ? tool.beginPermissionsRepairForDisk(disk)
-                                : tool.beginPermissionsVerifyForDisk(disk);
-            case Subject::Filesystem: break;
-        }
-        return isRepair ? tool.beginStoragesystemFilesystemRepairForDisk(disk)
-                        : tool.beginStoragesystemFilesystemVerifyForDisk(disk);
+        pellar::Trials trials;
+        trials.room.directory = systemRepairs;
+        trials.user = user_.value_or(::getuid());
+        // The user's own commands do not find what is kept here of an image.
+        if (request_.isOnImage())
+            return trials;
+        const auto asked = [this](Advice advice) {
+            return [mark = printer_.markOf(advice)](const DiskReference&) { return mark; };
+        };
+        trials.howToUndo = asked(Advice::Undo);
+        trials.howToUndoPermissions = asked(Advice::Undo);
+        trials.howToApply = asked(Advice::Apply);
+        trials.howToRepairDirectly = asked(Advice::RepairDirectly);
+        return trials;
     }
 
     void refuse(const JobFailure& failure)
     {
         pellar::EventQueue events(loop_, {&printer_, nullptr, {}, [] {
-                                       }});
+                                          }});
         pellar::JobLog log(request_.disk, texts_, events);
         log.started();
         reportFailure(failure, request_, texts_, log);

@@ -22,8 +22,38 @@ using Read = pellar::Result<HelperRequest, const char*>;
 // attach-OPERATION DESCRIPTOR OFFSET LENGTH, for a region of an image.
 constexpr std::string_view attaching = "attach-";
 
-// Comes last, for permissions.
+// What may come after the texts, in this order.
+
 constexpr std::string_view fetching = "--fetch-archives";
+
+struct PolicyOption {
+    std::string_view option;
+    bool pellar::RepairPolicy::*isSo;
+    bool value;
+};
+
+constexpr std::array policyOptions{
+    PolicyOption{"--direct", &pellar::RepairPolicy::isDirect, true},
+    PolicyOption{"--preview", &pellar::RepairPolicy::isPreview, true},
+    PolicyOption{"--apply-unproven", &pellar::RepairPolicy::appliesUnproven, true},
+    PolicyOption{"--no-undo", &pellar::RepairPolicy::keepsUndo, false},
+    PolicyOption{"--thorough", &pellar::RepairPolicy::isThorough, true}};
+
+/// Whether it means something to a task.
+bool isFor(const PolicyOption& option, Task task)
+{
+    if (task.subject == Subject::Permissions || task.isUndo())
+        return false;
+    return task.isRepair() || option.isSo == &pellar::RepairPolicy::isThorough;
+}
+
+/// A preview writes nothing; what is said of writing does not go with it.
+bool contradictsItself(const pellar::RepairPolicy& policy)
+{
+    return (policy.isPreview &&
+            (policy.isDirect || policy.appliesUnproven || !policy.keepsUndo)) ||
+           (policy.isDirect && policy.appliesUnproven);
+}
 
 constexpr std::size_t longestName = 1024;
 constexpr std::size_t longestLanguages = 64;
@@ -37,11 +67,30 @@ bool isCanonicalDevice(const std::string& path)
            !path.ends_with('/') && !path.ends_with("/..") && !path.ends_with("/.");
 }
 
-/// IDENTIFIER NAME FILESYSTEM LANGUAGES
-Read withTexts(HelperRequest request, Arguments texts)
+/// Each option once at most, in their order.
+bool readOptions(HelperRequest& request, Arguments options)
 {
-    if (texts.size() != 4)
+    const auto isNext = [&options](std::string_view option) {
+        const bool isIt = !options.empty() && options.front() == option;
+        options = options.subspan(isIt ? 1 : 0);
+        return isIt;
+    };
+    request.fetchesArchives = request.task.subject == Subject::Permissions && isNext(fetching);
+    for (const PolicyOption& option : policyOptions)
+        if (isFor(option, request.task) && isNext(option.option))
+            request.policy.*option.isSo = option.value;
+    return options.empty() && !contradictsItself(request.policy);
+}
+
+/// IDENTIFIER NAME FILESYSTEM LANGUAGES OPTION...
+Read withTexts(HelperRequest request, Arguments arguments)
+{
+    constexpr std::size_t textCount = 4;
+    if (arguments.size() < textCount)
         return "wrong number of arguments";
+    const Arguments texts = arguments.first(textCount);
+    if (!readOptions(request, arguments.subspan(textCount)))
+        return "an option that there is not, or that does not go with the others";
     if (texts[0].size() > longestName || texts[1].size() > longestName)
         return "a name is too long";
     if (!consistsOf(texts[2], "_-+.", 64) ||
@@ -60,7 +109,7 @@ Read readRegion(Arguments arguments)
     if (arguments.size() < 4)
         return "wrong number of arguments";
     const auto task = pellar::taskNamed(std::string_view(arguments[0]).substr(attaching.size()));
-    if (!task || task->subject != Subject::Filesystem)
+    if (!task || task->subject != Subject::Filesystem || task->isUndo())
         return "unknown operation";
     const auto image = numberIn<int>(arguments[1]);
     const auto offset = numberIn<std::uint64_t>(arguments[2]);
@@ -144,9 +193,15 @@ std::optional<pellar::Event> eventFromJSON(const json& parts)
     return std::nullopt;
 }
 
+constexpr std::string_view adviceType = "ADVICE";
+
 std::string_view attemptOf(const HelperRequest& request)
 {
     const bool isRepair = request.task.isRepair();
+    if (request.task.isUndo())
+        return request.task.operation == pellar::Operation::Undo
+                   ? "cannot undo the repair of “%1$@”: %2$@"
+                   : "cannot finish the repair of “%1$@”: %2$@";
     if (request.task.subject == Subject::Permissions)
         return isRepair ? "cannot repair the permissions on “%1$@”: %2$@"
                         : "cannot verify the permissions on “%1$@”: %2$@";
@@ -163,7 +218,8 @@ HelperRequest requestFor(const pellar::PrivilegedJob& job, const std::string& la
     HelperRequest request{.task = job.task,
                           .disk = job.disk,
                           .languages = acceptedLanguages(languages),
-                          .fetchesArchives = job.fetchesArchives};
+                          .fetchesArchives = job.fetchesArchives,
+                          .policy = job.policy};
     if (!job.image) {
         request.identity = identityOf(job.disk.path);
         return request;
@@ -192,6 +248,9 @@ std::vector<std::string> argumentsOf(const HelperRequest& request)
         arguments.push_back(text);
     if (request.fetchesArchives)
         arguments.emplace_back(fetching);
+    for (const PolicyOption& option : policyOptions)
+        if (isFor(option, request.task) && request.policy.*option.isSo == option.value)
+            arguments.emplace_back(option.option);
     return arguments;
 }
 
@@ -214,11 +273,7 @@ Read readHelperArguments(const std::vector<std::string>& arguments,
     HelperRequest request{.task = *task, .identity = *identity};
     request.disk.path = arguments[1];
     request.disk.isWhole = task->subject == Subject::PartitionMap;
-    Arguments texts = Arguments(arguments).subspan(3);
-    request.fetchesArchives =
-        task->subject == Subject::Permissions && !texts.empty() && texts.back() == fetching;
-    return withTexts(std::move(request),
-                     texts.first(texts.size() - (request.fetchesArchives ? 1 : 0)));
+    return withTexts(std::move(request), Arguments(arguments).subspan(3));
 }
 
 std::string lineFromEvent(const pellar::Event& event)
@@ -236,6 +291,25 @@ std::optional<pellar::Event> eventFromLine(std::string_view line)
     } catch (const json::exception&) {
         return std::nullopt;
     }
+}
+
+pellar::Message messageOf(Advice advice)
+{
+    return {{},
+            contract::Dictionary::of(
+                {{contract::kFsckMessageType, adviceType},
+                 {contract::kFsckVerbosity, static_cast<int>(advice)}})};
+}
+
+std::optional<Advice> adviceIn(const pellar::Event& event)
+{
+    const auto* const message = std::get_if<pellar::Message>(&event);
+    if (message == nullptr || !message->dictionary ||
+        message->dictionary.string(contract::kFsckMessageType) != adviceType)
+        return std::nullopt;
+    const auto number = message->dictionary.integer(contract::kFsckVerbosity);
+    const bool isKnown = number >= 0 && number <= static_cast<int>(Advice::RepairDirectly);
+    return isKnown ? std::optional(static_cast<Advice>(number)) : std::nullopt;
 }
 
 void reportFailure(const JobFailure& failure, const HelperRequest& request,

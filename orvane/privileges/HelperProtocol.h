@@ -29,6 +29,8 @@ struct HelperRequest {
     std::string languages = {};  ///< for the texts; empty for English
     /// Archives of packages may be fetched over the network; for permissions alone.
     bool fetchesArchives = false;
+    /// Of volumes and maps; no image is kept.
+    pellar::RepairPolicy policy = {};
 
     bool isOnImage() const { return image >= 0; }
 };
@@ -54,6 +56,14 @@ struct HelperRequest {
 /// holds is no event.
 [[nodiscard]] std::string lineFromEvent(const pellar::Event& event);
 [[nodiscard]] std::optional<pellar::Event> eventFromLine(std::string_view line);
+
+/// What the helper leaves to the program that asked to say: it knows what its user can do next.
+enum class Advice { Undo, Apply, RepairDirectly };
+
+/// A message that stands for such a sentence, and what one stands for; none for any other event.
+/// No job of the library tells such messages.
+[[nodiscard]] pellar::Message messageOf(Advice advice);
+[[nodiscard]] std::optional<Advice> adviceIn(const pellar::Event& event);
 
 /// How a job ends that was not done.
 struct JobFailure {

@@ -2,11 +2,16 @@
 #include "orvane/privileges/LibraryOptions.h"
 
 #include "orvane/privileges/MountedSystem.h"
+#include "orvane/support/files/WholeFile.h"
 #include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/settings/RepairSettings.h"
+#include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/texts/Language.h"
 
 #include <sys/stat.h>
 #include <unistd.h>
+
+#include <chrono>
 
 namespace orvane {
 namespace {
@@ -43,26 +48,57 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
     return path;
 }
 
+/// Root's repairs are kept with those that the helper makes for others, so that root sees them all;
+/// unless other directories are asked for.
+std::filesystem::path repairsDirectory(const XDGPaths& paths)
+{
+    const bool isUsual =
+        !environmentValue("XDG_STATE_HOME") && paths.state == userXDGPaths().state;
+    if (::geteuid() == 0 && isUsual)
+        return systemRepairs;
+    return fileIn(paths.state, "repairs");
+}
+
+void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairAdvice& advice)
+{
+    const RepairSettings settings =
+        readRepairSettings(fileIn(paths.config, settingsFileName));
+    options.trials.room.directory = repairsDirectory(paths);
+    options.trials.limits = {settings.keptRepairs,
+                             std::chrono::hours(24 * settings.keptRepairDays),
+                             settings.keptRepairMegabytes << 20U};
+    options.trials.howToUndo = advice.undo;
+    options.trials.howToUndoPermissions = advice.undoPermissions;
+    options.trials.howToApply = advice.apply;
+    options.trials.howToRepairDirectly = advice.repairDirectly;
+    options.repairPolicy = [isThorough = settings.thoroughVerification] {
+        pellar::RepairPolicy policy;
+        policy.isThorough = isThorough;
+        return policy;
+    };
+}
+
 }  // namespace
 
 pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
-                                      const Asking& asking, const WarningSink& refused)
+                                  const Asking& asking, const WarningSink& refused,
+                                  const RepairAdvice& advice)
 {
     pellar::JobOptions options;
     if (const std::string path = toolPathFromEnvironment(refused); !path.empty())
         options.toolPath = path;
     options.homeDirectory = environmentValue("HOME").value_or("");
-    if (!paths.state.empty()) {
-        options.savedSectorsDirectory = paths.state / "partition-maps";
+    if (!paths.state.empty())
         options.permissionReferences = paths.state / "permissions";
-    }
+    setTrials(options, paths, advice);
     const auto launcher = helperLauncher();
     if (!launcher.empty())
-        options.privileged = [launcher, asking, &texts](const pellar::PrivilegedJob& job,
-                                                        pellar::StopSwitch& stop,
-                                                        pellar::EventQueue& events) {
+        options.privileged = [launcher, asking, advice, &texts](const pellar::PrivilegedJob& job,
+                                                                pellar::StopSwitch& stop,
+                                                                pellar::EventQueue& events) {
             return std::make_unique<PrivilegedScript>(
-                HelperLaunch{launcher, currentLanguages(), asking}, job, texts, stop, events);
+                HelperLaunch{launcher, currentLanguages(), asking, advice}, job, texts, stop,
+                events);
         };
     return options;
 }

@@ -171,6 +171,13 @@ PrivilegedScript::PrivilegedScript(HelperLaunch launch, pellar::PrivilegedJob jo
 
 void PrivilegedScript::run()
 {
+    if (!job_.policy.keptImage.empty()) {
+        log_.started();
+        fail(contract::kPLErrorNotAuthorized,
+             "it takes an administrator's rights, and the repaired volume is not kept with those; "
+             "nothing was done");
+        return events_.flush();
+    }
     std::vector<std::string> command = launch_.launcher;
     for (const std::string& argument : argumentsOf(request_))
         command.push_back(argument);
@@ -237,12 +244,35 @@ void PrivilegedScript::take(pellar::Event event)
         return;
     asked();
     hasStarted_ = true;
+    if (const auto advice = adviceIn(event)) {
+        const std::string sentence = sentenceFor(*advice);
+        if (sentence.empty())
+            return;
+        event = pellar::Message{
+            {},
+            contract::Dictionary::of({{contract::kFsckMessageString, std::string_view(sentence)},
+                                      {contract::kFsckVerbosity, contract::verbosity::main}})};
+    }
     if (auto* const end = std::get_if<pellar::Finished>(&event))
         takeEnd(std::move(*end));
     else if (!held_.empty() || (job_.image && isResult(event)))
         held_.push_back(std::move(event));
     else
         events_.add(std::move(event));
+}
+
+/// The helper does not know by which commands, or in which window, the user works.
+std::string PrivilegedScript::sentenceFor(Advice advice) const
+{
+    switch (advice) {
+        case Advice::Undo:
+            return pellar::adviceFor(job_.disk, job_.task.subject == pellar::Subject::Permissions
+                                                    ? launch_.advice.undoPermissions
+                                                    : launch_.advice.undo);
+        case Advice::Apply: return pellar::adviceFor(job_.disk, launch_.advice.apply);
+        case Advice::RepairDirectly: break;
+    }
+    return pellar::adviceFor(job_.disk, launch_.advice.repairDirectly);
 }
 
 // What was found in a device on an image is true of nothing when the image was cut off or replaced

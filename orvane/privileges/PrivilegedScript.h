@@ -21,12 +21,22 @@ struct Asking {
     std::function<void()> ends;
 };
 
+/// What a user of this program can do after a trial, in their language (pellar::Trials). Any may be
+/// empty.
+struct RepairAdvice {
+    pellar::Trials::Advice undo;
+    pellar::Trials::Advice undoPermissions;
+    pellar::Trials::Advice apply;
+    pellar::Trials::Advice repairDirectly;
+};
+
 /// How the helper is started.
 struct HelperLaunch {
     /// What the helper's arguments are appended to: pkexec(1) and the helper's path.
     std::vector<std::string> launcher;
     std::string languages;
     Asking asking;
+    RepairAdvice advice = {};  ///< where the helper has some to give
 };
 
 /// A job for which this user has no right to the disk: it runs in the helper, as root, when the
@@ -43,6 +53,7 @@ private:
     void take(std::string_view lines);
     void take(pellar::Event event);
     void takeEnd(pellar::Finished end);
+    std::string sentenceFor(Advice advice) const;
     bool isResult(const pellar::Event& event) const;
     void passStopOn(HelperProcess& helper);
     void explain(std::optional<int> status);

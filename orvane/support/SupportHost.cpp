@@ -37,7 +37,7 @@ SupportHost::SupportHost(SupportOptions options, EventLoop& loop)
                if (options_.warn)
                    options_.warn(sentence);
            }),
-      settings_(fileIn(options_.paths.config, "settings.json"),
+      settings_(fileIn(options_.paths.config, settingsFileName),
                 [this](const std::string& sentence) { warn(sentence); }),
       preferences_(settings_),
       store_(options_.keepsHistory ? fileIn(options_.paths.state, "history.sqlite3") : "",

@@ -4,6 +4,8 @@
 #include "orvane/jobs/UnavailableReason.h"
 #include "orvane/terminal/Commands.h"
 
+#include <sys/stat.h>
+
 #include <algorithm>
 
 namespace orvane {
@@ -145,6 +147,23 @@ int treatMaps(const std::vector<NamedDisk>& wanted, const ActionButton& action, 
     return status | treat(disks, action, session, reporter);
 }
 
+/// Why the repaired volume cannot be kept as asked; empty when it can. A volume is looked for in
+/// an image, which is attached for that.
+std::string objectionToKeeping(const std::filesystem::path& file, const NamedDisk& named,
+                               Session& session)
+{
+    struct stat status = {};
+    if (::lstat(file.c_str(), &status) == 0)
+        return session.texts().sentence("“%@” is there already, and is not overwritten",
+                                        {file.native()});
+    const AttachedImage image(session, named.disk);
+    const auto& disk = image.top() ? image.top() : named.disk;
+    return disk->parts().size() > 1
+               ? session.texts().sentence("“%@” holds several volumes, and --keep takes one",
+                                          {named.name})
+               : std::string();
+}
+
 }  // namespace
 
 std::string unavailableReason(Session& session, const TerminalButton& button, const Disk& disk)
@@ -169,6 +188,13 @@ int runCheck(const Request& request, Session& session, Reporter& reporter)
         actionButtons.begin(), actionButtons.end(),
         [&](const ActionButton& button) { return button.command == request.command; });
     const std::vector<NamedDisk> named = session.findDisks(request.disks, status);
+    const auto& kept = request.repairPolicy.keptImage;
+    if (!kept.empty() && !named.empty())
+        if (const std::string objection = objectionToKeeping(kept, named.front(), session);
+            !objection.empty()) {
+            reporter.failure(named.front().name, objection);
+            return exitUnchecked;
+        }
     return status | (request.treatsPartitionMap ? treatMaps(named, action, session, reporter)
                                                 : treat(named, action, session, reporter));
 }

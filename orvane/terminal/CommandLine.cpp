@@ -18,12 +18,14 @@ struct CommandText {
     const char* text;
 };
 
-constexpr std::array<CommandText, 11> commandTexts{{
+constexpr std::array<CommandText, 13> commandTexts{{
     {Command::Verify, "verify", "Look for damage; write nothing"},
     {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
     {Command::VerifyPermissions, "verify-permissions",
      "Compare the permissions of installed files with what their packages say"},
     {Command::RepairPermissions, "repair-permissions", "Set them right"},
+    {Command::Undo, "undo", "Take the last repair back: the disk is as it was before"},
+    {Command::Finish, "finish", "Complete a repair that was interrupted while it was written"},
     {Command::List, "list", "Show disks, their last verdict and what can be done with them"},
     {Command::History, "history", "Show what earlier checks found"},
     {Command::Mount, "mount", "Mount volumes, where the system chooses to"},
@@ -38,7 +40,7 @@ constexpr const char* diskHelp = "A device, an image file, a mount point, LABEL=
 
 constexpr const char* footer =
     "\nExit status, added up over the disks: 0 sound, 1 damage found and repaired, 4 damage left,\n"
-    "8 could not be checked or not conclusive, 16 wrong usage, 32 stopped.";
+    "8 could not be checked, undone or finished, or not conclusive, 16 wrong usage, 32 stopped.";
 
 void addSharedOptions(CLI::App& app, Request& request)
 {
@@ -65,6 +67,48 @@ void addSharedOptions(CLI::App& app, Request& request)
                  "Print every command before it runs, and why an action is refused");
 }
 
+/// How a repair is done; it is tried first where nothing else is said.
+void addRepairOptions(CLI::App& command, Request& request)
+{
+    pellar::RepairPolicy& policy = request.repairPolicy;
+    CLI::Option* const preview =
+        command.add_flag("--preview", policy.isPreview, "Try the repair, and write nothing");
+    command.add_option("--keep", policy.keptImage, "Write the repaired volume to this new file")
+        ->type_name("FILE")
+        ->needs(preview)
+        ->excludes("--partition-map");
+    CLI::Option* const direct = command.add_flag(
+        "--direct", policy.isDirect, "Let the tool write to the disk itself; cannot be undone");
+    CLI::Option* const unproven =
+        command.add_flag("--apply-unproven", policy.appliesUnproven,
+                         "Apply the repair also where it would leave damage");
+    CLI::Option* const noUndo = command.add_flag_callback(
+        "--no-undo", [&policy] { policy.keepsUndo = false; },
+        "Do not keep what the repair overwrites");
+    for (CLI::Option* const other : {direct, unproven, noUndo})
+        preview->excludes(other);
+    direct->excludes(unproven);
+}
+
+/// What the parser's rules cannot say; none when there is nothing to object to.
+const char* objectionTo(Request& request)
+{
+    std::filesystem::path& kept = request.repairPolicy.keptImage;
+    if (kept.empty())
+        return nullptr;
+    if (request.disks.size() > 1)
+        return "--keep takes one disk: there is one file for one volume";
+    std::error_code error;
+    kept = std::filesystem::absolute(kept, error);
+    return error ? "--keep: the current directory cannot be found" : nullptr;
+}
+
+bool treatsMaps(Command command)
+{
+    return command == Command::Verify || command == Command::Repair || command == Command::Undo ||
+           command == Command::Finish;
+}
+
 void addCommand(CLI::App& app, const CommandText& text, Request& request)
 {
     CLI::App& command = *app.add_subcommand(text.name, text.text);
@@ -79,15 +123,31 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
         disks.required();
     if (text.command == Command::History)
         command.add_flag("--clear", request.clearsHistory, "Forget these disks' histories");
-    if (text.command == Command::Verify || text.command == Command::Repair)
+    if (treatsMaps(text.command))
         command.add_flag("--partition-map", request.treatsPartitionMap,
                          "Treat the disk's partition map (GPT or MBR) instead of its volumes");
+    if (text.command == Command::Undo)
+        command
+            .add_flag("--permissions", request.treatsPermissions,
+                      "Take back what repair-permissions did")
+            ->excludes("--partition-map");
+    if (text.command == Command::Verify)
+        command.add_flag("--thorough", request.repairPolicy.isThorough,
+                         "Try a repair as well where reading finds nothing");
+    if (text.command == Command::Repair)
+        addRepairOptions(command, request);
     if (text.command == Command::VerifyPermissions || text.command == Command::RepairPermissions)
         command.add_flag("--fetch-archives", request.fetchesArchives,
                          "Fetch package archives over the network (with apt) where nothing here "
                          "says what permissions their files have");
     command.callback([&request, chosen = text.command] { request.command = chosen; });
     command.fallthrough();
+}
+
+Ending wrongUsage(std::string_view why)
+{
+    return {exitUsage,
+            "fixwell: " + contract::printable(why) + "\nTry “fixwell --help”.\n"};
 }
 
 }  // namespace
@@ -104,14 +164,15 @@ pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* arg
         addCommand(app, text, request);
     try {
         app.parse(argc, argv);
+        if (const char* const objection = objectionTo(request))
+            return wrongUsage(objection);
         return request;
     } catch (const CLI::Success& asked) {
         std::ostringstream text;
         app.exit(asked, text, text);
         return Ending{exitSound, text.str()};
     } catch (const CLI::ParseError& error) {
-        return Ending{exitUsage, "fixwell: " + contract::printable(error.what()) +
-                                     "\nTry “fixwell --help”.\n"};
+        return wrongUsage(error.what());
     }
 }
 

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/jobs/JobOptions.h"
 #include "pellar/outcome/Result.h"
 
 #include <optional>
@@ -26,6 +27,8 @@ enum class Command {
     Repair,
     VerifyPermissions,
     RepairPermissions,
+    Undo,
+    Finish,
     List,
     History,
     Mount,
@@ -44,6 +47,8 @@ struct Request {
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
+    bool treatsPermissions = false;    ///< of installed files; to undo alone
+    pellar::RepairPolicy repairPolicy;  ///< the image to keep is named by an absolute path
     bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;
@@ -60,6 +65,7 @@ struct Ending {
     std::string text;  ///< for standard output when the status is 0, else for standard error
 };
 
+/// A relative path is taken from the current directory.
 [[nodiscard]] pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* argv);
 
 /// As the user writes it.

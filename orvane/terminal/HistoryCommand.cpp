@@ -3,30 +3,37 @@
 #include "orvane/terminal/TerminalText.h"
 
 #include <algorithm>
-#include <utility>
 
 namespace orvane {
 namespace {
 
 std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Session& session)
 {
-    std::vector<std::pair<Run::Time, Run>> runs;
+    struct Line {
+        Run::Time time;
+        Run run;
+        std::string record;
+    };
+    std::vector<Line> lines;
     for (const std::shared_ptr<Disk>& disk : disks) {
         // Of one disk they stand in the order in which they were, though a clock was put back.
         Run::Time newest{};
-        for (Run& run :
-             session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()))) {
+        const std::vector<Run> runs =
+            session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()));
+        const pellar::ListedRecord* const record = session.repairRecords().newestOf(disk->facts());
+        const Run* const undoable =
+            record != nullptr ? runOf(record->facts.repair, runs) : nullptr;
+        for (const Run& run : runs) {
             newest = std::max(newest, run.started);
-            runs.emplace_back(newest, std::move(run));
+            lines.push_back({newest, run, &run == undoable ? record->id : ""});
         }
     }
-    std::stable_sort(runs.begin(), runs.end(),
-                     [](const auto& a, const auto& b) { return a.first < b.first; });
-    std::vector<RunLine> lines;
-    for (const auto& [time, run] : runs)
-        lines.push_back(
-            {localTime(run.started), run.action, run.verdict(), run.end ? run.end->message : ""});
-    return lines;
+    std::ranges::stable_sort(lines, {}, &Line::time);
+    std::vector<RunLine> told;
+    for (const auto& [time, run, record] : lines)
+        told.push_back({localTime(run.started), run.action, run.verdict(),
+                        run.end ? run.end->message : "", record});
+    return told;
 }
 
 // The module leaves out the disks of a failing drive, on which nothing is to be done. Their history

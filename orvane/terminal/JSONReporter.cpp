@@ -125,6 +125,7 @@ public:
                                     ? ordered_json{{"started", disk.later->started},
                                                    {"verdict", textOrNull(disk.later->verdict)}}
                                     : ordered_json(nullptr)},
+               {"interruptedRepair", textOrNull(disk.interruptedRepair)},
                {"actions", actions}});
     }
 
@@ -147,7 +148,8 @@ public:
                    {"started", run.started},
                    {"action", run.action},
                    {"verdict", textOrNull(run.verdict)},
-                   {"message", textOrNull(run.message)}});
+                   {"message", textOrNull(run.message)},
+                   {"record", textOrNull(run.record)}});
     }
 
 private:

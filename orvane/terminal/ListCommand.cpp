@@ -37,6 +37,9 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
 {
     const DiskFacts& facts = disk->facts();
     DiskLine line;
+    const pellar::ListedRecord* const record = session.repairRecords().newestOf(facts);
+    if (record != nullptr && record->isInterrupted())
+        line.interruptedRepair = record->id;
     line.disk = session.names().nameOf(facts.identifier);
     line.name = disk->displayName();
     line.kind = session.texts().text(kindText(facts.type));
@@ -80,6 +83,7 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
         line.lastChecked = volume.lastChecked;
         line.verdict = volume.verdict;
         line.later = volume.later;
+        line.interruptedRepair = volume.interruptedRepair;
     }
     reporter.listed(line);
     if (!top)

@@ -25,6 +25,14 @@ std::string GivenNames::nameOf(std::string_view identifier) const
     return std::string(identifier);
 }
 
+std::string GivenNames::namedOf(std::string_view identifier) const
+{
+    for (const auto& [known, name] : names_)
+        if (isWithin(identifier, known))
+            return name;
+    return std::string(identifier);
+}
+
 bool GivenNames::isWithin(std::string_view identifier, std::string_view named)
 {
     if (!identifier.starts_with(named))

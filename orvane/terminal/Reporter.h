@@ -40,6 +40,8 @@ struct DiskLine {
         std::string verdict;  ///< empty when it was cut off
     };
     std::optional<Attempt> later = {};
+    /// The record of a repair that was interrupted as it was written; empty: none that is known.
+    std::string interruptedRepair = {};
     std::vector<ActionLine> actions;
 };
 
@@ -49,6 +51,7 @@ struct RunLine {
     std::string action;
     std::string verdict;  ///< empty for a run that was cut off with the program
     std::string message;
+    std::string record = {};  ///< of what the repair overwrote, where it can be undone; mostly empty
 };
 
 /// What the user called each disk. A volume inside an image is called by the image's name and
@@ -59,6 +62,9 @@ public:
 
     /// The identifier itself for a disk that was not named.
     std::string nameOf(std::string_view identifier) const;
+
+    /// What the user named: the disk, or what it lies inside of.
+    std::string namedOf(std::string_view identifier) const;
 
     /// Whether the disk is the named one, or lies inside it.
     static bool isWithin(std::string_view identifier, std::string_view named);

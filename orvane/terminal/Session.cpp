@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/terminal/Session.h"
 
-#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
+#include "orvane/terminal/TerminalText.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <unistd.h>
@@ -79,16 +79,60 @@ pellar::JobOptions Session::libraryOptions(const Request& request)
 {
     pellar::JobOptions options =
         orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking(),
-                               [this](const std::string& sentence) { trace(sentence); });
+                               [this](const std::string& sentence) { trace(sentence); },
+                               repairAdvice());
     options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },
                                libraryTexts_.text("With --fetch-archives the archives of these "
                                                   "packages are fetched over the network.")};
+    options.repairPolicy = [stored = options.repairPolicy(), asked = request.repairPolicy] {
+        pellar::RepairPolicy policy = asked;
+        policy.isThorough = asked.isThorough || stored.isThorough;
+        return policy;
+    };
+    trials_ = options.trials;
     options.observer = &ledger_;
     if (tracesCommands_)
         options.commandTrace = [this](std::string_view line) {
             trace(line);
         };
     return options;
+}
+
+// Asked on the job's thread. While a job runs no disk gets another name.
+RepairAdvice Session::repairAdvice() const
+{
+    const auto command = [this](std::string_view sentence, std::string_view words,
+                                const contract::DiskReference& disk, const std::string& name) {
+        const std::string_view option = disk.isWhole ? " --partition-map " : " ";
+        return pellar::Sentence{
+            sentence, "fixwell " + std::string(words) + std::string(option) + shellWord(name), {}}
+            .in(libraryTexts_);
+    };
+    return {[this, command](const contract::DiskReference& disk) {
+                return command("To take the repair back: %1$@", "undo", disk,
+                               names_.nameOf(disk.identifier));
+            },
+            [this, command](const contract::DiskReference& disk) {
+                return command("To take the repair back: %1$@", "undo --permissions", disk,
+                               names_.nameOf(disk.identifier));
+            },
+            [this, command](const contract::DiskReference& disk) {
+                return command("To apply it although damage would be left, which can be undone as "
+                               "well: %1$@",
+                               "repair --apply-unproven", disk, names_.namedOf(disk.identifier));
+            },
+            [this, command](const contract::DiskReference& disk) {
+                return command("To let the tool write to the disk itself, which cannot be undone: "
+                               "%1$@",
+                               "repair --direct", disk, names_.namedOf(disk.identifier));
+            }};
+}
+
+const RepairRecords& Session::repairRecords()
+{
+    if (!repairRecords_)
+        repairRecords_.emplace(trials_);
+    return *repairRecords_;
 }
 
 void Session::trace(std::string_view line)

@@ -2,9 +2,11 @@
 #pragma once
 
 #include "contract/toolkit/ControlNames.h"
+#include "orvane/jobs/HostJob.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/jobs/LibraryTexts.h"
-#include "orvane/privileges/PrivilegedScript.h"
+#include "orvane/jobs/RepairRecords.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleLoader.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/PasswordAgent.h"
@@ -71,6 +73,8 @@ public:
     TerminalButton& button(std::string_view outlet) { return interface_.button(outlet); }
     /// Presses the button, and returns when the job is over or was declined.
     void pressAndWait(TerminalButton& button);
+    /// Does what no module knows, and returns when it is over; how it ended.
+    RunEnd carryOut(pellar::Task task, const DiskPointer& disk);
     /// Writes the selected disks' whole log, under the name that the user gave.
     void writeAllRowsOf(const std::string& name);
 
@@ -81,6 +85,8 @@ public:
     TerminalHost& host() { return host_; }
     const Translator& texts() { return host_.translator(); }
     const pellar::Manager& library() const { return library_; }
+    /// Read when this is first asked.
+    const RepairRecords& repairRecords();
     const GivenNames& names() const { return names_; }
 
 private:
@@ -94,6 +100,7 @@ private:
     SupportOptions supportOptions(const Request& request);
     pellar::JobOptions libraryOptions(const Request& request);
     TerminalWindow::Events windowEvents();
+    RepairAdvice repairAdvice() const;
     void trace(std::string_view line);
     Asking asking();
     [[nodiscard]] Result<DiskPointer, Failure> findDisk(const std::string& name);
@@ -115,12 +122,15 @@ private:
     TerminalAlerts alerts_;
     Catalogue hostTexts_;
     LibraryTexts libraryTexts_;
+    pellar::Trials trials_;  ///< as the library has them
+    std::optional<RepairRecords> repairRecords_;
     pellar::Manager library_;
     TerminalHost host_;
     JobLedger ledger_;
     LoadedModule loaded_;
     std::unique_ptr<contract::OVModule> module_;
     std::string currentDisk_;  ///< what the user calls the disk whose rows are coming
+    HostJob* hostJob_ = nullptr;  ///< that is under way
     std::optional<RunEnd> unreportedEnd_;
     std::map<std::string, RunEnd> outcomes_;
     bool isStopping_ = false;

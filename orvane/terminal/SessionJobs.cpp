@@ -71,6 +71,32 @@ void Session::pressAndWait(TerminalButton& button)
     host_.histories().saveNew();
 }
 
+// Progress and the interface's lock are the window's, as in a module's job.
+RunEnd Session::carryOut(pellar::Task task, const DiskPointer& disk)
+{
+    const Interrupts interrupts(loop_, [this] { interrupt(); });
+    HostJob job(library_, host_, disk,
+                {[this] { logView_.reloadData(); },
+                 [this](double percent) {
+                     window_.setGlobalProgressBarIndeterminate(false);
+                     window_.setGlobalProgressBarValue(percent);
+                 }});
+    host_.sharedDiskController().hold({disk});
+    window_.setInterfaceLock();
+    window_.setGlobalProgressBarIndeterminate(true);
+    window_.setGlobalProgressText(HostJob::titleOf(task, *disk, host_.translator()));
+    hostJob_ = &job;
+    job.begin(task);
+    loop_.runUntil([&job] { return job.isOver(); });
+    hostJob_ = nullptr;
+    window_.resetInterfaceLock();
+    reportEnd();
+    host_.histories().saveNew();
+    host_.sharedDiskController().release();
+    repairRecords_.reset();
+    return outcomes_[disk->facts().identifier];
+}
+
 void Session::writeAllRowsOf(const std::string& name)
 {
     currentDisk_ = name;
@@ -85,7 +111,9 @@ void Session::interrupt()
     reporter_.prompt(Reporter::Prompt::Left);
     const bool isFirst = !isStopping_;
     isStopping_ = true;
-    if (!isFirst)
+    if (hostJob_ != nullptr)
+        hostJob_->stop();
+    else if (!isFirst)
         library_.cancelAgain();
     else if (!pressStop())
         host_.imageAttachment().stopAttachments();

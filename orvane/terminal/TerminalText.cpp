@@ -105,6 +105,20 @@ std::string terminalText(const contract::StyledText& text, bool colors)
     return result;
 }
 
+std::string shellWord(std::string_view text)
+{
+    constexpr std::string_view plain =
+        "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789/._-+:=,@%";
+    // What begins with a dash would be an option.
+    const std::string shown = (text.starts_with('-') ? "./" : "") + contract::printable(text);
+    if (!shown.empty() && shown.find_first_not_of(plain) == std::string::npos)
+        return shown;
+    std::string word = "'";
+    for (const char character : shown)
+        word += character == '\'' ? std::string("'\\''") : std::string(1, character);
+    return word + "'";
+}
+
 std::string fittedTo(std::string_view text, std::size_t columns)
 {
     std::string fitted;

@@ -133,6 +133,8 @@ public:
         if (disk.later)
             below(sentence("after that, %@: %@",
                            {disk.later->started, verdictText(disk.later->verdict)}));
+        if (!disk.interruptedRepair.empty())
+            below(sentence("repair interrupted: finish or undo it", {}));
         for (const ActionLine& action : disk.actions)
             below(fmt::format("{:<24} {}", action.title,
                               action.isAvailable ? sentence("available", {})
@@ -151,8 +153,8 @@ public:
         endLine();
         write(bold(disk) + (runs.empty() ? ": " + sentence("never checked", {}) + "\n" : "\n"));
         for (const RunLine& run : runs)
-            write(contract::printable(fmt::format("  {}  {:<8} {}", run.started, run.action,
-                                                  verdictText(run.verdict))) +
+            write(contract::printable(fmt::format("  {}  {:<8} {}{}", run.started, run.action,
+                                                  verdictText(run.verdict), noteOn(run))) +
                   "\n");
         if (!runs.empty())
             write("\n");
@@ -221,6 +223,11 @@ private:
     std::string verdictText(std::string_view verdict) const
     {
         return options_.translate(verdict.empty() ? "cut off" : verdict);
+    }
+
+    std::string noteOn(const RunLine& run) const
+    {
+        return run.record.empty() ? "" : "  (" + sentence("can be undone", {}) + ")";
     }
 
     const TextReporterOptions options_;

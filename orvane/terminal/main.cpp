@@ -62,6 +62,8 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     }
     switch (request.command) {
         case Command::List: return runList(request, session, reporter);
+        case Command::Undo:
+        case Command::Finish: return runUndo(request, session, reporter);
         case Command::History: return runHistory(request, session, reporter);
         default: return runCheck(request, session, reporter);
     }

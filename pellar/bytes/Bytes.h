@@ -13,8 +13,23 @@ namespace pellar {
 using Bytes = std::vector<std::uint8_t>;
 using ByteView = std::span<const std::uint8_t>;
 
+/// A stretch of a file, a device or a region of one, in bytes.
+struct ByteRange {
+    std::uint64_t offset = 0;
+    std::uint64_t length = 0;
+
+    constexpr std::uint64_t end() const { return offset + length; }
+    friend bool operator==(const ByteRange&, const ByteRange&) = default;
+};
+
 /// All of `count` bytes at `place`, or none.
 std::optional<Bytes> readDisk(int descriptor, std::uint64_t place, std::size_t count);
+
+// All of the bytes, however many calls that takes; 0, or errno. A file that ends before them, or
+// takes none of them, is EIO; a place that no file has is EFBIG.
+
+[[nodiscard]] int readAll(int descriptor, std::uint64_t place, std::span<std::uint8_t> bytes);
+[[nodiscard]] int writeAll(int descriptor, std::uint64_t place, ByteView bytes);
 
 // The number of `length` bytes, 8 at most, that stands at `offset`. All of them must be there.
 

@@ -157,15 +157,28 @@ Result<DiskForTool, int> DiskForTool::prepare(const DiskClaim& claim, Form form,
 {
     const bool isFit = form == Form::Itself || (form == Form::VolumeAlone && claim.isAllOfIt()) ||
                        (claim.isAllOfIt() && claim.isBlockDevice());
-    DiskForTool disk(claim.descriptor(), isFit ? claim.offset() : 0);
     if (isFit)
-        return Result<DiskForTool, int>(std::move(disk));
-    auto loop =
-        LoopDevice::attach(claim.descriptor(), claim.offset(), claim.availableBytes(), access);
+        return DiskForTool(claim.descriptor(), claim.offset());
+    return onLoop(claim.descriptor(), claim.offset(), claim.availableBytes(), access);
+}
+
+Result<DiskForTool, int> DiskForTool::prepare(int file, std::uint64_t bytes, Form form,
+                                              Access access)
+{
+    if (form == Form::BlockDevice)
+        return onLoop(file, 0, bytes, access);
+    return DiskForTool(file, 0);
+}
+
+Result<DiskForTool, int> DiskForTool::onLoop(int file, std::uint64_t offset, std::uint64_t bytes,
+                                             Access access)
+{
+    auto loop = LoopDevice::attach(file, offset, bytes, access);
     if (!loop)
         return loop.error();
-    disk.loop_.emplace(std::move(*loop));
-    return Result<DiskForTool, int>(std::move(disk));
+    DiskForTool disk(file, 0);
+    disk.loop_.emplace(*std::move(loop));
+    return disk;
 }
 
 }  // namespace pellar

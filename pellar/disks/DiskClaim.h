@@ -76,12 +76,17 @@ public:
     /// An errno when there is no loop device to be had (LoopDevice::attach).
     [[nodiscard]] static Result<DiskForTool, int> prepare(const DiskClaim& claim, Form form,
                                                           Access access);
+    /// The same of a file that holds the volume and nothing else, which outlives it.
+    [[nodiscard]] static Result<DiskForTool, int> prepare(int file, std::uint64_t bytes, Form form,
+                                                          Access access);
 
     int descriptor() const { return loop_ ? loop_->descriptor() : descriptor_; }
     std::uint64_t offset() const { return offset_; }
 
 private:
     DiskForTool(int descriptor, std::uint64_t offset) : descriptor_(descriptor), offset_(offset) {}
+    static Result<DiskForTool, int> onLoop(int file, std::uint64_t offset, std::uint64_t bytes,
+                                           Access access);
 
     int descriptor_;  // not owned
     std::uint64_t offset_;

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/bytes/Bytes.h"
+
 #include <cstdint>
 #include <functional>
 #include <optional>
@@ -8,23 +10,15 @@
 
 namespace pellar {
 
-/// A piece of a volume, bytes from its start.
-struct DiskPiece {
-    std::uint64_t start = 0;
-    std::uint64_t bytes = 0;
-
-    friend bool operator==(const DiskPiece&, const DiskPiece&) = default;
-};
-
 /// The beginning and the end of a volume, where file systems keep what they are built on: as much
 /// as is read in a second or two.
-std::vector<DiskPiece> endsOfVolume(std::uint64_t availableBytes);
+std::vector<ByteRange> endsOfVolume(std::uint64_t availableBytes);
 
 /// The first byte of these pieces that the kernel cannot read, from the volume's start; none when
 /// all can be read, or `isStopped` says so before. `offset` is where on the disk the volume begins;
 /// the pieces lie on the disk.
 std::optional<std::uint64_t> firstUnreadable(int descriptor, std::uint64_t offset,
-                                             const std::vector<DiskPiece>& pieces,
+                                             const std::vector<ByteRange>& pieces,
                                              const std::function<bool()>& isStopped);
 
 }  // namespace pellar

@@ -17,13 +17,30 @@ struct JobContext {
     const Texts& texts;
     StopSwitch& stop;
     EventQueue& events;
+    contract::DiskReference disk;
     JobLog log;
+    RepairPolicy policy;
 
-    JobContext(const contract::DiskReference& disk, const JobOptions& options_, const Texts& texts_,
+    JobContext(const contract::DiskReference& disk_, const JobOptions& options_, const Texts& texts_,
                StopSwitch& stop_, EventQueue& events_)
-        : options(options_), texts(texts_), stop(stop_), events(events_), log(disk, texts, events)
+        : options(options_),
+          texts(texts_),
+          stop(stop_),
+          events(events_),
+          disk(disk_),
+          log(disk, texts, events),
+          policy(policyFor(options))
     {
     }
+
+    /// Tells what the user can do next, where there is something to be told.
+    void advise(const Trials::Advice& advice)
+    {
+        if (const std::string sentence = adviceFor(disk, advice); !sentence.empty())
+            log.remark(sentence);
+    }
+
+    RepairWay repairWay() const { return repairWayFor(options, policy); }
 };
 
 /// Makes a script that heeds the switch and tells its events to the queue. Both outlive it.

@@ -5,9 +5,13 @@
 #include "pellar/disks/DiskClaim.h"
 #include "pellar/jobs/EventQueue.h"
 #include "pellar/outcome/Task.h"
+#include "pellar/overlay/Overlay.h"
 #include "pellar/process/KernelFiles.h"
 #include "pellar/process/ProcessOutput.h"
 #include "pellar/process/Stopping.h"
+#include "pellar/undo/UndoStore.h"
+
+#include <unistd.h>
 
 #include <chrono>
 #include <filesystem>
@@ -28,6 +32,51 @@ public:
     virtual void run() = 0;
 };
 
+/// How one job is to repair.
+struct RepairPolicy {
+    bool isDirect = false;         ///< the tool writes to the disk itself, which nothing takes back
+    bool isPreview = false;        ///< the repair is tried, and not applied
+    bool appliesUnproven = false;  ///< it is applied as well where damage would be left
+    bool keepsUndo = true;         ///< what it overwrites is kept, so that it can be taken back
+    bool isThorough = false;       ///< a verification that finds nothing tries a repair as well
+    std::filesystem::path keptImage;  ///< where a preview leaves the repaired volume; or empty
+
+    friend bool operator==(const RepairPolicy&, const RepairPolicy&) = default;
+};
+
+/// What it takes to try repairs, and to take them back.
+struct Trials {
+    /// Where what a tool would write is kept, and, below it, what repairs have overwritten. Without
+    /// a directory no repair is tried: the tools write to the disks themselves.
+    OverlayRoom room;
+    RecordLimits limits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
+    uid_t user = ::geteuid();  ///< who asks, and may take a repair back
+    /// Makes a sentence in the user's language about a disk; asked on the job's thread, while the
+    /// main thread runs. May be empty, and answer nothing, which is not told.
+    using Advice = std::function<std::string(const contract::DiskReference&)>;
+    Advice howToUndo;            ///< how a repair is taken back
+    Advice howToUndoPermissions;  ///< how one of permissions is
+    Advice howToApply;           ///< how one is applied that is not proven
+    Advice howToRepairDirectly;  ///< how one is done without a trial
+};
+
+inline std::string adviceFor(const contract::DiskReference& disk, const Trials::Advice& advice)
+{
+    return advice ? advice(disk) : std::string();
+}
+
+/// Where the records are of what repairs have overwritten (UndoStore).
+inline std::filesystem::path recordsIn(const Trials& trials)
+{
+    return trials.room.directory / "records";
+}
+
+/// Where the records are of the permissions that repairs have changed (PermissionRecords).
+inline std::filesystem::path permissionRecordsIn(const Trials& trials)
+{
+    return trials.room.directory / "permission-records";
+}
+
 /// A job for which this user has no right: on a block device that they may not open, on files that
 /// are not theirs, or on a part of an image that the kernel has to make a device of.
 struct PrivilegedJob {
@@ -38,6 +87,7 @@ struct PrivilegedJob {
     std::shared_ptr<const DiskClaim> image;
     /// The user agrees that archives of packages are fetched (JobOptions::archiveFetching).
     bool fetchesArchives = false;
+    RepairPolicy policy = {};
 };
 
 /// Makes the script of such a job; empty where there is no way to get the right. Any thread.
@@ -75,17 +125,29 @@ struct JobOptions {
     /// when others can write to it. Empty: nothing is kept.
     std::filesystem::path permissionReferences;
     ArchiveFetching archiveFetching;
-    /// Where the sectors that the repair of a partition map overwrites are kept first; absolute,
-    /// made when it is needed. Empty: no partition map is repaired.
-    std::filesystem::path savedSectorsDirectory;
+    Trials trials;
+    /// Asked as a job begins, on the main thread; may be empty.
+    std::function<RepairPolicy()> repairPolicy;
     PrivilegedScripts privileged;
     JobObserver* observer = nullptr;  ///< outlives the manager; none when null
 };
 
-/// What a task may do to the disk.
-inline Access accessFor(Operation operation)
+inline RepairPolicy policyFor(const JobOptions& options)
 {
-    return operation == Operation::Verify ? Access::ReadOnly : Access::ReadWrite;
+    return options.repairPolicy ? options.repairPolicy() : RepairPolicy();
+}
+
+inline RepairWay repairWayFor(const JobOptions& options, const RepairPolicy& policy)
+{
+    const bool isTried = !policy.isDirect && !options.trials.room.directory.empty();
+    return isTried ? RepairWay::TriedFirst : RepairWay::Direct;
+}
+
+/// What a task may do to the disk.
+inline Access accessFor(Operation operation, const RepairPolicy& policy = {})
+{
+    return operation == Operation::Verify || policy.isPreview ? Access::ReadOnly
+                                                              : Access::ReadWrite;
 }
 
 }  // namespace pellar

@@ -28,17 +28,29 @@ void PartOfImageScript::run()
 bool PartOfImageScript::needsDevice() const
 {
     const Tool* const tool = request_.tool;
-    if (tool == nullptr || tool->habits.takesOffset)
+    if (tool == nullptr || tool->habits.takesOffset || canBeTried())
         return false;
     const bool isRepair = request_.operation == Operation::Repair;
     return !findProgram(tool->name, context_.options.toolPath).empty() &&
-           (!isRepair || (tool->canRepair() &&
+           (!isRepair || (tool->repairs(context_.repairWay()) &&
                           !findProgram(tool->repairName, context_.options.toolPath).empty()));
+}
+
+/// Where repairs can be tried, a tool is shown the part alone.
+bool PartOfImageScript::canBeTried() const
+{
+    if (context_.repairWay() == RepairWay::Direct)
+        return false;
+    const DiskClaim& claim = *request_.claim;
+    return static_cast<bool>(TrialDisk::of(claim.descriptor(),
+                                           {claim.offset(), claim.availableBytes()},
+                                           context_.options.trials.room));
 }
 
 std::unique_ptr<Script> PartOfImageScript::scriptOfOthers()
 {
-    PrivilegedJob job{{Subject::Filesystem, request_.operation}, *request_.disk, nullptr, false};
+    PrivilegedJob job{
+        {Subject::Filesystem, request_.operation}, *request_.disk, nullptr, false, context_.policy};
     job.image = std::make_shared<const DiskClaim>(*std::exchange(request_.claim, std::nullopt));
     return context_.options.privileged(job, context_.stop, context_.events);
 }

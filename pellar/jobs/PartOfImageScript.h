@@ -20,6 +20,7 @@ public:
 
 private:
     bool needsDevice() const;
+    bool canBeTried() const;
     std::unique_ptr<Script> scriptOfOthers();
 
     VolumeRequest request_;

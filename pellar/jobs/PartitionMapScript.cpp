@@ -3,11 +3,13 @@
 
 #include "contract/foundation/Array.h"
 #include "contract/foundation/UTF8.h"
+#include "pellar/jobs/RecordedWriting.h"
 #include "pellar/partitions/MapOutcome.h"
-#include "pellar/partitions/SavedSectors.h"
 
+#include <algorithm>
+#include <chrono>
 #include <limits>
-#include <system_error>
+#include <span>
 #include <thread>
 #include <utility>
 
@@ -43,6 +45,54 @@ Sentence reasonOf(contract::ErrorCode claimError)
     }
 }
 
+/// Where the plan writes, in ascending order, each place once.
+std::vector<ByteRange> rangesOf(const RepairPlan& plan, std::uint32_t sectorBytes)
+{
+    std::vector<ByteRange> ranges;
+    for (const SectorWrite& write : plan.writes)
+        ranges.push_back({write.first * sectorBytes, write.after.size()});
+    std::ranges::sort(ranges, {}, &ByteRange::offset);
+    std::vector<ByteRange> apart;
+    for (const ByteRange& range : ranges)
+        if (apart.empty() || apart.back().end() <= range.offset)
+            apart.push_back(range);
+        else
+            apart.back().length = std::max(apart.back().end(), range.end()) - apart.back().offset;
+    return apart;
+}
+
+/// The bytes of a disk as the plan leaves it.
+class PlannedRegion final : public RegionReader {
+public:
+    PlannedRegion(Region& disk, const RepairPlan& plan, std::uint32_t sectorBytes)
+        : disk_(disk), plan_(plan), sectorBytes_(sectorBytes)
+    {
+    }
+
+    std::vector<ByteRange> ranges() const { return rangesOf(plan_, sectorBytes_); }
+    std::uint64_t length() const override { return disk_.length(); }
+
+    int read(std::uint64_t place, std::span<std::uint8_t> bytes) override
+    {
+        if (const int error = disk_.read(place, bytes))
+            return error;
+        for (const SectorWrite& write : plan_.writes) {
+            const std::uint64_t start = write.first * sectorBytes_;
+            const std::uint64_t from = std::max(place, start);
+            const std::uint64_t end = std::min(place + bytes.size(), start + write.after.size());
+            if (from < end)
+                std::ranges::copy(ByteView(write.after).subspan(from - start, end - from),
+                                  bytes.begin() + static_cast<std::ptrdiff_t>(from - place));
+        }
+        return 0;
+    }
+
+private:
+    Region& disk_;
+    const RepairPlan& plan_;
+    const std::uint32_t sectorBytes_;
+};
+
 Outcome stopped()
 {
     return {Verdict::Stopped, contract::kPLErrorCancelled, 0, {}, {}};
@@ -69,7 +119,8 @@ Result<MapClaim, contract::ErrorCode> PartitionMapScript::claim() const
     constexpr std::chrono::milliseconds pause{50};
     constexpr int mostTries = 40;
     for (int tries = 1;; ++tries) {
-        auto taken = MapClaim::take(*disk_, accessFor(operation_), context_.options.systemPaths);
+        auto taken = MapClaim::take(*disk_, accessFor(operation_, context_.policy),
+                                    context_.options.systemPaths);
         const bool isBusy = !taken && taken.error() == contract::kPLErrorDiskInUse;
         if (!isBusy || tries == mostTries || context_.stop.isPressed())
             return taken;
@@ -102,19 +153,65 @@ Outcome PartitionMapScript::carryOut()
                : outcome;
 }
 
+// What the map will be is known before anything is written: by reading it through the plan.
 Outcome PartitionMapScript::repair(const MapClaim& claim, const PartitionMap& map,
                                    const MapReport& report)
 {
     const auto planned = planRepair(map, report, claim.sectors());
     if (!planned)
         return outcomeOfRefusedRepair(planned.error());
-    const auto& plan = *planned;
-    Outcome outcome;
-    if (!save(claim, plan, outcome))
-        return outcome;
+    const PartitionMap repaired = claim.readMap(*planned);
+    const Outcome outcome = outcomeOfMapRepair(repaired, reportOn(repaired));
+    for (const SectorWrite& write : planned->writes)
+        step({write.what, {}, {}}, 50);
+    if (context_.policy.isPreview)
+        return preview(claim, *planned, outcome);
+    if (outcome.verdict != Verdict::Repaired && !context_.policy.appliesUnproven)
+        return outcomeOfRefusedRepair(
+            {"a repair was tried, and would leave damage; nothing was written", {}, {}});
     if (context_.stop.isPressed())
         return stopped();
-    outcome = write(claim, plan);
+    return write(claim, *planned);
+}
+
+Outcome PartitionMapScript::preview(const MapClaim& claim, const RepairPlan& plan,
+                                    const Outcome& planned)
+{
+    const std::vector<ByteRange> ranges = rangesOf(plan, claim.sectors().sectorBytes());
+    log_.remark(Sentence{"The repair would change %1$@ bytes in %2$@ places.",
+                         std::to_string(lengthOf(ranges)), std::to_string(ranges.size())});
+    if (planned.verdict != Verdict::Repaired)
+        return outcomeOfRefusedRepair(
+            {"a repair was tried, and would leave damage; nothing was written", {}, {}});
+    return {Verdict::Damaged,
+            contract::kPLErrorMapDamaged,
+            0,
+            {"a repair was tried, and would make it sound; nothing was written", {}, {}},
+            {}};
+}
+
+// Whatever has happened on the way, what can be read afterwards is the answer.
+Outcome PartitionMapScript::write(const MapClaim& claim, const RepairPlan& plan)
+{
+    FileRegion disk(claim.descriptor(), claim.offset(), claim.length());
+    PlannedRegion after(disk, plan, claim.sectors().sectorBytes());
+    RecordedWriting writing(
+        context_,
+        {recordedDisk(*disk_, claim.descriptor(), {claim.offset(), claim.length()}),
+         {Subject::PartitionMap, Operation::Repair},
+         context_.options.trials.user,
+         std::chrono::system_clock::now()},
+        contract::kPLErrorMapNotRepaired);
+    if (auto failure = writing.write(after.ranges(), disk, after))
+        return *std::move(failure);
+    step({"Verifying the repaired partition map of “%1$@”", log_.diskName(), {}}, 95);
+    claim.sectors().forgetCached();
+    const PartitionMap map = claim.readMap();
+    const MapReport found = reportOn(map);
+    for (const Finding& finding : found.findings)
+        if (levelOf(finding.kind) != FindingLevel::Note)
+            tell(finding);
+    Outcome outcome = outcomeOfMapRepair(map, found);
     if (outcome.verdict == Verdict::Repaired && !claim.rereadPartitions())
         log_.remark(
             Sentence{"The system has not taken up the repaired map yet; it does when "
@@ -122,49 +219,6 @@ Outcome PartitionMapScript::repair(const MapClaim& claim, const PartitionMap& ma
                      {},
                      {}});
     return outcome;
-}
-
-bool PartitionMapScript::save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome)
-{
-    const SavedDisk disk{disk_->path, claim.offset(), claim.sectors().sectorBytes(),
-                         std::chrono::system_clock::now()};
-    const auto saved = saveSectors(plan, disk, context_.options.savedSectorsDirectory);
-    if (!saved) {
-        outcome = outcomeOfRefusedRepair(saved.error());
-        return false;
-    }
-    const std::string directory = contract::printable(saved->native());
-    log_.remark(
-        {"The sectors that are overwritten are kept in %1$@; the README.txt there tells how "
-         "to put them back.",
-         directory,
-         {}});
-    return true;
-}
-
-// Whatever has happened on the way, what can be read afterwards is the answer.
-Outcome PartitionMapScript::write(const MapClaim& claim, const RepairPlan& plan)
-{
-    const FileSectors sectors = claim.sectors();
-    for (const SectorWrite& write : plan.writes) {
-        step({write.what, {}, {}}, 50);
-        if (const int error = sectors.write(write.first, write.after))
-            return outcomeOfRefusedRepair({"sector %1$@ cannot be written: %2$@",
-                                           std::to_string(write.first),
-                                           std::generic_category().message(error)});
-    }
-    step({"Verifying the repaired partition map of “%1$@”", log_.diskName(), {}}, 80);
-    sectors.forgetCached();
-    for (const SectorWrite& write : plan.writes)
-        if (sectors.read(write.first, write.after.size() / sectors.sectorBytes()) != write.after)
-            return outcomeOfRefusedRepair(
-                {"sector %1$@ does not hold what was written", std::to_string(write.first), {}});
-    const PartitionMap map = claim.readMap();
-    const MapReport found = reportOn(map);
-    for (const Finding& finding : found.findings)
-        if (levelOf(finding.kind) != FindingLevel::Note)
-            tell(finding);
-    return outcomeOfMapRepair(map, found);
 }
 
 void PartitionMapScript::tellMap(const PartitionMap& map)
@@ -204,13 +258,14 @@ void PartitionMapScript::step(Sentence sentence, double percent)
 
 void PartitionMapScript::report(const Outcome& outcome)
 {
+    const Operation operation = context_.policy.isPreview ? Operation::Verify : operation_;
     const std::string message =
-        mapMessageOf(outcome, operation_, log_.diskName(), context_.texts).in(context_.texts);
+        mapMessageOf(outcome, operation, log_.diskName(), context_.texts).in(context_.texts);
     if (outcome.verdict == Verdict::Failed)
         log_.failure(message);
     else if (!outcome.reason.isEmpty())
         log_.remark(message);
-    const Sentence line = mapVerdictLine(outcome.verdict, operation_, log_.diskName());
+    const Sentence line = mapVerdictLine(outcome.verdict, operation, log_.diskName());
     if (!line.isEmpty())
         log_.verdict(outcome.code == contract::kPLNoError, log_.text(line));
     log_.finished(outcome, message);

@@ -24,7 +24,7 @@ private:
     Result<MapClaim, contract::ErrorCode> claim() const;
     Outcome repair(const MapClaim& claim, const PartitionMap& map, const MapReport& report);
     Outcome write(const MapClaim& claim, const RepairPlan& plan);
-    bool save(const MapClaim& claim, const RepairPlan& plan, Outcome& outcome);
+    Outcome preview(const MapClaim& claim, const RepairPlan& plan, const Outcome& planned);
     void tellMap(const PartitionMap& map);
     void tell(const Finding& finding);
     void step(Sentence sentence, double percent);

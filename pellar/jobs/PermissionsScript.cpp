@@ -6,11 +6,9 @@
 #include "pellar/packages/InstalledSystem.h"
 #include "pellar/permissions/InstalledReferences.h"
 #include "pellar/permissions/PermissionsOutcome.h"
-#include "pellar/permissions/Restoring.h"
 
 #include <unistd.h>
 
-#include <system_error>
 #include <utility>
 
 namespace pellar {
@@ -27,7 +25,8 @@ constexpr double repairWasTried = 80;
 PermissionsScript::PermissionsScript(contract::DiskReferencePointer disk, Operation operation,
                                      JobContext context)
     : disk_(std::move(disk)),
-      operation_(operation),
+      // What a repair would set is what a verification tells.
+      operation_(context.policy.isPreview ? Operation::Verify : operation),
       context_(std::move(context)),
       fetchesArchives_(context_.options.archiveFetching.isAllowed &&
                        context_.options.archiveFetching.isAllowed())
@@ -67,7 +66,11 @@ Outcome PermissionsScript::treat(const RootDirectory& root, const References& re
     const bool isRepair = operation_ == Operation::Repair;
     log_.meter().setRange(databaseWasRead, isRepair ? repairWasTried : 100);
     step("Comparing the permissions of the installed files");
+    if (isRepair)
+        restoring_.emplace(disk_, root, context_);
     auto tally = look(root, references, isRepair ? Pass::Repair : Pass::Verify);
+    if (isRepair)
+        restoring_->finish();
     if (tally && isRepair && tally->differing > 0) {
         log_.meter().setRange(repairWasTried, 100);
         step("Comparing once more after the repair");
@@ -76,8 +79,7 @@ Outcome PermissionsScript::treat(const RootDirectory& root, const References& re
     if (!tally)
         return {Verdict::Stopped, contract::kPLErrorCancelled, 0, {}};
     tell(*tally);
-    return isRepair ? outcomeOfPermissionsRepair(*tally, restored_)
-                    : outcomeOfPermissionsVerification(*tally);
+    return isRepair ? outcomeOfRepair(*tally) : outcomeOfPermissionsVerification(*tally);
 }
 
 Result<References, Sentence> PermissionsScript::readReferences(const RootDirectory& root)
@@ -112,6 +114,8 @@ std::optional<Tally> PermissionsScript::look(const RootDirectory& root,
         log_.progress(100 * ++done / static_cast<double>(references.files.size()));
         log_.flushIfDue();
     }
+    if (pass == Pass::Repair)
+        restoring_->carryOut();
     log_.endOfRun();
     return tally;
 }
@@ -119,14 +123,19 @@ std::optional<Tally> PermissionsScript::look(const RootDirectory& root,
 void PermissionsScript::lookAt(const RootDirectory& root, const Reference& reference, Pass pass,
                                Tally& tally)
 {
-    const auto found = inspect(root, reference.path);
+    auto found = inspect(root, reference.path);
+    // The same file under another name may be as it should be by then.
+    if (found && pass == Pass::Repair && restoring_->isWaiting(*found)) {
+        restoring_->carryOut();
+        found = inspect(root, reference.path);
+    }
     if (!found) {
         tally.count(found.error());
         if (pass != Pass::Confirm)
             tellUnseen(reference, found.error());
         return;
     }
-    const auto& file = *found;
+    auto& file = *found;
     const Difference difference = compare(reference, file.permissions);
     const bool isUndecided = reference.doubt != Doubt::None;
     ++(isUndecided ? tally.undecided : tally.compared);
@@ -137,7 +146,7 @@ void PermissionsScript::lookAt(const RootDirectory& root, const Reference& refer
     if (!isUndecided && !mayBeLentRights(reference, file, tally))
         return;
     if (pass == Pass::Repair && !isUndecided)
-        repair(root, reference, file);
+        repair(reference, std::move(file));
 }
 
 void PermissionsScript::tellUnseen(const Reference& reference, Unseen unseen)
@@ -186,30 +195,18 @@ bool PermissionsScript::mayBeLentRights(const Reference& reference, const FoundF
     return false;
 }
 
-void PermissionsScript::repair(const RootDirectory& root, const Reference& reference,
-                               const FoundFile& file)
+void PermissionsScript::repair(const Reference& reference, FoundFile file)
 {
-    if (reference.kind && *reference.kind != file.permissions.kind)
-        return;
-    const std::string path = contract::printable(reference.path);
-    const Restoring restoring = restore(root, reference, file);
-    if (std::holds_alternative<Restored>(restoring)) {
-        ++restored_;
-        log_.detail(Sentence{"“%1$@” was set right.", path, {}});
-    } else if (const auto* const refusal = std::get_if<NotPermitted>(&restoring)) {
-        log_.problem(Sentence{"“%1$@” cannot be set right: %2$@.", path,
-                              std::generic_category().message(refusal->error)});
-    } else if (std::holds_alternative<ChangedMeanwhile>(restoring) ||
-               std::holds_alternative<ForeignContents>(restoring)) {
-        log_.problem(
-            Sentence{"“%1$@” changed while it was looked at, and was left alone.", path, {}});
-    } else {
-        log_.problem(
-            Sentence{"“%1$@” has other names too, and lies where others can "
-                     "write; it was left alone.",
-                     path,
-                     {}});
-    }
+    if (!reference.kind || *reference.kind == file.permissions.kind)
+        restoring_->add(reference, std::move(file));
+}
+
+Outcome PermissionsScript::outcomeOfRepair(const Tally& afterwards) const
+{
+    Outcome outcome = outcomeOfPermissionsRepair(afterwards, restoring_->restored());
+    if (!restoring_->failure().isEmpty() && outcome.verdict == Verdict::Damaged)
+        outcome.reason = restoring_->failure();
+    return outcome;
 }
 
 // The meter keeps away from this very number, so that no other job says it by chance.
@@ -228,9 +225,9 @@ void PermissionsScript::tell(const Tally& tally)
     if (tally.missing > 0)
         log_.detail(
             sentenceAbout(tally.missing, "%1$@ file is not there.", "%1$@ files are not there."));
-    if (restored_ > 0)
-        log_.remark(
-            sentenceAbout(restored_, "%1$@ file was set right.", "%1$@ files were set right."));
+    if (restoring_ && restoring_->restored() > 0)
+        log_.remark(sentenceAbout(restoring_->restored(), "%1$@ file was set right.",
+                                  "%1$@ files were set right."));
 }
 
 // Only the running system's apt knows where archives come from.

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "pellar/jobs/Job.h"
+#include "pellar/jobs/RecordedRestoring.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/outcome/Result.h"
 #include "pellar/packages/Reference.h"
@@ -35,7 +36,8 @@ private:
     void tellUnseen(const Reference& reference, Unseen unseen);
     void tell(const Reference& reference, const FoundFile& file, const Difference& difference);
     bool mayBeLentRights(const Reference& reference, const FoundFile& file, Tally& tally);
-    void repair(const RootDirectory& root, const Reference& reference, const FoundFile& file);
+    void repair(const Reference& reference, FoundFile file);
+    Outcome outcomeOfRepair(const Tally& afterwards) const;
     void tellDatabaseIsRead();
     void tell(const Tally& tally);
     void tellWhatIsMissing(const Tally& tally);
@@ -48,7 +50,7 @@ private:
     JobLog& log_ = context_.log;
     const bool fetchesArchives_;
     Accounts accounts_;
-    std::uint64_t restored_ = 0;
+    std::optional<RecordedRestoring> restoring_;  ///< of a repair
 };
 
 }  // namespace pellar

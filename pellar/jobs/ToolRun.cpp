@@ -50,6 +50,12 @@ ToolRun::ToolRun(const Tool& tool, std::filesystem::path program, Access access,
 {
 }
 
+void ToolRun::readLog(std::vector<std::uint64_t> parts)
+{
+    logParts_ = std::move(parts);
+    reader_ = tool_.logReading->makeReader();
+}
+
 RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 {
     JobLog& log = context_.log;
@@ -70,7 +76,9 @@ RunRequest ToolRun::requestFor(const DiskForTool& disk) const
     RunRequest request;
     request.wantsTerminal = tool_.habits.wantsTerminal;
     request.ignoresStops = isUnstoppable();
-    request.command = {program_, tool_.arguments(access_, diskArgumentOfTool(), disk.offset())};
+    request.command = {
+        program_, logParts_.empty() ? tool_.arguments(access_, diskArgumentOfTool(), disk.offset())
+                                    : tool_.logReading->arguments(logParts_, diskArgumentOfTool())};
     request.access = access_;
     request.disk = disk.descriptor();
     request.limits = context_.options.outputLimits;
@@ -145,7 +153,10 @@ void ToolRun::tellToolLines()
             case ToolLine::Kind::Problem:
                 problems_ == Problems::Kept ? log.detail(text) : log.problem(text);
                 break;
-            case ToolLine::Kind::Detail: log.detail(text); break;
+            case ToolLine::Kind::Detail:
+                if (logParts_.empty())
+                    log.detail(text);
+                break;
             case ToolLine::Kind::Progress: log.progress(line.percent); break;
         }
     }

@@ -31,6 +31,9 @@ public:
     ToolRun(const Tool& tool, std::filesystem::path program, Access access, Problems problems,
             JobContext& context);
 
+    /// It is to read these parts of a log (Tool::logReading) instead of verifying.
+    void readLog(std::vector<std::uint64_t> parts);
+
     /// Runs the tool to its end. `volume` is what was seen of the disk before.
     [[nodiscard]] RunEvidence run(const DiskForTool& disk, const VolumeFacts& volume);
 
@@ -57,6 +60,7 @@ private:
     JobContext& context_;
     std::unique_ptr<OutputReader> reader_;
     std::vector<ToolLine> lines_;
+    std::vector<std::uint64_t> logParts_;
     bool isEnded_ = false;  ///< by us, because of the disk
 };
 

@@ -4,82 +4,63 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
-#include "pellar/bytes/Bytes.h"
 #include "pellar/disks/DiskClaim.h"
+#include "pellar/jobs/RepairApplication.h"
+#include "pellar/jobs/RepairPreview.h"
 #include "pellar/outcome/Damage.h"
 #include "pellar/probe/DiskProbe.h"
-#include "pellar/process/FileDescriptor.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
 
-#include <sys/mount.h>
-
-#include <algorithm>
-#include <cerrno>
-#include <chrono>
-#include <cstring>
 #include <utility>
 
 namespace pellar {
 namespace {
 
-bool isMissingRight(int error)
+// The shares of the progress, in per cent: the verification before a repair ends here,
+constexpr double lookEnds = 30;
+/// and the trial of a repair here.
+constexpr double trialEnds = 85;
+/// The verification before a trial that decides.
+constexpr double readingEnds = 40;
+
+/// Whether another run can tell more than the verification did.
+bool isOpen(const Judgement& judgement, const RunEvidence& evidence)
 {
-    return error == EPERM || error == EACCES;
+    const bool waits = judgement.verdict == Verdict::Inconclusive &&
+                       (evidence.findings.skippedJournal || evidence.volume.needsRecovery);
+    const bool brokeOff = judgement.code == contract::kPLErrorToolFailed &&
+                          !std::holds_alternative<NotStarted>(evidence.result.ending);
+    return waits || brokeOff;
 }
 
-std::string textOf(int error)
+bool isProven(const Outcome& outcome)
 {
-    return ::strerrordesc_np(error);
+    return outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired;
 }
 
-/// The share of the progress that a repair takes; the verification behind it takes the rest.
-constexpr double repairShare = 60;
-/// And that of the verification before it.
-constexpr double lookShare = 30;
+/// How a job ends whose trial did not end in a sound volume.
+Outcome notProven(Outcome outcome, bool foundDamage)
+{
+    const bool isUnknown = outcome.verdict == Verdict::Inconclusive && foundDamage;
+    if (outcome.verdict != Verdict::Damaged && !isUnknown)
+        return outcome;
+    if (isUnknown)
+        outcome.reason = {
+            "a repair was tried, and it cannot be told whether it makes it sound; "
+            "nothing was written",
+            {},
+            {}};
+    else
+        outcome.reason = {
+            "a repair was tried, and would leave damage; nothing was written", {}, {}};
+    outcome.verdict = Verdict::Damaged;
+    outcome.code = contract::kPLErrorNotProven;
+    return outcome;
+}
 
 }  // namespace
-
-Judgement notAttached(const Tool& tool, int error)
-{
-    const std::string name(tool.name);
-    const Sentence reason =
-        isMissingRight(error)
-            ? Sentence{"%1$@ needs the volume as a disk of its own, which only an administrator "
-                       "may make of a part of an image",
-                       name,
-                       {}}
-            : Sentence{"the volume could not be made a disk of its own for %1$@: %2$@", name,
-                       textOf(error)};
-    return {Verdict::Failed, contract::kPLErrorCannotOpen, error, reason};
-}
-
-Outcome notReplayed(int error)
-{
-    const Sentence reason =
-        isMissingRight(error)
-            ? Sentence{"its log has to be replayed by mounting it, which only an administrator may",
-                       {},
-                       {}}
-            : Sentence{"its log could not be replayed by mounting it: %1$@", textOf(error), {}};
-    return {Verdict::Inconclusive, contract::kPLErrorInconclusive, error, reason};
-}
-
-int replayLog(const std::string& filesystem, int device)
-{
-    const FileDescriptor context(::fsopen(filesystem.c_str(), FSOPEN_CLOEXEC));
-    if (!context)
-        return errno;
-    const std::string source = pathOfDescriptor(device);
-    if (::fsconfig(context.get(), FSCONFIG_SET_STRING, "source", source.c_str(), 0) != 0)
-        return errno;
-    // A copy of a volume has its UUID, and the volume itself may be mounted (xfs(5)).
-    if (filesystem == "xfs" &&
-        ::fsconfig(context.get(), FSCONFIG_SET_FLAG, "nouuid", nullptr, 0) != 0)
-        return errno;
-    return ::fsconfig(context.get(), FSCONFIG_CMD_CREATE, nullptr, nullptr, 0) == 0 ? 0 : errno;
-}
 
 VolumeScript::VolumeScript(VolumeRequest request, JobContext context)
     : operation_(request.operation),
@@ -97,7 +78,7 @@ void VolumeScript::run()
         state = next(state);
     // Given back before it is told, so that the receiver may mount it at once.
     disk_.giveBack();
-    log_.outcomeOfVolume(outcome_, operation_);
+    log_.outcomeOfVolume(outcome_, context_.policy.isPreview ? Operation::Verify : operation_);
 }
 
 VolumeScript::State VolumeScript::next(State state)
@@ -105,10 +86,11 @@ VolumeScript::State VolumeScript::next(State state)
     switch (state) {
         case State::Examining: return examine();
         case State::Verifying: return verify();
+        case State::Deciding: return decide();
         case State::Looking: return look();
-        case State::Replaying: return replay();
         case State::Repairing: return repair();
-        case State::Confirming: return confirm();
+        case State::Trying: return tryRepair();
+        case State::Applying: return apply();
         case State::Done: break;
     }
     return State::Done;
@@ -118,18 +100,17 @@ VolumeScript::State VolumeScript::examine()
 {
     if (const auto objection = objectionToJob())
         return end(*objection);
-    if (const auto refusal = disk_.take(accessFor(operation_)))
+    if (const auto refusal = disk_.take(accessFor(operation_, context_.policy)))
         return end(*refusal);
+    if (const auto objection = objectionToHistory())
+        return end(*objection);
     // Only where nothing is known: what is listed as something else may hold the remains of a file
     // system that was there before.
     if (tool_ == nullptr && disk_.reference().filesystem.empty())
         tool_ = toolRecognizing(disk_.claim().descriptor(), disk_.claim().offset(),
                                 disk_.claim().availableBytes());
-    if (tool_ != nullptr) {
-        program_ = findProgram(tool_->name, context_.options.toolPath);
-        repairProgram_ = findProgram(tool_->repairName, context_.options.toolPath);
-        volume_ = factsFor(*tool_);
-    }
+    if (tool_ != nullptr)
+        runs_.choose(*tool_);
     if (const auto objection = objectionToDisk())
         return end(*objection);
     if (const auto objection = this->objection())
@@ -144,17 +125,45 @@ std::optional<Outcome> VolumeScript::objectionToJob() const
 {
     if (disk_.reference().filesystem.empty())
         return std::nullopt;
-    const Capability capability =
-        capabilityFor(disk_.reference().filesystem, operation_, context_.options.toolPath);
+    const Capability capability = capabilityFor(disk_.reference().filesystem, operation_,
+                                                context_.options.toolPath, context_.repairWay());
     return capability.isGiven() ? std::nullopt
                                 : std::optional(failedOutcome(capability.error, capability.reason));
+}
+
+/// What is half repaired is as it was neither before nor after.
+std::optional<Outcome> VolumeScript::objectionToHistory()
+{
+    const auto directory = recordsIn(context_.options.trials);
+    if (context_.options.trials.room.directory.empty() || !std::filesystem::exists(directory))
+        return std::nullopt;
+    const auto store = UndoStore::open(directory);
+    if (!store)
+        return std::nullopt;
+    const DiskClaim& claim = disk_.claim();
+    const RecordList list = store->list();
+    const ListedRecord* const newest =
+        newestOf(recordedDisk(disk_.reference(), claim.descriptor(),
+                              {claim.offset(), claim.availableBytes()}),
+                 list);
+    if (newest == nullptr || !newest->isInterrupted())
+        return std::nullopt;
+    const Sentence reason{
+        "an earlier repair of it was interrupted; finish it or undo it first", {}, {}};
+    if (operation_ == Operation::Repair && !context_.policy.isPreview)
+        return failedOutcome(contract::kPLErrorInterrupted, reason);
+    log_.error(Sentence{"An earlier repair of “%1$@” was interrupted; finish it or undo it first.",
+                        log_.diskName(),
+                        {}});
+    return std::nullopt;
 }
 
 /// Where no file system is found in its place, that may be for want of reading.
 std::optional<Outcome> VolumeScript::objectionToDisk()
 {
-    const bool isInPlace = tool_ != nullptr && volume_.isRecognized && volume_.hasPrimary;
-    const auto byte = isInPlace ? std::nullopt : unreadableByte({});
+    const VolumeFacts& volume = runs_.volume();
+    const bool isInPlace = tool_ != nullptr && volume.isRecognized && volume.hasPrimary;
+    const auto byte = isInPlace ? std::nullopt : runs_.unreadableByte({});
     return byte ? std::optional(outcomeOfVerification(unreadable(byte))) : std::nullopt;
 }
 
@@ -170,16 +179,21 @@ std::optional<Outcome> VolumeScript::objection() const
                               {}});
     if (tool_ == nullptr)
         return withoutTool();
-    if (operation_ == Operation::Repair && !tool_->canRepair())
-        return failedOutcome(contract::kPLErrorNoRepairHere, tool_->reasonAgainstRepair);
-    if (volume_.isForeign)
+    if (context_.policy.isPreview && context_.repairWay() == RepairWay::Direct)
+        return failedOutcome(contract::kPLErrorNotTried,
+                             {"there is no directory to keep what it would write", {}, {}});
+    if (operation_ == Operation::Repair && !tool_->repairs(context_.repairWay()))
+        return failedOutcome(contract::kPLErrorNoRepairHere, tool_->reasonAgainstDirectRepair);
+    if (runs_.volume().isForeign)
         return failedOutcome(
             contract::kPLErrorUnsupported,
             {"it holds something other than the file system it is listed with", {}, {}});
-    if (program_.empty() || (operation_ == Operation::Repair && repairProgram_.empty()))
+    const bool isRepair = operation_ == Operation::Repair;
+    const bool hasReader = !runs_.program(Access::ReadOnly).empty();
+    if (!hasReader || (isRepair && runs_.program(Access::ReadWrite).empty()))
         return failedOutcome(contract::kPLErrorToolMissing,
                              {"%1$@ is not installed (package %2$@)",
-                              std::string(program_.empty() ? tool_->name : tool_->repairName),
+                              std::string(hasReader ? tool_->repairName : tool_->name),
                               std::string(tool_->package)});
     return std::nullopt;
 }
@@ -193,7 +207,8 @@ Outcome VolumeScript::withoutTool() const
     if (type.empty())
         return failedOutcome(contract::kPLErrorUnsupported,
                              {"no file system was found that can be checked", {}, {}});
-    const Capability capability = capabilityFor(type, operation_, context_.options.toolPath);
+    const Capability capability =
+        capabilityFor(type, operation_, context_.options.toolPath, context_.repairWay());
     return failedOutcome(
         contract::kPLErrorUnsupported,
         capability.isGiven()
@@ -206,10 +221,11 @@ Outcome VolumeScript::withoutTool() const
 /// A tool that repairs a volume whose end is missing throws away what it cannot reach.
 std::optional<Outcome> VolumeScript::objectionToSize()
 {
-    if (!volume_.isCutShort())
+    const VolumeFacts& volume = runs_.volume();
+    if (!volume.isCutShort())
         return std::nullopt;
     log_.error({"The volume is cut short: it takes %1$@ bytes, but only %2$@ bytes are there.",
-                std::to_string(volume_.volumeBytes), std::to_string(volume_.availableBytes)});
+                std::to_string(volume.volumeBytes), std::to_string(volume.availableBytes)});
     if (operation_ == Operation::Verify)
         return std::nullopt;
     return outcomeOfVerification(cutShort(0));
@@ -217,12 +233,26 @@ std::optional<Outcome> VolumeScript::objectionToSize()
 
 VolumeScript::State VolumeScript::verify()
 {
-    const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
-    const Judgement judgement = judge(evidence);
-    if (judgement.verdict == Verdict::Damaged && !volume_.isCutShort())
+    const bool isTried = context_.repairWay() == RepairWay::TriedFirst;
+    const bool isThorough = context_.policy.isThorough && isTried;
+    // What is wrong before a journal is replayed may not be wrong afterwards.
+    const bool hasJournal = runs_.volume().needsRecovery && isTried;
+    log_.meter().setRange(0, isThorough || hasJournal ? readingEnds : 100);
+    const RunEvidence evidence = runs_.run(
+        Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
+    const Judgement judgement = runs_.judgeWithLog(evidence);
+    const bool canBeRepaired = tool_->repairs(context_.repairWay());
+    if (judgement.verdict == Verdict::Damaged && !runs_.volume().isCutShort())
         tellMeaning(evidence);
-    return end(tool_->canRepair() ? outcomeOfVerification(judgement)
-                                  : outcomeWithoutRepair(judgement));
+    outcome_ = canBeRepaired ? outcomeOfVerification(judgement) : outcomeWithoutRepair(judgement);
+    if (judgement.verdict == Verdict::Sound && hasJournal)
+        tellJournal();
+    look_.waitsForMount = evidence.findings.skippedJournal && !tool_->habits.logReplayedAs.empty();
+    const bool isWorthATrial =
+        isOpen(judgement, evidence) || (isThorough && judgement.verdict == Verdict::Sound);
+    const bool isPossible = isTried && canBeRepaired && !runs_.program(Access::ReadWrite).empty() &&
+                            !runs_.volume().isCutShort();
+    return isWorthATrial && isPossible ? State::Deciding : State::Done;
 }
 
 void VolumeScript::tellMeaning(const RunEvidence& evidence)
@@ -230,171 +260,148 @@ void VolumeScript::tellMeaning(const RunEvidence& evidence)
     Damage damage = evidence.findings.damage;
     if (!evidence.findings.isComplete)
         damage.add(Damage::Unsurveyed);
-    for (const std::string_view meaning : meaningOf(damage, tool_->canRepair()))
+    for (const std::string_view meaning : meaningOf(damage, tool_->repairs(context_.repairWay())))
         log_.remark(Sentence{meaning, {}, {}});
+}
+
+void VolumeScript::tellJournal()
+{
+    log_.remark(
+        Sentence{"Its journal waits to be replayed, which mounting it does; with that, no "
+                 "damage was found.",
+                 {},
+                 {}});
+}
+
+/// What a repair finds and changes is known once it is done; so it is done where the disk stays as
+/// it is.
+VolumeScript::State VolumeScript::decide()
+{
+    log_.step(Operation::Verify,
+              {"Trying a repair to know more; nothing is written to “%1$@”", log_.diskName(), {}});
+    if (const auto obstacle = beginTrial()) {
+        log_.remark(
+            Sentence{"More could be known by trying a repair, which cannot be done here: "
+                     "%1$@.",
+                     log_.text(*obstacle),
+                     {}});
+        return State::Done;
+    }
+    RepairPasses passes(runs_, context_, look_, {readingEnds, 100});
+    const Outcome tried = passes.run();
+    return end(decidedBy(tried, passes.foundProblems()));
+}
+
+/// Where the trial came to no answer, that of the verification stands.
+Outcome VolumeScript::decidedBy(const Outcome& tried, bool foundProblems)
+{
+    if (tried.verdict == Verdict::Stopped || tried.code == contract::kPLErrorUnreadable ||
+        tried.code == contract::kPLErrorDiskChanged)
+        return tried;
+    if (!isProven(tried) && tried.verdict != Verdict::Damaged)
+        return outcome_;
+    if (isProven(tried) && !foundProblems) {
+        if (outcome_.verdict == Verdict::Inconclusive)
+            tellJournal();
+        return outcome_.code == contract::kPLErrorToolFailed
+                   ? outcome_  // the tool broke off, and has not said over what
+                   : outcomeOfVerification(sound(0));
+    }
+    log_.remark(Sentence{isProven(tried) ? "A repair was tried; it would make the volume sound."
+                                         : "A repair was tried; it would leave damage.",
+                         {},
+                         {}});
+    return outcomeOfVerification(damaged(0));
 }
 
 /// A sound volume is not written to, what is not known to be damaged is not repaired, and nothing
 /// is written to a disk that cannot be read.
 VolumeScript::State VolumeScript::look()
 {
-    log_.meter().setRange(0, lookShare);
+    log_.meter().setRange(0, lookEnds);
     // What is wrong before a journal is replayed may not be wrong afterwards.
-    const bool hasJournal = volume_.needsRecovery;
-    const RunEvidence evidence =
-        runOnce(Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
-    const Judgement judgement = judge(evidence);
-    counts_.collectedOne = tool_->habits.collectedOne;
-    counts_.collectedMany = tool_->habits.collectedMany;
-    counts_.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
-    foundDamage_ = judgement.verdict == Verdict::Damaged;
+    const bool hasJournal = runs_.volume().needsRecovery;
+    const RunEvidence evidence = runs_.run(
+        Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
+    const Judgement judgement = runs_.judgeWithLog(evidence);
+    look_.counts.collectedOne = tool_->habits.collectedOne;
+    look_.counts.collectedMany = tool_->habits.collectedMany;
+    look_.counts.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
+    look_.foundDamage = judgement.verdict == Verdict::Damaged;
     const bool waitsForReplay =
         judgement.verdict == Verdict::Inconclusive && evidence.findings.skippedJournal;
-    if (waitsForReplay && !tool_->habits.logReplayedAs.empty())
-        return State::Replaying;
-    if (!foundDamage_ && !(waitsForReplay && tool_->habits.replaysInRepair))
+    look_.waitsForMount = waitsForReplay && !tool_->habits.logReplayedAs.empty();
+    const bool isTried = context_.repairWay() == RepairWay::TriedFirst;
+    const bool isToBeRepaired =
+        look_.foundDamage || look_.waitsForMount ||
+        (waitsForReplay && tool_->habits.replaysInRepair) ||
+        (isTried && (isOpen(judgement, evidence) ||
+                     (context_.policy.isThorough && judgement.verdict == Verdict::Sound)));
+    if (!isToBeRepaired)
         return end(outcomeOfVerification(judgement));
-    const auto byte = firstUnreadable(evidence.volume.backups);
-    return byte ? end(outcomeOfVerification(unreadable(byte))) : State::Repairing;
-}
-
-VolumeScript::State VolumeScript::replay()
-{
-    log_.step(Operation::Repair, {"Replaying the log by mounting the volume", {}, {}});
-    const std::string filesystem(tool_->habits.logReplayedAs);
-    log_.trace("replay: the kernel opens it as " + filesystem + " and closes it again");
-    log_.flush();
-    const auto disk =
-        DiskForTool::prepare(disk_.claim(), DiskForTool::Form::BlockDevice, Access::ReadWrite);
-    const int error = disk ? replayLog(filesystem, disk->descriptor()) : disk.error();
-    if (error != 0)
-        return end(notReplayed(error));
-    passes_.push_back({{Verdict::Inconclusive, contract::kPLErrorInconclusive, 0, {}, true}, true});
-    return State::Confirming;
+    const auto byte = runs_.firstUnreadable(evidence.volume.backups);
+    if (byte && !look_.waitsForMount)
+        return end(outcomeOfVerification(unreadable(byte)));
+    return isTried ? State::Trying : State::Repairing;
 }
 
 VolumeScript::State VolumeScript::repair()
 {
-    log_.meter().setRange(passes_.empty() ? lookShare : 0, repairShare);
-    const RunEvidence evidence = runOnce(
-        Access::ReadWrite, foundDamage_ ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
-    const Judgement judgement = judge(evidence);
-    passes_.push_back({judgement, evidence.findings.replayedJournal,
-                       evidence.findings.problems > 0 || foundDamage_});
-    counts_.reconnected += evidence.findings.reconnected;
-    counts_.cleared += evidence.findings.cleared;
-    // The disk went away, or the user did not want more: nothing is left to be confirmed.
-    const bool isOver = judgement.verdict == Verdict::Stopped ||
-                        judgement.code == contract::kPLErrorUnreadable ||
-                        judgement.code == contract::kPLErrorDiskChanged ||
-                        judgement.code == contract::kPLErrorDiskInUse;
-    return isOver ? end(outcomeOfVerification(judgement)) : State::Confirming;
+    return end(RepairPasses(runs_, context_, look_, {lookEnds, 100}).run());
 }
 
-VolumeScript::State VolumeScript::confirm()
+VolumeScript::State VolumeScript::tryRepair()
 {
-    log_.meter().setRange(repairShare, 100);
-    const RunEvidence evidence = runOnce(Access::ReadOnly, ToolRun::Problems::Shown);
-    const Judgement judgement = judge(evidence);
-    if (isWorthAnotherPass(passes_, judgement))
-        return State::Repairing;
-    counts_.after = evidence.findings.files;
-    const Outcome outcome = outcomeOfRepair(passes_, judgement, counts_);
-    // The verification behind it decides, but a repair that was cut off is not kept quiet about.
-    if (outcome.verdict == Verdict::Sound || outcome.verdict == Verdict::Repaired)
-        for (const RepairPass& pass : passes_)
-            if (pass.judgement.verdict == Verdict::Failed)
-                log_.failure(pass.judgement.reason);
-    return end(outcome);
+    log_.step(Operation::Repair, {"Trying the repair; nothing is written to “%1$@” until it is "
+                                  "proven",
+                                  log_.diskName(),
+                                  {}});
+    mark_ = WriteMark::of(disk_.claim().descriptor());
+    if (const auto obstacle = beginTrial()) {
+        context_.advise(context_.options.trials.howToRepairDirectly);
+        return end(
+            failedOutcome(contract::kPLErrorNotTried,
+                          {"the repair cannot be tried first: %1$@", log_.text(*obstacle), {}}));
+    }
+    RepairPasses passes(runs_, context_, look_, {lookEnds, trialEnds});
+    outcome_ = passes.run();
+    look_.counts = passes.counts();
+    runs_.workOn(nullptr);
+    if (context_.policy.isPreview || isProven(outcome_))
+        return State::Applying;
+    const Outcome end = notProven(outcome_, look_.foundDamage);
+    if (end.code == contract::kPLErrorNotProven && context_.policy.appliesUnproven)
+        return State::Applying;
+    if (end.code == contract::kPLErrorNotProven)
+        context_.advise(context_.options.trials.howToApply);
+    return this->end(end);
+}
+
+VolumeScript::State VolumeScript::apply()
+{
+    if (context_.policy.isPreview)
+        return end(RepairPreview(context_, *tool_, *trial_).tell(outcome_, look_.counts));
+    return end(applyTrial(*trial_, mark_, disk_, context_, outcome_));
+}
+
+/// Why there is none; the tool works on it from now on.
+std::optional<Sentence> VolumeScript::beginTrial()
+{
+    const DiskClaim& claim = disk_.claim();
+    auto trial =
+        TrialDisk::of(claim.descriptor(), {claim.offset(), claim.availableBytes()},
+                      context_.options.trials.room, [this] { return context_.stop.isPressed(); });
+    if (!trial)
+        return trial.error();
+    trial_.emplace(*std::move(trial));
+    runs_.workOn(&*trial_);
+    return std::nullopt;
 }
 
 VolumeScript::State VolumeScript::end(Outcome outcome)
 {
     outcome_ = std::move(outcome);
     return State::Done;
-}
-
-VolumeFacts VolumeScript::factsFor(const Tool& tool) const
-{
-    return tool.examine(disk_.claim().descriptor(), disk_.claim().offset(),
-                        disk_.claim().availableBytes());
-}
-
-RunEvidence VolumeScript::runOnce(Access access, ToolRun::Problems problems)
-{
-    volume_ = factsFor(*tool_);  // the run before may have changed what is to be seen
-    const auto form =
-        tool_->habits.takesOffset ? DiskForTool::Form::Itself : DiskForTool::Form::VolumeAlone;
-    const auto disk = DiskForTool::prepare(disk_.claim(), form, access);
-    if (!disk) {
-        obstacle_ = notAttached(*tool_, disk.error());
-        return {access, {NotStarted{disk.error()}}, {}, volume_};
-    }
-    ToolRun run(*tool_, access == Access::ReadOnly ? program_ : repairProgram_, access, problems,
-                context_);
-    return run.run(*disk, volume_);
-}
-
-// What was found on a disk that then went away is no answer about the disk that is left.
-Judgement VolumeScript::judge(const RunEvidence& evidence) const
-{
-    Judgement judgement = obstacle_ ? *obstacle_ : tool_->judge(evidence);
-    if (judgement.verdict == Verdict::Stopped)
-        return judgement;
-    const auto lost = [&judgement](std::string_view reason) {
-        return Judgement{Verdict::Failed,
-                         contract::kPLErrorDiskChanged,
-                         judgement.detail,
-                         {reason, {}, {}},
-                         false};
-    };
-    if (!disk_.claim().isStillWhole())
-        return lost("the disk became shorter meanwhile");
-    if (!disk_.claim().isStillInPlace())
-        return lost("the disk was deleted, moved or replaced meanwhile");
-    if (!disk_.claim().isEndReadable())
-        return unreadable(disk_.claim().availableBytes() - 1);
-    return asKernelSays(judgement, evidence);
-}
-
-/// What a tool takes for damage may be a disk that cannot be read, which not every tool says.
-Judgement VolumeScript::asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const
-{
-    const bool isAnswer = judgement.code == contract::kPLErrorUnreadable ||
-                          judgement.code == contract::kPLErrorDamaged ||
-                          judgement.code == contract::kPLErrorCutShort ||
-                          judgement.code == contract::kPLErrorInconclusive ||
-                          judgement.code == contract::kPLErrorToolFailed;
-    if (obstacle_ || !isAnswer || context_.stop.isPressed() ||
-        std::holds_alternative<NotStarted>(evidence.result.ending))
-        return judgement;
-    const auto byte = unreadableByte(evidence.findings.readFault.value_or(ReadFault()));
-    return byte ? unreadable(byte) : judgement;
-}
-
-/// Our own reading of where the tool could not, and of where a file system keeps what it is built
-/// on; of all, for half a minute, where a tool could not read and does not say where.
-std::optional<std::uint64_t> VolumeScript::unreadableByte(const ReadFault& fault) const
-{
-    constexpr std::uint64_t around = 1U << 20U;
-    const std::uint64_t available = disk_.claim().availableBytes();
-    std::vector<DiskPiece> pieces = endsOfVolume(available);
-    const auto byte =
-        fault.block ? productOrGreatest(*fault.block, volume_.blockBytes) : fault.byte;
-    if (byte && *byte < available)
-        pieces.insert(pieces.begin(), {*byte, std::min(around, available - *byte)});
-    else if (fault.isUnproven)
-        pieces.push_back({0, available});
-    return firstUnreadable(pieces);
-}
-
-std::optional<std::uint64_t> VolumeScript::firstUnreadable(
-    const std::vector<DiskPiece>& pieces) const
-{
-    const auto deadline = Clock::now() + std::chrono::seconds(30);
-    return pellar::firstUnreadable(disk_.claim().descriptor(), disk_.claim().offset(), pieces, [&] {
-        return context_.stop.isPressed() || Clock::now() > deadline;
-    });
 }
 
 }  // namespace pellar

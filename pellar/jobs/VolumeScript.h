@@ -2,9 +2,11 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
+#include "pellar/disks/WriteMark.h"
 #include "pellar/jobs/Job.h"
 #include "pellar/jobs/JobDisk.h"
-#include "pellar/jobs/ToolRun.h"
+#include "pellar/jobs/RepairPasses.h"
+#include "pellar/jobs/VolumeRuns.h"
 #include "pellar/outcome/Outcome.h"
 #include "pellar/tools/Tool.h"
 
@@ -24,12 +26,13 @@ struct VolumeRequest {
 
 /// What a job does, from the claimed disk to the verdict, on the thread that calls `run`:
 ///
-///     Examining ─→ Verifying ─→ Done
-///              └─→ Looking ─→ Repairing ⇄ Confirming ─→ Done
-///                         ├─→ Replaying ─→ Confirming
-///                         └─→ Done
+///     Examining ─→ Verifying ─→ Deciding ─→ Done
+///              └─→ Looking ─→ Trying ─→ Applying ─→ Done
+///                         └─→ Repairing ─→ Done
 ///
-/// Looking verifies before a repair; Replaying brings a log to its place by mounting.
+/// Looking verifies before a repair. Trying repairs where the disk stays as it is, and what is
+/// proven there is applied to it; Repairing lets the tool write to the disk itself. Deciding tries
+/// a repair to know what a verification could not tell. A state goes to Done where it has decided.
 ///
 /// A mounted disk is unmounted at the beginning and mounted again at the end. Whatever happens, it
 /// tells *started* once, first, and *finished* once, last. The references outlive it.
@@ -40,43 +43,39 @@ public:
     void run() override;
 
 private:
-    enum class State { Examining, Verifying, Looking, Replaying, Repairing, Confirming, Done };
+    enum class State { Examining, Verifying, Deciding, Looking, Repairing, Trying, Applying, Done };
 
     State next(State state);
     State examine();
     State verify();
+    State decide();
     State look();
-    State replay();
     State repair();
-    State confirm();
+    State tryRepair();
+    State apply();
     State end(Outcome outcome);
 
     std::optional<Outcome> objectionToJob() const;
     std::optional<Outcome> objection() const;
     std::optional<Outcome> objectionToDisk();
     std::optional<Outcome> objectionToSize();
-    VolumeFacts factsFor(const Tool& tool) const;
+    std::optional<Outcome> objectionToHistory();
     Outcome withoutTool() const;
+    void tellJournal();
     void tellMeaning(const RunEvidence& evidence);
-    RunEvidence runOnce(Access access, ToolRun::Problems problems);
-    Judgement judge(const RunEvidence& evidence) const;
-    Judgement asKernelSays(const Judgement& judgement, const RunEvidence& evidence) const;
-    std::optional<std::uint64_t> unreadableByte(const ReadFault& fault) const;
-    std::optional<std::uint64_t> firstUnreadable(const std::vector<DiskPiece>& pieces) const;
+    std::optional<Sentence> beginTrial();
+    Outcome decidedBy(const Outcome& tried, bool foundProblems);
 
     const Operation operation_;
     const Tool* tool_;
     JobContext context_;
     JobLog& log_ = context_.log;
     JobDisk disk_;
+    VolumeRuns runs_{disk_, context_};
 
-    std::filesystem::path program_;
-    std::filesystem::path repairProgram_;
-    VolumeFacts volume_;
-    std::optional<Judgement> obstacle_;  ///< why the last run could not even be prepared
-    std::vector<RepairPass> passes_;
-    bool foundDamage_ = false;  ///< the verification before the repair did
-    FileCounts counts_;
+    RepairPasses::Look look_;
+    std::optional<TrialDisk> trial_;
+    WriteMark mark_;  ///< of the disk before the trial
     Outcome outcome_;
 };
 

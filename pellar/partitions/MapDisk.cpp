@@ -74,7 +74,7 @@ FileSectors sectorsOf(int descriptor, std::uint64_t offset, std::uint64_t length
 }
 
 // What fills the disk matters only where the map is not plainly in force, and takes longer to find.
-PartitionMap readMapOf(int descriptor, const FileSectors& sectors, std::uint64_t offset,
+PartitionMap readMapOf(int descriptor, const Sectors& sectors, std::uint64_t offset,
                        std::uint64_t length)
 {
     PartitionMap map = readPartitionMap(sectors, {});
@@ -124,6 +124,12 @@ FileSectors MapClaim::sectors() const
 PartitionMap MapClaim::readMap() const
 {
     return readMapOf(disk_.get(), sectors(), offset_, length_);
+}
+
+PartitionMap MapClaim::readMap(const RepairPlan& plan) const
+{
+    const FileSectors disk = sectors();
+    return readMapOf(disk_.get(), PlannedSectors(disk, plan), offset_, length_);
 }
 
 bool MapClaim::rereadPartitions() const

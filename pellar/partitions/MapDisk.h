@@ -5,6 +5,7 @@
 #include "pellar/disks/DiskClaim.h"
 #include "pellar/outcome/Result.h"
 #include "pellar/partitions/PartitionMap.h"
+#include "pellar/partitions/RepairPlan.h"
 #include "pellar/partitions/Sectors.h"
 #include "pellar/process/FileDescriptor.h"
 
@@ -25,8 +26,8 @@ namespace pellar {
 [[nodiscard]] FileSectors sectorsOf(int descriptor, std::uint64_t offset, std::uint64_t length);
 
 /// The map of an open disk, with what fills the whole of it.
-[[nodiscard]] PartitionMap readMapOf(int descriptor, const FileSectors& sectors,
-                                     std::uint64_t offset, std::uint64_t length);
+[[nodiscard]] PartitionMap readMapOf(int descriptor, const Sectors& sectors, std::uint64_t offset,
+                                     std::uint64_t length);
 
 /// Opens the disk for a look and reads its map; a map of no kind when it cannot be opened. Reads a
 /// few sectors.
@@ -44,7 +45,11 @@ public:
 
     FileSectors sectors() const;
     [[nodiscard]] PartitionMap readMap() const;
+    /// As it will be.
+    [[nodiscard]] PartitionMap readMap(const RepairPlan& plan) const;
+    int descriptor() const { return disk_.get(); }
     std::uint64_t offset() const { return offset_; }
+    std::uint64_t length() const { return length_; }
     /// Asks the kernel to read a device's map again; NO when it refuses. Nothing to do for a file.
     [[nodiscard]] bool rereadPartitions() const;
 

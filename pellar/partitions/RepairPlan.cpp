@@ -180,6 +180,25 @@ void addCopies(PlanWriter& writer, const Target& target, bool startsWithPrimary)
 
 }  // namespace
 
+std::optional<Bytes> PlannedSectors::read(std::uint64_t first, std::uint64_t number) const
+{
+    auto bytes = disk_.read(first, number);
+    if (!bytes)
+        return std::nullopt;
+    const std::uint32_t size = sectorBytes();
+    for (const SectorWrite& write : plan_.writes) {
+        const std::uint64_t writeEnd = write.first + write.after.size() / size;
+        const std::uint64_t from = std::max(first, write.first);
+        const std::uint64_t end = std::min(first + number, writeEnd);
+        if (from < end)
+            std::copy_n(
+                write.after.begin() + static_cast<std::ptrdiff_t>((from - write.first) * size),
+                (end - from) * size,
+                bytes->begin() + static_cast<std::ptrdiff_t>((from - first) * size));
+    }
+    return bytes;
+}
+
 Result<RepairPlan, Sentence> planRepair(const PartitionMap& map, const MapReport& report,
                                         const Sectors& sectors)
 {

@@ -21,6 +21,21 @@ struct RepairPlan {
     std::vector<SectorWrite> writes;
 };
 
+/// A disk as it will be when the plan is carried out. The references outlive it.
+class PlannedSectors final : public Sectors {
+public:
+    PlannedSectors(const Sectors& disk, const RepairPlan& plan) : disk_(disk), plan_(plan) {}
+
+    std::uint32_t sectorBytes() const override { return disk_.sectorBytes(); }
+    std::uint64_t count() const override { return disk_.count(); }
+    [[nodiscard]] std::optional<Bytes> read(std::uint64_t first,
+                                            std::uint64_t number) const override;
+
+private:
+    const Sectors& disk_;
+    const RepairPlan& plan_;
+};
+
 /// The plan for a map that can be repaired, or why there is none. Reads, never writes.
 [[nodiscard]] Result<RepairPlan, Sentence> planRepair(const PartitionMap& map,
                                                       const MapReport& report,

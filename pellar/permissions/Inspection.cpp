@@ -3,7 +3,7 @@
 
 #include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 #include "pellar/packages/Permissions.h"
 
 #include <fcntl.h>

@@ -87,9 +87,9 @@ std::optional<Restoring> objectionToLending(const Reference& reference, const Fo
     if (error != 0)
         return NotPermitted{error};
     if (isOpenForWriting(object))
-        return ChangedMeanwhile{};
+        return ChangedMeanwhile{.wasTouched = true};
     if (contentsOf(seen, reference) != Contents::AsPackaged)
-        return ForeignContents{};
+        return ForeignContents{.wasTouched = true};
     return std::nullopt;
 }
 
@@ -104,6 +104,11 @@ Restoring restore(const RootDirectory& root, const Reference& reference, const F
         seen.permissions.kind == FileKind::Regular && seen.status.st_nlink > 1;
     if (hasFurtherNames && !isClosedToOthers(root, reference.path))
         return SuspiciousLink{};
+    return give(reference, seen);
+}
+
+Restoring give(const Reference& reference, const FoundFile& seen)
+{
     const bool lends = seen.permissions.kind == FileKind::Regular && lendsRights(reference);
     if (const auto objection = lends ? objectionToLending(reference, seen) : std::nullopt)
         return *objection;

@@ -9,8 +9,10 @@ namespace pellar {
 
 struct Restored {};
 
-/// The file was no longer what had been looked at, so nothing was done.
-struct ChangedMeanwhile {};
+/// The file was no longer what had been looked at, or somebody has it open for writing.
+struct ChangedMeanwhile {
+    bool wasTouched = false;  ///< it has its owner, and lends no rights; else nothing was done
+};
 
 /// The file has further names, and its directory is open to somebody who is not root: it may be
 /// somebody else's file that was linked there. Nothing was done.
@@ -18,7 +20,9 @@ struct SuspiciousLink {};
 
 /// The file lends rights, and what it holds is not known to be what its package brought. Rights
 /// are not given to it.
-struct ForeignContents {};
+struct ForeignContents {
+    bool wasTouched = false;  ///< as above
+};
 
 struct NotPermitted {
     int error;  ///< errno
@@ -34,5 +38,8 @@ using Restoring =
 /// the package's, it is its owner's again and nobody has it open for writing. Needs root.
 [[nodiscard]] Restoring restore(const RootDirectory& root, const Reference& reference,
                                 const FoundFile& seen);
+
+/// The same for a file that is known to be the right one: it is looked up by no name.
+[[nodiscard]] Restoring give(const Reference& reference, const FoundFile& seen);
 
 }  // namespace pellar

@@ -1,18 +1,14 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/bytes/Bytes.h"
+
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
 
 namespace pellar {
-
-/// A stretch of an open file or device, in bytes.
-struct ByteRange {
-    std::uint64_t offset = 0;
-    std::uint64_t length = 0;
-};
 
 /// What a superblock says of itself, in the words of libblkid; empty where it says nothing.
 struct Superblock {
@@ -43,8 +39,8 @@ struct PartitionTable {
 // Both only read, from any thread, and leave the descriptor open. Contents that make no sense count
 // as none.
 
-/// Nothing for an empty range. Ambiguous contents (signatures of two file systems) are nothing, too:
-/// a guess could be the wrong one, and a tool let loose on it would destroy what is there.
+/// Nothing for an empty range. Ambiguous contents (signatures of two file systems) are nothing,
+/// too: a guess could be the wrong one, and a tool let loose on it would destroy what is there.
 [[nodiscard]] Superblock readSuperblock(int descriptor, ByteRange range);
 /// Of a whole disk.
 [[nodiscard]] std::optional<PartitionTable> readPartitionTable(int descriptor);

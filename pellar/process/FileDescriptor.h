@@ -26,6 +26,8 @@ public:
     int get() const noexcept { return descriptor_; }
     explicit operator bool() const noexcept { return descriptor_ >= 0; }
     void reset() noexcept;
+    /// The caller closes it from now on.
+    [[nodiscard]] int release() noexcept { return std::exchange(descriptor_, -1); }
 
 private:
     int descriptor_ = -1;

@@ -45,15 +45,15 @@ std::string_view objectionInUse(std::string_view filesystemType)
 }  // namespace
 
 Capability capabilityFor(std::string_view filesystemType, Operation operation,
-                         std::string_view toolPath)
+                         std::string_view toolPath, RepairWay way)
 {
     const Tool* const tool = toolFor(filesystemType);
     if (tool == nullptr)
         return {contract::kPLErrorUnsupported,
                 {objectionTo(filesystemType), contract::printable(filesystemType), {}},
                 {}};
-    if (operation == Operation::Repair && !tool->canRepair())
-        return {contract::kPLErrorNoRepairHere, tool->reasonAgainstRepair, {}};
+    if (operation == Operation::Repair && !tool->repairs(way))
+        return {contract::kPLErrorNoRepairHere, tool->reasonAgainstDirectRepair, {}};
     // A repair is confirmed by verifying, so it needs both.
     std::filesystem::path program = findProgram(tool->name, toolPath);
     if (program.empty())

@@ -21,7 +21,7 @@ struct Capability {
 
 /// `filesystemType` as libblkid names it; `toolPath` is searched for the tool.
 Capability capabilityFor(std::string_view filesystemType, Operation operation,
-                         std::string_view toolPath);
+                         std::string_view toolPath, RepairWay way = RepairWay::Direct);
 
 /// Whether a volume of this kind, as libblkid names it, can be verified while it stays mounted and
 /// is written to: with an answer that is true, by a tool that is there. It needs root.

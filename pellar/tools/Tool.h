@@ -2,6 +2,7 @@
 #pragma once
 
 #include "pellar/outcome/Judgement.h"
+#include "pellar/outcome/Task.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/ProcessRunner.h"
 #include "pellar/tools/ToolOutput.h"
@@ -42,14 +43,36 @@ struct ToolHabits {
     std::string_view collectedMany = "no damage is left; %1$@ files are now in lost+found";
 };
 
+/// How a tool reads a log that waits to be replayed, which its verification passes over: by the
+/// places of its parts. What is not damage is not told.
+struct LogReading {
+    std::vector<std::string> (*arguments)(const std::vector<std::uint64_t>& parts,
+                                          const std::string& disk);
+    std::unique_ptr<OutputReader> (*makeReader)();
+};
+
+/// A file to which a repair gave a name of its own.
+struct CollectedFile {
+    std::string name;  ///< any bytes
+    std::uint64_t bytes = 0;
+};
+
+/// How the directory is listed in which a repair collects files that have lost their names.
+struct CollectedFilesReading {
+    std::string_view program;
+    std::vector<std::string> (*arguments)(const std::string& disk);
+    /// Of a line of what it prints.
+    std::optional<CollectedFile> (*fileIn)(std::string_view line);
+};
+
 /// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
 /// any thread.
 struct Tool {
     std::string_view name;        ///< of the executable that verifies
     std::string_view repairName;  ///< of the executable that repairs
     std::string_view package;     ///< the Debian package that brings them
-    /// Why it does not repair; empty where it does.
-    Sentence reasonAgainstRepair = {};
+    /// Why it is not let repair a disk without a trial before; empty where it is.
+    Sentence reasonAgainstDirectRepair = {};
     ToolHabits habits = {};
 
     /// Reads the disk a little; never writes.
@@ -64,8 +87,15 @@ struct Tool {
         return std::optional<double>();
     };
     Judgement (*judge)(const RunEvidence& evidence);
+    /// Null where a verification leaves nothing out of a log, or no tool can read it.
+    const LogReading* logReading = nullptr;
+    /// Null where no tool can list it.
+    const CollectedFilesReading* collectedFiles = nullptr;
 
-    bool canRepair() const { return reasonAgainstRepair.isEmpty(); }
+    bool repairs(RepairWay way) const
+    {
+        return way == RepairWay::TriedFirst || reasonAgainstDirectRepair.isEmpty();
+    }
 };
 
 }  // namespace pellar

@@ -55,10 +55,11 @@ struct Findings {
     bool foundDiskInUse = false;
     bool expectsDifference = false;  ///< in what is no damage, and so no matter of its exit status
     int crashSignal = 0;             ///< caught by the tool itself; 0 for none
-    std::optional<ReadFault> readFault;  ///< the first
-    std::optional<std::uint64_t> files;  ///< that it counted, where it says so at its end
-    std::uint64_t reconnected = 0;       ///< files that it gave a new name, as they had none
-    std::uint64_t cleared = 0;           ///< files and names that it did away with
+    std::optional<ReadFault> readFault;   ///< the first
+    std::optional<std::uint64_t> files;   ///< that it counted, where it says so at its end
+    std::vector<std::uint64_t> logParts;  ///< where the rest is of a log that it was to read
+    std::uint64_t reconnected = 0;        ///< files that it gave a new name, as they had none
+    std::uint64_t cleared = 0;            ///< files and names that it did away with
 
     friend bool operator==(const Findings&, const Findings&) = default;
 };

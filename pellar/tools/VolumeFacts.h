@@ -16,6 +16,7 @@ struct VolumeFacts {
     bool hasPrimary = false;    ///< the main superblock is in its place
     bool isForeign = false;     ///< something else claims the place: nothing may be written
     bool needsRecovery = false;
+    std::uint64_t log = 0;          ///< where a log is that has to be read apart; 0 for none
     bool isMarkedDirty = false;     ///< it says itself that it was not properly unmounted
     std::uint64_t volumeBytes = 0;  ///< 0 when not known
     std::uint64_t availableBytes = 0;
@@ -23,7 +24,7 @@ struct VolumeFacts {
     bool differsFromBackup =
         false;  ///< the two copies of the main superblock contradict each other
     std::optional<std::uint64_t> files;  ///< by its own books, where these agree with each other
-    std::vector<DiskPiece> backups;      ///< what a repair uses and a verification does not read
+    std::vector<ByteRange> backups;      ///< what a repair uses and a verification does not read
 
     bool isCutShort() const { return volumeBytes > availableBytes; }
 };

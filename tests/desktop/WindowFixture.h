@@ -24,6 +24,8 @@ protected:
     std::string makeDamagedImage(const std::string& name);
     /// Two partitions, the first with an ext4 volume.
     std::string makePartitionedImage(const std::string& name);
+    /// Keeps a repair of the image that was cut off after half of it was written: 'r' in two places.
+    void interruptRepair(const std::string& image);
     /// A checking tool that runs until it is told to end takes the place of e2fsck.
     void useEndlessTool();
 
@@ -50,6 +52,7 @@ protected:
     bool logHolds(const std::string& text);
     /// What the disk list says about the image.
     std::string cell(const std::string& image, DiskColumn column);
+    QModelIndex row(const std::string& image);
     std::string verdict(const std::string& image) { return cell(image, DiskColumn::Verdict); }
     QAction& command(const char* name);
     /// The sheet that is open; none when there is none.
@@ -67,7 +70,6 @@ protected:
 
 private:
     void TearDown() override;
-    QModelIndex row(const std::string& image);
 };
 
 }  // namespace orvane::desktop::test

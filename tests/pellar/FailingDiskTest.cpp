@@ -277,8 +277,10 @@ void expectAdviceToCopy(const test::Listener& heard, std::string_view because)
 
 TEST_F(FailingDiskTest, IsNeitherDamagedNorWrittenTo)
 {
+    enum class Way { Verify, Repair, TryARepair };
     for (const BadPlace& place : badPlaces)
-        for (const bool repairs : {false, true}) {
+        for (const Way way : {Way::Verify, Way::Repair, Way::TryARepair}) {
+            const bool repairs = way != Way::Verify;
             const auto backing = make(place.filesystem);
             if (backing.empty())
                 continue;
@@ -287,11 +289,12 @@ TEST_F(FailingDiskTest, IsNeitherDamagedNorWrittenTo)
             const FailingDisk failing(directory_.path("mounted"), backing, {place.bad});
             const auto disk = test::reference(
                 failing.path(), isListed ? std::string(place.filesystem) : std::string());
-            test::JobFixture library;
+            test::JobFixture library(
+                way == Way::TryARepair ? test::tryingIn(directory_.path("repairs")) : JobOptions());
             ASSERT_EQ(repairs ? library.repair(disk) : library.verify(disk), 0);
             const std::string because =
                 std::string(place.filesystem) + ", " + std::string(place.because);
-            if (repairs && place.filesystem == "btrfs" && isListed)
+            if (way == Way::Repair && place.filesystem == "btrfs" && isListed)
                 EXPECT_EQ(library.listener.error, contract::kPLErrorNoRepairHere) << because;
             else
                 expectAdviceToCopy(library.listener, because);

@@ -107,6 +107,13 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image, std
     return disk;
 }
 
+JobOptions tryingIn(const std::filesystem::path& directory)
+{
+    JobOptions options;
+    options.trials.room.directory = directory;
+    return options;
+}
+
 JobFixture::JobFixture(JobOptions options)
     : manager(loop, texts, [this, &options] {
           options.commandTrace = [this](std::string_view line) {
@@ -127,6 +134,12 @@ contract::ErrorCode JobFixture::verify(const contract::DiskReferencePointer& dis
 contract::ErrorCode JobFixture::repair(const contract::DiskReferencePointer& disk)
 {
     return finish(tool->beginStoragesystemFilesystemRepairForDisk(disk));
+}
+
+contract::ErrorCode JobFixture::run(Task task, const contract::DiskReferencePointer& disk)
+{
+    const auto own = manager.makeTool(listener);
+    return finish(own->begin(task, disk));
 }
 
 contract::ErrorCode JobFixture::finish(contract::ErrorCode begun)

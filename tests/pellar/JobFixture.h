@@ -4,6 +4,7 @@
 #include "contract/foundation/RunLoop.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/Manager.h"
+#include "pellar/RepairDisk.h"
 #include "tests/support/TestDirectory.h"
 
 #include <chrono>
@@ -92,6 +93,9 @@ JobOptions with(T JobOptions::*option, std::type_identity_t<T> value)
     return options;
 }
 
+/// By which repairs are tried, and kept to be undone, below this directory.
+JobOptions tryingIn(const std::filesystem::path& directory);
+
 /// One library, one listener, one loop.
 struct JobFixture {
     explicit JobFixture(JobOptions options = {});
@@ -99,6 +103,8 @@ struct JobFixture {
     /// Runs a job to its *finished* and answers what the begin answered.
     contract::ErrorCode verify(const contract::DiskReferencePointer& disk);
     contract::ErrorCode repair(const contract::DiskReferencePointer& disk);
+    /// The same of the tasks that a module does not know.
+    contract::ErrorCode run(Task task, const contract::DiskReferencePointer& disk);
     contract::ErrorCode finish(contract::ErrorCode begun);
 
     TestLoop loop;

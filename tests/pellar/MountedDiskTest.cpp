@@ -347,7 +347,7 @@ TEST(MapDevice, IsRepairedUnlessAPartitionIsMounted)
     auto reference = std::make_shared<contract::DiskReference>(*test::wholeDisk(device.name()));
     reference->storage = contract::DiskReference::Storage::BlockDevice;
     reference->length = 0;
-    test::JobFixture bench(test::with(&JobOptions::savedSectorsDirectory, workshop.path("saved")));
+    test::JobFixture bench(test::tryingIn(workshop.path("saved")));
 
     if (test::runTool({"partx", "-a", "--nr", "1", device.name()}).status == 0) {
         std::filesystem::create_directory(workshop.path("mount"));

@@ -102,6 +102,45 @@ TEST_P(RealTools, SayWhatIsTrue)
     EXPECT_FALSE(library.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
 }
 
+/// A library that tries repairs before it applies them.
+JobOptions trying(const test::TestDirectory& directory, RepairPolicy& policy)
+{
+    JobOptions options = test::tryingIn(directory.path("repairs"));
+    options.repairPolicy = [&policy] {
+        return policy;
+    };
+    return options;
+}
+
+TEST_P(RealTools, AreTriedBeforeAnythingIsWrittenAndUndone)
+{
+    constexpr Task undo{Subject::Filesystem, Operation::Undo};
+    const VolumeState& state = GetParam();
+    const test::TestDirectory directory;
+    const auto image = make(directory, state);
+    const auto disk = test::reference(image, std::string(state.filesystem));
+    const std::string before = contentsOf(image);
+    RepairPolicy policy;
+    test::JobFixture library(trying(directory, policy));
+    policy.isPreview = true;
+    policy.keptImage = directory.path("kept");
+    ASSERT_EQ(library.repair(disk), 0);
+    EXPECT_TRUE(contentsOf(image) == before) << "a preview wrote";
+    policy = {};
+    ASSERT_EQ(library.repair(disk), 0);
+    const bool isRepaired = library.listener.verdict == "repaired";
+    EXPECT_EQ(isRepaired, contentsOf(image) != before) << library.listener.message;
+    EXPECT_TRUE(!isRepaired || contentsOf(directory.path("kept")) == contentsOf(image))
+        << "the preview shows another repair";
+    EXPECT_TRUE(isRepaired || state.repaired != "repaired") << library.listener.message;
+    ASSERT_EQ(library.verify(disk), 0);
+    EXPECT_TRUE(!isRepaired || library.listener.verdict == "sound") << library.listener.message;
+    ASSERT_EQ(library.run(undo, disk), 0);
+    EXPECT_EQ(library.listener.verdict, isRepaired ? "undone" : "failed")
+        << library.listener.message;
+    EXPECT_TRUE(contentsOf(image) == before) << "it is not as it was";
+}
+
 INSTANTIATE_TEST_SUITE_P(EachState, RealTools, ::testing::ValuesIn(orvane::test::volumeStates()),
                          caseName);
 
@@ -300,6 +339,24 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         EXPECT_EQ(library.listener.verdict, "sound") << "after";
         EXPECT_EQ(library.listener.finished, 5);
     }
+}
+
+TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
+{
+    const test::TestDirectory directory;
+    const auto image = makeVolume(directory, {});
+    directory.damage(image, "unlink f3");
+    RepairPolicy policy;
+    policy.isPreview = true;
+    test::JobFixture library(trying(directory, policy));
+    ASSERT_EQ(library.repair(test::reference(image)), 0);
+    EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
+    EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
+    const auto& told = library.listener.dictionaries;
+    EXPECT_TRUE(std::ranges::any_of(told, [](const contract::Dictionary& message) {
+        return message.string(contract::kFsckMessageString) ==
+               "After the repair: no damage is left; 1 file is now in lost+found.";
+    }));
 }
 
 TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)

@@ -46,9 +46,24 @@ TEST(HelperRequest, ArrivesAsItWasMade)
         requests.back().disk.length = std::uint64_t(1) << 40U;
         requests.back().image = 17;
     }
+    for (const Subject subject : {Subject::Filesystem, Subject::PartitionMap})
+        for (const Operation operation : {Operation::Undo, Operation::Finish})
+            requests.push_back(request(subject, operation));
+    requests.push_back(request(Subject::Permissions, Operation::Undo));
+    constexpr bool keepsUndo = true;
+    for (const pellar::RepairPolicy& policy :
+         {pellar::RepairPolicy{true, false, false, !keepsUndo, true, {}},
+          pellar::RepairPolicy{false, true, false, keepsUndo, false, {}},
+          pellar::RepairPolicy{false, false, true, keepsUndo, false, {}}}) {
+        requests.push_back(request(Subject::Filesystem, Operation::Repair));
+        requests.back().policy = policy;
+    }
+    requests.push_back(request(Subject::Filesystem, Operation::Verify));
+    requests.back().policy.isThorough = true;
     for (const HelperRequest& made : requests) {
         const auto read = readHelperArguments(argumentsOf(made), isKnownDevice);
         ASSERT_TRUE(read) << read.error();
+        EXPECT_EQ(read->policy, made.policy);
         EXPECT_EQ(argumentsOf(*read), argumentsOf(made));
         EXPECT_EQ(read->task, made.task);
         EXPECT_EQ(read->disk.isWhole, made.disk.isWhole);
@@ -132,6 +147,43 @@ TEST(HelperRequest, NothingButADeviceByItsOwnNameIsTaken)
                        {5, "ext4;reboot", "no name of a file system"},
                        {6, "../../../tmp/x", "no language, but a way to somebody's texts"},
                    });
+}
+
+// What an authorisation was given for is what is done.
+TEST(HelperRequest, NoOptionIsTakenThatDoesNotGoWithTheRest)
+{
+    const auto isTaken = [](std::vector<std::string> first, std::vector<std::string> options) {
+        for (const char* const text : {"id", "--preview", "ext4", "--direct"})
+            first.emplace_back(text);
+        first.insert(first.end(), options.begin(), options.end());
+        const auto read = readHelperArguments(first, isKnownDevice);
+        EXPECT_TRUE(!read || !options.empty() || read->policy == pellar::RepairPolicy())
+            << "a name that looks like an option is a name";
+        return static_cast<bool>(read);
+    };
+    const auto onDevice = [&](const char* task, std::vector<std::string> options) {
+        return isTaken({task, "/dev/sdb1", "8:17:5:6bd0"}, std::move(options));
+    };
+    EXPECT_TRUE(onDevice("repair", {}));
+    EXPECT_TRUE(onDevice("repair", {"--preview"}));
+    EXPECT_TRUE(isTaken({"attach-repair", "7", "512", "1024"}, {"--direct", "--no-undo"}));
+    struct Case {
+        const char* task;
+        std::vector<std::string> options;
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{"repair", {"--preview", "--direct"}, "both writing and not"},
+          Case{"repair", {"--preview", "--no-undo"}, "nothing is to be undone"},
+          Case{"repair", {"--preview", "--preview"}, "once is enough"},
+          Case{"repair", {"--keep=/etc/shadow"}, "no file is written for a user"},
+          Case{"repair", {"--fetch-archives"}, "of permissions"},
+          Case{"verify", {"--direct"}, "a verification writes nothing"},
+          Case{"undo", {"--direct"}, "of repairs"},
+          Case{"repair-permissions", {"--preview"}, "it would be done for real"}})
+        EXPECT_FALSE(onDevice(c.task, c.options)) << c.task << ": " << c.because;
+    EXPECT_FALSE(isTaken({"attach-undo", "7", "512", "1024"}, {}))
+        << "what is kept of an image is its user's";
 }
 
 TEST(HelperRequest, NothingButARegionOfAnOpenFileIsTaken)

@@ -2,6 +2,7 @@
 // The asking side of the helper, with programs in the helper's place.
 
 #include "contract/pellar/ErrorCodes.h"
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/privileges/PrivilegedScript.h"
 #include "pellar/jobs/Job.h"
 #include "tests/pellar/JobFixture.h"
@@ -30,7 +31,13 @@ protected:
                                {[this] { asking_ += "begins "; },
                                 [this] {
                                     asking_ += "ends ";
-                                }}};
+                                }},
+                               {[](const contract::DiskReference& disk) {
+                                    return "type: undo " + disk.name;
+                                },
+                                {},
+                                {},
+                                {}}};
         job_ = std::make_unique<pellar::Job>(
             [this, how, job](pellar::StopSwitch& stop, pellar::EventQueue& road) {
                 return std::make_unique<PrivilegedScript>(how, job, texts_, stop, road);
@@ -78,6 +85,34 @@ printf '["finished",0,0,{"dictionary":[["kPLVerdict","sound"],["kPLMessage","'"$
     EXPECT_EQ(listener_.message, "verify /dev/sdz9");
     EXPECT_EQ(asking_, "begins ends ");
     EXPECT_TRUE(listener_.hasPlainLine("The volume “Stick” appears to be OK.\n"));
+}
+
+TEST_F(PrivilegedScriptTest, AdviceIsInTheWordsOfTheProgramThatAsked)
+{
+    const std::string end = "printf '[\"finished\",0,0,null]\\n'";
+    launch("cat <<'X'\n" + lineFromEvent(messageOf(Advice::Undo)) + "\n" +
+           lineFromEvent(messageOf(Advice::Apply)) + "\nX\n" + end);
+    ASSERT_TRUE(finishes());
+    ASSERT_EQ(listener_.dictionaries.size(), 1U)
+        << "what this program has no words for is not told";
+    EXPECT_EQ(listener_.dictionaries.front().string(contract::kFsckMessageString),
+              "type: undo Stick");
+}
+
+// The helper writes no file for a user; and it never repairs where only a preview is wanted.
+TEST_F(PrivilegedScriptTest, NoRepairedVolumeIsKeptWithMoreRights)
+{
+    auto job = jobOn("/dev/sdz9", pellar::Operation::Repair);
+    job.policy.isPreview = true;
+    launch("echo \"$*\" >" + workshop_.path("asked").native(), job);
+    ASSERT_TRUE(finishes());
+    EXPECT_NE(test::contentsOf(workshop_.path("asked")).find("--preview"), std::string::npos);
+    std::filesystem::remove(workshop_.path("asked"));
+    job.policy.keptImage = workshop_.path("kept");
+    launch("touch " + workshop_.path("asked").native(), job);
+    ASSERT_TRUE(finishes());
+    EXPECT_EQ(listener_.error, contract::kPLErrorNotAuthorized);
+    EXPECT_FALSE(std::filesystem::exists(workshop_.path("asked"))) << "nobody is asked for it";
 }
 
 TEST_F(PrivilegedScriptTest, WhatWasNotAllowedIsSaidAndEnds)

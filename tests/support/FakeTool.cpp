@@ -3,9 +3,11 @@
 // A tool that does what the file "script" beside it says, one action per line:
 //   say TEXT | progress TEXT | exit N | kill N | ignore N | wait | sleep MS
 //   flood-lines | flood-bytes | hold-pipe | shrink BYTES | environment | descriptors | terminal
+//   write-in-repair TEXT: at the beginning of the disk, when it was called with -a or -y
 //   say-in-repair TEXT: when it was called with -a or -y
 //   await NAME: until there is such a file beside it
 //   await-in-repair NAME: the same, when it was called with -a or -y
+//   become PROGRAM: which gets its arguments
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
@@ -76,6 +78,13 @@ bool isRepairing()
     return false;
 }
 
+void writeToDisk(const std::string& text)
+{
+    const int disk = ::open("/proc/self/fd/3", O_WRONLY | O_CLOEXEC);
+    put(disk, text);
+    ::close(disk);
+}
+
 void await(const std::string& name)
 {
     const auto self = std::filesystem::read_symlink("/proc/self/exe");
@@ -83,11 +92,19 @@ void await(const std::string& name)
         ::usleep(5000);
 }
 
-void act(const std::string& action, const std::string& text)
+[[noreturn]] void become(const std::string& program, char** arguments)
+{
+    ::execv(program.c_str(), arguments);
+    std::exit(97);
+}
+
+void act(const std::string& action, const std::string& text, char** arguments)
 {
     const int number = std::atoi(text.c_str());
     if (action == "say" || (action == "say-in-repair" && isRepairing()))
         put(STDOUT_FILENO, text + "\n");
+    else if (action == "write-in-repair" && isRepairing())
+        writeToDisk(text);
     else if (action == "progress")
         put(4, text + "\n");
     else if (action == "exit")
@@ -115,6 +132,8 @@ void act(const std::string& action, const std::string& text)
             put(STDOUT_FILENO, std::string("environment ") + *entry + "\n");
     else if (action == "await" || (action == "await-in-repair" && isRepairing()))
         await(text);
+    else if (action == "become")
+        become(text, arguments);
     else if (action == "terminal")
         tellTerminal();
     else if (action == "descriptors")
@@ -123,7 +142,7 @@ void act(const std::string& action, const std::string& text)
 
 }  // namespace
 
-int main()
+int main(int, char** arguments)
 {
     const auto self = std::filesystem::read_symlink("/proc/self/exe");
     std::ifstream script(self.parent_path() / "script");
@@ -133,7 +152,7 @@ int main()
         std::string text;
         words >> action >> std::ws;
         std::getline(words, text);
-        act(action, text);
+        act(action, text, arguments);
     }
     return 0;
 }

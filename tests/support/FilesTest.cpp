@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/files/ActivityLog.h"
+#include "orvane/support/settings/RepairSettings.h"
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "tests/support/TestDirectory.h"
@@ -78,6 +79,23 @@ TEST(SettingsFile, KeepsValuesAndTheirKinds)
     struct stat status = {};
     ASSERT_EQ(::stat(settings.file.c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 0777U, 0600U);
+}
+
+TEST(RepairSettings, WhatIsNoSensibleNumberIsAsItWas)
+{
+    const TestDirectory directory;
+    const auto file = directory / "settings.json";
+    EXPECT_EQ(readRepairSettings(file), RepairSettings()) << "no file";
+    test::write(file, R"({"keptRepairs": 3, "keptRepairDays": 0, "keptRepairMegabytes": 10,
+                    "thoroughVerification": true})");
+    EXPECT_EQ(readRepairSettings(file), (RepairSettings{3, 0, 10, true}));
+    test::write(file, R"({"keptRepairs": -1, "keptRepairDays": "3", "keptRepairMegabytes": 1e30,
+                    "thoroughVerification": "perhaps"})");
+    EXPECT_EQ(readRepairSettings(file), RepairSettings());
+    test::write(file, R"({"keptRepairs": 99999999999999999999})");
+    EXPECT_EQ(readRepairSettings(file), RepairSettings());
+    test::write(file, "[");
+    EXPECT_EQ(readRepairSettings(file), RepairSettings());
 }
 
 TEST(SettingsFile, AnotherProgramsChangeIsKept)

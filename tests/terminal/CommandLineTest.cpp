@@ -41,6 +41,13 @@ TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsageAndNotObeyed)
           Case{{"verify", "--color=pink", "a"}, "no such choice"},
           Case{{"verify", "--log-level=loud", "a"}, "no number"},
           Case{{"verify", "--log-level=9", "a"}, "out of range"},
+          Case{{"verify", "--preview", "a"}, "writes nothing anyway"},
+          Case{{"repair", "--preview", "--direct", "a"}, "both writing and not"},
+          Case{{"repair", "--preview", "--apply-unproven", "a"}, "nothing is applied"},
+          Case{{"repair", "--preview", "--no-undo", "a"}, "nothing is to be undone"},
+          Case{{"repair", "--keep", "f", "a"}, "only a preview's is kept"},
+          Case{{"repair", "--preview", "--keep", "f", "a", "b"}, "one file, two volumes"},
+          Case{{"undo", "--preview", "a"}, "of repairs"}, Case{{"finish"}, "what?"},
           Case{{"verify", "--f\x1b[2Jast", "a"}, "an option with escapes"},
           Case{{"\x1b]0;title\x07"}, "a command with escapes"}}) {
         const auto read = readWords(c.words);
@@ -109,6 +116,20 @@ TEST_F(TerminalTextTest, AProgressLineFitsAnyTerminal)
             EXPECT_EQ(fittedTo(line, columns), line);
             EXPECT_FALSE(holdsControls(line)) << line;
         }
+}
+
+TEST_F(TerminalTextTest, AWordOfAShellStaysOneWord)
+{
+    struct Case {
+        std::string_view text;
+        std::string_view word;
+    };
+    for (const Case& c :
+         {Case{"/dev/sdb1", "/dev/sdb1"}, Case{"LABEL=x y", "'LABEL=x y'"}, Case{"a#1", "'a#1'"},
+          Case{"$(reboot);", "'$(reboot);'"}, Case{"it's", "'it'\\''s'"}, Case{"", "''"},
+          Case{"-rf", "./-rf"}, Case{"~", "'~'"}})
+        EXPECT_EQ(shellWord(c.text), c.word);
+    EXPECT_FALSE(holdsControls(shellWord("a\x1b[2J\n\x07")));
 }
 
 TEST_F(TerminalTextTest, HostileTextIsMadeHarmless)

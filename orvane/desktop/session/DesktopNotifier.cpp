@@ -19,7 +19,7 @@ constexpr std::size_t mostLines = 4;  // a bubble is small
 std::string titleOf(const std::vector<FinishedRun>& runs, const Translator& texts)
 {
     const StartedRun& first = runs.front().run;
-    const bool isRepair = first.task.isRepair();
+    const bool isRepair = first.task.isRepair() || first.task.isUndo();
     if (runs.size() == 1)
         return texts.sentence(
             isRepair ? texts.text("Repair of “%@”") : texts.text("Verification of “%@”"),

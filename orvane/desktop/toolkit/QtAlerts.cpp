@@ -119,6 +119,8 @@ std::shared_ptr<contract::Alert> QtAlerts::makeAlert(const contract::Alert::Text
 void QtAlerts::simpleModuleAlert(const std::string& title, const std::string& message,
                                  std::int32_t error)
 {
+    if (isWithheld_ && isWithheld_())
+        return;
     std::string informative = title.empty() ? std::string() : message;
     if (error != 0 && errorText_)
         informative += (informative.empty() ? "" : "\n\n") + errorText_(error);

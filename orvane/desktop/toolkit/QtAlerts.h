@@ -24,6 +24,10 @@ public:
     /// The window that sheets are shown on, whichever window a module names.
     void setWindow(QWidget* window) { window_ = window; }
 
+    /// Asked before a simple alert is shown; YES withholds it, because the host has more to say
+    /// about the same.
+    void setWithheld(std::function<bool()> isWithheld) { isWithheld_ = std::move(isWithheld); }
+
     std::shared_ptr<contract::Alert> makeAlert(const contract::Alert::Text& text) override;
     /// Returns at once; the sheet goes away with its button.
     void simpleModuleAlert(const std::string& title, const std::string& message,
@@ -33,6 +37,7 @@ private:
     class Sheet;
 
     std::function<std::string(std::int32_t)> errorText_;
+    std::function<bool()> isWithheld_;
     QPointer<QWidget> window_;
 };
 

@@ -44,23 +44,32 @@ constexpr std::string_view splitterKey = "MainWindow.splitter";
 
 }  // namespace
 
-ProgressArea::ProgressArea(const QString& accessibleName, QWidget* parent)
-    : QWidget(parent), bar_(new QProgressBar(this)), label_(new QLabel(this))
+ProgressArea::ProgressArea(const Translator& texts, QWidget* parent)
+    : QWidget(parent),
+      bar_(new QProgressBar(this)),
+      label_(new QLabel(this)),
+      stopButton_(new QPushButton(toQtTitle(texts.text("Stop")), this))
 {
     bar_->setObjectName(QStringLiteral("progressBar"));
-    bar_->setAccessibleName(accessibleName);
+    bar_->setAccessibleName(toQt(texts.text("Progress")));
     bar_->setTextVisible(false);
     label_->setObjectName(QStringLiteral("statusLine"));
     label_->setTextFormat(Qt::PlainText);
     label_->setTextInteractionFlags(Qt::TextSelectableByMouse);
     label_->setMinimumWidth(1);
     label_->setSizePolicy(QSizePolicy::Ignored, QSizePolicy::Fixed);
+    stopButton_->setObjectName(QStringLiteral("stopButton"));
+    connect(stopButton_, &QPushButton::clicked, this, [this] { stop_(); });
 
     auto* const layout = new QHBoxLayout(this);
     layout->setContentsMargins(12, 6, 12, 6);
     layout->setSpacing(12);
     layout->addWidget(label_, 3);
     layout->addWidget(bar_, 2);
+    layout->addWidget(stopButton_);
+    stopButton_->hide();
+    setMinimumHeight(layout->contentsMargins().top() + stopButton_->sizeHint().height() +
+                     layout->contentsMargins().bottom());
     keepRoomWhenHidden(*bar_);
     keepRoomWhenHidden(*label_);
 }
@@ -112,6 +121,12 @@ void ProgressArea::showText()
     label_->setToolTip(toQtToolTip(fromQt(text_)));
 }
 
+void ProgressArea::setStop(std::function<void()> stop)
+{
+    stop_ = std::move(stop);
+    stopButton_->setVisible(static_cast<bool>(stop_));
+}
+
 void ProgressArea::resizeEvent(QResizeEvent* event)
 {
     QWidget::resizeEvent(event);
@@ -122,7 +137,7 @@ MainWindow::MainWindow(const Translator& texts)
     : disks_(new DiskList(texts)),
       tabs_(new QTabWidget),
       splitter_(new QSplitter(Qt::Horizontal)),
-      progress_(new ProgressArea(toQt(texts.text("Progress")), this))
+      progress_(new ProgressArea(texts, this))
 {
     setObjectName(QStringLiteral("mainWindow"));
     setWindowTitle(QStringLiteral("Orvane"));

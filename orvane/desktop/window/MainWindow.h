@@ -7,6 +7,7 @@
 #include <QLabel>
 #include <QMainWindow>
 #include <QProgressBar>
+#include <QPushButton>
 #include <QSplitter>
 #include <QTabWidget>
 #include <QWidget>
@@ -19,10 +20,11 @@
 namespace orvane::desktop {
 
 /// The window's status line, and beside it the progress bar. Both keep their room when they are
-/// not in use, so that nothing in the window jumps.
+/// not in use, so that nothing in the window jumps. For a job that no module has a button for, there
+/// is one to stop it.
 class ProgressArea final : public QWidget {
 public:
-    ProgressArea(const QString& accessibleName, QWidget* parent);
+    ProgressArea(const Translator& texts, QWidget* parent);
 
     void setBarActive(bool isActive);
     void setTextActive(bool isActive);
@@ -32,6 +34,8 @@ public:
     /// Any bytes; shown as one line of plain text.
     void setText(std::string_view text);
     QString text() const { return text_; }
+    /// Shows the Stop button, which calls this with every press; hides it when empty.
+    void setStop(std::function<void()> stop);
 
 protected:
     void resizeEvent(QResizeEvent* event) override;
@@ -42,6 +46,8 @@ private:
 
     QProgressBar* bar_;
     QLabel* label_;
+    QPushButton* stopButton_;
+    std::function<void()> stop_;
     QString text_;
     bool isBarActive_ = false;
     bool isIndeterminate_ = true;

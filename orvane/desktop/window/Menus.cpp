@@ -9,9 +9,23 @@
 namespace orvane::desktop {
 namespace {
 
+std::string reasonAgainst(const MenuCommand& command)
+{
+    return command.reasonAgainst ? command.reasonAgainst() : std::string();
+}
+
 bool isAvailable(const MenuCommand& command)
 {
-    return !command.isAvailable || command.isAvailable();
+    return (!command.isAvailable || command.isAvailable()) && reasonAgainst(command).empty();
+}
+
+void prepare(const MenuCommand& command, QAction& action)
+{
+    action.setEnabled(isAvailable(command));
+    if (command.reasonAgainst)
+        action.setToolTip(toQtToolTip(reasonAgainst(command)));
+    if (command.isOn)
+        action.setChecked(command.isOn());
 }
 
 void perform(const MenuCommand& command, QAction& action)
@@ -34,11 +48,8 @@ void addCommand(QMenu& menu, const MenuCommand& command, const Translator& texts
     action->setCheckable(static_cast<bool>(command.isOn));
     QObject::connect(action, &QAction::triggered, action,
                      [command, action] { perform(command, *action); });
-    QObject::connect(&menu, &QMenu::aboutToShow, action, [command, action] {
-        action->setEnabled(isAvailable(command));
-        if (command.isOn)
-            action->setChecked(command.isOn());
-    });
+    QObject::connect(&menu, &QMenu::aboutToShow, action,
+                     [command, action] { prepare(command, *action); });
     // A disabled action would not hear its shortcut.
     QObject::connect(
         &menu, &QMenu::aboutToHide, action, [action] { action->setEnabled(true); },
@@ -52,6 +63,7 @@ void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Transla
     for (const Menu& menu : menus) {
         QMenu* const added = window.menuBar()->addMenu(toQt(texts.text(menu.title)));
         added->setObjectName(QLatin1String(menu.objectName));
+        added->setToolTipsVisible(true);
         for (const MenuCommand& command : menu.commands)
             addCommand(*added, command, texts);
     }

@@ -7,6 +7,7 @@
 #include <QMainWindow>
 
 #include <functional>
+#include <string>
 #include <vector>
 
 namespace orvane::desktop {
@@ -21,6 +22,9 @@ struct MenuCommand {
     std::function<bool()> isAvailable = {};
     /// For a command that is a switch: its state, asked when the menu opens.
     std::function<bool()> isOn = {};
+    /// Why the command cannot be given, in the user's language: its tool tip while it is grey. Asked
+    /// as `isAvailable` is, and beside it; empty when it can.
+    std::function<std::string()> reasonAgainst = {};
 };
 
 /// A menu of the window's menu bar; a command without a title is a line between others.

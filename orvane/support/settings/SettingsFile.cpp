@@ -16,8 +16,6 @@
 namespace orvane {
 namespace {
 
-constexpr std::size_t largestFile = 1U << 20U;
-
 std::optional<bool> truthValue(std::string_view text)
 {
     constexpr std::array<std::string_view, 4> affirmative{"yes", "true", "on", "1"};
@@ -65,7 +63,7 @@ void SettingsFile::read()
 {
     if (file_.empty())
         return;
-    const auto contents = readWholeFile(file_, largestFile);
+    const auto contents = readWholeFile(file_, largestSettingsFile);
     if (!contents) {
         const int error = contents.error();
         if (error == EFBIG || error == EINVAL)

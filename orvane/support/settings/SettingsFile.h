@@ -7,8 +7,12 @@
 #include <filesystem>
 #include <map>
 #include <string>
+#include <string_view>
 
 namespace orvane {
+
+inline constexpr std::string_view settingsFileName = "settings.json";
+inline constexpr std::size_t largestSettingsFile = 1U << 20U;
 
 /// The stored settings: one JSON object in a file that is replaced as a whole. Main thread only.
 ///

@@ -2,7 +2,7 @@
 #include "pellar/packages/dpkg/AptArchives.h"
 
 #include "contract/foundation/UTF8.h"
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 #include "pellar/packages/PackagedFile.h"
 #include "pellar/packages/TemporaryDirectory.h"
 #include "pellar/packages/TextLines.h"

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/packages/dpkg/DpkgReferences.h"
 
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 #include "pellar/packages/PackagedFile.h"
 #include "pellar/packages/Reference.h"
 #include "pellar/packages/ScriptMentions.h"

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/packages/dpkg/ReferenceStore.h"
 
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 
 #include <fcntl.h>
 #include <sys/stat.h>

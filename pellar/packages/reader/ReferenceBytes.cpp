@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/packages/reader/ReferenceBytes.h"
 
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 #include "pellar/packages/Permissions.h"
 
 #include <array>

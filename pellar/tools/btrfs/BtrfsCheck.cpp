@@ -6,6 +6,7 @@
 #include "pellar/tools/btrfs/BtrfsSuperblock.h"
 
 #include <array>
+#include <charconv>
 
 namespace pellar {
 namespace {
@@ -112,6 +113,36 @@ class BtrfsOutput final : public LineOutput {
     }
 };
 
+/// Reads what btrfs inspect-internal dump-tree prints of a log's tree of trees, and of these. It
+/// ends with 0 also where it could not read.
+class BtrfsLogOutput final : public LineOutput {
+    ToolLine tell(std::string_view line) override
+    {
+        noteLogPart(line);
+        const bool isDamage = line.starts_with("checksum verify failed") ||
+                              line.starts_with("parent transid verify failed") ||
+                              line.starts_with("bad tree block") || line.starts_with("ERROR: ");
+        return isDamage ? problem(line, Damage::Structure) : detail(line);
+    }
+
+    ///     "	item 0 key (TREE_LOG ROOT_ITEM 5) itemoff 15844 itemsize 439"
+    ///     "		generation 8 root_dirid 0 bytenr 30736384 byte_limit 0 bytes_used 0"
+    void noteLogPart(std::string_view line)
+    {
+        constexpr std::string_view sign = " bytenr ";
+        const std::size_t at = line.find(sign);
+        if (isLogItem_ && at != std::string_view::npos) {
+            std::uint64_t part = 0;
+            const char* const number = line.data() + at + sign.size();
+            if (std::from_chars(number, line.data() + line.size(), part).ec == std::errc())
+                findings_.logParts.push_back(part);
+        }
+        isLogItem_ = line.find("key (TREE_LOG ROOT_ITEM ") != std::string_view::npos;
+    }
+
+    bool isLogItem_ = false;  ///< the line before begins one
+};
+
 constexpr std::array damagedStatuses{1};
 
 VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes)
@@ -119,13 +150,28 @@ VolumeFacts examine(int disk, std::uint64_t offset, std::uint64_t availableBytes
     const auto superblock = readBtrfsSuperblock(disk, offset, availableBytes);
     VolumeFacts facts = factsFrom(superblock, "btrfs", disk, offset, availableBytes);
     facts.volumeBytes = superblock ? superblock->diskBytes : 0;
-    facts.needsRecovery = facts.hasPrimary && superblock->hasLog;
+    facts.log = facts.hasPrimary ? superblock->log : 0;
+    facts.needsRecovery = facts.log != 0;
     return facts;
 }
 
-std::vector<std::string> arguments(Access, const std::string& disk, std::uint64_t)
+std::vector<std::string> arguments(Access access, const std::string& disk, std::uint64_t)
 {
+    // --force lets it begin without the ten seconds in which it warns.
+    if (access == Access::ReadWrite)
+        return {"check", "--repair", "--force", disk};
     return {"check", "--readonly", disk};
+}
+
+// The log is a tree of trees; each is read with all that is below it.
+std::vector<std::string> logArguments(const std::vector<std::uint64_t>& parts,
+                                      const std::string& disk)
+{
+    std::vector<std::string> arguments{"inspect-internal", "dump-tree", "--hide-names", "--follow"};
+    for (const std::uint64_t part : parts)
+        arguments.insert(arguments.end(), {"-b", std::to_string(part)});
+    arguments.push_back(disk);
+    return arguments;
 }
 
 // It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
@@ -145,11 +191,12 @@ Judgement judge(const RunEvidence& evidence)
 
 const Tool& btrfsCheck()
 {
+    static constexpr LogReading logReading{logArguments, readerFor<BtrfsLogOutput>};
     static const Tool tool{
         .name = name,
         .repairName = name,
         .package = "btrfs-progs",
-        .reasonAgainstRepair =
+        .reasonAgainstDirectRepair =
             {"to repair btrfs is dangerous by its tool’s own manual; copy what matters to another "
              "volume and make this one anew",
              {},
@@ -158,6 +205,7 @@ const Tool& btrfsCheck()
         .arguments = arguments,
         .makeReader = readerFor<BtrfsOutput>,
         .judge = judge,
+        .logReading = &logReading,
     };
     return tool;
 }

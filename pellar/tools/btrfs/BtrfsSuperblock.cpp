@@ -14,7 +14,7 @@ std::optional<BtrfsSuperblock> parseBtrfsSuperblock(ByteView bytes, std::uint64_
         return std::nullopt;
     BtrfsSuperblock block;
     std::copy_n(bytes.begin() + 32, block.id.size(), block.id.begin());
-    block.hasLog = littleEndian(bytes, 96, 8) != 0;
+    block.log = littleEndian(bytes, 96, 8);
     block.disks = littleEndian(bytes, 136, 8);
     block.diskBytes = littleEndian(bytes, 209, 8);
     return block.disks == 0 ? std::nullopt : std::optional(block);

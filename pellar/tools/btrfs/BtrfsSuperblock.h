@@ -18,7 +18,7 @@ struct BtrfsSuperblock {
     BtrfsId id{};
     std::uint64_t diskBytes = 0;  ///< of this one disk
     std::uint64_t disks = 0;      ///< that the volume is made of
-    bool hasLog = false;          ///< changes that only a mount brings to their place
+    std::uint64_t log = 0;        ///< where changes are that only a mount brings to their place
     bool isBackup = false;
 };
 

@@ -6,6 +6,8 @@
 #include "pellar/tools/ext/E2fsckOutput.h"
 #include "pellar/tools/ext/ExtSuperblock.h"
 
+#include <charconv>
+
 namespace pellar {
 namespace {
 
@@ -113,6 +115,37 @@ std::optional<double> percentOf(std::string_view progressLine)
     return e2fsckPercent(progressLine);
 }
 
+std::vector<std::string> listingArguments(const std::string& disk)
+{
+    return {"-R", "ls -p /lost+found", disk};
+}
+
+/// "/13/100644/0/0/#13/126824/": inode, mode, user, group, name, size. Of a directory and of what
+/// is free, "/0/000000/0/0//0/", there is no size.
+std::optional<CollectedFile> collectedFileIn(std::string_view line)
+{
+    constexpr int slashesBeforeName = 5;
+    constexpr std::string_view regular = "100";
+    std::size_t at = 0;
+    std::size_t mode = 0;
+    for (int i = 0; i < slashesBeforeName; ++i) {
+        at = line.find('/', i == 0 ? 0 : at + 1);
+        if (at == std::string_view::npos)
+            return std::nullopt;
+        mode = i == 1 ? at + 1 : mode;
+    }
+    const std::string_view rest = line.substr(at + 1);
+    const std::size_t end = rest.size() > 1 ? rest.rfind('/', rest.size() - 2) : 0;
+    if (!line.substr(mode).starts_with(regular) || !rest.ends_with('/') || end == 0 ||
+        end == std::string_view::npos)
+        return std::nullopt;
+    CollectedFile file{std::string(rest.substr(0, end)), 0};
+    const char* const number = rest.data() + end + 1;
+    const bool isNumber =
+        std::from_chars(number, rest.data() + rest.size(), file.bytes).ec == std::errc();
+    return isNumber ? std::optional(file) : std::nullopt;
+}
+
 Judgement judge(const RunEvidence& evidence)
 {
     if (const auto judgement = judgementOfEnding(evidence, name))
@@ -126,6 +159,8 @@ Judgement judge(const RunEvidence& evidence)
 
 const Tool& e2fsck()
 {
+    static constexpr CollectedFilesReading collectedFiles{"debugfs", listingArguments,
+                                                          collectedFileIn};
     static const Tool tool{
         .name = name,
         .repairName = name,
@@ -140,6 +175,7 @@ const Tool& e2fsck()
         .makeReader = readerFor<E2fsckOutput>,
         .percentOf = percentOf,
         .judge = judge,
+        .collectedFiles = &collectedFiles,
     };
     return tool;
 }

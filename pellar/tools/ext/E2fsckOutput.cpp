@@ -85,6 +85,15 @@ bool isSavingOnly(std::string_view text)
            (text.starts_with(") could be narrower.") || text.starts_with(") could be shorter."));
 }
 
+/// "Free blocks count wrong (56023, counted=55588).": the sum that the superblock keeps of its
+/// groups. While a volume is mounted nobody keeps it, and mounting it adds it up anew (ext4's
+/// ext4_fill_super), so behind a journal that waited it is no problem.
+bool isTotalOnly(std::string_view text)
+{
+    return text.starts_with("Free blocks count wrong (") ||
+           text.starts_with("Free inodes count wrong (");
+}
+
 /// "11/2048 files": how many are in use.
 std::optional<std::uint64_t> filesIn(std::string_view tally)
 {
@@ -284,13 +293,14 @@ bool E2fsckOutput::readRemark(std::string_view line)
 void E2fsckOutput::readAnswer(std::string_view line, bool isYes, std::vector<ToolLine>& lines)
 {
     const bool hasItsText = !isBareAnswer(line) || kept_.empty();
-    const bool isProblem = !isSavingOnly(line);
     const std::string_view problem = hasItsText ? line : std::string_view(kept_.front());
+    const bool isProblem =
+        !isSavingOnly(line) && !(findings_.replayedJournal && isTotalOnly(problem));
     if (isProblem)
         findings_.damage.add(e2fsckDamageOf(problem));
     if (isYes)
         countLosses(problem, line);
-    releaseKept(hasItsText ? Kind::Detail : Kind::Problem, lines);
+    releaseKept(hasItsText || !isProblem ? Kind::Detail : Kind::Problem, lines);
     lines.push_back(
         {hasItsText && isProblem ? Kind::Problem : Kind::Detail, std::string(line), {}});
     findings_.problems += isProblem ? 1 : 0;

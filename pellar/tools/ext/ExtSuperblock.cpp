@@ -98,9 +98,9 @@ std::uint64_t ExtSuperblock::descriptorTableBytes() const
 }
 
 // With sparse backups they are in the groups 1 and all powers of 3, 5 and 7.
-std::vector<DiskPiece> ExtSuperblock::backups(std::uint64_t availableBytes) const
+std::vector<ByteRange> ExtSuperblock::backups(std::uint64_t availableBytes) const
 {
-    std::vector<DiskPiece> pieces;
+    std::vector<ByteRange> pieces;
     if (!hasSparseBackups || hasFewBackups)
         return pieces;
     const std::uint64_t bytes = blockBytes + (hasMetaGroups ? 0 : descriptorTableBytes());

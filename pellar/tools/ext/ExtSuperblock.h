@@ -39,7 +39,7 @@ struct ExtSuperblock {
     std::uint64_t descriptorTableBytes() const;
     /// Where its copies are, each with the descriptors behind it, as far as they are on the disk;
     /// none where these stand elsewhere than by default.
-    std::vector<DiskPiece> backups(std::uint64_t availableBytes) const;
+    std::vector<ByteRange> backups(std::uint64_t availableBytes) const;
 
     /// Bytes; the greatest number when the product does not fit.
     std::uint64_t volumeBytes() const;

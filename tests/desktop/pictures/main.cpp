@@ -8,6 +8,7 @@
 #include "tests/support/TestDirectory.h"
 
 #include <QApplication>
+#include <QMenu>
 #include <QPainter>
 #include <QTest>
 
@@ -50,11 +51,30 @@ protected:
     void takePicture(const std::string& name)
     {
         QPixmap picture = window().grab();
-        if (QMessageBox* const box = sheet()) {
-            const QPoint corner = box->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
-            QPainter(&picture).drawPixmap(corner, box->grab());
+        QWidget* const above = sheet() != nullptr ? sheet() : QApplication::activePopupWidget();
+        if (above != nullptr) {
+            const QPoint corner = above->mapToGlobal(QPoint()) - window().mapToGlobal(QPoint());
+            QPainter(&picture).drawPixmap(corner, above->grab());
         }
         save(picture, name);
+    }
+
+    void takePictureOfMenu(const char* command, const std::string& name)
+    {
+        auto* const menu = qobject_cast<QMenu*>(this->command(command).parent());
+        menu->popup(window().mapToGlobal(QPoint(120, 24)));
+        QTest::qWait(50);
+        takePicture(name);
+        menu->close();
+        QTest::qWait(50);
+    }
+
+    /// Presses what changes something, of a sheet that asks.
+    void accept()
+    {
+        for (QAbstractButton* button : sheet()->buttons())
+            if (sheet()->buttonRole(button) == QMessageBox::DestructiveRole)
+                QTest::mouseClick(button, Qt::LeftButton);
     }
 
     static void save(const QPixmap& picture, const std::string& name)
@@ -79,6 +99,52 @@ TEST_F(Pictures, OfADamagedDiskThatWasVerified)
     QWidget& help = *session().host().sharedHelpManager().window();
     save(help.grab(), "-help");
     EXPECT_LE(window().minimumSizeHint().width(), 1180) << "it has room on a small screen";
+}
+
+TEST_F(Pictures, OfARepairThatIsUndone)
+{
+    const std::string image = makeDamagedImage("Letters");
+    const std::string interrupted = makeImage("Photos");
+    interruptRepair(interrupted);
+    openInOneSize({image, interrupted});
+    takePictureOfMenu("verifyThoroughly", "-settings");
+    takePicture("-interrupted-row");
+    select(interrupted);
+    button("repairDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    ASSERT_TRUE(waitUntil([this] { return sheet() != nullptr; }));
+    QTest::qWait(300);
+    takePicture("-interrupted");
+    takeSheet();
+    treat("repairDiskButton", image);
+    QTest::qWait(300);
+    takePictureOfMenu("undoRepair", "-menu");
+    command("undoRepair").trigger();
+    QTest::qWait(100);
+    takePicture("-undo");
+    accept();
+    QCoreApplication::sendPostedEvents(&window());
+    takePicture("-undoing");
+    ASSERT_TRUE(waitUntil([&] { return verdict(image) != "" && logRows().size() > 10; }));
+    QTest::qWait(300);
+    takePicture("-undone");
+}
+
+TEST_F(Pictures, OfARepairThatIsNotProven)
+{
+    const std::string tools = directory_.fakeTools(
+        "say Pass 1: Checking inodes, blocks, and sizes\nwrite-in-repair changed\nexit 4");
+    ::setenv("FIXWELL_TOOL_PATH", tools.c_str(), 1);
+    const std::string image = makeImage("Letters");
+    openInOneSize({image});
+    select(image);
+    button("repairDiskButton").press();
+    ASSERT_TRUE(waitUntil([this] { return sheet() != nullptr; }));
+    QTest::qWait(300);
+    takePicture("-unproven");
+    accept();
+    QTest::qWait(100);
+    takePicture("-unproven-confirmation");
 }
 
 }  // namespace

@@ -65,10 +65,7 @@ void expectReport(const fs::path& image, const DamageCase& c)
 }
 
 struct MapBench : test::JobFixture {
-    explicit MapBench(const fs::path& saved)
-        : JobFixture(test::with(&JobOptions::savedSectorsDirectory, saved))
-    {
-    }
+    explicit MapBench(const fs::path& saved) : JobFixture(test::tryingIn(saved)) {}
 
     void verifyMap(const fs::path& disk)
     {
@@ -98,21 +95,8 @@ std::set<std::uint64_t> differences(Bytes a, Bytes b)
     return sectors;
 }
 
-/// As `sh README.txt` would, command by command.
-Bytes putBack(Bytes disk, const fs::path& saved)
-{
-    for (const auto& file : fs::recursive_directory_iterator(saved)) {
-        const std::string name = file.path().filename();
-        if (name.starts_with("sector-"))
-            std::ranges::copy(test::fileBytes(file.path()),
-                              disk.begin() + std::stol(name.substr(7)) * 512);
-    }
-    return disk;
-}
-
 /// Carried out: what is kept, what is written, and what the disk is then.
-void expectRepaired(const test::TestDirectory& workshop, MapBench& bench, const DiskImage& disk,
-                    const Bytes& before)
+void expectRepaired(MapBench& bench, const DiskImage& disk, const Bytes& before)
 {
     const Bytes damaged = disk.bytes();
     bench.verifyMap(disk.path());
@@ -126,11 +110,12 @@ void expectRepaired(const test::TestDirectory& workshop, MapBench& bench, const 
     }
     for (const std::uint64_t sector : differences(after, damaged))
         EXPECT_TRUE(sector <= 33 || sector >= lastSector - 32) << "sector " << sector;
-    EXPECT_TRUE(putBack(after, workshop.path("saved")) == damaged)
-        << "what was kept is not what was there";
     expectToolsAgree(disk.path());
     bench.verifyMap(disk.path());
     EXPECT_EQ(bench.listener.verdict, "sound");
+    bench.run({Subject::PartitionMap, Operation::Undo}, test::wholeDisk(disk.path()));
+    EXPECT_EQ(bench.listener.verdict, "undone") << bench.listener.message;
+    EXPECT_TRUE(disk.bytes() == damaged) << "what was kept is not what was there";
 }
 
 void expectUntouched(const test::TestDirectory& workshop, MapBench& bench, const DiskImage& disk)
@@ -197,7 +182,7 @@ TEST(PartitionMaps, AGPTIsRestoredWhereItIsThereTwiceAndLeftAloneElsewhere)
         expectReport(disk.path(), c);
         MapBench bench(workshop.path("saved"));
         if (c.verdict == repairable)
-            expectRepaired(workshop, bench, disk, before);
+            expectRepaired(bench, disk, before);
         if (c.verdict == person)
             expectUntouched(workshop, bench, disk);
     }
@@ -366,28 +351,30 @@ TEST(PartitionMaps, WithoutAPlaceForTheOldSectorsNothingIsWritten)
     }
 }
 
-TEST(PartitionMaps, KeepsTheOldSectorsPrivatelyAndTellsHowToPutThemBack)
+TEST(PartitionMaps, EachRepairIsUndoneByItself)
 {
     const test::TestDirectory workshop;
-    const DiskImage disk = DiskImage::gpt(workshop, "it's $HOME\n.img");
+    const DiskImage disk = DiskImage::gpt(workshop);
+    constexpr Task undo{Subject::PartitionMap, Operation::Undo};
+    const auto reference = test::wholeDisk(disk.path());
+    MapBench bench(workshop.path("saved"));
     disk.fill(512, 512, 0x11);
-    const fs::path saved = workshop.path("saved");
-    MapBench bench(saved);
+    const Bytes first = disk.bytes();
     bench.repairMap(disk.path());
+    const Bytes repaired = disk.bytes();
     disk.fill(512, 512, 0x22);
+    const Bytes second = disk.bytes();
+    bench.run(undo, reference);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorNotUndone) << "it was changed since";
+    EXPECT_TRUE(disk.bytes() == second);
     bench.repairMap(disk.path());
-    const auto count = std::distance(fs::directory_iterator(saved), fs::directory_iterator());
-    EXPECT_EQ(count, 2) << "a second repair does not overwrite what the first has kept";
-    for (const auto& entry : fs::recursive_directory_iterator(saved)) {
-        struct stat status = {};
-        ASSERT_EQ(::stat(entry.path().c_str(), &status), 0);
-        EXPECT_EQ(status.st_mode & 0077, 0U) << entry.path();
+    for (const Bytes& expected : {second, first}) {
+        bench.run(undo, reference);
+        EXPECT_TRUE(disk.bytes() == expected) << bench.listener.message;
+        disk.put(0, Bytes(repaired.begin(), repaired.begin() + 34 * 512));
     }
-    std::ifstream file(fs::directory_iterator(saved)->path() / "README.txt");
-    const std::string text(std::istreambuf_iterator<char>(file), {});
-    EXPECT_TRUE(test::contains(text, "bs=512 seek=1 conv=notrunc,fsync")) << text;
-    EXPECT_TRUE(test::contains(text, "it'\\''s $HOME")) << text;
-    EXPECT_FALSE(test::contains(text, "HOME\n")) << "a line end in a name forges no line";
+    bench.run(undo, reference);
+    EXPECT_EQ(bench.listener.error, contract::kPLErrorNothingToUndo);
 }
 
 TEST(PartitionMaps, ADiskThatIsInUseIsOnlyRead)

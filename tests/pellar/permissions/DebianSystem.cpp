@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "tests/pellar/permissions/DebianSystem.h"
 
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "pellar/packages/Digest.h"
+#include "pellar/bytes/Digest.h"
 
 #include <nettle/md5.h>
 #include <nettle/nettle-meta.h>

@@ -1,0 +1,242 @@
+// SPDX-License-Identifier: Apache-2.0
+// What the window does about repairs beyond the module's buttons.
+
+#include "tests/desktop/WindowFixture.h"
+
+#include "orvane/desktop/KeptRepairs.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QMenu>
+#include <QPushButton>
+
+#include <cstdlib>
+
+namespace orvane::desktop::test {
+namespace {
+
+using orvane::test::contentsOf;
+using pellar::Operation;
+
+TEST(UndoAvailability, SaysWhatIsMissing)
+{
+    constexpr std::string_view busy = "Not available while a job runs.";
+    constexpr std::string_view none = "No repair of this disk is kept.";
+    struct Case {
+        UndoSituation situation;
+        std::string_view undo;
+        std::string_view finish;
+        std::string_view because;
+    };
+    for (const Case& c : {
+             Case{{1, false, true, KeptRepair::Applied},
+                  "",
+                  "The last repair of this disk was not interrupted.",
+                  "a repair that came to its end"},
+             Case{{1, false, true, KeptRepair::Interrupted}, "", "", "either way leads out"},
+             Case{{1, false, true, KeptRepair::Unknown}, "", "", "only root knows"},
+             Case{{1, false, true, KeptRepair::None}, none, none, "never repaired"},
+             Case{{1, false, true, KeptRepair::InUse},
+                  "A program works on the last repair of this disk.",
+                  "A program works on the last repair of this disk.",
+                  "the terminal program is at it"},
+             Case{{1, true, true, KeptRepair::Interrupted}, busy, busy, "another job runs"},
+             Case{{0, false, false, KeptRepair::None},
+                  "Select a disk first.",
+                  "Select a disk first.",
+                  "nothing is selected"},
+             Case{{2, false, true, KeptRepair::Applied},
+                  "Select one disk alone.",
+                  "Select one disk alone.",
+                  "not several at once"},
+             Case{{1, false, false, KeptRepair::Applied},
+                  "Not available for this disk.",
+                  "Not available for this disk.",
+                  "an image that was not read yet"},
+         }) {
+        EXPECT_EQ(reasonAgainst(Operation::Undo, c.situation), c.undo) << c.because;
+        EXPECT_EQ(reasonAgainst(Operation::Finish, c.situation), c.finish) << c.because;
+    }
+}
+
+class RepairTest : public WindowFixture {
+protected:
+    /// A tool that finds damage, changes something in a repair, and leaves damage.
+    void useFailingTool()
+    {
+        const std::string tools = directory_.fakeTools("write-in-repair changed\nexit 4");
+        ::setenv("FIXWELL_TOOL_PATH", tools.c_str(), 1);
+    }
+    /// Why the command is grey in the open menu; empty when it is not.
+    std::string whyGrey(const char* name)
+    {
+        emit qobject_cast<QMenu*>(command(name).parent())->aboutToShow();
+        const std::string toolTip = fromQt(command(name).toolTip());
+        return command(name).isEnabled() ? std::string() : toolTip;
+    }
+    std::string details(const std::string& image)
+    {
+        return fromQt(row(image).data(DiskTreeModel::DetailsRole).toString());
+    }
+    /// Waits until the sheet is there, and gives this answer.
+    void answer(const char* sheetName, const char* title)
+    {
+        ASSERT_TRUE(waitUntil([&] {
+            return sheet() != nullptr && fromQt(sheet()->objectName()) == sheetName;
+        })) << sheetName;
+        const std::string byHabit = fromQt(sheet()->defaultButton()->text());
+        EXPECT_TRUE(byHabit == "Close" || byHabit == "Cancel") << byHabit;
+        EXPECT_EQ(sheet()->defaultButton(), sheet()->escapeButton());
+        const QPointer<QMessageBox> answered = sheet();
+        press(*answered, toQt(title));
+        ASSERT_TRUE(waitUntil([&] { return !answered || !answered->isVisible(); }));
+    }
+    bool isFree()
+    {
+        return waitUntil([&] {
+            return button("repairDiskButton").isEnabled() &&
+                   button("repairDiskButton").action() == "repairDisk:";
+        });
+    }
+};
+
+TEST_F(RepairTest, ARepairIsPreviewedDoneAndTakenBack)
+{
+    const std::string image = makeDamagedImage("damaged");
+    const std::string before = contentsOf(image);
+    open({image});
+    select(image);
+    EXPECT_NE(whyGrey("undoRepair").find("No repair of this disk is kept."), std::string::npos);
+
+    command("previewRepair").trigger();
+    ASSERT_TRUE(waitForJob());
+    EXPECT_EQ(verdict(image), "damaged");
+    EXPECT_TRUE(contentsOf(image) == before) << "a preview writes nothing";
+    takeSheet();
+    ASSERT_TRUE(isFree());
+    run("repairDiskButton");
+    EXPECT_EQ(verdict(image), "repaired") << "only that one job was a preview";
+    EXPECT_TRUE(logHolds("choose Undo Repair in the Disk menu"));
+    EXPECT_EQ(sheet(), nullptr) << takeSheet();
+    const std::string repaired = contentsOf(image);
+    ASSERT_FALSE(repaired == before);
+
+    ASSERT_TRUE(isFree());
+    EXPECT_TRUE(waitUntil([&] { return whyGrey("undoRepair").empty(); }));
+    EXPECT_NE(whyGrey("finishRepair"), "");
+    command("undoRepair").trigger();
+    EXPECT_TRUE(sheet()->informativeText().contains(QStringLiteral(" bytes in ")));
+    answer("undoQuestion", "Undo Repair");
+    QCoreApplication::sendPostedEvents(&window());
+    EXPECT_EQ(verdict(image), "undoing…");
+    EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "no other job begins meanwhile";
+    EXPECT_NE(whyGrey("undoRepair").find("while a job runs"), std::string::npos);
+    EXPECT_TRUE(window().findChild<QPushButton*>(QStringLiteral("stopButton"))->isVisible());
+    window().close();
+    EXPECT_TRUE(window().isVisible()) << "it asks first";
+    ASSERT_TRUE(isFree());
+    EXPECT_FALSE(window().findChild<QPushButton*>(QStringLiteral("stopButton"))->isVisible());
+    EXPECT_TRUE(waitUntil([&] { return sheet() == nullptr; })) << "there is nothing left to ask";
+    EXPECT_EQ(verdict(image), "undone");
+    EXPECT_TRUE(contentsOf(image) == before) << "it is as it was, to the byte";
+    EXPECT_TRUE(logHolds("undid the repair of “damaged”")) << testing::PrintToString(logRows());
+    EXPECT_NE(whyGrey("undoRepair"), "") << "what was put back is not kept any longer";
+}
+
+TEST_F(RepairTest, TheRepairOfAMapIsTakenBack)
+{
+    const std::string image = makePartitionedImage("partitioned");
+    orvane::test::patch(image, 0, std::string(1024, '\0'));
+    const std::string before = contentsOf(image);
+    open({image});
+    select(image);
+    command("repairMap").trigger();
+    ASSERT_TRUE(waitForJob());
+    ASSERT_TRUE(waitUntil([&] { return whyGrey("undoRepair").empty(); })) << whyGrey("undoRepair");
+    EXPECT_FALSE(contentsOf(image) == before);
+    command("undoRepair").trigger();
+    answer("undoQuestion", "Undo Repair");
+    EXPECT_TRUE(waitUntil([&] { return contentsOf(image) == before; }));
+    ASSERT_TRUE(isFree());
+}
+
+TEST_F(RepairTest, WhatIsNotProvenIsAppliedOnlyWhereTheUserSaysSoTwice)
+{
+    const std::string image = makeImage("image");
+    const std::string before = contentsOf(image);
+    useFailingTool();
+    open({image});
+    run("repairDiskButton", image);
+    answer("unprovenQuestion", "Close");
+    EXPECT_EQ(sheet(), nullptr) << "said once, not by the module as well: " << takeSheet();
+    run("repairDiskButton");
+    answer("unprovenQuestion", "Apply Anyway…");
+    answer("unprovenConfirmation", "Cancel");
+    EXPECT_TRUE(contentsOf(image) == before);
+    run("repairDiskButton");
+    answer("unprovenQuestion", "Apply Anyway…");
+    answer("unprovenConfirmation", "Apply Repair");
+    ASSERT_TRUE(waitUntil([&] { return contentsOf(image).starts_with("changed"); }));
+    ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; })) << "damage is left";
+    takeSheet();
+    ASSERT_TRUE(waitUntil([&] { return whyGrey("undoRepair").empty(); }));
+    command("undoRepair").trigger();
+    answer("undoQuestion", "Undo Repair");
+    ASSERT_TRUE(waitUntil([&] { return verdict(image) == "undone"; }));
+    ASSERT_TRUE(isFree());
+    run("repairDiskButton");
+    answer("unprovenQuestion", "Close");
+    EXPECT_TRUE(contentsOf(image) == before) << "that was for one repair";
+}
+
+TEST_F(RepairTest, WhatCannotBeTriedIsRepairedDirectlyOnlyWhereTheUserSaysSo)
+{
+    const std::string image = makeImage("image");
+    const std::string before = contentsOf(image);
+    useFailingTool();
+    directory_.write("state/repairs", "no directory");
+    open({image});
+    run("repairDiskButton", image);
+    answer("untriedQuestion", "Repair Directly…");
+    EXPECT_TRUE(contentsOf(image) == before);
+    answer("directConfirmation", "Repair Directly");
+    EXPECT_TRUE(waitUntil([&] { return contentsOf(image).starts_with("changed"); }));
+    ASSERT_TRUE(isFree());
+}
+
+TEST_F(RepairTest, AnInterruptedRepairIsPointedOutAndLeadsBothWays)
+{
+    for (const bool isUndo : {true, false}) {
+        const std::string image = makeImage(isUndo ? "undone" : "finished");
+        const std::string before = contentsOf(image);
+        interruptRepair(image);
+        open({image});
+        EXPECT_EQ(details(image), "repair interrupted");
+        run("repairDiskButton", image);
+        answer("interruptedQuestion", isUndo ? "Undo Repair…" : "Finish Repair…");
+        answer("undoQuestion", isUndo ? "Undo Repair" : "Finish Repair");
+        ASSERT_TRUE(waitUntil([&] { return verdict(image) == (isUndo ? "undone" : "repaired"); }));
+        EXPECT_EQ(contentsOf(image) == before, isUndo);
+        EXPECT_TRUE(isUndo || contentsOf(image) == contentsOf(directory_ / "repaired"));
+        EXPECT_TRUE(waitUntil([&] { return details(image) != "repair interrupted"; }));
+        ASSERT_TRUE(isFree());
+        EXPECT_EQ(sheet(), nullptr) << takeSheet();
+        close();
+    }
+}
+
+TEST_F(RepairTest, VerifyingThoroughlyIsKeptAndTriesARepair)
+{
+    const std::string image = openImage("sound");
+    run("verifyDiskButton");
+    EXPECT_FALSE(logHolds("Trying a repair"));
+    command("verifyThoroughly").trigger();
+    close();
+    open({image});
+    run("verifyDiskButton", image);
+    command("showDetails").trigger();
+    EXPECT_TRUE(logHolds("Trying a repair")) << testing::PrintToString(logRows());
+    EXPECT_EQ(verdict(image), "sound");
+}
+
+}  // namespace
+}  // namespace orvane::desktop::test

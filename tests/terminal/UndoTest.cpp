@@ -1,0 +1,267 @@
+// SPDX-License-Identifier: Apache-2.0
+// Repairs that are tried, taken back and finished.
+
+#include "orvane/jobs/RepairRecords.h"
+#include "pellar/undo/UndoStore.h"
+#include "tests/support/LoopDevice.h"
+#include "tests/terminal/ProgramTest.h"
+
+#include <fcntl.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace orvane::test {
+namespace {
+
+class UndoTest : public ProgramTest {
+protected:
+    /// The records of the repairs that can be undone, as the disk's history tells them.
+    std::vector<std::string> undoable(const std::string& image) const
+    {
+        std::vector<std::string> verdicts;
+        for (const auto& one : Events(run({"history", "--json", image}).output).named("run"))
+            if (one["record"].is_string())
+                verdicts.push_back(one["verdict"]);
+        return verdicts;
+    }
+    bool isInterrupted(const std::string& image) const
+    {
+        const bool isSaid = run({"list", image}).output.find("repair interrupted: finish or undo") !=
+                            std::string::npos;
+        const auto disk = Events(run({"list", "--json", image}).output).named("disk").front();
+        EXPECT_EQ(disk["interruptedRepair"].is_string(), isSaid);
+        return isSaid;
+    }
+    /// The image is half of what it was and half of what `repaired` holds, as a power cut leaves it.
+    void interruptRepair(const std::filesystem::path& image,
+                         const std::filesystem::path& repaired) const
+    {
+        const pid_t child = ::fork();
+        if (child == 0)
+            ::_exit(writeHalf(image, repaired));
+        int status = -1;
+        ::waitpid(child, &status, 0);
+        ASSERT_EQ(status, 0);
+    }
+    /// Has the whole file as its volume, which this tool says is damaged, and writes to it.
+    void useToolThatFails()
+    {
+        const auto tool = path("tools/e2fsck");
+        write(tool,
+              "#!/bin/sh\ncase \"$*\" in *-n*) ;; *) for disk; do :; done\n"
+              "printf damaged | dd of=\"$disk\" bs=1 seek=4096 conv=notrunc status=none;; esac\n"
+              "echo 'x: ********** WARNING: Filesystem still has errors **********'\nexit 4\n");
+        std::filesystem::permissions(tool, std::filesystem::perms::owner_all);
+        environment_["FIXWELL_TOOL_PATH"] = tool.parent_path();
+    }
+
+private:
+    int writeHalf(const std::filesystem::path& image, const std::filesystem::path& repaired) const
+    {
+        const FileDescriptor disk(::open(image.c_str(), O_RDWR));
+        const FileDescriptor other(::open(repaired.c_str(), O_RDONLY));
+        const auto bytes = std::filesystem::file_size(image);
+        pellar::FileRegion before(disk.get(), 0, bytes);
+        pellar::FileRegion after(other.get(), 0, bytes);
+        const auto store = pellar::UndoStore::open(path("state/orvane/repairs/records"));
+        auto record = store->save({{image, 0, bytes, "", "ext4", "image"},
+                                   {pellar::Subject::Filesystem, pellar::Operation::Repair},
+                                   ::geteuid(),
+                                   std::chrono::system_clock::now()},
+                                  {{0, bytes}}, before, after);
+        pellar::UndoWork work;
+        work.progress = [&disk, bytes](std::uint64_t, std::uint64_t) {
+            char half = 0;
+            if (::pread(disk.get(), &half, 1, static_cast<off_t>(bytes / 2)) == 1 && half != 0)
+                ::_exit(0);
+        };
+        return record && record->apply(before, work) ? 1 : 2;
+    }
+};
+
+TEST_F(UndoTest, APreviewSaysWhatARepairWouldDoAndWritesNothing)
+{
+    const auto image = makeDamagedVolume("a");
+    const std::string before = contentsOf(image);
+    const RunResult preview = run({"repair", "--preview", "--keep", "kept", "a"});
+    EXPECT_EQ(preview.status, 4);
+    EXPECT_NE(preview.output.find("would make it sound; nothing was written"), std::string::npos)
+        << preview.output;
+    EXPECT_TRUE(contentsOf(image) == before);
+    EXPECT_EQ(runTool({"e2fsck", "-fn", path("kept")}).status, 0) << "the repaired volume";
+    EXPECT_TRUE(undoable("a").empty());
+
+    const std::string kept = contentsOf(path("kept"));
+    const RunResult again = run({"repair", "--preview", "--keep", "kept", "a"});
+    EXPECT_EQ(again.status, 8);
+    EXPECT_NE(again.errors.find("is there already"), std::string::npos) << again.errors;
+    EXPECT_TRUE(contentsOf(path("kept")) == kept);
+    EXPECT_EQ(again.output, "") << "refused before anything begins";
+}
+
+TEST_F(UndoTest, AnUndoneRepairLeavesEveryByteAsItWas)
+{
+    const auto image = makeDamagedVolume("it's a");
+    const std::string before = contentsOf(image);
+    const RunResult repaired = run({"repair", "it's a"});
+    EXPECT_EQ(repaired.status, 1);
+    EXPECT_NE(repaired.output.find("To take the repair back: fixwell undo 'it'\\''s a'\n"),
+              std::string::npos)
+        << repaired.output;
+    EXPECT_FALSE(contentsOf(image) == before);
+    EXPECT_EQ(undoable("it's a"), std::vector<std::string>{"repaired"});
+
+    const RunResult undone = run({"undo", "--json", "it's a"});
+    EXPECT_EQ(undone.status, 0) << undone.output;
+    EXPECT_EQ(Events(undone.output).story({"started", "finished"}),
+              (std::vector<std::string>{"started it's a", "finished it's a undone"}));
+    EXPECT_TRUE(contentsOf(image) == before);
+    EXPECT_TRUE(undoable("it's a").empty());
+    EXPECT_EQ(Events(run({"list", "--json", "it's a"}).output).named("disk").front()["verdict"],
+              "undone")
+        << "it is no longer repaired";
+
+    environment_["LANGUAGE"] = "de";
+    const RunResult nothing = run({"undo", "it's a"});
+    EXPECT_EQ(nothing.status, 8);
+    EXPECT_NE(nothing.output.find("von einer Reparatur ist nichts aufgehoben"), std::string::npos)
+        << nothing.output;
+    EXPECT_EQ(run({"undo", "none"}).status, 8);
+}
+
+TEST_F(UndoTest, WhatWasChangedSinceStaysAsItIs)
+{
+    const auto image = makeDamagedVolume("a");
+    ASSERT_EQ(run({"repair", "a"}).status, 1);
+    change(image, "mkdir later");
+    const std::string changed = contentsOf(image);
+    const RunResult undone = run({"undo", "a"});
+    EXPECT_EQ(undone.status, 8);
+    EXPECT_NE(undone.output.find("the disk was changed since"), std::string::npos) << undone.output;
+    EXPECT_TRUE(contentsOf(image) == changed);
+}
+
+TEST_F(UndoTest, ARepairThatLeavesDamageIsAppliedOnDemandOnly)
+{
+    const auto image = makeVolume("a");
+    useToolThatFails();
+    const std::string before = contentsOf(image);
+    const RunResult repaired = run({"repair", "a"});
+    EXPECT_EQ(repaired.status, 4) << repaired.output;
+    EXPECT_NE(repaired.output.find("fixwell repair --apply-unproven a\n"), std::string::npos)
+        << repaired.output;
+    EXPECT_TRUE(contentsOf(image) == before);
+
+    EXPECT_EQ(run({"repair", "--apply-unproven", "a"}).status, 4);
+    EXPECT_EQ(contentsOf(image).substr(4096, 7), "damaged");
+    EXPECT_EQ(undoable("a"), std::vector<std::string>{"damaged"});
+    EXPECT_EQ(run({"undo", "a"}).status, 0);
+    EXPECT_TRUE(contentsOf(image) == before);
+
+    static_cast<void>(run({"repair", "--apply-unproven", "--no-undo", "a"}));
+    EXPECT_TRUE(undoable("a").empty());
+    EXPECT_EQ(contentsOf(image).substr(4096, 7), "damaged");
+}
+
+TEST_F(UndoTest, AnInterruptedRepairIsPointedOutAndFinishedOrUndone)
+{
+    const auto image = makeVolume("a");
+    const std::string before = contentsOf(image);
+    write(path("repaired"), std::string(before).replace(mebibyte, 6 * mebibyte, 6 * mebibyte, 'r'));
+    for (const std::string command : {"finish", "undo"}) {
+        write(image, before);
+        interruptRepair(image, path("repaired"));
+        EXPECT_TRUE(isInterrupted("a"));
+        const std::string half = contentsOf(image);
+        EXPECT_EQ(run({"repair", "a"}).status, 8);
+        EXPECT_TRUE(contentsOf(image) == half) << "nothing is built on it";
+        EXPECT_EQ(run({command, "a"}).status, 0);
+        EXPECT_TRUE(contentsOf(image) ==
+                    (command == "undo" ? before : contentsOf(path("repaired"))));
+        EXPECT_FALSE(isInterrupted("a"));
+    }
+}
+
+TEST_F(UndoTest, ADeviceIsTreatedAsAnImageIs)
+{
+    if (const char* const obstacle = LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const auto image = makeDamagedVolume("a");
+    const std::string before = contentsOf(image);
+    const LoopDevice device(image.native());
+    EXPECT_EQ(run({"repair", "--preview", device.name()}).status, 4);
+    EXPECT_EQ(run({"repair", device.name()}).status, 1);
+    EXPECT_EQ(undoable(device.name()), std::vector<std::string>{"repaired"});
+    EXPECT_EQ(run({"undo", device.name()}).status, 0);
+    EXPECT_TRUE(contentsOf(device.name()) == before);
+}
+
+TEST_F(UndoTest, OfSeveralVolumesTheOneThatIsNamedIsUndone)
+{
+    makeDisk("disk.img", {makeDamagedVolume("first"), makeDamagedVolume("second")});
+    const std::string before = contentsOf(path("disk.img"));
+    ASSERT_EQ(run({"repair", "disk.img"}).status, 1);
+    const RunResult unclear = run({"undo", "disk.img"});
+    EXPECT_EQ(unclear.status, 8);
+    EXPECT_NE(unclear.errors.find("name one: disk.img#1, disk.img#2"), std::string::npos)
+        << unclear.errors;
+    EXPECT_EQ(run({"undo", "disk.img#3"}).status, 8);
+    EXPECT_EQ(run({"undo", "disk.img#2"}).status, 0);
+    EXPECT_TRUE(contentsOf(path("disk.img")).substr(9 * mebibyte) == before.substr(9 * mebibyte));
+    EXPECT_FALSE(contentsOf(path("disk.img")) == before);
+    EXPECT_EQ(run({"undo", "disk.img"}).status, 0) << "one is left";
+    EXPECT_TRUE(contentsOf(path("disk.img")) == before);
+}
+
+TEST_F(UndoTest, ARepairedMapIsUndone)
+{
+    const auto disk = makeDisk("disk.img", {makeVolume("volume")});
+    patch(disk, 512, std::string(512, '\0'));
+    const std::string before = contentsOf(disk);
+    ASSERT_EQ(run({"repair", "--preview", "--partition-map", "disk.img"}).status, 4);
+    EXPECT_TRUE(contentsOf(disk) == before);
+    const RunResult repaired = run({"repair", "--partition-map", "disk.img"});
+    ASSERT_EQ(repaired.status, 1);
+    EXPECT_NE(repaired.output.find("fixwell undo --partition-map disk.img"), std::string::npos)
+        << repaired.output;
+    EXPECT_EQ(run({"undo", "disk.img"}).status, 8) << "of its volume nothing is kept";
+    EXPECT_EQ(run({"undo", "--partition-map", "disk.img"}).status, 0);
+    EXPECT_TRUE(contentsOf(disk) == before);
+}
+
+TEST(RepairRecords, ARecordBelongsToTheRunThatWrote)
+{
+    using std::chrono::milliseconds;
+    const orvane::Run::Time time{std::chrono::seconds(1000)};
+    const pellar::RecordedRepair repair{
+        {}, {pellar::Subject::Filesystem, pellar::Operation::Repair}, 0, time};
+    const auto run = [time](const char* action, int begins, int ends, const char* verdict) {
+        const std::optional<RunEnd> end =
+            *verdict != '\0' ? std::optional(RunEnd{verdict, 0, ""}) : std::nullopt;
+        return orvane::Run{action, time + milliseconds(begins),
+                   end ? std::optional(time + milliseconds(ends)) : std::nullopt, end};
+    };
+    struct Case {
+        std::vector<orvane::Run> runs;
+        int written;  ///< -1: none of them
+        std::string_view because;
+    };
+    for (const Case& c :
+         {Case{{run("repair", -5000, 5000, "repaired")}, 0, "the time lies in it"},
+          Case{{run("repair", 700, 5000, "repaired")}, 0, "times of records are whole seconds"},
+          Case{{run("verify", -5000, 5000, "sound")}, -1, "writes nothing"},
+          Case{{run("repair", -9000, -5000, "repaired")}, -1, "over before"},
+          Case{{run("repair", 1000, 5000, "repaired")}, -1, "begun after"},
+          Case{{run("repair", -5000, 0, "")}, 0, "cut off"},
+          Case{{run("repair", -5000, 0, ""), run("repair", 800, 900, "failed")}, 0, "refused"},
+          Case{{run("repair", 100, 200, "damaged"), run("repair", 300, 400, "repaired")}, 1,
+               "after a preview"},
+          Case{{run("repair", 100, 200, "repaired"), run("repair", 300, 400, "sound")}, 0,
+               "before another look"}}) {
+        const orvane::Run* const found = runOf(repair, c.runs);
+        EXPECT_EQ(found == nullptr ? -1 : found - c.runs.data(), c.written) << c.because;
+    }
+}
+
+}  // namespace
+}  // namespace orvane::test
