@@ -10,9 +10,10 @@
 namespace pellar {
 namespace {
 
+/// What was damaged before and is sound behind it was changed, whatever the tool says.
 bool hasChanged(const RepairPass& pass)
 {
-    return pass.judgement.madeProgress || pass.replayedJournal;
+    return pass.judgement.madeProgress || pass.replayedJournal || pass.foundProblems;
 }
 
 /// Nothing was wrong but that the journal's changes were not in their place.

@@ -119,7 +119,7 @@ int PermissionRecord::add(const std::vector<RecordedChange>& changes)
         error = sync();
     if (error != 0) {
         length_ = before;
-        static_cast<void>(::ftruncate(file_.get(), static_cast<off_t>(before)));
+        static_cast<void>(!::ftruncate(file_.get(), static_cast<off_t>(before)));
         return error;
     }
     changes_.insert(changes_.end(), changes.begin(), changes.end());

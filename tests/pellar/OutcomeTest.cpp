@@ -42,10 +42,12 @@ TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
     const RepairPass replayed{sound(), true, false};
     const RepairPass some{damaged(true), false, true};
     const RepairPass all{corrected(), false, true};
+    const RepairPass silent{sound(), false, true};  // btrfs does not say what it has changed
     for (const Case& c :
          {Case{{nothing}, sound(), Verdict::Sound}, Case{{all}, sound(), Verdict::Repaired},
           Case{{replayed}, sound(), Verdict::Repaired}, Case{{all}, damaged(), Verdict::Damaged},
           Case{{some, all}, sound(), Verdict::Repaired},
+          Case{{silent}, sound(), Verdict::Repaired},
           Case{{{killed(), false, false}}, damaged(), Verdict::Damaged}}) {
         const Outcome outcome = outcomeOfRepair(c.passes, c.confirmation);
         EXPECT_EQ(outcome.verdict, c.verdict);

@@ -175,7 +175,7 @@ std::vector<std::string> logArguments(const std::vector<std::uint64_t>& parts,
 }
 
 // It ends with 0 where a copy of what is damaged was still good, and where a whole disk is missing;
-// only its words tell.
+// only its words tell. A repair ends with 0 when it has come to its end.
 Judgement judge(const RunEvidence& evidence)
 {
     const Findings& found = evidence.findings;
@@ -184,7 +184,9 @@ Judgement judge(const RunEvidence& evidence)
     if (found.expectsDifference && found.isComplete && !hasDamage(evidence) &&
         evidence.result.ending == Ending(Exited{1}))
         weighed.result.ending = Exited{0};
-    return judgeRun(weighed, {name, damagedStatuses});
+    return judgeRun(weighed, {name, damagedStatuses, [](int status, const Findings&) {
+                                  return status == 0;
+                              }});
 }
 
 }  // namespace
