@@ -178,8 +178,7 @@ Outcome PartitionMapScript::preview(const MapClaim& claim, const RepairPlan& pla
                                     const Outcome& planned)
 {
     const std::vector<ByteRange> ranges = rangesOf(plan, claim.sectors().sectorBytes());
-    log_.remark(Sentence{"The repair would change %1$@ bytes in %2$@ places.",
-                         std::to_string(lengthOf(ranges)), std::to_string(ranges.size())});
+    log_.remark(changesOf(ranges));
     if (planned.verdict != Verdict::Repaired)
         return outcomeOfRefusedRepair(
             {"a repair was tried, and would leave damage; nothing was written", {}, {}});

@@ -15,6 +15,13 @@ namespace {
 /// Where the share of this in the job's progress begins, in per cent.
 constexpr double writingBegins = 85;
 
+std::uint64_t lengthOf(const std::vector<ByteRange>& ranges)
+{
+    return std::accumulate(
+        ranges.begin(), ranges.end(), std::uint64_t{0},
+        [](std::uint64_t sum, const ByteRange& range) { return sum + range.length; });
+}
+
 }  // namespace
 
 RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
@@ -26,11 +33,11 @@ RecordedDisk recordedDisk(const contract::DiskReference& reference, int descript
             readSuperblock(descriptor, region).uuid, reference.filesystem, reference.name};
 }
 
-std::uint64_t lengthOf(const std::vector<ByteRange>& ranges)
+Sentence changesOf(const std::vector<ByteRange>& ranges)
 {
-    return std::accumulate(
-        ranges.begin(), ranges.end(), std::uint64_t{0},
-        [](std::uint64_t sum, const ByteRange& range) { return sum + range.length; });
+    return sentenceAbout(ranges.size(), "The repair would change %1$@ place (%2$@ bytes).",
+                         "The repair would change %1$@ places (%2$@ bytes).",
+                         std::to_string(lengthOf(ranges)));
 }
 
 UndoWork workOf(JobContext& context)
@@ -50,8 +57,11 @@ std::optional<Outcome> RecordedWriting::write(const std::vector<ByteRange>& rang
     if (!store)
         return notWritten(store.error());
     log.meter().setRange(writingBegins, 100);
-    log.step(Operation::Repair, {"Keeping what the repair overwrites (%1$@ bytes in %2$@ places)",
-                                 std::to_string(lengthOf(ranges)), std::to_string(ranges.size())});
+    log.step(
+        Operation::Repair,
+        sentenceAbout(ranges.size(), "Keeping what the repair overwrites: %1$@ place (%2$@ bytes)",
+                      "Keeping what the repair overwrites: %1$@ places (%2$@ bytes)",
+                      std::to_string(lengthOf(ranges))));
     auto record = store->save(repair_, ranges, disk, after, workOf(context_));
     if (!record)
         return notWritten(record.error());

@@ -14,8 +14,8 @@ namespace pellar {
 [[nodiscard]] RecordedDisk recordedDisk(const contract::DiskReference& reference, int descriptor,
                                         ByteRange region);
 
-/// "1234 bytes in 5 places": how much that is.
-[[nodiscard]] std::uint64_t lengthOf(const std::vector<ByteRange>& ranges);
+/// How many places the repair would change, and how many bytes that are.
+[[nodiscard]] Sentence changesOf(const std::vector<ByteRange>& ranges);
 
 /// How a job takes part in work on a record: it stops it, and tells how far it has come.
 [[nodiscard]] UndoWork workOf(JobContext& context);

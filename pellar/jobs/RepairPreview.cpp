@@ -97,8 +97,7 @@ Outcome RepairPreview::tell(const Outcome& tried, const FileCounts& counts)
 void RepairPreview::tellChanges(const std::vector<ByteRange>& ranges, const Outcome& tried,
                                 const FileCounts& counts)
 {
-    log_.remark(Sentence{"The repair would change %1$@ bytes in %2$@ places.",
-                         std::to_string(lengthOf(ranges)), std::to_string(ranges.size())});
+    log_.remark(changesOf(ranges));
     if (counts.before && counts.after)
         log_.remark(Sentence{"The volume has %1$@ files, and would have %2$@ after the repair.",
                              std::to_string(*counts.before), std::to_string(*counts.after)});

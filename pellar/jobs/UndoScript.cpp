@@ -92,10 +92,14 @@ UndoScript::Failure UndoScript::objectionTo(const ListedRecord* record) const
 
 UndoScript::Failure UndoScript::work(UndoRecord& record, Region& region)
 {
-    log_.step(request_.task.operation, {isUndo() ? "Putting back %1$@ bytes in %2$@ places"
-                                                 : "Writing %1$@ bytes in %2$@ places once more",
-                                        std::to_string(record.facts().changedBytes),
-                                        std::to_string(record.facts().rangeCount)});
+    const RecordFacts& facts = record.facts();
+    const std::string bytes = std::to_string(facts.changedBytes);
+    log_.step(request_.task.operation,
+              isUndo()
+                  ? sentenceAbout(facts.rangeCount, "Putting back %1$@ place (%2$@ bytes)",
+                                  "Putting back %1$@ places (%2$@ bytes)", bytes)
+                  : sentenceAbout(facts.rangeCount, "Writing %1$@ place (%2$@ bytes) once more",
+                                  "Writing %1$@ places (%2$@ bytes) once more", bytes));
     log_.flush();
     const UndoWork work = workOf(context_);
     const auto done = isUndo() ? record.undo(region, work) : record.finish(region, work);
