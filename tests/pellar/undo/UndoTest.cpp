@@ -8,8 +8,6 @@
 #include <signal.h>
 #include <sys/resource.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <optional>
 
@@ -228,99 +226,24 @@ TEST(UndoPowerCut, WhileRecoveringFromACut)
     EXPECT_GE(recovered, 2);
 }
 
-/// Runs `work` in a process that ends itself with SIGKILL at the nth event; NO when it has less.
-bool killedAt(int event, const std::function<void(const std::function<void()>&)>& work)
-{
-    const pid_t child = ::fork();
-    if (child == 0) {
-        int left = event;
-        work([&left] {
-            if (--left == 0)
-                ::raise(SIGKILL);
-        });
-        ::_exit(0);
-    }
-    int status = 0;
-    ::waitpid(child, &status, 0);
-    return WIFSIGNALED(status);
-}
-
-/// Tells what happens, also in the middle of a write.
-class WatchedRegion final : public Region {
-public:
-    WatchedRegion(int descriptor, std::uint64_t length, const std::function<void()>& happens)
-        : file_(descriptor, 0, length), happens_(happens)
-    {
-    }
-    std::uint64_t length() const override { return file_.length(); }
-    int read(std::uint64_t place, std::span<std::uint8_t> bytes) override
-    {
-        return file_.read(place, bytes);
-    }
-    int write(std::uint64_t place, ByteView bytes) override
-    {
-        if (const int error = file_.write(place, bytes.first(bytes.size() / 3)))
-            return error;
-        happens_();
-        return file_.write(place, bytes);
-    }
-    int sync() override { return file_.sync(); }
-    void forgetCached() override { file_.forgetCached(); }
-
-private:
-    FileRegion file_;
-    const std::function<void()>& happens_;
-};
-
-// Ranges larger than the pieces in which they are dealt with, on real files.
-TEST(UndoKill, AtAnyPointLeavesAWayBackAndForth)
+// They are dealt with in pieces, of which one boundary lies in each large range.
+TEST(UndoRecord, LargeRangesOfAFileAreWrittenAndPutBack)
 {
     constexpr std::size_t size = 7 << 20;
     const std::vector<ByteRange> large{{100, 2'500'000}, {3'000'001, 1}, {3'500'000, 3'000'000}};
     const std::string before = oldDisk(size);
     const std::string after = repaired(before, large);
-    int kills = 0;
-    int interruptions = 0;
-    for (int event = 1;; ++event) {
-        TestDirectory directory;
-        orvane::test::write(directory / "disk", before);
-        const FileDescriptor file(::open((directory / "disk").c_str(), O_RDWR | O_CLOEXEC));
-        const bool isKilled = killedAt(event, [&](const std::function<void()>& happens) {
-            const auto sync = [&](int) {
-                happens();
-                return 0;
-            };
-            const auto store = UndoStore::open(directory / "store", sync);
-            WatchedRegion disk(file.get(), size, happens);
-            CachedDisk view(after);
-            UndoWork work;
-            work.progress = [&](std::uint64_t, std::uint64_t) {
-                happens();
-            };
-            auto record = store->save(repairOf(size), large, disk, view, work);
-            (void)record->apply(disk, work);
-        });
-        const auto store = UndoStore::open(directory / "store", noSync);
-        FileRegion disk(file.get(), 0, size);
-        const RecordList list = store->list();
-        EXPECT_TRUE(list.broken.empty());
-        if (list.records.empty()) {
-            EXPECT_EQ(contentsOf(directory / "disk") == before, true);
-            EXPECT_TRUE(isKilled && fs::is_empty(directory / "store"));
-        } else {
-            interruptions += list.records[0].isInterrupted() ? 1 : 0;
-            auto record = store->take(list.records[0].id);
-            ASSERT_TRUE(record);
-            const bool isFinished = event % 2 == 0 && list.records[0].isInterrupted();
-            EXPECT_TRUE(isFinished ? record->finish(disk) : record->undo(disk));
-            EXPECT_EQ(contentsOf(directory / "disk") == (isFinished ? after : before), true);
-        }
-        if (!isKilled)
-            break;
-        ++kills;
-    }
-    EXPECT_GE(kills, 40);
-    EXPECT_GE(interruptions, 15);
+    World world;
+    const fs::path name = world.directory / "disk";
+    orvane::test::write(name, "beside" + before + "beside");
+    const FileDescriptor file(::open(name.c_str(), O_RDWR | O_CLOEXEC));
+    FileRegion disk(file.get(), 6, size);
+    CachedDisk view(after);
+    auto record = world.store->save(repairOf(size), large, disk, view);
+    EXPECT_TRUE(record->apply(disk));
+    EXPECT_TRUE(contentsOf(name) == "beside" + after + "beside");
+    EXPECT_TRUE(record->undo(disk));
+    EXPECT_TRUE(contentsOf(name) == "beside" + before + "beside");
 }
 
 TEST(UndoRecord, ADiskThatDoesNotTakeTheRepairIsPutBack)
