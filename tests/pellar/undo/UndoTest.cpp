@@ -55,30 +55,21 @@ RecordedRepair repairOf(std::uint64_t length = 6192)
 
 /// A store, and a disk of which the repaired view is another.
 struct World {
-    explicit World(SyncFunction sync = noSync) : disk(oldDisk()), view(repaired(oldDisk()))
-    {
-        open(std::move(sync));
-    }
-    World(const Remains& remains, SyncFunction sync) : disk(remains.disk), view("")
+    explicit World(const Remains& remains = {{}, oldDisk()})
+        : disk(remains.disk), view(repaired(oldDisk()))
     {
         putStore(remains, storePath());
-        open(std::move(sync));
+        open(noSync);
     }
 
     fs::path storePath() const { return directory / "store"; }
     void open(SyncFunction sync)
     {
-        auto opened = UndoStore::open(storePath(), std::move(sync));
-        if (!opened)
-            throw std::runtime_error(opened.error().first);
-        store = std::move(*opened);
+        store = *UndoStore::open(storePath(), std::move(sync));
     }
     UndoRecord save()
     {
-        auto saved = store->save(repairOf(), ranges, disk, view);
-        if (!saved)
-            throw std::runtime_error(std::string(saved.error().key));
-        return std::move(*saved);
+        return *store->save(repairOf(), ranges, disk, view);
     }
     std::string apply()
     {
@@ -109,7 +100,7 @@ enum class Way { Undo, Finish };
 /// Brings a disk to one end from whatever a cut left; says what is not as it should be.
 std::string faultAfter(const Remains& remains, Way way)
 {
-    World world(remains, noSync);
+    World world(remains);
     const RecordList list = world.store->list();
     if (!list.broken.empty() || list.records.size() > 1)
         return "a record is broken";
@@ -141,9 +132,7 @@ std::string faultAfter(const Remains& remains, Way way)
 /// Works in a world of which every moment is kept; answers what a cut could leave.
 std::vector<Remains> everyCut(const Remains& from, const std::function<void(World&)>& work)
 {
-    World world(from, noSync);
-    if (from.store.empty())
-        world.view = CachedDisk(repaired(oldDisk()));
+    World world(from);
     PowerCuts cuts(world.storePath(), world.disk);
     world.open(cuts.syncFunction());
     work(world);
@@ -165,14 +154,11 @@ void expectRecovery(const std::vector<Remains>& remains, std::size_t atLeast)
         ADD_FAILURE() << fault << ", " << count << " times of " << 2 * remains.size();
 }
 
-Remains untouched()
-{
-    return {{}, oldDisk()};
-}
+const Remains untouched{{}, oldDisk()};
 
 TEST(UndoPowerCut, WhileApplying)
 {
-    const auto cuts = everyCut(untouched(), [](World& world) { world.apply(); });
+    const auto cuts = everyCut(untouched, [](World& world) { world.apply(); });
     expectRecovery(cuts, 200);
     // What was told to be done is there, whatever was not synced is lost.
     const Remains& last = *(cuts.end() - 10);
@@ -182,7 +168,7 @@ TEST(UndoPowerCut, WhileApplying)
 
 TEST(UndoPowerCut, WhilePuttingBack)
 {
-    expectRecovery(everyCut(untouched(),
+    expectRecovery(everyCut(untouched,
                             [](World& world) {
                                 UndoRecord record = world.save();
                                 world.disk.failingWrites = {3};
@@ -193,7 +179,7 @@ TEST(UndoPowerCut, WhilePuttingBack)
 
 TEST(UndoPowerCut, WhileUndoing)
 {
-    Remains applied = everyCut(untouched(), [](World& world) { world.apply(); }).back();
+    Remains applied = everyCut(untouched, [](World& world) { world.apply(); }).back();
     const auto cuts = everyCut(applied, [](World& world) {
         auto record = world.store->take(world.store->list().records.at(0).id);
         ASSERT_TRUE(record);
@@ -205,7 +191,7 @@ TEST(UndoPowerCut, WhileUndoing)
 
 TEST(UndoPowerCut, WhileRecoveringFromACut)
 {
-    const auto cuts = everyCut(untouched(), [](World& world) { world.apply(); });
+    const auto cuts = everyCut(untouched, [](World& world) { world.apply(); });
     int recovered = 0;
     for (std::size_t i = 3; i < cuts.size(); i += 10) {
         const bool isMixed = cuts[i].disk != oldDisk() && cuts[i].disk != repaired(oldDisk());
@@ -378,38 +364,32 @@ TEST(UndoRecord, StopsOnlyBeforeTheFirstWrite)
 // RLIMIT_FSIZE fails a write in its middle, as a full file system does.
 TEST(UndoStore, WithoutRoomNothingIsTouched)
 {
-    struct FileSizeLimit {
-        explicit FileSizeLimit(rlim_t bytes)
-        {
-            ::getrlimit(RLIMIT_FSIZE, &old);
-            const rlimit limit{bytes, old.rlim_max};
-            ::setrlimit(RLIMIT_FSIZE, &limit);
-        }
-        ~FileSizeLimit() { ::setrlimit(RLIMIT_FSIZE, &old); }
-        rlimit old{};
+    const auto limitFiles = [](rlim_t bytes) {
+        rlimit limit{};
+        ::getrlimit(RLIMIT_FSIZE, &limit);
+        limit.rlim_cur = std::min(bytes, limit.rlim_max);
+        ::setrlimit(RLIMIT_FSIZE, &limit);
     };
     ::signal(SIGXFSZ, SIG_IGN);
     World world;
-    {
-        const FileSizeLimit limit(4000);
-        EXPECT_EQ(
-            world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
-            "nothing was changed: the bytes kept for undoing cannot be written or read (%1$@)");
-    }
+    limitFiles(4000);
+    EXPECT_EQ(world.store->save(repairOf(), ranges, world.disk, world.view).error().key,
+              "nothing was changed: the bytes kept for undoing cannot be written or read (%1$@)");
+    limitFiles(RLIM_INFINITY);
     EXPECT_TRUE(fs::is_empty(world.storePath()));
     {
         UndoRecord record = world.save();
-        const FileSizeLimit limit(100);
+        limitFiles(100);
         EXPECT_FALSE(record.apply(world.disk));
+        limitFiles(RLIM_INFINITY);
     }
     EXPECT_TRUE(world.store->list().records.empty());
     EXPECT_EQ(world.disk.writes, 0);
     const std::string id = world.apply();
-    {
-        const FileSizeLimit limit(4000);
-        const auto done = world.store->take(id)->undo(world.disk);
-        EXPECT_TRUE(!done && done.error().left == Left::Unchanged);
-    }
+    limitFiles(4000);
+    const auto done = world.store->take(id)->undo(world.disk);
+    limitFiles(RLIM_INFINITY);
+    EXPECT_TRUE(!done && done.error().left == Left::Unchanged);
     EXPECT_EQ(world.disk.medium, repaired(oldDisk()));
     EXPECT_TRUE(world.store->take(id)->undo(world.disk));
     EXPECT_EQ(world.disk.medium, oldDisk());
