@@ -2,20 +2,15 @@
 #include "tests/desktop/WindowFixture.h"
 
 #include "orvane/desktop/toolkit/Text.h"
-#include "pellar/process/FileDescriptor.h"
-#include "pellar/undo/UndoStore.h"
 #include "tests/support/TestDirectory.h"
 
 #include <QAbstractButton>
 #include <QTest>
 
 #include <fcntl.h>
-#include <unistd.h>
 
 #include <cerrno>
-#include <chrono>
 #include <cstdlib>
-#include <span>
 #include <utility>
 
 namespace orvane::desktop::test {
@@ -42,53 +37,6 @@ std::string WindowFixture::makePartitionedImage(const std::string& name)
     prepareWith({"mke2fs", "-q", "-F", "-t", "ext4", "-L", "inner", "-E", "offset=1048576", image,
                  "8192k"});
     return image;
-}
-
-void WindowFixture::interruptRepair(const std::string& image)
-{
-    // Written once, and then not any more.
-    class FailingFile final : public pellar::Region {
-    public:
-        explicit FailingFile(const std::string& name, std::uint64_t bytes)
-            : file_(::open(name.c_str(), O_RDWR | O_CLOEXEC)), region_(file_.get(), 0, bytes)
-        {
-        }
-        std::uint64_t length() const override { return region_.length(); }
-        int read(std::uint64_t place, std::span<std::uint8_t> bytes) override
-        {
-            return region_.read(place, bytes);
-        }
-        int write(std::uint64_t place, pellar::ByteView bytes) override
-        {
-            return std::exchange(canWrite_, false) ? region_.write(place, bytes) : EIO;
-        }
-        int sync() override { return 0; }
-        void forgetCached() override {}
-
-    private:
-        pellar::FileDescriptor file_;
-        pellar::FileRegion region_;
-        bool canWrite_ = true;
-    };
-    const std::uint64_t bytes = std::filesystem::file_size(image);
-    const std::string repaired = directory_.makeFile("repaired", 0);
-    std::filesystem::copy_file(image, repaired,
-                               std::filesystem::copy_options::overwrite_existing);
-    std::vector<pellar::ByteRange> ranges;
-    for (const std::uint64_t place : {bytes / 2, bytes - 4096}) {
-        orvane::test::patch(repaired, place, std::string(512, 'r'));
-        ranges.push_back({place, 512});
-    }
-    FailingFile disk(image, bytes);
-    FailingFile after(repaired, bytes);
-    const pellar::RecordedRepair repair{
-        {std::filesystem::canonical(image), 0, bytes, "", "ext4", "disk"},
-        {pellar::Subject::Filesystem, pellar::Operation::Repair},
-        ::geteuid(),
-        std::chrono::system_clock::now()};
-    const auto store = pellar::UndoStore::open(directory_ / "state/repairs/records");
-    auto record = store->save(repair, ranges, disk, after);
-    ASSERT_EQ(record->apply(disk).error().left, pellar::UndoFailure::Left::Interrupted);
 }
 
 void WindowFixture::useEndlessTool()

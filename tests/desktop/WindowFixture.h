@@ -24,8 +24,6 @@ protected:
     std::string makeDamagedImage(const std::string& name);
     /// Two partitions, the first with an ext4 volume.
     std::string makePartitionedImage(const std::string& name);
-    /// Keeps a repair of the image that was cut off after half of it was written: 'r' in two places.
-    void interruptRepair(const std::string& image);
     /// A checking tool that runs until it is told to end takes the place of e2fsck.
     void useEndlessTool();
 

@@ -8,14 +8,12 @@
 #include <QClipboard>
 #include <QMimeData>
 
-#include <fstream>
-
 namespace orvane::desktop::test {
 namespace {
 
 using WindowTest = WindowFixture;
 
-TEST_F(WindowTest, TheButtonsFindAndRepairWhatIsDamaged)
+TEST_F(WindowTest, TheButtonsFindWhatIsDamaged)
 {
     const std::string sound = makeImage("sound");
     const std::string damaged = makeDamagedImage("damaged");
@@ -31,10 +29,6 @@ TEST_F(WindowTest, TheButtonsFindAndRepairWhatIsDamaged)
         EXPECT_NE(cell(image, DiskColumn::LastCheck), "");
         EXPECT_EQ(takeSheet().empty(), image == sound) << "damage is said in a sheet as well";
     }
-    run("repairDiskButton", damaged);
-    EXPECT_EQ(verdict(damaged), "repaired");
-    run("verifyDiskButton", damaged);
-    EXPECT_EQ(verdict(damaged), "sound");
 }
 
 TEST_F(WindowTest, TheLogIsCopiedAndDeletedByTheMenus)
@@ -144,21 +138,6 @@ TEST_F(WindowTest, AnImageWithPartitionsShowsItsVolumes)
     // A disk of a job keeps its place until the job is over in every respect.
     EXPECT_TRUE(waitUntil([&disks] { return disks.rowCount() == 0; }));
     EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "nothing is selected any more";
-}
-
-TEST_F(WindowTest, TheMapOfAnImageIsVerifiedAndRepaired)
-{
-    const std::string image = makePartitionedImage("partitioned");
-    std::fstream(image) << std::string(1024, '\0');  // the boot record and the primary header
-    open({image});
-    select(image);
-    command("verifyMap").trigger();
-    ASSERT_TRUE(waitForJob());
-    EXPECT_TRUE(waitUntil([&] { return verdict(image) == "damaged"; }));
-    takeSheet();
-    command("repairMap").trigger();
-    ASSERT_TRUE(waitForJob());
-    EXPECT_EQ(orvane::test::runTool({"sfdisk", "-q", "--verify", image}).status, 0);
 }
 
 TEST_F(WindowTest, AGreyButtonSaysWhyAndForWhichDisk)

@@ -6,21 +6,20 @@
 #include "pellar/process/FileDescriptor.h"
 #include "tests/pellar/partitions/DiskMaker.h"
 
+#define FUSE_USE_VERSION 312
 #include <fcntl.h>
+#include <fuse3/fuse.h>
 #include <gtest/gtest.h>
-#include <linux/fuse.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <atomic>
 #include <cerrno>
 #include <cstdint>
-#include <cstring>
 #include <filesystem>
 #include <stdexcept>
 #include <string>
 #include <thread>
-#include <type_traits>
 #include <utility>
 #include <vector>
 
@@ -29,35 +28,6 @@
 namespace {
 
 using namespace pellar;
-constexpr std::uint64_t diskNode = 2;  // the directory is FUSE_ROOT_ID
-
-template <class Message>
-std::string_view bytesOf(const Message& message)
-{
-    static_assert(std::is_trivially_copyable_v<Message>);
-    return {reinterpret_cast<const char*>(&message), sizeof message};
-}
-
-/// `bytes` hold at least one.
-template <class Message>
-Message messageIn(std::string_view bytes)
-{
-    Message message;
-    std::memcpy(&message, bytes.data(), sizeof message);
-    return message;
-}
-
-fuse_attr attributesOf(std::uint64_t node, std::uint64_t size)
-{
-    fuse_attr attributes = {};
-    attributes.ino = node;
-    attributes.size = node == diskNode ? size : 0;
-    attributes.blocks = attributes.size / 512;
-    attributes.mode = node == diskNode ? S_IFREG | 0666 : S_IFDIR | 0777;
-    attributes.nlink = 1;
-    attributes.blksize = 4096;
-    return attributes;
-}
 
 /// A file that fails on demand: it shows what is in another file, but for places that answer with
 /// an I/O error. Needs root and /dev/fuse. Until this object ends it is served by a thread.
@@ -75,17 +45,17 @@ public:
                 std::vector<Bad> bad, Since since = Since::Ever)
         : directory_(std::move(directory)),
           backing_(::open(backing.c_str(), O_RDWR | O_CLOEXEC)),
-          fuse_(::open("/dev/fuse", O_RDWR | O_CLOEXEC)),
-          size_(std::filesystem::file_size(backing)),
           bad_(std::move(bad)),
           since_(since)
     {
-        const std::string options = "fd=" + std::to_string(fuse_.get()) +
-                                    ",rootmode=40000,user_id=0,group_id=0,allow_other";
-        if (!backing_ || !fuse_ ||
-            ::mount("failing-disk", directory_.c_str(), "fuse", 0, options.c_str()) != 0)
+        static const fuse_operations table = operations();
+        std::string program = "failing-disk";
+        char* arguments[]{program.data(), nullptr};
+        fuse_args list = FUSE_ARGS_INIT(1, arguments);
+        fuse_ = ::fuse_new(&list, &table, sizeof table, this);
+        if (!backing_ || fuse_ == nullptr || ::fuse_mount(fuse_, directory_.c_str()) != 0)
             throw std::runtime_error("cannot prepare the test: no FUSE file system can be mounted");
-        server_ = std::thread([this] { serve(); });
+        server_ = std::thread([this] { ::fuse_loop(fuse_); });
     }
     FailingDisk(const FailingDisk&) = delete;
     FailingDisk& operator=(const FailingDisk&) = delete;
@@ -93,6 +63,7 @@ public:
     {
         ::umount2(directory_.c_str(), MNT_DETACH);  // which ends the serving
         server_.join();
+        ::fuse_destroy(fuse_);
     }
 
     /// Why there can be none here; empty where there can.
@@ -107,86 +78,35 @@ public:
     bool wasWritten() const { return wasWritten_; }
 
 private:
-    void serve()
+    static FailingDisk& own()
     {
-        std::vector<char> request(1U << 20U);
-        for (;;) {
-            const ssize_t count = ::read(fuse_.get(), request.data(), request.size());
-            if (count < 0 && errno != EINTR && errno != ENOENT)
-                return;
-            if (count >= static_cast<ssize_t>(sizeof(fuse_in_header)))
-                answer(request.data(), static_cast<std::size_t>(count));
-        }
+        return *static_cast<FailingDisk*>(::fuse_get_context()->private_data);
     }
-    void answer(const char* request, std::size_t bytes)
+    static fuse_operations operations()
     {
-        const auto head = messageIn<fuse_in_header>({request, bytes});
-        const std::string_view body(request + sizeof head, bytes - sizeof head);
-        switch (head.opcode) {
-            case FUSE_INIT: {
-                fuse_init_out out = {};
-                out.major = FUSE_KERNEL_VERSION;
-                out.minor = 31;
-                out.max_write = 131072;
-                reply(head.unique, 0, bytesOf(out));
-                break;
-            }
-            case FUSE_LOOKUP:
-                look(head.unique, head.nodeid, body.substr(0, body.find('\0')));
-                break;
-            case FUSE_GETATTR:
-            case FUSE_SETATTR: {
-                fuse_attr_out out = {};
-                out.attr = attributesOf(head.nodeid, size_);
-                reply(head.unique, 0, bytesOf(out));
-                break;
-            }
-            case FUSE_OPEN: reply(head.unique, 0, bytesOf(fuse_open_out{})); break;
-            case FUSE_READ: {
-                const auto in = messageIn<fuse_read_in>(body);
-                read(head.unique, in.offset, in.size);
-                break;
-            }
-            case FUSE_WRITE: {
-                const auto in = messageIn<fuse_write_in>(body);
-                write(head.unique, in.offset, body.substr(sizeof in, in.size));
-                break;
-            }
-            case FUSE_STATFS: reply(head.unique, 0, bytesOf(fuse_statfs_out{})); break;
-            case FUSE_FORGET:
-            case FUSE_BATCH_FORGET: break;        // want no answer
-            default: reply(head.unique, ENOSYS);  // with which the kernel helps itself
-        }
+        fuse_operations table = {};
+        table.getattr = [](const char* path, struct stat* status, fuse_file_info*) {
+            const bool isDirectory = std::string_view(path) == "/";
+            if (!isDirectory && std::string_view(path) != "/disk")
+                return -ENOENT;
+            if (!isDirectory)
+                return ::fstat(own().backing_.get(), status) == 0 ? 0 : -errno;
+            status->st_mode = S_IFDIR | 0777;
+            status->st_nlink = 2;
+            return 0;
+        };
+        table.read = [](const char*, char* bytes, std::size_t count, off_t start, fuse_file_info*) {
+            if (own().isBad(static_cast<std::uint64_t>(start), count))
+                return -EIO;
+            return static_cast<int>(::pread(own().backing_.get(), bytes, count, start));
+        };
+        table.write = [](const char*, const char* bytes, std::size_t count, off_t start,
+                         fuse_file_info*) {
+            own().wasWritten_ = true;
+            return static_cast<int>(::pwrite(own().backing_.get(), bytes, count, start));
+        };
+        return table;
     }
-    void look(std::uint64_t id, std::uint64_t node, std::string_view name)
-    {
-        if (node != FUSE_ROOT_ID || name != "disk")
-            return reply(id, ENOENT);
-        fuse_entry_out out = {};
-        out.nodeid = diskNode;
-        out.attr = attributesOf(diskNode, size_);
-        reply(id, 0, bytesOf(out));
-    }
-    void read(std::uint64_t id, std::uint64_t start, std::uint32_t bytes)
-    {
-        if (isBad(start, bytes))
-            return reply(id, EIO);
-        std::string buffer(bytes, '\0');
-        const ssize_t count =
-            ::pread(backing_.get(), buffer.data(), buffer.size(), static_cast<off_t>(start));
-        buffer.resize(count < 0 ? 0 : static_cast<std::size_t>(count));
-        reply(id, 0, buffer);
-    }
-    void write(std::uint64_t id, std::uint64_t start, std::string_view bytes)
-    {
-        wasWritten_ = true;
-        const ssize_t count =
-            ::pwrite(backing_.get(), bytes.data(), bytes.size(), static_cast<off_t>(start));
-        if (count < 0)
-            return reply(id, errno);
-        reply(id, 0, bytesOf(fuse_write_out{static_cast<std::uint32_t>(count), 0}));
-    }
-    void reply(std::uint64_t id, int error, std::string_view bytes = {});
     bool isBad(std::uint64_t start, std::uint64_t bytes) const
     {
         if (since_ == Since::FirstWrite && !wasWritten_)
@@ -198,22 +118,12 @@ private:
 
     std::filesystem::path directory_;
     pellar::FileDescriptor backing_;
-    pellar::FileDescriptor fuse_;
-    std::uint64_t size_ = 0;
+    fuse* fuse_ = nullptr;
     std::vector<Bad> bad_;
     Since since_;
     std::atomic<bool> wasWritten_ = false;
     std::thread server_;
 };
-
-void FailingDisk::reply(std::uint64_t id, int error, std::string_view bytes)
-{
-    fuse_out_header head{0, -error, id};
-    head.len = static_cast<std::uint32_t>(sizeof head + bytes.size());
-    std::string message(bytesOf(head));
-    message += bytes;
-    static_cast<void>(!::write(fuse_.get(), message.data(), message.size()));
-}
 
 /// Places of the volumes that `volumeMakers` make, and of an ext4 of 16 MiB.
 struct BadPlace {

@@ -107,10 +107,14 @@ contract::DiskReferencePointer reference(const std::filesystem::path& image, std
     return disk;
 }
 
-JobOptions tryingIn(const std::filesystem::path& directory)
+JobOptions tryingIn(const std::filesystem::path& directory, const RepairPolicy* policy)
 {
     JobOptions options;
     options.trials.room.directory = directory;
+    if (policy != nullptr)
+        options.repairPolicy = [policy] {
+            return *policy;
+        };
     return options;
 }
 

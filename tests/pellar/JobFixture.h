@@ -93,8 +93,9 @@ JobOptions with(T JobOptions::*option, std::type_identity_t<T> value)
     return options;
 }
 
-/// By which repairs are tried, and kept to be undone, below this directory.
-JobOptions tryingIn(const std::filesystem::path& directory);
+/// By which repairs are tried, and kept to be undone, below this directory; by this policy, which
+/// outlives them.
+JobOptions tryingIn(const std::filesystem::path& directory, const RepairPolicy* policy = nullptr);
 
 /// One library, one listener, one loop.
 struct JobFixture {

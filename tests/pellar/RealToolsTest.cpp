@@ -102,16 +102,6 @@ TEST_P(RealTools, SayWhatIsTrue)
     EXPECT_FALSE(library.listener.hasPlainLine("/proc/self")) << "our name for the disk is shown";
 }
 
-/// A library that tries repairs before it applies them.
-JobOptions trying(const test::TestDirectory& directory, RepairPolicy& policy)
-{
-    JobOptions options = test::tryingIn(directory.path("repairs"));
-    options.repairPolicy = [&policy] {
-        return policy;
-    };
-    return options;
-}
-
 TEST_P(RealTools, AreTriedBeforeAnythingIsWrittenAndUndone)
 {
     constexpr Task undo{Subject::Filesystem, Operation::Undo};
@@ -121,7 +111,7 @@ TEST_P(RealTools, AreTriedBeforeAnythingIsWrittenAndUndone)
     const auto disk = test::reference(image, std::string(state.filesystem));
     const std::string before = contentsOf(image);
     RepairPolicy policy;
-    test::JobFixture library(trying(directory, policy));
+    test::JobFixture library(test::tryingIn(directory.path("repairs"), &policy));
     policy.isPreview = true;
     policy.keptImage = directory.path("kept");
     ASSERT_EQ(library.repair(disk), 0);
@@ -348,7 +338,7 @@ TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
     directory.damage(image, "unlink f3");
     RepairPolicy policy;
     policy.isPreview = true;
-    test::JobFixture library(trying(directory, policy));
+    test::JobFixture library(test::tryingIn(directory.path("repairs"), &policy));
     ASSERT_EQ(library.repair(test::reference(image)), 0);
     EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
     EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));

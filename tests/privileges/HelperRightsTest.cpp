@@ -29,12 +29,7 @@ constexpr uid_t somebody = 65534;
 /// Runs in a child, whose parent is this program; what it answers.
 bool inChild(const std::function<bool()>& question)
 {
-    const pid_t child = ::fork();
-    if (child == 0)
-        ::_exit(question() ? 0 : 1);
-    int status = -1;
-    ::waitpid(child, &status, 0);
-    return status == 0;
+    return test::statusOfChild([&question] { return question() ? 0 : 1; }) == 0;
 }
 
 TEST(AskingProgram, GivesWhatItHasOpenItself)

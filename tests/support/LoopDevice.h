@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/disks/LoopDevice.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
@@ -31,52 +32,35 @@ public:
     /// Throws when the system gives none after all.
     explicit LoopDevice(const std::string& image)
     {
-        // Another test may take the free one first.
-        constexpr int mostTries = 20;
-        const pellar::FileDescriptor control(::open("/dev/loop-control", O_RDWR | O_CLOEXEC));
-        for (int i = 0; control && number_ < 0 && i < mostTries; ++i) {
-            number_ = ::ioctl(control.get(), LOOP_CTL_GET_FREE);
-            if (!attach(image))
-                number_ = -1;
-        }
-        if (number_ < 0)
+        const pellar::FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
+        const auto made = pellar::setUpLoop(file.get(), 0, 0, pellar::Access::ReadWrite,
+                                            pellar::LoopLife::UntilDetached);
+        if (!made)
             throw std::runtime_error("cannot prepare the test: no loop device");
+        name_ = "/dev/" + made->name;
     }
     LoopDevice(const LoopDevice&) = delete;
     LoopDevice& operator=(const LoopDevice&) = delete;
     ~LoopDevice() { detach(); }
 
-    std::string name() const { return "/dev/loop" + std::to_string(number_); }
-
-    /// NO while somebody else still has the device open from before.
-    [[nodiscard]] bool attach(const std::string& image)
-    {
-        const pellar::FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
-        const pellar::FileDescriptor file(::open(image.c_str(), O_RDWR | O_CLOEXEC));
-        isOurs_ = device && file && ::ioctl(device.get(), LOOP_SET_FD, file.get()) == 0;
-        return isOurs_;
-    }
+    const std::string& name() const { return name_; }
 
     /// Somebody else has detached it, and may have given the device to another.
-    void forget()
-    {
-        number_ = -1;
-        isOurs_ = false;
-    }
+    void forget() { isOurs_ = false; }
 
     /// Nothing happens when it is detached already: it may be another test's by now.
     void detach()
     {
         if (!std::exchange(isOurs_, false))
             return;
-        const pellar::FileDescriptor device(::open(name().c_str(), O_RDWR | O_CLOEXEC));
+        const pellar::FileDescriptor device(::open(name_.c_str(), O_RDWR | O_CLOEXEC));
         if (device)
             ::ioctl(device.get(), LOOP_CLR_FD);
     }
 
 private:
-    int number_ = -1;
-    bool isOurs_ = false;
+    std::string name_;
+    bool isOurs_ = true;
 };
 
 }  // namespace orvane::test

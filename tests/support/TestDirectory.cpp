@@ -5,7 +5,6 @@
 #include "pellar/process/FileDescriptor.h"
 #include "tests/support/VolumeStates.h"
 
-#include <spawn.h>
 #include <stdlib.h>
 #include <sys/mman.h>
 #include <sys/wait.h>
@@ -19,6 +18,7 @@
 namespace orvane::test {
 namespace {
 
+constexpr int notStarted = 127;
 constexpr std::string_view systemPath = "/usr/sbin:/usr/bin:/sbin:/bin";
 
 }  // namespace
@@ -29,11 +29,6 @@ ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input)
     const pellar::FileDescriptor out(::memfd_create("output", MFD_CLOEXEC));
     if (::pwrite(in.get(), input.data(), input.size(), 0) != std::ssize(input))
         return {};
-    posix_spawn_file_actions_t actions;
-    ::posix_spawn_file_actions_init(&actions);
-    ::posix_spawn_file_actions_adddup2(&actions, in.get(), 0);
-    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 1);
-    ::posix_spawn_file_actions_adddup2(&actions, out.get(), 2);
     std::vector<char*> words;
     for (std::string& argument : arguments)
         words.push_back(argument.data());
@@ -42,12 +37,14 @@ ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input)
     std::string locale = "LC_ALL=C";
     char* environment[] = {path.data(), locale.data(), nullptr};
     const std::string program = pellar::findProgram(arguments.front(), systemPath);
-    pid_t child = 0;
-    const int error =
-        ::posix_spawn(&child, program.c_str(), &actions, nullptr, words.data(), environment);
-    ::posix_spawn_file_actions_destroy(&actions);
-    int status = 0;
-    if (error != 0 || ::waitpid(child, &status, 0) != child || !WIFEXITED(status))
+    const int status = statusOfChild([&] {
+        ::dup2(in.get(), STDIN_FILENO);
+        ::dup2(out.get(), STDOUT_FILENO);
+        ::dup2(out.get(), STDERR_FILENO);
+        ::execve(program.c_str(), words.data(), environment);
+        return notStarted;
+    });
+    if (!WIFEXITED(status) || WEXITSTATUS(status) == notStarted)
         return {};
     return {WEXITSTATUS(status), contentsOf("/proc/self/fd/" + std::to_string(out.get()))};
 }
@@ -57,6 +54,16 @@ void prepareWith(const std::vector<std::string>& arguments, std::string_view inp
     const ToolAnswer answer = runTool(arguments, input);
     if (answer.status != 0)
         throw std::runtime_error("cannot prepare the test: " + arguments[0] + answer.output);
+}
+
+int statusOfChild(const std::function<int()>& work)
+{
+    const pid_t child = ::fork();
+    if (child == 0)
+        ::_exit(work());
+    int status = -1;
+    ::waitpid(child, &status, 0);
+    return status;
 }
 
 std::string contentsOf(const std::filesystem::path& file)

@@ -3,6 +3,7 @@
 
 #include <cstdint>
 #include <filesystem>
+#include <functional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -18,6 +19,9 @@ struct ToolAnswer {
 ToolAnswer runTool(std::vector<std::string> arguments, std::string_view input = {});
 /// The same, for what a test needs to begin with: throws unless the tool answers 0.
 void prepareWith(const std::vector<std::string>& arguments, std::string_view input = {});
+
+/// Runs in a process of its own, which ends with what `work` answers; its wait status (wait(2)).
+int statusOfChild(const std::function<int()>& work);
 
 std::string contentsOf(const std::filesystem::path& file);
 /// Makes the directories above it, too.

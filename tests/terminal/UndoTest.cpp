@@ -2,13 +2,9 @@
 // Repairs that are tried, taken back and finished.
 
 #include "orvane/jobs/RepairRecords.h"
-#include "pellar/undo/UndoStore.h"
+#include "tests/support/InterruptedRepair.h"
 #include "tests/support/LoopDevice.h"
 #include "tests/terminal/ProgramTest.h"
-
-#include <fcntl.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 namespace orvane::test {
 namespace {
@@ -26,56 +22,12 @@ protected:
     }
     bool isInterrupted(const std::string& image) const
     {
-        const bool isSaid = run({"list", image}).output.find("repair interrupted: finish or undo") !=
-                            std::string::npos;
+        const bool isSaid =
+            run({"list", image}).output.find("repair interrupted: finish or undo") !=
+            std::string::npos;
         const auto disk = Events(run({"list", "--json", image}).output).named("disk").front();
         EXPECT_EQ(disk["interruptedRepair"].is_string(), isSaid);
         return isSaid;
-    }
-    /// The image is half of what it was and half of what `repaired` holds, as a power cut leaves it.
-    void interruptRepair(const std::filesystem::path& image,
-                         const std::filesystem::path& repaired) const
-    {
-        const pid_t child = ::fork();
-        if (child == 0)
-            ::_exit(writeHalf(image, repaired));
-        int status = -1;
-        ::waitpid(child, &status, 0);
-        ASSERT_EQ(status, 0);
-    }
-    /// Has the whole file as its volume, which this tool says is damaged, and writes to it.
-    void useToolThatFails()
-    {
-        const auto tool = path("tools/e2fsck");
-        write(tool,
-              "#!/bin/sh\ncase \"$*\" in *-n*) ;; *) for disk; do :; done\n"
-              "printf damaged | dd of=\"$disk\" bs=1 seek=4096 conv=notrunc status=none;; esac\n"
-              "echo 'x: ********** WARNING: Filesystem still has errors **********'\nexit 4\n");
-        std::filesystem::permissions(tool, std::filesystem::perms::owner_all);
-        environment_["FIXWELL_TOOL_PATH"] = tool.parent_path();
-    }
-
-private:
-    int writeHalf(const std::filesystem::path& image, const std::filesystem::path& repaired) const
-    {
-        const FileDescriptor disk(::open(image.c_str(), O_RDWR));
-        const FileDescriptor other(::open(repaired.c_str(), O_RDONLY));
-        const auto bytes = std::filesystem::file_size(image);
-        pellar::FileRegion before(disk.get(), 0, bytes);
-        pellar::FileRegion after(other.get(), 0, bytes);
-        const auto store = pellar::UndoStore::open(path("state/orvane/repairs/records"));
-        auto record = store->save({{image, 0, bytes, "", "ext4", "image"},
-                                   {pellar::Subject::Filesystem, pellar::Operation::Repair},
-                                   ::geteuid(),
-                                   std::chrono::system_clock::now()},
-                                  {{0, bytes}}, before, after);
-        pellar::UndoWork work;
-        work.progress = [&disk, bytes](std::uint64_t, std::uint64_t) {
-            char half = 0;
-            if (::pread(disk.get(), &half, 1, static_cast<off_t>(bytes / 2)) == 1 && half != 0)
-                ::_exit(0);
-        };
-        return record && record->apply(before, work) ? 1 : 2;
     }
 };
 
@@ -121,30 +73,14 @@ TEST_F(UndoTest, AnUndoneRepairLeavesEveryByteAsItWas)
               "undone")
         << "it is no longer repaired";
 
-    environment_["LANGUAGE"] = "de";
-    const RunResult nothing = run({"undo", "it's a"});
-    EXPECT_EQ(nothing.status, 8);
-    EXPECT_NE(nothing.output.find("von einer Reparatur ist nichts aufgehoben"), std::string::npos)
-        << nothing.output;
+    EXPECT_EQ(run({"undo", "it's a"}).status, 8);
     EXPECT_EQ(run({"undo", "none"}).status, 8);
-}
-
-TEST_F(UndoTest, WhatWasChangedSinceStaysAsItIs)
-{
-    const auto image = makeDamagedVolume("a");
-    ASSERT_EQ(run({"repair", "a"}).status, 1);
-    change(image, "mkdir later");
-    const std::string changed = contentsOf(image);
-    const RunResult undone = run({"undo", "a"});
-    EXPECT_EQ(undone.status, 8);
-    EXPECT_NE(undone.output.find("the disk was changed since"), std::string::npos) << undone.output;
-    EXPECT_TRUE(contentsOf(image) == changed);
 }
 
 TEST_F(UndoTest, ARepairThatLeavesDamageIsAppliedOnDemandOnly)
 {
     const auto image = makeVolume("a");
-    useToolThatFails();
+    useTool("write-in-repair changed\nexit 4");
     const std::string before = contentsOf(image);
     const RunResult repaired = run({"repair", "a"});
     EXPECT_EQ(repaired.status, 4) << repaired.output;
@@ -153,31 +89,29 @@ TEST_F(UndoTest, ARepairThatLeavesDamageIsAppliedOnDemandOnly)
     EXPECT_TRUE(contentsOf(image) == before);
 
     EXPECT_EQ(run({"repair", "--apply-unproven", "a"}).status, 4);
-    EXPECT_EQ(contentsOf(image).substr(4096, 7), "damaged");
+    EXPECT_TRUE(contentsOf(image).starts_with("changed"));
     EXPECT_EQ(undoable("a"), std::vector<std::string>{"damaged"});
     EXPECT_EQ(run({"undo", "a"}).status, 0);
     EXPECT_TRUE(contentsOf(image) == before);
 
     static_cast<void>(run({"repair", "--apply-unproven", "--no-undo", "a"}));
     EXPECT_TRUE(undoable("a").empty());
-    EXPECT_EQ(contentsOf(image).substr(4096, 7), "damaged");
+    EXPECT_TRUE(contentsOf(image).starts_with("changed"));
 }
 
 TEST_F(UndoTest, AnInterruptedRepairIsPointedOutAndFinishedOrUndone)
 {
     const auto image = makeVolume("a");
     const std::string before = contentsOf(image);
-    write(path("repaired"), std::string(before).replace(mebibyte, 6 * mebibyte, 6 * mebibyte, 'r'));
     for (const std::string command : {"finish", "undo"}) {
         write(image, before);
-        interruptRepair(image, path("repaired"));
+        const std::string repaired = interruptRepair(image, path("state/orvane/repairs/records"));
         EXPECT_TRUE(isInterrupted("a"));
         const std::string half = contentsOf(image);
         EXPECT_EQ(run({"repair", "a"}).status, 8);
         EXPECT_TRUE(contentsOf(image) == half) << "nothing is built on it";
         EXPECT_EQ(run({command, "a"}).status, 0);
-        EXPECT_TRUE(contentsOf(image) ==
-                    (command == "undo" ? before : contentsOf(path("repaired"))));
+        EXPECT_TRUE(contentsOf(image) == (command == "undo" ? before : repaired));
         EXPECT_FALSE(isInterrupted("a"));
     }
 }
@@ -196,11 +130,16 @@ TEST_F(UndoTest, ADeviceIsTreatedAsAnImageIs)
     EXPECT_TRUE(contentsOf(device.name()) == before);
 }
 
-TEST_F(UndoTest, OfSeveralVolumesTheOneThatIsNamedIsUndone)
+TEST_F(UndoTest, OfSeveralVolumesEachIsRepairedAndTheOneThatIsNamedUndone)
 {
     makeDisk("disk.img", {makeDamagedVolume("first"), makeDamagedVolume("second")});
     const std::string before = contentsOf(path("disk.img"));
-    ASSERT_EQ(run({"repair", "disk.img"}).status, 1);
+    const RunResult repaired = run({"repair", "--json", "disk.img"});
+    EXPECT_EQ(repaired.status, 1) << repaired.output << repaired.errors;
+    const std::vector<std::string> story{"started disk.img#1", "finished disk.img#1 repaired",
+                                         "started disk.img#2", "finished disk.img#2 repaired"};
+    EXPECT_EQ(Events(repaired.output).story({"started", "finished"}), story);
+    EXPECT_EQ(run({"verify", "disk.img"}).status, 0);
     const RunResult unclear = run({"undo", "disk.img"});
     EXPECT_EQ(unclear.status, 8);
     EXPECT_NE(unclear.errors.find("name one: disk.img#1, disk.img#2"), std::string::npos)
@@ -239,7 +178,7 @@ TEST(RepairRecords, ARecordBelongsToTheRunThatWrote)
         const std::optional<RunEnd> end =
             *verdict != '\0' ? std::optional(RunEnd{verdict, 0, ""}) : std::nullopt;
         return orvane::Run{action, time + milliseconds(begins),
-                   end ? std::optional(time + milliseconds(ends)) : std::nullopt, end};
+                           end ? std::optional(time + milliseconds(ends)) : std::nullopt, end};
     };
     struct Case {
         std::vector<orvane::Run> runs;
@@ -254,9 +193,11 @@ TEST(RepairRecords, ARecordBelongsToTheRunThatWrote)
           Case{{run("repair", 1000, 5000, "repaired")}, -1, "begun after"},
           Case{{run("repair", -5000, 0, "")}, 0, "cut off"},
           Case{{run("repair", -5000, 0, ""), run("repair", 800, 900, "failed")}, 0, "refused"},
-          Case{{run("repair", 100, 200, "damaged"), run("repair", 300, 400, "repaired")}, 1,
+          Case{{run("repair", 100, 200, "damaged"), run("repair", 300, 400, "repaired")},
+               1,
                "after a preview"},
-          Case{{run("repair", 100, 200, "repaired"), run("repair", 300, 400, "sound")}, 0,
+          Case{{run("repair", 100, 200, "repaired"), run("repair", 300, 400, "sound")},
+               0,
                "before another look"}}) {
         const orvane::Run* const found = runOf(repair, c.runs);
         EXPECT_EQ(found == nullptr ? -1 : found - c.runs.data(), c.written) << c.because;

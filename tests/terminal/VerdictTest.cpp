@@ -5,26 +5,6 @@
 namespace orvane::test {
 namespace {
 
-using VerdictTest = ProgramTest;
-
-TEST_F(VerdictTest, EachVolumeOfAPartitionedImageIsTreatedAndNothingBesides)
-{
-    const auto first = makeVolume("first", 20 * mebibyte);
-    change(first, "clri <2>");
-    const auto disk = makeDisk("disk.img", {first, makeVolume("second", 20 * mebibyte)});
-    const std::string untilThere = contentsOf(disk).substr(0, mebibyte);
-    const RunResult repaired = run({"repair", "--json", "disk.img"});
-    EXPECT_EQ(repaired.status, 1) << repaired.output << repaired.errors;
-    const std::vector<std::string> story{"started disk.img#1", "finished disk.img#1 repaired",
-                                         "started disk.img#2", "finished disk.img#2 sound"};
-    EXPECT_EQ(Events(repaired.output).story({"started", "finished"}), story);
-    EXPECT_TRUE(contentsOf(disk).substr(0, mebibyte) == untilThere) << "the partition map";
-    for (const std::uint64_t start : {1, 21}) {
-        write(path("volume"), contentsOf(disk).substr(start * mebibyte, 20 * mebibyte));
-        EXPECT_EQ(runTool({"e2fsck", "-fn", path("volume")}).status, 0) << start;
-    }
-}
-
 using PartitionMapTest = ProgramTest;
 
 std::string zeros(std::size_t count)

@@ -5,6 +5,7 @@
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/texts/Language.h"
 #include "tests/desktop/WindowFixture.h"
+#include "tests/support/InterruptedRepair.h"
 #include "tests/support/TestDirectory.h"
 
 #include <QApplication>
@@ -105,7 +106,7 @@ TEST_F(Pictures, OfARepairThatIsUndone)
 {
     const std::string image = makeDamagedImage("Letters");
     const std::string interrupted = makeImage("Photos");
-    interruptRepair(interrupted);
+    orvane::test::interruptRepair(interrupted, directory_ / "state/repairs/records");
     openInOneSize({image, interrupted});
     takePictureOfMenu("verifyThoroughly", "-settings");
     takePicture("-interrupted-row");

@@ -9,7 +9,6 @@
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/prctl.h>
-#include <sys/wait.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -57,21 +56,6 @@ public:
     std::string original;  ///< of the region
     std::unique_ptr<Overlay> overlay;
 };
-
-/// Runs it in a process of its own, with this user; what it answers is the exit status.
-int statusOf(uid_t user, const std::function<int()>& work)
-{
-    const pid_t child = ::fork();
-    if (child == 0) {
-        // As a program that this user has started: the files of its process are its own.
-        const bool isThem = ::setresgid(user, user, user) == 0 &&
-                            ::setresuid(user, user, user) == 0 && ::prctl(PR_SET_DUMPABLE, 1) == 0;
-        ::_exit(isThem ? work() : 99);
-    }
-    int status = 0;
-    EXPECT_EQ(::waitpid(child, &status, 0), child);
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
 
 TEST(Overlay, IsTheDiskWithWhatWasWrittenToIt)
 {
@@ -171,23 +155,9 @@ TEST(FullCopy, IsTheImageWithWhatWasWrittenToIt)
     EXPECT_TRUE(contentsOf(image) == before);
     const auto tooLarge = FullCopy::of(disk.get(), part, {directory.path("room"), 100}, isStopped);
     EXPECT_TRUE(tooLarge || tooLarge.error() == ENOSPC) << "or its blocks are shared";
-    const auto stopped = FullCopy::of(disk.get(), part, {directory.path("room")}, [] {
-        return true;
-    });
+    const auto stopped =
+        FullCopy::of(disk.get(), part, {directory.path("room")}, [] { return true; });
     EXPECT_TRUE(stopped || stopped.error() == ECANCELED);
-}
-
-/// The tool's own way: by the name of a descriptor that it inherits.
-int writeThroughName(const OverlayFile& file)
-{
-    const FileDescriptor again(::open(pathOfDescriptor(file.descriptor()).c_str(), O_RDWR));
-    char bytes[4] = {};
-    const bool isUsable = again && ::pwrite(again.get(), "abcd", 4, 4'000) == 4 &&
-                          ::pread(again.get(), bytes, 4, 4'000) == 4 &&
-                          std::string_view(bytes, 4) == "abcd" &&
-                          ::lseek(again.get(), 0, SEEK_END) == static_cast<off_t>(region.length) &&
-                          ::ftruncate(again.get(), 10) != 0;
-    return isUsable ? 0 : 1;
 }
 
 TEST(OverlayFile, IsOpenedByNameAsAnyUser)
@@ -196,11 +166,26 @@ TEST(OverlayFile, IsOpenedByNameAsAnyUser)
         if (::geteuid() != 0 && user != ::geteuid())
             continue;
         const OverlayFixture disk;
-        EXPECT_EQ(statusOf(user,
-                           [&] {
-                               const auto file = OverlayFile::present(*disk.overlay);
-                               return file ? writeThroughName(**file) : file.error();
-                           }),
+        // As a program that this user has started: the files of its process are its own.
+        EXPECT_EQ(orvane::test::statusOfChild([&] {
+                      if (::setresgid(user, user, user) != 0 ||
+                          ::setresuid(user, user, user) != 0 || ::prctl(PR_SET_DUMPABLE, 1) != 0)
+                          return 99;
+                      const auto file = OverlayFile::present(*disk.overlay);
+                      if (!file)
+                          return file.error();
+                      // The tool's own way: by the name of a descriptor that it inherits.
+                      const FileDescriptor again(
+                          ::open(pathOfDescriptor((*file)->descriptor()).c_str(), O_RDWR));
+                      char bytes[4] = {};
+                      const bool isUsable =
+                          again && ::pwrite(again.get(), "abcd", 4, 4'000) == 4 &&
+                          ::pread(again.get(), bytes, 4, 4'000) == 4 &&
+                          std::string_view(bytes, 4) == "abcd" &&
+                          ::lseek(again.get(), 0, SEEK_END) == static_cast<off_t>(region.length) &&
+                          ::ftruncate(again.get(), 10) != 0;
+                      return isUsable ? 0 : 1;
+                  }),
                   0)
             << user;
         EXPECT_EQ(contentsOf("/proc/self/mountinfo").find("pellar-overlay"), std::string::npos);

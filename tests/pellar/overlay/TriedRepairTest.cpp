@@ -27,9 +27,6 @@ protected:
         before_ = contentsOf(image_);
         options_.toolPath =
             directory_.fakeTools("await-in-repair go\nbecome " + e2fsck_.string() + "\n");
-        options_.repairPolicy = [this] {
-            return policy_;
-        };
     }
 
     void letTheToolGo() const
@@ -55,8 +52,8 @@ protected:
     const contract::DiskReferencePointer disk_ = test::reference(image_);
     const std::filesystem::path e2fsck_ = findProgram("e2fsck", "/usr/sbin:/sbin");
     std::string before_;
-    JobOptions options_ = test::tryingIn(directory_.path("repairs"));
     RepairPolicy policy_;
+    JobOptions options_ = test::tryingIn(directory_.path("repairs"), &policy_);
     std::optional<test::JobFixture> library_;
 };
 
@@ -75,8 +72,7 @@ TEST_F(TriedRepair, IsNotAppliedToADiskThatAnotherHasWrittenTo)
         patch(image_, 5U << 20U, "another");
         letTheToolGo();
     };
-    const contract::ErrorCode begun = library().repair(disk_);
-    ASSERT_EQ(begun, 0);
+    ASSERT_EQ(library().repair(disk_), 0);
     EXPECT_TRUE(isChanged);
     EXPECT_EQ(library().listener.error, contract::kPLErrorDiskChanged)
         << library().listener.message;

@@ -122,45 +122,6 @@ TEST(MapFlips, HostileNumbersInSealedHeadersDoNoHarm)
     }
 }
 
-// The power may fail at any moment of a repair: after a write, or with half of one on the disk.
-TEST(MapFlips, AnInterruptedRepairCanAlwaysBeFinished)
-{
-    const test::TestDirectory workshop;
-    const Bytes sound = DiskImage::smallGPT(workshop).bytes();
-    const std::size_t last = sound.size() - 512;
-    // What is set to zero, and by how many sectors the disk has grown.
-    for (const auto& [from, length, grownBy] : {std::tuple(512UL, 33UL * 512, 0UL),
-                                                {1024UL, 512UL, 0UL},
-                                                {last - 32UL * 512, 33UL * 512, 0UL},
-                                                {0UL, 34UL * 512, 0UL},
-                                                {0UL, 0UL, 100UL},
-                                                {0UL, 0UL, 5UL},
-                                                {512UL, 33UL * 512, 100UL},
-                                                {512UL, 33UL * 512, 5UL}}) {
-        SCOPED_TRACE(testing::Message() << from << ' ' << length << ' ' << grownBy);
-        MemorySectors disk(sound);
-        std::fill_n(disk.bytes.begin() + static_cast<std::ptrdiff_t>(from), length,
-                    std::uint8_t{0});
-        disk.bytes.resize(sound.size() + grownBy * 512);
-        const Bytes finished = repaired(disk);
-        const PartitionMap map = readPartitionMap(disk, {});
-        const auto planned = planRepair(map, reportOn(map), disk);
-        ASSERT_TRUE(planned);
-        for (const SectorWrite& write : planned->writes) {
-            const auto place = static_cast<std::ptrdiff_t>(write.first * 512);
-            for (std::size_t done = 0; done <= write.after.size(); done += 512) {
-                std::copy_n(write.after.begin(), done, disk.bytes.begin() + place);
-                if (disk.bytes != finished) {
-                    EXPECT_EQ(reportOf(disk).verdict, MapVerdict::Repairable)
-                        << "sector " << write.first << ", byte " << done;
-                }
-                EXPECT_TRUE(repaired(disk) == finished)
-                    << "sector " << write.first << ", byte " << done;
-            }
-        }
-    }
-}
-
 // A disk of noise behind the right signatures: nothing crashes, nothing is sound.
 TEST(MapFlips, NoiseIsNeverSound)
 {

@@ -55,6 +55,7 @@ private:
 
 /// Runs permission jobs.
 struct PermissionBench : JobFixture {
+    using JobFixture::JobFixture;
     explicit PermissionBench(const DebianSystem& installed) : PermissionBench(installed.store()) {}
     explicit PermissionBench(const std::filesystem::path& store)
         : JobFixture(with(&JobOptions::permissionReferences, store))

@@ -7,28 +7,7 @@
 #include <cerrno>
 
 namespace pellar::test {
-namespace {
-
 namespace fs = std::filesystem;
-
-/// Of the names in either, each as it is in one of them.
-template <class Names, class Chance>
-Names mixed(const Names& safe, const Names& now, const Chance& isThere)
-{
-    Names all = safe;
-    all.insert(now.begin(), now.end());
-    Names names;
-    for (const auto& [name, ignored] : all) {
-        const bool isSame =
-            safe.contains(name) && now.contains(name) && safe.at(name) == now.at(name);
-        const Names& from = isSame || !isThere() ? safe : now;
-        if (from.contains(name))
-            names[name] = from.at(name);
-    }
-    return names;
-}
-
-}  // namespace
 
 int CachedDisk::read(std::uint64_t place, std::span<std::uint8_t> bytes)
 {
@@ -86,39 +65,34 @@ SyncFunction PowerCuts::syncFunction()
 
 PowerCuts::Files PowerCuts::look()
 {
-    const auto numberOf = [this](const fs::path& path) {
-        FileDescriptor opened(::open(path.c_str(), O_RDONLY | O_CLOEXEC));
+    Files files;
+    for (const auto& entry : fs::recursive_directory_iterator(store_)) {
+        FileDescriptor opened(::open(entry.path().c_str(), O_RDONLY | O_CLOEXEC));
         struct stat status = {};
         ::fstat(opened.get(), &status);
         kept_.try_emplace(status.st_ino, std::move(opened));
-        return status.st_ino;
-    };
-    Files files;
-    for (const auto& record : fs::directory_iterator(store_)) {
-        const ino_t directory = numberOf(record.path());
-        files.directories[record.path().filename()] = directory;
-        for (const auto& file : fs::directory_iterator(record.path())) {
-            const ino_t number = numberOf(file.path());
-            files.names[directory][file.path().filename()] = number;
-            files.bytes[number] = orvane::test::contentsOf(file.path());
-        }
+        files.names[entry.path()] = status.st_ino;
+        if (entry.is_regular_file())
+            files.bytes[status.st_ino] = orvane::test::contentsOf(entry.path());
     }
     return files;
 }
 
 void PowerCuts::synced(int descriptor)
 {
-    struct stat status = {};
-    struct stat store = {};
-    ::fstat(descriptor, &status);
-    ::stat(store_.c_str(), &store);
+    const fs::path path = fs::read_symlink("/proc/self/fd/" + std::to_string(descriptor));
     Files now = look();
-    if (status.st_ino == store.st_ino)
-        safe_.directories = now.directories;
-    else if (S_ISDIR(status.st_mode))
-        safe_.names[status.st_ino] = now.names[status.st_ino];
-    else
-        safe_.bytes[status.st_ino] = now.bytes[status.st_ino];
+    if (!fs::is_directory(path)) {
+        const ino_t number = now.names.at(path);
+        safe_.bytes[number] = now.bytes[number];
+        return;
+    }
+    const auto isIn = [&path](const auto& name) {
+        return name.first.parent_path() == path;
+    };
+    std::erase_if(safe_.names, isIn);
+    std::erase_if(now.names, std::not_fn(isIn));
+    safe_.names.merge(now.names);
 }
 
 void PowerCuts::happened()
@@ -133,18 +107,22 @@ void PowerCuts::happened()
 
 Remains PowerCuts::cut(const Files& now, const Chance& isThere)
 {
-    const auto in = [](const auto& map, ino_t number) {
-        const auto found = map.find(number);
-        return found == map.end() ? typename std::decay_t<decltype(map)>::mapped_type()
-                                  : found->second;
-    };
     Remains left;
-    for (const auto& [name, directory] : mixed(safe_.directories, now.directories, isThere)) {
-        auto& files = left.store[name];
-        const Names names = mixed(in(safe_.names, directory), in(now.names, directory), isThere);
-        for (const auto& [file, number] : names)
-            files[file] =
-                in(now.bytes.contains(number) && isThere() ? now.bytes : safe_.bytes, number);
+    auto all = safe_.names;
+    all.insert(now.names.begin(), now.names.end());
+    for (const auto& [path, ignored] : all) {
+        const auto& names = isThere() ? now.names : safe_.names;
+        const auto found = names.find(path);
+        if (found == names.end())
+            continue;
+        const ino_t number = found->second;
+        if (path.parent_path() == store_)
+            left.store[path.filename()];
+        else if (const auto record = left.store.find(path.parent_path().filename());
+                 record != left.store.end())
+            record->second[path.filename()] = now.bytes.contains(number) && isThere()
+                                                  ? now.bytes.at(number)
+                                                  : safe_.bytes[number];
     }
     left.disk = cutDisk(isThere);
     return left;

@@ -64,10 +64,8 @@ public:
     std::vector<Remains> remains;
 
 private:
-    using Names = std::map<std::string, ino_t>;
     struct Files {
-        Names directories;
-        std::map<ino_t, Names> names;
+        std::map<std::filesystem::path, ino_t> names;
         std::map<ino_t, std::string> bytes;
     };
     /// Whether something that was not synced is there.
