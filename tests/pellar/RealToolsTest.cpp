@@ -334,7 +334,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
 TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
 {
     const test::TestDirectory directory;
-    const auto image = makeVolume(directory, {});
+    const auto image = makeVolume(directory, {"-O", "^orphan_file"});
     directory.damage(image, "unlink f3");
     RepairPolicy policy;
     policy.isPreview = true;
