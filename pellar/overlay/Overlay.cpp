@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/overlay/Overlay.h"
 
+#include <unistd.h>
+
 #include <algorithm>
 #include <cerrno>
 #include <memory>
@@ -34,8 +36,30 @@ Overlay::Piece Overlay::firstPieceOf(ByteRange range) const
     return {{range.offset, std::min(range.end(), end) - range.offset}, std::nullopt};
 }
 
+/// The kernel keeps a page in memory for each page of a hole that is read, which takes longer than
+/// all the rest. A device, and a file system that knows no holes, has data only (lseek(2)).
+bool Overlay::isHole(ByteRange place)
+{
+    if (place.offset < known_.offset || place.offset >= known_.end()) {
+        const auto from = static_cast<off_t>(place.offset);
+        const off_t data = ::lseek(disk_, from, SEEK_DATA);
+        isKnownHole_ = data != from;
+        off_t end = data;
+        if (!isKnownHole_)
+            end = ::lseek(disk_, from, SEEK_HOLE);
+        else if (data < 0)
+            end = errno == ENXIO ? ::lseek(disk_, 0, SEEK_END) : from;
+        known_ = {place.offset, static_cast<std::uint64_t>(std::max(end, from) - from)};
+    }
+    return isKnownHole_ && place.end() <= known_.end();
+}
+
 int Overlay::readDisk(std::uint64_t start, std::span<std::uint8_t> bytes)
 {
+    if (isHole({region_.offset + start, bytes.size()})) {
+        std::ranges::fill(bytes, std::uint8_t{0});
+        return 0;
+    }
     const int error = readAll(disk_, region_.offset + start, bytes);
     if (error != 0 && !unreadable_)
         unreadable_ = start;

@@ -47,6 +47,7 @@ private:
         std::optional<std::uint64_t> place;
     };
     Piece firstPieceOf(ByteRange range) const;
+    bool isHole(ByteRange place);
     int readDisk(std::uint64_t start, std::span<std::uint8_t> bytes);
     int append(std::uint64_t start, std::span<const std::uint8_t> bytes);
     bool hasRoomFor(std::uint64_t bytes);
@@ -60,6 +61,8 @@ private:
     Extents extents_;
     std::uint64_t keptBytes_ = 0;
     std::uint64_t knownRoom_ = 0;  ///< bytes that may be appended before it is looked again
+    ByteRange known_;  ///< of the disk: a hole, or data, to its end
+    bool isKnownHole_ = false;
     std::optional<std::uint64_t> unreadable_;
     bool isOutOfRoom_ = false;
 };

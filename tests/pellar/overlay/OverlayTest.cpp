@@ -96,6 +96,28 @@ TEST(Overlay, IsTheDiskWithWhatWasWrittenToIt)
               disk.original);
 }
 
+TEST(Overlay, ReadsHolesAsZerosUpToTheirEnds)
+{
+    const TestDirectory directory;
+    const auto image = directory.makeFile("disk", 400'000);
+    orvane::test::patch(image, 131'072, "data");
+    const FileDescriptor disk(::open(image.c_str(), O_RDONLY | O_CLOEXEC));
+    const auto overlay = *Overlay::over(disk.get(), {4'096, 395'904}, {directory.path("room")});
+    const auto read = [&](std::uint64_t place, std::size_t length) {
+        Bytes bytes(length, 7);
+        EXPECT_EQ(overlay->read(place, bytes), 0);
+        return std::string(bytes.begin(), bytes.end());
+    };
+    EXPECT_EQ(read(0, 1'000), std::string(1'000, '\0'));
+    EXPECT_EQ(read(126'000, 2'000).substr(976, 5), std::string("data\0", 5));
+    EXPECT_EQ(read(394'904, 1'000), std::string(1'000, '\0'));
+    EXPECT_EQ(read(126'976, 4), "data") << "after a hole behind it";
+    std::filesystem::resize_file(image, 200'000);
+    const auto shorter = *Overlay::over(disk.get(), {4'096, 395'904}, {directory.path("room")});
+    Bytes bytes(512);
+    EXPECT_EQ(shorter->read(300'000, bytes), EIO) << "behind the end is no hole";
+}
+
 TEST(Overlay, TellsOnlySectorsThatDiffer)
 {
     const OverlayFixture disk;
@@ -167,8 +189,8 @@ TEST(OverlayFile, IsOpenedByNameAsAnyUser)
         if (::geteuid() != 0 && user != ::geteuid())
             continue;
         // Nobody makes one behind a chroot (user_namespaces(7)).
-        if (user != 0 && orvane::test::statusOfChild(
-                             [] { return ::unshare(CLONE_NEWUSER) == 0 ? 0 : 1; }) != 0)
+        if (user != 0 &&
+            orvane::test::statusOfChild([] { return ::unshare(CLONE_NEWUSER) == 0 ? 0 : 1; }) != 0)
             GTEST_SKIP() << "user namespaces are not to be had here";
         const OverlayFixture disk;
         // As a program that this user has started: the files of its process are its own.
