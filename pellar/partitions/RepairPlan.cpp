@@ -109,7 +109,6 @@ public:
     {
     }
 
-    // The list before its header: a header is only valid with the list that it describes.
     void addCopy(const GPTHeader& header, std::string_view entriesWhat, std::string_view headerWhat)
     {
         add(header.entriesPlace, wholeSectors(valid_.entries, map_.sectorBytes), entriesWhat);
@@ -130,11 +129,11 @@ public:
 private:
     void add(std::uint64_t first, Bytes after, std::string_view what)
     {
-        auto before = sectors_.read(first, after.size() / map_.sectorBytes);
+        const auto before = sectors_.read(first, after.size() / map_.sectorBytes);
         if (!before)
             isReadable_ = false;
         else if (*before != after)
-            plan_.writes.push_back({first, *std::move(before), std::move(after), what});
+            plan_.writes.push_back({first, std::move(after), what});
     }
 
     const PartitionMap& map_;
@@ -160,22 +159,6 @@ bool mendsProtective(const MapReport& report)
     return report.has(FindingKind::ProtectiveMissing) ||
            report.has(FindingKind::ProtectiveWrongSize) ||
            report.has(FindingKind::ProtectiveWrongStart);
-}
-
-// Where the disk has grown by a few sectors only, the new backup overlaps the old one: the copy
-// that the repair comes from is written last.
-void addCopies(PlanWriter& writer, const Target& target, bool startsWithPrimary)
-{
-    const auto addPrimary = [&] {
-        writer.addCopy(target.primary, "Writing the list of partitions of the main copy",
-                       "Writing the header of the main copy");
-    };
-    if (startsWithPrimary)
-        addPrimary();
-    writer.addCopy(target.backup, "Writing the list of partitions of the backup copy",
-                   "Writing the header of the backup copy");
-    if (!startsWithPrimary)
-        addPrimary();
 }
 
 }  // namespace
@@ -209,7 +192,10 @@ Result<RepairPlan, Sentence> planRepair(const PartitionMap& map, const MapReport
     if (!target)
         return Sentence{"there is no room for a second copy beside the partitions", {}, {}};
     PlanWriter writer(map, *valid, sectors);
-    addCopies(writer, *target, valid == &map.backup);
+    writer.addCopy(target->primary, "Writing the list of partitions of the main copy",
+                   "Writing the header of the main copy");
+    writer.addCopy(target->backup, "Writing the list of partitions of the backup copy",
+                   "Writing the header of the backup copy");
     if (mendsProtective(report))
         writer.addProtective();
     if (!writer.isReadable())

@@ -10,13 +10,12 @@ namespace pellar {
 /// Whole sectors that take the place of others.
 struct SectorWrite {
     std::uint64_t first = 0;
-    Bytes before;  ///< what stands there, of the same length
     Bytes after;
     std::string_view what;  ///< a step in English, which is the text key
 };
 
-/// What makes the map sound again, in the order in which it is to be written: as long as not all
-/// of it is, the copy that the repair came from stays valid. Nothing in it touches a partition.
+/// What makes the map sound again: it may be written in any order, as what it overwrites is kept.
+/// Nothing in it touches a partition.
 struct RepairPlan {
     std::vector<SectorWrite> writes;
 };
