@@ -148,6 +148,7 @@ public:
         static const fuse_lowlevel_ops table = operations();
         ::fuse_set_log_func([](fuse_log_level, const char*, va_list) {});
         fuse_session* const session = ::fuse_session_new(&list, &table, sizeof table, &overlay);
+        ::fuse_opt_free_args(&list);  // the session adds to them, and keeps none
         if (session == nullptr)
             return nullptr;
         auto server = std::unique_ptr<Server>(new Server(session, std::move(mount)));

@@ -53,6 +53,7 @@ public:
         char* arguments[]{program.data(), nullptr};
         fuse_args list = FUSE_ARGS_INIT(1, arguments);
         fuse_ = ::fuse_new(&list, &table, sizeof table, this);
+        ::fuse_opt_free_args(&list);
         if (!backing_ || fuse_ == nullptr || ::fuse_mount(fuse_, directory_.c_str()) != 0)
             throw std::runtime_error("cannot prepare the test: no FUSE file system can be mounted");
         server_ = std::thread([this] { ::fuse_loop(fuse_); });
@@ -63,6 +64,7 @@ public:
     {
         ::umount2(directory_.c_str(), MNT_DETACH);  // which ends the serving
         server_.join();
+        ::fuse_unmount(fuse_);
         ::fuse_destroy(fuse_);
     }
 
