@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/process/ChildProcess.h"
 
-#include "pellar/process/ChildProcess.h"
 #include "pellar/process/ReducedRights.h"
 
 #include <fcntl.h>
