@@ -6,7 +6,6 @@
 // "e2fsck".
 
 #include "orvane/desktop/DesktopSession.h"
-#include "orvane/desktop/TerminationSignals.h"
 
 #include <QApplication>
 #include <QEventLoop>
