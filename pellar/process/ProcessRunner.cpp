@@ -21,6 +21,10 @@ using namespace std::chrono_literals;
 /// How long a lull in the output must be before the listener is told of a pause.
 constexpr auto lull = 20ms;
 
+/// How long the progress is left in its pipe. A tool that tells it a thousand times a second is
+/// held up each time it wakes its reader.
+constexpr auto progressRest = 50ms;
+
 /// One run, from the start of the child to its reaping.
 class Run {
 public:
@@ -69,8 +73,9 @@ private:
     /// YES when the time passed without any output.
     bool waitForEvents()
     {
+        const bool isResting = progressRestLeft() > 0ms;
         std::array<pollfd, 4> events{{{output_.readEnd.get(), POLLIN, 0},
-                                      {progress_.readEnd.get(), POLLIN, 0},
+                                      {isResting ? -1 : progress_.readEnd.get(), POLLIN, 0},
                                       {child_.endDescriptor(), POLLIN, 0},
                                       {stop_.descriptor(), POLLIN, 0}}};
         if (::poll(events.data(), events.size(), timeout()) < 0)
@@ -80,9 +85,17 @@ private:
         const bool hasProgress = events[1].revents != 0;
         if (hasOutput)
             read(output_.readEnd, outputLines_, true);
-        if (hasProgress)
+        if (hasProgress) {
             read(progress_.readEnd, progressLines_, false);
+            progressDue_ = Clock::now() + progressRest;
+        }
         return !hasOutput && !hasProgress;
+    }
+
+    /// Not more than 0 where the progress is waited for.
+    std::chrono::milliseconds progressRestLeft() const
+    {
+        return std::chrono::ceil<std::chrono::milliseconds>(progressDue_ - Clock::now());
     }
 
     /// Milliseconds until something is due; -1 for never.
@@ -91,6 +104,8 @@ private:
         if (isHeard_)
             return static_cast<int>(lull.count());
         std::optional<Clock::time_point> due = ladder_.deadline();
+        if (progress_.readEnd && progressRestLeft() > 0ms)
+            due = std::min(due.value_or(Clock::time_point::max()), progressDue_);
         if (request_.silenceLimit > 0ms && !ladder_.isStopping())
             due = std::min(due.value_or(Clock::time_point::max()),
                            lastHeard_ + request_.silenceLimit);
@@ -199,6 +214,7 @@ private:
     StopCause cause_ = StopCause::None;
     unsigned heededPresses_ = 0;
     Clock::time_point lastHeard_ = Clock::now();
+    Clock::time_point progressDue_ = Clock::now();
     bool isHeard_ = false;  ///< something was told since the last pause
     bool isLimitTold_ = false;
     bool isStopTold_ = false;
