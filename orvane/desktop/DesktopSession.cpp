@@ -29,16 +29,15 @@ DesktopSession::DesktopSession(SessionOptions options)
              {[this] { selectionChanged(); },
               [this] {
                   hints_.refresh();
+                  overview_.refresh();
               }}),
       hints_(parts(), library_),
       closer_(parts(), options_.closed),
       jobs_(parts(), disks_, closer_, options_.buses, options_.longestGlanceAway,
-            [this] {
-                update();
-                choices_.offer();
-            }),
+            [this] { update(); }),
       undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
-      choices_(parts(), disks_, repairs_, undoing_, closer_, jobPolicy_),
+      choices_(parts(), disks_, repairs_, jobPolicy_, [this] { overview_.explainCopying(); }),
+      overview_(parts(), disks_, repairs_, choices_, undoing_),
       commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); })
 {
     host_.setWindow(&window_);
@@ -149,11 +148,13 @@ void DesktopSession::connectHost()
                 tab->deliver(notification);
             window_.disks().synchronize();
             hints_.refresh();
+            overview_.refresh();
             // What the user clears later is another step.
             loop_.post([this] { host_.histories().closeClearing(); });
         };
-    host_.alerts().setWithheld(
-        [this] { return controller_.interfaceLock() && choices_.saysMoreThanModule(); });
+    // The banner says how a job ended, and what can be done about it.
+    host_.alerts().setWithheld([this] { return controller_.interfaceLock() && jobs_.hasResult(); });
+    tabs_.setMayPerform([this](std::string_view action) { return choices_.mayPerform(action); });
     host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
     host_.printing().setTitle([this] {
         std::string names;
@@ -166,6 +167,7 @@ void DesktopSession::connectHost()
 void DesktopSession::connectWindow()
 {
     commands_.addMenus();
+    commands_.fillBar();
     window_.setEvents({
         [this] { return closer_.mayClose(); },
         [this](const std::vector<std::filesystem::path>& files) {
@@ -174,6 +176,7 @@ void DesktopSession::connectWindow()
         [this] { return !controller_.interfaceLock(); },
         [this] { update(); },
         [this] { windowAppeared(); },
+        [this](bool isCompact) { tabs_.setCompact(isCompact); },
     });
     controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
                            [this](const contract::Dictionary& report) {
@@ -185,6 +188,7 @@ void DesktopSession::lockChanged(bool isLocked)
 {
     jobs_.lockChanged(isLocked);
     choices_.lockChanged(isLocked);
+    overview_.refresh();
     if (isLocked)
         hints_.refresh();
     else
@@ -197,7 +201,6 @@ void DesktopSession::runEnded(const StartedRun& run, const RunEnd& end)
     if (run.task.operation != pellar::Operation::Verify)
         repairs_.read();
     jobs_.runEnded(run, end);
-    choices_.runEnded(run, end);
     undoing_.runEnded(run, end);
 }
 
@@ -205,6 +208,7 @@ void DesktopSession::update()
 {
     tabs_.update();
     hints_.refresh();
+    overview_.refresh();
 }
 
 void DesktopSession::selectionChanged()

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/desktop/DiskOverview.h"
 #include "orvane/desktop/JobWatch.h"
 #include "orvane/desktop/MenuCommands.h"
 #include "orvane/desktop/ModuleHints.h"
@@ -88,6 +89,7 @@ private:
     JobWatch jobs_;
     RepairUndoing undoing_;
     RepairChoices choices_;
+    DiskOverview overview_;
     MenuCommands commands_;
 };
 

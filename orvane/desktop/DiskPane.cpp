@@ -28,7 +28,8 @@ Check checkOf(const Run& run)
     const auto started =
         std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
     return {run.verdict(), run.end ? run.end->message : "",
-            QDateTime::fromMSecsSinceEpoch(started.count())};
+            QDateTime::fromMSecsSinceEpoch(started.count()), run.action,
+            run.end ? run.end->errorCode : 0};
 }
 
 std::string_view activityIn(pellar::Operation operation)

@@ -33,6 +33,9 @@ public:
     /// The module's own report at the end of its job.
     void reported(const contract::Dictionary& report);
 
+    /// Whether the job at hand has come to an answer about a disk.
+    bool hasResult() const { return !job_.runs.empty(); }
+
     // As the ledger hears it.
 
     void runBegan(const StartedRun& run);

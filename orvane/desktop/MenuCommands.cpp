@@ -45,6 +45,58 @@ void MenuCommands::addMenus()
             const QPoint& place) { menu->popup(list.viewport()->mapToGlobal(place)); });
 }
 
+void MenuCommands::fillBar()
+{
+    const auto action = [this](const char* objectName, std::string_view title,
+                               std::string_view button) {
+        return MenuCommand{.objectName = objectName,
+                           .title = title,
+                           .shortcut = shortcutOf(button),
+                           .perform = [this, button] { at_.tabs.button(button)->press(); },
+                           .reasonAgainst = [this, button] { return reasonAgainstButton(button); }};
+    };
+    const auto stop = MenuCommand{
+        .objectName = "barStop",
+        .title = "Stop",
+        .shortcut = {},
+        .perform = [this] { at_.tabs.stopJob(); },
+        .reasonAgainst = [this] { return isLocked() ? "" : text("No job runs."); }};
+    const auto open = MenuCommand{.objectName = "barOpen",
+                                  .title = "Open Image…",
+                                  .shortcut = QKeySequence::Open,
+                                  .perform = [this] { openImages(); },
+                                  .isAvailable = [this] { return !isLocked(); }};
+    auto preview = previewCommand();
+    preview.objectName = "barPreview";
+    preview.title = "Preview";
+    auto undo = undoCommand("barUndo", "Undo", pellar::Operation::Undo);
+    at_.window.commands().add(
+        {{action("barVerify", "Verify", outlet::verifyDisk), Symbol::Verify, true},
+         {action("barRepair", "Repair", outlet::repairDisk), Symbol::Repair},
+         {std::move(preview), Symbol::Preview},
+         {std::move(undo), Symbol::Undo},
+         {stop, Symbol::Stop},
+         {open, Symbol::Open, false, true}});
+}
+
+QKeySequence MenuCommands::shortcutOf(std::string_view button)
+{
+    const QtButton* const control = at_.tabs.button(button);
+    return control != nullptr ? control->widget().shortcut() : QKeySequence();
+}
+
+std::string MenuCommands::reasonAgainstButton(std::string_view button)
+{
+    const QtButton* const control = at_.tabs.button(button);
+    if (control == nullptr)
+        return text("Not available for this disk.");
+    if (isLocked())
+        return text("Not available while a job runs.");
+    if (control->isEnabled())
+        return {};
+    return control->reason().empty() ? text("Not available for this disk.") : control->reason();
+}
+
 std::vector<Menu> MenuCommands::menus()
 {
     return {{"&File", fileCommands()},
@@ -61,9 +113,6 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
     const auto isFree = [this] {
         return !isLocked();
     };
-    const auto open = [this] {
-        chooseImages("Open Image", [this](const auto& names) { disks_.open(names); });
-    };
     const auto attach = [this] {
         chooseImages("Attach Image as Device",
                      [this](const auto& names) { disks_.attachAsDevices(names); });
@@ -72,7 +121,7 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
         return at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
     };
     return {
-        {"openImage", "&Open Image…", QKeySequence::Open, open, isFree},
+        {"openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }, isFree},
         {"attachImage", "&Attach Image as Device…", {}, attach, isFree},
         {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }, isFree},
         diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
@@ -122,17 +171,22 @@ std::vector<MenuCommand> MenuCommands::diskCommands()
 {
     return {buttonCommand("verifyDisk", "&Verify Disk", outlet::verifyDisk),
             buttonCommand("repairDisk", "&Repair Disk", outlet::repairDisk),
-            {.objectName = "previewRepair",
-             .title = "Previe&w Repair",
-             .shortcut = {},
-             .perform = [this] { choices_.preview(); },
-             .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }},
+            previewCommand(),
             line,
             undoCommand("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
             undoCommand("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
             line,
             mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
             mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)};
+}
+
+MenuCommand MenuCommands::previewCommand()
+{
+    return {.objectName = "previewRepair",
+            .title = "Previe&w Repair",
+            .shortcut = {},
+            .perform = [this] { choices_.preview(); },
+            .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }};
 }
 
 MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view title,
@@ -206,6 +260,11 @@ MenuCommand MenuCommands::mapCommand(const char* objectName, std::string_view ti
             [this] {
                 return diskWithMap() != nullptr;
             }};
+}
+
+void MenuCommands::openImages()
+{
+    chooseImages("Open Image", [this](const auto& names) { disks_.open(names); });
 }
 
 void MenuCommands::chooseImages(std::string_view title,

@@ -39,6 +39,8 @@ public:
 
     /// Gives the window its menus, and the list of disks one of them as its own.
     void addMenus();
+    /// Fills the bar at the top of the window.
+    void fillBar();
 
 private:
     std::vector<Menu> menus();
@@ -46,6 +48,7 @@ private:
     std::vector<MenuCommand> editCommands();
     std::vector<MenuCommand> diskCommands();
     MenuCommand detailsCommand();
+    MenuCommand previewCommand();
     MenuCommand undoCommand(const char* objectName, std::string_view title,
                             pellar::Operation operation);
     MenuCommand settingCommand(const char* objectName, std::string_view title,
@@ -59,6 +62,9 @@ private:
     bool isLocked() const { return at_.controller.interfaceLock(); }
     void chooseImages(std::string_view title,
                       const std::function<void(const std::vector<std::string>&)>& chosen);
+    void openImages();
+    QKeySequence shortcutOf(std::string_view button);
+    std::string reasonAgainstButton(std::string_view button);
     void print();
     bool canEdit(contract::Selector action);
     void completeLog();
@@ -67,6 +73,8 @@ private:
     void undoClearing();
     std::shared_ptr<Disk> diskWithMap();
     void treatMap(std::string_view button);
+
+    std::string text(std::string_view key) const { return at_.host.translator().text(key); }
 
     const SessionParts at_;
     DiskPane& disks_;

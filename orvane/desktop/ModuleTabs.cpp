@@ -136,8 +136,12 @@ void ModuleTabs::add(std::unique_ptr<ModuleTab> tab)
     window_.tabs().insertTab(static_cast<int>(place - tabs_.begin()), page,
                              toQtTitle(tab->module().displayName()));
     if (tab->interface() != nullptr)
-        tab->interface()->setBeforeAction(
-            [this](std::string_view action) { lastAction_ = action; });
+        tab->interface()->setMayPerform([this](std::string_view action) {
+            if (mayPerform_ && !mayPerform_(action))
+                return false;
+            lastAction_ = action;
+            return true;
+        });
     tabs_.insert(place, std::move(tab));
 }
 
@@ -160,6 +164,13 @@ void ModuleTabs::offer()
 {
     for (std::size_t i = 0; i < tabs_.size(); ++i)
         window_.tabs().setTabEnabled(static_cast<int>(i), tabs_[i]->isOffered());
+}
+
+void ModuleTabs::setCompact(bool isCompact)
+{
+    for (const auto& tab : tabs_)
+        if (tab->interface() != nullptr)
+            tab->interface()->setCompact(isCompact);
 }
 
 void ModuleTabs::stopJob()

@@ -95,6 +95,13 @@ public:
     void update();
     /// Enables the tabs that are offered for what is selected.
     void offer();
+    /// Asked before a module performs an action that the user asks for.
+    void setMayPerform(std::function<bool(std::string_view action)> asked)
+    {
+        mayPerform_ = std::move(asked);
+    }
+    /// Where there is little room.
+    void setCompact(bool isCompact);
     /// Stops the job that runs: the host's own or, of a module, by its Stop button or, where that
     /// cannot be pressed, by itself.
     void stopJob();
@@ -111,7 +118,7 @@ public:
     void reloadLog();
     std::string selectedLogHTML();
 
-    /// The selector that was sent to a module last.
+    /// The selector that a module performed last.
     const std::string& lastAction() const { return lastAction_; }
 
 private:
@@ -123,6 +130,7 @@ private:
     WindowController& controller_;
     std::vector<std::unique_ptr<ModuleTab>> tabs_;
     std::string lastAction_;
+    std::function<bool(std::string_view action)> mayPerform_;
     std::function<void()> stopHostJob_;
 };
 

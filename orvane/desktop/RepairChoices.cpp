@@ -3,20 +3,100 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/toolkit/ControlNames.h"
+#include "orvane/desktop/toolkit/Text.h"
+
+#include <QCheckBox>
 
 #include <algorithm>
-#include <array>
 #include <utility>
 
 namespace orvane::desktop {
-namespace {
 
-constexpr std::array errorsWithAChoice{contract::kPLErrorNotProven, contract::kPLErrorNotTried,
-                                       contract::kPLErrorInterrupted};
+namespace selector = contract::selector;
 
-constexpr pellar::Task repairOfVolume{pellar::Subject::Filesystem, pellar::Operation::Repair};
+bool asksBeforeRepair(SupportHost& host)
+{
+    const contract::Value kept = host.standardUserDefaults().objectForKey(asksBeforeRepairKey);
+    return kept.isNone() || kept.boolean();
+}
 
-}  // namespace
+bool RepairChoices::mayPerform(std::string_view action)
+{
+    const bool isRepair =
+        action == selector::repairDisk || action == selector::repairPermissions;
+    if (!isRepair || isConfirmed_ || !asksBeforeRepair(at_.host))
+        return true;
+    askBeforeRepair(action);
+    return false;
+}
+
+void RepairChoices::press(std::string_view button)
+{
+    isConfirmed_ = true;
+    if (QtButton* const control = at_.tabs.button(button))
+        control->press();
+    isConfirmed_ = false;
+}
+
+std::string RepairChoices::nameOfSelection()
+{
+    const auto disks = at_.controller.allSelectedItemsFilterDuplicates(false, true);
+    if (disks.size() == 1)
+        return at_.host.translator().sentence("“%@”", {disks.front()->displayName()});
+    const auto count = static_cast<long>(disks.size());
+    return contract::format(at_.host.translator().plural("%ld disk", "%ld disks", count), {count});
+}
+
+bool RepairChoices::isUnreadable()
+{
+    const auto rows = disks_.list().selectedRows();
+    return std::ranges::any_of(rows, [](const DiskRow& row) {
+        if (!row.lastCheck)
+            return row.facts.hasSMARTError;
+        const LastCheck& check = *row.lastCheck;
+        return row.facts.hasSMARTError || (check.later ? *check.later : check.told).errorCode ==
+                                              contract::kPLErrorUnreadable;
+    });
+}
+
+std::string RepairChoices::meaningOfRepair(std::string_view action)
+{
+    if (action == selector::repairPermissions)
+        return text("The permissions, owners and groups of the files of installed packages are set "
+                    "to what the packages say. What they were is kept, so it can be undone.");
+    if (!kept_.canTry())
+        return text("The checking tool writes to the disk itself, because there is no place here "
+                    "to try the repair first. That cannot be undone. Copy what matters first.");
+    return text("The repair is tried first, and the result is checked. Only where no damage would "
+                "be left, the disk is written to. What is overwritten is kept, so the repair can "
+                "be undone with “Undo Repair” in the Disk menu.");
+}
+
+// A disk that cannot be read loses by every attempt: for it, no repair is offered.
+void RepairChoices::askBeforeRepair(std::string_view action)
+{
+    const bool isOfDisk = action == selector::repairDisk;
+    if (isOfDisk && isUnreadable()) {
+        explainCopying_();
+        return;
+    }
+    const std::string_view button = isOfDisk ? contract::outlet::repairDisk
+                                             : contract::outlet::repairPermissions;
+    std::vector<Question::Answer> answers{{text("Repair"), [this, button] { press(button); }}};
+    if (isOfDisk && reasonAgainstPreview().empty())
+        answers.push_back({text("Preview"), [this] { preview(); }});
+    QMessageBox* const box =
+        ask(at_.window, {isOfDisk ? "repairQuestion" : "permissionsQuestion",
+                         sentence(isOfDisk ? "Repair %@?" : "Repair the permissions of %@?",
+                                  nameOfSelection()),
+                         meaningOfRepair(action), std::move(answers), text("Cancel")});
+    auto* const again = new QCheckBox(toQtTitle(text("Ask before every repair")));
+    again->setChecked(true);
+    box->setCheckBox(again);
+    QObject::connect(again, &QCheckBox::toggled, &at_.window, [this](bool isOn) {
+        at_.host.standardUserDefaults().setObjectForKey(isOn, asksBeforeRepairKey);
+    });
+}
 
 std::string RepairChoices::reasonAgainstPreview()
 {
@@ -39,108 +119,49 @@ void RepairChoices::begin(Way way)
 {
     policy_ = {};
     policy_.*way = true;
-    at_.tabs.button(contract::outlet::repairDisk)->press();
+    press(contract::outlet::repairDisk);
     if (!at_.controller.interfaceLock())
         policy_ = {};
 }
 
 void RepairChoices::lockChanged(bool isLocked)
 {
-    if (isLocked)
-        runsInJob_ = 0;
-    else
+    if (!isLocked)
         policy_ = {};
 }
 
-void RepairChoices::runEnded(const StartedRun& run, const RunEnd& end)
+void RepairChoices::confirmUnproven()
 {
-    ++runsInJob_;
-    auto disk = at_.host.sharedDiskController().diskNamed(run.identifier);
-    const bool hasChoice = run.task == repairOfVolume && !policy_.isPreview && disk &&
-                           std::ranges::count(errorsWithAChoice, end.errorCode) != 0;
-    if (hasChoice)
-        offers_.push_back({std::move(disk), end.errorCode, end.message});
+    confirm("unprovenConfirmation",
+            "Apply the repair of “%@”, although it may leave damage?",
+            "The volume may stay damaged, and the repair may remove files, or parts of them, that "
+            "could still be read before. What it overwrites is kept, so it can be undone.",
+            "Apply Repair", &pellar::RepairPolicy::appliesUnproven);
 }
 
-void RepairChoices::offer()
+void RepairChoices::confirmDirect()
 {
-    if (closer_.isEnding())
-        offers_.clear();
-    if (offers_.empty() || at_.controller.interfaceLock())
+    confirm("directConfirmation", "Repair “%@” directly?",
+            "The checking tool then writes to the disk itself. That cannot be undone: what it "
+            "removes is gone, also where the repair fails or is stopped. Copy what matters to "
+            "another disk first.",
+            "Repair Directly", &pellar::RepairPolicy::isDirect);
+}
+
+void RepairChoices::confirm(const char* objectName, std::string_view question,
+                            std::string_view meaning, std::string_view answer, Way way)
+{
+    const auto disks = disks_.selected();
+    if (disks.size() != 1)
         return;
-    const Offer first = std::move(offers_.front());
-    offers_.pop_front();
-    const QMessageBox* const box = ask(at_.window, questionAbout(first));
-    QObject::connect(
-        box, &QDialog::finished, &at_.window, [this] { offer(); }, Qt::QueuedConnection);
-}
-
-Question RepairChoices::questionAbout(const Offer& offer)
-{
-    const auto disk = offer.disk;
-    if (offer.error == contract::kPLErrorNotProven)
-        return {"unprovenQuestion",
-                sentence("A repair was tried, and may leave damage. “%@” is as it was.", *disk),
-                offer.message,
-                {{text("Apply Anyway…"),
-                  [this, offer] {
-                      confirmUnproven(offer);
-                  }}},
-                text("Close")};
-    if (offer.error == contract::kPLErrorNotTried)
-        return {
-            "untriedQuestion",
-            sentence("The repair of “%@” could not be tried first, so nothing was written.", *disk),
-            offer.message,
-            {{text("Repair Directly…"),
-              [this, offer] {
-                  confirmDirect(offer);
-              }}},
-            text("Close")};
-    return {
-        "interruptedQuestion",
-        sentence("A repair of “%@” was interrupted, and only a part of it is written.", *disk),
-        text("Finishing it writes the rest. Undoing it puts back what it has overwritten. Until "
-             "then, the disk is neither as before nor repaired; do not use it."),
-        {{text("Finish Repair…"),
-          [this, disk] {
-              undo(*disk, pellar::Operation::Finish);
-          }},
-         {text("Undo Repair…"),
-          [this, disk] {
-              undo(*disk, pellar::Operation::Undo);
-          }}},
-        text("Close")};
-}
-
-void RepairChoices::confirmUnproven(const Offer& offer)
-{
-    ask(at_.window,
-        {"unprovenConfirmation",
-         sentence("Apply the repair of “%@”, although it may leave damage?", *offer.disk),
-         text(
-             "The volume may stay damaged, and the repair may remove files, or parts of them, that "
-             "could still be read before. What it overwrites is kept, so it can be undone."),
-         {{text("Apply Repair"),
-           [this, disk = offer.disk] {
-               repair(*disk, &pellar::RepairPolicy::appliesUnproven);
-           }}},
-         text("Cancel")});
-}
-
-void RepairChoices::confirmDirect(const Offer& offer)
-{
-    ask(at_.window,
-        {"directConfirmation",
-         sentence("Repair “%@” directly?", *offer.disk),
-         text("The checking tool then writes to the disk itself. That cannot be undone: what it "
-              "removes is gone, also where the repair fails or is stopped. Copy what matters to "
-              "another disk first."),
-         {{text("Repair Directly"),
-           [this, disk = offer.disk] {
-               repair(*disk, &pellar::RepairPolicy::isDirect);
-           }}},
-         text("Cancel")});
+    ask(at_.window, {objectName,
+                     sentence(question, disks.front()->displayName()),
+                     text(meaning),
+                     {{text(answer),
+                       [this, disk = disks.front(), way] {
+                           repair(*disk, way);
+                       }}},
+                     text("Cancel")});
 }
 
 void RepairChoices::repair(const Disk& disk, Way way)
@@ -150,15 +171,7 @@ void RepairChoices::repair(const Disk& disk, Way way)
         button->isEnabled())
         begin(way);
     else
-        at_.host.showSheet("", {sentence("“%@” cannot be repaired now.", disk)});
-}
-
-void RepairChoices::undo(const Disk& disk, pellar::Operation operation)
-{
-    if (disks_.selectOnly(disk))
-        undoing_.ask(operation);
-    else
-        at_.host.showSheet("", {sentence("“%@” is not in the list any more.", disk)});
+        at_.host.showSheet("", {sentence("“%@” cannot be repaired now.", disk.displayName())});
 }
 
 }  // namespace orvane::desktop

@@ -3,82 +3,81 @@
 
 #include "orvane/desktop/DiskPane.h"
 #include "orvane/desktop/ModuleTabs.h"
-#include "orvane/desktop/RepairUndoing.h"
-#include "orvane/desktop/WindowCloser.h"
 #include "orvane/desktop/window/Question.h"
 #include "pellar/jobs/JobOptions.h"
 
-#include <cstddef>
-#include <deque>
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 
 namespace orvane::desktop {
 
-/// What the user can choose about a repair beyond the module's button: to see what it would do,
-/// and, where it came to nothing, what to do instead. Main thread.
+/// Whether the user wants to be asked before a repair begins; until they say otherwise.
+[[nodiscard]] bool asksBeforeRepair(SupportHost& host);
+inline constexpr std::string_view asksBeforeRepairKey = "asksBeforeRepair";
+
+/// What the user can choose about a repair beyond the module's button: to hear first what will be
+/// written, to see what it would do, and, where it came to nothing, what to do instead. Main
+/// thread.
 class RepairChoices {
 public:
     /// All outlive this object. `policy` is what the library asks for as a job begins: other than
-    /// it was only for the length of a job that is begun here.
+    /// it was only for the length of a job that is begun here. `explainCopying` says how a disk
+    /// that cannot be read is copied.
     RepairChoices(const SessionParts& parts, DiskPane& disks, const KeptRepairs& kept,
-                  RepairUndoing& undoing, const WindowCloser& closer, pellar::RepairPolicy& policy)
+                  pellar::RepairPolicy& policy, std::function<void()> explainCopying)
         : at_(parts),
           disks_(disks),
           kept_(kept),
-          undoing_(undoing),
-          closer_(closer),
-          policy_(policy)
+          policy_(policy),
+          explainCopying_(std::move(explainCopying))
     {
     }
     RepairChoices(const RepairChoices&) = delete;
     RepairChoices& operator=(const RepairChoices&) = delete;
+
+    /// Whether the module may perform what its button asks for; where NO, the user is asked, and
+    /// may have it done.
+    [[nodiscard]] bool mayPerform(std::string_view action);
 
     /// Why no repair of what is selected can be previewed, in the user's language; empty when one
     /// can.
     std::string reasonAgainstPreview();
     void preview() { begin(&pellar::RepairPolicy::isPreview); }
 
+    // Of the one disk that is selected, after a repair that came to nothing: asks once more.
+
+    void confirmUnproven();
+    void confirmDirect();
+
     /// The window was locked for a job, or is free again.
     void lockChanged(bool isLocked);
-    /// As the ledger hears it.
-    void runEnded(const StartedRun& run, const RunEnd& end);
-    /// Whether what the module would say about the job at hand is said by `offer`.
-    bool saysMoreThanModule() const { return runsInJob_ == 1 && offers_.size() == 1; }
-    /// After a job: asks, for one disk after the other, what to do about a repair that came to
-    /// nothing.
-    void offer();
 
 private:
-    struct Offer {
-        std::shared_ptr<Disk> disk;
-        contract::ErrorCode error;
-        std::string message;  ///< of the run
-    };
-
     using Way = bool pellar::RepairPolicy::*;
 
     void begin(Way way);
-    Question questionAbout(const Offer& offer);
-    void confirmUnproven(const Offer& offer);
-    void confirmDirect(const Offer& offer);
+    void press(std::string_view button);
+    std::string meaningOfRepair(std::string_view action);
+    std::string nameOfSelection();
+    bool isUnreadable();
+    void askBeforeRepair(std::string_view action);
+    void confirm(const char* objectName, std::string_view question, std::string_view meaning,
+                 std::string_view answer, Way way);
     void repair(const Disk& disk, Way way);
-    void undo(const Disk& disk, pellar::Operation operation);
     std::string text(std::string_view key) const { return at_.host.translator().text(key); }
-    std::string sentence(std::string_view key, const Disk& disk) const
+    std::string sentence(std::string_view key, const std::string& name) const
     {
-        return at_.host.translator().sentence(key, {disk.displayName()});
+        return at_.host.translator().sentence(key, {name});
     }
 
     const SessionParts at_;
     DiskPane& disks_;
     const KeptRepairs& kept_;
-    RepairUndoing& undoing_;
-    const WindowCloser& closer_;
     pellar::RepairPolicy& policy_;
-    std::size_t runsInJob_ = 0;
-    std::deque<Offer> offers_;
+    const std::function<void()> explainCopying_;
+    bool isConfirmed_ = false;  ///< the press at hand
 };
 
 }  // namespace orvane::desktop

@@ -7,6 +7,7 @@
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QCheckBox>
 #include <QMenu>
 #include <QPushButton>
 
@@ -143,21 +144,17 @@ TEST_F(RepairTest, WhatIsNotProvenIsAppliedOnlyWhereTheUserSaysSoTwice)
     useFailingTool();
     open({image});
     run("repairDiskButton", image);
-    answer("unprovenQuestion", "Close");
-    EXPECT_EQ(sheet(), nullptr) << "said once, not by the module as well: " << takeSheet();
-    run("repairDiskButton");
-    answer("unprovenQuestion", "Apply Anyway…");
+    take(NextStep::ApplyUnproven);
     answer("unprovenConfirmation", "Cancel");
     EXPECT_TRUE(contentsOf(image) == before);
-    run("repairDiskButton");
-    answer("unprovenQuestion", "Apply Anyway…");
+    take(NextStep::ApplyUnproven);
     answer("unprovenConfirmation", "Apply Repair");
     ASSERT_TRUE(waitUntil([&] { return contentsOf(image).starts_with("changed"); }));
-    ASSERT_TRUE(waitUntil([&] { return sheet() != nullptr; })) << "damage is left";
-    takeSheet();
     ASSERT_TRUE(isFree());
+    EXPECT_TRUE(waitUntil([&] { return result() == "Damage is left after the repair."; }));
+    EXPECT_EQ(sheet(), nullptr) << "said once, not by the module as well: " << takeSheet();
     run("repairDiskButton");
-    answer("unprovenQuestion", "Close");  // that was for one repair
+    EXPECT_TRUE(waitForStep(NextStep::ApplyUnproven)) << "that was for one repair";
 }
 
 TEST_F(RepairTest, WhatCannotBeTriedIsRepairedDirectlyOnlyWhereTheUserSaysSo)
@@ -168,7 +165,7 @@ TEST_F(RepairTest, WhatCannotBeTriedIsRepairedDirectlyOnlyWhereTheUserSaysSo)
     directory_.write("state/repairs", "no directory");
     open({image});
     run("repairDiskButton", image);
-    answer("untriedQuestion", "Repair Directly…");
+    take(NextStep::RepairDirectly);
     EXPECT_TRUE(contentsOf(image) == before);
     answer("directConfirmation", "Repair Directly");
     EXPECT_TRUE(waitUntil([&] { return contentsOf(image).starts_with("changed"); }));
@@ -184,8 +181,8 @@ TEST_F(RepairTest, AnInterruptedRepairIsPointedOutAndLeadsBothWays)
             orvane::test::interruptRepair(image, directory_ / "state/repairs/records");
         open({image});
         EXPECT_EQ(details(image), "repair interrupted");
-        run("repairDiskButton", image);
-        answer("interruptedQuestion", isUndo ? "Undo Repair…" : "Finish Repair…");
+        select(image);
+        take(isUndo ? NextStep::Undo : NextStep::Finish);
         answer("undoQuestion", isUndo ? "Undo Repair" : "Finish Repair");
         ASSERT_TRUE(waitUntil([&] { return verdict(image) == (isUndo ? "undone" : "repaired"); }));
         EXPECT_TRUE(contentsOf(image) == (isUndo ? before : repaired));
@@ -194,6 +191,30 @@ TEST_F(RepairTest, AnInterruptedRepairIsPointedOutAndLeadsBothWays)
         EXPECT_EQ(sheet(), nullptr) << takeSheet();
         close();
     }
+}
+
+TEST_F(RepairTest, WhatWillBeWrittenIsSaidFirst)
+{
+    const std::string image = makeDamagedImage("damaged");
+    const std::string before = contentsOf(image);
+    asksFirst_ = true;
+    open({image});
+    select(image);
+    button("repairDiskButton").press();
+    answer("repairQuestion", "Cancel");
+    button("repairDiskButton").press();
+    answer("repairQuestion", "Preview");
+    ASSERT_TRUE(waitForStep(NextStep::Repair)) << result();
+    EXPECT_TRUE(contentsOf(image) == before);
+    take(NextStep::Repair);
+    ASSERT_TRUE(waitUntil([this] { return sheet() != nullptr; }));
+    sheet()->checkBox()->setChecked(false);
+    answer("repairQuestion", "Repair");
+    EXPECT_TRUE(waitForStep(NextStep::Undo)) << result();
+    EXPECT_EQ(verdict(image), "repaired");
+    button("repairDiskButton").press();
+    EXPECT_EQ(sheet(), nullptr) << "that was not wanted any more";
+    ASSERT_TRUE(isFree());
 }
 
 TEST_F(RepairTest, VerifyingThoroughlyIsKeptAndTriesARepair)

@@ -5,10 +5,12 @@
 #include "tests/support/TestDirectory.h"
 
 #include <QAbstractButton>
+#include <QPushButton>
 #include <QTest>
 
 #include <fcntl.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <cstdlib>
 #include <utility>
@@ -69,6 +71,7 @@ void WindowFixture::openWith(SessionOptions options)
 {
     wasClosed_ = false;
     session_ = std::make_unique<DesktopSession>(std::move(options));
+    session_->host().standardUserDefaults().setObjectForKey(asksFirst_, asksBeforeRepairKey);
     session_->show();
 }
 
@@ -169,6 +172,24 @@ bool WindowFixture::logHolds(const std::string& text)
 QAction& WindowFixture::command(const char* name)
 {
     return *window().findChild<QAction*>(QLatin1String(name));
+}
+
+std::string WindowFixture::result()
+{
+    return window().banner().summary().title;
+}
+
+bool WindowFixture::waitForStep(NextStep step)
+{
+    return waitUntil([&] { return std::ranges::count(window().banner().summary().steps, step) != 0; });
+}
+
+void WindowFixture::take(NextStep step)
+{
+    ASSERT_TRUE(waitForStep(step)) << result();
+    auto* const button = window().banner().findChild<QPushButton*>(
+        QStringLiteral("step%1").arg(static_cast<int>(step)));
+    QTest::mouseClick(button, Qt::LeftButton);
 }
 
 QMessageBox* WindowFixture::sheet()

@@ -53,6 +53,11 @@ protected:
     QModelIndex row(const std::string& image);
     std::string verdict(const std::string& image) { return cell(image, DiskColumn::Verdict); }
     QAction& command(const char* name);
+    /// What the banner says about the last job on what is selected.
+    std::string result();
+    /// Until the banner offers this.
+    [[nodiscard]] bool waitForStep(NextStep step);
+    void take(NextStep step);
     /// The sheet that is open; none when there is none.
     QMessageBox* sheet();
     /// What it says; also closes it.
@@ -64,6 +69,7 @@ protected:
 
     orvane::test::TestDirectory directory_;
     bool wasClosed_ = false;
+    bool asksFirst_ = false;  ///< before a repair
     std::unique_ptr<DesktopSession> session_;
 
 private:

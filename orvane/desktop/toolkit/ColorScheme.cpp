@@ -75,6 +75,15 @@ QColor readableOn(const QColor& background, const QColor& wanted)
     return darkens ? Qt::black : Qt::white;
 }
 
+QColor mixedColor(const QColor& a, const QColor& b, double share)
+{
+    const auto between = [share](double from, double to) {
+        return static_cast<float>(from + (to - from) * share);
+    };
+    return QColor::fromRgbF(between(a.redF(), b.redF()), between(a.greenF(), b.greenF()),
+                            between(a.blueF(), b.blueF()));
+}
+
 QPalette darkPalette()
 {
     QPalette palette(QColor(0x4a, 0x4a, 0x4a), QColor(0x38, 0x38, 0x38));

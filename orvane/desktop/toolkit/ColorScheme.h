@@ -18,6 +18,9 @@ double contrastRatio(const QColor& a, const QColor& b);
 /// `wanted`, or the nearest lighter or darker colour of its hue that is readable on `background`.
 QColor readableOn(const QColor& background, const QColor& wanted);
 
+/// `share` of the way from `a` to `b`.
+QColor mixedColor(const QColor& a, const QColor& b, double share);
+
 /// Light text on dark ground, for the style "Fusion".
 [[nodiscard]] QPalette darkPalette();
 

@@ -158,9 +158,8 @@ void LoadedInterface::adoptButtons()
 {
     for (QAbstractButton* widget : root_->findChildren<QAbstractButton*>()) {
         auto button = std::make_unique<QtButton>(*widget, [this](QtButton& sender) {
-            if (beforeAction_)
-                beforeAction_(sender.action());
-            if (owner_ != nullptr)
+            const bool mayPerform = !mayPerform_ || mayPerform_(sender.action());
+            if (owner_ != nullptr && mayPerform)
                 owner_->perform(sender.action(), &sender);
         });
         const std::string action = fromQt(widget->property(actionProperty).toString());
@@ -237,6 +236,13 @@ void LoadedInterface::limitSplitView()
         pane.setMinimumWidth(least);
         pane.setMaximumWidth(most);
     }
+}
+
+void LoadedInterface::setCompact(bool isCompact)
+{
+    auto* const splitter = root_->findChild<QSplitter*>();
+    if (splitter != nullptr && splitter->count() > 1)
+        splitter->widget(0)->setVisible(!isCompact);
 }
 
 QtButton* LoadedInterface::button(std::string_view name)

@@ -35,11 +35,14 @@ public:
     QWidget& widget() { return *root_; }
     /// None when the file has no button of that name.
     QtButton* button(std::string_view name);
-    /// Told of every action before the module performs it.
-    void setBeforeAction(std::function<void(std::string_view action)> told)
+    /// Asked before the module performs an action of the user's; where it answers NO, nothing
+    /// happens.
+    void setMayPerform(std::function<bool(std::string_view action)> asked)
     {
-        beforeAction_ = std::move(told);
+        mayPerform_ = std::move(asked);
     }
+    /// Where there is little room, the instructions give theirs to the log.
+    void setCompact(bool isCompact);
     /// The module's view of its log, for the menus: copy, select all, delete, validation. None
     /// when the file has none, and after the module has gone.
     contract::OutlineView* outlineView() { return outlineView_.get(); }
@@ -62,7 +65,7 @@ private:
     QPointer<QWidget> root_;
     contract::InterfaceOwner* owner_;
     const std::function<void()>& beforeRows_;
-    std::function<void(std::string_view action)> beforeAction_;
+    std::function<bool(std::string_view action)> mayPerform_;
     std::map<std::string, std::unique_ptr<QtButton>, std::less<>> buttons_;
     std::vector<std::unique_ptr<contract::View>> texts_;
     std::unique_ptr<OutlinePeer> peer_;

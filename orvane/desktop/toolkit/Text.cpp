@@ -75,6 +75,11 @@ QString toQt(std::string_view text)
     return QString::fromUtf8(text.data(), static_cast<qsizetype>(text.size()));
 }
 
+QString toQtLine(std::string_view text)
+{
+    return toQt(contract::printable(text));
+}
+
 std::string fromQt(const QString& text)
 {
     return text.toStdString();

@@ -17,6 +17,8 @@ namespace orvane::desktop {
 /// format is Qt::PlainText.
 QString toQt(std::string_view text);
 std::string fromQt(const QString& text);
+/// One line of what stands on a disk, fit to be shown: without control characters.
+QString toQtLine(std::string_view text);
 
 /// A title for a button or menu, where Qt takes an ampersand for the mark of a shortcut.
 QString toQtTitle(std::string_view title);

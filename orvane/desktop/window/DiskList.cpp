@@ -196,7 +196,7 @@ void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged
             });
 }
 
-std::vector<DiskList::DiskPointer> DiskList::selectedDisks() const
+QModelIndexList DiskList::selectionInOrder() const
 {
     if (selectionModel() == nullptr)
         return {};
@@ -210,15 +210,37 @@ std::vector<DiskList::DiskPointer> DiskList::selectedDisks() const
     };
     std::sort(rows.begin(), rows.end(),
               [&](const QModelIndex& a, const QModelIndex& b) { return path(a) < path(b); });
+    return rows;
+}
+
+std::vector<DiskList::DiskPointer> DiskList::selectedDisks() const
+{
     std::vector<DiskPointer> disks;
-    for (const QModelIndex& row : rows)
+    for (const QModelIndex& row : selectionInOrder())
         disks.push_back(disks_->diskAt(row));
     return disks;
 }
 
+std::vector<DiskRow> DiskList::selectedRows() const
+{
+    std::vector<DiskRow> rows;
+    for (const QModelIndex& row : selectionInOrder())
+        rows.push_back(disks_->rowAt(row));
+    return rows;
+}
+
+std::vector<DiskRow> DiskList::rowsBelow(const DiskRow& row) const
+{
+    std::vector<DiskRow> rows;
+    const QModelIndex top = disks_ != nullptr ? disks_->indexOf(row.facts.identifier) : QModelIndex();
+    for (int i = 0; top.isValid() && i < disks_->rowCount(top); ++i)
+        rows.push_back(disks_->rowAt(disks_->index(i, 0, top)));
+    return rows;
+}
+
 void DiskList::select(const Disk& disk)
 {
-    const QModelIndex row = disks_ != nullptr ? disks_->indexOf(disk) : QModelIndex();
+    const QModelIndex row = disks_ != nullptr ? disks_->indexOf(disk.facts().identifier) : QModelIndex();
     if (row.isValid())
         setCurrentIndex(row);
 }

@@ -23,12 +23,18 @@ public:
 
     /// In the list's order, each once.
     std::vector<DiskPointer> selectedDisks() const;
+    /// What is shown of them, in the same order.
+    std::vector<DiskRow> selectedRows() const;
+    /// What is shown of the disks inside a disk of the list.
+    std::vector<DiskRow> rowsBelow(const DiskRow& row) const;
     /// Selects this disk alone, and brings it into sight.
     void select(const Disk& disk);
     /// Has rows taken in and out without telling of the selection.
     void synchronize();
 
 private:
+    QModelIndexList selectionInOrder() const;
+
     DiskTreeModel* disks_ = nullptr;
     bool isSynchronizing_ = false;
 };

@@ -101,11 +101,6 @@ Drawing sign(const QColor& color, const QPolygonF& strokes)
     };
 }
 
-QString shown(const std::string& text)
-{
-    return toQt(contract::printable(text));
-}
-
 std::string_view kindText(std::int32_t type)
 {
     switch (type) {
@@ -119,35 +114,9 @@ std::string_view kindText(std::int32_t type)
     }
 }
 
-/// As the log names it, by its label, and with the file or the device that bears it.
-QString nameText(const DiskRow& row)
-{
-    const DiskFacts& facts = row.facts;
-    const QString file = shown(facts.path.filename().native());
-    const QString label = shown(row.label);
-    const bool isInImage = facts.storage == contract::DiskReference::Storage::FileRegion &&
-                           facts.type != diskType::diskImage;
-    if (!label.isEmpty() && !isInImage && !file.isEmpty())
-        return label + QStringLiteral(" (") + file + QLatin1Char(')');
-    const QString name = shown(facts.name);
-    return name.isEmpty() ? file : name;
-}
-
-QString sizeText(std::uint64_t bytes)
-{
-    if (bytes == 0)
-        return {};
-    return QLocale().formattedDataSize(static_cast<qint64>(bytes), 1, QLocale::DataSizeIecFormat);
-}
-
 QString timeText(const QDateTime& time)
 {
     return QLocale().toString(time, QLocale::ShortFormat);
-}
-
-QString verdictText(const Check& check, const Translator& texts)
-{
-    return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
 }
 
 /// "11/22/26 2:08 AM, then stopped"
@@ -170,17 +139,55 @@ QStringList toolTipOfCheck(const LastCheck& check, const Translator& texts)
     lines += toQt(texts.sentence("last checked %@: %@", {fromQt(timeText(check.told.started)),
                                                          fromQt(verdictText(check.told, texts))}));
     if (!check.told.message.empty())
-        lines += shown(check.told.message);
+        lines += toQtLine(check.told.message);
     if (!check.later)
         return lines;
     lines += toQt(texts.sentence("after that, %@: %@", {fromQt(timeText(check.later->started)),
                                                         fromQt(verdictText(*check.later, texts))}));
     if (!check.later->message.empty())
-        lines += shown(check.later->message);
+        lines += toQtLine(check.later->message);
     return lines;
 }
 
 }  // namespace
+
+DiskNames namesOf(const DiskRow& row)
+{
+    const DiskFacts& facts = row.facts;
+    const QString file = toQtLine(facts.path.filename().native());
+    const QString label = toQtLine(row.label);
+    const bool isInImage = facts.storage == contract::DiskReference::Storage::FileRegion &&
+                           facts.type != diskType::diskImage;
+    if (!label.isEmpty() && !isInImage && !file.isEmpty())
+        return {label, file};
+    const QString name = toQtLine(facts.name);
+    return {name.isEmpty() ? file : name, {}};
+}
+
+QString nameText(const DiskRow& row)
+{
+    const DiskNames names = namesOf(row);
+    return names.bearer.isEmpty() ? names.name
+                                  : names.name + QStringLiteral(" (") + names.bearer + QLatin1Char(')');
+}
+
+QString formatText(const DiskRow& row, const Translator& texts)
+{
+    return row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
+                                  : toQtLine(row.filesystem);
+}
+
+QString sizeText(std::uint64_t bytes)
+{
+    if (bytes == 0)
+        return {};
+    return QLocale().formattedDataSize(static_cast<qint64>(bytes), 1, QLocale::DataSizeIecFormat);
+}
+
+QString verdictText(const Check& check, const Translator& texts)
+{
+    return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
+}
 
 QIcon diskIcon(const DiskFacts& facts)
 {
@@ -215,7 +222,7 @@ QIcon verdictIcon(std::string_view verdict)
 QString stateText(const DiskRow& row, const Translator& texts)
 {
     if (!row.activity.empty())
-        return shown(row.activity);
+        return toQtLine(row.activity);
     if (!row.lastCheck)
         return {};
     return row.lastCheck->isPartial ? toQt(texts.text("partly checked"))
@@ -227,8 +234,8 @@ QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts)
     switch (column) {
         case DiskColumn::Name: return nameText(row);
         case DiskColumn::Size: return sizeText(row.facts.length);
-        case DiskColumn::Format: return shown(row.filesystem);
-        case DiskColumn::MountPoint: return shown(row.facts.mountPoint);
+        case DiskColumn::Format: return toQtLine(row.filesystem);
+        case DiskColumn::MountPoint: return toQtLine(row.facts.mountPoint);
         case DiskColumn::Verdict: return stateText(row, texts);
         case DiskColumn::LastCheck:
             return row.lastCheck ? lastCheckText(*row.lastCheck, texts) : QString();
@@ -256,9 +263,8 @@ QString rowDetails(const DiskRow& row, const Translator& texts)
 {
     // There is room for a few words.
     if (!row.note.empty())
-        return shown(row.note);
-    QStringList parts{row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
-                                             : shown(row.filesystem)};
+        return toQtLine(row.note);
+    QStringList parts{formatText(row, texts)};
     if (row.facts.length != 0)
         parts += sizeText(row.facts.length);
     if (!row.facts.mountPoint.empty())
@@ -282,18 +288,18 @@ QString rowSummary(const DiskRow& row, const Translator& texts)
 
 QString rowToolTip(const DiskRow& row, const Translator& texts)
 {
-    QStringList lines{nameText(row), shown(row.facts.path.native()),
+    QStringList lines{nameText(row), toQtLine(row.facts.path.native()),
                       toQt(texts.text(kindText(row.facts.type)))};
     if (row.facts.length != 0)
         lines.back() += QStringLiteral(", ") + sizeText(row.facts.length);
     if (!row.filesystem.empty())
-        lines.back() += QStringLiteral(", ") + shown(row.filesystem);
+        lines.back() += QStringLiteral(", ") + toQtLine(row.filesystem);
     if (!row.facts.mountPoint.empty())
         lines += toQt(texts.sentence("mounted at %@", {contract::printable(row.facts.mountPoint)}));
     if (!row.note.empty())
-        lines += shown(row.note);
+        lines += toQtLine(row.note);
     if (!row.activity.empty())
-        lines += shown(row.activity);
+        lines += toQtLine(row.activity);
     if (row.lastCheck)
         lines += toolTipOfCheck(*row.lastCheck, texts);
     else if (row.activity.empty())

@@ -9,6 +9,7 @@
 #include <QIcon>
 #include <QString>
 
+#include <cstdint>
 #include <functional>
 #include <optional>
 #include <string>
@@ -21,6 +22,8 @@ struct Check {
     std::string verdict;  ///< one of the library's verdicts; empty when it was cut off
     std::string message;  ///< one sentence; may be empty
     QDateTime started;
+    std::string action = {};     ///< the name of the library's task
+    std::int32_t errorCode = 0;  ///< of the library
 };
 
 /// What is kept of the last actions on a disk, or on the part of it that is worst off.
@@ -62,6 +65,21 @@ struct DiskRow {
     std::string activity = {};  ///< as of DiskStates
     std::string note = {};
 };
+
+/// As the log names it, by its label, and with the file or the device that bears it.
+[[nodiscard]] QString nameText(const DiskRow& row);
+/// The name alone; with its file or device in a second one, where they differ.
+struct DiskNames {
+    QString name;
+    QString bearer;  ///< empty where it is the name
+};
+[[nodiscard]] DiskNames namesOf(const DiskRow& row);
+/// In binary units; empty for 0.
+[[nodiscard]] QString sizeText(std::uint64_t bytes);
+/// "ext4", or the kind of disk where there is no file system.
+[[nodiscard]] QString formatText(const DiskRow& row, const Translator& texts);
+/// "damaged"; "cut off" where there is none.
+[[nodiscard]] QString verdictText(const Check& check, const Translator& texts);
 
 /// One line, fit to be shown; empty where there is nothing to say.
 [[nodiscard]] QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts);

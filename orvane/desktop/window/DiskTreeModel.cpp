@@ -102,6 +102,7 @@ DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
     if (const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr) {
         row.label = contents->facts().label;
         row.filesystem = contents->facts().filesystem;
+        row.facts.space = contents->facts().space;
     }
     return row;
 }
@@ -209,9 +210,14 @@ DiskTreeModel::DiskPointer DiskTreeModel::diskAt(const QModelIndex& index) const
     return nodeAt(index).disk;
 }
 
-QModelIndex DiskTreeModel::indexOf(const Disk& disk) const
+const DiskRow& DiskTreeModel::rowAt(const QModelIndex& index) const
 {
-    const QModelIndexList found = match(index(0, 0), Qt::UserRole, toQt(disk.facts().identifier), 1,
+    return nodeAt(index).row;
+}
+
+QModelIndex DiskTreeModel::indexOf(const std::string& identifier) const
+{
+    const QModelIndexList found = match(index(0, 0), Qt::UserRole, toQt(identifier), 1,
                                         Qt::MatchExactly | Qt::MatchRecursive | Qt::MatchWrap);
     return found.isEmpty() ? QModelIndex() : found.front();
 }

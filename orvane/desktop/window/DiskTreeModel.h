@@ -27,10 +27,12 @@ public:
     /// Rows that stay keep their selection.
     void synchronize();
 
+    /// What is shown of it.
+    const DiskRow& rowAt(const QModelIndex& index) const;
     /// None for no row.
     DiskPointer diskAt(const QModelIndex& index) const;
     /// The row that shows the disk; invalid when there is none.
-    QModelIndex indexOf(const Disk& disk) const;
+    QModelIndex indexOf(const std::string& identifier) const;
 
     QModelIndex index(int row, int column, const QModelIndex& parent = {}) const override;
     QModelIndex parent(const QModelIndex& child) const override;

@@ -47,17 +47,13 @@ constexpr std::string_view splitterKey = "MainWindow.splitter";
 ProgressArea::ProgressArea(const Translator& texts, QWidget* parent)
     : QWidget(parent),
       bar_(new QProgressBar(this)),
-      label_(new QLabel(this)),
+      label_(new ElidedLabel(this)),
       stopButton_(new QPushButton(toQtTitle(texts.text("Stop")), this))
 {
     bar_->setObjectName(QStringLiteral("progressBar"));
     bar_->setAccessibleName(toQt(texts.text("Progress")));
     bar_->setTextVisible(false);
     label_->setObjectName(QStringLiteral("statusLine"));
-    label_->setTextFormat(Qt::PlainText);
-    label_->setTextInteractionFlags(Qt::TextSelectableByMouse);
-    label_->setMinimumWidth(1);
-    label_->setSizePolicy(QSizePolicy::Ignored, QSizePolicy::Fixed);
     stopButton_->setObjectName(QStringLiteral("stopButton"));
     connect(stopButton_, &QPushButton::clicked, this, [this] { stop_(); });
 
@@ -111,14 +107,7 @@ void ProgressArea::showRange()
 
 void ProgressArea::setText(std::string_view text)
 {
-    text_ = toQt(contract::printable(text));
-    showText();
-}
-
-void ProgressArea::showText()
-{
-    label_->setText(label_->fontMetrics().elidedText(text_, Qt::ElideMiddle, label_->width()));
-    label_->setToolTip(toQtToolTip(fromQt(text_)));
+    label_->setFullText(toQtLine(text));
 }
 
 void ProgressArea::setStop(std::function<void()> stop)
@@ -127,14 +116,11 @@ void ProgressArea::setStop(std::function<void()> stop)
     stopButton_->setVisible(static_cast<bool>(stop_));
 }
 
-void ProgressArea::resizeEvent(QResizeEvent* event)
-{
-    QWidget::resizeEvent(event);
-    showText();
-}
-
 MainWindow::MainWindow(const Translator& texts)
-    : disks_(new DiskList(texts)),
+    : commands_(new CommandBar(texts, this)),
+      disks_(new DiskList(texts)),
+      header_(new DiskHeader),
+      banner_(new ResultBanner(texts)),
       tabs_(new QTabWidget),
       splitter_(new QSplitter(Qt::Horizontal)),
       progress_(new ProgressArea(texts, this))
@@ -144,10 +130,20 @@ MainWindow::MainWindow(const Translator& texts)
     setAcceptDrops(true);
     resize(firstSize);
 
+    addToolBar(commands_);
+    setContextMenuPolicy(Qt::NoContextMenu);
     tabs_->setDocumentMode(true);
+    tabs_->setTabBarAutoHide(true);
     tabs_->setAccessibleName(toQt(texts.text("What can be done")));
+    auto* const work = new QWidget(this);
+    auto* const rows = new QVBoxLayout(work);
+    rows->setContentsMargins(0, 0, 0, 0);
+    rows->setSpacing(0);
+    rows->addWidget(header_);
+    rows->addWidget(banner_);
+    rows->addWidget(tabs_, 1);
     splitter_->addWidget(disks_);
-    splitter_->addWidget(tabs_);
+    splitter_->addWidget(work);
     splitter_->setChildrenCollapsible(false);
     splitter_->setStretchFactor(0, 2);
     splitter_->setStretchFactor(1, 3);
@@ -221,6 +217,28 @@ void MainWindow::paintEvent(QPaintEvent* event)
         if (events_.appeared)
             events_.appeared();
     });
+}
+
+void MainWindow::resizeEvent(QResizeEvent* event)
+{
+    QMainWindow::resizeEvent(event);
+    adoptRoom();
+}
+
+// Measured in lines of text, for a large font takes the same room as a small window.
+void MainWindow::adoptRoom()
+{
+    constexpr int roomyHeight = 30;  // lines
+    constexpr int roomyWidth = 110;  // characters
+    const QFontMetrics metrics = fontMetrics();
+    const bool isCompact = height() < roomyHeight * metrics.height();
+    commands_->setCompact(width() < roomyWidth * metrics.averageCharWidth());
+    if (std::exchange(isCompact_, isCompact) == isCompact)
+        return;
+    header_->setCompact(isCompact);
+    banner_->setCompact(isCompact);
+    if (events_.roomChanged)
+        events_.roomChanged(isCompact);
 }
 
 void MainWindow::restoreLayout(const contract::UserDefaults& settings)

@@ -2,9 +2,12 @@
 #pragma once
 
 #include "contract/support/OVPreferences.h"
+#include "orvane/desktop/window/CommandBar.h"
+#include "orvane/desktop/window/DiskHeader.h"
 #include "orvane/desktop/window/DiskList.h"
+#include "orvane/desktop/window/ElidedLabel.h"
+#include "orvane/desktop/window/ResultBanner.h"
 
-#include <QLabel>
 #include <QMainWindow>
 #include <QProgressBar>
 #include <QPushButton>
@@ -33,28 +36,24 @@ public:
     void setPercent(double percent);
     /// Any bytes; shown as one line of plain text.
     void setText(std::string_view text);
-    QString text() const { return text_; }
+    QString text() const { return label_->fullText(); }
     /// Shows the Stop button, which calls this with every press; hides it when empty.
     void setStop(std::function<void()> stop);
 
-protected:
-    void resizeEvent(QResizeEvent* event) override;
-
 private:
-    void showText();
     void showRange();
 
     QProgressBar* bar_;
-    QLabel* label_;
+    ElidedLabel* label_;
     QPushButton* stopButton_;
     std::function<void()> stop_;
-    QString text_;
     bool isBarActive_ = false;
     bool isIndeterminate_ = true;
     int tenths_ = 0;
 };
 
-/// The host's window: the disks on the left, the modules' tabs on the right, progress below.
+/// The host's window: commands at the top, the disks on the left, on the right what is selected,
+/// what came out of the last job on it, and the modules' tabs; progress below.
 /// Knows how they lie, not what they do. Main thread.
 class MainWindow final : public QMainWindow {
 public:
@@ -68,6 +67,8 @@ public:
         std::function<void()> changed;
         /// The window was painted for the first time.
         std::function<void()> appeared;
+        /// There is little room now, or there is more again.
+        std::function<void(bool isCompact)> roomChanged;
     };
 
     /// `texts` must outlive the window.
@@ -77,6 +78,9 @@ public:
     DiskList& disks() { return *disks_; }
     const DiskList& disks() const { return *disks_; }
     QTabWidget& tabs() { return *tabs_; }
+    CommandBar& commands() { return *commands_; }
+    DiskHeader& header() { return *header_; }
+    ResultBanner& banner() { return *banner_; }
     QSplitter& splitter() { return *splitter_; }
     ProgressArea& progress() { return *progress_; }
 
@@ -96,15 +100,21 @@ protected:
     void dragEnterEvent(QDragEnterEvent* event) override;
     void dropEvent(QDropEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
 
 private:
     void tellOfChange();
+    void adoptRoom();
 
     Events events_;
+    CommandBar* commands_;
     DiskList* disks_;
+    DiskHeader* header_;
+    ResultBanner* banner_;
     QTabWidget* tabs_;
     QSplitter* splitter_;
     ProgressArea* progress_;
+    bool isCompact_ = false;
     bool hadAttention_ = true;
     bool hasAppeared_ = false;
 };

@@ -2,9 +2,11 @@
 #pragma once
 
 #include "contract/pellar/DiskReference.h"
+#include "pellar/probe/SpaceUse.h"
 
 #include <cstdint>
 #include <filesystem>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -43,6 +45,9 @@ struct DiskFacts : contract::DiskReference {
 
     std::string label = {};
     std::string uuid = {};  ///< of the file system
+    /// Of a volume, as it says itself; none where it does not, or cannot be read.
+    std::optional<pellar::SpaceUse> space = {};
+    std::string model = {};  ///< of the drive, of a whole disk; empty when it is not known
 
     bool isWritable = true;
     bool isBootVolume = false;

@@ -78,6 +78,7 @@ Superblock superblockFromUdev(const std::string& number, const DiskSources& sour
 struct Contents {
     Superblock superblock;
     std::optional<PartitionTable> table;
+    std::optional<pellar::SpaceUse> space = {};
     bool hasExtBackup = false;
     bool hasTableTraces = false;
     bool hasBootSector = false;  ///< and what looks like a table is nothing else
@@ -90,9 +91,12 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
     if (!device)
         return {superblockFromUdev(number, sources), {}};
     const ByteRange all{0, size};
-    Contents contents{readSuperblock(device.get(), all), readPartitionTable(device.get()),
+    Contents contents{readSuperblock(device.get(), all),
+                      readPartitionTable(device.get()),
+                      {},
                       hasExtBackupSuperblock(device.get(), all),
                       hasPartitionTableTraces(device.get())};
+    contents.space = pellar::spaceUseOf(device.get(), all, contents.superblock.type);
     contents.hasBootSector =
         contents.table && isBootSector(device.get(), *contents.table, contents.superblock);
     return contents;
@@ -124,6 +128,7 @@ void addMount(DiskFacts& facts, const std::string& number, const DiskSources& so
     if (!mount)
         return;
     facts.mountPoint = mount->target;
+    facts.space = pellar::spaceUseOfMount(mount->target.c_str());
     if (facts.filesystem.empty())
         facts.filesystem = filesystemOf(*mount);
     facts.isWritable = facts.isWritable && !mount->isReadOnly;
@@ -143,6 +148,7 @@ void addSuperblock(DiskFacts& facts, const Contents& contents)
     else if (superblock.type.empty() && contents.hasExtBackup)
         facts.filesystem = "ext4";
     facts.label = superblock.label;
+    facts.space = contents.space;
     facts.uuid = superblock.isFilesystem() ? superblock.uuid : std::string();
     if (!facts.label.empty())
         facts.name = facts.label;
@@ -225,6 +231,7 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
     const std::string number = attribute(device, "dev");
     DiskFacts facts = baseFacts(device, sources.dev / device.filename());
     facts.name = nameOfWhole(device);
+    facts.model = attribute(device, "device/model");
     facts.isEjectable = isEjectable(device);
     const Contents contents = contentsOf(facts.path, number, facts.length, sources);
     DiskTree tree;

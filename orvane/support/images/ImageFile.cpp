@@ -69,6 +69,7 @@ ImageVolume readVolume(const OpenImage& image, Partition partition)
     if (!partition.isContainer) {
         volume.superblock = readSuperblock(image.descriptor.get(), there);
         volume.hasExtBackup = hasExtBackupSuperblock(image.descriptor.get(), there);
+        volume.space = pellar::spaceUseOf(image.descriptor.get(), there, volume.superblock.type);
     }
     volume.partition = std::move(partition);
     return volume;
@@ -152,6 +153,7 @@ void addVolume(DiskFacts& facts, const ImageVolume& volume, std::string nameWith
 {
     facts.filesystem = volume.filesystem();
     facts.label = volume.superblock.label;
+    facts.space = volume.space;
     if (volume.superblock.isFilesystem())
         facts.uuid = volume.superblock.uuid;
     facts.name = facts.label.empty() ? std::move(nameWithoutLabel) : facts.label;

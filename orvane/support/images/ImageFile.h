@@ -32,6 +32,7 @@ struct ImageVolume {
     Partition partition;  ///< of a bare volume: number 0, the whole file
     Superblock superblock;
     bool hasExtBackup = false;
+    std::optional<pellar::SpaceUse> space = {};
 
     /// The file system's type, also where only a backup superblock tells of one; else empty.
     std::string filesystem() const;
