@@ -115,11 +115,11 @@ RepairAdvice DesktopSession::repairAdvice()
     RepairAdvice all;
     all.undo = advice("To take the repair back, choose Undo Repair in the Disk menu.");
     all.apply =
-        advice("“Apply Anyway”, in the question that follows a repair, applies it although it may "
-               "leave damage. That can be undone as well.");
+        advice("“Apply Anyway”, above this log, applies it although it may leave damage. That can "
+               "be undone as well.");
     all.repairDirectly =
-        advice("“Repair Directly”, in the question that follows a repair, lets the tool write to "
-               "the disk itself. That cannot be undone.");
+        advice("“Repair Directly”, above this log, lets the tool write to the disk itself. That "
+               "cannot be undone.");
     return all;
 }
 
@@ -129,8 +129,9 @@ JobLedger::Events DesktopSession::ledgerEvents()
                 jobs_.runBegan(run);
             },
             [this](const StartedRun& run, const RunEnd& end) { runEnded(run, end); },
-            [this] {
-                jobs_.stopAsked();
+            [this] { jobs_.stopAsked(); },
+            [this](const StartedRun& run) {
+                jobs_.runProgressed(run);
             }};
 }
 
@@ -179,8 +180,9 @@ void DesktopSession::connectWindow()
         [this](bool isCompact) { tabs_.setCompact(isCompact); },
     });
     controller_.setEvents({[this](bool isLocked) { lockChanged(isLocked); },
-                           [this](const contract::Dictionary& report) {
-                               jobs_.reported(report);
+                           [this](const contract::Dictionary& report) { jobs_.reported(report); },
+                           [this](std::string_view text) {
+                               return jobs_.statusText(text);
                            }});
 }
 

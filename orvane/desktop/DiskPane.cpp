@@ -197,8 +197,9 @@ DiskStates DiskPane::states()
 {
     return {[this](const Disk& disk) { return lastCheckOf(disk); },
             [this](const Disk& disk) { return activityOn(disk); },
-            [this](const Disk& disk) {
-                return noteOn(disk);
+            [this](const Disk& disk) { return noteOn(disk); },
+            [this] {
+                return ledger_.currentRun() != nullptr ? ledger_.currentRun()->percent : 0;
             }};
 }
 

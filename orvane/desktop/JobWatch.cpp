@@ -2,13 +2,46 @@
 #include "orvane/desktop/JobWatch.h"
 
 #include "contract/foundation/UTF8.h"
+#include "contract/pellar/ErrorCodes.h"
+#include "orvane/desktop/toolkit/Text.h"
 #include "orvane/jobs/UnavailableReason.h"
 
 #include <QApplication>
 
+#include <algorithm>
 #include <utility>
 
 namespace orvane::desktop {
+namespace {
+
+using pellar::Operation;
+using pellar::Subject;
+
+std::string_view statusKey(pellar::Task task)
+{
+    const bool isOfPermissions = task.subject == Subject::Permissions;
+    const bool isOfMap = task.subject == Subject::PartitionMap;
+    switch (task.operation) {
+        case Operation::Verify:
+            return isOfPermissions ? "Verifying permissions on “%@”"
+                   : isOfMap       ? "Verifying the partition map of “%@”"
+                                   : "Verifying “%@”";
+        case Operation::Undo: return "Undoing the repair of “%@”";
+        case Operation::Finish: return "Finishing the repair of “%@”";
+        case Operation::Repair: break;
+    }
+    return isOfPermissions ? "Repairing permissions on “%@”"
+           : isOfMap       ? "Repairing the partition map of “%@”"
+                           : "Repairing “%@”";
+}
+
+/// Whether the run is about the disk, or about what is in it.
+bool isAbout(const std::string& run, const std::string& disk)
+{
+    return run == disk || run.starts_with(disk + "#");
+}
+
+}  // namespace
 
 JobWatch::JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& closer,
                    const SessionBuses& buses, std::chrono::milliseconds glance,
@@ -24,7 +57,8 @@ JobWatch::JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& clo
                      window.setWindowState(window.windowState() & ~Qt::WindowMinimized);
                      window.raise();
                      window.activateWindow();
-                 }})
+                 }}),
+      taskBar_(buses.session, desktopEntry)
 {
 }
 
@@ -57,11 +91,66 @@ void JobWatch::runBegan(const StartedRun& run)
     else
         wakefulness_.release();
     job_.reached.insert(run.identifier);
+    job_.estimator = at_.host.makeTimeEstimator();
+    job_.estimator->setStartTimeWithPercentComplete(at_.host.threads().now(), 0);
     disks_.list().synchronize();
     if (closer_.isEnding())
         closer_.stopAndClose();
     else if (job_.isStopAsked)
         at_.host.mainRunLoop().post([this] { at_.tabs.stopJob(); });
+}
+
+void JobWatch::runProgressed(const StartedRun& run)
+{
+    disks_.list().showProgress();
+    at_.window.progress().setText(statusText(""));
+    showProgress(run.percent);
+}
+
+// What a program's window and its place in the task bar show.
+void JobWatch::showProgress(std::optional<double> percent)
+{
+    const QString name = QApplication::applicationDisplayName();
+    at_.window.setWindowTitle(percent ? QStringLiteral("%1 – %2").arg(
+                                            toQt(percentText(*percent, at_.host.translator())),
+                                            name)
+                                      : name);
+    taskBar_.show(percent);
+}
+
+/// "2 of 9, big.img"
+std::string JobWatch::placeOf(const StartedRun& run)
+{
+    const auto found = std::ranges::find_if(job_.disks, [&](const auto& disk) {
+        return isAbout(run.identifier, disk->facts().identifier);
+    });
+    std::string place;
+    if (job_.disks.size() > 1 && found != job_.disks.end())
+        place = at_.host.translator().sentence(
+            "%ld of %ld", {static_cast<long>(found - job_.disks.begin()) + 1,
+                           static_cast<long>(job_.disks.size())});
+    const auto disk = at_.host.sharedDiskController().diskNamed(run.identifier);
+    const std::string bearer = disk ? disk->facts().path.filename().native() : std::string();
+    if (!bearer.empty() && bearer != run.disk)
+        place += (place.empty() ? "" : ", ") + contract::printable(bearer);
+    return place;
+}
+
+std::string JobWatch::statusText(std::string_view moduleText)
+{
+    const StartedRun* const run = at_.ledger.currentRun();
+    if (run == nullptr)
+        return std::string(moduleText);
+    const Translator& texts = at_.host.translator();
+    std::string status = texts.sentence(statusKey(run->task), {contract::printable(run->disk)});
+    if (const std::string place = placeOf(*run); !place.empty())
+        status += " (" + place + ")";
+    if (run->percent <= 0)
+        return status;
+    status += ", " + percentText(run->percent, texts);
+    const std::string estimate =
+        job_.estimator ? job_.estimator->timeEstimateString(run->percent) : std::string();
+    return estimate.empty() ? status : status + ", " + estimate;
 }
 
 void JobWatch::runEnded(const StartedRun& run, const RunEnd& end)
@@ -82,9 +171,10 @@ void JobWatch::stopAsked()
 void JobWatch::end()
 {
     wakefulness_.release();
+    showProgress(std::nullopt);
     at_.host.imageAttachment().resumeAttachments();
     const auto length = std::chrono::steady_clock::now() - job_.start;
-    const auto runs = std::exchange(job_.runs, {});
+    const auto& runs = job_.runs;
     const bool isActive = QApplication::activeWindow() != nullptr;
     if (!runs.empty() && !closer_.isEnding() &&
         isWorthANotice(length, isActive, longestGlanceAway_))
@@ -105,8 +195,23 @@ void JobWatch::lookBack()
         sentences.push_back(text("Nothing that is selected could be checked."));
     disks_.refresh(job_.disks);
     disks_.list().synchronize();
+    tellUnseenEnds(sentences);
     updated_();
     at_.host.showSheet(text("Not everything could be checked."), sentences);
+}
+
+// How a run ended stands above the log of its disk, unless another disk has taken its place.
+void JobWatch::tellUnseenEnds(std::vector<std::string>& sentences)
+{
+    for (const FinishedRun& finished : std::exchange(job_.runs, {})) {
+        const auto disk = at_.host.sharedDiskController().diskNamed(finished.run.identifier);
+        const auto last = disk ? at_.host.historyStore().lastRun(
+                                     at_.host.histories().keyOf(disk->facts()))
+                               : std::nullopt;
+        const bool isSeen = last && last->end == finished.end;
+        if (!isSeen && finished.end.errorCode != contract::kPLNoError)
+            sentences.push_back(finished.end.message);
+    }
 }
 
 // Images that no tool got to see. The module has nothing to say about them.

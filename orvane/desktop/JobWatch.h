@@ -6,11 +6,15 @@
 #include "orvane/desktop/WindowCloser.h"
 #include "orvane/desktop/session/DesktopNotifier.h"
 #include "orvane/desktop/session/SleepInhibitor.h"
+#include "orvane/desktop/session/TaskBarProgress.h"
 
 #include <chrono>
 #include <functional>
+#include <memory>
+#include <optional>
 #include <set>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace orvane::desktop {
@@ -39,13 +43,21 @@ public:
     // As the ledger hears it.
 
     void runBegan(const StartedRun& run);
+    void runProgressed(const StartedRun& run);
     void runEnded(const StartedRun& run, const RunEnd& end);
     void stopAsked();
+
+    /// What the status line says of the run that is under way: what is done to which disk, which of
+    /// several it is, and how far; without a run, the module's own words.
+    std::string statusText(std::string_view moduleText);
 
 private:
     void begin();
     void end();
+    void showProgress(std::optional<double> percent);
+    std::string placeOf(const StartedRun& run);
     void lookBack();
+    void tellUnseenEnds(std::vector<std::string>& sentences);
     std::vector<std::string> keepUnreachedImages();
     std::string text(std::string_view key) { return at_.host.translator().text(key); }
 
@@ -54,6 +66,7 @@ private:
         std::string action = {};                        ///< the selector that began it
         std::vector<std::shared_ptr<Disk>> disks = {};  ///< that it was to work on
         std::chrono::steady_clock::time_point start = std::chrono::steady_clock::now();
+        std::unique_ptr<contract::OVTimeEstimator> estimator = {};  ///< of the run under way
         std::set<std::string> reached = {};  ///< identifiers of disks that a run was about
         std::vector<FinishedRun> runs = {};
         bool isStopAsked = false;
@@ -67,6 +80,7 @@ private:
     const std::function<void()> updated_;
     SleepInhibitor wakefulness_;
     DesktopNotifier notifier_;
+    TaskBarProgress taskBar_;
     Job job_;
 };
 

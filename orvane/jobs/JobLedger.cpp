@@ -72,6 +72,13 @@ void JobLedger::jobWillFinish(const contract::DiskReferencePointer& /*disk*/,
     end({verdict, error, std::string(result.string(contract::kPLMessage))});
 }
 
+void JobLedger::jobDidProgress(const contract::DiskReferencePointer& /*disk*/, double percent)
+{
+    run_.percent = percent;
+    if (events_.progressed)
+        events_.progressed(run_);
+}
+
 void JobLedger::stopWasAsked()
 {
     if (events_.stopAsked)

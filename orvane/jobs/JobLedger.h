@@ -18,6 +18,7 @@ struct StartedRun {
     pellar::Task task;
     std::string disk = {};        ///< any bytes
     std::string identifier = {};  ///< the disk's
+    double percent = 0;           ///< how far it is, from 0 to 100
 };
 
 /// Keeps the runs of a manager's jobs with their disks' histories: when each began, and how it
@@ -28,6 +29,7 @@ public:
         std::function<void(const StartedRun&, const contract::DiskReferencePointer&)> began;
         std::function<void(const StartedRun&, const RunEnd&)> ended;  ///< the run is kept
         std::function<void()> stopAsked;                              ///< may be empty
+        std::function<void(const StartedRun&)> progressed = {};       ///< may be empty
     };
 
     /// The host outlives this object.
@@ -46,6 +48,7 @@ private:
                         contract::ErrorCode error) override;
     void jobWillFinish(const contract::DiskReferencePointer& disk, contract::ErrorCode error,
                        const contract::Dictionary& result) override;
+    void jobDidProgress(const contract::DiskReferencePointer& disk, double percent) override;
     void stopWasAsked() override;
     void end(const RunEnd& end);
 

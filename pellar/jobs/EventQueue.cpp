@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/jobs/EventQueue.h"
 
+#include "contract/foundation/Array.h"
 #include "contract/pellar/MessageKeys.h"
 #include "pellar/jobs/JobObserver.h"
 
@@ -108,6 +109,16 @@ void EventQueue::close()
     shared_->room.notify_all();
 }
 
+void EventQueue::tellProgress(const EventReceiver& to, const contract::Dictionary& message)
+{
+    if (to.observer == nullptr ||
+        message.string(contract::kFsckMessageType) != contract::kFsckProgress.text())
+        return;
+    const contract::Array parameters = message[contract::kFsckParameters].array();
+    if (!parameters.isEmpty())
+        to.observer->jobDidProgress(to.disk, parameters.front().real());
+}
+
 void EventQueue::deliver(Shared& shared, std::vector<Event>& events)
 {
     for (const Event& event : events) {
@@ -115,6 +126,7 @@ void EventQueue::deliver(Shared& shared, std::vector<Event>& events)
             return;
         const EventReceiver& to = shared.receiver;
         if (const auto* const message = std::get_if<Message>(&event)) {
+            tellProgress(to, message->dictionary);
             to.delegate->plAsyncMessageForDisk(to.disk, message->text, message->dictionary);
         } else if (const auto* const trace = std::get_if<Trace>(&event)) {
             if (to.trace)

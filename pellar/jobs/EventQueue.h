@@ -81,6 +81,7 @@ private:
     struct Shared;
     class Batch;
 
+    static void tellProgress(const EventReceiver& to, const contract::Dictionary& message);
     static void deliver(Shared& shared, std::vector<Event>& events);
 
     contract::RunLoop& loop_;

@@ -16,6 +16,10 @@ public:
                                 contract::ErrorCode error) = 0;
     /// A stop was asked for. There may be no job yet.
     virtual void stopWasAsked() {}
+    /// How far the job is, in per cent, strictly between 0 and 100.
+    virtual void jobDidProgress(const contract::DiskReferencePointer& /*disk*/, double /*percent*/)
+    {
+    }
     /// Before the delegate hears of it. `result` has the result keys.
     virtual void jobWillFinish(const contract::DiskReferencePointer& disk,
                                contract::ErrorCode error, const contract::Dictionary& result) = 0;

@@ -36,8 +36,12 @@ TEST_F(JobFaultTest, AnImageThatIsLostDuringItsCheckIsNeverTakenForAnother)
         EXPECT_TRUE(waitUntil([&] {
             return isReplaced ? logRows().empty() : logHolds("replaced");
         })) << testing::PrintToString(logRows());
-        const std::string alert = takeSheet();
-        EXPECT_NE(alert.find("changed while it was being checked"), std::string::npos) << alert;
+        const auto isSaid = [this, isReplaced] {
+            const std::string text =
+                isReplaced ? takeSheet() : window().banner().summary().details;
+            return text.find("deleted, moved or replaced meanwhile") != std::string::npos;
+        };
+        EXPECT_TRUE(waitUntil(isSaid)) << result() << window().banner().summary().details;
         close();
     }
 }
@@ -68,8 +72,9 @@ TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
     run("verifyDiskButton", image);
     fs::rename(makeDamagedImage("second"), image);
     run("verifyDiskButton");
-    EXPECT_NE(takeSheet().find("“second”"), std::string::npos);
     EXPECT_EQ(verdict(image), "damaged");
+    EXPECT_TRUE(waitUntil(
+        [this] { return window().banner().summary().details.find("“second”") != std::string::npos; }));
     EXPECT_EQ(cell(image, DiskColumn::Name), "second (first.img)");
     EXPECT_TRUE(logHolds("needs to be repaired")) << testing::PrintToString(logRows());
     EXPECT_FALSE(logHolds("appears to be OK")) << "that was another volume";

@@ -27,7 +27,11 @@ TEST_F(WindowTest, TheButtonsFindWhatIsDamaged)
         ASSERT_TRUE(waitForJob());
         EXPECT_EQ(verdict(image), expected);
         EXPECT_NE(cell(image, DiskColumn::LastCheck), "");
-        EXPECT_EQ(takeSheet().empty(), image == sound) << "damage is said in a sheet as well";
+        EXPECT_TRUE(waitUntil([&] {
+            return result() == (image == sound ? "No damage was found."
+                                               : "Damage was found. Nothing was changed.");
+        })) << result();
+        EXPECT_EQ(takeSheet(), "");
     }
 }
 

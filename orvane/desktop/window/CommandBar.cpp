@@ -1,17 +1,52 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/CommandBar.h"
 
+#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
 
-#include <QEvent>
 #include <QHBoxLayout>
+#include <QStyleOptionToolButton>
+#include <QStylePainter>
 
 #include <utility>
 
 namespace orvane::desktop {
 namespace {
 
-constexpr int margin = 6;  // pixels
+constexpr int margin = 6;       // pixels
+constexpr double rounding = 4;  // pixels
+
+/// A button that stands out: filled, where the others are flat.
+class PrimaryButton final : public QToolButton {
+public:
+    using QToolButton::QToolButton;
+
+    QSize sizeHint() const override
+    {
+        return QToolButton::sizeHint() + QSize(2 * margin, 0);
+    }
+
+protected:
+    void paintEvent(QPaintEvent* event) override
+    {
+        if (!isEnabled()) {
+            QToolButton::paintEvent(event);
+            return;
+        }
+        const QColor color = palette().color(QPalette::Highlight);
+        const QColor text = palette().color(QPalette::HighlightedText);
+        QStylePainter painter(this);
+        painter.setRenderHint(QPainter::Antialiasing);
+        painter.setPen(hasFocus() ? QPen(palette().color(QPalette::WindowText), 1.5) : Qt::NoPen);
+        painter.setBrush(isDown() || underMouse() ? mixedColor(color, text, 0.12) : color);
+        painter.drawRoundedRect(QRectF(rect()).adjusted(1, 1, -1, -1), rounding, rounding);
+        QStyleOptionToolButton option;
+        initStyleOption(&option);
+        option.palette.setColor(QPalette::ButtonText, text);
+        option.state &= ~(QStyle::State_MouseOver | QStyle::State_Sunken);
+        painter.drawControl(QStyle::CE_ToolButtonLabel, option);
+    }
+};
 
 }  // namespace
 
@@ -37,18 +72,18 @@ void CommandBar::add(std::vector<BarCommand> commands)
         }
         addButton(std::move(command));
     }
-    adoptColors();
     setCompact(isCompact_);
 }
 
 void CommandBar::addButton(BarCommand command)
 {
-    auto* const button = new QToolButton(this);
+    QToolButton* const button =
+        command.isPrimary ? new PrimaryButton(this) : new QToolButton(this);
     button->setObjectName(QLatin1String(command.command.objectName));
     const QString title = toQt(texts_.text(command.command.title));
     button->setText(toQtTitle(fromQt(title)));
     button->setAccessibleName(title);
-    button->setAutoRaise(!command.isPrimary);
+    button->setAutoRaise(true);
     button->setFocusPolicy(Qt::TabFocus);
     button->setIcon(symbol(command.symbol, command.isPrimary ? QPalette::HighlightedText
                                                              : QPalette::ButtonText));
@@ -75,7 +110,8 @@ void CommandBar::refresh()
         if (!reason.empty())
             toolTip += QStringLiteral("\n\n") + toQt(reason);
         button.widget->setToolTip(toQtToolTip(fromQt(toolTip)));
-        button.widget->setAccessibleDescription(toQt(reason));
+        // The tool tip is HTML, which must not be read out.
+        button.widget->setAccessibleDescription(toolTip);
     }
 }
 
@@ -86,28 +122,6 @@ void CommandBar::setCompact(bool isCompact)
         button.widget->setToolButtonStyle(isCompact && !button.command.isPrimary
                                               ? Qt::ToolButtonIconOnly
                                               : Qt::ToolButtonTextBesideIcon);
-}
-
-void CommandBar::adoptColors()
-{
-    for (const Button& button : buttons_) {
-        if (!button.command.isPrimary)
-            continue;
-        QPalette colors = palette();
-        for (const auto group : {QPalette::Active, QPalette::Inactive}) {
-            colors.setColor(group, QPalette::Button, colors.color(group, QPalette::Highlight));
-            colors.setColor(group, QPalette::ButtonText,
-                            colors.color(group, QPalette::HighlightedText));
-        }
-        button.widget->setPalette(colors);
-    }
-}
-
-void CommandBar::changeEvent(QEvent* event)
-{
-    QToolBar::changeEvent(event);
-    if (event->type() == QEvent::PaletteChange)
-        adoptColors();
 }
 
 }  // namespace orvane::desktop

@@ -30,9 +30,6 @@ public:
     /// Where there is little room: the symbols alone, but for the first command.
     void setCompact(bool isCompact);
 
-protected:
-    void changeEvent(QEvent* event) override;
-
 private:
     struct Button {
         BarCommand command;
@@ -40,7 +37,6 @@ private:
     };
 
     void addButton(BarCommand command);
-    void adoptColors();
 
     const Translator& texts_;
     std::vector<Button> buttons_;

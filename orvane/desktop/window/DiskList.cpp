@@ -17,6 +17,7 @@ namespace orvane::desktop {
 namespace {
 
 constexpr int margin = 5;  // pixels, around a row and between its parts
+constexpr int progressHeight = 3;  // pixels
 
 QFont nameFont(const QFont& font)
 {
@@ -111,6 +112,20 @@ QVariant cell(const QModelIndex& index, DiskColumn column, int role = Qt::Displa
     return index.siblingAtColumn(static_cast<int>(column)).data(role);
 }
 
+/// A thin line along the lower edge of the row.
+void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, double percent)
+{
+    if (percent <= 0)
+        return;
+    QRect line = option.rect;
+    line.setTop(line.bottom() - progressHeight + 1);
+    line.setWidth(static_cast<int>(line.width() * percent / 100));
+    const bool isSelected = option.state.testFlag(QStyle::State_Selected);
+    painter.fillRect(QStyle::visualRect(option.direction, option.rect, line),
+                     option.palette.color(isSelected ? QPalette::HighlightedText
+                                                     : QPalette::Highlight));
+}
+
 /// Draws a disk in two lines, from the columns of its row: its name and its state, and below what
 /// it is and when it was last checked.
 class DiskDelegate final : public QStyledItemDelegate {
@@ -157,6 +172,7 @@ void DiskDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
     row.setLine(line, detailFont(complete.font), faint);
     row.drawAtEnd(cell(index, DiskColumn::LastCheck).toString());
     row.drawInTheRest(index.data(DiskTreeModel::DetailsRole).toString());
+    drawProgress(*painter, complete, index.data(DiskTreeModel::PercentRole).toDouble());
     painter->restore();
 }
 
@@ -243,6 +259,12 @@ void DiskList::select(const Disk& disk)
     const QModelIndex row = disks_ != nullptr ? disks_->indexOf(disk.facts().identifier) : QModelIndex();
     if (row.isValid())
         setCurrentIndex(row);
+}
+
+void DiskList::showProgress()
+{
+    if (disks_ != nullptr)
+        disks_->showProgress();
 }
 
 void DiskList::synchronize()

@@ -31,6 +31,8 @@ public:
     void select(const Disk& disk);
     /// Has rows taken in and out without telling of the selection.
     void synchronize();
+    /// Shows how far the work on the disks is.
+    void showProgress();
 
 private:
     QModelIndexList selectionInOrder() const;

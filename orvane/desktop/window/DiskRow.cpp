@@ -219,10 +219,16 @@ QIcon verdictIcon(std::string_view verdict)
     return verdict == contract::kPLVerdictDamaged.text() ? cross : mark;
 }
 
+std::string percentText(double percent, const Translator& texts)
+{
+    return texts.sentence("%ld %%", {static_cast<long>(percent)});
+}
+
 QString stateText(const DiskRow& row, const Translator& texts)
 {
     if (!row.activity.empty())
-        return toQtLine(row.activity);
+        return toQtLine(row.percent > 0 ? row.activity + " " + percentText(row.percent, texts)
+                                        : row.activity);
     if (!row.lastCheck)
         return {};
     return row.lastCheck->isPartial ? toQt(texts.text("partly checked"))

@@ -43,6 +43,10 @@ struct DiskStates {
     std::function<std::string(const Disk& disk)> activity;
     /// What is out of the ordinary about it, in a few words; mostly empty.
     std::function<std::string(const Disk& disk)> note;
+    /// How far the activity is, from 0 to 100.
+    std::function<double()> percent = [] {
+        return 0.0;
+    };
 };
 
 /// By the kind of disk.
@@ -63,6 +67,7 @@ struct DiskRow {
     std::string filesystem;
     std::optional<LastCheck> lastCheck;
     std::string activity = {};  ///< as of DiskStates
+    double percent = 0;         ///< how far that is, from 0 to 100
     std::string note = {};
 };
 
@@ -78,6 +83,8 @@ struct DiskNames {
 [[nodiscard]] QString sizeText(std::uint64_t bytes);
 /// "ext4", or the kind of disk where there is no file system.
 [[nodiscard]] QString formatText(const DiskRow& row, const Translator& texts);
+/// "64 %"
+[[nodiscard]] std::string percentText(double percent, const Translator& texts);
 /// "damaged"; "cut off" where there is none.
 [[nodiscard]] QString verdictText(const Check& check, const Translator& texts);
 

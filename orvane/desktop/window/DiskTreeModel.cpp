@@ -98,6 +98,8 @@ DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
 {
     DiskRow row{disk->facts(), disk->facts().label, disk->facts().filesystem, checkOf(*disk)};
     row.activity = activityOf(*disk);
+    if (!row.activity.empty())
+        row.percent = states_.percent();
     row.note = states_.note(*disk);
     if (const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr) {
         row.label = contents->facts().label;
@@ -155,6 +157,24 @@ std::string DiskTreeModel::activityOf(const Disk& disk) const
 void DiskTreeModel::synchronize()
 {
     synchronize(*top_, {}, rootsShown());
+}
+
+void DiskTreeModel::showProgress()
+{
+    showProgress(*top_, {});
+}
+
+void DiskTreeModel::showProgress(Node& node, const QModelIndex& at)
+{
+    for (std::size_t i = 0; i < node.children.size(); ++i) {
+        Node& child = *node.children[i];
+        const QModelIndex place = index(static_cast<int>(i), 0, at);
+        if (!child.row.activity.empty()) {
+            child.row.percent = states_.percent();
+            emit dataChanged(place, place);
+        }
+        showProgress(child, place);
+    }
 }
 
 void DiskTreeModel::removeGone(Node& node, const QModelIndex& at,
@@ -260,6 +280,7 @@ QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
             return column == DiskColumn::Name ? rowSummary(row, texts_)
                                               : cellText(row, column, texts_);
         case DetailsRole: return rowDetails(row, texts_);
+        case PercentRole: return row.percent;
         case Qt::ToolTipRole: return toQtToolTip(fromQt(rowToolTip(row, texts_)));
         case Qt::UserRole: return toQt(row.facts.identifier);
         case Qt::DecorationRole:

@@ -18,6 +18,9 @@ public:
     using DiskPointer = std::shared_ptr<Disk>;
     /// One line about what the disk is, of any column.
     static constexpr int DetailsRole = Qt::UserRole + 1;
+    /// How far what is being done to the disk is, in per cent; 0 when nothing is, or it is not
+    /// known.
+    static constexpr int PercentRole = Qt::UserRole + 2;
 
     /// All outlive this object.
     DiskTreeModel(const DiskController& disks, DiskStates states, const Translator& texts);
@@ -26,6 +29,9 @@ public:
     /// Takes rows in and out where disks have come or gone, and shows the others as they are now.
     /// Rows that stay keep their selection.
     void synchronize();
+
+    /// Shows how far the work on the disks is, and nothing else.
+    void showProgress();
 
     /// What is shown of it.
     const DiskRow& rowAt(const QModelIndex& index) const;
@@ -51,6 +57,7 @@ private:
     std::vector<DiskPointer> childrenOf(const Disk& disk) const;
     std::vector<DiskPointer> rootsShown() const;
     void removeGone(Node& node, const QModelIndex& at, const std::vector<DiskPointer>& wanted);
+    void showProgress(Node& node, const QModelIndex& at);
     void synchronize(Node& node, const QModelIndex& at, const std::vector<DiskPointer>& wanted);
     DiskRow rowOf(const DiskPointer& disk) const;
     std::optional<LastCheck> ownCheckOf(const Disk& disk) const;

@@ -59,7 +59,10 @@ SelectionSummary summaryOfOne(const DiskRow& row, const QDateTime& now, const Tr
 
 void addSpace(SelectionSummary& summary, const DiskRow& row, const Translator& texts)
 {
-    if (!row.facts.space)
+    // What a damaged volume says of itself may be part of the damage.
+    const bool isDamaged =
+        row.lastCheck && row.lastCheck->told.verdict == contract::kPLVerdictDamaged.text();
+    if (!row.facts.space || (isDamaged && row.facts.mountPoint.empty()))
         return;
     summary.space = row.facts.space;
     summary.spaceText = toQt(texts.sentence("%@ of %@ used",

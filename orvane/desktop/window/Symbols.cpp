@@ -12,7 +12,7 @@ namespace orvane::desktop {
 namespace {
 
 constexpr double side = 16;  ///< of the square that the strokes are made for
-constexpr double strokeWidth = 1.5;
+constexpr double strokeWidth = 1.25;
 
 QPainterPath lines(const QList<QPolygonF>& strokes)
 {

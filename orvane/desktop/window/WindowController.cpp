@@ -42,7 +42,7 @@ void WindowController::setGlobalProgressBarValue(double percent)
 
 void WindowController::setGlobalProgressText(std::string_view text)
 {
-    window_.progress().setText(text);
+    window_.progress().setText(events_.statusText ? events_.statusText(text) : std::string(text));
 }
 
 void WindowController::notifyWindowOfCompletion(const contract::Dictionary& report)

@@ -15,6 +15,8 @@ public:
     struct Events {
         std::function<void(bool isLocked)> lockChanged;
         std::function<void(const contract::Dictionary& report)> completed;
+        /// What the status line says where a module wants this to be said.
+        std::function<std::string(std::string_view text)> statusText;
     };
 
     explicit WindowController(MainWindow& window) : window_(window) {}
