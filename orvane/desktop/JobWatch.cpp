@@ -174,7 +174,7 @@ void JobWatch::end()
     showProgress(std::nullopt);
     at_.host.imageAttachment().resumeAttachments();
     const auto length = std::chrono::steady_clock::now() - job_.start;
-    const auto& runs = job_.runs;
+    const auto runs = std::exchange(job_.runs, {});
     const bool isActive = QApplication::activeWindow() != nullptr;
     if (!runs.empty() && !closer_.isEnding() &&
         isWorthANotice(length, isActive, longestGlanceAway_))
@@ -195,23 +195,15 @@ void JobWatch::lookBack()
         sentences.push_back(text("Nothing that is selected could be checked."));
     disks_.refresh(job_.disks);
     disks_.list().synchronize();
-    tellUnseenEnds(sentences);
     updated_();
     at_.host.showSheet(text("Not everything could be checked."), sentences);
 }
 
-// How a run ended stands above the log of its disk, unless another disk has taken its place.
-void JobWatch::tellUnseenEnds(std::vector<std::string>& sentences)
+bool JobWatch::hasResult() const
 {
-    for (const FinishedRun& finished : std::exchange(job_.runs, {})) {
-        const auto disk = at_.host.sharedDiskController().diskNamed(finished.run.identifier);
-        const auto last = disk ? at_.host.historyStore().lastRun(
-                                     at_.host.histories().keyOf(disk->facts()))
-                               : std::nullopt;
-        const bool isSeen = last && last->end == finished.end;
-        if (!isSeen && finished.end.errorCode != contract::kPLNoError)
-            sentences.push_back(finished.end.message);
-    }
+    return !job_.runs.empty() && std::ranges::none_of(job_.runs, [](const FinishedRun& finished) {
+        return finished.end.errorCode == contract::kPLErrorDiskChanged;
+    });
 }
 
 // Images that no tool got to see. The module has nothing to say about them.

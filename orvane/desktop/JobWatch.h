@@ -37,8 +37,9 @@ public:
     /// The module's own report at the end of its job.
     void reported(const contract::Dictionary& report);
 
-    /// Whether the job at hand has come to an answer about a disk.
-    bool hasResult() const { return !job_.runs.empty(); }
+    /// Whether what the job at hand has come to stands with its disks, and not with another that
+    /// has taken the place of one.
+    bool hasResult() const;
 
     // As the ledger hears it.
 
@@ -57,7 +58,6 @@ private:
     void showProgress(std::optional<double> percent);
     std::string placeOf(const StartedRun& run);
     void lookBack();
-    void tellUnseenEnds(std::vector<std::string>& sentences);
     std::vector<std::string> keepUnreachedImages();
     std::string text(std::string_view key) { return at_.host.translator().text(key); }
 
