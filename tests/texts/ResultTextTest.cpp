@@ -34,7 +34,8 @@ TEST(ResultTexts, EveryLanguageReadsItsOwnVerdictsRight)
     const orvane::Catalogue catalogue(locale);
     std::vector<std::string> all{"C"};
     for (const auto& entry : std::filesystem::directory_iterator(locale))
-        all.push_back(entry.path().filename());
+        if (std::filesystem::exists(entry.path() / "LC_MESSAGES" / (std::string(table) + ".mo")))
+            all.push_back(entry.path().filename());
     ASSERT_GE(all.size(), 2U) << "there is a translation to be tested";
     for (const std::string& language : all) {
         orvane::setLanguage(language);

@@ -44,8 +44,10 @@ const Catalogue::Files& Catalogue::filesOf(std::string_view table) const
     if (const auto found = files_.find(table); found != files_.end())
         return found->second;
     Files files;
+    std::vector<std::string> languages = folderNames(currentLanguages());
+    languages.emplace_back("en");
     if (!table.empty() && table.find('/') == std::string_view::npos)
-        for (const std::string& language : folderNames(currentLanguages()))
+        for (const std::string& language : languages)
             if (auto file = MessageFile::read(directory_ / language / "LC_MESSAGES" /
                                               (std::string(table) + ".mo")))
                 files.push_back(std::move(*file));

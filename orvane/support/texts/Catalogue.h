@@ -39,8 +39,8 @@ struct Translator {
 };
 
 /// The gettext catalogues below one directory, `LANGUAGE/LC_MESSAGES/TABLE.mo`; a string table is
-/// a catalogue. Texts come in the first of the languages in force (Language.h) that has them. Any
-/// thread.
+/// a catalogue. Texts come in the first of the languages in force (Language.h) that has them, then
+/// in English, where the key itself is not the best English. Any thread.
 class Catalogue {
 public:
     explicit Catalogue(std::filesystem::path directory);
