@@ -8,6 +8,7 @@
 #include <QApplication>
 #include <QIcon>
 #include <QSocketNotifier>
+#include <QStyle>
 
 #include <cstdio>
 #include <exception>
@@ -100,6 +101,8 @@ int run(int argc, char** argv)
         return readCommandLine(argc, argv).exitStatus.value_or(0);
     TerminationSignals termination;
     QApplication application(argc, argv);
+    if (QApplication::style()->name() == QLatin1String("fusion"))
+        QApplication::setStyle(new FramedStyle);
     QApplication::setApplicationName(QStringLiteral("orvane"));
     QApplication::setApplicationDisplayName(QStringLiteral("Orvane"));
     QApplication::setDesktopFileName(QLatin1String(desktopEntry));

@@ -5,7 +5,9 @@
 #include <QDBusMessage>
 #include <QDBusPendingCallWatcher>
 #include <QDBusPendingReply>
+#include <QPainter>
 #include <QStyle>
+#include <QStyleOption>
 
 #include <algorithm>
 #include <cmath>
@@ -24,6 +26,7 @@ double luminance(const QColor& color)
 }
 
 constexpr int lightnessSteps = 50;
+constexpr double frameShare = 0.4;  ///< of the ground in the colour of a frame
 
 const QString service = QStringLiteral("org.freedesktop.portal.Desktop");
 const QString path = QStringLiteral("/org/freedesktop/portal/desktop");
@@ -42,7 +45,8 @@ bool isLight(const QPalette& palette)
 // Other styles have colours of their own.
 bool canBeDyed()
 {
-    return QApplication::style()->name() == QLatin1String("fusion");
+    const auto* const framed = dynamic_cast<const FramedStyle*>(QApplication::style());
+    return framed != nullptr || QApplication::style()->name() == QLatin1String("fusion");
 }
 
 }  // namespace
@@ -82,6 +86,30 @@ QColor mixedColor(const QColor& a, const QColor& b, double share)
     };
     return QColor::fromRgbF(between(a.redF(), b.redF()), between(a.greenF(), b.greenF()),
                             between(a.blueF(), b.blueF()));
+}
+
+FramedStyle::FramedStyle() : QProxyStyle(QStringLiteral("fusion")) {}
+
+void FramedStyle::drawPrimitive(PrimitiveElement element, const QStyleOption* option,
+                                QPainter* painter, const QWidget* widget) const
+{
+    QProxyStyle::drawPrimitive(element, option, painter, widget);
+    const bool isRound = element == PE_IndicatorRadioButton;
+    if (element != PE_IndicatorCheckBox && !isRound)
+        return;
+    const bool isEnabled = option->state.testFlag(State_Enabled);
+    const auto group = isEnabled ? QPalette::Active : QPalette::Disabled;
+    painter->save();
+    painter->setRenderHint(QPainter::Antialiasing);
+    painter->setPen(mixedColor(option->palette.color(group, QPalette::WindowText),
+                               option->palette.color(group, QPalette::Base), frameShare));
+    painter->setBrush(Qt::NoBrush);
+    const QRectF frame = QRectF(option->rect).adjusted(0.5, 0.5, -0.5, -0.5);
+    if (isRound)
+        painter->drawEllipse(frame);
+    else
+        painter->drawRect(frame);
+    painter->restore();
 }
 
 QPalette darkPalette()

@@ -6,6 +6,7 @@
 #include <QDBusVariant>
 #include <QObject>
 #include <QPalette>
+#include <QProxyStyle>
 
 namespace orvane::desktop {
 
@@ -20,6 +21,16 @@ QColor readableOn(const QColor& background, const QColor& wanted);
 
 /// `share` of the way from `a` to `b`.
 QColor mixedColor(const QColor& a, const QColor& b, double share);
+
+/// The style "Fusion" with frames around check boxes and radio buttons that are seen on dark ground
+/// as well (WCAG 2.1, 1.4.11).
+class FramedStyle final : public QProxyStyle {
+public:
+    FramedStyle();
+
+    void drawPrimitive(PrimitiveElement element, const QStyleOption* option, QPainter* painter,
+                       const QWidget* widget) const override;
+};
 
 /// Light text on dark ground, for the style "Fusion".
 [[nodiscard]] QPalette darkPalette();

@@ -60,9 +60,11 @@ SelectionSummary summaryOfOne(const DiskRow& row, const QDateTime& now, const Tr
 void addSpace(SelectionSummary& summary, const DiskRow& row, const Translator& texts)
 {
     // What a damaged volume says of itself may be part of the damage.
-    const bool isDamaged =
-        row.lastCheck && row.lastCheck->told.verdict == contract::kPLVerdictDamaged.text();
-    if (!row.facts.space || (isDamaged && row.facts.mountPoint.empty()))
+    const std::string_view verdict =
+        row.lastCheck ? std::string_view(row.lastCheck->told.verdict) : "";
+    const bool isDoubtful = row.lastCheck && verdict != contract::kPLVerdictSound.text() &&
+                            verdict != contract::kPLVerdictRepaired.text();
+    if (!row.facts.space || (isDoubtful && row.facts.mountPoint.empty()))
         return;
     summary.space = row.facts.space;
     summary.spaceText = toQt(texts.sentence("%@ of %@ used",

@@ -155,7 +155,7 @@ int main(int argc, char** argv)
     QApplication application(argc, argv);
     QLocale::setDefault(QLocale(QString::fromStdString(orvane::currentLanguage())));
     QApplication::setQuitOnLastWindowClosed(false);
-    QApplication::setStyle(QStringLiteral("fusion"));
+    QApplication::setStyle(new orvane::desktop::FramedStyle);
     if (qEnvironmentVariable("PICTURE").contains(QLatin1String("dark")))
         QApplication::setPalette(orvane::desktop::darkPalette());
     if (const int points = qEnvironmentVariableIntValue("FONT_POINTS"); points > 0) {
