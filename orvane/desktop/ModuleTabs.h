@@ -110,6 +110,7 @@ public:
     /// Shows the log as it is now.
     void reloadLog();
     std::string selectedLogHTML();
+    std::string selectedLogText();
 
     /// The selector that was sent to a module last.
     const std::string& lastAction() const { return lastAction_; }
