@@ -98,6 +98,7 @@ LineLooks looksOf(const QStyleOptionViewItem& option, const Row& row)
                        : row.isHeading ? bandColor(option)
                                        : option.palette.color(group, QPalette::Base);
     looks.keepsTextColor = isChosen;
+    looks.isMirrored = option.direction == Qt::RightToLeft;
     return looks;
 }
 
@@ -199,9 +200,15 @@ private:
         return {frame.left() + frame.right() - rect.right(), rect.top(), rect.width(),
                 rect.height()};
     }
-    Qt::Alignment start() const
+    /// On the side where the text of the window starts; a text reads in its own direction.
+    void putText(QPainter& painter, const QRectF& rect, const QString& text) const
     {
-        return option_.direction == Qt::RightToLeft ? Qt::AlignRight : Qt::AlignLeft;
+        const Qt::Alignment side = looks_.isMirrored ? Qt::AlignRight : Qt::AlignLeft;
+        painter.setLayoutDirection(text.isRightToLeft() ? Qt::RightToLeft : Qt::LeftToRight);
+        painter.drawText(rect,
+                         static_cast<int>(side | Qt::AlignAbsolute | Qt::AlignVCenter) |
+                             Qt::TextSingleLine,
+                         text);
     }
 
     void paintTriangle(QPainter& painter, const QRectF& rect) const
@@ -231,9 +238,7 @@ private:
         if (signSide_ > 0)
             note_.sign.paint(&painter,
                              placed({rect.left(), rect.top(), signSide_, rect.height()}).toRect());
-        painter.drawText(placed(rect.adjusted(signSide_ + spacing / 2, 0, 0, 0)),
-                         static_cast<int>(start() | Qt::AlignVCenter) | Qt::TextSingleLine,
-                         note_.verdict);
+        putText(painter, placed(rect.adjusted(signSide_ + spacing / 2, 0, 0, 0)), note_.verdict);
         painter.restore();
     }
 
@@ -245,9 +250,8 @@ private:
                            ? looks_.textColor
                            : readableOn(looks_.background, mixed(looks_.background,
                                                                  looks_.textColor, quietStrength)));
-        painter.drawText(placed(rect),
-                         static_cast<int>(start() | Qt::AlignVCenter) | Qt::TextSingleLine,
-                         metrics_.elidedText(note_.details, Qt::ElideRight, rect.width()));
+        putText(painter, placed(rect),
+                metrics_.elidedText(note_.details, Qt::ElideRight, rect.width()));
         painter.restore();
     }
 

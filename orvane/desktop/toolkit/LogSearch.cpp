@@ -170,6 +170,7 @@ void LogSearch::searchFor(const QString& text)
     matches_.search(text);
     peer_.table().setSearched(text);
     current_ = -1;
+    currentItem_ = {};
     mustShow_ = !text.isEmpty();
     look_.start();
     look();
@@ -182,6 +183,7 @@ void LogSearch::rowsChanged(LogModel::Change change)
     if (change == LogModel::Change::Other) {
         matches_.begin();
         current_ = -1;
+        tried_ = 0;
     }
     look_.start();
 }
@@ -189,10 +191,21 @@ void LogSearch::rowsChanged(LogModel::Change change)
 void LogSearch::look()
 {
     matches_.lookOn(slice);
+    findCurrentAgain();
     showFirst();
     showCount();
     if (!isLooking())
         look_.stop();
+}
+
+/// Details came or went: the reader stays where he was.
+void LogSearch::findCurrentAgain()
+{
+    contract::OutlineView* const view = peer_.model().view();
+    const std::vector<int>& rows = matches_.rows();
+    for (; view != nullptr && current_ < 0 && currentItem_ && tried_ < rows.size(); ++tried_)
+        if (view->itemAtRow(static_cast<std::size_t>(rows[tried_])).isSameAs(currentItem_))
+            current_ = rows[tried_];
 }
 
 /// For rows, or for where they are shown.
@@ -228,6 +241,7 @@ void LogSearch::goOn(bool isForwards)
         if (!peer_.goTo(static_cast<std::size_t>(row)))
             continue;
         current_ = row;
+        currentItem_ = peer_.model().view()->itemAtRow(static_cast<std::size_t>(row));
         break;
     }
     showCount();

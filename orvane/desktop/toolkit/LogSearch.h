@@ -81,6 +81,7 @@ private:
     void rowsChanged(LogModel::Change change);
     void look();
     void showFirst();
+    void findCurrentAgain();
     bool isLooking() const;
     void showCount();
 
@@ -90,7 +91,9 @@ private:
     QTimer look_;
     QLineEdit* field_;
     QLabel* count_;
-    int current_ = -1;       ///< the row of the view that is shown; -1 for none
+    int current_ = -1;  ///< the row of the view that was gone to; -1 for none
+    contract::OutlineItem currentItem_;  ///< its record, by which it is found in another log
+    std::size_t tried_ = 0;              ///< matches that are not that record
     bool mustShow_ = false;  ///< the first match behind where the reader was, once it is found
 };
 

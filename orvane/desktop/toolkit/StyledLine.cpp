@@ -176,6 +176,8 @@ void layOut(QTextLayout& layout, const StyledLine& line, const LineLooks& looks,
 {
     QTextOption option;
     option.setWrapMode(wrapMode);
+    if (looks.isMirrored)
+        option.setAlignment(Qt::AlignRight | Qt::AlignAbsolute);
     layout.setTextOption(option);
     layout.setFormats(formatsOf(line, looks));
     double height = 0;

@@ -69,6 +69,9 @@ TEST_F(LogSearchTest, GoesFromMatchToMatchAlsoInFoldedRuns)
     reload();
     settle();
     EXPECT_EQ(place(), "inode 2, 2 of 3") << "the log has grown";
+    interface->button("showDetailsButton")->press();
+    settle();
+    EXPECT_EQ(place(), "inode 2, 2 of 3") << "the log is another, with the same row";
     type("nothing");
     EXPECT_EQ(search().count().text(), QStringLiteral("Not found"));
     press(Qt::Key_Escape);
