@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogDelegate.h"
 
+#include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/LogTable.h"
@@ -23,6 +24,7 @@ constexpr int mostLines = 12;       // a name may be as long as it likes
 constexpr double indent = 14;       // pixels: rows stand below their heading's title
 constexpr double padding = 4;       // above and below what a heading says
 constexpr double gap = 6;           // above a heading
+constexpr int heightOfEnd = 4;
 constexpr double spacing = 8;       // between title and verdict
 constexpr double bandStrength = 0.07;
 constexpr double quietStrength = 0.65;
@@ -49,6 +51,7 @@ struct Row {
     StyledLine line;
     QRectF frame;
     bool isHeading = false;
+    bool isEnd = false;  ///< of a run: an empty line
 };
 
 /// None where there is nothing to show yet, or any more.
@@ -63,7 +66,9 @@ std::optional<Row> rowAt(const QModelIndex& index)
     const auto number = static_cast<std::size_t>(model.viewRow(index.row()));
     const contract::Rect frame = view->frameOfCellAtColumnRow(0, number);
     return Row{model, *view, oneLine(textOfRow(*view, number)),
-               QRectF(frame.x, frame.y, frame.width, frame.height), model.isHeading(index.row())};
+               QRectF(frame.x, frame.y, frame.width, frame.height), model.isHeading(index.row()),
+               model.itemAt(index.row()).integer(contract::kFsckVerbosity) ==
+                   contract::verbosity::summary};
 }
 
 bool isSelected(const QStyleOptionViewItem& option)
@@ -292,6 +297,8 @@ QSize LogDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelInde
     const auto row = rowAt(index);
     if (!row)
         return option.rect.size();
+    if (row->isEnd)
+        return {option.rect.width(), heightOfEnd};
     const double oneLineHeight = option.rect.height();
     const double height = row->isHeading
                               ? Heading(option, *row, index.row()).height(oneLineHeight)

@@ -167,6 +167,7 @@ void LogSearch::keyPressEvent(QKeyEvent* event)
 
 void LogSearch::searchFor(const QString& text)
 {
+    peer_.flush();
     matches_.search(text);
     peer_.table().setSearched(text);
     current_ = -1;
@@ -231,6 +232,8 @@ void LogSearch::goOn(bool isForwards)
         open();
         return;
     }
+    // Rows that wait would move the reader on again.
+    peer_.flush();
     const std::vector<int>& rows = matches_.rows();
     const auto count = static_cast<std::ptrdiff_t>(rows.size());
     const auto from = isForwards ? std::upper_bound(rows.begin(), rows.end(), current_)
