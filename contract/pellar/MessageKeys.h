@@ -40,6 +40,14 @@ inline const Name kPLVerdict{"kPLVerdict"};
 /// One sentence that names the attempt, the disk and the outcome.
 inline const Name kPLMessage{"kPLMessage"};
 
+/// The tool that did the work, with its version where it says it: "e2fsck 1.47.0". Absent where
+/// none ran.
+inline const Name kPLTool{"kPLTool"};
+/// How many problems were told of, and of how many kinds they are; absent where none was, the
+/// second also where only the least is known.
+inline const Name kPLProblems{"kPLProblems"};
+inline const Name kPLProblemKinds{"kPLProblemKinds"};
+
 inline const Name kPLVerdictSound{"sound"};
 inline const Name kPLVerdictDamaged{"damaged"};            ///< damage is left
 inline const Name kPLVerdictRepaired{"repaired"};          ///< damage was found, none is left

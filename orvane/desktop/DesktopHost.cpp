@@ -10,7 +10,7 @@ DesktopHost::DesktopHost(SupportOptions options, QtLoop& loop)
       alerts_([this](std::int32_t code) { return OVLocalizedErrorString(code); }),
       help_(hostBundle(), standardUserDefaults()),
       // What the user has seen is kept, whatever happens to the program.
-      interface_([this] { histories().saveNew(); }),
+      interface_([this] { histories().saveNew(); }, &hostBundle()),
       printing_(hostBundle(), [this] {
           alerts_.simpleModuleAlert(translator().text("The log could not be printed."), "", 0);
       })

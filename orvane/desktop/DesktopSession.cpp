@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
+#include "orvane/desktop/RunNotes.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <cstdio>
@@ -54,6 +55,7 @@ DesktopSession::~DesktopSession()
 {
     window_.setEvents({});
     host_.generalPasteboard().setHTMLSource({});
+    host_.generalPasteboard().setTextSource({});
     controller_.setEvents({});
     // The modules go before what they were given, their running job with them.
     tabs_.clear();
@@ -157,6 +159,8 @@ void DesktopSession::connectHost()
     host_.alerts().setWithheld([this] { return controller_.interfaceLock() && jobs_.hasResult(); });
     tabs_.setMayPerform([this](std::string_view action) { return choices_.mayPerform(action); });
     host_.generalPasteboard().setHTMLSource([this] { return tabs_.selectedLogHTML(); });
+    host_.generalPasteboard().setTextSource([this] { return tabs_.selectedLogText(); });
+    host_.printing().setNoteSource(runKnowledge(host_.histories(), host_.translator()).noteOf);
     host_.printing().setTitle([this] {
         std::string names;
         for (const auto& disk : disks_.selected())

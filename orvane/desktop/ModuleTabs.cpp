@@ -2,6 +2,7 @@
 #include "orvane/desktop/ModuleTabs.h"
 
 #include "contract/toolkit/ControlNames.h"
+#include "orvane/desktop/RunNotes.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QLabel>
@@ -142,6 +143,9 @@ void ModuleTabs::add(std::unique_ptr<ModuleTab> tab)
             lastAction_ = action;
             return true;
         });
+    if (tab->interface() != nullptr && tab->interface()->outlinePeer() != nullptr)
+        tab->interface()->outlinePeer()->setRunKnowledge(
+            runKnowledge(host_.histories(), host_.translator()));
     tabs_.insert(place, std::move(tab));
 }
 
@@ -220,6 +224,11 @@ void ModuleTabs::reloadLog()
 std::string ModuleTabs::selectedLogHTML()
 {
     return log() != nullptr ? interface()->outlinePeer()->selectionHTML() : std::string();
+}
+
+std::string ModuleTabs::selectedLogText()
+{
+    return log() != nullptr ? interface()->outlinePeer()->selectionText() : std::string();
 }
 
 }  // namespace orvane::desktop

@@ -117,6 +117,7 @@ public:
     /// Shows the log as it is now.
     void reloadLog();
     std::string selectedLogHTML();
+    std::string selectedLogText();
 
     /// The selector that a module performed last.
     const std::string& lastAction() const { return lastAction_; }

@@ -95,8 +95,8 @@ void HostJob::add(const contract::Dictionary& record)
 
 void HostJob::tellError(ErrorCode error)
 {
-    add(logRecord(contract::kFsckFail, host_.OVLocalizedErrorString(error),
-                  contract::verbosity::heading));
+    add(lineOfRun(logRecord(contract::kFsckFail, host_.OVLocalizedErrorString(error),
+                            contract::verbosity::heading)));
 }
 
 }  // namespace orvane

@@ -69,7 +69,9 @@ void JobLedger::jobWillFinish(const contract::DiskReferencePointer& /*disk*/,
     std::string verdict(result.string(contract::kPLVerdict));
     if (verdict.empty())
         verdict = error == 0 ? std::string(contract::kPLVerdictSound.text()) : failedVerdict();
-    end({verdict, error, std::string(result.string(contract::kPLMessage))});
+    end({verdict, error, std::string(result.string(contract::kPLMessage)),
+         std::string(result.string(contract::kPLTool)), result.integer(contract::kPLProblems),
+         result.integer(contract::kPLProblemKinds)});
 }
 
 void JobLedger::jobDidProgress(const contract::DiskReferencePointer& /*disk*/, double percent)
@@ -123,15 +125,16 @@ std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key)
 void keepUnreached(SupportHost& host, Disk& image, pellar::Operation operation,
                    const std::string& sentence)
 {
+    // As of every run, its first record is saved before it begins.
+    image.fsckHistoryNoChildren().append(
+        logRecord(contract::kFsckFail, sentence, contract::verbosity::heading));
+    host.histories().saveNew();
     HistoryStore& store = host.historyStore();
     const auto time = now();
     const std::int64_t run =
         store.beginRun(host.histories().keyOf(image.facts()),
                        nameOf(pellar::Task{pellar::Subject::Filesystem, operation}), time);
     store.endRun(run, {failedVerdict(), contract::kPLErrorCannotOpen, sentence}, time);
-    image.fsckHistoryNoChildren().append(
-        logRecord(contract::kFsckFail, sentence, contract::verbosity::heading));
-    host.histories().saveNew();
 }
 
 }  // namespace orvane

@@ -3,12 +3,14 @@
 
 #include "contract/foundation/StyledText.h"
 #include "contract/pellar/MessageKeys.h"
+#include "orvane/support/history/RunStart.h"
 
 #include <array>
 
 namespace orvane {
 namespace {
 
+const contract::Name libraryMessage{"kOV_typeOfOutput_dict"};
 constexpr double fontPoints = 11;
 constexpr contract::Color red{1, 0, 0, 1};
 constexpr contract::Color green{0, 0.8, 0.2, 1};
@@ -52,6 +54,12 @@ contract::Dictionary logRecord(std::optional<contract::Name> type, const std::st
     return record;
 }
 
+contract::Dictionary lineOfRun(contract::Dictionary record)
+{
+    record.set(typeOfOutputKey, libraryMessage);
+    return record;
+}
+
 contract::Dictionary logRecordOf(const contract::Dictionary& message)
 {
     const auto type = typeNamed(message.string(contract::kFsckMessageType));
@@ -60,7 +68,8 @@ contract::Dictionary logRecordOf(const contract::Dictionary& message)
         verbosity = contract::verbosity::detail;
     else if (type == contract::kFsckError)
         verbosity = contract::verbosity::heading;
-    return logRecord(type, std::string(message.string(contract::kFsckMessageString)), verbosity);
+    return lineOfRun(
+        logRecord(type, std::string(message.string(contract::kFsckMessageString)), verbosity));
 }
 
 }  // namespace orvane

@@ -15,6 +15,9 @@ namespace orvane {
 [[nodiscard]] contract::Dictionary logRecord(std::optional<contract::Name> type,
                                              const std::string& text, std::int64_t verbosity);
 
+/// The record, marked as a line within a run: no run begins with it.
+[[nodiscard]] contract::Dictionary lineOfRun(contract::Dictionary record);
+
 /// The same of a message of the library, at the level at which a module shows it.
 [[nodiscard]] contract::Dictionary logRecordOf(const contract::Dictionary& message);
 

@@ -131,6 +131,14 @@ bool ProblemLimiter::admits(std::string_view problem)
     return false;
 }
 
+ProblemLimiter::Tally ProblemLimiter::tally() const
+{
+    Tally tally{hiddenOfVariousKinds_, kinds_.size(), hiddenOfVariousKinds_ > 0};
+    for (const auto& [kind, count] : kinds_)
+        tally.problems += count.shown + count.hidden;
+    return tally;
+}
+
 std::vector<ProblemLimiter::Remainder> ProblemLimiter::takeRemainders()
 {
     std::vector<Remainder> remainders;
@@ -210,7 +218,7 @@ void JobLog::detail(std::string_view line)
 void JobLog::problem(std::string_view line)
 {
     if (problems_.admits(line))
-        error(contract::printable(line));
+        failure(contract::printable(line));
     else
         detail(line);
 }
@@ -246,10 +254,25 @@ void JobLog::progressOfJob(double percent)
 
 void JobLog::endOfRun()
 {
+    if (found_.problems == 0)
+        found_ = problems_.tally();
     for (const ProblemLimiter::Remainder& rest : problems_.takeRemainders())
-        error(texts_.text(rest.kind.empty() ? "… and more problems of other kinds: %1$@"
-                                            : "… and %1$@ more like “%2$@”"),
-              contract::Array::of({rest.count, contract::printable(rest.kind)}));
+        add(Level::Main, contract::kFsckFail,
+            texts_.text(rest.kind.empty() ? "… and more problems of other kinds: %1$@"
+                                          : "… and %1$@ more like “%2$@”"),
+            contract::Array::of({rest.count, contract::printable(rest.kind)}));
+}
+
+void JobLog::tellProblems()
+{
+    if (found_.problems == 0)
+        return;
+    const std::string_view key = found_.problems == 1 ? "1 problem was found."
+                                 : found_.hasOtherKinds
+                                     ? "%1$@ problems of more than %2$@ kinds were found."
+                                 : found_.kinds == 1 ? "%1$@ problems of one kind were found."
+                                                     : "%1$@ problems of %2$@ kinds were found.";
+    error(texts_.text(key), contract::Array::of({found_.problems, found_.kinds}));
 }
 
 // The module ends a failure's line itself, a success's it does not.
@@ -302,9 +325,15 @@ void JobLog::finished(const Outcome& outcome, const std::string& message)
 void JobLog::finished(contract::ErrorCode mainError, std::int32_t detailError, Name verdict,
                       const std::string& message)
 {
-    events_.add(Finished{
-        mainError, detailError,
-        Dictionary::of({{contract::kPLVerdict, verdict}, {contract::kPLMessage, message}})});
+    const Dictionary result =
+        Dictionary::of({{contract::kPLVerdict, verdict}, {contract::kPLMessage, message}});
+    if (!tool_.empty())
+        result.set(contract::kPLTool, tool_);
+    if (found_.problems > 0)
+        result.set(contract::kPLProblems, found_.problems);
+    if (found_.problems > 0 && !found_.hasOtherKinds)
+        result.set(contract::kPLProblemKinds, found_.kinds);
+    events_.add(Finished{mainError, detailError, result});
     events_.flush();
 }
 

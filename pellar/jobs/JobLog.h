@@ -51,8 +51,16 @@ public:
         std::string kind;  ///< empty: of various kinds
     };
 
+    /// How many problems there were since it started anew.
+    struct Tally {
+        std::uint64_t problems = 0;
+        std::uint64_t kinds = 0;       ///< of those that were shown
+        bool hasOtherKinds = false;    ///< and there are more than these
+    };
+
     /// Whether this problem is to be shown; counts it otherwise.
     bool admits(std::string_view problem);
+    Tally tally() const;
     /// What was not shown, by kind, and starts anew. A kind of which nothing was shown is
     /// counted with the various.
     std::vector<Remainder> takeRemainders();
@@ -109,7 +117,8 @@ public:
     /// A line of a tool that says nothing in particular.
     void detail(std::string_view line);
     void detail(const Sentence& sentence) { detail(text(sentence)); }
-    /// Shown as an error, or as a detail where there are too many of its kind.
+    /// A tool's line about a problem, or one line of many of our own. Shown as a failure, or as a
+    /// detail where there are too many of its kind. An error would be a heading each.
     void problem(std::string_view line);
     void problem(const Sentence& sentence) { problem(text(sentence)); }
     /// Always shown as an error. The module puts the parameters, where there are some, in their
@@ -127,6 +136,12 @@ public:
     void progressOfJob(double percent);
     /// Names the number of problems that were not shown.
     void endOfRun();
+    /// Says in one sentence how many problems there were in the first run that had any, and of how
+    /// many kinds; nothing where there were none.
+    void tellProblems();
+    /// The tool that does the job's work, for the result.
+    void setTool(std::string tool) { tool_ = std::move(tool); }
+    const std::string& tool() const { return tool_; }
     /// The line by which the module knows the result; none for a verdict without a phrase. What is
     /// damaged for good does not “need to be repaired”.
     void verdict(Verdict verdict, Operation operation, bool isForGood = false);
@@ -162,6 +177,8 @@ private:
     std::string diskName_;
     std::string lineEnd_ = "\n";
     ProblemLimiter problems_;
+    ProblemLimiter::Tally found_;  ///< by the first run that found any
+    std::string tool_;
     ProgressMeter meter_;
 };
 

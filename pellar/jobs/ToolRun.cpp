@@ -60,6 +60,10 @@ RunEvidence ToolRun::run(const DiskForTool& disk, const VolumeFacts& volume)
 {
     JobLog& log = context_.log;
     const RunRequest request = requestFor(disk);
+    // A repair is the work of the tool that writes.
+    namesTool_ = access_ == Access::ReadWrite || log.tool().empty();
+    if (namesTool_)
+        log.setTool(program_.filename());
     log.trace("run: " + shown(request.command));
     log.step(operation(), {"Running %1$@ on “%2$@”", program_.filename(), log.diskName()});
     log.flush();
@@ -98,11 +102,21 @@ void ToolRun::tellEndOf(const RunResult& result)
 
 void ToolRun::line(std::string_view line, bool isCut)
 {
+    nameTool(line);
     reader_->read(line, lines_);
     tellToolLines();
     endIfUnreadable();
     if (isCut)
         context_.log.detail(Sentence{"(The line above was longer and is cut.)", {}, {}});
+}
+
+void ToolRun::nameTool(std::string_view line)
+{
+    const auto version = namesTool_ ? versionBehind(tool_.banner, line) : std::string_view();
+    if (version.empty())
+        return;
+    context_.log.setTool(program_.filename().native() + ' ' + std::string(version));
+    namesTool_ = false;
 }
 
 void ToolRun::progressLine(std::string_view line)

@@ -40,6 +40,7 @@ public:
 private:
     RunRequest requestFor(const DiskForTool& disk) const;
     bool isUnstoppable() const;
+    void nameTool(std::string_view line);
     void endIfUnreadable();
     void tellEndOf(const RunResult& result);
     void tellToolLines();
@@ -61,6 +62,7 @@ private:
     std::unique_ptr<OutputReader> reader_;
     std::vector<ToolLine> lines_;
     std::vector<std::uint64_t> logParts_;
+    bool namesTool_ = false;  ///< its name is the job's, and its version is not known yet
     bool isEnded_ = false;  ///< by us, because of the disk
 };
 

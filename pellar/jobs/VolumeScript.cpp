@@ -242,6 +242,8 @@ VolumeScript::State VolumeScript::verify()
         Access::ReadOnly, hasJournal ? ToolRun::Problems::Kept : ToolRun::Problems::Shown);
     const Judgement judgement = runs_.judgeWithLog(evidence);
     const bool canBeRepaired = tool_->repairs(context_.repairWay());
+    if (judgement.verdict == Verdict::Damaged)
+        log_.tellProblems();
     if (judgement.verdict == Verdict::Damaged && !runs_.volume().isCutShort())
         tellMeaning(evidence);
     outcome_ = canBeRepaired ? outcomeOfVerification(judgement) : outcomeWithoutRepair(judgement);
@@ -307,6 +309,7 @@ Outcome VolumeScript::decidedBy(const Outcome& tried, bool foundProblems)
                    ? outcome_  // the tool broke off, and has not said over what
                    : outcomeOfVerification(sound(0));
     }
+    log_.tellProblems();
     log_.remark(Sentence{isProven(tried) ? "A repair was tried; it would make the volume sound."
                                          : "A repair was tried; it would leave damage.",
                          {},
@@ -328,6 +331,8 @@ VolumeScript::State VolumeScript::look()
     look_.counts.collectedMany = tool_->habits.collectedMany;
     look_.counts.before = evidence.volume.files ? evidence.volume.files : evidence.findings.files;
     look_.foundDamage = judgement.verdict == Verdict::Damaged;
+    if (look_.foundDamage)
+        log_.tellProblems();
     const bool waitsForReplay =
         judgement.verdict == Verdict::Inconclusive && evidence.findings.skippedJournal;
     look_.waitsForMount = waitsForReplay && !tool_->habits.logReplayedAs.empty();

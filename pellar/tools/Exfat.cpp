@@ -156,6 +156,7 @@ const Tool& fsckExfat()
         .name = name,
         .repairName = name,
         .package = "exfatprogs",
+        .banner = "exfatprogs version : ",
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<ExfatOutput>,

@@ -275,6 +275,7 @@ const Tool& fsckFat()
                        "no damage is left; lost parts were made into %1$@ file (FSCK0000.REC)",
                    .collectedMany = "no damage is left; lost parts were made into %1$@ files "
                                     "(FSCK0000.REC and so on)"},
+        .banner = "fsck.fat ",
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<FatOutput>,

@@ -74,6 +74,8 @@ struct Tool {
     /// Why it is not let repair a disk without a trial before; empty where it is.
     Sentence reasonAgainstDirectRepair = {};
     ToolHabits habits = {};
+    /// What stands before its version in one of its first lines; empty where it does not say it.
+    std::string_view banner = {};
 
     /// Reads the disk a little; never writes.
     VolumeFacts (*examine)(int disk, std::uint64_t offset, std::uint64_t availableBytes);

@@ -5,6 +5,20 @@ namespace pellar {
 
 using Kind = ToolLine::Kind;
 
+std::string_view versionBehind(std::string_view banner, std::string_view line)
+{
+    constexpr std::size_t longest = 24;
+    if (banner.empty() || !line.starts_with(banner))
+        return {};
+    line.remove_prefix(banner.size());
+    const std::size_t end = line.find_first_not_of(
+        "0123456789.-+~abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ");
+    const std::string_view version = line.substr(0, end);
+    const bool isVersion = !version.empty() && version.size() <= longest &&
+                           version.front() >= '0' && version.front() <= '9';
+    return isVersion ? version : std::string_view();
+}
+
 void LineOutput::read(std::string_view line, std::vector<ToolLine>& lines)
 {
     if (line.find_first_not_of(" \t") != std::string_view::npos)

@@ -30,6 +30,10 @@ struct ToolLine {
     friend bool operator==(const ToolLine&, const ToolLine&) = default;
 };
 
+/// The version number that stands in a line behind `banner`: letters, digits, dots, dashes; empty
+/// where the line does not begin so, or `banner` is empty.
+std::string_view versionBehind(std::string_view banner, std::string_view line);
+
 /// What a tool could not read.
 struct ReadFault {
     std::optional<std::uint64_t> byte;   ///< from the volume's start, where that is said

@@ -58,7 +58,8 @@ TEST(Job, VerifyAnswersWhatIsTrue)
           Case{"say Pass 1: Checking inodes\n", contract::kPLErrorInconclusive, "inconclusive"},
           Case{soundRun + "kill 9", contract::kPLErrorToolFailed, "failed"},
           Case{soundRun + "shrink 4194304", contract::kPLErrorDiskChanged, "failed"},
-          Case{"flood-lines", contract::kPLErrorDamaged, "damaged"},
+          // Ten of its lines are shown as problems, and the number of the others.
+          Case{"flood-lines", contract::kPLErrorDamaged, "damaged", 12},
           Case{"flood-bytes", contract::kPLErrorToolMisbehaved, "failed", 2}}) {
         FakeToolFixture fixture(c.script,
                                 test::with(&JobOptions::outputLimits, {1000, 10U << 20U}));
@@ -227,13 +228,15 @@ TEST(Job, IsToldThatAWritingToolComesToItsEndBeforeItStops)
 
 TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
 {
-    FakeFatFixture fixture(fatDamage + "exit 1");
+    FakeFatFixture fixture("say fsck.fat 4.2 (2021-01-31)\n" + fatDamage + "exit 1");
     fixture.repair();
     const test::Listener& heard = fixture.library.listener;
     EXPECT_EQ(heard.verdict, "damaged") << "it never says that it has changed anything";
     EXPECT_TRUE(heard.hasPlainLine("The volume “Disk” could not be repaired."));
-    EXPECT_EQ(heard.textsOf(contract::kFsckError).size(), 2U)
+    EXPECT_EQ(heard.textsOf(contract::kFsckFail).size(), 2U)
         << "once before the repair, and once for what is left";
+    EXPECT_EQ(heard.result.string(contract::kPLTool), "fsck.fat 4.2");
+    EXPECT_EQ(heard.result.integer(contract::kPLProblems), 1);
     EXPECT_EQ(heard.textsOf(contract::kFsckRepair).size(), 1U) << "one pass is enough";
 }
 

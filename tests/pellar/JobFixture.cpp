@@ -62,12 +62,13 @@ void Listener::plAsyncMessageForDisk(const contract::DiskReferencePointer&, std:
 
 void Listener::plAsyncFinishedForDisk(const contract::DiskReferencePointer&,
                                       contract::ErrorCode mainError, contract::ErrorCode,
-                                      const contract::Dictionary& result)
+                                      const contract::Dictionary& dictionary)
 {
     ++finished;
     error = mainError;
-    verdict = result.string(contract::kPLVerdict);
-    message = result.string(contract::kPLMessage);
+    verdict = dictionary.string(contract::kPLVerdict);
+    message = dictionary.string(contract::kPLMessage);
+    result = dictionary;
     if (onFinished)
         onFinished();
 }
@@ -89,8 +90,11 @@ bool Listener::hasPlainLine(std::string_view part) const
 
 bool Listener::hasErrorWith(std::string_view part) const
 {
-    const auto errors = textsOf(contract::kFsckError);
-    return std::ranges::any_of(errors, [part](const auto& line) { return contains(line, part); });
+    const auto isIn = [part](const auto& line) {
+        return contains(line, part);
+    };
+    return std::ranges::any_of(textsOf(contract::kFsckError), isIn) ||
+           std::ranges::any_of(textsOf(contract::kFsckFail), isIn);
 }
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,

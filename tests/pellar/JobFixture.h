@@ -73,6 +73,7 @@ public:
     contract::ErrorCode error = 0;
     std::string verdict;
     std::string message;
+    contract::Dictionary result;
     std::vector<std::string> plainLines;
     std::vector<contract::Dictionary> dictionaries;
     std::vector<double> progress;

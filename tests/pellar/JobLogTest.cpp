@@ -86,7 +86,7 @@ TEST(JobLog, ShowsNoControlCharacters)
     fixture.log.problem("\x1b[2Jgone");
     fixture.deliver();
     EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
-    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckError),
+    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckFail),
               std::vector<std::string>{"\uFFFD[2Jgone"});
 }
 
@@ -118,7 +118,7 @@ TEST(JobLog, KeepsTenThousandProblemsReadable)
         fixture.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
     fixture.log.endOfRun();
     fixture.deliver();
-    const auto errors = fixture.listener.textsOf(contract::kFsckError);
+    const auto errors = fixture.listener.textsOf(contract::kFsckFail);
     EXPECT_EQ(errors.size(), ProblemLimiter::shownInAll + 2);
     EXPECT_EQ(errors[100], "… and %1$@ more like “%2$@”");
     EXPECT_EQ(fixture.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
@@ -127,6 +127,49 @@ TEST(JobLog, KeepsTenThousandProblemsReadable)
         fixture.listener.dictionaries[100][contract::kFsckParameters].array();
     EXPECT_EQ(rest.at(0).integer(), 9990);
     EXPECT_EQ(rest.at(1).string(), "Entry '…' in / (#) has a wrong inode #.");
+}
+
+// A module draws every error as a heading; of many problems that would be a wall.
+TEST(JobLog, ProblemsOfToolsAreNoHeadingsAndAreSummedUpInOne)
+{
+    struct Case {
+        int kinds;
+        int ofEach;
+        std::string_view sentence;
+        std::int64_t problems;
+        std::int64_t knownKinds;
+    };
+    for (const Case& c :
+         {Case{0, 0, "", 0, 0}, Case{1, 1, "1 problem was found.", 1, 1},
+          Case{1, 30, "%1$@ problems of one kind were found.", 30, 1},
+          Case{3, 20, "%1$@ problems of %2$@ kinds were found.", 60, 3},
+          Case{200, 2, "%1$@ problems of more than %2$@ kinds were found.", 400, 0}}) {
+        LogFixture fixture;
+        for (int kind = 0; kind < c.kinds; ++kind)
+            for (int i = 0; i < c.ofEach; ++i)
+                fixture.log.problem("problem " +
+                                    std::string(static_cast<std::size_t>(kind) + 1, 'x'));
+        fixture.log.endOfRun();
+        fixture.log.problem("of a second run, which finds the same");
+        fixture.log.endOfRun();
+        const bool hasFound = c.problems > 0;
+        if (hasFound)
+            fixture.log.tellProblems();
+        fixture.log.finished(0, 0, contract::kPLVerdictDamaged, "");
+        fixture.deliver();
+        for (const contract::Dictionary& message : fixture.listener.dictionaries) {
+            const bool isProblem =
+                message.string(contract::kFsckMessageType) == contract::kFsckFail.text();
+            EXPECT_TRUE(!isProblem || message.integer(contract::kFsckVerbosity) == 0);
+        }
+        const auto sentences = fixture.listener.textsOf(contract::kFsckError);
+        EXPECT_EQ(sentences.size(), hasFound ? 1U : 0U);
+        if (hasFound) {
+            EXPECT_EQ(sentences.at(0), c.sentence);
+            EXPECT_EQ(fixture.listener.result.integer(contract::kPLProblems), c.problems);
+            EXPECT_EQ(fixture.listener.result.integer(contract::kPLProblemKinds), c.knownKinds);
+        }
+    }
 }
 
 TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
@@ -149,6 +192,20 @@ TEST(ProgressMeter, OnlyGrowsAndStaysWithin)
     ProgressMeter other;
     EXPECT_EQ(other.report(20, now), 20.05) << "20 itself means something else";
     EXPECT_EQ(other.report(30, now + 50ms), std::nullopt) << "too soon";
+}
+
+TEST(ToolRun, KnowsAVersionFromOtherLines)
+{
+    for (const auto& [banner, line, version] :
+         {std::tuple("e2fsck ", "e2fsck 1.47.0 (5-Feb-2023)", "1.47.0"),
+          {"fsck.fat ", "fsck.fat 4.2 (2021-01-31)", "4.2"},
+          {"exfatprogs version : ", "exfatprogs version : 1.2.0", "1.2.0"},
+          {"ntfsresize v", "ntfsresize v2022.10.3 (libntfs-3g)", "2022.10.3"},
+          {"e2fsck ", "e2fsck 1.48~WIP+x\x1b[2J", "1.48~WIP+x"},
+          {"e2fsck ", "e2fsck could not open it", ""},
+          {"e2fsck ", "e2fsck 111111111111111111111111111111", ""},
+          {"", "1.2", ""}})
+        EXPECT_EQ(versionBehind(banner, line), version) << line;
 }
 
 TEST(ToolRun, ReplacesOurNameForTheDisk)

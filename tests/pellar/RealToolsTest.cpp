@@ -314,7 +314,6 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         EXPECT_EQ(library.listener.textsOf(contract::kFsckError).empty(), waits);
         EXPECT_TRUE(contentsOf(image) == before) << "a verification wrote";
 
-        const std::size_t failures = library.listener.textsOf(contract::kFsckFail).size();
         ASSERT_EQ(library.repair(disk), 0);
         EXPECT_EQ(library.listener.verdict, "repaired");
         EXPECT_TRUE(library.listener.hasPlainLine("“Disk” was repaired successfully.\n"));
@@ -322,8 +321,9 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
             const bool isLoss = test::contains(damage.message, "files");
-            ASSERT_EQ(warnings.size() > failures, isLoss) << damage.message;
-            EXPECT_TRUE(!isLoss || warnings.back() == library.listener.message);
+            const bool hasWarned =
+                !warnings.empty() && warnings.back() == library.listener.message;
+            EXPECT_EQ(hasWarned, isLoss) << damage.message;
         }
         ASSERT_EQ(library.verify(disk), 0);
         EXPECT_EQ(library.listener.verdict, "sound") << "after";

@@ -12,7 +12,9 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <chrono>
 #include <cmath>
+#include <thread>
 
 namespace orvane {
 namespace {
@@ -215,7 +217,7 @@ TEST_F(HistoryTest, WhatCannotBeKeptHoldsInMemoryWithOneWarning)
 TEST_F(HistoryTest, RunsAreKeptAndCutOffOnesStayOpen)
 {
     const Run::Time start(std::chrono::seconds(1000));
-    const RunEnd end{"damaged", -69701, "cannot ‘\x1b’"};
+    const RunEnd end{"damaged", -69701, "cannot ‘\x1b’", "e2fsck 1.47.0", 62, 3};
     {
         HistoryStore mine = open();
         mine.endRun(mine.beginRun("v", "verify", start), end, start + std::chrono::seconds(5));
@@ -234,6 +236,92 @@ TEST_F(HistoryTest, RunsAreKeptAndCutOffOnesStayOpen)
         ASSERT_TRUE(file.execute(("UPDATE openRuns SET owner = " + std::string(program)).c_str()));
         EXPECT_EQ(mine.lastRun("v")->verdict(), "") << "cut off with its program: " << program;
     }
+}
+
+// As a program made it before runs had a tool.
+TEST_F(HistoryTest, AnEarlierDatabaseGetsTheColumnsItLacks)
+{
+    static_cast<void>(open());
+    {
+        Database file = Database::open(file_);
+        ASSERT_TRUE(file.execute(
+            "ALTER TABLE runs DROP COLUMN tool; ALTER TABLE runs DROP COLUMN problemKinds;"
+            "INSERT INTO volumes (key) VALUES ('v');"
+            "INSERT INTO runs (volume, started, finished, action, verdict, error, message) "
+            "VALUES (1, 5, 6, 'verify', 'damaged', 7, 'why')"));
+    }
+    const RunEnd end{"sound", 0, "", "fsck.fat 4.2", 1, 1};
+    {
+        HistoryStore mine = open();
+        mine.endRun(mine.beginRun("v", "verify", {}), end, {});
+    }
+    const auto runs = open().runs("v");
+    ASSERT_EQ(runs.size(), 2U);
+    EXPECT_EQ(runs[0].end, (RunEnd{"damaged", 7, "why"})) << "nothing is made up";
+    EXPECT_EQ(runs[1].end, end);
+    EXPECT_TRUE(warnings_.empty());
+}
+
+/// As a module begins a run.
+Dictionary startOfRun(std::string_view title)
+{
+    return Dictionary::of({{contract::kFsckMessageString, title}, {contract::kFsckVerbosity, -1}});
+}
+
+// By the time at which the first record of each was saved.
+TEST_F(HistoryTest, RunsAreFoundByTheRecordsTheyBeginWith)
+{
+    const auto action = [](DiskHistories& histories, const DiskFacts& disk, const char* title) {
+        const Array all = histories.historyOf(disk);
+        for (std::size_t i = 0; i < all.size(); ++i)
+            if (const Dictionary record = all.at(i).dictionary();
+                record.string(contract::kFsckMessageString) == title) {
+                const auto known = histories.runOf(record);
+                return !known ? "unknown" : known->run ? known->run->action : "none";
+            }
+        return std::string("no such record");
+    };
+    const DiskFacts other = device("/dev/z", "another");
+    const auto check = [&](DiskHistories& histories, const char* when) {
+        EXPECT_EQ(action(histories, disk_, "first"), "verify") << when;
+        EXPECT_EQ(action(histories, disk_, "never began"), "none") << when;
+        EXPECT_EQ(action(histories, disk_, "third"), "repair") << when;
+        EXPECT_EQ(action(histories, other, "of another"), "undo") << when;
+        EXPECT_EQ(action(histories, disk_, "message"), "unknown") << when;
+        const Array all = histories.historyOf(disk_);
+        EXPECT_FALSE(histories.isNewestStart(all.front().dictionary())) << when;
+        EXPECT_TRUE(histories.isNewestStart(all.at(all.size() - 2).dictionary())) << when;
+    };
+    HistoryStore mine = open();
+    {
+        DiskHistories histories(mine);
+        histories.rememberCleared();
+        const auto begin = [&](const DiskFacts& disk, const char* title, const char* run) {
+            histories.historyOf(disk).append(startOfRun(title));
+            EXPECT_FALSE(histories.runOf(histories.historyOf(disk).back().dictionary()));
+            histories.saveNew();
+            if (run != nullptr)
+                mine.endRun(mine.beginRun(histories.keyOf(disk), run, Run::Time::clock::now()),
+                            {"sound", 0, ""}, Run::Time::clock::now());
+            std::this_thread::sleep_for(std::chrono::milliseconds(2));
+            histories.historyOf(disk).append(Dictionary::of(
+                {{contract::kFsckMessageString, "message"}, {contract::kFsckVerbosity, -1},
+                 {contract::Name("kOV_typeOfOutputKey"), "kOV_typeOfOutput_dict"}}));
+            histories.saveNew();
+        };
+        begin(disk_, "first", "verify");
+        begin(disk_, "never began", nullptr);
+        begin(other, "of another", "undo");
+        begin(disk_, "third", "repair");
+        check(histories, "while the program runs");
+        EXPECT_TRUE(histories.clearHistoryOf(disk_));
+        EXPECT_FALSE(histories.isNewestStart(startOfRun("third")));
+        histories.restoreCleared();
+        check(histories, "after clearing was undone");
+    }
+    DiskHistories later(mine);
+    (void)later.historyOf(other);
+    check(later, "read again");
 }
 
 TEST_F(HistoryTest, WhatAnotherProgramHoldsUpIsWrittenLater)

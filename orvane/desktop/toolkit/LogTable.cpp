@@ -1,22 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/LogTable.h"
 
-#include "orvane/desktop/toolkit/LogModel.h"
-#include "orvane/desktop/toolkit/StyledLine.h"
-#include "orvane/desktop/toolkit/Text.h"
+#include "orvane/desktop/toolkit/LogDelegate.h"
 
 #include <QApplication>
 #include <QFontMetrics>
 #include <QHeaderView>
-#include <QHelpEvent>
 #include <QMouseEvent>
-#include <QPainter>
 #include <QScrollBar>
-#include <QStyledItemDelegate>
-#include <QToolTip>
 
 #include <algorithm>
-#include <cmath>
+#include <utility>
 
 namespace orvane::desktop {
 namespace {
@@ -24,52 +18,6 @@ namespace {
 constexpr int noteMargin = 24;       // pixels
 constexpr int spaceBetweenRows = 2;  // pixels
 constexpr int mostTries = 4;
-
-LineLooks looksOf(const QStyleOptionViewItem& option, const contract::Font& font)
-{
-    const bool isSelected = option.state.testFlag(QStyle::State_Selected);
-    const auto group = !option.state.testFlag(QStyle::State_Enabled) ? QPalette::Disabled
-                       : option.state.testFlag(QStyle::State_Active) ? QPalette::Active
-                                                                     : QPalette::Inactive;
-    LineLooks looks;
-    looks.fontScale = desktopFontScale();
-    looks.defaultFont = font;
-    looks.textColor =
-        option.palette.color(group, isSelected ? QPalette::HighlightedText : QPalette::Text);
-    looks.background =
-        option.palette.color(group, isSelected ? QPalette::Highlight : QPalette::Base);
-    looks.keepsTextColor = isSelected;
-    return looks;
-}
-
-/// None where there is nothing to show yet, or any more.
-contract::OutlineView* viewOf(const QModelIndex& index)
-{
-    const auto* const model = static_cast<const LogModel*>(index.model());
-    contract::OutlineView* const view = model != nullptr ? model->view() : nullptr;
-    return view != nullptr && view->dataCell() != nullptr ? view : nullptr;
-}
-
-bool isSentence(const QModelIndex& index)
-{
-    return !isDetail(static_cast<const LogModel*>(index.model())->itemAt(index.row()));
-}
-
-/// For a LogModel. Paints a row of the log: the text of the module's cell, in the frame that the
-/// module's view gives, in colours that are readable on the desktop's palette. What is shown
-/// without details are sentences to be read, and take as many lines as they need; the lines that
-/// tools print among the details are cut as the module says, and are whole in a tooltip.
-class LogDelegate final : public QStyledItemDelegate {
-public:
-    using QStyledItemDelegate::QStyledItemDelegate;
-
-    void paint(QPainter* painter, const QStyleOptionViewItem& option,
-               const QModelIndex& index) const override;
-    /// The option's rectangle has the row's width, and the height of a row of one line.
-    QSize sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const override;
-    bool helpEvent(QHelpEvent* event, QAbstractItemView* view, const QStyleOptionViewItem& option,
-                   const QModelIndex& index) override;
-};
 
 }  // namespace
 
@@ -101,56 +49,6 @@ void EmptyNote::follow()
 {
     setGeometry(view_.viewport()->rect());
     setVisible(view_.model()->rowCount() == 0);
-}
-
-void LogDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
-                        const QModelIndex& index) const
-{
-    drawRowBackground(*painter, option);
-    contract::OutlineView* const view = viewOf(index);
-    if (view == nullptr)
-        return;
-    const auto row = static_cast<std::size_t>(index.row());
-    const contract::Rect frame = view->frameOfCellAtColumnRow(0, row);
-    const auto put = isSentence(index) ? drawWrapped : draw;
-    put(*painter, QRectF(frame.x, frame.y, frame.width, frame.height),
-        oneLine(textOfRow(*view, row)), looksOf(option, view->dataCell()->font()));
-}
-
-QSize LogDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const
-{
-    constexpr int mostLines = 12;  // a name may be as long as it likes
-    contract::OutlineView* const view = viewOf(index);
-    if (view == nullptr || !isSentence(index))
-        return option.rect.size();
-    const auto row = static_cast<std::size_t>(index.row());
-    const StyledLine line = oneLine(textOfRow(*view, row));
-    const LineLooks looks = looksOf(option, view->dataCell()->font());
-    const double width = view->frameOfCellAtColumnRow(0, row).width;
-    const QFontMetricsF metrics(widestFont(line, looks));
-    if (metrics.horizontalAdvance(line.text) <= width)
-        return option.rect.size();
-    const double added = wrappedHeight(line, looks, width) - metrics.height();
-    return {option.rect.width(),
-            std::min(option.rect.height() * mostLines,
-                     option.rect.height() + static_cast<int>(std::ceil(std::max(0.0, added))))};
-}
-
-bool LogDelegate::helpEvent(QHelpEvent* event, QAbstractItemView* table,
-                            const QStyleOptionViewItem& option, const QModelIndex& index)
-{
-    contract::OutlineView* const view = viewOf(index);
-    if (view == nullptr || event->type() != QEvent::ToolTip)
-        return QStyledItemDelegate::helpEvent(event, table, option, index);
-    const auto row = static_cast<std::size_t>(index.row());
-    const StyledLine line = oneLine(textOfRow(*view, row));
-    const QFontMetricsF metrics(widestFont(line, looksOf(option, view->dataCell()->font())));
-    const bool isCut =
-        !isSentence(index) &&
-        fitted(line, metrics, view->frameOfCellAtColumnRow(0, row).width).text != line.text;
-    QToolTip::showText(event->globalPos(), isCut ? toQtToolTip(fromQt(line.text)) : QString(),
-                       table);
-    return true;
 }
 
 LogTable::LogTable(QWidget* parent) : QTableView(parent)
@@ -252,11 +150,35 @@ void LogTable::mousePressEvent(QMouseEvent* event)
 {
     const QModelIndex index = indexAt(event->position().toPoint());
     setDragEnabled(isDraggable_ && index.isValid() && selectionModel()->isSelected(index));
+    const bool isPlain =
+        event->button() == Qt::LeftButton && event->modifiers() == Qt::NoModifier;
+    pressed_ = isPlain ? QPersistentModelIndex(index) : QPersistentModelIndex();
     QTableView::mousePressEvent(event);
+}
+
+// A row that is dragged, or over which rows are selected, is not clicked.
+void LogTable::mouseReleaseEvent(QMouseEvent* event)
+{
+    QTableView::mouseReleaseEvent(event);
+    const QPersistentModelIndex pressed = std::exchange(pressed_, QPersistentModelIndex());
+    if (pressed.isValid() && pressed == indexAt(event->position().toPoint()) && handlers_.clicked)
+        handlers_.clicked(pressed.row());
+}
+
+void LogTable::mouseDoubleClickEvent(QMouseEvent* event)
+{
+    mousePressEvent(event);
+}
+
+void LogTable::setSearched(const QString& text)
+{
+    if (std::exchange(searched_, text) != text)
+        viewport()->update();
 }
 
 void LogTable::startDrag(Qt::DropActions /*supported*/)
 {
+    pressed_ = QPersistentModelIndex();
     if (handlers_.drag)
         handlers_.drag();
 }

@@ -3,6 +3,7 @@
 
 #include <QAbstractItemView>
 #include <QLabel>
+#include <QPersistentModelIndex>
 #include <QTableView>
 
 #include <functional>
@@ -38,6 +39,8 @@ public:
         std::function<void(QKeyEvent&)> keyDown;
         /// Selected rows are dragged.
         std::function<void()> drag;
+        /// A row was clicked, without a key held.
+        std::function<void(int row)> clicked;
     };
 
     explicit LogTable(QWidget* parent);
@@ -45,6 +48,9 @@ public:
     void setHandlers(Handlers handlers) { handlers_ = std::move(handlers); }
     /// Selected rows can be dragged out of the log.
     void setDraggable(bool isDraggable) { isDraggable_ = isDraggable; }
+    /// Where it occurs in a row, it is marked; in no row when it is empty.
+    void setSearched(const QString& text);
+    const QString& searched() const { return searched_; }
     /// What is hidden below the last visible row.
     int pixelsToEnd() const;
     void scrollToPixelsBeforeEnd(int pixels);
@@ -57,6 +63,8 @@ public:
 protected:
     void keyPressEvent(QKeyEvent* event) override;
     void mousePressEvent(QMouseEvent* event) override;
+    void mouseReleaseEvent(QMouseEvent* event) override;
+    void mouseDoubleClickEvent(QMouseEvent* event) override;
     void startDrag(Qt::DropActions supported) override;
     void changeEvent(QEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
@@ -70,6 +78,8 @@ private:
 
     Handlers handlers_;
     bool isDraggable_ = true;
+    QPersistentModelIndex pressed_;
+    QString searched_;
 };
 
 }  // namespace orvane::desktop

@@ -9,9 +9,11 @@
 #include <QDrag>
 #include <QKeyEvent>
 #include <QMetaObject>
+#include <QScopedValueRollback>
 
 #include <algorithm>
 #include <memory>
+#include <numeric>
 #include <utility>
 
 namespace orvane::desktop {
@@ -39,20 +41,8 @@ LogPlace::LogPlace(const LogTable& table, const LogModel& model)
     const auto rowAt = [&model](int number) {
         return Row{number, model.itemAt(number)};
     };
-    const int first = table.rowAt(0);
-    const int height = table.viewport()->height();
-    for (int row = first; row >= 0 && row < rows_; ++row) {
-        const int top = table.rowViewportPosition(row);
-        if (top >= height)
-            break;
-        inSight_.push_back({rowAt(row), top});
-    }
-    // Where nothing but details is in sight, the line that they belong to stands in for them.
-    for (int row = first; row >= 0; --row)
-        if (!isDetail(model.itemAt(row))) {
-            inSight_.push_back({rowAt(row), table.rowViewportPosition(first)});
-            break;
-        }
+    if (!isAtEnd_)
+        noteSight(table, model);
     for (const QItemSelectionRange& range : table.selectionModel()->selection())
         selected_.push_back({rowAt(range.top()), rowAt(range.bottom())});
     if (!table.currentIndex().isValid())
@@ -64,6 +54,25 @@ LogPlace::LogPlace(const LogTable& table, const LogModel& model)
         [this](const SightedRow& sighted) { return sighted.row.number == current_->number; });
     if (current != inSight_.end())
         std::rotate(inSight_.begin(), current, current + 1);
+}
+
+// At the end, where a flood of output is followed, none of this is needed.
+void LogPlace::noteSight(const LogTable& table, const LogModel& model)
+{
+    const int first = table.rowAt(0);
+    const int height = table.viewport()->height();
+    for (int row = first; row >= 0 && row < rows_; ++row) {
+        const int top = table.rowViewportPosition(row);
+        if (top >= height)
+            break;
+        inSight_.push_back({{row, model.itemAt(row)}, top});
+    }
+    // Where nothing but details is in sight, the line that they belong to stands in for them.
+    for (int row = first; row >= 0; --row)
+        if (!isDetail(model.itemAt(row))) {
+            inSight_.push_back({{row, model.itemAt(row)}, table.rowViewportPosition(first)});
+            break;
+        }
 }
 
 // Where rows came in one place, a row is where it was or that much further down. Only where they
@@ -114,7 +123,18 @@ OutlinePeer::OutlinePeer(LogTable& table, std::function<void()> beforeRows)
     table.setHandlers({[this](QKeyEvent& event) { sendKey(event); },
                        [this] {
                            drag();
+                       },
+                       [this](int row) {
+                           if (model_.isHeading(row))
+                               toggle(row);
                        }});
+    QObject::connect(table.selectionModel(), &QItemSelectionModel::selectionChanged, &model_,
+                     [this] {
+                         if (!isOwnChange_)
+                             selectedWhole_ = 0;
+                     });
+    look_.setInterval(0);
+    QObject::connect(&look_, &QTimer::timeout, &model_, [this] { lookOn(); });
 }
 
 OutlinePeer::~OutlinePeer()
@@ -127,7 +147,8 @@ void OutlinePeer::setView(contract::OutlineView* view)
 {
     view_ = view;
     model_.setView(view);
-    rows_ = static_cast<std::size_t>(model_.rowCount());
+    rows_ = static_cast<std::size_t>(model_.rowsOfView());
+    look_.start();
 }
 
 void OutlinePeer::reloadData()
@@ -162,49 +183,144 @@ void OutlinePeer::flush()
     const auto row = std::exchange(mustShow_, std::nullopt);
     if (std::exchange(mustShowEnd_, false))
         table_->scrollToPixelsBeforeEnd(0);
-    else if (row && *row < rows_)
-        table_->scrollTo(model_.index(static_cast<int>(*row)));
+    else if (const auto shown = row ? model_.shownRow(static_cast<int>(*row)) : std::nullopt)
+        table_->scrollTo(model_.index(*shown));
 }
 
 // Another log is shown from its end, where the last verdict stands. In one that goes on, who reads
 // at its end is shown the new end, and who has scrolled up keeps the place.
 void OutlinePeer::reload()
 {
+    const QScopedValueRollback own(isOwnChange_, true);
     const LogModel::Change change = model_.reload();
-    rows_ = static_cast<std::size_t>(model_.rowCount());
+    rows_ = static_cast<std::size_t>(model_.rowsOfView());
     if (change == LogModel::Change::None)
         return;
-    if (change == LogModel::Change::Other)
+    if (change == LogModel::Change::Other) {
+        selectedWhole_ = 0;
         place_.restoreSelection(*table_, model_);
-    if (place_.isAtEnd())
+        keepPlace(place_);
+        look_.start();
+    } else if (place_.isAtEnd()) {
         table_->scrollToPixelsBeforeEnd(0);
-    else if (change != LogModel::Change::MoreAtEnd && !place_.restoreSight(*table_, model_))
+    }
+    if (rowsChanged_)
+        rowsChanged_(change);
+}
+
+void OutlinePeer::keepPlace(const LogPlace& place)
+{
+    if (place.isAtEnd() || !place.restoreSight(*table_, model_))
         table_->scrollToPixelsBeforeEnd(0);
+}
+
+void OutlinePeer::lookOn()
+{
+    constexpr std::chrono::milliseconds budget{8};
+    const LogPlace place(*table_, model_);
+    const QScopedValueRollback own(isOwnChange_, true);
+    const int before = model_.rowCount();
+    if (!model_.lookOn(budget))
+        look_.stop();
+    if (model_.rowCount() == before)
+        return;
+    keepPlace(place);
+    if (selectedWhole_ > 0)
+        selectShownRows();
+}
+
+void OutlinePeer::setFilter(LogRuns::Filter filter)
+{
+    const LogPlace place(*table_, model_);
+    model_.setFilter(filter);
+    selectedWhole_ = 0;
+    place.restoreSelection(*table_, model_);
+    keepPlace(place);
+    look_.start();
+}
+
+bool OutlinePeer::goTo(std::size_t row)
+{
+    const auto shown = model_.reveal(static_cast<int>(row));
+    if (!shown)
+        return false;
+    const QModelIndex index = model_.index(*shown);
+    table_->setCurrentIndex(index);
+    table_->scrollTo(index, QAbstractItemView::EnsureVisible);
+    return true;
+}
+
+void OutlinePeer::toggle(int shown)
+{
+    const bool wasAtEnd = table_->pixelsToEnd() == 0;
+    const QScopedValueRollback own(isOwnChange_, true);
+    model_.setOpen(shown, !model_.isOpen(shown));
+    if (selectedWhole_ > 0)
+        selectShownRows();
+    // Where the table could not stay, the heading does.
+    if (wasAtEnd)
+        table_->scrollTo(model_.index(shown));
+}
+
+// As in a tree: towards the end side opens, towards the start side closes, or goes to the heading.
+bool OutlinePeer::takeFoldingKey(const QKeyEvent& event)
+{
+    const int row = table_->currentIndex().row();
+    if (row < 0 || (event.modifiers() & ~Qt::KeypadModifier) != Qt::NoModifier)
+        return false;
+    const bool isMirrored = table_->layoutDirection() == Qt::RightToLeft;
+    const int opening = isMirrored ? Qt::Key_Left : Qt::Key_Right;
+    const int closing = isMirrored ? Qt::Key_Right : Qt::Key_Left;
+    const auto heading = event.key() == closing ? model_.headingOf(row) : std::nullopt;
+    if (heading && *heading != row) {
+        table_->setCurrentIndex(model_.index(*heading));
+        return true;
+    }
+    if (!model_.isHeading(row))
+        return false;
+    const bool isOpen = model_.isOpen(row);
+    const bool isToggle = event.key() == Qt::Key_Space || event.key() == Qt::Key_Return ||
+                          event.key() == Qt::Key_Enter;
+    if (isToggle || event.key() == (isOpen ? closing : opening))
+        toggle(row);
+    return isToggle || event.key() == opening || event.key() == closing;
 }
 
 std::string OutlinePeer::selectionHTML() const
 {
     std::string result;
-    if (view_ != nullptr)
-        for (const std::size_t row : selectedRowIndexes())
-            result += html(textOfRow(*view_, row));
+    for (const std::size_t row : selectedRowIndexes())
+        result += html(model_.notedText(static_cast<int>(row)));
+    return result;
+}
+
+std::string OutlinePeer::selectionText() const
+{
+    std::string result;
+    for (const std::size_t row : selectedRowIndexes())
+        result += model_.notedText(static_cast<int>(row)).characters();
     return result;
 }
 
 std::vector<std::size_t> OutlinePeer::selectedRowIndexes() const
 {
-    std::vector<std::size_t> rows;
+    std::vector<std::size_t> rows(selectedWhole_);
+    std::iota(rows.begin(), rows.end(), std::size_t{0});
+    if (selectedWhole_ > 0)
+        return rows;
     rows.reserve(numberOfSelectedRows());
     for (const QItemSelectionRange& range : table_->selectionModel()->selection())
         for (int row = range.top(); row <= range.bottom(); ++row)
-            rows.push_back(static_cast<std::size_t>(row));
+            rows.push_back(static_cast<std::size_t>(model_.viewRow(row)));
     std::sort(rows.begin(), rows.end());
     return rows;
 }
 
 std::size_t OutlinePeer::numberOfSelectedRows() const
 {
-    std::size_t count = 0;
+    std::size_t count = selectedWhole_;
+    if (count > 0)
+        return count;
     for (const QItemSelectionRange& range : table_->selectionModel()->selection())
         count += static_cast<std::size_t>(range.height());
     return count;
@@ -220,9 +336,11 @@ void OutlinePeer::scrollRowToVisible(std::size_t row)
 
 contract::Rect OutlinePeer::rectOfRow(std::size_t row) const
 {
-    if (row >= static_cast<std::size_t>(model_.rowCount()))
+    const auto shown =
+        row < rows_ ? model_.shownRow(static_cast<int>(row)) : std::optional<int>();
+    if (!shown)
         return {};
-    const QRect rect = table_->visualRect(model_.index(static_cast<int>(row)));
+    const QRect rect = table_->visualRect(model_.index(*shown));
     return {static_cast<double>(rect.x()), static_cast<double>(rect.y()),
             static_cast<double>(rect.width()), static_cast<double>(rect.height())};
 }
@@ -252,7 +370,9 @@ void OutlinePeer::sendKey(QKeyEvent& event)
         view_->selectAll(&table());
     else if (event.matches(QKeySequence::Copy) && view_->validateMenuItem({"copy:"}))
         view_->copy(&table());
-    else if (!event.matches(QKeySequence::Copy))
+    else if (event.key() == Qt::Key_Escape && escaped_)
+        escaped_();
+    else if (!event.matches(QKeySequence::Copy) && !takeFoldingKey(event))
         view_->keyDown({keyCodeOf(event.key()), modifierFlags(event.modifiers()), &event});
 }
 
@@ -265,6 +385,14 @@ void OutlinePeer::keyDown(const contract::KeyEvent& event)
 void OutlinePeer::selectAll()
 {
     flush();
+    selectShownRows();
+    if (model_.filter() == LogRuns::Filter::None)
+        selectedWhole_ = rows_;
+}
+
+void OutlinePeer::selectShownRows()
+{
+    const QScopedValueRollback own(isOwnChange_, true);
     table_->selectAll();
 }
 
@@ -297,6 +425,7 @@ void OutlinePeer::drag()
     MimePasteboard pasteboard;
     if (!source->outlineViewWriteItemsToPasteboard(items, pasteboard))
         return;
+    pasteboard.replaceText(selectionText());
     std::unique_ptr<QMimeData> data = pasteboard.take();
     data->setHtml(toQt(selectionHTML()));
     auto* const drag = new QDrag(table_);  // Qt deletes it when the drag is over

@@ -7,6 +7,7 @@
 #include "orvane/desktop/toolkit/QtControls.h"
 
 #include <QPointer>
+#include <QTimer>
 
 #include <functional>
 #include <optional>
@@ -47,6 +48,7 @@ private:
         Row last;
     };
 
+    void noteSight(const LogTable& table, const LogModel& model);
     std::optional<int> find(const LogModel& model, const Row& row) const;
 
     bool isAtEnd_ = true;
@@ -72,8 +74,24 @@ public:
     /// Shows what is waiting.
     void flush();
     LogTable& table() { return *table_; }
-    /// The selected rows as HTML, for the pasteboard.
+    const LogModel& model() const { return model_; }
+    /// The selected rows as HTML and as plain text, for the pasteboard. Headings come with what is
+    /// known of their runs.
     std::string selectionHTML() const;
+    std::string selectionText() const;
+
+    void setRunKnowledge(RunKnowledge knowledge) { model_.setRunKnowledge(std::move(knowledge)); }
+    void setFilter(LogRuns::Filter filter);
+    /// Unfolds what hides a row of the view, and makes it the one that is selected and in sight; NO
+    /// where it is not shown even then.
+    bool goTo(std::size_t row);
+    /// Told after the rows of the view have changed.
+    void setRowsChanged(std::function<void(LogModel::Change)> told)
+    {
+        rowsChanged_ = std::move(told);
+    }
+    /// Escape was pressed in the log.
+    void setEscaped(std::function<void()> told) { escaped_ = std::move(told); }
 
     void reloadData() override;
     std::size_t numberOfRows() const override { return rows_; }
@@ -99,6 +117,11 @@ public:
 private:
     void noteChange();
     void reload();
+    void lookOn();
+    void keepPlace(const LogPlace& place);
+    void selectShownRows();
+    void toggle(int shown);
+    bool takeFoldingKey(const QKeyEvent& event);
     void sendKey(QKeyEvent& event);
     void drag();
 
@@ -108,6 +131,13 @@ private:
     QtScroller scroller_;
     contract::OutlineView* view_ = nullptr;
     std::size_t rows_ = 0;
+    /// The first so many rows of the view are selected, also those that are folded; 0 when the
+    /// selection is the table's.
+    std::size_t selectedWhole_ = 0;
+    bool isOwnChange_ = false;  ///< of the selection, because rows come and go
+    QTimer look_;
+    std::function<void(LogModel::Change)> rowsChanged_;
+    std::function<void()> escaped_;
     bool mustReload_ = false;
     bool isWaiting_ = false;  ///< the event loop will come to `flush`
     LogPlace place_;          ///< of the reader, before the reload that is waiting

@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/toolkit/QtInterface.h"
 
+#include "contract/toolkit/ControlNames.h"
+#include "orvane/desktop/toolkit/LogSearch.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/Text.h"
 
 #include <QAbstractButton>
+#include <QBoxLayout>
 #include <QEvent>
 #include <QFile>
 #include <QLabel>
@@ -136,8 +139,9 @@ private:
 }  // namespace
 
 LoadedInterface::LoadedInterface(std::unique_ptr<QWidget> root, contract::InterfaceOwner& owner,
-                                 const std::function<void()>& beforeRows)
-    : root_(root.release()), owner_(&owner), beforeRows_(beforeRows)
+                                 const std::function<void()>& beforeRows,
+                                 const contract::Bundle* hostTexts)
+    : root_(root.release()), owner_(&owner), beforeRows_(beforeRows), hostTexts_(hostTexts)
 {
     adoptButtons();
     for (const contract::Outlet& outlet : owner.outlets())
@@ -207,10 +211,43 @@ void LoadedInterface::makeOutlineView(contract::OutlineView** place, LogTable& t
     const auto word = [&table](const char* property) {
         return table.property(property).toString();
     };
+    const auto hostWord = [this](std::string_view key) {
+        return hostTexts_ != nullptr ? toQt(hostTexts_->localizedString(key)) : toQt(key);
+    };
     static_cast<LogModel*>(table.model())
-        ->setSpokenTypes({word(problemProperty), word(successProperty)});
+        ->setSpokenTypes({word(problemProperty), word(successProperty), hostWord("expanded"),
+                          hostWord("collapsed")});
+    if (hostTexts_ != nullptr)
+        addHostControls(table);
     if (const QString note = word(emptyNoteProperty); !note.isEmpty())
         emptyNote_ = new EmptyNote(table, note);
+}
+
+// The search above the log, and the switch beside that for the details, where there is one.
+void LoadedInterface::addHostControls(LogTable& table)
+{
+    const auto layoutOf = [](QWidget& widget) -> QBoxLayout* {
+        QWidget* const parent = widget.parentWidget();
+        if (parent == nullptr || parent->layout() == nullptr)
+            return nullptr;
+        for (QBoxLayout* const layout : parent->findChildren<QBoxLayout*>())
+            if (layout->indexOf(&widget) >= 0)
+                return layout;
+        return nullptr;
+    };
+    QBoxLayout* const rows = layoutOf(table);
+    if (rows == nullptr)
+        return;
+    auto* const search = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
+    rows->insertWidget(rows->indexOf(&table), search);
+    QWidget* const details =
+        root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
+    QBoxLayout* const head = details != nullptr ? layoutOf(*details) : nullptr;
+    QCheckBox* const toggle = makeProblemsToggle(*peer_, *hostTexts_, table.parentWidget());
+    if (head != nullptr)
+        head->insertWidget(head->indexOf(details) + 1, toggle);
+    else
+        rows->insertWidget(rows->indexOf(search), toggle);
 }
 
 // The divider stands below the first pane: its limits are the pane's.
@@ -268,7 +305,8 @@ bool QtInterface::loadInterface(std::string_view name, contract::InterfaceOwner&
             loadInterfaceFile(bundle_->pathForResource(std::string(name) + ".ui"), *bundle_, error);
     const bool isLoaded = root != nullptr;
     if (isLoaded)
-        loaded_.push_back(std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_));
+        loaded_.push_back(std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_,
+                                                            hostTexts_));
     else
         qWarning("cannot load the interface %s: %s", std::string(name).c_str(),
                  qPrintable(error.isEmpty() ? QStringLiteral("no such file") : error));

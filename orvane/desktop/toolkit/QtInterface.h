@@ -25,8 +25,9 @@ class LoadedInterface {
 public:
     /// `root` is the widget that the interface file describes; this object owns it, wherever it
     /// is put in a window. The window must not be destroyed before the module.
+    /// Without the host's texts, its own controls of the log are left out.
     LoadedInterface(std::unique_ptr<QWidget> root, contract::InterfaceOwner& owner,
-                    const std::function<void()>& beforeRows);
+                    const std::function<void()>& beforeRows, const contract::Bundle* hostTexts);
     LoadedInterface(const LoadedInterface&) = delete;
     LoadedInterface& operator=(const LoadedInterface&) = delete;
     ~LoadedInterface();
@@ -58,6 +59,7 @@ private:
     void adoptButtons();
     void fill(const contract::Outlet& outlet);
     void limitSplitView();
+    void addHostControls(LogTable& table);
     void makeOutlineView(contract::OutlineView** place, LogTable& table);
     template <class Control, class Widget, class Outlet>
     void fillText(Outlet** place, std::string_view name);
@@ -65,6 +67,7 @@ private:
     QPointer<QWidget> root_;
     contract::InterfaceOwner* owner_;
     const std::function<void()>& beforeRows_;
+    const contract::Bundle* hostTexts_;
     std::function<bool(std::string_view action)> mayPerform_;
     std::map<std::string, std::unique_ptr<QtButton>, std::less<>> buttons_;
     std::vector<std::unique_ptr<contract::View>> texts_;
@@ -79,8 +82,13 @@ private:
 /// module's bundle. Main thread.
 class QtInterface final : public contract::InterfaceLoader {
 public:
-    /// `beforeRows` is called before new rows of a log are shown.
-    explicit QtInterface(std::function<void()> beforeRows) : beforeRows_(std::move(beforeRows)) {}
+    /// `beforeRows` is called before new rows of a log are shown. `hostTexts` outlives this object;
+    /// without it, logs cannot be searched.
+    explicit QtInterface(std::function<void()> beforeRows,
+                         const contract::Bundle* hostTexts = nullptr)
+        : beforeRows_(std::move(beforeRows)), hostTexts_(hostTexts)
+    {
+    }
 
     /// Where the interface file of the module that is made next lies; the bundle must live until
     /// then.
@@ -93,6 +101,7 @@ public:
 
 private:
     std::function<void()> beforeRows_;
+    const contract::Bundle* hostTexts_;
     const contract::Bundle* bundle_ = nullptr;
     std::vector<std::unique_ptr<LoadedInterface>> loaded_;
 };

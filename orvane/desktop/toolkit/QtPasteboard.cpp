@@ -66,8 +66,18 @@ void MimePasteboard::setData(std::string_view data, contract::PasteboardType typ
         becameComplete();
 }
 
+void MimePasteboard::replaceText(std::string_view text)
+{
+    if (!data_ || text.empty())
+        return;
+    put(*data_, text, contract::PasteboardType::PlainString);
+    put(*data_, text, contract::PasteboardType::TabularText);
+}
+
 void QtPasteboard::becameComplete()
 {
+    if (text_)
+        replaceText(text_());
     std::unique_ptr<QMimeData> data = take();
     const std::string html = html_ ? html_() : std::string();
     if (!html.empty())

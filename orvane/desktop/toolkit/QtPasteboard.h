@@ -20,6 +20,9 @@ public:
                       const void* owner) override;
     void setData(std::string_view data, contract::PasteboardType type) override;
 
+    /// What was collected as plain text is this instead, unless it is empty.
+    void replaceText(std::string_view text);
+
     /// What was collected; none when nothing was declared since the last call.
     std::unique_ptr<QMimeData> take() { return std::move(data_); }
 
@@ -39,11 +42,14 @@ public:
 
     /// Asked for an HTML version of what is copied; an empty answer is none.
     void setHTMLSource(HTMLSource source) { html_ = std::move(source); }
+    /// Asked for the plain text; an empty answer leaves what the module gave.
+    void setTextSource(std::function<std::string()> source) { text_ = std::move(source); }
 
 private:
     void becameComplete() override;
 
     HTMLSource html_;
+    std::function<std::string()> text_;
 };
 
 }  // namespace orvane::desktop

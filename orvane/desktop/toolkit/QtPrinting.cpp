@@ -3,9 +3,9 @@
 
 #include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
-#include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/history/RunStart.h"
 
 #include <QDateTime>
 #include <QFile>
@@ -48,16 +48,6 @@ QFont headerFont()
 constexpr std::chrono::milliseconds slice{20};
 constexpr double paperMargin = 15;  // millimetres
 constexpr int progressSteps = 1000;
-
-// The records are shared with the history, not copied.
-std::vector<contract::StyledText> rowsOf(contract::OutlineView& view)
-{
-    std::vector<contract::StyledText> rows;
-    rows.reserve(view.numberOfRows());
-    for (std::size_t row = 0; row < view.numberOfRows(); ++row)
-        rows.push_back(textOfRow(view, row));
-    return rows;
-}
 
 }  // namespace
 
@@ -274,6 +264,19 @@ PrintHeader QtPrinting::header() const
         }};
 }
 
+// The records are shared with the history, not copied, but for the headings.
+std::vector<contract::StyledText> QtPrinting::rows() const
+{
+    std::vector<contract::StyledText> rows;
+    rows.reserve(view_->numberOfRows());
+    for (std::size_t row = 0; row < view_->numberOfRows(); ++row) {
+        const contract::OutlineItem item = view_->itemAtRow(row);
+        const contract::StyledText text = textOfItem(*view_, item);
+        rows.push_back(noteOf_ && isStartOfRun(item) ? withNote(text, noteOf_(item)) : text);
+    }
+    return rows;
+}
+
 void QtPrinting::forget(const contract::OutlineView& view)
 {
     if (view_ != &view)
@@ -311,7 +314,7 @@ void QtPrinting::start(std::shared_ptr<QPrinter> printer, const contract::PrintI
     printer_ = std::move(printer);
     const contract::Font font =
         view_->dataCell() != nullptr ? view_->dataCell()->font() : contract::Font();
-    job_ = std::make_unique<PrintJob>(*printer_, rowsOf(*view_), font, info, header());
+    job_ = std::make_unique<PrintJob>(*printer_, rows(), font, info, header());
     // It shows itself when printing takes longer than a moment.
     progress_ =
         new QProgressDialog(text("Printing the log…"), text("Cancel"), 0, progressSteps, window_);

@@ -3,6 +3,7 @@
 
 #include "contract/foundation/Bundle.h"
 #include "contract/toolkit/Printing.h"
+#include "orvane/desktop/toolkit/LogModel.h"
 #include "orvane/desktop/toolkit/StyledLine.h"
 
 #include <QPainter>
@@ -107,6 +108,11 @@ public:
     /// Asked what is printed, for the head of the pages: the names of the disks. One line; what it
     /// answers may be hostile.
     void setTitle(std::function<std::string()> title) { title_ = std::move(title); }
+    /// Asked what is known of the run that begins with a row, to be printed with it.
+    void setNoteSource(std::function<RunNote(const contract::OutlineItem& start)> source)
+    {
+        noteOf_ = std::move(source);
+    }
     /// A view goes away: what is being printed of it is given up.
     void forget(const contract::OutlineView& view);
 
@@ -120,6 +126,7 @@ private:
     QString text(std::string_view key) const;
     QString title() const;
     PrintHeader header() const;
+    std::vector<contract::StyledText> rows() const;
     void start(std::shared_ptr<QPrinter> printer, const contract::PrintInfo& info);
     void goOn();
     void end(bool hasFailed);
@@ -127,6 +134,7 @@ private:
     const contract::Bundle& texts_;
     Failed failed_;
     std::function<std::string()> title_;
+    std::function<RunNote(const contract::OutlineItem& start)> noteOf_;
     contract::PrintInfo info_;
     QPointer<QWidget> window_;
     QPointer<QWidget> panel_;

@@ -176,6 +176,8 @@ void layOut(QTextLayout& layout, const StyledLine& line, const LineLooks& looks,
 {
     QTextOption option;
     option.setWrapMode(wrapMode);
+    if (looks.isMirrored)
+        option.setAlignment(Qt::AlignRight | Qt::AlignAbsolute);
     layout.setTextOption(option);
     layout.setFormats(formatsOf(line, looks));
     double height = 0;
@@ -190,12 +192,13 @@ void layOut(QTextLayout& layout, const StyledLine& line, const LineLooks& looks,
     layout.endLayout();
 }
 
-void drawCentred(QPainter& painter, const QRectF& rect, const QTextLayout& layout)
+void drawCentred(QPainter& painter, const QRectF& rect, const QTextLayout& layout,
+                 const LineLooks& looks)
 {
     const double top = rect.top() + (rect.height() - layout.boundingRect().height()) / 2;
     painter.save();
     painter.setClipRect(rect, Qt::IntersectClip);
-    layout.draw(&painter, QPointF(rect.left(), top));
+    layout.draw(&painter, QPointF(rect.left(), top), looks.marks);
     painter.restore();
 }
 
@@ -207,7 +210,7 @@ void draw(QPainter& painter, const QRectF& rect, const StyledLine& line, const L
     const StyledLine shown = fitted(line, QFontMetricsF(font, painter.device()), rect.width());
     QTextLayout layout(shown.text, font, painter.device());
     layOut(layout, shown, looks, QTextOption::NoWrap, rect.width());
-    drawCentred(painter, rect, layout);
+    drawCentred(painter, rect, layout, looks);
 }
 
 void drawWrapped(QPainter& painter, const QRectF& rect, const StyledLine& line,
@@ -215,7 +218,7 @@ void drawWrapped(QPainter& painter, const QRectF& rect, const StyledLine& line,
 {
     QTextLayout layout(line.text, widestFont(line, looks), painter.device());
     layOut(layout, line, looks, QTextOption::WrapAtWordBoundaryOrAnywhere, rect.width());
-    drawCentred(painter, rect, layout);
+    drawCentred(painter, rect, layout, looks);
 }
 
 double wrappedHeight(const StyledLine& line, const LineLooks& looks, double width)

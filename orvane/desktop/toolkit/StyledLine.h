@@ -52,6 +52,8 @@ struct LineLooks {
     QColor background;           ///< colours are made readable on it
     bool joinsLetters = true;  ///< NO where the text is searched later: “fi” stays two letters
     bool keepsTextColor = false;  ///< as for selected rows: `textColor` for everything
+    bool isMirrored = false;      ///< the text stands at the right
+    QList<QTextLayout::FormatRange> marks = {};  ///< drawn over the line's own formats
 };
 
 /// The font that the line's widest run has.

@@ -2,8 +2,11 @@
 #include "orvane/support/history/DiskHistories.h"
 
 #include "contract/foundation/Dictionary.h"
+#include "orvane/support/history/RunStart.h"
 
 #include <algorithm>
+#include <iterator>
+#include <utility>
 
 namespace orvane {
 
@@ -18,6 +21,42 @@ std::string historyKeyOf(const DiskFacts& disk, bool sharesUUID)
 }
 
 using contract::Array;
+
+void RunStarts::take(const Array& records, const RecordTimes& times)
+{
+    const std::size_t end = std::min(records.size(), times.count);
+    auto next = times.stretches.begin();
+    for (; taken_ < end; ++taken_) {
+        const contract::Dictionary record = records.values()[taken_].dictionary();
+        if (!isStartOfRun(record))
+            continue;
+        while (next != times.stretches.end() && next->first <= taken_)
+            ++next;
+        if (next != times.stretches.begin())
+            list_.push_back({record, std::prev(next)->time});
+    }
+}
+
+void RunStarts::insertInFront(const RunStarts& older)
+{
+    list_.insert(list_.begin(), older.list_.begin(), older.list_.end());
+    taken_ += older.taken_;
+}
+
+std::optional<Run> runBegunAt(const std::vector<RunStarts::Start>& starts, std::size_t index,
+                              const std::vector<Run>& runs)
+{
+    // Only a slow disk lies between the two.
+    constexpr std::chrono::minutes longestSaving{1};
+    const auto first = starts[index].time;
+    const auto end = index + 1 < starts.size() && starts[index + 1].time > first
+                         ? starts[index + 1].time
+                         : RecordTimes::Time::max();
+    const auto found = std::find_if(runs.begin(), runs.end(), [&](const Run& run) {
+        return run.started >= first && run.started < end && run.started - first <= longestSaving;
+    });
+    return found == runs.end() ? std::nullopt : std::optional(*found);
+}
 
 namespace {
 
@@ -51,6 +90,7 @@ DiskHistories::History DiskHistories::load(const std::string& key)
     store_.load({first, all.end}, history.records, history.times);
     history.savedCount = history.records.size();
     history.lastSaved = history.records.back();
+    history.starts.take(history.records, history.times);
     if (isGradual) {
         history.older = {Array::make(), {}, {all.next, first}};
         isIncomplete_();
@@ -68,6 +108,7 @@ DiskHistories::Progress DiskHistories::loadMore()
     const std::int64_t end = std::min(older.left.end, older.left.next + recordsAtOnce);
     store_.load({older.left.next, end}, older.records, older.times);
     older.left.next = end;
+    older.starts.take(older.records, older.times);
     if (older.left.size() > 0)
         return Progress::More;
     complete(found->second);
@@ -88,6 +129,7 @@ void DiskHistories::complete(History& history)
     const Array all = history.older->records;
     history.savedCount += all.size();
     history.times.insertInFront(history.older->times);
+    history.starts.insertInFront(history.older->starts);
     all.append(history.records);
     history.records = all;
     history.older.reset();
@@ -101,6 +143,55 @@ Array DiskHistories::historyOf(const DiskFacts& disk)
 const RecordTimes& DiskHistories::timesOf(const DiskFacts& disk)
 {
     return find(disk).times;
+}
+
+const std::vector<Run>& DiskHistories::runsOf(const std::string& key)
+{
+    KnownRuns& known = knownRuns_[key];
+    const std::uint64_t revision = store_.runsRevision() + 1;
+    if (std::exchange(known.revision, revision) != revision)
+        known.runs = store_.runs(key);
+    return known.runs;
+}
+
+std::optional<std::size_t> DiskHistories::placeOf(const contract::Dictionary& start,
+                                                  const std::string& key)
+{
+    const auto history = histories_.find(key);
+    if (history == histories_.end())
+        return std::nullopt;
+    const auto& list = history->second.starts.list();
+    const auto isThere = [&](std::size_t place) {
+        return place < list.size() && list[place].record.isSameAs(start);
+    };
+    for (const std::size_t place : {lastPlace_, lastPlace_ + 1, lastPlace_ - 1})
+        if (isThere(place))
+            return place;
+    for (std::size_t place = list.size(); place-- > 0;)
+        if (isThere(place))
+            return place;
+    return std::nullopt;
+}
+
+std::optional<RunOfRecord> DiskHistories::runOf(const contract::Dictionary& start)
+{
+    auto place = placeOf(start, lastKey_);
+    for (auto history = histories_.begin(); !place && history != histories_.end(); ++history)
+        if ((place = placeOf(start, history->first)))
+            lastKey_ = history->first;
+    if (!place)
+        return std::nullopt;
+    lastPlace_ = *place;
+    const auto& starts = histories_.at(lastKey_).starts.list();
+    return RunOfRecord{starts[*place].time, runBegunAt(starts, *place, runsOf(lastKey_))};
+}
+
+bool DiskHistories::isNewestStart(const contract::Dictionary& start) const
+{
+    return std::any_of(histories_.begin(), histories_.end(), [&start](const auto& entry) {
+        const auto& list = entry.second.starts.list();
+        return !list.empty() && list.back().record.isSameAs(start);
+    });
 }
 
 void DiskHistories::replaceHistoryOf(const DiskFacts& disk, const Array& history)
@@ -122,6 +213,7 @@ bool DiskHistories::clearHistoryOf(const DiskFacts& disk)
         remember(key, history, std::move(runs));
     history.records.removeAll();
     history.times = {};
+    history.starts = {};
     history.older.reset();
     if (store_.clear(key)) {
         history.savedCount = 0;
@@ -161,6 +253,8 @@ void DiskHistories::restore(const Cleared& cleared)
         all.append(history.records);
     history.times.insertInFront(cleared.times);
     history.records = all;
+    history.starts = {};
+    history.starts.take(all, history.times);
     const auto newer = store_.runs(cleared.key);
     if (!store_.clear(cleared.key))
         return;
@@ -206,8 +300,10 @@ void DiskHistories::save(const std::string& key, History& history, RecordTimes::
             return;
         history.savedCount = 0;
         history.times = {};
+        history.starts = {};
     }
     history.times.add(history.records.size(), now);
+    history.starts.take(history.records, history.times);
     if (history.savedCount == history.records.size())
         return;
     if (store_.append(key, history.records, history.savedCount, history.times)) {

@@ -12,6 +12,37 @@
 
 namespace orvane {
 
+/// What is known of the run that begins with a record of a log.
+struct RunOfRecord {
+    RecordTimes::Time time;  ///< at which the record was saved, which is before the run began
+    /// None where none began after all, or it is not kept any more.
+    std::optional<Run> run;
+};
+
+/// The records of one history with which runs begin, and when each was saved.
+class RunStarts {
+public:
+    struct Start {
+        contract::Dictionary record;
+        RecordTimes::Time time;
+    };
+
+    /// Looks at those of the records that have a time, and were not looked at yet.
+    void take(const contract::Array& records, const RecordTimes& times);
+    /// Of the records in front of those that were looked at.
+    void insertInFront(const RunStarts& older);
+    const std::vector<Start>& list() const { return list_; }
+
+private:
+    std::vector<Start> list_;
+    std::size_t taken_ = 0;
+};
+
+/// The run that was begun with the start at `index`: a record is saved before its run begins, and
+/// the next one behind it. None where none was.
+[[nodiscard]] std::optional<Run> runBegunAt(const std::vector<RunStarts::Start>& starts,
+                                            std::size_t index, const std::vector<Run>& runs);
+
 /// What a volume's history is filed under.
 ///
 /// A file system on a device is known by its UUID, because device names change from one start to
@@ -48,6 +79,12 @@ public:
     contract::Array historyOf(const DiskFacts& disk) override;
     const RecordTimes& timesOf(const DiskFacts& disk) override;
     void replaceHistoryOf(const DiskFacts& disk, const contract::Array& history) override;
+    /// Of a record that `isStartOfRun`; none before it was saved. Quick for records of one history
+    /// that are asked for in their order, or against it.
+    std::optional<RunOfRecord> runOf(const contract::Dictionary& start);
+    /// No run of its history began later.
+    bool isNewestStart(const contract::Dictionary& start) const;
+
     /// YES also where there were runs without records.
     bool clearHistoryOf(const DiskFacts& disk) override;
     std::uint64_t revision() const override { return revision_; }
@@ -75,11 +112,13 @@ private:
         contract::Array records;
         RecordTimes times;
         RecordRange left;
+        RunStarts starts = {};
     };
 
     struct History {
         contract::Array records;
         RecordTimes times;
+        RunStarts starts;
         std::size_t savedCount = 0;
         contract::Value lastSaved;
         std::optional<Older> older = std::nullopt;
@@ -101,7 +140,18 @@ private:
     void save(const std::string& key, History& history, RecordTimes::Time now);
     static bool hasOnlyGrown(const History& history);
 
+    /// The runs of a volume as they stand in the store.
+    struct KnownRuns {
+        std::vector<Run> runs;
+        std::uint64_t revision = 0;
+    };
+    const std::vector<Run>& runsOf(const std::string& key);
+    std::optional<std::size_t> placeOf(const contract::Dictionary& start, const std::string& key);
+
     HistoryStore& store_;
+    std::map<std::string, KnownRuns> knownRuns_;
+    std::string lastKey_;         ///< where `runOf` found something last
+    std::size_t lastPlace_ = 0;
     std::map<std::string, History> histories_;               ///< by key
     std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it
     std::function<void()> isIncomplete_;

@@ -7,6 +7,7 @@
 
 #include <fcntl.h>
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <ctime>
@@ -41,6 +42,12 @@ constexpr const char* laterAdditions =
     "CREATE INDEX IF NOT EXISTS summaries ON records (id) WHERE verbosity = -2;"
     "CREATE TABLE IF NOT EXISTS openRuns (run INTEGER PRIMARY KEY, owner TEXT NOT NULL)";
 
+// A program of before them reads and writes the table as it did.
+constexpr std::array<std::array<const char*, 2>, 3> laterColumnsOfRuns{
+    {{"tool", "ALTER TABLE runs ADD COLUMN tool TEXT"},
+     {"problems", "ALTER TABLE runs ADD COLUMN problems INTEGER"},
+     {"problemKinds", "ALTER TABLE runs ADD COLUMN problemKinds INTEGER"}}};
+
 // WAL lets other programs read while one writes. With synchronous = NORMAL what was saved survives
 // the end of the program, however it comes; a power failure may take the last moments. Checkpoints
 // have a thread of their own; SQLite makes one itself only when a quarter of a gigabyte waits.
@@ -70,6 +77,33 @@ bool readVersion(Database& database, std::int64_t& version)
     return true;
 }
 
+bool hasColumnOfRuns(Database& database, std::string_view name)
+{
+    Statement statement = database.prepare("SELECT 1 FROM pragma_table_info('runs') WHERE name = ?");
+    statement.bind(1, name);
+    return statement.step() == Statement::Step::Row;
+}
+
+bool hasAllColumnsOfRuns(Database& database)
+{
+    return std::all_of(
+        laterColumnsOfRuns.begin(), laterColumnsOfRuns.end(),
+        [&database](const auto& column) { return hasColumnOfRuns(database, column[0]); });
+}
+
+/// What a database of an earlier program lacks. Another program may be adding it, hence the second
+/// look.
+bool addColumnsOfRuns(Database& database)
+{
+    if (hasAllColumnsOfRuns(database))
+        return true;
+    Transaction transaction(database);
+    bool isDone = transaction.hasBegun();
+    for (const auto& [name, addition] : laterColumnsOfRuns)
+        isDone = isDone && (hasColumnOfRuns(database, name) || database.execute(addition));
+    return isDone && transaction.commit();
+}
+
 /// Another program may make the tables at the same time, hence the second look.
 Condition makeReady(Database& database, std::string& reason)
 {
@@ -83,7 +117,8 @@ Condition makeReady(Database& database, std::string& reason)
                   readVersion(database, version);
     }
     isReady = isReady && database.execute(probe) &&
-              (version != layoutVersion || database.execute(laterAdditions));
+              (version != layoutVersion ||
+               (database.execute(laterAdditions) && addColumnsOfRuns(database)));
     if (isReady && version == layoutVersion)
         return Condition::Ready;
     reason = isReady ? "it was made by a newer version" : database.lastError();

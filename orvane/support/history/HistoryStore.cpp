@@ -113,6 +113,7 @@ void HistoryStore::countAdded(std::int64_t records)
 
 bool HistoryStore::clear(std::string_view key)
 {
+    ++runsRevision_;
     const std::int64_t volume = tables_->volumes.find(key);
     const bool isCleared =
         volume == 0 || (tables_->records.removeAll(volume) && tables_->runs.keepNewest(volume, 0));
@@ -135,6 +136,7 @@ std::int64_t HistoryStore::beginRun(std::string_view key, std::string_view actio
 std::int64_t HistoryStore::noteBegin(std::string_view key, std::string_view action,
                                      Run::Time started)
 {
+    ++runsRevision_;
     database_.forgetError();
     const std::int64_t volume = tables_->volumes.intern(key);
     return volume != 0 ? tables_->runs.begin(volume, action, started) : 0;
@@ -142,6 +144,7 @@ std::int64_t HistoryStore::noteBegin(std::string_view key, std::string_view acti
 
 void HistoryStore::endRun(std::int64_t run, const RunEnd& end, Run::Time finished)
 {
+    ++runsRevision_;
     if (run > 0 && !tables_->runs.end(run, end, finished))
         late_.push_back({run, {}, {}, {}, end, finished});
     if (run < 0) {
@@ -160,6 +163,7 @@ void HistoryStore::writeLate()
             continue;
         if (late.run == 0)
             late.run = noteBegin(late.key, late.action, late.started);
+        ++runsRevision_;
         if (late.run == 0 || !tables_->runs.end(late.run, *late.end, late.finished))
             return;
         late.end.reset();

@@ -51,6 +51,8 @@ public:
     [[nodiscard]] std::vector<Run> runs(std::string_view key);
     [[nodiscard]] std::optional<Run> lastRun(std::string_view key);
 
+    /// Grows whenever this program writes or removes a run.
+    [[nodiscard]] std::uint64_t runsRevision() const { return runsRevision_; }
     /// Grows when a new database had to be begun in the middle: everything is unsaved then.
     [[nodiscard]] std::uint64_t generation() const { return generation_; }
     /// NO when the histories end with the program.
@@ -100,6 +102,7 @@ private:
     bool isKept_ = false;
     bool hasWarned_ = false;
     std::uint64_t generation_ = 0;
+    std::uint64_t runsRevision_ = 0;
     std::vector<LateRun> late_;
 };
 

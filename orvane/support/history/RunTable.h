@@ -17,6 +17,9 @@ struct RunEnd {
     std::string verdict;  ///< one of the library's verdicts
     std::int32_t errorCode = 0;
     std::string message;  ///< one sentence; empty when there was nothing to say
+    std::string tool = {};          ///< with its version; empty where none ran, or it is not known
+    std::int64_t problems = 0;      ///< that were told of; 0 also where it is not known
+    std::int64_t problemKinds = 0;  ///< of how many kinds they are; 0 likewise
 
     friend bool operator==(const RunEnd&, const RunEnd&) = default;
 };

@@ -170,6 +170,7 @@ const Tool& e2fsck()
                    .replaysInRepair = true,
                    .endsInOrder = true,
                    .logReplayedAs = {}},
+        .banner = "e2fsck ",
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<E2fsckOutput>,

@@ -178,6 +178,7 @@ const Tool& ntfs()
         .name = name,
         .repairName = repairName,
         .package = "ntfs-3g",
+        .banner = "ntfsresize v",
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<NtfsOutput>,

@@ -9,6 +9,7 @@
 #include "tests/support/TestDirectory.h"
 
 #include <QApplication>
+#include <QLineEdit>
 #include <QMenu>
 #include <QPainter>
 #include <QTest>
@@ -100,6 +101,27 @@ TEST_F(Pictures, OfADamagedDiskThatWasVerified)
     QWidget& help = *session().host().sharedHelpManager().window();
     save(help.grab(), "-help");
     EXPECT_LE(window().minimumSizeHint().width(), 1180) << "it has room on a small screen";
+}
+
+TEST_F(Pictures, OfALogOfSeveralRuns)
+{
+    const std::string image = makeDamagedImage("Letters");
+    openInOneSize({image});
+    treat("verifyDiskButton", image);
+    treat("repairDiskButton", image);
+    treat("verifyDiskButton", image);
+    session_.reset();
+    openInOneSize({image});
+    select(image);
+    QTest::qWait(100);
+    takePicture("-runs");
+    button("showDetailsButton").press();
+    QTest::keyClick(&window(), Qt::Key_F, Qt::ControlModifier);
+    auto* const field = window().findChild<QLineEdit*>(QStringLiteral("logSearchField"));
+    field->setText(QStringLiteral("block"));
+    QTest::qWait(100);
+    takePicture("-search");
+    EXPECT_GT(logRows().size(), 20U) << "a folded run with a match is open";
 }
 
 TEST_F(Pictures, OfARepairThatIsUndone)

@@ -5,6 +5,7 @@
 #include <QKeyEvent>
 #include <QLabel>
 #include <QMimeData>
+#include <QTest>
 
 namespace orvane::desktop {
 namespace {
@@ -15,6 +16,11 @@ void press(QWidget& widget, int key, Qt::KeyboardModifiers modifiers = Qt::NoMod
 {
     QKeyEvent event(QEvent::KeyPress, key, modifiers);
     QApplication::sendEvent(&widget, &event);
+}
+
+bool waitFor(const std::function<bool()>& condition)
+{
+    return QTest::qWaitFor(condition, 20'000);
 }
 
 TEST_F(LogView, RowsAreCountedAtOnceAndShownTogetherAfterTheyAreSaved)
@@ -100,6 +106,108 @@ TEST_F(LogView, WhoHasScrolledUpKeepsPlaceAndSelection)
             EXPECT_EQ(table().rowViewportPosition(rowOf(line)), top) << name << i;
         }
     }
+}
+
+TEST_F(LogView, OlderRunsAreFoldedAndTheModuleCountsTheirRowsAllTheSame)
+{
+    addRun("first", {"a", "b"});
+    addRun("second", {"c"});
+    selectDisk();
+    EXPECT_EQ(shownRows(), "first|second|c");
+    EXPECT_EQ(view->numberOfRows(), 6U) << "with the end of the first, which is a row";
+    EXPECT_EQ(view->rectOfRow(2), contract::Rect());
+    EXPECT_EQ(view->rectOfRow(4).y, table().rowViewportPosition(1));
+
+    table().selectRow(1);
+    EXPECT_EQ(view->selectedRowIndexes(), std::vector<std::size_t>{4});
+    press(table(), Qt::Key_Delete);
+    EXPECT_FALSE(disk->history.isEmpty()) << "a heading is not all rows";
+    press(table(), Qt::Key_A, Qt::ControlModifier);
+    EXPECT_EQ(view->selectedRowIndexes(), (std::vector<std::size_t>{0, 1, 2, 3, 4, 5}))
+        << "the folded ones as well";
+
+    table().setCurrentIndex(table().model()->index(0, 0));
+    press(table(), Qt::Key_Right);
+    EXPECT_EQ(shownRows(), "first|a|b|second|c");
+    addRun("third", {"d"});
+    reload();
+    EXPECT_EQ(shownRows(), "first|a|b|second|c|third|d") << "nothing is folded while it is read";
+    press(table(), Qt::Key_Down);
+    press(table(), Qt::Key_Left);
+    EXPECT_EQ(table().currentIndex().row(), 0) << "to the heading";
+    for (const int key : {Qt::Key_Left, Qt::Key_Space, Qt::Key_Return}) {
+        const bool wasOpen = rowText(1) == "a";
+        press(table(), key);
+        EXPECT_EQ(rowText(1) == "a", !wasOpen) << key;
+    }
+    interface->button("showDetailsButton")->press();
+    settle();
+    EXPECT_EQ(shownRows(), "first|second|c|third|d") << "as the user left it";
+
+    const QRect heading = table().visualRect(table().model()->index(0, 0));
+    QTest::mouseClick(table().viewport(), Qt::LeftButton, {}, heading.center());
+    EXPECT_EQ(rowText(1), QStringLiteral("a"));
+    const auto spoken = [this](int row) {
+        return table().model()->index(row, 0).data(Qt::AccessibleTextRole).toString();
+    };
+    EXPECT_EQ(spoken(0), QStringLiteral("first, expanded"));
+}
+
+TEST_F(LogView, HeadingsSayWhatIsKnownOfTheirRuns)
+{
+    const auto other = std::make_shared<fixwell::testing::FakeDisk>("loop1");
+    other->history = contract::Array::make();
+    addRun("one", {"a"});
+    addRun("two", {"b"});
+    addRun("three", {"c"}, other);
+    interface->outlinePeer()->setRunKnowledge(
+        {[](const contract::OutlineItem& start) {
+             const auto text = start[fixwell::kOV_finalAttributedString_type].styledText();
+             return text.characters() == "two\n" ? RunNote{"today", "sound", {}} : RunNote();
+         },
+         [&](const contract::OutlineItem& start) {
+             return start.isSameAs(disk->history.at(3).dictionary()) ||
+                    start.isSameAs(other->history.at(0).dictionary());
+         }});
+    host.disks.push_back(other);
+    host.selection = {disk, other};
+    selectDisk();
+    EXPECT_EQ(shownRows(), "one|two|b|three|c") << "the newest of each disk is open";
+    EXPECT_GT(table().rowHeight(1), table().rowHeight(0)) << "there is more to say of it";
+    EXPECT_EQ(table().model()->index(1, 0).data(Qt::AccessibleTextRole).toString(),
+              QStringLiteral("two, today, sound, expanded"));
+    view->selectAll(nullptr);
+    EXPECT_EQ(interface->outlinePeer()->selectionText(),
+              "one\na\n\ntwo (today, sound)\nb\n\nthree\nc\n");
+    EXPECT_NE(interface->outlinePeer()->selectionHTML().find("two (today, sound)"),
+              std::string::npos);
+}
+
+TEST_F(LogView, NothingButProblemsAndHeadingsIsShownOnWish)
+{
+    addRun("first", {"problem 1"});
+    addRun("second", {"fine", "problem 2", "fine"});
+    selectDisk();
+    interface->outlinePeer()->setFilter(LogRuns::Filter::KeptRows);
+    EXPECT_EQ(shownRows(), "first|second|problem 2");
+    addRun("third", {"fine", "problem 3"});
+    reload();
+    EXPECT_EQ(shownRows(), "first|second|problem 2|third|problem 3");
+    press(table(), Qt::Key_A, Qt::ControlModifier);
+    EXPECT_EQ(view->numberOfSelectedRows(), 5U) << "what is not shown is not deleted with it";
+    interface->outlinePeer()->setFilter(LogRuns::Filter::None);
+    EXPECT_EQ(shownRows(), "first|second|fine|problem 2|fine|third|fine|problem 3");
+}
+
+// Of which the first looks at a part only.
+TEST_F(LogView, ALongLogIsFoldedBitByBit)
+{
+    for (int run = 0; run < 200; ++run)
+        addRun("run", std::vector<std::string>(4000, "line"));
+    selectDisk();
+    ASSERT_TRUE(waitFor([this] { return table().model()->rowCount() == 200 + 4000; }))
+        << table().model()->rowCount();
+    EXPECT_EQ(view->verticalScroller()->value(), 1.0);
 }
 
 TEST_F(LogView, AMillionRowsCostNoMoreThanTheOnesInSight)

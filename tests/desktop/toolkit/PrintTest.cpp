@@ -147,6 +147,21 @@ TEST_F(PrintTest, ALongLogLeavesTheWindowItsTurnsAndCanBeGivenUp)
     EXPECT_EQ(host.printFailures, 0) << "to give up is no failure";
 }
 
+TEST_F(PrintTest, HeadingsAreDatedAndFoldedRowsArePrinted)
+{
+    addRun("first", {"folded"});
+    addRun("second", {"shown"});
+    selectDisk();
+    host.qtPrinting.setNoteSource([](const contract::OutlineItem&) {
+        return RunNote{"today", "sound", {}};
+    });
+    startPrinting(0, "dated.pdf");
+    ASSERT_TRUE(QTest::qWaitFor([&] { return !host.qtPrinting.isPrinting(); }, longestWait));
+    const QString text = textOf(fileNamed("dated.pdf"));
+    for (const char* const line : {"first (today, sound)", "folded", "second (today, sound)"})
+        EXPECT_EQ(text.count(QLatin1String(line)), 1) << line;
+}
+
 TEST_F(PrintTest, AModuleThatGoesTakesItsPrintingAlong)
 {
     startPrinting(5000, "gone.pdf");

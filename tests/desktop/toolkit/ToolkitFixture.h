@@ -42,9 +42,7 @@ struct ScreenHost final : fixwell::testing::FakeHost {
     }};
     QtEvents qtEvents;
     int savesBeforeRows = 0;
-    QtInterface qtInterface{[this] {
-        ++savesBeforeRows;
-    }};
+    QtInterface qtInterface{[this] { ++savesBeforeRows; }, &texts};
     QtPasteboard qtPasteboard;
     int printFailures = 0;
     QtPrinting qtPrinting{texts, [this] {
@@ -105,6 +103,37 @@ protected:
         settle();
     }
     static void settle() { QApplication::processEvents(); }
+
+    /// A run of the module: its first record, and a row for each of the texts.
+    void addRun(std::string_view title, const std::vector<std::string>& rows,
+                const std::shared_ptr<fixwell::testing::FakeDisk>& of = nullptr)
+    {
+        const contract::Array& history = (of ? of : disk)->history;
+        const auto record = [](std::string_view text, std::int64_t verbosity) {
+            return contract::Dictionary::of(
+                {{contract::kFsckVerbosity, verbosity},
+                 {fixwell::kOV_finalAttributedString_type,
+                  contract::StyledText::make(std::string(text) + "\n",
+                                             {contract::Font{verbosity < 0, 11}, {}, {}})}});
+        };
+        history.append(record(title, -1));
+        for (const std::string& row : rows) {
+            const contract::Dictionary line = record(row, 0);
+            if (row.starts_with("problem"))
+                line.set(contract::kFsckMessageType, contract::kFsckFail);
+            history.append(line);
+        }
+        history.append(record("", -2));
+    }
+    /// The rows that are shown, in one line.
+    std::string shownRows()
+    {
+        QStringList rows;
+        for (int row = 0; row < table().model()->rowCount(); ++row)
+            rows += rowText(row);
+        rows.removeAll(QString());
+        return rows.join(QLatin1Char('|')).toStdString();
+    }
 
     LogTable& table() { return interface->outlinePeer()->table(); }
     QString rowText(int row) { return table().model()->index(row, 0).data().toString(); }

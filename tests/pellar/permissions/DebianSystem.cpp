@@ -127,8 +127,9 @@ contract::DiskReferencePointer mountedAt(const fs::path& root)
 std::string PermissionBench::problems() const
 {
     std::string all;
-    for (const std::string& line : listener.textsOf(contract::kFsckError))
-        all += line + '\n';
+    for (const auto& type : {contract::kFsckError, contract::kFsckFail})
+        for (const std::string& line : listener.textsOf(type))
+            all += line + '\n';
     return all;
 }
 
