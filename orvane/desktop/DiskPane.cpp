@@ -27,9 +27,10 @@ Check checkOf(const Run& run)
 {
     const auto started =
         std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
-    return {run.verdict(), run.end ? run.end->message : "",
-            QDateTime::fromMSecsSinceEpoch(started.count()), run.action,
-            run.end ? run.end->errorCode : 0};
+    const RunEnd end = run.end.value_or(RunEnd{});
+    return {run.verdict(), end.message,    QDateTime::fromMSecsSinceEpoch(started.count()),
+            run.action,    end.errorCode, end.problems,
+            end.problemKinds};
 }
 
 std::string_view activityIn(pellar::Operation operation)

@@ -8,6 +8,8 @@
 #include "orvane/desktop/window/SelectionSummary.h"
 #include "pellar/outcome/Task.h"
 
+#include <QLocale>
+
 #include <algorithm>
 #include <array>
 #include <map>
@@ -119,6 +121,26 @@ std::string_view titleOf(const Ending& ending)
                                                  : titleOfRepair(ending);
 }
 
+/// With the number of problems, where it is known.
+std::string titleOf(const Check& check, const Ending& ending, const Translator& texts)
+{
+    const bool isCounted = ending.subject == Subject::Filesystem &&
+                           ending.operation == Operation::Verify && check.problems > 0 &&
+                           ending.error == contract::kPLErrorDamaged;
+    if (!isCounted)
+        return texts.text(titleOf(ending));
+    const auto number = [](std::int64_t value) {
+        return fromQt(QLocale().toString(static_cast<qlonglong>(value)));
+    };
+    if (check.problems == 1)
+        return texts.text("Damaged: 1 problem. Nothing was changed.");
+    return check.kinds <= 1
+               ? texts.sentence("Damaged: %@ problems of one kind. Nothing was changed.",
+                                {number(check.problems)})
+               : texts.sentence("Damaged: %@ problems of %@ kinds. Nothing was changed.",
+                                {number(check.problems), number(check.kinds)});
+}
+
 std::vector<NextStep> stepsAfter(const Ending& ending, const DiskRow& disk,
                                  const ResultSituation& situation)
 {
@@ -177,7 +199,7 @@ ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,
     const LastCheck& check = *disk.lastCheck;
     const Check& last = check.later ? *check.later : check.told;
     const Ending ending = endingOf(last);
-    return {toneOf(ending), texts.text(titleOf(ending)), asSentence(last.message),
+    return {toneOf(ending), titleOf(last, ending, texts), asSentence(last.message),
             stepsAfter(ending, disk, situation), {}};
 }
 
