@@ -137,7 +137,7 @@ std::optional<Outcome> VolumeScript::objectionToHistory()
     const auto directory = recordsIn(context_.options.trials);
     if (context_.options.trials.room.directory.empty() || !std::filesystem::exists(directory))
         return std::nullopt;
-    const auto store = UndoStore::open(directory);
+    const auto store = openRecords(context_.options.trials);
     if (!store)
         return std::nullopt;
     const DiskClaim& claim = disk_.claim();
