@@ -47,7 +47,8 @@ private:
     std::vector<MenuCommand> diskCommands();
     MenuCommand detailsCommand();
     MenuCommand undoCommand(const char* objectName, std::string_view title,
-                            pellar::Operation operation);
+                            pellar::Operation operation,
+                            RepairUndoing::Scope scope = RepairUndoing::Scope::Disk);
     MenuCommand settingCommand(const char* objectName, std::string_view title,
                                std::string_view key);
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,

@@ -24,6 +24,10 @@ TEST(UndoAvailability, SaysWhatIsMissing)
     for (const auto& [situation, reason] :
          {std::pair(UndoSituation{1, false, true, KeptRepair::Unknown}, ""),
           {{1, false, true, KeptRepair::InUse}, "A program works on the last repair of this disk."},
+          {{1, false, true, KeptRepair::Others},
+           "Another user asked for the last repair of this disk."},
+          {{1, false, true, KeptRepair::None, true},
+           "No repair of permissions on this disk is kept."},
           {{0, false, false, KeptRepair::None}, "Select a disk first."},
           {{2, false, true, KeptRepair::Applied}, "Select one disk alone."},
           {{1, false, false, KeptRepair::Applied}, "Not available for this disk."}})
