@@ -47,10 +47,8 @@ class PermissionUndo : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "giving files to others needs root";
-        if (findProgram("dpkg-deb", "/usr/bin:/bin").empty())
-            GTEST_SKIP() << "dpkg-deb is not installed";
+        if (const char* const obstacle = DebianSystem::obstacle())
+            GTEST_SKIP() << obstacle;
         system_.install("games", {{"usr/", 0755},
                                   {"usr/bin/play", 0755},
                                   {"usr/bin/score", 02755, 0, 60},
