@@ -65,8 +65,8 @@ std::optional<std::chrono::system_clock::time_point> newestTimeIn(
                          });
     std::error_code error;
     const auto path = std::filesystem::canonical(disk.path, error);
-    const ListedRecord* const newest = newestOf(
-        {error ? disk.path : path, disk.offset, disk.length, {}, {}, {}}, ofSubject);
+    const ListedRecord* const newest =
+        newestOf({error ? disk.path : path, disk.offset, disk.length, {}, {}, {}}, ofSubject);
     return newest != nullptr ? std::optional(newest->facts.repair.time) : std::nullopt;
 }
 

@@ -16,16 +16,16 @@ bool needsRights(pellar::Subject subject, const Disk& disk)
 {
     return ::geteuid() != 0 &&
            disk.facts().storage == contract::DiskReference::Storage::BlockDevice &&
-           (subject == pellar::Subject::Permissions || disk.isMounted() || ::access(disk.facts().path.c_str(), R_OK | W_OK) != 0);
+           (subject == pellar::Subject::Permissions || disk.isMounted() ||
+            ::access(disk.facts().path.c_str(), R_OK | W_OK) != 0);
 }
 
 std::string_view whyNotKept(pellar::Operation operation, const UndoSituation& situation)
 {
     switch (situation.kept) {
         case KeptRepair::None:
-            return situation.isOfPermissions
-                       ? "No repair of permissions on this disk is kept."
-                       : "No repair of this disk is kept.";
+            return situation.isOfPermissions ? "No repair of permissions on this disk is kept."
+                                             : "No repair of this disk is kept.";
         case KeptRepair::Others: return "Another user asked for the last repair of this disk.";
         case KeptRepair::InUse: return "A program works on the last repair of this disk.";
         case KeptRepair::Applied:
@@ -48,8 +48,7 @@ std::string_view reasonAgainst(pellar::Operation operation, const UndoSituation&
         return "Select a disk first.";
     if (situation.selectedDisks > 1)
         return "Select one disk alone.";
-    return situation.isThere ? whyNotKept(operation, situation)
-                             : "Not available for this disk.";
+    return situation.isThere ? whyNotKept(operation, situation) : "Not available for this disk.";
 }
 
 const pellar::ListedRecord* KeptRepairs::newestOf(pellar::Subject subject, const Disk& disk) const
@@ -57,16 +56,16 @@ const pellar::ListedRecord* KeptRepairs::newestOf(pellar::Subject subject, const
     const Disk* const treated = subjectIn(disk);
     if (treated == nullptr)
         return nullptr;
-    return subject == pellar::Subject::Permissions
-               ? records_.newestOfPermissions(treated->facts())
-               : records_.newestOf(treated->facts());
+    return subject == pellar::Subject::Permissions ? records_.newestOfPermissions(treated->facts())
+                                                   : records_.newestOf(treated->facts());
 }
 
 KeptRepair KeptRepairs::stateOf(pellar::Subject subject, const Disk& disk) const
 {
     const pellar::ListedRecord* const record = newestOf(subject, disk);
     if (record == nullptr)
-        return needsRights(subject, disk) && !records_.knowsAll() ? KeptRepair::Unknown : KeptRepair::None;
+        return needsRights(subject, disk) && !records_.knowsAll() ? KeptRepair::Unknown
+                                                                  : KeptRepair::None;
     if (record->isInUse)
         return KeptRepair::InUse;
     if (!records_.isUsers(*record))

@@ -126,7 +126,10 @@ std::vector<MenuCommand> MenuCommands::diskCommands()
              .title = "Previe&w Repair",
              .shortcut = {},
              .perform = [this] { choices_.preview(); },
-             .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }},
+             .reasonAgainst =
+                 [this] {
+                     return choices_.reasonAgainstPreview();
+                 }},
             line,
             undoCommand("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
             undoCommand("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
@@ -144,9 +147,10 @@ MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view t
             .title = title,
             .shortcut = {},
             .perform = [this, operation, scope] { undoing_.ask(operation, scope); },
-            .reasonAgainst = [this, operation, scope] {
-                return undoing_.reasonAgainst(operation, scope);
-            }};
+            .reasonAgainst =
+                [this, operation, scope] {
+                    return undoing_.reasonAgainst(operation, scope);
+                }};
 }
 
 MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,

@@ -122,8 +122,9 @@ std::string RepairUndoing::meaningOf(pellar::Task task, const pellar::ListedReco
              number(record->facts.rangeCount)});
     if (isOfPermissions)
         return meaning + " " +
-               text("Each file that is still as that repair left it has again the owner, group and "
-                    "permissions that it had before.");
+               text(
+                   "Each file that is still as that repair left it has again the owner, group and "
+                   "permissions that it had before.");
     return meaning + " " +
            text(isUndo ? "The damage that it repaired is then there again."
                        : "The disk is then as the repair was to leave it.");

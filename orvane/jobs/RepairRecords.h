@@ -18,9 +18,9 @@ public:
     /// Nothing where there is no store; none is made.
     explicit RepairRecords(const pellar::Trials& trials);
 
-    /// The one that could be undone now, whoever asked for it; an older one cannot be before: of the
-    /// disk's file system or, where it is a whole disk, of its partition map. Null where there is
-    /// none, or where it may be another disk's of this name. Valid as long as this object.
+    /// The one that could be undone now, whoever asked for it; an older one cannot be before: of
+    /// the disk's file system or, where it is a whole disk, of its partition map. Null where there
+    /// is none, or where it may be another disk's of this name. Valid as long as this object.
     [[nodiscard]] const pellar::ListedRecord* newestOf(const DiskFacts& disk) const;
     /// The same of the permissions of the system that is installed on the disk.
     [[nodiscard]] const pellar::ListedRecord* newestOfPermissions(const DiskFacts& disk) const;

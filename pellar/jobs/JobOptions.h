@@ -84,9 +84,9 @@ inline std::filesystem::path recordIndexIn(const std::filesystem::path& director
 
 [[nodiscard]] inline Result<UndoStore, Sentence> openRecords(const Trials& trials)
 {
-    return UndoStore::open(recordsIn(trials), ::fsync,
-                           trials.isPublic ? recordIndexIn(trials.room.directory)
-                                           : std::filesystem::path());
+    return UndoStore::open(
+        recordsIn(trials), ::fsync,
+        trials.isPublic ? recordIndexIn(trials.room.directory) : std::filesystem::path());
 }
 
 /// Where the records are of the permissions that repairs have changed (PermissionRecords).
@@ -101,12 +101,11 @@ inline std::filesystem::path permissionIndexIn(const std::filesystem::path& dire
     return directory / "permission-index";
 }
 
-[[nodiscard]] inline Result<PermissionRecords, Sentence> openPermissionRecords(
-    const Trials& trials)
+[[nodiscard]] inline Result<PermissionRecords, Sentence> openPermissionRecords(const Trials& trials)
 {
-    return PermissionRecords::open(permissionRecordsIn(trials), ::fsync,
-                                   trials.isPublic ? permissionIndexIn(trials.room.directory)
-                                                   : std::filesystem::path());
+    return PermissionRecords::open(
+        permissionRecordsIn(trials), ::fsync,
+        trials.isPublic ? permissionIndexIn(trials.room.directory) : std::filesystem::path());
 }
 
 /// A job for which this user has no right: on a block device that they may not open, on files that

@@ -149,8 +149,8 @@ void RepairPreview::nameFiles(std::vector<FileChange>& files)
 {
     constexpr std::ptrdiff_t mostNamed = 500;
     const FileComparison& comparison = *tool_.files;
-    const std::vector<FileChange> asked(
-        files.begin(), files.begin() + std::min(std::ssize(files), mostNamed));
+    const std::vector<FileChange> asked(files.begin(),
+                                        files.begin() + std::min(std::ssize(files), mostNamed));
     ListingReader<FileChange> listing(comparison.nameIn);
     // What was named before it came to an end is right all the same.
     static_cast<void>(runListing(

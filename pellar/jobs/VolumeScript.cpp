@@ -380,8 +380,8 @@ VolumeScript::State VolumeScript::tryRepair()
 VolumeScript::State VolumeScript::apply()
 {
     if (context_.policy.isPreview)
-        return end(RepairPreview(context_, *tool_, *trial_, disk_.claim())
-                       .tell(outcome_, look_.counts));
+        return end(
+            RepairPreview(context_, *tool_, *trial_, disk_.claim()).tell(outcome_, look_.counts));
     return end(applyTrial(*trial_, mark_, disk_, context_, outcome_));
 }
 

@@ -163,7 +163,8 @@ Result<PermissionRecords, Sentence> PermissionRecords::open(const std::filesyste
 {
     const auto without = [](const std::string& reason) {
         return Sentence{
-            "there is no directory to keep the permissions in that a repair changes: %1$@", reason,
+            "there is no directory to keep the permissions in that a repair changes: %1$@",
+            reason,
             {}};
     };
     auto opened = StoreDirectory::open(directory, sync);
@@ -256,9 +257,10 @@ PermissionRecordList PermissionRecords::list() const
     }
     if (index_)
         index_->removeOrphans();
-    sortNewestFirst(list.records, [](const ListedPermissionRecord& record) -> const RecordedRepair& {
-        return record.run.repair;
-    });
+    sortNewestFirst(list.records,
+                    [](const ListedPermissionRecord& record) -> const RecordedRepair& {
+                        return record.run.repair;
+                    });
     return list;
 }
 

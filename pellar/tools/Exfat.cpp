@@ -111,8 +111,8 @@ class ExfatOutput final : public LineOutput {
         return detail(line);
     }
 
-    /// "ERROR: /A: less clusters are allocated. truncates to 4096 bytes at 0x1180. Truncate (y/N)? y"
-    /// Where it says "more clusters are allocated", the file keeps its size.
+    /// "ERROR: /A: less clusters are allocated. truncates to 4096 bytes at 0x1180. Truncate (y/N)?
+    /// y" Where it says "more clusters are allocated", the file keeps its size.
     static std::optional<FileChange> sizeIn(const std::string& line)
     {
         constexpr std::string_view start = "ERROR: ";

@@ -198,8 +198,8 @@ class XfsOutput final : public LineOutput {
         if (std::sscanf(std::string(line).c_str(), "cleared inode %" SCNu64, &inode) == 1)
             noteChange({inode, {}, std::nullopt, std::nullopt});
         else if (line.starts_with(entry) && end != std::string_view::npos && end > entry.size())
-            noteChange({0, std::string(line.substr(entry.size(), end - entry.size())),
-                        std::nullopt, std::nullopt});
+            noteChange({0, std::string(line.substr(entry.size(), end - entry.size())), std::nullopt,
+                        std::nullopt});
     }
 
     /// YES for a line that tells of the check and not of the volume.

@@ -78,8 +78,7 @@ int letAllSearch(const fs::path& directory)
         return EACCES;
     if (status.st_uid != ::geteuid() || (status.st_mode & searched) == searched)
         return 0;
-    const FileDescriptor opened(
-        ::openat(trusted->get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const FileDescriptor opened(::openat(trusted->get(), ".", O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     return opened && ::fchmod(opened.get(), (status.st_mode & 07777) | searched) == 0 ? 0 : errno;
 }
 

@@ -109,8 +109,7 @@ const ListedRecord* newestOf(const RecordedDisk& disk, const RecordList& list)
 }
 
 Result<UndoStore, Sentence> UndoStore::open(const std::filesystem::path& directory,
-                                            SyncFunction sync,
-                                            const std::filesystem::path& index)
+                                            SyncFunction sync, const std::filesystem::path& index)
 {
     const auto without = [](const std::string& reason) {
         return Sentence{"there is no directory to keep the bytes in that a repair overwrites: %1$@",

@@ -354,7 +354,8 @@ TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
     };
     EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
     EXPECT_TRUE(isTold("After the repair: no damage is left; 1 file is now in lost+found."));
-    EXPECT_TRUE(library.listener.hasPlainLine("“/f4” would be gone")) << "its size is nonsense, too";
+    EXPECT_TRUE(library.listener.hasPlainLine("“/f4” would be gone"))
+        << "its size is nonsense, too";
     EXPECT_TRUE(library.listener.hasPlainLine("“/f5” would have another size: 1 → 3072 bytes"));
     EXPECT_TRUE(library.listener.hasPlainLine("“/dir/deep” would have another size: 100 → "));
     for (const std::string name : {"/f0", "/f3", "/f7", "/dir"})

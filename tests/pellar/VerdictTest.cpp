@@ -261,8 +261,10 @@ TEST(ToolFindings, FilesThatARepairTakesAwayOrShortensAreNamed)
         std::vector<std::string> lines;
         Changes changes;
     };
-    const std::string cut = "ERROR: /a: b: less clusters are allocated. truncates to 4096 bytes at 0x1180";
-    const std::string kept = "ERROR: /a: more clusters are allocated. truncate to 4096 bytes at 0x1180";
+    const std::string cut =
+        "ERROR: /a: b: less clusters are allocated. truncates to 4096 bytes at 0x1180";
+    const std::string kept =
+        "ERROR: /a: more clusters are allocated. truncate to 4096 bytes at 0x1180";
     for (const Said& c : {
              Said{"vfat", test::recordedLines("fsck.fat/repaired"), {{0, "/FILE.TXT", 5000, 2048}}},
              Said{"vfat",

@@ -177,8 +177,8 @@ protected:
              pellar::RecordState state = pellar::RecordState::Applied) const
     {
         const bool isOfPermissions = subject == pellar::Subject::Permissions;
-        const auto place = isOfPermissions ? pellar::permissionIndexIn(system_)
-                                           : pellar::recordIndexIn(system_);
+        const auto place =
+            isOfPermissions ? pellar::permissionIndexIn(system_) : pellar::recordIndexIn(system_);
         const auto records = std::make_shared<const pellar::StoreDirectory>(
             *pellar::StoreDirectory::open(system_ / "records", ::fsync));
         pellar::RecordFacts facts;

@@ -64,9 +64,9 @@ std::vector<InodeTable> inodeTables(int volume, const ExtSuperblock& superblock)
     if (!descriptors)
         return tables;
     for (std::uint64_t group = 0; group < superblock.groups(); ++group) {
-        const ByteView entry = ByteView(*descriptors)
-                                   .subspan(group * superblock.descriptorBytes,
-                                            superblock.descriptorBytes);
+        const ByteView entry =
+            ByteView(*descriptors)
+                .subspan(group * superblock.descriptorBytes, superblock.descriptorBytes);
         std::uint64_t block = littleEndian(entry, 0x08, 4);
         if (superblock.descriptorBytes >= smallestWithHighHalf)
             block |= littleEndian(entry, 0x28, 4) << 32U;
@@ -142,8 +142,7 @@ std::vector<std::string> arguments(const std::string& disk, std::uint64_t offset
     for (const FileChange& file : files)
         request += " " + std::to_string(file.inode);
     // -c: the maps of what is free may be damaged, and are not needed.
-    return {"-c", "-R", request,
-            offset == 0 ? disk : disk + "?offset=" + std::to_string(offset)};
+    return {"-c", "-R", request, offset == 0 ? disk : disk + "?offset=" + std::to_string(offset)};
 }
 
 /// "16\t/path/file", "12\t//file" of the root's own (debugfs 1.47.0)

@@ -102,7 +102,8 @@ TEST_F(PublicIndexTest, EverybodyReadsTheFactsAndNothingElse)
                       ::mkdir((index_ / "x").c_str(), 0700) == 0)
                       return 4;
                   return 0;
-              }) >> 8,
+              }) >>
+                  8,
               0);
 }
 
@@ -153,7 +154,8 @@ TEST_F(PublicIndexTest, AKillAtAnyMomentLeavesWhatTheNextListingMends)
                    });
                    work(store);
                    return atEnd;
-               }) >> 8;
+               }) >>
+               8;
     };
     const auto apply = [this](UndoStore& store) {
         static_cast<void>(save(store).apply(disk_));
