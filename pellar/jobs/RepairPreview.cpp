@@ -136,12 +136,12 @@ void RepairPreview::tellFiles(const std::vector<ByteRange>& ranges, const FileCo
         nameFiles(files);
     const std::size_t shown = std::min(files.size(), mostShown);
     for (const FileChange& file : std::span(files).first(shown))
-        log_.detail(sentenceFor(
+        log_.remark(sentenceFor(
             file, log_.text(file.name.empty()
                                 ? Sentence{"The file in inode %1$@", std::to_string(file.inode), {}}
                                 : Sentence{"“%1$@”", contract::printable(file.name), {}})));
     if (shown < files.size())
-        log_.detail(Sentence{"… and %1$@ more", std::to_string(files.size() - shown), {}});
+        log_.remark(Sentence{"… and %1$@ more", std::to_string(files.size() - shown), {}});
 }
 
 /// The first of them, as many as a tool can be asked for at once. What is no file goes.
