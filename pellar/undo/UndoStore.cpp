@@ -76,6 +76,12 @@ std::optional<std::vector<ByteRange>> rangesIn(const RecordDirectory& directory,
     return ranges;
 }
 
+Sentence withoutDirectory(const std::string& reason)
+{
+    return {
+        "there is no directory to keep the bytes in that a repair overwrites: %1$@", reason, {}};
+}
+
 /// Whoever makes a record has its lock until it is committed.
 void removeLeftOver(const RecordDirectory& directory)
 {
@@ -111,25 +117,23 @@ const ListedRecord* newestOf(const RecordedDisk& disk, const RecordList& list)
 Result<UndoStore, Sentence> UndoStore::open(const std::filesystem::path& directory,
                                             SyncFunction sync, const std::filesystem::path& index)
 {
-    const auto without = [](const std::string& reason) {
-        return Sentence{"there is no directory to keep the bytes in that a repair overwrites: %1$@",
-                        reason,
-                        {}};
-    };
     auto opened = StoreDirectory::open(directory, sync);
     if (!opened)
-        return without(opened.error());
+        return withoutDirectory(opened.error());
     const auto records = std::make_shared<const StoreDirectory>(std::move(*opened));
     const auto published = PublicIndex::openUnlessEmpty(index, records, std::move(sync));
+    UndoStore store(records, published ? *published : nullptr);
     if (!published)
-        return without(published.error());
-    return UndoStore(records, *published);
+        store.whyNoIndex_ = published.error();
+    return store;
 }
 
 Result<UndoRecord, Sentence> UndoStore::save(const RecordedRepair& repair,
                                              std::vector<ByteRange> ranges, RegionReader& before,
                                              RegionReader& after, const UndoWork& work) const
 {
+    if (!whyNoIndex_.empty())
+        return withoutDirectory(whyNoIndex_);
     if (!areInOrder(ranges, std::min({repair.disk.length, before.length(), after.length()})))
         return unchangedBecause({Cause::RecordFailed, EINVAL});
     auto directory = RecordDirectory::make(directory_, nameFor(repair.time));

@@ -51,7 +51,7 @@ public:
     /// Makes the directory when it is missing. It must be absolute, and no other user but root may
     /// be able to change it.
     /// `index` is where everybody may read which records there are (PublicIndex); nowhere when it
-    /// is empty. It is an error, too, when that cannot be made.
+    /// is empty. Where that cannot be made, nothing more is saved; what is there can be undone.
     [[nodiscard]] static Result<UndoStore, Sentence> open(const std::filesystem::path& directory,
                                                           SyncFunction sync = ::fsync,
                                                           const std::filesystem::path& index = {});
@@ -88,6 +88,7 @@ private:
 
     std::shared_ptr<const StoreDirectory> directory_;
     std::shared_ptr<const PublicIndex> index_;  ///< null where there is none
+    std::string whyNoIndex_;                    ///< in English, where there ought to be one
 };
 
 }  // namespace pellar

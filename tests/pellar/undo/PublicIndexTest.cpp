@@ -188,6 +188,17 @@ TEST_F(PublicIndexTest, AKillAtAnyMomentLeavesWhatTheNextListingMends)
     }
 }
 
+TEST_F(PublicIndexTest, WithoutAnIndexNothingIsSavedAndAllCanBeUndone)
+{
+    EXPECT_TRUE(save(*UndoStore::open(records_, noSync)).apply(disk_));
+    orvane::test::write(index_, "no directory");
+    const UndoStore store = open();
+    CachedDisk view(after);
+    EXPECT_FALSE(store.save(repairOf("/dev/sdb1"), {{0, 512}}, disk_, view));
+    EXPECT_TRUE(store.take(store.list().records.front().id)->undo(disk_));
+    EXPECT_EQ(disk_.medium, before);
+}
+
 TEST_F(PublicIndexTest, WhatOthersCouldHaveWrittenIsNotBelieved)
 {
     EXPECT_EQ(index(), "") << "there is none";
