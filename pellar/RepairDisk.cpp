@@ -14,12 +14,17 @@
 #include "pellar/partitions/MapDisk.h"
 #include "pellar/tools/Capability.h"
 #include "pellar/tools/ToolTable.h"
+#include "pellar/undo/PublicIndex.h"
 
 #include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
+#include <chrono>
+#include <iterator>
 #include <memory>
+#include <optional>
+#include <system_error>
 #include <utility>
 #include <variant>
 
@@ -47,6 +52,40 @@ bool needsPrivileges(Task task, const contract::DiskReference& disk, const Syste
     const bool isRead = accessFor(task.operation) == Access::ReadOnly;
     return ::access(disk.path.c_str(), isRead ? R_OK : R_OK | W_OK) != 0 ||
            !mountsOf(status.st_rdev, paths).empty();
+}
+
+/// The newest time of a repair of the disk in a list; none where there is none.
+std::optional<std::chrono::system_clock::time_point> newestTimeIn(
+    const RecordList& list, Task task, const contract::DiskReference& disk)
+{
+    RecordList ofSubject;
+    std::ranges::copy_if(list.records, std::back_inserter(ofSubject.records),
+                         [task](const ListedRecord& record) {
+                             return record.facts.repair.task.subject == task.subject;
+                         });
+    std::error_code error;
+    const auto path = std::filesystem::canonical(disk.path, error);
+    const ListedRecord* const newest =
+        newestOf({error ? disk.path : path, disk.offset, disk.length, {}, {}, {}}, ofSubject);
+    return newest != nullptr ? std::optional(newest->facts.repair.time) : std::nullopt;
+}
+
+/// Whether the repair that is to be undone was done with the administrator's rights, though this
+/// user could do without them by now: because it is not mounted any more.
+bool isKeptByAdministrator(Task task, const contract::DiskReference& disk, const Trials& trials)
+{
+    if (!task.isUndo() || trials.systemDirectory.empty())
+        return false;
+    const auto index = readPublicIndex(recordIndexIn(trials.systemDirectory));
+    const auto theirs = index ? newestTimeIn(*index, task, disk) : std::nullopt;
+    if (!theirs)
+        return false;
+    std::error_code error;
+    if (trials.room.directory.empty() || !std::filesystem::exists(recordsIn(trials), error))
+        return true;
+    const auto store = openRecords(trials);
+    const auto ours = store ? newestTimeIn(store->list(), task, disk) : std::nullopt;
+    return !ours || *ours < *theirs;
 }
 
 /// Whether the directory lies on what is mounted at one of the places.
@@ -207,7 +246,8 @@ ErrorCode RepairDisk::beginUndo(Task task, const DiskReferencePointer& disk)
 /// NO when the job needs no other rights, or there is no way to them.
 bool RepairDisk::beginPrivileged(Task task, const DiskReferencePointer& disk)
 {
-    if (!options_.privileged || !needsPrivileges(task, *disk, options_.systemPaths))
+    if (!options_.privileged || (!needsPrivileges(task, *disk, options_.systemPaths) &&
+                                 !isKeptByAdministrator(task, *disk, options_.trials)))
         return false;
     const auto& isAllowed = options_.archiveFetching.isAllowed;
     const bool fetches = task.subject == Subject::Permissions && isAllowed && isAllowed();

@@ -116,6 +116,8 @@ RepairAdvice DesktopSession::repairAdvice()
     };
     RepairAdvice all;
     all.undo = advice("To take the repair back, choose Undo Repair in the Disk menu.");
+    all.undoPermissions =
+        advice("To take the repair back, choose Undo Permissions Repair in the Disk menu.");
     all.apply =
         advice("“Apply Anyway”, above this log, applies it although it may leave damage. That can "
                "be undone as well.");

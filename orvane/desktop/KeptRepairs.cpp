@@ -12,17 +12,21 @@ const Disk* subjectIn(const Disk& disk)
 }
 
 /// Whether a job that writes to it runs with an administrator's rights, who keep their own records.
-bool needsRights(const Disk& disk)
+bool needsRights(pellar::Subject subject, const Disk& disk)
 {
     return ::geteuid() != 0 &&
            disk.facts().storage == contract::DiskReference::Storage::BlockDevice &&
-           (disk.isMounted() || ::access(disk.facts().path.c_str(), R_OK | W_OK) != 0);
+           (subject == pellar::Subject::Permissions || disk.isMounted() ||
+            ::access(disk.facts().path.c_str(), R_OK | W_OK) != 0);
 }
 
-std::string_view reasonAgainst(pellar::Operation operation, KeptRepair kept)
+std::string_view whyNotKept(pellar::Operation operation, const UndoSituation& situation)
 {
-    switch (kept) {
-        case KeptRepair::None: return "No repair of this disk is kept.";
+    switch (situation.kept) {
+        case KeptRepair::None:
+            return situation.isOfPermissions ? "No repair of permissions on this disk is kept."
+                                             : "No repair of this disk is kept.";
+        case KeptRepair::Others: return "Another user asked for the last repair of this disk.";
         case KeptRepair::InUse: return "A program works on the last repair of this disk.";
         case KeptRepair::Applied:
             return operation == pellar::Operation::Finish
@@ -44,30 +48,38 @@ std::string_view reasonAgainst(pellar::Operation operation, const UndoSituation&
         return "Select a disk first.";
     if (situation.selectedDisks > 1)
         return "Select one disk alone.";
-    return situation.isThere ? reasonAgainst(operation, situation.kept)
-                             : "Not available for this disk.";
+    return situation.isThere ? whyNotKept(operation, situation) : "Not available for this disk.";
 }
 
-const pellar::ListedRecord* KeptRepairs::newestOf(const Disk& disk) const
+const pellar::ListedRecord* KeptRepairs::newestOf(pellar::Subject subject, const Disk& disk) const
 {
-    const Disk* const subject = subjectIn(disk);
-    return subject != nullptr ? records_.newestOf(subject->facts()) : nullptr;
+    const Disk* const treated = subjectIn(disk);
+    if (treated == nullptr)
+        return nullptr;
+    return subject == pellar::Subject::Permissions ? records_.newestOfPermissions(treated->facts())
+                                                   : records_.newestOf(treated->facts());
 }
 
-KeptRepair KeptRepairs::stateOf(const Disk& disk) const
+KeptRepair KeptRepairs::stateOf(pellar::Subject subject, const Disk& disk) const
 {
-    const pellar::ListedRecord* const record = newestOf(disk);
+    const pellar::ListedRecord* const record = newestOf(subject, disk);
     if (record == nullptr)
-        return needsRights(disk) ? KeptRepair::Unknown : KeptRepair::None;
+        return needsRights(subject, disk) && !records_.knowsAll() ? KeptRepair::Unknown
+                                                                  : KeptRepair::None;
     if (record->isInUse)
         return KeptRepair::InUse;
+    if (!records_.isUsers(*record))
+        return KeptRepair::Others;
     return record->isInterrupted() ? KeptRepair::Interrupted : KeptRepair::Applied;
 }
 
 // Asked for every row of the list: where nothing is interrupted, no disk's name is looked up.
 bool KeptRepairs::isInterrupted(const Disk& disk) const
 {
-    return records_.hasInterrupted() && stateOf(disk) == KeptRepair::Interrupted;
+    if (!records_.hasInterrupted())
+        return false;
+    const pellar::ListedRecord* const record = newestOf(pellar::Subject::Filesystem, disk);
+    return record != nullptr && record->isInterrupted();
 }
 
 }  // namespace orvane::desktop

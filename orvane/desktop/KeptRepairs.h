@@ -17,6 +17,7 @@ enum class KeptRepair {
     Applied,      ///< it can be undone
     Interrupted,  ///< it can be finished or undone
     InUse,        ///< a program works on it
+    Others,       ///< another user asked for it
     Unknown,      ///< only an administrator can see it, if there is one
 };
 
@@ -26,6 +27,7 @@ struct UndoSituation {
     bool isLocked = false;  ///< a job runs
     bool isThere = true;    ///< the disk, or what is in the image, is there and has been read
     KeptRepair kept = KeptRepair::None;
+    bool isOfPermissions = false;
 };
 
 /// Why `operation` (Undo or Finish) cannot be chosen, as a key of the host's texts; empty when it
@@ -43,8 +45,10 @@ public:
 
     /// Of the disk or, where it is an image, of what is in it; null where there is none. Valid
     /// until the next `read`.
-    [[nodiscard]] const pellar::ListedRecord* newestOf(const Disk& disk) const;
-    [[nodiscard]] KeptRepair stateOf(const Disk& disk) const;
+    [[nodiscard]] const pellar::ListedRecord* newestOf(pellar::Subject subject,
+                                                       const Disk& disk) const;
+    /// Of what it holds: its file system or partition map, or the permissions of the files.
+    [[nodiscard]] KeptRepair stateOf(pellar::Subject subject, const Disk& disk) const;
     [[nodiscard]] bool isInterrupted(const Disk& disk) const;
     /// Whether there is a place to try repairs in.
     [[nodiscard]] bool canTry() const { return !trials_.room.directory.empty(); }

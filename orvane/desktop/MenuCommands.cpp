@@ -175,6 +175,8 @@ std::vector<MenuCommand> MenuCommands::diskCommands()
             line,
             undoCommand("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
             undoCommand("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
+            undoCommand("undoPermissions", "Undo Permi&ssions Repair…", pellar::Operation::Undo,
+                        RepairUndoing::Scope::Permissions),
             line,
             mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
             mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)};
@@ -190,13 +192,16 @@ MenuCommand MenuCommands::previewCommand()
 }
 
 MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view title,
-                                      pellar::Operation operation)
+                                      pellar::Operation operation, RepairUndoing::Scope scope)
 {
     return {.objectName = objectName,
             .title = title,
             .shortcut = {},
-            .perform = [this, operation] { undoing_.ask(operation); },
-            .reasonAgainst = [this, operation] { return undoing_.reasonAgainst(operation); }};
+            .perform = [this, operation, scope] { undoing_.ask(operation, scope); },
+            .reasonAgainst =
+                [this, operation, scope] {
+                    return undoing_.reasonAgainst(operation, scope);
+                }};
 }
 
 MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,

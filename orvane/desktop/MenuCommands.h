@@ -50,7 +50,8 @@ private:
     MenuCommand detailsCommand();
     MenuCommand previewCommand();
     MenuCommand undoCommand(const char* objectName, std::string_view title,
-                            pellar::Operation operation);
+                            pellar::Operation operation,
+                            RepairUndoing::Scope scope = RepairUndoing::Scope::Disk);
     MenuCommand settingCommand(const char* objectName, std::string_view title,
                                std::string_view key);
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,

@@ -3,7 +3,6 @@
 
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
-#include "orvane/desktop/window/Question.h"
 
 #include <QDateTime>
 #include <QLocale>
@@ -26,10 +25,21 @@ std::string number(std::uint64_t value)
     return fromQt(QLocale().toString(static_cast<qulonglong>(value)));
 }
 
-pellar::Task taskFor(Operation operation, const Disk& disk)
+pellar::Task taskFor(Operation operation, RepairUndoing::Scope scope, const Disk& disk)
 {
+    if (scope == RepairUndoing::Scope::Permissions)
+        return {pellar::Subject::Permissions, operation};
     return {disk.isWhole() ? pellar::Subject::PartitionMap : pellar::Subject::Filesystem,
             operation};
+}
+
+/// What is asked, with the disk's name in it.
+std::string_view questionKeyOf(pellar::Task task)
+{
+    if (task.subject == pellar::Subject::Permissions)
+        return "Undo the repair of the permissions on “%@”?";
+    return task.operation == Operation::Undo ? "Undo the repair of “%@”?"
+                                             : "Finish the repair of “%@”?";
 }
 
 }  // namespace
@@ -45,54 +55,62 @@ RepairUndoing::RepairUndoing(const SessionParts& parts, const DiskPane& disks, K
 {
 }
 
-// None unless one disk alone is selected, and is there.
-std::shared_ptr<Disk> RepairUndoing::disk() const
+// None unless one disk alone is selected, and is there; for permissions, mounted.
+std::shared_ptr<Disk> RepairUndoing::disk(Scope scope) const
 {
     const auto selected = disks_.selected();
     if (selected.size() != 1)
         return nullptr;
     const auto& disk =
         selected.front()->isOfflineDiskImage() ? selected.front()->contents() : selected.front();
-    return disk && !disk->hasGone() ? disk : nullptr;
+    const bool isThere = disk && !disk->hasGone();
+    return isThere && (scope == Scope::Disk || disk->isMounted()) ? disk : nullptr;
 }
 
-std::string RepairUndoing::reasonAgainst(Operation operation)
+std::string RepairUndoing::reasonAgainst(Operation operation, Scope scope)
 {
     kept_.read();
-    const auto disk = this->disk();
+    const auto disk = this->disk(scope);
     const std::string_view reason = desktop::reasonAgainst(
-        operation, {disks_.selected().size(), at_.controller.interfaceLock(), disk != nullptr,
-                    disk ? kept_.stateOf(*disk) : KeptRepair::None});
+        operation,
+        {disks_.selected().size(), at_.controller.interfaceLock(), disk != nullptr,
+         disk ? kept_.stateOf(taskFor(operation, scope, *disk).subject, *disk) : KeptRepair::None,
+         scope == Scope::Permissions});
     return reason.empty() ? std::string() : text(reason);
 }
 
-void RepairUndoing::ask(Operation operation)
+void RepairUndoing::ask(Operation operation, Scope scope)
 {
-    if (const std::string reason = reasonAgainst(operation); !reason.empty()) {
+    if (const std::string reason = reasonAgainst(operation, scope); !reason.empty()) {
         at_.host.showSheet("", {reason});
         return;
     }
-    const auto disk = this->disk();
-    const pellar::Task task = taskFor(operation, *disk);
-    const bool isUndo = operation == Operation::Undo;
-    desktop::ask(at_.window, {"undoQuestion",
-                              at_.host.translator().sentence(isUndo ? "Undo the repair of “%@”?"
-                                                                    : "Finish the repair of “%@”?",
-                                                             {disk->displayName()}),
-                              meaningOf(operation, kept_.newestOf(*disk)),
-                              {{text(isUndo ? "Undo Repair" : "Finish Repair"),
-                                [this, task, disk] {
-                                    begin(task, disk);
-                                }}},
-                              text("Cancel")});
+    const auto disk = this->disk(scope);
+    desktop::ask(at_.window, questionAbout(taskFor(operation, scope, *disk), disk));
 }
 
-std::string RepairUndoing::meaningOf(Operation operation, const pellar::ListedRecord* record)
+Question RepairUndoing::questionAbout(pellar::Task task, const std::shared_ptr<Disk>& disk)
+{
+    const bool isUndo = task.operation == Operation::Undo;
+    return {"undoQuestion",
+            at_.host.translator().sentence(questionKeyOf(task), {disk->displayName()}),
+            meaningOf(task, kept_.newestOf(task.subject, *disk)),
+            {{text(isUndo ? "Undo Repair" : "Finish Repair"),
+              [this, task, disk] {
+                  begin(task, disk);
+              }}},
+            text("Cancel")};
+}
+
+std::string RepairUndoing::meaningOf(pellar::Task task, const pellar::ListedRecord* record)
 {
     const Translator& texts = at_.host.translator();
-    const bool isUndo = operation == Operation::Undo;
+    const bool isUndo = task.operation == Operation::Undo;
+    const bool isOfPermissions = task.subject == pellar::Subject::Permissions;
     std::string meaning;
-    if (record == nullptr)
+    if (record != nullptr && isOfPermissions)
+        meaning = texts.sentence("It was done on %1$@.", {timeOf(*record)});
+    else if (record == nullptr)
         meaning = text("What is kept of it is known only with an administrator’s rights.");
     else
         meaning = texts.sentence(
@@ -102,6 +120,11 @@ std::string RepairUndoing::meaningOf(Operation operation, const pellar::ListedRe
                      "%3$@ places.",
             {timeOf(*record), number(record->facts.changedBytes),
              number(record->facts.rangeCount)});
+    if (isOfPermissions)
+        return meaning + " " +
+               text(
+                   "Each file that is still as that repair left it has again the owner, group and "
+                   "permissions that it had before.");
     return meaning + " " +
            text(isUndo ? "The damage that it repaired is then there again."
                        : "The disk is then as the repair was to leave it.");

@@ -4,6 +4,7 @@
 #include "orvane/desktop/DiskPane.h"
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/ModuleTabs.h"
+#include "orvane/desktop/window/Question.h"
 #include "orvane/jobs/HostJob.h"
 
 #include <functional>
@@ -17,6 +18,8 @@ namespace orvane::desktop {
 /// Main thread.
 class RepairUndoing {
 public:
+    enum class Scope { Disk, Permissions };
+
     /// The disks, the kept repairs and the texts outlive this object. The ledger is the options'
     /// observer. `update` shows that the window is locked.
     RepairUndoing(const SessionParts& parts, const DiskPane& disks, KeptRepairs& kept,
@@ -25,19 +28,21 @@ public:
     RepairUndoing(const RepairUndoing&) = delete;
     RepairUndoing& operator=(const RepairUndoing&) = delete;
 
-    // Of the disk that is selected; `operation` is Undo or Finish.
+    // Of the disk that is selected: of what it holds, which is a file system or a map, or of its
+    // files' permissions; `operation` is Undo or Finish.
 
     /// Why it cannot be done, in the user's language; empty when it can. Looks at what is kept.
-    std::string reasonAgainst(pellar::Operation operation);
+    std::string reasonAgainst(pellar::Operation operation, Scope scope = Scope::Disk);
     /// Tells what it means, and does it if the user wants that; or tells why it cannot be done.
-    void ask(pellar::Operation operation);
+    void ask(pellar::Operation operation, Scope scope = Scope::Disk);
 
     /// As the ledger hears it, of any job.
     void runEnded(const StartedRun& run, const RunEnd& end);
 
 private:
-    std::shared_ptr<Disk> disk() const;
-    std::string meaningOf(pellar::Operation operation, const pellar::ListedRecord* record);
+    std::shared_ptr<Disk> disk(Scope scope) const;
+    Question questionAbout(pellar::Task task, const std::shared_ptr<Disk>& disk);
+    std::string meaningOf(pellar::Task task, const pellar::ListedRecord* record);
     void begin(pellar::Task task, const std::shared_ptr<Disk>& disk);
     void showProgress(const std::string& title);
     void finish(const std::string& title, const RunEnd& end);

@@ -3,9 +3,11 @@
 
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/pellar/MessageKeys.h"
+#include "pellar/undo/PublicIndex.h"
 
 #include <algorithm>
 #include <chrono>
+#include <iterator>
 #include <system_error>
 #include <utility>
 
@@ -53,16 +55,47 @@ bool hasNotWritten(const Run& run)
 RepairRecords::RepairRecords(const pellar::Trials& trials) : user_(trials.user)
 {
     std::error_code error;
-    const auto directory = recordsIn(trials);
-    if (trials.room.directory.empty() || !std::filesystem::is_directory(directory, error))
-        return;
-    const auto store = pellar::UndoStore::open(directory);
-    if (!store)
-        return;
-    pellar::RecordList all = store->list();
-    for (ListedRecord& record : all.records) {
+    std::vector<ListedRecord> all;
+    if (!trials.room.directory.empty() && std::filesystem::is_directory(recordsIn(trials), error))
+        if (const auto store = openRecords(trials))
+            all = store->list().records;
+    if (!trials.systemDirectory.empty())
+        addSystemRecords(trials.systemDirectory, all);
+    pellar::sortNewestFirst(all, [](const ListedRecord& record) -> const pellar::RecordedRepair& {
+        return record.facts.repair;
+    });
+    for (ListedRecord& record : all) {
         const bool isOfMap = record.facts.repair.task.subject == pellar::Subject::PartitionMap;
         (isOfMap ? ofMaps_ : ofVolumes_).records.push_back(std::move(record));
+    }
+    if (user_ == 0 && !trials.room.directory.empty() &&
+        std::filesystem::is_directory(permissionRecordsIn(trials), error))
+        readPermissionRecords(trials);
+}
+
+void RepairRecords::addSystemRecords(const std::filesystem::path& directory,
+                                     std::vector<ListedRecord>& all)
+{
+    auto repairs = pellar::readPublicIndex(pellar::recordIndexIn(directory));
+    if (repairs)
+        std::ranges::move(repairs->records, std::back_inserter(all));
+    auto permissions = pellar::readPublicIndex(pellar::permissionIndexIn(directory));
+    if (permissions)
+        ofPermissions_ = std::move(*permissions);
+    knowsAll_ = repairs && permissions;
+}
+
+/// Only root can repair permissions, so only root has any of its own.
+void RepairRecords::readPermissionRecords(const pellar::Trials& trials)
+{
+    const auto store = openPermissionRecords(trials);
+    if (!store)
+        return;
+    for (const pellar::ListedPermissionRecord& record : store->list().records) {
+        pellar::RecordFacts facts;
+        facts.repair = record.run.repair;
+        facts.state = pellar::RecordState::Applied;
+        ofPermissions_.records.push_back({record.id, std::move(facts), record.isInUse});
     }
 }
 
@@ -73,10 +106,25 @@ const ListedRecord* RepairRecords::newestOf(const DiskFacts& disk) const
         pellar::newestOf(wanted, disk.isWhole ? ofMaps_ : ofVolumes_);
     if (newest == nullptr)
         return nullptr;
-    // An older one is of no use before the newest was undone.
-    const pellar::RecordedRepair& repair = newest->facts.repair;
-    const bool isUsers = user_ == 0 || repair.user == user_;
-    return isUsers && !mayBeAnother(repair.disk, wanted) ? newest : nullptr;
+    return mayBeAnother(newest->facts.repair.disk, wanted) ? nullptr : newest;
+}
+
+// As the job finds it, which also knows where the system was mounted.
+const ListedRecord* RepairRecords::newestOfPermissions(const DiskFacts& disk) const
+{
+    const RecordedDisk wanted = recordedDisk(disk);
+    const auto found =
+        std::ranges::find_if(ofPermissions_.records, [&wanted](const ListedRecord& record) {
+            const RecordedDisk& repaired = record.facts.repair.disk;
+            return repaired.uuid == wanted.uuid &&
+                   (!wanted.uuid.empty() || repaired.path == wanted.path);
+        });
+    return found == ofPermissions_.records.end() ? nullptr : &*found;
+}
+
+bool RepairRecords::isUsers(const ListedRecord& record) const
+{
+    return user_ == 0 || record.facts.repair.user == user_;
 }
 
 bool RepairRecords::hasInterrupted() const

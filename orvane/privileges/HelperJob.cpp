@@ -228,6 +228,7 @@ private:
     {
         pellar::Trials trials;
         trials.room.directory = systemRepairs;
+        trials.isPublic = true;
         trials.user = user_.value_or(::getuid());
         // The user's own commands do not find what is kept here of an image.
         if (request_.isOnImage())

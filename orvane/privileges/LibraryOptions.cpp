@@ -64,6 +64,9 @@ void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairA
     const RepairSettings settings =
         readRepairSettings(fileIn(paths.config, settingsFileName));
     options.trials.room.directory = repairsDirectory(paths);
+    options.trials.isPublic = options.trials.room.directory == systemRepairs;
+    if (::geteuid() != 0)
+        options.trials.systemDirectory = systemRepairs;
     options.trials.limits = {settings.keptRepairs,
                              std::chrono::hours(24 * settings.keptRepairDays),
                              settings.keptRepairMegabytes << 20U};

@@ -9,7 +9,7 @@
 
 namespace orvane {
 
-/// Where repairs are tried and kept as root; root's alone.
+/// Where repairs are tried and kept as root, in directories that are root's alone.
 inline constexpr const char* systemRepairs = "/var/lib/orvane/repairs";
 
 /// How the disk-management library is set up for a user: where it looks for tools, where it keeps

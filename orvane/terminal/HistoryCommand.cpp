@@ -21,8 +21,9 @@ std::vector<RunLine> runsOf(const std::vector<std::shared_ptr<Disk>>& disks, Ses
         const std::vector<Run> runs =
             session.host().historyStore().runs(session.host().histories().keyOf(disk->facts()));
         const pellar::ListedRecord* const record = session.repairRecords().newestOf(disk->facts());
-        const Run* const undoable =
-            record != nullptr ? runOf(record->facts.repair, runs) : nullptr;
+        const Run* const undoable = record != nullptr && session.repairRecords().isUsers(*record)
+                                        ? runOf(record->facts.repair, runs)
+                                        : nullptr;
         for (const Run& run : runs) {
             newest = std::max(newest, run.started);
             lines.push_back({newest, run, &run == undoable ? record->id : ""});

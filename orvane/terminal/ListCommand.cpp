@@ -38,8 +38,10 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     const DiskFacts& facts = disk->facts();
     DiskLine line;
     const pellar::ListedRecord* const record = session.repairRecords().newestOf(facts);
-    if (record != nullptr && record->isInterrupted())
+    if (record != nullptr && record->isInterrupted()) {
         line.interruptedRepair = record->id;
+        line.isOthersToUndo = !session.repairRecords().isUsers(*record);
+    }
     line.disk = session.names().nameOf(facts.identifier);
     line.name = disk->displayName();
     line.kind = session.texts().text(kindText(facts.type));
@@ -84,6 +86,7 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
         line.verdict = volume.verdict;
         line.later = volume.later;
         line.interruptedRepair = volume.interruptedRepair;
+        line.isOthersToUndo = volume.isOthersToUndo;
     }
     reporter.listed(line);
     if (!top)

@@ -42,6 +42,7 @@ struct DiskLine {
     std::optional<Attempt> later = {};
     /// The record of a repair that was interrupted as it was written; empty: none that is known.
     std::string interruptedRepair = {};
+    bool isOthersToUndo = false;  ///< another user asked for that repair
     std::vector<ActionLine> actions;
 };
 

@@ -134,7 +134,11 @@ public:
             below(sentence("after that, %@: %@",
                            {disk.later->started, verdictText(disk.later->verdict)}));
         if (!disk.interruptedRepair.empty())
-            below(sentence("repair interrupted: finish or undo it", {}));
+            below(sentence(disk.isOthersToUndo
+                               ? "repair interrupted: who asked for it, or an administrator, can "
+                                 "finish or undo it"
+                               : "repair interrupted: finish or undo it",
+                           {}));
         for (const ActionLine& action : disk.actions)
             below(fmt::format("{:<24} {}", action.title,
                               action.isAvailable ? sentence("available", {})

@@ -6,6 +6,7 @@
 #include "pellar/jobs/EventQueue.h"
 #include "pellar/outcome/Task.h"
 #include "pellar/overlay/Overlay.h"
+#include "pellar/permissions/PermissionRecords.h"
 #include "pellar/process/KernelFiles.h"
 #include "pellar/process/ProcessOutput.h"
 #include "pellar/process/Stopping.h"
@@ -49,6 +50,10 @@ struct Trials {
     /// Where what a tool would write is kept, and, below it, what repairs have overwritten. Without
     /// a directory no repair is tried: the tools write to the disks themselves.
     OverlayRoom room;
+    /// Everybody may read which repairs are kept there (PublicIndex).
+    bool isPublic = false;
+    /// Where the administrator keeps repairs for all; empty where it is the room's directory.
+    std::filesystem::path systemDirectory = {};
     RecordLimits limits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
     uid_t user = ::geteuid();  ///< who asks, and may take a repair back
     /// Makes a sentence in the user's language about a disk; asked on the job's thread, while the
@@ -71,10 +76,36 @@ inline std::filesystem::path recordsIn(const Trials& trials)
     return trials.room.directory / "records";
 }
 
+/// What everybody may know of them.
+inline std::filesystem::path recordIndexIn(const std::filesystem::path& directory)
+{
+    return directory / "index";
+}
+
+[[nodiscard]] inline Result<UndoStore, Sentence> openRecords(const Trials& trials)
+{
+    return UndoStore::open(
+        recordsIn(trials), ::fsync,
+        trials.isPublic ? recordIndexIn(trials.room.directory) : std::filesystem::path());
+}
+
 /// Where the records are of the permissions that repairs have changed (PermissionRecords).
 inline std::filesystem::path permissionRecordsIn(const Trials& trials)
 {
     return trials.room.directory / "permission-records";
+}
+
+/// What everybody may know of them.
+inline std::filesystem::path permissionIndexIn(const std::filesystem::path& directory)
+{
+    return directory / "permission-index";
+}
+
+[[nodiscard]] inline Result<PermissionRecords, Sentence> openPermissionRecords(const Trials& trials)
+{
+    return PermissionRecords::open(
+        permissionRecordsIn(trials), ::fsync,
+        trials.isPublic ? permissionIndexIn(trials.room.directory) : std::filesystem::path());
 }
 
 /// A job for which this user has no right: on a block device that they may not open, on files that

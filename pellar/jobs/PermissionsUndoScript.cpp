@@ -49,7 +49,7 @@ PermissionsUndoScript::Failure PermissionsUndoScript::carryOut()
                              {"the root of the system cannot be opened", {}, {}});
     if (context_.options.trials.room.directory.empty())
         return nothingKept();
-    const auto store = PermissionRecords::open(permissionRecordsIn(context_.options.trials));
+    const auto store = openPermissionRecords(context_.options.trials);
     if (!store)
         return failedOutcome(contract::kPLErrorNothingToUndo, store.error());
     const PermissionRecordList list = store->list();

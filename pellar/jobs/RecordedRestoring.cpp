@@ -93,7 +93,7 @@ void RecordedRestoring::carryOut()
 void RecordedRestoring::record(const std::vector<Waiting>& batch)
 {
     if (!record_) {
-        const auto records = PermissionRecords::open(permissionRecordsIn(context_.options.trials));
+        const auto records = openPermissionRecords(context_.options.trials);
         if (!records)
             return failWith(records.error());
         auto begun = records->begin(permissionsRunOn(*disk_, root_, context_));
@@ -172,7 +172,7 @@ void RecordedRestoring::finish()
     if (error != 0)
         return log_.error(notKept(error));
     const Trials& trials = context_.options.trials;
-    if (const auto records = PermissionRecords::open(permissionRecordsIn(trials)))
+    if (const auto records = openPermissionRecords(trials))
         records->removeBeyond(trials.limits, std::chrono::system_clock::now());
     if (isKept)
         context_.advise(trials.howToUndoPermissions);

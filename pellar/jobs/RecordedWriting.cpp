@@ -53,7 +53,7 @@ std::optional<Outcome> RecordedWriting::write(const std::vector<ByteRange>& rang
                                               RegionReader& after)
 {
     JobLog& log = context_.log;
-    const auto store = UndoStore::open(recordsIn(context_.options.trials));
+    const auto store = openRecords(context_.options.trials);
     if (!store)
         return notWritten(store.error());
     log.meter().setRange(writingBegins, 100);

@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cerrno>
 #include <cstring>
+#include <iterator>
 #include <utility>
 
 namespace pellar {
@@ -82,6 +83,7 @@ std::optional<Outcome> RepairPasses::repair()
                        evidence.findings.problems > 0 || look_.foundDamage});
     look_.counts.reconnected += evidence.findings.reconnected;
     look_.counts.cleared += evidence.findings.cleared;
+    std::ranges::copy(evidence.findings.changes, std::back_inserter(look_.counts.changes));
     return isOver(judgement) ? std::optional(outcomeOfVerification(judgement)) : std::nullopt;
 }
 

@@ -45,14 +45,17 @@ int copyInto(int file, WorkingCopy& overlay, const std::function<bool()>& isStop
                : errno;
 }
 
-/// Gathers the files that a directory's listing tells of.
+/// Gathers what a listing tells of files.
+template <class File>
 class ListingReader final : public RunListener {
 public:
-    explicit ListingReader(const CollectedFilesReading& reading) : reading_(reading) {}
+    using Reading = std::optional<File> (*)(std::string_view line);
+
+    explicit ListingReader(Reading reading) : reading_(reading) {}
 
     void line(std::string_view line, bool isCut) override
     {
-        if (auto file = isCut ? std::nullopt : reading_.fileIn(line))
+        if (auto file = isCut ? std::nullopt : reading_(line))
             files.push_back(*std::move(file));
     }
     void progressLine(std::string_view) override {}
@@ -60,11 +63,25 @@ public:
     void pause() override {}
     void tick() override {}
 
-    std::vector<CollectedFile> files;
+    std::vector<File> files;
 
 private:
-    const CollectedFilesReading& reading_;
+    const Reading reading_;
 };
+
+/// As many names are told, of each sort; the rest is counted.
+constexpr std::size_t mostShown = 50;
+
+/// `shown` is the file.
+Sentence sentenceFor(const FileChange& file, const std::string& shown)
+{
+    const std::string before = file.before ? std::to_string(*file.before) : std::string();
+    if (file.after)
+        return {"%1$@ would have another size: %2$@ bytes", shown,
+                (file.before ? before + " → " : "") + std::to_string(*file.after)};
+    return file.before ? Sentence{"%1$@ would be gone: %2$@ bytes", shown, before}
+                       : Sentence{"%1$@ would be gone", shown, {}};
+}
 
 }  // namespace
 
@@ -103,23 +120,69 @@ void RepairPreview::tellChanges(const std::vector<ByteRange>& ranges, const Outc
                              std::to_string(*counts.before), std::to_string(*counts.after)});
     for (const Sentence& warning : tried.warnings)
         log_.remark(Sentence{"After the repair: %1$@.", log_.text(warning), {}});
+    tellFiles(ranges, counts);
     if (counts.reconnected > 0 && tool_.collectedFiles != nullptr)
         tellCollected();
 }
 
-void RepairPreview::tellCollected()
+/// By the volume's books, where we can read them; else by what the tool said.
+void RepairPreview::tellFiles(const std::vector<ByteRange>& ranges, const FileCounts& counts)
 {
-    constexpr std::size_t mostShown = 50;
-    const CollectedFilesReading& reading = *tool_.collectedFiles;
+    std::vector<FileChange> files = counts.changes;
+    if (tool_.files != nullptr)
+        files = tool_.files->changes(
+            {disk_.descriptor(), disk_.offset(), trial_.descriptor(), trial_.bytes()}, ranges);
+    if (!files.empty() && tool_.files != nullptr)
+        nameFiles(files);
+    const std::size_t shown = std::min(files.size(), mostShown);
+    for (const FileChange& file : std::span(files).first(shown))
+        log_.remark(sentenceFor(
+            file, log_.text(file.name.empty()
+                                ? Sentence{"The file in inode %1$@", std::to_string(file.inode), {}}
+                                : Sentence{"“%1$@”", contract::printable(file.name), {}})));
+    if (shown < files.size())
+        log_.remark(Sentence{"… and %1$@ more", std::to_string(files.size() - shown), {}});
+}
+
+/// The first of them, as many as a tool can be asked for at once. What is no file goes.
+void RepairPreview::nameFiles(std::vector<FileChange>& files)
+{
+    constexpr std::ptrdiff_t mostNamed = 500;
+    const FileComparison& comparison = *tool_.files;
+    const std::vector<FileChange> asked(files.begin(),
+                                        files.begin() + std::min(std::ssize(files), mostNamed));
+    ListingReader<FileChange> listing(comparison.nameIn);
+    // What was named before it came to an end is right all the same.
+    static_cast<void>(runListing(
+        comparison.program,
+        comparison.arguments(pathOfDescriptor(diskDescriptorOfTool), disk_.offset(), asked),
+        disk_.descriptor(), listing));
+    for (FileChange& file : files) {
+        const auto named = std::ranges::find(listing.files, file.inode, &FileChange::inode);
+        if (named != listing.files.end())
+            file.name = named->name;
+    }
+    std::erase_if(files, [](const FileChange& file) { return file.name.empty() && !file.before; });
+}
+
+bool RepairPreview::runListing(std::string_view program, std::vector<std::string> arguments,
+                               int disk, RunListener& listing)
+{
     RunRequest request;
-    request.command = {findProgram(reading.program, context_.options.toolPath),
-                       reading.arguments(pathOfDescriptor(diskDescriptorOfTool))};
-    request.disk = trial_.descriptor();
+    request.command = {findProgram(program, context_.options.toolPath), std::move(arguments)};
+    request.disk = disk;
     request.limits = context_.options.outputLimits;
     request.graceTimes = graceTimesFor(Access::ReadOnly);
-    ListingReader listing(reading);
-    if (request.command.executable.empty() ||
-        runTool(request, context_.stop, listing).ending != Ending(Exited{0}))
+    return !request.command.executable.empty() &&
+           runTool(request, context_.stop, listing).ending == Ending(Exited{0});
+}
+
+void RepairPreview::tellCollected()
+{
+    const CollectedFilesReading& reading = *tool_.collectedFiles;
+    ListingReader<CollectedFile> listing(reading.fileIn);
+    if (!runListing(reading.program, reading.arguments(pathOfDescriptor(diskDescriptorOfTool)),
+                    trial_.descriptor(), listing))
         return;
     const std::size_t shown = std::min(mostShown, listing.files.size());
     for (const CollectedFile& file : std::span(listing.files).first(shown))

@@ -59,7 +59,7 @@ UndoScript::Failure UndoScript::onMap()
 
 UndoScript::Failure UndoScript::carryOutOn(Region& region, const RecordedDisk& disk)
 {
-    const auto store = UndoStore::open(recordsIn(context_.options.trials));
+    const auto store = openRecords(context_.options.trials);
     if (!store)
         return failedOutcome(contract::kPLErrorNothingToUndo, store.error());
     RecordList list = store->list();

@@ -137,7 +137,7 @@ std::optional<Outcome> VolumeScript::objectionToHistory()
     const auto directory = recordsIn(context_.options.trials);
     if (context_.options.trials.room.directory.empty() || !std::filesystem::exists(directory))
         return std::nullopt;
-    const auto store = UndoStore::open(directory);
+    const auto store = openRecords(context_.options.trials);
     if (!store)
         return std::nullopt;
     const DiskClaim& claim = disk_.claim();
@@ -385,7 +385,8 @@ VolumeScript::State VolumeScript::tryRepair()
 VolumeScript::State VolumeScript::apply()
 {
     if (context_.policy.isPreview)
-        return end(RepairPreview(context_, *tool_, *trial_).tell(outcome_, look_.counts));
+        return end(
+            RepairPreview(context_, *tool_, *trial_, disk_.claim()).tell(outcome_, look_.counts));
     return end(applyTrial(*trial_, mark_, disk_, context_, outcome_));
 }
 

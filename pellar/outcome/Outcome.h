@@ -2,6 +2,7 @@
 #pragma once
 
 #include "contract/foundation/Name.h"
+#include "pellar/outcome/FileChange.h"
 #include "pellar/outcome/Judgement.h"
 #include "pellar/outcome/Task.h"
 #include "pellar/texts/Texts.h"
@@ -40,6 +41,7 @@ struct FileCounts {
     std::uint64_t cleared = 0;
     std::string_view collectedOne = {};  ///< ToolHabits
     std::string_view collectedMany = {};
+    std::vector<FileChange> changes = {};  ///< that the tool told of
 };
 
 /// The losses that a repaired volume is left with, the gravest first; none when nothing is known to

@@ -12,7 +12,6 @@
 #include <cerrno>
 #include <cstdio>
 #include <system_error>
-#include <thread>
 
 namespace pellar {
 namespace {
@@ -58,6 +57,15 @@ bool isSameSystem(const PermissionsRun& a, const PermissionsRun& b)
     if (disk.uuid != other.uuid)
         return false;
     return !disk.uuid.empty() || (disk.path == other.path && a.mountPoint == b.mountPoint);
+}
+
+/// What is said of it to everybody.
+RecordFacts factsOf(const PermissionsRun& run)
+{
+    RecordFacts facts;
+    facts.repair = run.repair;
+    facts.state = RecordState::Applied;
+    return facts;
 }
 
 std::uint64_t unsettledIn(const std::vector<RecordedChange>& changes)
@@ -145,19 +153,28 @@ int PermissionRecord::remove() const
 {
     if (::unlinkat(directory_->descriptor(), name_.c_str(), 0) != 0)
         return errno;
-    return directory_->sync();
+    const int error = directory_->sync();
+    return error == 0 && index_ ? index_->remove(name_) : error;
 }
 
 Result<PermissionRecords, Sentence> PermissionRecords::open(const std::filesystem::path& directory,
-                                                            SyncFunction sync)
+                                                            SyncFunction sync,
+                                                            const std::filesystem::path& index)
 {
-    auto opened = StoreDirectory::open(directory, std::move(sync));
-    if (!opened)
+    const auto without = [](const std::string& reason) {
         return Sentence{
             "there is no directory to keep the permissions in that a repair changes: %1$@",
-            opened.error(),
+            reason,
             {}};
-    return PermissionRecords(std::make_shared<const StoreDirectory>(std::move(*opened)));
+    };
+    auto opened = StoreDirectory::open(directory, sync);
+    if (!opened)
+        return without(opened.error());
+    const auto records = std::make_shared<const StoreDirectory>(std::move(*opened));
+    const auto published = PublicIndex::openUnlessEmpty(index, records, std::move(sync));
+    if (!published)
+        return without(published.error());
+    return PermissionRecords(records, *published);
 }
 
 Result<PermissionRecord, int> PermissionRecords::begin(const PermissionsRun& run) const
@@ -169,7 +186,7 @@ Result<PermissionRecord, int> PermissionRecords::begin(const PermissionsRun& run
                                  O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
     if (!file)
         return errno;
-    PermissionRecord record(directory_, unfinishedName, std::move(file));
+    PermissionRecord record(directory_, index_, unfinishedName, std::move(file));
     int error = lock(record.file_, LOCK_EX);
     if (error == 0)
         error = record.begin(run);
@@ -184,9 +201,19 @@ Result<PermissionRecord, int> PermissionRecords::begin(const PermissionsRun& run
     if (error == 0)
         error = directory_->sync();
     if (error == 0)
+        error = publish(record);
+    if (error == 0)
         return record;
     ::unlinkat(directory, record.name_.c_str(), 0);
     return error;
+}
+
+int PermissionRecords::publish(const PermissionRecord& record) const
+{
+    if (!index_)
+        return 0;
+    const auto shown = index_->publish(record.name_, factsOf(record.run_));
+    return shown ? 0 : shown.error();
 }
 
 // O_NONBLOCK: a FIFO in a file's place must not keep the process waiting; it is refused.
@@ -201,7 +228,7 @@ Result<PermissionRecord, int> PermissionRecords::openLocked(const std::string& n
         return errno;
     if (!S_ISREG(status.st_mode))
         return EINVAL;
-    PermissionRecord record(directory_, name, std::move(file));
+    PermissionRecord record(directory_, index_, name, std::move(file));
     const int error = lock(record.file_, kind);
     // One that is in use may be read all the same: it is only appended to.
     if (error != 0 && !(kind == LOCK_SH && error == EWOULDBLOCK))
@@ -217,30 +244,29 @@ PermissionRecordList PermissionRecords::list() const
     PermissionRecordList list;
     for (const std::string& name : directory_->names()) {
         const auto record = openLocked(name, LOCK_SH);
-        if (record)
+        if (record) {
             list.records.push_back(
                 {name, record->run(), unsettledIn(record->changes()), record->isInUse_});
-        else if (record.error() != ENOENT)
+            if (index_ && !record->isInUse_)
+                index_->mend(name, factsOf(record->run()));
+        } else if (record.error() != ENOENT) {
             list.broken.push_back(name);
+            if (index_ && record.error() != EWOULDBLOCK)
+                static_cast<void>(index_->remove(name));
+        }
     }
-    std::ranges::sort(list.records,
-                      [](const ListedPermissionRecord& a, const ListedPermissionRecord& b) {
-                          const auto aTime = a.run.repair.time;
-                          const auto bTime = b.run.repair.time;
-                          return aTime != bTime ? aTime > bTime : a.id > b.id;
-                      });
+    if (index_)
+        index_->removeOrphans();
+    sortNewestFirst(list.records,
+                    [](const ListedPermissionRecord& record) -> const RecordedRepair& {
+                        return record.run.repair;
+                    });
     return list;
 }
 
 Result<PermissionRecord, Sentence> PermissionRecords::take(const std::string& id) const
 {
-    using namespace std::chrono_literals;
-    auto record = openLocked(id, LOCK_EX);
-    // A listing takes the lock too, for a moment.
-    for (int i = 0; i < 10 && !record && record.error() == EWOULDBLOCK; ++i) {
-        std::this_thread::sleep_for(20ms);
-        record = openLocked(id, LOCK_EX);
-    }
+    auto record = waitingForLock([&] { return openLocked(id, LOCK_EX); });
     if (record)
         return std::move(*record);
     if (record.error() == EWOULDBLOCK)

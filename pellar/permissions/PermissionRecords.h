@@ -4,6 +4,7 @@
 #include "pellar/outcome/Result.h"
 #include "pellar/permissions/RecordedChange.h"
 #include "pellar/texts/Sentence.h"
+#include "pellar/undo/PublicIndex.h"
 #include "pellar/undo/RecordDirectory.h"
 #include "pellar/undo/UndoStore.h"
 
@@ -41,9 +42,13 @@ public:
 private:
     friend class PermissionRecords;
 
-    PermissionRecord(std::shared_ptr<const StoreDirectory> directory, std::string name,
+    PermissionRecord(std::shared_ptr<const StoreDirectory> directory,
+                     std::shared_ptr<const PublicIndex> index, std::string name,
                      FileDescriptor file)
-        : directory_(std::move(directory)), name_(std::move(name)), file_(std::move(file))
+        : directory_(std::move(directory)),
+          index_(std::move(index)),
+          name_(std::move(name)),
+          file_(std::move(file))
     {
     }
 
@@ -52,6 +57,7 @@ private:
     [[nodiscard]] int append(const std::string& text);
 
     std::shared_ptr<const StoreDirectory> directory_;
+    std::shared_ptr<const PublicIndex> index_;  ///< null where there is none
     std::string name_;
     FileDescriptor file_;
     std::uint64_t length_ = 0;  ///< of the whole lines
@@ -84,12 +90,15 @@ struct PermissionRecordList {
 class PermissionRecords {
 public:
     /// Makes the directory when it is missing. It must be absolute, and no other user but root may
-    /// be able to change it.
+    /// be able to change it. `index` is where everybody may read which records there are
+    /// (PublicIndex); nowhere when it is empty.
     [[nodiscard]] static Result<PermissionRecords, Sentence> open(
-        const std::filesystem::path& directory, SyncFunction sync = ::fsync);
+        const std::filesystem::path& directory, SyncFunction sync = ::fsync,
+        const std::filesystem::path& index = {});
 
     /// A new one, on the medium; errno otherwise.
     [[nodiscard]] Result<PermissionRecord, int> begin(const PermissionsRun& run) const;
+    /// Also mends the index.
     [[nodiscard]] PermissionRecordList list() const;
     /// To be undone. Waits for its lock, a fifth of a second at most.
     [[nodiscard]] Result<PermissionRecord, Sentence> take(const std::string& id) const;
@@ -98,14 +107,17 @@ public:
     void removeBeyond(const RecordLimits& limits, std::chrono::system_clock::time_point now) const;
 
 private:
-    explicit PermissionRecords(std::shared_ptr<const StoreDirectory> directory)
-        : directory_(std::move(directory))
+    PermissionRecords(std::shared_ptr<const StoreDirectory> directory,
+                      std::shared_ptr<const PublicIndex> index)
+        : directory_(std::move(directory)), index_(std::move(index))
     {
     }
 
+    [[nodiscard]] int publish(const PermissionRecord& record) const;
     [[nodiscard]] Result<PermissionRecord, int> openLocked(const std::string& name, int kind) const;
 
     std::shared_ptr<const StoreDirectory> directory_;
+    std::shared_ptr<const PublicIndex> index_;  ///< null where there is none
 };
 
 }  // namespace pellar

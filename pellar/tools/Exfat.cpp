@@ -95,6 +95,8 @@ class ExfatOutput final : public LineOutput {
         if (sign == nullptr)
             return detail(line);
         findings_.corrections += line.ends_with("? y") ? 1 : 0;
+        if (auto change = sizeIn(std::string(line)); change && line.ends_with("? y"))
+            noteChange(*std::move(change));
         return problem(line, sign->kind);
     }
 
@@ -107,6 +109,27 @@ class ExfatOutput final : public LineOutput {
         if (findings_.isComplete)
             findings_.files = filesIn(std::string(line));
         return detail(line);
+    }
+
+    /// "ERROR: /A: less clusters are allocated. truncates to 4096 bytes at 0x1180. Truncate (y/N)?
+    /// y" Where it says "more clusters are allocated", the file keeps its size.
+    static std::optional<FileChange> sizeIn(const std::string& line)
+    {
+        constexpr std::string_view start = "ERROR: ";
+        FileChange change{0, {}, std::nullopt, 0};
+        for (const std::string_view said :
+             {": less clusters are allocated. truncate",
+              ": cluster is already allocated for the other file. truncate",
+              ": BAD cluster. truncate", ": broken cluster chain. truncate"}) {
+            const std::size_t at = line.rfind(said);
+            const std::size_t number = line.find(" to ", at == std::string::npos ? at : at + 1);
+            if (!line.starts_with(start) || number == std::string::npos ||
+                std::sscanf(line.c_str() + number, " to %" SCNu64 " bytes", &*change.after) != 1)
+                continue;
+            change.name = line.substr(start.size(), at - start.size());
+            return change;
+        }
+        return std::nullopt;
     }
 
     /// "NAME: clean. directories 1, files 0"

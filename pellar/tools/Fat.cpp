@@ -202,6 +202,7 @@ class FatOutput final : public LineOutput {
     {
         const bool isBelowPath = wasPath_ && line.starts_with(' ');
         const bool isTally = line.starts_with("/proc/self/fd/") && line.ends_with(" clusters");
+        noteSizes(line);
         wasPath_ = line.starts_with('/') && !isTally;
         findings_.isComplete = findings_.isComplete || isTally;
         if (isTally)
@@ -220,6 +221,23 @@ class FatOutput final : public LineOutput {
                    : problem(line, sign->kind);
     }
 
+    /// Of the file whose path stood in a line of its own before.
+    void noteSizes(std::string_view line)
+    {
+        std::uint64_t bytes = 0;
+        const std::string text(line);
+        if (!line.starts_with(' ')) {
+            file_ = {0, text, std::nullopt, std::nullopt};
+        } else if (std::sscanf(text.c_str(), "  File size is %" SCNu64 " bytes,", &bytes) == 1) {
+            file_.before = bytes;
+        } else if (std::sscanf(text.c_str(), "  Truncating file to %" SCNu64 " bytes.", &bytes) ==
+                       1 &&
+                   file_.name.starts_with('/') && file_.before > bytes) {
+            file_.after = bytes;
+            noteChange(file_);
+        }
+    }
+
     static Damage damageBelowPath(std::string_view line)
     {
         const DamageSign* const sign = damageIn(signs, line);
@@ -235,6 +253,7 @@ class FatOutput final : public LineOutput {
     }
 
     bool wasPath_ = false;
+    FileChange file_;  ///< that the last lines were about
 };
 
 constexpr std::array damagedStatuses{1};

@@ -5,6 +5,7 @@
 #include "pellar/outcome/Task.h"
 #include "pellar/process/Command.h"
 #include "pellar/process/ProcessRunner.h"
+#include "pellar/tools/FileComparison.h"
 #include "pellar/tools/ToolOutput.h"
 #include "pellar/tools/VolumeFacts.h"
 
@@ -93,6 +94,8 @@ struct Tool {
     const LogReading* logReading = nullptr;
     /// Null where no tool can list it.
     const CollectedFilesReading* collectedFiles = nullptr;
+    /// Null where we cannot read them.
+    const FileComparison* files = nullptr;
 
     bool repairs(RepairWay way) const
     {

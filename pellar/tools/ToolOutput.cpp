@@ -40,6 +40,13 @@ ToolLine LineOutput::progress(double percent)
     return {Kind::Progress, {}, {}, percent};
 }
 
+void LineOutput::noteChange(FileChange change)
+{
+    constexpr std::size_t most = 100'000;
+    if (findings_.changes.size() < most)
+        findings_.changes.push_back(std::move(change));
+}
+
 void LineOutput::noteReadFault(const ReadFault& fault)
 {
     if (!findings_.readFault || (findings_.readFault->isUnproven && !fault.isUnproven))

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "pellar/outcome/Damage.h"
+#include "pellar/outcome/FileChange.h"
 
 #include <cstdint>
 #include <memory>
@@ -64,6 +65,7 @@ struct Findings {
     std::vector<std::uint64_t> logParts;  ///< where the rest is of a log that it was to read
     std::uint64_t reconnected = 0;        ///< files that it gave a new name, as they had none
     std::uint64_t cleared = 0;            ///< files and names that it did away with
+    std::vector<FileChange> changes;      ///< what it says of such files, as far as it names them
 
     friend bool operator==(const Findings&, const Findings&) = default;
 };
@@ -104,6 +106,8 @@ protected:
     ToolLine problem(std::string_view line, Damage damage);
     /// Kept unless there is one, or one that is less sure.
     void noteReadFault(const ReadFault& fault);
+    /// Kept unless there are very many.
+    void noteChange(FileChange change);
 
     Findings findings_;
 };

@@ -6,6 +6,8 @@
 #include "pellar/tools/VolumeFacts.h"
 
 #include <array>
+#include <cinttypes>
+#include <cstdio>
 
 namespace pellar {
 namespace {
@@ -184,6 +186,20 @@ class XfsOutput final : public LineOutput {
             line.starts_with("disconnected ") && line.ends_with(", moving to lost+found");
         findings_.reconnected += isMoved ? 1 : 0;
         findings_.cleared += line.starts_with("cleared inode ") ? 1 : 0;
+        noteGone(line);
+    }
+
+    /// "cleared inode 133", 'junking entry "name" in directory inode 128'
+    void noteGone(std::string_view line)
+    {
+        constexpr std::string_view entry = "junking entry \"";
+        const std::size_t end = line.rfind("\" in directory inode ");
+        std::uint64_t inode = 0;
+        if (std::sscanf(std::string(line).c_str(), "cleared inode %" SCNu64, &inode) == 1)
+            noteChange({inode, {}, std::nullopt, std::nullopt});
+        else if (line.starts_with(entry) && end != std::string_view::npos && end > entry.size())
+            noteChange({0, std::string(line.substr(entry.size(), end - entry.size())), std::nullopt,
+                        std::nullopt});
     }
 
     /// YES for a line that tells of the check and not of the volume.

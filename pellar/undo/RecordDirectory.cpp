@@ -56,6 +56,20 @@ std::string numbered(const std::string& name, int number)
 
 }  // namespace
 
+Result<std::string, int> readWhole(const FileDescriptor& file, std::uint64_t most)
+{
+    struct stat status = {};
+    if (::fstat(file.get(), &status) != 0)
+        return errno;
+    if (static_cast<std::uint64_t>(status.st_size) > most)
+        return EFBIG;
+    std::string text(static_cast<std::size_t>(status.st_size), '\0');
+    if (const int error =
+            readAll(file.get(), 0, {reinterpret_cast<std::uint8_t*>(text.data()), text.size()}))
+        return error;
+    return text;
+}
+
 Result<StoreDirectory, std::string> StoreDirectory::open(const fs::path& path, SyncFunction sync)
 {
     if (!path.is_absolute())
@@ -70,6 +84,17 @@ Result<StoreDirectory, std::string> StoreDirectory::open(const fs::path& path, S
     if (!directory)
         return descriptionOf(errno);
     return StoreDirectory(std::move(directory), std::move(sync));
+}
+
+Result<StoreDirectory, int> StoreDirectory::openExisting(const fs::path& path)
+{
+    FileDescriptor directory(::open(path.c_str(), directoryFlags));
+    struct stat status = {};
+    if (!directory || ::fstat(directory.get(), &status) != 0)
+        return errno;
+    if (!whyOthersCanChange(status).empty())
+        return EPERM;
+    return StoreDirectory(std::move(directory), ::fsync);
 }
 
 int StoreDirectory::sync(int descriptor) const
@@ -187,19 +212,10 @@ bool RecordDirectory::hasFile(const char* name, std::uint64_t size) const
 
 Result<std::string, int> RecordDirectory::readFile(const char* name, std::uint64_t most) const
 {
-    auto file = openFile(name);
+    const auto file = openFile(name);
     if (!file)
         return file.error();
-    struct stat status = {};
-    if (::fstat(file->get(), &status) != 0)
-        return errno;
-    if (static_cast<std::uint64_t>(status.st_size) > most)
-        return EFBIG;
-    std::string text(static_cast<std::size_t>(status.st_size), '\0');
-    if (const int error =
-            readAll(file->get(), 0, {reinterpret_cast<std::uint8_t*>(text.data()), text.size()}))
-        return error;
-    return text;
+    return readWhole(*file, most);
 }
 
 int RecordDirectory::writeFile(const char* name, std::string_view text) const

@@ -4,17 +4,37 @@
 #include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 
+#include <cerrno>
+#include <chrono>
 #include <filesystem>
 #include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
+#include <thread>
 #include <vector>
 
 namespace pellar {
 
 /// How a file or a directory reaches the medium: like fsync(2), whose result and errno it has.
 using SyncFunction = std::function<int(int descriptor)>;
+
+/// All of an open file; EFBIG when it has more bytes than `most`, or another errno.
+[[nodiscard]] Result<std::string, int> readWhole(const FileDescriptor& file, std::uint64_t most);
+
+/// What `attempt`, which answers a Result with an errno, comes to: made again while another has the
+/// lock (EWOULDBLOCK), for a fifth of a second at most, as a listing takes it for a moment.
+template <class Attempt>
+[[nodiscard]] auto waitingForLock(const Attempt& attempt)
+{
+    constexpr int tries = 11;
+    auto result = attempt();
+    for (int i = 1; i < tries && !result && result.error() == EWOULDBLOCK; ++i) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+        result = attempt();
+    }
+    return result;
+}
 
 /// The directory that holds the records' directories. It is opened once, and everything is reached
 /// through its descriptor, so nobody can lead a name elsewhere in between.
@@ -24,6 +44,11 @@ public:
     /// this user and root could change it.
     [[nodiscard]] static Result<StoreDirectory, std::string> open(const std::filesystem::path& path,
                                                                   SyncFunction sync);
+
+    /// None is made, nor need it be this user's: it only may not be others' to change than this
+    /// user's and root's. EPERM where it is, else an errno.
+    [[nodiscard]] static Result<StoreDirectory, int> openExisting(
+        const std::filesystem::path& path);
 
     int descriptor() const { return directory_.get(); }
     /// 0, or errno.

@@ -6,6 +6,7 @@
 
 #include <sys/types.h>
 
+#include <algorithm>
 #include <chrono>
 #include <filesystem>
 #include <optional>
@@ -36,6 +37,17 @@ struct RecordedRepair {
 
     friend bool operator==(const RecordedRepair&, const RecordedRepair&) = default;
 };
+
+/// Sorts what a list shows of records, each with an `id`, by their repairs' times.
+template <class Record, class RepairOf>
+void sortNewestFirst(std::vector<Record>& records, const RepairOf& repairOf)
+{
+    std::ranges::sort(records, [&repairOf](const Record& a, const Record& b) {
+        const auto aTime = repairOf(a).time;
+        const auto bTime = repairOf(b).time;
+        return aTime != bTime ? aTime > bTime : a.id > b.id;
+    });
+}
 
 enum class RecordState {
     Applying,  ///< the bytes after are being written: each byte is as before or as after

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "pellar/undo/UndoRecord.h"
 
+#include "pellar/undo/PublicIndex.h"
+
 #include <cassert>
 #include <system_error>
 #include <utility>
@@ -83,6 +85,8 @@ Sentence unchangedBecause(UndoFault fault)
 
 UndoRecord::UndoRecord(UndoRecord&& other) noexcept
     : directory_(std::move(other.directory_)),
+      index_(std::move(other.index_)),
+      shownInUse_(std::move(other.shownInUse_)),
       facts_(std::move(other.facts_)),
       ranges_(std::move(other.ranges_)),
       stage_(std::exchange(other.stage_, Stage::Removed))
@@ -101,7 +105,10 @@ Done UndoRecord::apply(Region& disk, const UndoWork& work)
     RangePasses passes(directory_, ranges_, work, 3);
     if (const auto fault = passes.compare(disk, digests(), RangePasses::Expected::Before))
         return unchanged(*fault);
-    if (const int error = commit(RecordState::Applying)) {
+    int error = publish(RecordState::Applying);
+    if (error == 0)
+        error = commit(RecordState::Applying);
+    if (error != 0) {
         (void)remove();  // what stays counts as interrupted, and the disk is as before
         return unchanged({Cause::RecordFailed, error});
     }
@@ -129,6 +136,10 @@ Done UndoRecord::undo(Region& disk, const UndoWork& work)
                               : passes.compare(disk, digests(), RangePasses::Expected::Mixture);
     if (obstacle)
         return unchanged(*obstacle);
+    // Of one that was interrupted everybody knows that already.
+    const bool isNew = facts_.state == RecordState::Applied;
+    if (const int error = publish(RecordState::Undoing); error != 0 && isNew)
+        return unchanged({Cause::RecordFailed, error});
     if (const int error = commit(RecordState::Undoing))
         return unchanged({Cause::RecordFailed, error});
     if (const auto fault =
@@ -149,6 +160,7 @@ Done UndoRecord::finish(Region& disk, const UndoWork& work)
     RangePasses passes(directory_, ranges_, work, 3);
     if (const auto obstacle = passes.compare(disk, digests(), RangePasses::Expected::Mixture))
         return unchanged(*obstacle);
+    (void)publish(RecordState::Applying);  // the next listing mends what this could not
     if (const int error = commit(RecordState::Applying))
         return unchanged({Cause::RecordFailed, error});
     if (const auto fault =
@@ -164,8 +176,23 @@ Done UndoRecord::complete()
     if (const int error = commit(RecordState::Applied))
         return interrupted(
             {"the disk is repaired, but that cannot be recorded (%1$@)", textOf(error), {}});
+    (void)publish(RecordState::Applied);  // the next listing mends what this could not
     (void)directory_.removeFile(RecordDirectory::afterName);  // else it only takes room
     return {};
+}
+
+/// Before the record itself says so: what is said to everybody is rather too grave than too light.
+int UndoRecord::publish(RecordState state)
+{
+    if (!index_)
+        return 0;
+    RecordFacts facts = facts_;
+    facts.state = state;
+    auto shown = index_->publish(id(), facts);
+    if (!shown)
+        return shown.error();
+    shownInUse_ = std::move(*shown);
+    return 0;
 }
 
 int UndoRecord::commit(RecordState state)
@@ -187,7 +214,8 @@ int UndoRecord::commit(RecordState state)
 int UndoRecord::remove()
 {
     stage_ = Stage::Removed;
-    return directory_.remove();
+    const int error = directory_.remove();
+    return error == 0 && index_ ? index_->remove(id()) : error;
 }
 
 }  // namespace pellar

@@ -13,6 +13,8 @@
 
 namespace pellar {
 
+class PublicIndex;
+
 /// Why work on a record failed.
 struct UndoFailure {
     enum class Left {
@@ -63,9 +65,11 @@ private:
 
     enum class Stage { Uncommitted, Committed, Removed };
 
-    UndoRecord(RecordDirectory directory, RecordFacts facts, std::vector<ByteRange> ranges,
-               Stage stage)
+    /// `index` may be null.
+    UndoRecord(RecordDirectory directory, std::shared_ptr<const PublicIndex> index,
+               RecordFacts facts, std::vector<ByteRange> ranges, Stage stage)
         : directory_(std::move(directory)),
+          index_(std::move(index)),
           facts_(std::move(facts)),
           ranges_(std::move(ranges)),
           stage_(stage)
@@ -76,10 +80,13 @@ private:
     [[nodiscard]] Result<void, UndoFailure> putBack(Region& disk, UndoFault fault,
                                                     RangePasses& passes);
     [[nodiscard]] Result<void, UndoFailure> complete();
+    [[nodiscard]] int publish(RecordState state);
     [[nodiscard]] int commit(RecordState state);
     [[nodiscard]] int remove();
 
     RecordDirectory directory_;
+    std::shared_ptr<const PublicIndex> index_;
+    FileDescriptor shownInUse_;  ///< in the index
     RecordFacts facts_;
     std::vector<ByteRange> ranges_;
     Stage stage_;

@@ -2,13 +2,13 @@
 #include "pellar/undo/UndoStore.h"
 
 #include "pellar/bytes/Digest.h"
+#include "pellar/undo/PublicIndex.h"
 
 #include <algorithm>
 #include <array>
 #include <cerrno>
 #include <ctime>
 #include <system_error>
-#include <thread>
 
 namespace pellar {
 namespace {
@@ -76,6 +76,12 @@ std::optional<std::vector<ByteRange>> rangesIn(const RecordDirectory& directory,
     return ranges;
 }
 
+Sentence withoutDirectory(const std::string& reason)
+{
+    return {
+        "there is no directory to keep the bytes in that a repair overwrites: %1$@", reason, {}};
+}
+
 /// Whoever makes a record has its lock until it is committed.
 void removeLeftOver(const RecordDirectory& directory)
 {
@@ -109,20 +115,25 @@ const ListedRecord* newestOf(const RecordedDisk& disk, const RecordList& list)
 }
 
 Result<UndoStore, Sentence> UndoStore::open(const std::filesystem::path& directory,
-                                            SyncFunction sync)
+                                            SyncFunction sync, const std::filesystem::path& index)
 {
-    auto opened = StoreDirectory::open(directory, std::move(sync));
+    auto opened = StoreDirectory::open(directory, sync);
     if (!opened)
-        return Sentence{"there is no directory to keep the bytes in that a repair overwrites: %1$@",
-                        opened.error(),
-                        {}};
-    return UndoStore(std::make_shared<const StoreDirectory>(std::move(*opened)));
+        return withoutDirectory(opened.error());
+    const auto records = std::make_shared<const StoreDirectory>(std::move(*opened));
+    const auto published = PublicIndex::openUnlessEmpty(index, records, std::move(sync));
+    UndoStore store(records, published ? *published : nullptr);
+    if (!published)
+        store.whyNoIndex_ = published.error();
+    return store;
 }
 
 Result<UndoRecord, Sentence> UndoStore::save(const RecordedRepair& repair,
                                              std::vector<ByteRange> ranges, RegionReader& before,
                                              RegionReader& after, const UndoWork& work) const
 {
+    if (!whyNoIndex_.empty())
+        return withoutDirectory(whyNoIndex_);
     if (!areInOrder(ranges, std::min({repair.disk.length, before.length(), after.length()})))
         return unchangedBecause({Cause::RecordFailed, EINVAL});
     auto directory = RecordDirectory::make(directory_, nameFor(repair.time));
@@ -132,7 +143,7 @@ Result<UndoRecord, Sentence> UndoStore::save(const RecordedRepair& repair,
     facts.repair = repair;
     facts.rangeCount = ranges.size();
     facts.changedBytes = totalOf(ranges);
-    UndoRecord record(std::move(*directory), std::move(facts), std::move(ranges),
+    UndoRecord record(std::move(*directory), index_, std::move(facts), std::move(ranges),
                       UndoRecord::Stage::Uncommitted);
 
     auto digests = RangePasses(record.directory_, record.ranges_, work, 1).save(before, after);
@@ -163,36 +174,46 @@ RecordList UndoStore::list() const
         } else {
             // Held while the facts are read, so that nobody begins to change them now.
             const bool isInUse = directory->lockForReading() == EWOULDBLOCK;
-            if (auto facts = factsIn(*directory))
+            if (auto facts = factsIn(*directory)) {
                 list.records.push_back({name, std::move(*facts), isInUse});
-            else if (!isInUse && hasFacts(*directory))
+                mendIndex(list.records.back());
+            } else if (!isInUse && hasFacts(*directory)) {
                 list.broken.push_back(name);
+                if (index_)
+                    (void)index_->remove(name);
+            }
         }
     }
-    std::ranges::sort(list.records, [](const ListedRecord& a, const ListedRecord& b) {
-        const auto aTime = a.facts.repair.time;
-        const auto bTime = b.facts.repair.time;
-        return aTime != bTime ? aTime > bTime : a.id > b.id;
+    if (index_)
+        index_->removeOrphans();
+    sortNewestFirst(list.records, [](const ListedRecord& record) -> const RecordedRepair& {
+        return record.facts.repair;
     });
     return list;
 }
 
+void UndoStore::mendIndex(const ListedRecord& record) const
+{
+    if (index_ && !record.isInUse)
+        index_->mend(record.id, record.facts);
+}
+
 Result<RecordDirectory, Sentence> UndoStore::openLocked(const std::string& id) const
 {
-    using namespace std::chrono_literals;
-    auto directory = RecordDirectory::open(directory_, id);
-    int error = directory ? directory->lock() : directory.error();
-    // A listing takes the lock too, for a moment.
-    for (int i = 0; i < 10 && error == EWOULDBLOCK; ++i) {
-        std::this_thread::sleep_for(20ms);
-        error = directory->lock();
-    }
-    if (error == EWOULDBLOCK)
+    auto directory = waitingForLock([&]() -> Result<RecordDirectory, int> {
+        auto opened = RecordDirectory::open(directory_, id);
+        const int error = opened ? opened->lock() : 0;
+        if (error != 0)
+            return error;
+        return opened;
+    });
+    if (directory)
+        return std::move(*directory);
+    if (directory.error() == EWOULDBLOCK)
         return Sentence{"the saved bytes are in use", {}, {}};
-    if (error != 0)
-        return Sentence{
-            "the saved bytes cannot be read: %1$@", std::generic_category().message(error), {}};
-    return std::move(*directory);
+    return Sentence{"the saved bytes cannot be read: %1$@",
+                    std::generic_category().message(directory.error()),
+                    {}};
 }
 
 Result<UndoRecord, Sentence> UndoStore::take(const std::string& id) const
@@ -204,8 +225,14 @@ Result<UndoRecord, Sentence> UndoStore::take(const std::string& id) const
     auto ranges = facts ? rangesIn(*directory, *facts) : std::nullopt;
     if (!ranges)
         return unchangedBecause({Cause::RecordDamaged});
-    return UndoRecord(std::move(*directory), std::move(*facts), std::move(*ranges),
+    return UndoRecord(std::move(*directory), index_, std::move(*facts), std::move(*ranges),
                       UndoRecord::Stage::Committed);
+}
+
+int UndoStore::remove(const RecordDirectory& directory) const
+{
+    const int error = directory.remove();
+    return error == 0 && index_ ? index_->remove(directory.name()) : error;
 }
 
 Result<void, Sentence> UndoStore::remove(const std::string& id) const
@@ -213,7 +240,7 @@ Result<void, Sentence> UndoStore::remove(const std::string& id) const
     const auto directory = openLocked(id);
     if (!directory)
         return directory.error();
-    if (const int error = directory->remove())
+    if (const int error = remove(*directory))
         return Sentence{
             "the saved bytes cannot be removed: %1$@", std::generic_category().message(error), {}};
     return {};
@@ -235,7 +262,7 @@ std::size_t UndoStore::removeBeyond(const RecordLimits& limits,
             continue;
         const auto directory = openLocked(record->id);
         const auto facts = directory ? factsIn(*directory) : std::nullopt;
-        if (!facts || facts->state != RecordState::Applied || directory->remove() != 0)
+        if (!facts || facts->state != RecordState::Applied || remove(*directory) != 0)
             continue;
         --records;
         bytes -= record->facts.changedBytes;

@@ -50,8 +50,11 @@ class UndoStore {
 public:
     /// Makes the directory when it is missing. It must be absolute, and no other user but root may
     /// be able to change it.
+    /// `index` is where everybody may read which records there are (PublicIndex); nowhere when it
+    /// is empty. Where that cannot be made, nothing more is saved; what is there can be undone.
     [[nodiscard]] static Result<UndoStore, Sentence> open(const std::filesystem::path& directory,
-                                                          SyncFunction sync = ::fsync);
+                                                          SyncFunction sync = ::fsync,
+                                                          const std::filesystem::path& index = {});
 
     /// Reads the ranges (`areInOrder` within the disk's length) from the disk and from the view of
     /// it repaired, and keeps both, ready to be applied.
@@ -60,7 +63,7 @@ public:
                                                     RegionReader& before, RegionReader& after,
                                                     const UndoWork& work = {}) const;
 
-    /// Also removes what was never committed and is not being worked on.
+    /// Also removes what was never committed and is not being worked on, and mends the index.
     [[nodiscard]] RecordList list() const;
     /// A record to be undone or finished. Waits for its lock, a fifth of a second at most.
     [[nodiscard]] Result<UndoRecord, Sentence> take(const std::string& id) const;
@@ -72,14 +75,20 @@ public:
                              std::chrono::system_clock::time_point now) const;
 
 private:
-    explicit UndoStore(std::shared_ptr<const StoreDirectory> directory)
-        : directory_(std::move(directory))
+    UndoStore(std::shared_ptr<const StoreDirectory> directory,
+              std::shared_ptr<const PublicIndex> index)
+        : directory_(std::move(directory)), index_(std::move(index))
     {
     }
 
     [[nodiscard]] Result<RecordDirectory, Sentence> openLocked(const std::string& id) const;
 
+    [[nodiscard]] int remove(const RecordDirectory& directory) const;
+    void mendIndex(const ListedRecord& record) const;
+
     std::shared_ptr<const StoreDirectory> directory_;
+    std::shared_ptr<const PublicIndex> index_;  ///< null where there is none
+    std::string whyNoIndex_;                    ///< in English, where there ought to be one
 };
 
 }  // namespace pellar

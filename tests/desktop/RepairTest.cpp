@@ -3,13 +3,20 @@
 
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/InterruptedRepair.h"
+#include "tests/support/LoopDevice.h"
 
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "pellar/permissions/PermissionRecords.h"
+#include "pellar/probe/DiskProbe.h"
 
 #include <QCheckBox>
 #include <QMenu>
 #include <QPushButton>
+
+#include <fcntl.h>
+#include <sys/mount.h>
+#include <sys/stat.h>
 
 #include <cstdlib>
 
@@ -25,6 +32,10 @@ TEST(UndoAvailability, SaysWhatIsMissing)
     for (const auto& [situation, reason] :
          {std::pair(UndoSituation{1, false, true, KeptRepair::Unknown}, ""),
           {{1, false, true, KeptRepair::InUse}, "A program works on the last repair of this disk."},
+          {{1, false, true, KeptRepair::Others},
+           "Another user asked for the last repair of this disk."},
+          {{1, false, true, KeptRepair::None, true},
+           "No repair of permissions on this disk is kept."},
           {{0, false, false, KeptRepair::None}, "Select a disk first."},
           {{2, false, true, KeptRepair::Applied}, "Select one disk alone."},
           {{1, false, false, KeptRepair::Applied}, "Not available for this disk."}})
@@ -80,6 +91,8 @@ TEST_F(RepairTest, ARepairIsPreviewedDoneAndTakenBack)
     open({image});
     select(image);
     EXPECT_NE(whyGrey("undoRepair").find("No repair of this disk is kept."), std::string::npos);
+    EXPECT_NE(whyGrey("undoPermissions").find("Not available for this disk."), std::string::npos)
+        << "it is not mounted";
 
     command("previewRepair").trigger();
     ASSERT_TRUE(waitForJob());
@@ -135,6 +148,71 @@ TEST_F(RepairTest, AMapIsVerifiedRepairedAndTakenBack)
     answer("undoQuestion", "Undo Repair");
     EXPECT_TRUE(waitUntil([&] { return contentsOf(image) == before; }));
     ASSERT_TRUE(isFree());
+}
+
+/// A file on what is mounted at `root`, made 0644 by a repair whose record is left as it was.
+void repairPermissionsOf(const std::filesystem::path& root, const std::string& device,
+                         const std::filesystem::path& records)
+{
+    const std::string file = root / "file";
+    orvane::test::write(file, "");
+    struct stat status = {};
+    const auto stateWith = [&](mode_t mode) {
+        ::chmod(file.c_str(), mode);
+        ::stat(file.c_str(), &status);
+        return pellar::stateOf({pellar::FileKind::Regular, mode, 0, 0, {}}, status);
+    };
+    pellar::RecordedChange change;
+    change.path = "file";
+    change.before = stateWith(0600);
+    change.device = status.st_dev;
+    change.inode = status.st_ino;
+    change.wanted = {pellar::FileKind::Regular, 0644, 0, 0, {}};
+    const pellar::FileDescriptor opened(::open(device.c_str(), O_RDONLY | O_CLOEXEC));
+    pellar::PermissionsRun run;
+    run.repair.disk = {device, 0, 1, pellar::readSuperblock(opened.get(), {0, 1U << 20U}).uuid,
+                       "ext4", ""};
+    run.repair.time = std::chrono::system_clock::now();
+    run.mountPoint = root;
+    run.rootDevice = status.st_dev;
+    auto record = *pellar::PermissionRecords::open(records)->begin(run);
+    EXPECT_EQ(record.add({change}), 0);
+    EXPECT_EQ(record.note(0, pellar::ChangeStage::Changed, stateWith(0644)), 0);
+}
+
+TEST_F(RepairTest, ARepairOfPermissionsIsTakenBack)
+{
+    if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const orvane::test::LoopDevice device(makeImage("system"));
+    const auto root = directory_.path("root");
+    std::filesystem::create_directory(root);
+    if (::mount(device.name().c_str(), root.c_str(), "ext4", 0, nullptr) != 0)
+        GTEST_SKIP() << "the system does not let ext4 be mounted";
+    const std::unique_ptr<const std::filesystem::path, void (*)(const std::filesystem::path*)>
+        mounted(&root, [](const auto* path) { ::umount2(path->c_str(), MNT_DETACH); });
+    orvane::test::write(root / "var/lib/dpkg/status", "Package: one\n");
+    orvane::test::write(root / "etc/passwd", "");
+    repairPermissionsOf(root, device.name(), directory_ / "state/repairs/permission-records");
+    openWithSystemDisks();
+    ASSERT_TRUE(
+        waitUntil([&] { return cell(device.name(), DiskColumn::MountPoint) == root.native(); }));
+    select(device.name());
+    EXPECT_EQ(whyGrey("undoPermissions"), "");
+    EXPECT_NE(whyGrey("undoRepair").find("No repair of this disk is kept."), std::string::npos);
+    command("undoPermissions").trigger();
+    EXPECT_TRUE(
+        sheet()->informativeText().contains(QStringLiteral("owner, group and permissions")));
+    answer("undoQuestion", "Undo Repair");
+    EXPECT_TRUE(waitUntil([&] { return verdict(device.name()) == "undone"; }))
+        << verdict(device.name()) << testing::PrintToString(logRows());
+    struct stat status = {};
+    EXPECT_EQ(::stat((root / "file").c_str(), &status), 0);
+    EXPECT_EQ(status.st_mode & 07777, 0600U);
+    ASSERT_TRUE(isFree());
+    EXPECT_NE(whyGrey("undoPermissions").find("No repair of permissions on this disk is kept."),
+              std::string::npos);
+    close();
 }
 
 TEST_F(RepairTest, WhatIsNotProvenIsAppliedOnlyWhereTheUserSaysSoTwice)

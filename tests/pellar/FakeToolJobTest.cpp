@@ -4,6 +4,7 @@
 #include "pellar/tools/ToolTable.h"
 #include "tests/pellar/JobFixture.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 
@@ -298,6 +299,49 @@ TEST(PartOfImage, OthersAreAskedOnlyWhereTheToolNeedsADevice)
         ASSERT_TRUE(asked->image);
         EXPECT_EQ(asked->image->offset(), 4096U);
         EXPECT_EQ(asked->task.operation, operation);
+    }
+}
+
+// The record lies where only root reads, though this user could open the disk by now.
+TEST(UndoOfADevice, TheAdministratorIsAskedWhereItsStoreHasTheNewestRepair)
+{
+    using std::chrono::seconds;
+    const auto repairAt = [](seconds time) {
+        return RecordedRepair{{"/dev/full", 0, 4096, "1234", "ext4", ""},
+                              {Subject::Filesystem, Operation::Repair},
+                              ::geteuid(),
+                              std::chrono::system_clock::time_point(time)};
+    };
+    for (const auto& [theirs, ours, isAsked] : {std::tuple(seconds(0), seconds(0), false),
+                                                {seconds(9), seconds(0), true},
+                                                {seconds(9), seconds(5), true},
+                                                {seconds(5), seconds(9), false}}) {
+        const test::TestDirectory directory;
+        JobOptions options = test::tryingIn(directory.path("own"));
+        Trials system;
+        system.room.directory = options.trials.systemDirectory = directory.path("system");
+        system.isPublic = true;
+        std::string bytes(4096, 'x');
+        directory.write("bytes", bytes);
+        const FileDescriptor file(::open(directory.path("bytes").c_str(), O_RDWR | O_CLOEXEC));
+        FileRegion disk(file.get(), 0, bytes.size());
+        for (const auto& [trials, time] : {std::pair(system, theirs), {options.trials, ours}})
+            if (time != seconds(0)) {
+                const auto store = openRecords(trials);
+                EXPECT_TRUE(store->save(repairAt(time), {{0, 512}}, disk, disk)->apply(disk));
+            }
+        bool wasAsked = false;
+        options.privileged = [&](const PrivilegedJob&, StopSwitch&, EventQueue& events) {
+            wasAsked = true;
+            return std::make_unique<EmptyScript>(events);
+        };
+        contract::DiskReference device;
+        device.path = "/dev/full";
+        device.length = 4096;
+        test::JobFixture library(options);
+        static_cast<void>(library.run({Subject::Filesystem, Operation::Undo},
+                                      std::make_shared<const contract::DiskReference>(device)));
+        EXPECT_EQ(wasAsked, isAsked) << theirs.count() << ours.count();
     }
 }
 

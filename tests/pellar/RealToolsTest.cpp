@@ -276,6 +276,7 @@ const std::vector<ExtDamage> extDamages{
     {{"set_super_value free_blocks_count 1"}, {}, "no damage is left"},  // -n exits with 0
     {{"set_inode_field f5 links_count 9"}, {}, "no damage is left"},
     {{"clri f3"}, {}, "no damage is left, but 1 of 19 files is gone"},
+    {{"unlink f3"}, {}, "no damage is left; 1 file is now in lost+found"},
     {{"unlink f3", "unlink f4"}, {}, "no damage is left; 2 files are now in lost+found"},
     {{"clri f1", "unlink f2", "set_super_value free_inodes_count 3"}, {}, ""},
     // A table of inodes full of nonsense.
@@ -320,7 +321,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
         if (!damage.message.empty()) {
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
-            const bool isLoss = test::contains(damage.message, "files");
+            const bool isLoss = test::contains(damage.message, " file");
             const bool hasWarned =
                 !warnings.empty() && warnings.back() == library.listener.message;
             EXPECT_EQ(hasWarned, isLoss) << damage.message;
@@ -335,18 +336,35 @@ TEST(RealE2fsck, APreviewTellsWhatBecomesOfFiles)
 {
     const test::TestDirectory directory;
     const auto image = makeVolume(directory, {"-O", "^orphan_file"});
-    directory.damage(image, "unlink f3");
+    directory.damage(image, "mkdir dir");
+    directory.damage(image, "write " + directory.path("content").string() + " dir/deep");
+    for (const char* const command :
+         {"unlink f3", "set_inode_field f4 mode 0177777", "set_inode_field f5 size 1",
+          "set_inode_field dir/deep size 100", "set_inode_field f6 flags 0x80000", "clri f7"})
+        directory.damage(image, command);
     RepairPolicy policy;
     policy.isPreview = true;
     test::JobFixture library(test::tryingIn(directory.path("repairs"), &policy));
     ASSERT_EQ(library.repair(test::reference(image)), 0);
     EXPECT_EQ(library.listener.error, contract::kPLErrorDamaged) << library.listener.message;
+    const auto isTold = [&library](std::string_view sentence) {
+        return std::ranges::any_of(library.listener.dictionaries, [&](const auto& message) {
+            return message.string(contract::kFsckMessageString) == sentence;
+        });
+    };
     EXPECT_TRUE(library.listener.hasPlainLine("In lost+found after the repair: “#15”, 3000 bytes"));
-    const auto& told = library.listener.dictionaries;
-    EXPECT_TRUE(std::ranges::any_of(told, [](const contract::Dictionary& message) {
-        return message.string(contract::kFsckMessageString) ==
-               "After the repair: no damage is left; 1 file is now in lost+found.";
-    }));
+    EXPECT_TRUE(isTold("After the repair: no damage is left; 1 file is now in lost+found."));
+    EXPECT_TRUE(isTold("“/f4” would be gone")) << "its size is nonsense, too";
+    EXPECT_TRUE(isTold("“/f5” would have another size: 1 → 3072 bytes"));
+    EXPECT_TRUE(isTold("“/dir/deep” would have another size: 100 → 3072 bytes"));
+    EXPECT_EQ(std::ranges::count_if(library.listener.dictionaries,
+                                    [](const auto& message) {
+                                        return test::contains(
+                                            message.string(contract::kFsckMessageString),
+                                            "” would ");
+                                    }),
+              3)
+        << "what was damaged already, or is only moved, is not told of";
 }
 
 TEST(RealE2fsck, WillNotRepairAVolumeWhoseEndIsMissing)

@@ -252,6 +252,38 @@ TEST(ToolVerdict, WhatCannotBeReadIsNotDamaged)
     }
 }
 
+TEST(ToolFindings, FilesThatARepairTakesAwayOrShortensAreNamed)
+{
+    using Changes = std::vector<FileChange>;
+    constexpr auto unknown = std::nullopt;
+    struct Said {
+        std::string_view filesystem;
+        std::vector<std::string> lines;
+        Changes changes;
+    };
+    const std::string cut =
+        "ERROR: /a: b: less clusters are allocated. truncates to 4096 bytes at 0x1180";
+    const std::string kept =
+        "ERROR: /a: more clusters are allocated. truncate to 4096 bytes at 0x1180";
+    for (const Said& c : {
+             Said{"vfat", test::recordedLines("fsck.fat/repaired"), {{0, "/FILE.TXT", 5000, 2048}}},
+             Said{"vfat",
+                  {"/LONG.TXT", "  File size is 2048 bytes, cluster chain length is > 2048 bytes.",
+                   "  Truncating file to 2048 bytes."},
+                  {}},
+             Said{"vfat", {"  Truncating file to 2048 bytes."}, {}},
+             Said{"exfat", {cut + ". Truncate (y/N)? y"}, {{0, "/a: b", unknown, 4096}}},
+             Said{"exfat", {cut + ". Truncate (y/N)? n", kept + ". Truncate (y/N)? y"}, {}},
+             Said{"xfs",
+                  {"cleared inode 133", "would have cleared inode 134",
+                   "junking entry \"a \"b\" in directory inode 128",
+                   "would have junked entry \"c\" in directory inode 128"},
+                  {{133, "", unknown, unknown}, {0, "a \"b", unknown, unknown}}},
+         })
+        EXPECT_EQ(readAll(*toolFor(c.filesystem), c.lines).findings.changes, c.changes)
+            << c.lines.front();
+}
+
 // What was named before stands, unless a log may put it right.
 TEST(ToolVerdict, ACrashDoesNotUndoWhatWasFound)
 {

@@ -2,6 +2,7 @@
 // Repairs that are tried, taken back and finished.
 
 #include "orvane/jobs/RepairRecords.h"
+#include "pellar/undo/PublicIndex.h"
 #include "tests/support/InterruptedRepair.h"
 #include "tests/support/LoopDevice.h"
 #include "tests/terminal/ProgramTest.h"
@@ -166,6 +167,77 @@ TEST_F(UndoTest, ARepairedMapIsUndone)
     EXPECT_EQ(run({"undo", "disk.img"}).status, 8) << "of its volume nothing is kept";
     EXPECT_EQ(run({"undo", "--partition-map", "disk.img"}).status, 0);
     EXPECT_TRUE(contentsOf(disk) == before);
+}
+
+/// A place where the administrator keeps repairs of /dev/full, and a user of it.
+class SystemRecords : public testing::Test {
+protected:
+    void put(const std::string& id, uid_t user, std::chrono::seconds time,
+             pellar::Subject subject = pellar::Subject::Filesystem,
+             pellar::RecordState state = pellar::RecordState::Applied) const
+    {
+        const bool isOfPermissions = subject == pellar::Subject::Permissions;
+        const auto place =
+            isOfPermissions ? pellar::permissionIndexIn(system_) : pellar::recordIndexIn(system_);
+        const auto records = std::make_shared<const pellar::StoreDirectory>(
+            *pellar::StoreDirectory::open(system_ / "records", ::fsync));
+        pellar::RecordFacts facts;
+        facts.repair = {{"/dev/full", 0, 4096, "1234", "ext4", ""},
+                        {subject, pellar::Operation::Repair},
+                        user,
+                        std::chrono::system_clock::time_point(time)};
+        facts.state = state;
+        EXPECT_TRUE(pellar::PublicIndex::open(place, records, ::fsync)->publish(id, facts));
+    }
+    RepairRecords seenBy(uid_t user) const
+    {
+        pellar::Trials trials;
+        trials.room.directory = own_;
+        trials.systemDirectory = system_;
+        trials.user = user;
+        return RepairRecords(trials);
+    }
+    static DiskFacts disk(const char* uuid = "1234")
+    {
+        DiskFacts facts;
+        facts.path = "/dev/full";
+        facts.length = 4096;
+        facts.uuid = uuid;
+        return facts;
+    }
+
+    TestDirectory directory_;
+    const std::filesystem::path system_ = directory_ / "system";
+    const std::filesystem::path own_ = directory_ / "own";
+};
+
+TEST_F(SystemRecords, AreKnownToEverybodyAndBelongToWhoAsked)
+{
+    using std::chrono::seconds;
+    EXPECT_EQ(seenBy(1000).newestOf(disk()), nullptr);
+    EXPECT_TRUE(seenBy(1000).knowsAll()) << "nothing was ever kept";
+    put("old", 1000, seconds(100));
+    put("half", 2000, seconds(200), pellar::Subject::Filesystem, pellar::RecordState::Applying);
+    put("map", 1000, seconds(300), pellar::Subject::PartitionMap);
+    put("modes", 1000, seconds(400), pellar::Subject::Permissions);
+    for (const uid_t user : {1000U, 2000U}) {
+        const RepairRecords records = seenBy(user);
+        const auto* const newest = records.newestOf(disk());
+        ASSERT_NE(newest, nullptr);
+        EXPECT_EQ(newest->id, "half") << "whoever asked: an older one is of no use before";
+        EXPECT_TRUE(newest->isInterrupted());
+        EXPECT_EQ(records.isUsers(*newest), user == 2000);
+        EXPECT_EQ(records.newestOf(disk("5678")), nullptr) << "another disk of that name";
+        const auto* const permissions = records.newestOfPermissions(disk());
+        ASSERT_NE(permissions, nullptr);
+        EXPECT_EQ(permissions->id, "modes");
+        EXPECT_EQ(records.isUsers(*permissions), user == 1000);
+        EXPECT_EQ(records.newestOfPermissions(disk("5678")), nullptr);
+        EXPECT_TRUE(records.knowsAll());
+    }
+    std::filesystem::permissions(pellar::recordIndexIn(system_), std::filesystem::perms::all);
+    EXPECT_FALSE(seenBy(1000).knowsAll()) << "others could have written that";
+    EXPECT_EQ(seenBy(1000).newestOf(disk()), nullptr);
 }
 
 TEST(RepairRecords, ARecordBelongsToTheRunThatWrote)

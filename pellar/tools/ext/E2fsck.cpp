@@ -4,6 +4,7 @@
 #include "pellar/tools/Judging.h"
 #include "pellar/tools/ToolTable.h"
 #include "pellar/tools/ext/E2fsckOutput.h"
+#include "pellar/tools/ext/ExtFiles.h"
 #include "pellar/tools/ext/ExtSuperblock.h"
 
 #include <charconv>
@@ -177,6 +178,7 @@ const Tool& e2fsck()
         .percentOf = percentOf,
         .judge = judge,
         .collectedFiles = &collectedFiles,
+        .files = &extFiles(),
     };
     return tool;
 }

@@ -10,6 +10,7 @@ namespace pellar {
 namespace {
 
 constexpr std::uint16_t magicNumber = 0xEF53;
+constexpr std::uint32_t firstRevisionWithInodeSize = 1;
 constexpr std::uint32_t incompatRecover = 0x4;
 constexpr std::uint32_t incompatJournalDevice = 0x8;
 constexpr std::uint32_t incompat64Bit = 0x80;
@@ -61,6 +62,9 @@ std::optional<ExtSuperblock> parseExtSuperblock(ByteView bytes)
     block.freeInodes = number(bytes, 0x10, 4);
     block.firstDataBlock = number(bytes, 0x14, 4);
     block.groupBlocks = number(bytes, 0x20, 4);
+    block.groupInodes = number(bytes, 0x28, 4);
+    if (number(bytes, 0x4C, 4) >= firstRevisionWithInodeSize)
+        block.inodeBytes = number(bytes, 0x58, 2);
     block.descriptorBytes = (incompat & incompat64Bit) != 0 ? number(bytes, 0xFE, 2) : 32;
     block.hasMetaGroups = (incompat & incompatMetaGroups) != 0;
     block.hasFewBackups = (compat & compatFewBackups) != 0;

@@ -16,6 +16,7 @@ namespace pellar {
 /// (Linux, Documentation/filesystems/ext4/super.rst; all fields little-endian).
 struct ExtSuperblock {
     static constexpr std::size_t size = 1024;
+    static constexpr std::uint32_t smallestInode = 128;
 
     std::uint64_t blockCount = 0;
     std::uint32_t blockBytes = 0;
@@ -29,6 +30,8 @@ struct ExtSuperblock {
     std::uint64_t freeInodes = 0;
     std::uint32_t firstDataBlock = 0;
     std::uint32_t groupBlocks = 0;  ///< of a block group
+    std::uint32_t groupInodes = 0;
+    std::uint32_t inodeBytes = smallestInode;
     std::uint32_t descriptorBytes = 0;
     bool hasMetaGroups = false;  ///< descriptors stand in several places
     bool hasFewBackups = false;  ///< two at most, wherever they are

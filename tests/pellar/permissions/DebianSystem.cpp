@@ -2,6 +2,7 @@
 #include "tests/pellar/permissions/DebianSystem.h"
 
 #include "pellar/bytes/Digest.h"
+#include "pellar/process/Command.h"
 #include "pellar/process/FileDescriptor.h"
 
 #include <fcntl.h>
@@ -42,6 +43,13 @@ Rights rightsOf(const fs::path& path)
     struct stat status = {};
     EXPECT_EQ(::lstat(path.c_str(), &status), 0) << path;
     return {status.st_mode & 07777U, status.st_uid, status.st_gid};
+}
+
+const char* DebianSystem::obstacle()
+{
+    if (::geteuid() != 0)
+        return "giving files to others needs root";
+    return findProgram("dpkg-deb", "/usr/bin:/bin").empty() ? "dpkg-deb is not installed" : nullptr;
 }
 
 DebianSystem::DebianSystem()

@@ -36,6 +36,9 @@ struct PackageFile {
 /// by dpkg-deb(1). Needs root, because the owners do.
 class DebianSystem {
 public:
+    /// Why there can be none here; null when there can.
+    static const char* obstacle();
+
     DebianSystem();
 
     void install(const std::string& name, const std::vector<PackageFile>& files,

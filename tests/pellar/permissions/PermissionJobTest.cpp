@@ -41,10 +41,8 @@ class PermissionJob : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "giving files to others needs root";
-        if (findProgram("dpkg-deb", "/usr/bin:/bin").empty())
-            GTEST_SKIP() << "dpkg-deb is not installed";
+        if (const char* const obstacle = DebianSystem::obstacle())
+            GTEST_SKIP() << obstacle;
         system_ = std::make_unique<DebianSystem>();
         system_->install("games", {{"bin/", 0755},
                                    {"bin/play", 0755},

@@ -47,10 +47,8 @@ class PermissionUndo : public testing::Test {
 protected:
     void SetUp() override
     {
-        if (::geteuid() != 0)
-            GTEST_SKIP() << "giving files to others needs root";
-        if (findProgram("dpkg-deb", "/usr/bin:/bin").empty())
-            GTEST_SKIP() << "dpkg-deb is not installed";
+        if (const char* const obstacle = DebianSystem::obstacle())
+            GTEST_SKIP() << obstacle;
         system_.install("games", {{"usr/", 0755},
                                   {"usr/bin/play", 0755},
                                   {"usr/bin/score", 02755, 0, 60},
@@ -129,10 +127,21 @@ TEST_F(PermissionUndo, EveryFileHasAgainWhatItHadBefore)
     fs::remove(path("usr/bin/two-names"));
     fs::create_hard_link(path("usr/bin/two"), path("usr/bin/two-names"));
     const auto before = all();
+    options_.trials.isPublic = true;
+    const fs::path index = permissionIndexIn(options_.trials.room.directory);
     PermissionBench bench(options_);
     bench.repairPermissions(system_.disk());
     EXPECT_EQ(bench.listener.verdict, "repaired") << bench.problems();
     EXPECT_FALSE(contains(bench.problems(), "changed while it was looked at"));
+    for (const char* const written : {"with the record", "by the next listing"}) {
+        const RecordList known = *readPublicIndex(index);
+        ASSERT_EQ(known.records.size(), 1U) << written;
+        EXPECT_EQ(known.records.front().id, onlyRecord().filename());
+        EXPECT_EQ(known.records.front().facts.repair.task.subject, Subject::Permissions);
+        EXPECT_FALSE(contains(contentsOf(index / known.records.front().id), "usr")) << "no files";
+        fs::remove(index / known.records.front().id);
+        EXPECT_EQ(openPermissionRecords(options_.trials)->list().records.size(), 1U);
+    }
     EXPECT_NE(all(), before);
     EXPECT_TRUE(contains(bench.remarks(), "This is how.\n"));
     const auto listed = list().records;
@@ -152,6 +161,7 @@ TEST_F(PermissionUndo, EveryFileHasAgainWhatItHadBefore)
         "undid the repair of the permissions on “Disk”: 7 files were put back; left alone: 0");
     EXPECT_EQ(all(), before);
     EXPECT_TRUE(list().records.empty());
+    EXPECT_TRUE(readPublicIndex(index)->records.empty());
     bench.run(undo, system_.disk());
     EXPECT_EQ(bench.listener.error, contract::kPLErrorNothingToUndo);
 }
