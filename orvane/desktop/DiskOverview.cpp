@@ -77,7 +77,7 @@ ResultSummary DiskOverview::result(const std::vector<DiskRow>& rows)
     if (rows.size() > 1)
         return resultOfSeveral(rows, at_.host.translator());
     const QtButton* const repair = at_.tabs.button(outlet::repairDisk);
-    const KeptRepair kept = kept_.stateOf(*disks_.selected().front());
+    const KeptRepair kept = kept_.stateOf(pellar::Subject::Filesystem, *disks_.selected().front());
     return resultOf(rows.front(),
                     {repair != nullptr && repair->isEnabled(),
                      kept == KeptRepair::Applied || kept == KeptRepair::Unknown,
