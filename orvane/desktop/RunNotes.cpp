@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/RunNotes.h"
 
+#include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskRow.h"
@@ -40,9 +41,9 @@ QString durationText(std::chrono::system_clock::duration duration, const Transla
 
 QString problemsText(std::int64_t problems, const Translator& texts)
 {
-    if (problems == 1)
-        return toQt(texts.text("1 problem"));
-    return toQt(texts.sentence("%@ problems", {fromQt(QLocale().toString(qlonglong{problems}))}));
+    const std::string number = fromQt(QLocale().toString(qlonglong{problems}));
+    return toQt(contract::format(
+        texts.plural("%@ problem", "%@ problems", static_cast<long>(problems)), {number}));
 }
 
 }  // namespace
