@@ -173,7 +173,8 @@ bool LogModel::isOpenAtFirst(const contract::OutlineItem& start) const
     for (const auto& [chosen, isOpen] : choices_)
         if (chosen.isSameAs(start))
             return isOpen;
-    return knowledge_.isNewest ? knowledge_.isNewest(start) : !runs_.lastHeading();
+    const bool isLast = !runs_.lastHeading();
+    return isLast || (knowledge_.isNewest && knowledge_.isNewest(start));
 }
 
 void LogModel::choose(const contract::OutlineItem& start, bool isOpen)

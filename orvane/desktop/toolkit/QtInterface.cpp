@@ -2,7 +2,6 @@
 #include "orvane/desktop/toolkit/QtInterface.h"
 
 #include "contract/toolkit/ControlNames.h"
-#include "orvane/desktop/toolkit/LogSearch.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/Text.h"
 
@@ -239,8 +238,8 @@ void LoadedInterface::addHostControls(LogTable& table)
     QBoxLayout* const rows = layoutOf(table);
     if (rows == nullptr)
         return;
-    auto* const search = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
-    rows->insertWidget(rows->indexOf(&table), search);
+    search_ = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
+    rows->insertWidget(rows->indexOf(&table), search_);
     QWidget* const details =
         root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
     QBoxLayout* const head = details != nullptr ? layoutOf(*details) : nullptr;
@@ -248,7 +247,7 @@ void LoadedInterface::addHostControls(LogTable& table)
     if (head != nullptr)
         head->insertWidget(head->indexOf(details) + 1, toggle);
     else
-        rows->insertWidget(rows->indexOf(search), toggle);
+        rows->insertWidget(rows->indexOf(search_), toggle);
 }
 
 // The divider stands below the first pane: its limits are the pane's.
