@@ -24,8 +24,7 @@ QString dateText(RecordTimes::Time time)
 
 QString durationText(std::chrono::system_clock::duration duration, const Translator& texts)
 {
-    const std::int64_t seconds =
-        std::chrono::duration_cast<std::chrono::seconds>(duration).count();
+    const std::int64_t seconds = std::chrono::duration_cast<std::chrono::seconds>(duration).count();
     const auto number = [](std::int64_t value) {
         return std::to_string(value);
     };
@@ -35,8 +34,7 @@ QString durationText(std::chrono::system_clock::duration duration, const Transla
         return toQt(texts.sentence("%@ s", {number(seconds)}));
     if (seconds < 3600)
         return toQt(texts.sentence("%@ min %@ s", {number(seconds / 60), number(seconds % 60)}));
-    return toQt(
-        texts.sentence("%@ h %@ min", {number(seconds / 3600), number(seconds / 60 % 60)}));
+    return toQt(texts.sentence("%@ h %@ min", {number(seconds / 3600), number(seconds / 60 % 60)}));
 }
 
 QString problemsText(std::int64_t problems, const Translator& texts)

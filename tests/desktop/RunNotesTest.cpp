@@ -35,8 +35,8 @@ TEST(RunNotes, SayWhatIsKnownAndNothingElse)
                " · 59 s · 1 problem", "sound", "no tool"},
           Case{KeptRun{"verify", start, start + 61s, RunEnd{"sound", 0, "", "a\x1b[2J"}},
                " · 1 min 1 s · a\uFFFD[2J", "sound", "what a tool says may be hostile"},
-          Case{KeptRun{"verify", start, start + 3h + 62s, RunEnd{"failed", 0, ""}}, " · 3 h 1 min", "failed",
-               "nothing but the end"},
+          Case{KeptRun{"verify", start, start + 3h + 62s, RunEnd{"failed", 0, ""}}, " · 3 h 1 min",
+               "failed", "nothing but the end"},
           Case{KeptRun{"verify", start, start - 1s, RunEnd{"sound", 0, ""}}, "", "sound",
                "the clock was set back"}}) {
         const RunNote note = noteOf({start, c.run}, Translator());

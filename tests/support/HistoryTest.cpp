@@ -303,9 +303,10 @@ TEST_F(HistoryTest, RunsAreFoundByTheRecordsTheyBeginWith)
                 mine.endRun(mine.beginRun(histories.keyOf(disk), run, Run::Time::clock::now()),
                             {"sound", 0, ""}, Run::Time::clock::now());
             std::this_thread::sleep_for(std::chrono::milliseconds(2));
-            histories.historyOf(disk).append(Dictionary::of(
-                {{contract::kFsckMessageString, "message"}, {contract::kFsckVerbosity, -1},
-                 {contract::Name("kOV_typeOfOutputKey"), "kOV_typeOfOutput_dict"}}));
+            histories.historyOf(disk).append(
+                Dictionary::of({{contract::kFsckMessageString, "message"},
+                                {contract::kFsckVerbosity, -1},
+                                {contract::Name("kOV_typeOfOutputKey"), "kOV_typeOfOutput_dict"}}));
             histories.saveNew();
         };
         begin(disk_, "first", "verify");

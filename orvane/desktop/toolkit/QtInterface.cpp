@@ -240,8 +240,7 @@ void LoadedInterface::addHostControls(LogTable& table)
         return;
     search_ = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
     rows->insertWidget(rows->indexOf(&table), search_);
-    QWidget* const details =
-        root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
+    QWidget* const details = root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
     QBoxLayout* const head = details != nullptr ? layoutOf(*details) : nullptr;
     QCheckBox* const toggle = makeProblemsToggle(*peer_, *hostTexts_, table.parentWidget());
     if (head != nullptr)
@@ -298,8 +297,8 @@ bool QtInterface::loadInterface(std::string_view name, contract::InterfaceOwner&
             loadInterfaceFile(bundle_->pathForResource(std::string(name) + ".ui"), *bundle_, error);
     const bool isLoaded = root != nullptr;
     if (isLoaded)
-        loaded_.push_back(std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_,
-                                                            hostTexts_));
+        loaded_.push_back(
+            std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_, hostTexts_));
     else
         qWarning("cannot load the interface %s: %s", std::string(name).c_str(),
                  qPrintable(error.isEmpty() ? QStringLiteral("no such file") : error));
