@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/RunNotes.h"
 
+#include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskRow.h"
@@ -23,8 +24,7 @@ QString dateText(RecordTimes::Time time)
 
 QString durationText(std::chrono::system_clock::duration duration, const Translator& texts)
 {
-    const std::int64_t seconds =
-        std::chrono::duration_cast<std::chrono::seconds>(duration).count();
+    const std::int64_t seconds = std::chrono::duration_cast<std::chrono::seconds>(duration).count();
     const auto number = [](std::int64_t value) {
         return std::to_string(value);
     };
@@ -34,15 +34,14 @@ QString durationText(std::chrono::system_clock::duration duration, const Transla
         return toQt(texts.sentence("%@ s", {number(seconds)}));
     if (seconds < 3600)
         return toQt(texts.sentence("%@ min %@ s", {number(seconds / 60), number(seconds % 60)}));
-    return toQt(
-        texts.sentence("%@ h %@ min", {number(seconds / 3600), number(seconds / 60 % 60)}));
+    return toQt(texts.sentence("%@ h %@ min", {number(seconds / 3600), number(seconds / 60 % 60)}));
 }
 
 QString problemsText(std::int64_t problems, const Translator& texts)
 {
-    if (problems == 1)
-        return toQt(texts.text("1 problem"));
-    return toQt(texts.sentence("%@ problems", {fromQt(QLocale().toString(qlonglong{problems}))}));
+    const std::string number = fromQt(QLocale().toString(qlonglong{problems}));
+    return toQt(contract::format(
+        texts.plural("%@ problem", "%@ problems", static_cast<long>(problems)), {number}));
 }
 
 }  // namespace

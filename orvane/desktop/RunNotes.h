@@ -11,8 +11,8 @@ namespace orvane::desktop {
 /// left out. Both outlive what is answered; main thread.
 [[nodiscard]] RunKnowledge runKnowledge(DiskHistories& histories, const Translator& texts);
 
-/// In a heading: when the run began (its first record was saved), how long it took, with which tool,
-/// how many problems it told of; and its verdict.
+/// In a heading: when the run began (its first record was saved), how long it took, with which
+/// tool, how many problems it told of; and its verdict.
 [[nodiscard]] RunNote noteOf(const RunOfRecord& known, const Translator& texts);
 
 }  // namespace orvane::desktop

@@ -54,8 +54,8 @@ public:
     /// How many problems there were since it started anew.
     struct Tally {
         std::uint64_t problems = 0;
-        std::uint64_t kinds = 0;       ///< of those that were shown
-        bool hasOtherKinds = false;    ///< and there are more than these
+        std::uint64_t kinds = 0;     ///< of those that were shown
+        bool hasOtherKinds = false;  ///< and there are more than these
     };
 
     /// Whether this problem is to be shown; counts it otherwise.

@@ -65,6 +65,7 @@ TEST_F(AccessibilityTest, RowsAreReadWithTheirTypeNotByTheirColourAlone)
     (void)logRows();  // what is waiting is shown now
     const std::string rows = cells(log());
     EXPECT_NE(rows.find("Problem: Free blocks count wrong"), std::string::npos) << rows;
+    EXPECT_NE(rows.find(", damaged, expanded\n"), std::string::npos) << "of the run: " << rows;
     EXPECT_NE(cells(window().disks()).find("\ndamaged\n"), std::string::npos)
         << "the state is not its icon alone";
     takeSheet();

@@ -322,8 +322,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
             const bool isLoss = test::contains(damage.message, " file");
-            const bool hasWarned =
-                !warnings.empty() && warnings.back() == library.listener.message;
+            const bool hasWarned = !warnings.empty() && warnings.back() == library.listener.message;
             EXPECT_EQ(hasWarned, isLoss) << damage.message;
         }
         ASSERT_EQ(library.verify(disk), 0);

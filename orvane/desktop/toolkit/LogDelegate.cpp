@@ -20,12 +20,12 @@
 namespace orvane::desktop {
 namespace {
 
-constexpr int mostLines = 12;       // a name may be as long as it likes
-constexpr double indent = 14;       // pixels: rows stand below their heading's title
-constexpr double padding = 4;       // above and below what a heading says
-constexpr double gap = 6;           // above a heading
+constexpr int mostLines = 12;  // a name may be as long as it likes
+constexpr double indent = 14;  // pixels: rows stand below their heading's title
+constexpr double padding = 4;  // above and below what a heading says
+constexpr double gap = 6;      // above a heading
 constexpr int heightOfEnd = 4;
-constexpr double spacing = 8;       // between title and verdict
+constexpr double spacing = 8;  // between title and verdict
 constexpr double bandStrength = 0.07;
 constexpr double quietStrength = 0.65;
 const QColor markColor(0xff, 0xdd, 0x57);
@@ -65,8 +65,11 @@ std::optional<Row> rowAt(const QModelIndex& index)
         return std::nullopt;
     const auto number = static_cast<std::size_t>(model.viewRow(index.row()));
     const contract::Rect frame = view->frameOfCellAtColumnRow(0, number);
-    return Row{model, *view, oneLine(textOfRow(*view, number)),
-               QRectF(frame.x, frame.y, frame.width, frame.height), model.isHeading(index.row()),
+    return Row{model,
+               *view,
+               oneLine(textOfRow(*view, number)),
+               QRectF(frame.x, frame.y, frame.width, frame.height),
+               model.isHeading(index.row()),
                model.itemAt(index.row()).integer(contract::kFsckVerbosity) ==
                    contract::verbosity::summary};
 }
@@ -182,11 +185,11 @@ public:
         titleLooks.marks = marksIn(row_.line.text, searchedIn(option_));
         drawWrapped(painter, placed({left + indent, top, titleWidth_, titleHeight}), row_.line,
                     titleLooks);
-        paintVerdict(painter, {row_.frame.right() - verdictWidth_, top, verdictWidth_,
-                               metrics_.height()});
+        paintVerdict(painter,
+                     {row_.frame.right() - verdictWidth_, top, verdictWidth_, metrics_.height()});
         if (!note_.details.isEmpty())
-            paintDetails(painter, {left + indent, top + titleHeight,
-                                   row_.frame.width() - indent, detailsHeight()});
+            paintDetails(painter, {left + indent, top + titleHeight, row_.frame.width() - indent,
+                                   detailsHeight()});
     }
 
 private:
@@ -210,10 +213,10 @@ private:
     {
         const Qt::Alignment side = looks_.isMirrored ? Qt::AlignRight : Qt::AlignLeft;
         painter.setLayoutDirection(text.isRightToLeft() ? Qt::RightToLeft : Qt::LeftToRight);
-        painter.drawText(rect,
-                         static_cast<int>(side | Qt::AlignAbsolute | Qt::AlignVCenter) |
-                             Qt::TextSingleLine,
-                         text);
+        painter.drawText(
+            rect,
+            static_cast<int>(side | Qt::AlignAbsolute | Qt::AlignVCenter) | Qt::TextSingleLine,
+            text);
     }
 
     void paintTriangle(QPainter& painter, const QRectF& rect) const
@@ -253,8 +256,8 @@ private:
         painter.setFont(scaledFont(looks_.defaultFont, looks_.fontScale));
         painter.setPen(isSelected(option_)
                            ? looks_.textColor
-                           : readableOn(looks_.background, mixed(looks_.background,
-                                                                 looks_.textColor, quietStrength)));
+                           : readableOn(looks_.background,
+                                        mixed(looks_.background, looks_.textColor, quietStrength)));
         putText(painter, placed(rect),
                 metrics_.elidedText(note_.details, Qt::ElideRight, rect.width()));
         painter.restore();

@@ -164,7 +164,8 @@ LogRuns::Row LogModel::kindOf(const contract::OutlineItem& item) const
 {
     if (isStartOfRun(item))
         return LogRuns::Row::Heading;
-    const bool isKept = filter_ == LogRuns::Filter::KeptRows && (isProblem(item) || isSuccess(item));
+    const bool isKept =
+        filter_ == LogRuns::Filter::KeptRows && (isProblem(item) || isSuccess(item));
     return isKept ? LogRuns::Row::Kept : LogRuns::Row::Other;
 }
 
@@ -173,14 +174,15 @@ bool LogModel::isOpenAtFirst(const contract::OutlineItem& start) const
     for (const auto& [chosen, isOpen] : choices_)
         if (chosen.isSameAs(start))
             return isOpen;
-    return knowledge_.isNewest ? knowledge_.isNewest(start) : !runs_.lastHeading();
+    const bool isLast = !runs_.lastHeading();
+    return isLast || (knowledge_.isNewest && knowledge_.isNewest(start));
 }
 
 void LogModel::choose(const contract::OutlineItem& start, bool isOpen)
 {
-    const auto chosen = std::find_if(
-        choices_.begin(), choices_.end(),
-        [&start](const Choice& choice) { return choice.first.isSameAs(start); });
+    const auto chosen =
+        std::find_if(choices_.begin(), choices_.end(),
+                     [&start](const Choice& choice) { return choice.first.isSameAs(start); });
     if (chosen != choices_.end())
         chosen->second = isOpen;
     else

@@ -76,8 +76,7 @@ void LogRuns::settleOffsets() const
             continue;
         }
         const Run& before = runs_[run - 1];
-        offsets_.push_back(offsets_[run - 1] + 1 +
-                           (before.isOpen ? rowsUnder(before.heading) : 0));
+        offsets_.push_back(offsets_[run - 1] + 1 + (before.isOpen ? rowsUnder(before.heading) : 0));
     }
 }
 

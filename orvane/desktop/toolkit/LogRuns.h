@@ -69,8 +69,8 @@ private:
     int known_ = 0;  ///< the first row that is known
     int end_ = 0;
     std::deque<Run> runs_;
-    std::vector<int> keptInFront_;   ///< before the first heading, the last one first
-    bool hasFoundHeading_ = false;   ///< looking from the end to the front
+    std::vector<int> keptInFront_;  ///< before the first heading, the last one first
+    bool hasFoundHeading_ = false;  ///< looking from the end to the front
     /// Shown rows before each run, from the first heading on; runs beyond its size are not counted.
     mutable std::vector<int> offsets_;
 };

@@ -100,9 +100,8 @@ LogSearch::LogSearch(OutlinePeer& peer, const contract::Bundle& texts, QWidget* 
     connect(back, &QToolButton::clicked, this, [this] { goOn(false); });
     connect(next, &QToolButton::clicked, this, [this] { goOn(true); });
     connect(end, &QToolButton::clicked, this, [this] { close(); });
-    connect(field_, &QLineEdit::textChanged, this, [this](const QString& text) {
-        searchFor(text);
-    });
+    connect(field_, &QLineEdit::textChanged, this,
+            [this](const QString& text) { searchFor(text); });
     look_.setInterval(0);
     connect(&look_, &QTimer::timeout, this, [this] { look(); });
     peer_.setRowsChanged([this](LogModel::Change change) { rowsChanged(change); });
@@ -257,9 +256,9 @@ void LogSearch::showCount()
     const bool isAtOne = current_ >= 0 && place <= static_cast<std::ptrdiff_t>(rows.size());
     QString text;
     if (!rows.empty())
-        text = toQt(contract::format(texts_.localizedString("%ld of %ld"),
-                                     {isAtOne ? static_cast<long>(place) : 0L,
-                                      static_cast<long>(rows.size())}));
+        text = toQt(contract::format(
+            texts_.localizedString("%ld of %ld"),
+            {isAtOne ? static_cast<long>(place) : 0L, static_cast<long>(rows.size())}));
     else if (!field_->text().isEmpty() && matches_.isComplete())
         text = toQt(texts_.localizedString("Not found"));
     if (!text.isEmpty() && isLooking())

@@ -91,7 +91,7 @@ private:
     QTimer look_;
     QLineEdit* field_;
     QLabel* count_;
-    int current_ = -1;  ///< the row of the view that was gone to; -1 for none
+    int current_ = -1;                   ///< the row of the view that was gone to; -1 for none
     contract::OutlineItem currentItem_;  ///< its record, by which it is found in another log
     std::size_t tried_ = 0;              ///< matches that are not that record
     bool mustShow_ = false;  ///< the first match behind where the reader was, once it is found

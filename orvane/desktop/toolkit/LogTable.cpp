@@ -150,8 +150,7 @@ void LogTable::mousePressEvent(QMouseEvent* event)
 {
     const QModelIndex index = indexAt(event->position().toPoint());
     setDragEnabled(isDraggable_ && index.isValid() && selectionModel()->isSelected(index));
-    const bool isPlain =
-        event->button() == Qt::LeftButton && event->modifiers() == Qt::NoModifier;
+    const bool isPlain = event->button() == Qt::LeftButton && event->modifiers() == Qt::NoModifier;
     pressed_ = isPlain ? QPersistentModelIndex(index) : QPersistentModelIndex();
     QTableView::mousePressEvent(event);
 }

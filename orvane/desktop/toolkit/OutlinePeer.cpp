@@ -120,10 +120,7 @@ OutlinePeer::OutlinePeer(LogTable& table, std::function<void()> beforeRows)
     : table_(&table), beforeRows_(std::move(beforeRows)), scroller_(*table.verticalScrollBar())
 {
     table.setModel(&model_);
-    table.setHandlers({[this](QKeyEvent& event) { sendKey(event); },
-                       [this] {
-                           drag();
-                       },
+    table.setHandlers({[this](QKeyEvent& event) { sendKey(event); }, [this] { drag(); },
                        [this](int row) {
                            if (model_.isHeading(row))
                                toggle(row);
@@ -336,8 +333,7 @@ void OutlinePeer::scrollRowToVisible(std::size_t row)
 
 contract::Rect OutlinePeer::rectOfRow(std::size_t row) const
 {
-    const auto shown =
-        row < rows_ ? model_.shownRow(static_cast<int>(row)) : std::optional<int>();
+    const auto shown = row < rows_ ? model_.shownRow(static_cast<int>(row)) : std::optional<int>();
     if (!shown)
         return {};
     const QRect rect = table_->visualRect(model_.index(*shown));

@@ -2,7 +2,6 @@
 #include "orvane/desktop/toolkit/QtInterface.h"
 
 #include "contract/toolkit/ControlNames.h"
-#include "orvane/desktop/toolkit/LogSearch.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/Text.h"
 
@@ -238,16 +237,15 @@ void LoadedInterface::addHostControls(LogTable& table)
     QBoxLayout* const rows = layoutOf(table);
     if (rows == nullptr)
         return;
-    auto* const search = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
-    rows->insertWidget(rows->indexOf(&table), search);
-    QWidget* const details =
-        root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
+    search_ = new LogSearch(*peer_, *hostTexts_, table.parentWidget());
+    rows->insertWidget(rows->indexOf(&table), search_);
+    QWidget* const details = root_->findChild<QWidget*>(toQt(contract::outlet::showDetails));
     QBoxLayout* const head = details != nullptr ? layoutOf(*details) : nullptr;
     QCheckBox* const toggle = makeProblemsToggle(*peer_, *hostTexts_, table.parentWidget());
     if (head != nullptr)
         head->insertWidget(head->indexOf(details) + 1, toggle);
     else
-        rows->insertWidget(rows->indexOf(search), toggle);
+        rows->insertWidget(rows->indexOf(search_), toggle);
 }
 
 // The divider stands below the first pane: its limits are the pane's.
@@ -305,8 +303,8 @@ bool QtInterface::loadInterface(std::string_view name, contract::InterfaceOwner&
             loadInterfaceFile(bundle_->pathForResource(std::string(name) + ".ui"), *bundle_, error);
     const bool isLoaded = root != nullptr;
     if (isLoaded)
-        loaded_.push_back(std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_,
-                                                            hostTexts_));
+        loaded_.push_back(
+            std::make_unique<LoadedInterface>(std::move(root), owner, beforeRows_, hostTexts_));
     else
         qWarning("cannot load the interface %s: %s", std::string(name).c_str(),
                  qPrintable(error.isEmpty() ? QStringLiteral("no such file") : error));

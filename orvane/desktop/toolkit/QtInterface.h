@@ -3,6 +3,7 @@
 
 #include "contract/foundation/Bundle.h"
 #include "contract/toolkit/Interface.h"
+#include "orvane/desktop/toolkit/LogSearch.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/OutlinePeer.h"
 #include "orvane/desktop/toolkit/QtControls.h"
@@ -48,6 +49,8 @@ public:
     /// when the file has none, and after the module has gone.
     contract::OutlineView* outlineView() { return outlineView_.get(); }
     OutlinePeer* outlinePeer() { return peer_.get(); }
+    /// The search above the log, for the menus; none where the log has none.
+    LogSearch* search() { return search_; }
     /// What the log says while it is empty; none when it says nothing.
     EmptyNote* emptyNote() { return emptyNote_; }
 
@@ -73,6 +76,7 @@ private:
     std::vector<std::unique_ptr<contract::View>> texts_;
     std::unique_ptr<OutlinePeer> peer_;
     QPointer<EmptyNote> emptyNote_;
+    QPointer<LogSearch> search_;
     std::unique_ptr<contract::OutlineView> outlineView_;
 };
 

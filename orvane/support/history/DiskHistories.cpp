@@ -254,7 +254,6 @@ void DiskHistories::restore(const Cleared& cleared)
     history.times.insertInFront(cleared.times);
     history.records = all;
     history.starts = {};
-    history.starts.take(all, history.times);
     const auto newer = store_.runs(cleared.key);
     if (!store_.clear(cleared.key))
         return;

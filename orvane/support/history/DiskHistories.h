@@ -150,7 +150,7 @@ private:
 
     HistoryStore& store_;
     std::map<std::string, KnownRuns> knownRuns_;
-    std::string lastKey_;         ///< where `runOf` found something last
+    std::string lastKey_;  ///< where `runOf` found something last
     std::size_t lastPlace_ = 0;
     std::map<std::string, History> histories_;               ///< by key
     std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it

@@ -79,7 +79,8 @@ bool readVersion(Database& database, std::int64_t& version)
 
 bool hasColumnOfRuns(Database& database, std::string_view name)
 {
-    Statement statement = database.prepare("SELECT 1 FROM pragma_table_info('runs') WHERE name = ?");
+    Statement statement =
+        database.prepare("SELECT 1 FROM pragma_table_info('runs') WHERE name = ?");
     statement.bind(1, name);
     return statement.step() == Statement::Step::Row;
 }

@@ -77,9 +77,10 @@ RunTable::RunTable(Database& database)
           "UPDATE runs SET finished = ?, verdict = ?, error = ?, message = ?, "
           "tool = NULLIF(?, ''), problems = NULLIF(?, 0), problemKinds = NULLIF(?, 0) "
           "WHERE id = ?")),
-      list_(database.prepare("SELECT action, started, finished, verdict, error, message, owner, "
-                             "tool, problems, problemKinds FROM runs LEFT JOIN openRuns ON run = id "
-                             "WHERE volume = ? ORDER BY id DESC LIMIT ?")),
+      list_(
+          database.prepare("SELECT action, started, finished, verdict, error, message, owner, "
+                           "tool, problems, problemKinds FROM runs LEFT JOIN openRuns ON run = id "
+                           "WHERE volume = ? ORDER BY id DESC LIMIT ?")),
       trim_(database.prepare("DELETE FROM runs WHERE volume = ?1 AND id <= (SELECT id FROM runs "
                              "WHERE volume = ?1 ORDER BY id DESC LIMIT 1 OFFSET ?2)")),
       database_(database)
@@ -134,8 +135,8 @@ std::vector<Run> RunTable::runs(std::int64_t volume, std::int64_t limit)
             run.finished = timeFrom(list_.integer(2));
             run.end =
                 RunEnd{std::string(list_.text(3)), static_cast<std::int32_t>(list_.integer(4)),
-                       std::string(list_.text(5)), std::string(list_.text(7)), list_.integer(8),
-                       list_.integer(9)};
+                       std::string(list_.text(5)), std::string(list_.text(7)),
+                       list_.integer(8),           list_.integer(9)};
         }
         run.isGoingOn = !run.end && isAlive(std::string(list_.text(6)));
         runs.push_back(std::move(run));

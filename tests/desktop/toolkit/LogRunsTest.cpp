@@ -54,8 +54,7 @@ TEST(LogRuns, RowsAreFoldedUnderTheirHeadings)
         std::string_view because;
     };
     for (const Case& c :
-         {Case{"", "", "", "an empty log"},
-          Case{"..k", "0 1 2", "2", "a log without runs"},
+         {Case{"", "", "", "an empty log"}, Case{"..k", "0 1 2", "2", "a log without runs"},
           Case{"H.k.", "0 1 2 3", "0 2", "one run"},
           Case{"h.k.H.", "0 4 5", "0 4", "an older one is folded"},
           Case{".kh..h.kHk", "0 1 2 5 8 9", "1 2 5 8 9", "what came before the first run"},
@@ -71,12 +70,13 @@ TEST(LogRuns, RowsAreFoldedUnderTheirHeadings)
 TEST(LogRuns, TheLastRunIsShownBeforeItsBeginningIsKnown)
 {
     for (const auto& [unknown, rows, because] :
-         {std::tuple(8U, "8 9", "it may have begun anywhere before"), {7U, "7 8 9", "as it has"},
-          {5U, "7 8 9", "of a run that may be folded nothing is shown"}, {4U, "4 7 8 9", "as it is"},
+         {std::tuple(8U, "8 9", "it may have begun anywhere before"),
+          {7U, "7 8 9", "as it has"},
+          {5U, "7 8 9", "of a run that may be folded nothing is shown"},
+          {4U, "4 7 8 9", "as it is"},
           {1U, "2 3 4 7 8 9", "what may have a heading is not shown without it"},
           {0U, "0 1 2 3 4 7 8 9", "as it has none"}})
-        EXPECT_EQ(shown(runsOf("..H.h..H..", 10, LogRuns::Filter::None, unknown)), rows)
-            << because;
+        EXPECT_EQ(shown(runsOf("..H.h..H..", 10, LogRuns::Filter::None, unknown)), rows) << because;
 }
 
 TEST(LogRuns, OpeningAndClosingMovesWhatFollows)

@@ -56,6 +56,7 @@ TEST_F(LogSearchTest, GoesFromMatchToMatchAlsoInFoldedRuns)
 {
     addRun("first", {"Inode 1", "other"});
     addRun("second", {"other", "inode 2"});
+    addRow("a detail", 2);
     selectDisk();
     type("INODE");
     EXPECT_EQ(place(), "Inode 1, 1 of 2") << "its run is unfolded";
@@ -70,6 +71,7 @@ TEST_F(LogSearchTest, GoesFromMatchToMatchAlsoInFoldedRuns)
     settle();
     EXPECT_EQ(place(), "inode 2, 2 of 3") << "the log has grown";
     interface->button("showDetailsButton")->press();
+    settle();
     settle();
     EXPECT_EQ(place(), "inode 2, 2 of 3") << "the log is another, with the same row";
     type("nothing");
