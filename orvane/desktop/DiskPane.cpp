@@ -120,6 +120,7 @@ void DiskPane::start()
     if (scansSystemDisks_) {
         if (const auto watching = watch_.start(); !watching)
             host_.log().ov_log(contract::OVLog::error, 0, watching.error().message);
+        list_.setLooking(true);
         scan_.start();
     }
     openNamed(true);
@@ -131,6 +132,7 @@ void DiskPane::start()
 void DiskPane::adoptDisks(const std::vector<DiskTree>& disks)
 {
     host_.sharedDiskController().synchronize(disks);
+    list_.setLooking(false);
     if (!std::exchange(hasReadDisks_, true))
         openNamed(false);
 }

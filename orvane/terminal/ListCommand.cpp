@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskFacts.h"
+#include "orvane/support/disks/FormatName.h"
 #include "orvane/terminal/Commands.h"
 #include "orvane/terminal/TerminalText.h"
 
@@ -46,6 +47,7 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     line.name = disk->displayName();
     line.kind = session.texts().text(kindText(facts.type));
     line.filesystem = facts.filesystem;
+    line.format = formatName(facts.filesystem, facts.filesystemVersion);
     line.bytes = facts.length;
     line.mountPoint = facts.mountPoint;
     const auto runs =
@@ -81,6 +83,7 @@ void listImage(const NamedDisk& image, Session& session, Reporter& reporter)
     if (top && top->parts().empty()) {
         const DiskLine volume = describe(top, session);
         line.filesystem = volume.filesystem;
+        line.format = volume.format;
         line.name = volume.name;
         line.lastChecked = volume.lastChecked;
         line.verdict = volume.verdict;

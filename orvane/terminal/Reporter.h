@@ -28,7 +28,8 @@ struct DiskLine {
     std::string disk;  ///< what a command takes
     std::string name;
     std::string kind;
-    std::string filesystem;
+    std::string filesystem;  ///< as programs name it
+    std::string format;      ///< the same as people do
     std::uint64_t bytes = 0;
     std::string mountPoint;
     bool isVolume = false;

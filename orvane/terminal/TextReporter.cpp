@@ -117,8 +117,8 @@ public:
     {
         const std::string indent = disk.isVolume ? "  " : "";
         std::string facts = byteCount(disk.bytes) + "  " + disk.kind;
-        if (!disk.filesystem.empty())
-            facts += "  " + disk.filesystem;
+        if (!disk.format.empty())
+            facts += "  " + disk.format;
         if (!disk.mountPoint.empty())
             facts += "  " + sentence("mounted at %@", {disk.mountPoint});
         const std::string name = disk.name.empty() ? "" : "  “" + disk.name + "”";

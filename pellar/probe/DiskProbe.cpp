@@ -89,13 +89,14 @@ Superblock readSuperblock(int descriptor, ByteRange range)
         return {};
     blkid_probe_enable_superblocks(probe.get(), 1);
     blkid_probe_set_superblocks_flags(probe.get(), BLKID_SUBLKS_TYPE | BLKID_SUBLKS_USAGE |
-                                                       BLKID_SUBLKS_LABEL | BLKID_SUBLKS_UUID);
+                                                       BLKID_SUBLKS_LABEL | BLKID_SUBLKS_UUID |
+                                                       BLKID_SUBLKS_VERSION);
     constexpr int ambivalent = -2;
     const int result = blkid_do_safeprobe(probe.get());
     if (result != 0)
-        return {{}, {}, {}, {}, result == ambivalent};
+        return {{}, {}, {}, {}, {}, result == ambivalent};
     return {valueOf(probe, "USAGE"), valueOf(probe, "TYPE"), valueOf(probe, "LABEL"),
-            valueOf(probe, "UUID"), false};
+            valueOf(probe, "UUID"), valueOf(probe, "VERSION"), false};
 }
 
 std::optional<PartitionTable> readPartitionTable(int descriptor)

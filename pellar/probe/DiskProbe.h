@@ -16,6 +16,7 @@ struct Superblock {
     std::string type;   ///< "ext4", "vfat", "swap", "crypto_LUKS", ...
     std::string label;  ///< any bytes
     std::string uuid;
+    std::string version;  ///< "FAT32", "1.0", ...
     /// There are several that disagree; then none of them is taken.
     bool isAmbivalent = false;
 

@@ -2,6 +2,7 @@
 #include "orvane/support/DiskLookup.h"
 #include "orvane/support/disks/DiskController.h"
 #include "orvane/support/disks/DiskWatch.h"
+#include "orvane/support/disks/FormatName.h"
 #include "orvane/support/disks/SystemDisks.h"
 #include "orvane/support/loop/MainLoop.h"
 #include "orvane/support/loop/Notifications.h"
@@ -156,7 +157,9 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     test::write(machine / "udev/b8:1",
                 "S:disk/by-id\nE:NOVALUE\nE:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=ext4\n"
                 "E:ID_FS_UUID=u-1\nE:ID_FS_LABEL_ENC=My\\x20D=\\x1b\\x\n");
-    test::write(machine / "udev/b8:16", "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=vfat\n");
+    test::write(machine / "udev/b8:0", "E:ID_PART_TABLE_TYPE=gpt\n");
+    test::write(machine / "udev/b8:16",
+                "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=vfat\nE:ID_FS_VERSION=FAT16\n");
 
     DiskSources sources{machine / "sys", machine / "dev", machine / "udev",
                         pellar::parseMounts("22 1 8:1 / / rw - ext4 /dev/sda1 rw\n"
@@ -173,6 +176,8 @@ TEST(SystemDisks, ReadsAMachineMadeOfFiles)
     EXPECT_EQ(disks[0].children[2].facts.type, diskType::container);
     EXPECT_EQ(disks[1].facts.type, diskType::bareVolume);
     EXPECT_EQ(disks[1].facts.sequence, 7U);
+    EXPECT_EQ(disks[0].facts.partitionMap, "gpt");
+    EXPECT_EQ(formatName(disks[1].facts.filesystem, disks[1].facts.filesystemVersion), "FAT16");
     EXPECT_EQ(disks[2].facts.type, diskType::bareVolume) << "it is mounted, so it is a volume";
     EXPECT_TRUE(disks[2].facts.containsUserHome);
 }

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/disks/DiskController.h"
+#include "orvane/support/disks/FormatName.h"
 #include "orvane/support/images/ImageAttacher.h"
 #include "orvane/support/images/ImageFile.h"
 #include "orvane/support/loop/Notifications.h"
@@ -60,6 +61,28 @@ TEST(ImageDisks, ABareFileSystemIsOneVolume)
     EXPECT_EQ(outline(disksIn(larger)), "0:type6:ext4") << "known by the superblock's backup";
 }
 
+TEST(ImageDisks, FormatsAreCalledAsPeopleCallThem)
+{
+    const TestDirectory directory;
+    const fs::path image = directory.makeFile("disk.img", 64 * mebibyte);
+    const auto format = [&] {
+        const DiskFacts facts = disksIn(image).facts;
+        return formatName(facts.filesystem, facts.filesystemVersion);
+    };
+    for (const auto& [bits, name] :
+         {std::pair("12", "FAT12"), std::pair("16", "FAT16"), std::pair("32", "FAT32")}) {
+        prepareWith({"mkfs.fat", "-s", bits == std::string("12") ? "64" : "1", "-F", bits,
+                     image.native()});
+        EXPECT_EQ(format(), name);
+    }
+    makeExt(image, 0, 64 * mebibyte, "");
+    EXPECT_EQ(format(), "ext4");
+    EXPECT_EQ(formatName("vfat", ""), "FAT") << "an entry of udev may lack the version";
+    EXPECT_EQ(formatName("vfat", "\x1b[31m"), "FAT");
+    EXPECT_EQ(formatName("ntfs", "3.1"), "NTFS");
+    EXPECT_EQ(formatName("zfs\xff", ""), "zfs\xff") << "what is not known stays as it is";
+}
+
 TEST(ImageDisks, PartitionsOfAGPT)
 {
     const TestDirectory directory;
@@ -75,6 +98,7 @@ TEST(ImageDisks, PartitionsOfAGPT)
     EXPECT_EQ(outline(disk), "0:type1: 1:type3:ext4 2:type3::hidden 3:type3: 4:type3::hidden")
         << "a Linux partition without a file system may be a damaged one";
     ASSERT_EQ(disk.children.size(), 4U);
+    EXPECT_EQ(disk.facts.partitionMap, "gpt");
     EXPECT_EQ(disk.children[0].facts.offset, mebibyte);
     EXPECT_EQ(disk.children[0].facts.length, 16 * mebibyte);
     EXPECT_EQ(disk.children[0].facts.identifier, image.native() + "#1");

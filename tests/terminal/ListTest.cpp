@@ -30,6 +30,17 @@ TEST_F(ListTest, TellsWhatIsKnownOfAnImage)
         "reason":"Not available because the selected disk is not mounted."}}})"));
 }
 
+TEST_F(ListTest, PeopleReadTheFormatsNameAndProgramsItsType)
+{
+    std::ofstream(path("fat")).close();
+    std::filesystem::resize_file(path("fat"), 64 * mebibyte);
+    prepareWith({"mkfs.fat", "-F", "16", path("fat").native()});
+    const std::string text = run({"list", "fat"}).output;
+    EXPECT_NE(text.find("disk image  FAT16"), std::string::npos) << text;
+    EXPECT_EQ(Events(run({"list", "--json", "fat"}).output).named("disk").front()["filesystem"],
+              "vfat");
+}
+
 class HistoryCommandTest : public ProgramTest {
 protected:
     std::vector<std::string> verdicts(const std::string& image) const

@@ -6,7 +6,7 @@
 #include "orvane/desktop/window/DiskRow.h"
 
 #include <QApplication>
-#include <QHeaderView>
+#include <QKeyEvent>
 #include <QPainter>
 #include <QStyledItemDelegate>
 
@@ -18,6 +18,7 @@ namespace {
 
 constexpr int margin = 5;  // pixels, around a row and between its parts
 constexpr int progressHeight = 3;  // pixels
+constexpr double greatestShareOfState = 0.55;  // of the line that the name stands on
 
 QFont nameFont(const QFont& font)
 {
@@ -58,15 +59,15 @@ public:
     void setLine(const QRect& line, const QFont& font, const QColor& color)
     {
         left_ = line;
-        painter_.setFont(font);
-        painter_.setPen(color);
+        useFont(font, color);
     }
 
-    void drawAtEnd(const QString& text)
+    /// In at most this share of the room that is left.
+    void drawAtEnd(const QString& text, double share = 1)
     {
-        // Whole pixels hold what was measured in fractions of them.
-        const double width = std::ceil(QFontMetricsF(painter_.font()).horizontalAdvance(text)) + 1;
-        draw(takeFromEnd(std::min(static_cast<int>(width), left_.width())), text);
+        if (!text.isEmpty())
+            draw(takeFromEnd(std::min(widthOf(text), static_cast<int>(left_.width() * share))),
+                 text);
     }
 
     void drawAtEnd(const QIcon& icon)
@@ -77,9 +78,31 @@ public:
         icon.paint(&painter_, visual(takeFromEnd(side)), Qt::AlignCenter);
     }
 
+    void drawAtStart(const QString& text)
+    {
+        QRect taken = left_;
+        taken.setWidth(std::min(widthOf(text), left_.width()));
+        left_.setLeft(taken.right() + 1 + margin);
+        draw(taken, text);
+    }
+
     void drawInTheRest(const QString& text) { draw(left_, text); }
 
+    void useFont(const QFont& font, const QColor& color)
+    {
+        painter_.setFont(font);
+        painter_.setPen(color);
+    }
+
 private:
+    // Whole pixels hold what was measured in fractions of them.
+    int widthOf(const QString& text) const
+    {
+        return static_cast<int>(
+                   std::ceil(QFontMetricsF(painter_.font()).horizontalAdvance(text))) +
+               1;
+    }
+
     QRect takeFromEnd(int width)
     {
         const QRect taken(left_.right() - width + 1, left_.top(), width, left_.height());
@@ -94,6 +117,10 @@ private:
 
     void draw(const QRect& rect, const QString& text)
     {
+        // An ellipsis and a letter say nothing.
+        const int least = painter_.fontMetrics().averageCharWidth() * 3;
+        if (rect.width() < std::min(least, widthOf(text)))
+            return;
         const QString shown =
             painter_.fontMetrics().elidedText(text, Qt::ElideMiddle, rect.width());
         painter_.drawText(visual(rect),
@@ -126,6 +153,28 @@ void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, double 
                                                      : QPalette::Highlight));
 }
 
+/// Around the row that the keys act on.
+void drawFocus(QPainter& painter, const QStyleOptionViewItem& option)
+{
+    if (!option.state.testFlag(QStyle::State_HasFocus))
+        return;
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.setPen(QPen(textColor(option), 1.5));
+    painter.setBrush(Qt::NoBrush);
+    painter.drawRoundedRect(QRectF(option.rect).adjusted(1.5, 1.5, -1.5, -1.5), 3, 3);
+}
+
+void drawHeading(QPainter& painter, const QStyleOptionViewItem& option)
+{
+    painter.setFont(nameFont(detailFont(option.font)));
+    painter.setPen(option.palette.color(QPalette::PlaceholderText));
+    const QRect line = option.rect.adjusted(margin, margin, -margin, 0);
+    painter.drawText(line,
+                     Qt::AlignVCenter | Qt::TextSingleLine |
+                         QStyle::visualAlignment(option.direction, Qt::AlignLeft),
+                     painter.fontMetrics().elidedText(option.text, Qt::ElideRight, line.width()));
+}
+
 /// Draws a disk in two lines, from the columns of its row: its name and its state, and below what
 /// it is and when it was last checked.
 class DiskDelegate final : public QStyledItemDelegate {
@@ -135,6 +184,10 @@ public:
     void paint(QPainter* painter, const QStyleOptionViewItem& option,
                const QModelIndex& index) const override;
     QSize sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const override;
+
+private:
+    static void drawDisk(QPainter& painter, const QStyleOptionViewItem& option,
+                         const QModelIndex& index);
 };
 
 }  // namespace
@@ -144,55 +197,78 @@ void DiskDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
 {
     QStyleOptionViewItem complete = option;
     initStyleOption(&complete, index);
-    drawRowBackground(*painter, complete);
-
     painter->save();
-    const int height = heightOfLines(complete.font);
-    QRect rest = complete.rect.adjusted(margin, 0, -margin, 0);
+    if (index.data(DiskTreeModel::HeadingRole).toBool()) {
+        drawHeading(*painter, complete);
+    } else {
+        const bool hasFocus = complete.state.testFlag(QStyle::State_HasFocus);
+        complete.state.setFlag(QStyle::State_HasFocus, false);
+        drawRowBackground(*painter, complete);
+        complete.state.setFlag(QStyle::State_HasFocus, hasFocus);
+        drawDisk(*painter, complete, index);
+        drawFocus(*painter, complete);
+    }
+    painter->restore();
+}
+
+void DiskDelegate::drawDisk(QPainter& painter, const QStyleOptionViewItem& option,
+                            const QModelIndex& index)
+{
+    const int height = heightOfLines(option.font);
+    QRect rest = option.rect.adjusted(margin, 0, -margin, 0);
     rest.setTop(rest.top() + (rest.height() - height) / 2);
     rest.setHeight(height);
     const int side = height * 3 / 4;
     const QRect icon(rest.left(), rest.top() + (height - side) / 2, side, side);
-    complete.icon.paint(painter, QStyle::visualRect(complete.direction, complete.rect, icon));
+    option.icon.paint(&painter, QStyle::visualRect(option.direction, option.rect, icon));
     rest.setLeft(icon.right() + 2 * margin);
 
-    const QColor color = textColor(complete);
+    const QColor color = textColor(option);
     QColor faint = color;
     faint.setAlphaF(0.72F);
     QRect line = rest;
-    line.setHeight(QFontMetrics(nameFont(complete.font)).height());
-    RowPainter row(*painter, complete);
-    row.setLine(line, complete.font, color);
-    row.drawAtEnd(cell(index, DiskColumn::Verdict).toString());
+    line.setHeight(QFontMetrics(nameFont(option.font)).height());
+    RowPainter row(painter, option);
+    row.setLine(line, option.font, color);
+    row.drawAtEnd(cell(index, DiskColumn::Verdict).toString(), greatestShareOfState);
     row.drawAtEnd(cell(index, DiskColumn::Verdict, Qt::DecorationRole).value<QIcon>());
-    painter->setFont(nameFont(complete.font));
-    row.drawInTheRest(index.data().toString());
+    row.useFont(nameFont(option.font), color);
+    row.drawAtStart(index.data(DiskTreeModel::NameRole).toString());
+    row.useFont(detailFont(option.font), faint);
+    row.drawInTheRest(index.data(DiskTreeModel::BearerRole).toString());
     line.setTop(line.bottom() + 1);
     line.setBottom(rest.bottom());
-    row.setLine(line, detailFont(complete.font), faint);
+    row.setLine(line, detailFont(option.font), faint);
     row.drawAtEnd(cell(index, DiskColumn::LastCheck).toString());
     row.drawInTheRest(index.data(DiskTreeModel::DetailsRole).toString());
-    drawProgress(*painter, complete, index.data(DiskTreeModel::PercentRole).toDouble());
-    painter->restore();
+    drawProgress(painter, option, index.data(DiskTreeModel::PercentRole).toDouble());
 }
 
-QSize DiskDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& /*index*/) const
+QSize DiskDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const
 {
-    return {QFontMetrics(option.font).averageCharWidth() * 30,
-            heightOfLines(option.font) + 2 * margin};
+    const int height = index.data(DiskTreeModel::HeadingRole).toBool()
+                           ? QFontMetrics(detailFont(option.font)).height()
+                           : heightOfLines(option.font);
+    return {QFontMetrics(option.font).averageCharWidth() * 30, height + 2 * margin};
 }
 
-DiskList::DiskList(const Translator& texts, QWidget* parent) : QTreeView(parent)
+DiskList::DiskList(const Translator& texts, QWidget* parent)
+    : QTreeView(parent), texts_(texts), note_(new ListNote(*this))
 {
     setObjectName(QStringLiteral("diskList"));
     setAccessibleName(toQt(texts.text("Disks")));
     setAccessibleDescription(toQt(texts.text("Select the disks to verify or repair.")));
     setSelectionMode(ExtendedSelection);
     setSelectionBehavior(SelectRows);
-    setUniformRowHeights(true);
     setEditTriggers(NoEditTriggers);
+    setExpandsOnDoubleClick(false);
     setHeaderHidden(true);
+    setFrameShape(NoFrame);
     setItemDelegate(new DiskDelegate(this));
+    connect(this, &QAbstractItemView::doubleClicked, this, [this] {
+        if (events_.opened)
+            events_.opened();
+    });
 }
 
 void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged)
@@ -205,11 +281,12 @@ void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged
     // Volumes are what the user is here for.
     connect(&disks, &QAbstractItemModel::rowsInserted, this,
             [this](const QModelIndex& parent) { setExpanded(parent, true); });
-    connect(selectionModel(), &QItemSelectionModel::selectionChanged, this,
-            [this, changed = std::move(selectionChanged)] {
-                if (!isSynchronizing_)
-                    changed();
-            });
+    selectionChanged_ = std::move(selectionChanged);
+    connect(selectionModel(), &QItemSelectionModel::selectionChanged, this, [this] {
+        if (!isSynchronizing_)
+            selectionChanged_();
+    });
+    tellWhatIsMissing();
 }
 
 QModelIndexList DiskList::selectionInOrder() const
@@ -247,18 +324,22 @@ std::vector<DiskRow> DiskList::selectedRows() const
 
 std::vector<DiskRow> DiskList::rowsBelow(const DiskRow& row) const
 {
-    std::vector<DiskRow> rows;
-    const QModelIndex top = disks_ != nullptr ? disks_->indexOf(row.facts.identifier) : QModelIndex();
-    for (int i = 0; top.isValid() && i < disks_->rowCount(top); ++i)
-        rows.push_back(disks_->rowAt(disks_->index(i, 0, top)));
-    return rows;
+    const QModelIndex index =
+        disks_ != nullptr ? disks_->indexOf(row.facts.identifier) : QModelIndex();
+    return index.isValid() ? disks_->partsOf(*disks_->diskAt(index)) : std::vector<DiskRow>();
 }
 
 void DiskList::select(const Disk& disk)
 {
-    const QModelIndex row = disks_ != nullptr ? disks_->indexOf(disk.facts().identifier) : QModelIndex();
-    if (row.isValid())
-        setCurrentIndex(row);
+    if (disks_ == nullptr)
+        return;
+    const auto row = [&] {
+        return disks_->indexOf(disk.facts().identifier);
+    };
+    if (!row().isValid() && disks_->isFiltered() && disks_->isKnown(disk) && events_.clearFilter)
+        events_.clearFilter();
+    if (const QModelIndex found = row(); found.isValid())
+        setCurrentIndex(found);
 }
 
 void DiskList::showProgress()
@@ -274,6 +355,65 @@ void DiskList::synchronize()
     isSynchronizing_ = true;
     disks_->synchronize();
     isSynchronizing_ = false;
+    tellWhatIsMissing();
+}
+
+// Told once the rows are as they will be: a listener asks for them.
+void DiskList::setFilter(const QString& words)
+{
+    filter_ = words.simplified();
+    if (disks_ == nullptr)
+        return;
+    const auto before = selectedDisks();
+    isSynchronizing_ = true;
+    disks_->setFilter(filter_);
+    isSynchronizing_ = false;
+    tellWhatIsMissing();
+    if (selectedDisks() != before)
+        selectionChanged_();
+}
+
+void DiskList::selectFirst()
+{
+    const QModelIndex first = moveCursor(MoveHome, Qt::NoModifier);
+    if (first.isValid())
+        setCurrentIndex(first);
+}
+
+void DiskList::setLooking(bool isLooking)
+{
+    isLooking_ = isLooking;
+    tellWhatIsMissing();
+}
+
+void DiskList::tellWhatIsMissing()
+{
+    const auto text = [this](std::string_view key) {
+        return toQt(texts_.text(key));
+    };
+    if (disks_ == nullptr || disks_->rowCount() != 0)
+        note_->hide();
+    else if (disks_->hasDisks())
+        note_->tell(toQt(texts_.sentence("No disk matches “%@”.", {fromQt(filter_)})),
+                    text("Show All Disks"), events_.clearFilter);
+    else if (isLooking_)
+        note_->tell(text("Looking for disks…"));
+    else
+        note_->tell(text("No disks were found. Open an image, or drop one here."),
+                    text("Open Image…"), [this] {
+                        if (events_.openImage)
+                            events_.openImage();
+                    });
+}
+
+void DiskList::keyPressEvent(QKeyEvent* event)
+{
+    const bool isReturn = event->key() == Qt::Key_Return || event->key() == Qt::Key_Enter;
+    const auto& answer = isReturn ? events_.opened : events_.search;
+    if ((isReturn || event->text() == QLatin1String("/")) && answer)
+        answer();
+    else
+        QTreeView::keyPressEvent(event);
 }
 
 }  // namespace orvane::desktop

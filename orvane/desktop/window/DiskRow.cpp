@@ -173,8 +173,8 @@ QString nameText(const DiskRow& row)
 
 QString formatText(const DiskRow& row, const Translator& texts)
 {
-    return row.filesystem.empty() ? toQt(texts.text(kindText(row.facts.type)))
-                                  : toQtLine(row.filesystem);
+    return row.format.empty() ? toQt(texts.text(kindText(row.facts.type)))
+                                  : toQtLine(row.format);
 }
 
 QString sizeText(std::uint64_t bytes)
@@ -187,6 +187,12 @@ QString sizeText(std::uint64_t bytes)
 QString verdictText(const Check& check, const Translator& texts)
 {
     return toQt(texts.text(check.verdict.empty() ? std::string_view("cut off") : check.verdict));
+}
+
+bool isGood(std::string_view verdict)
+{
+    return verdict == contract::kPLVerdictSound.text() ||
+           verdict == contract::kPLVerdictRepaired.text();
 }
 
 QIcon diskIcon(const DiskFacts& facts)
@@ -213,8 +219,7 @@ QIcon verdictIcon(std::string_view verdict)
     static const QIcon cross =
         drawn(sign(redColor, {{5.6, 5.6}, {10.4, 10.4}, {10.4, 5.6}, {5.6, 10.4}}));
     static const QIcon mark = drawn(sign(amberColor, {{8, 4.6}, {8, 8.8}, {8, 11.4}, {8, 11.5}}));
-    if (verdict == contract::kPLVerdictSound.text() ||
-        verdict == contract::kPLVerdictRepaired.text())
+    if (isGood(verdict))
         return check;
     return verdict == contract::kPLVerdictDamaged.text() ? cross : mark;
 }
@@ -231,8 +236,12 @@ QString stateText(const DiskRow& row, const Translator& texts)
                                         : row.activity);
     if (!row.lastCheck)
         return {};
-    return row.lastCheck->isPartial ? toQt(texts.text("partly checked"))
-                                    : verdictText(row.lastCheck->told, texts);
+    if (row.lastCheck->isPartial)
+        return toQt(texts.text("partly checked"));
+    const QString verdict = verdictText(row.lastCheck->told, texts);
+    if (row.lastCheck->part.empty() || isGood(row.lastCheck->told.verdict))
+        return verdict;
+    return toQtLine(texts.sentence("%@: %@", {fromQt(verdict), row.lastCheck->part}));
 }
 
 QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts)
@@ -240,7 +249,7 @@ QString cellText(const DiskRow& row, DiskColumn column, const Translator& texts)
     switch (column) {
         case DiskColumn::Name: return nameText(row);
         case DiskColumn::Size: return sizeText(row.facts.length);
-        case DiskColumn::Format: return toQtLine(row.filesystem);
+        case DiskColumn::Format: return toQtLine(row.format);
         case DiskColumn::MountPoint: return toQtLine(row.facts.mountPoint);
         case DiskColumn::Verdict: return stateText(row, texts);
         case DiskColumn::LastCheck:
@@ -298,8 +307,8 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
                       toQt(texts.text(kindText(row.facts.type)))};
     if (row.facts.length != 0)
         lines.back() += QStringLiteral(", ") + sizeText(row.facts.length);
-    if (!row.filesystem.empty())
-        lines.back() += QStringLiteral(", ") + toQtLine(row.filesystem);
+    if (!row.format.empty())
+        lines.back() += QStringLiteral(", ") + toQtLine(row.format);
     if (!row.facts.mountPoint.empty())
         lines += toQt(texts.sentence("mounted at %@", {contract::printable(row.facts.mountPoint)}));
     if (!row.note.empty())
@@ -311,6 +320,21 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
     else if (row.activity.empty())
         lines += toQt(texts.text("never checked"));
     return lines.join(QLatin1Char('\n'));
+}
+
+QString searchText(const DiskRow& row, const Translator& texts)
+{
+    return QStringList{nameText(row),
+                       toQtLine(row.facts.name),
+                       toQtLine(row.facts.path.native()),
+                       formatText(row, texts),
+                       toQtLine(row.facts.model),
+                       toQtLine(row.facts.mountPoint),
+                       stateText(row, texts),
+                       row.lastCheck || !row.activity.empty() ? QString()
+                                                              : toQt(texts.text("never checked")),
+                       toQtLine(row.note)}
+        .join(QLatin1Char('\n'));
 }
 
 }  // namespace orvane::desktop

@@ -51,6 +51,9 @@ struct DiskStates {
     };
 };
 
+/// Nothing is wrong: sound, or repaired.
+[[nodiscard]] bool isGood(std::string_view verdict);
+
 /// By the kind of disk.
 [[nodiscard]] QIcon diskIcon(const DiskFacts& facts);
 
@@ -66,7 +69,7 @@ inline constexpr int diskColumnCount = 6;
 struct DiskRow {
     DiskFacts facts;
     std::string label;
-    std::string filesystem;
+    std::string format;  ///< of its file system, as people call it; empty where there is none
     std::optional<LastCheck> lastCheck;
     std::string activity = {};  ///< as of DiskStates
     double percent = 0;         ///< how far that is, from 0 to 100
@@ -99,7 +102,10 @@ struct DiskNames {
 [[nodiscard]] QString rowSummary(const DiskRow& row, const Translator& texts);
 /// Everything there is to say, on several lines of plain text.
 [[nodiscard]] QString rowToolTip(const DiskRow& row, const Translator& texts);
-/// What is being done to the disk, or what is known of it, in the user's language.
+/// Everything by which the user may look for it, on lines; no kind of it more than another.
+[[nodiscard]] QString searchText(const DiskRow& row, const Translator& texts);
+/// What is being done to the disk, or what is known of it and, where that is bad news of a part,
+/// of which: "damaged: inner".
 [[nodiscard]] QString stateText(const DiskRow& row, const Translator& texts);
 
 }  // namespace orvane::desktop

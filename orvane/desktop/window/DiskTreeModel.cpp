@@ -4,8 +4,10 @@
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskRow.h"
+#include "orvane/support/disks/FormatName.h"
 
 #include <algorithm>
+#include <array>
 
 namespace orvane::desktop {
 namespace {
@@ -16,11 +18,15 @@ bool isImageContents(const Disk& disk)
            !disk.isOfflineDiskImage();
 }
 
+std::string formatOf(const Disk& disk)
+{
+    return formatName(disk.facts().filesystem, disk.facts().filesystemVersion);
+}
+
 /// What is good is 0, and what is known to be bad is worse than what is not known.
 int badness(const Check& check)
 {
-    if (check.verdict == contract::kPLVerdictSound.text() ||
-        check.verdict == contract::kPLVerdictRepaired.text())
+    if (isGood(check.verdict))
         return 0;
     return check.verdict == contract::kPLVerdictDamaged.text() ? 2 : 1;
 }
@@ -38,7 +44,7 @@ QIcon stateIcon(const DiskRow& row)
 }  // namespace
 
 struct DiskTreeModel::Node {
-    DiskPointer disk;
+    Subject subject;
     DiskRow row;
     Node* parent = nullptr;
     Nodes children;
@@ -87,23 +93,92 @@ std::vector<DiskTreeModel::DiskPointer> DiskTreeModel::childrenOf(const Disk& di
     return children;
 }
 
-std::vector<DiskTreeModel::DiskPointer> DiskTreeModel::rootsShown() const
+// The system's disks, then the images; each section has a heading where there are both.
+DiskTreeModel::Subjects DiskTreeModel::topSubjects()
 {
-    std::vector<DiskPointer> roots = disks_.roots();
-    std::erase_if(roots, [this](const DiskPointer& root) { return isContents(*root); });
-    return roots;
+    std::array<Subjects, 2> sections;
+    std::array<bool, 2> isThere{};
+    for (const DiskPointer& root : disks_.roots()) {
+        if (isContents(*root))
+            continue;
+        const auto section = root->facts().storage == contract::DiskReference::Storage::FileRegion
+                                 ? Section::Images
+                                 : Section::Disks;
+        const auto place = static_cast<std::size_t>(section);
+        isThere[place] = true;
+        if (isShown(root))
+            sections[place].push_back({root, section});
+    }
+    Subjects all;
+    for (const Section section : {Section::Disks, Section::Images}) {
+        const Subjects& disks = sections[static_cast<std::size_t>(section)];
+        if (isThere[0] && isThere[1] && !disks.empty())
+            all.push_back({nullptr, section});
+        all.insert(all.end(), disks.begin(), disks.end());
+    }
+    return all;
+}
+
+DiskTreeModel::Subjects DiskTreeModel::partsShown(const Disk& disk)
+{
+    Subjects parts;
+    for (DiskPointer& child : childrenOf(disk))
+        if (isShown(child))
+            parts.push_back({std::move(child)});
+    return parts;
+}
+
+bool DiskTreeModel::isShown(const DiskPointer& disk)
+{
+    if (!isFiltered() || isFound(disk))
+        return true;
+    const auto children = childrenOf(*disk);
+    return std::ranges::any_of(children, [this](const auto& child) { return isShown(child); });
+}
+
+bool DiskTreeModel::isFound(const DiskPointer& disk)
+{
+    if (found_.contains(disk->facts().identifier))
+        return true;
+    const QString text = searchText(rowOf(disk), texts_);
+    const bool hasAll = std::ranges::all_of(
+        words_, [&](const QString& word) { return text.contains(word, Qt::CaseInsensitive); });
+    if (hasAll)
+        found_.insert(disk->facts().identifier);
+    return hasAll;
+}
+
+void DiskTreeModel::setFilter(const QString& words)
+{
+    words_ = words.split(QLatin1Char(' '), Qt::SkipEmptyParts);
+    found_.clear();
+    synchronize();
+}
+
+bool DiskTreeModel::isKnown(const Disk& disk) const
+{
+    const DiskPointer known = disks_.diskNamed(disk.facts().identifier);
+    return known && !isContents(*known);
+}
+
+std::vector<DiskRow> DiskTreeModel::partsOf(const Disk& disk) const
+{
+    std::vector<DiskRow> rows;
+    for (const DiskPointer& child : childrenOf(disk))
+        rows.push_back(rowOf(child));
+    return rows;
 }
 
 DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
 {
-    DiskRow row{disk->facts(), disk->facts().label, disk->facts().filesystem, checkOf(*disk)};
+    DiskRow row{disk->facts(), disk->facts().label, formatOf(*disk), checkOf(*disk)};
     row.activity = activityOf(*disk);
     if (!row.activity.empty())
         row.percent = states_.percent();
     row.note = states_.note(*disk);
     if (const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr) {
         row.label = contents->facts().label;
-        row.filesystem = contents->facts().filesystem;
+        row.format = formatOf(*contents);
         row.facts.space = contents->facts().space;
     }
     return row;
@@ -156,7 +231,7 @@ std::string DiskTreeModel::activityOf(const Disk& disk) const
 
 void DiskTreeModel::synchronize()
 {
-    synchronize(*top_, {}, rootsShown());
+    synchronize(*top_, {}, topSubjects());
 }
 
 void DiskTreeModel::showProgress()
@@ -178,11 +253,11 @@ void DiskTreeModel::showProgress(Node& node, const QModelIndex& at)
 }
 
 void DiskTreeModel::removeGone(Node& node, const QModelIndex& at,
-                               const std::vector<DiskPointer>& wanted)
+                               const Subjects& wanted)
 {
     for (int row = static_cast<int>(node.children.size()) - 1; row >= 0; --row) {
         const auto place = node.children.begin() + row;
-        if (std::find(wanted.begin(), wanted.end(), (*place)->disk) != wanted.end())
+        if (std::find(wanted.begin(), wanted.end(), (*place)->subject) != wanted.end())
             continue;
         beginRemoveRows(at, row, row);
         node.children.erase(place);
@@ -191,25 +266,29 @@ void DiskTreeModel::removeGone(Node& node, const QModelIndex& at,
 }
 
 void DiskTreeModel::synchronize(Node& node, const QModelIndex& at,
-                                const std::vector<DiskPointer>& wanted)
+                                const Subjects& wanted)
 {
+    const auto rowFor = [this](const Subject& subject) {
+        return subject.disk ? rowOf(subject.disk) : DiskRow();
+    };
     removeGone(node, at, wanted);
     for (std::size_t i = 0; i < wanted.size(); ++i) {
         const int row = static_cast<int>(i);
-        const bool isThere = i < node.children.size() && node.children[i]->disk == wanted[i];
+        const bool isThere = i < node.children.size() && node.children[i]->subject == wanted[i];
         if (!isThere) {
             auto added = std::make_unique<Node>();
-            added->disk = wanted[i];
-            added->row = rowOf(wanted[i]);
+            added->subject = wanted[i];
+            added->row = rowFor(wanted[i]);
             added->parent = &node;
             beginInsertRows(at, row, row);
             node.children.insert(node.children.begin() + row, std::move(added));
             endInsertRows();
         } else {
-            node.children[i]->row = rowOf(wanted[i]);
+            node.children[i]->row = rowFor(wanted[i]);
             emit dataChanged(index(row, 0, at), index(row, diskColumnCount - 1, at));
         }
-        synchronize(*node.children[i], index(row, 0, at), childrenOf(*wanted[i]));
+        if (wanted[i].disk)
+            synchronize(*node.children[i], index(row, 0, at), partsShown(*wanted[i].disk));
     }
     // Rows that have changed places stand here a second time.
     while (node.children.size() > wanted.size()) {
@@ -227,7 +306,7 @@ const DiskTreeModel::Node& DiskTreeModel::nodeAt(const QModelIndex& index) const
 
 DiskTreeModel::DiskPointer DiskTreeModel::diskAt(const QModelIndex& index) const
 {
-    return nodeAt(index).disk;
+    return nodeAt(index).subject.disk;
 }
 
 const DiskRow& DiskTreeModel::rowAt(const QModelIndex& index) const
@@ -268,11 +347,30 @@ int DiskTreeModel::columnCount(const QModelIndex& /*parent*/) const
     return diskColumnCount;
 }
 
+// What is disabled is passed over by the keys, too.
+Qt::ItemFlags DiskTreeModel::flags(const QModelIndex& index) const
+{
+    return index.isValid() && !diskAt(index) ? Qt::NoItemFlags : QAbstractItemModel::flags(index);
+}
+
+QVariant DiskTreeModel::headingData(Section section, const QModelIndex& index, int role) const
+{
+    if (role == HeadingRole)
+        return true;
+    const bool isText = role == Qt::DisplayRole || role == Qt::AccessibleTextRole;
+    if (!isText || index.column() != static_cast<int>(DiskColumn::Name))
+        return {};
+    return toQt(texts_.text(section == Section::Disks ? "Disks" : "Disk Images"));
+}
+
 QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
 {
     if (!index.isValid())
         return {};
-    const DiskRow& row = nodeAt(index).row;
+    const Node& node = nodeAt(index);
+    if (!node.subject.disk)
+        return headingData(node.subject.section, index, role);
+    const DiskRow& row = node.row;
     const auto column = static_cast<DiskColumn>(index.column());
     switch (role) {
         case Qt::DisplayRole: return cellText(row, column, texts_);
@@ -281,6 +379,8 @@ QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
                                               : cellText(row, column, texts_);
         case DetailsRole: return rowDetails(row, texts_);
         case PercentRole: return row.percent;
+        case NameRole: return namesOf(row).name;
+        case BearerRole: return namesOf(row).bearer;
         case Qt::ToolTipRole: return toQtToolTip(fromQt(rowToolTip(row, texts_)));
         case Qt::UserRole: return toQt(row.facts.identifier);
         case Qt::DecorationRole:

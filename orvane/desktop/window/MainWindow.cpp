@@ -118,7 +118,7 @@ void ProgressArea::setStop(std::function<void()> stop)
 
 MainWindow::MainWindow(const Translator& texts)
     : commands_(new CommandBar(texts, this)),
-      disks_(new DiskList(texts)),
+      disks_(new DiskPanel(texts)),
       header_(new DiskHeader),
       banner_(new ResultBanner(texts)),
       tabs_(new QTabWidget),
@@ -235,6 +235,7 @@ void MainWindow::adoptRoom()
     commands_->setCompact(width() < roomyWidth * metrics.averageCharWidth());
     if (std::exchange(isCompact_, isCompact) == isCompact)
         return;
+    disks_->setCompact(isCompact);
     header_->setCompact(isCompact);
     banner_->setCompact(isCompact);
     if (events_.roomChanged)

@@ -4,7 +4,7 @@
 #include "contract/support/OVPreferences.h"
 #include "orvane/desktop/window/CommandBar.h"
 #include "orvane/desktop/window/DiskHeader.h"
-#include "orvane/desktop/window/DiskList.h"
+#include "orvane/desktop/window/DiskPanel.h"
 #include "orvane/desktop/window/ElidedLabel.h"
 #include "orvane/desktop/window/ResultBanner.h"
 
@@ -75,8 +75,9 @@ public:
     explicit MainWindow(const Translator& texts);
     void setEvents(Events events) { events_ = std::move(events); }
 
-    DiskList& disks() { return *disks_; }
-    const DiskList& disks() const { return *disks_; }
+    DiskPanel& diskPanel() { return *disks_; }
+    DiskList& disks() { return disks_->list(); }
+    const DiskList& disks() const { return disks_->list(); }
     QTabWidget& tabs() { return *tabs_; }
     CommandBar& commands() { return *commands_; }
     DiskHeader& header() { return *header_; }
@@ -108,7 +109,7 @@ private:
 
     Events events_;
     CommandBar* commands_;
-    DiskList* disks_;
+    DiskPanel* disks_;
     DiskHeader* header_;
     ResultBanner* banner_;
     QTabWidget* tabs_;

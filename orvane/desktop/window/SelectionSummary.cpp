@@ -24,8 +24,6 @@ QString stateOf(const DiskRow& row, const QDateTime& now, const Translator& text
         return toQt(texts.text("Never checked"));
     const LastCheck& check = *row.lastCheck;
     QString text = capitalized(state) + separator + ageText(check.told.started, now, texts);
-    if (!check.part.empty())
-        text += separator + toQtLine(check.part);
     if (check.later)
         text += separator + toQt(texts.sentence("then %@",
                                                 {fromQt(verdictText(*check.later, texts))}));

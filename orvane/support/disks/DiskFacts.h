@@ -45,6 +45,7 @@ struct DiskFacts : contract::DiskReference {
 
     std::string label = {};
     std::string uuid = {};  ///< of the file system
+    std::string filesystemVersion = {};  ///< as libblkid names it; mostly empty
     /// Of a volume, as it says itself; none where it does not, or cannot be read.
     std::optional<pellar::SpaceUse> space = {};
     std::string model = {};  ///< of the drive, of a whole disk; empty when it is not known
@@ -59,6 +60,7 @@ struct DiskFacts : contract::DiskReference {
     bool hasSMARTError = false;
     /// Of the whole disk in an image: its partition map was found damaged when it was read.
     bool hasDamagedMap = false;
+    std::string partitionMap = {};  ///< its kind, of a whole disk, as libblkid names it ("gpt")
 
     std::filesystem::path imagePath = {};  ///< of an image file that is not attached
 

@@ -67,13 +67,6 @@ bool isLeftOut(const fs::path& device)
     return isMemory || (sizeOf(device) == 0 && !isOptical);
 }
 
-Superblock superblockFromUdev(const std::string& number, const DiskSources& sources)
-{
-    auto properties = udevProperties(number, sources.udevData);
-    return {properties["ID_FS_USAGE"], properties["ID_FS_TYPE"],
-            decodeUdevName(properties["ID_FS_LABEL_ENC"]), properties["ID_FS_UUID"]};
-}
-
 /// What can be found out by reading the device, or about it where it may not be read.
 struct Contents {
     Superblock superblock;
@@ -82,14 +75,26 @@ struct Contents {
     bool hasExtBackup = false;
     bool hasTableTraces = false;
     bool hasBootSector = false;  ///< and what looks like a table is nothing else
+    std::string tableType = {};
 };
+
+Contents contentsFromUdev(const std::string& number, const DiskSources& sources)
+{
+    auto properties = udevProperties(number, sources.udevData);
+    Contents contents;
+    contents.superblock = {properties["ID_FS_USAGE"], properties["ID_FS_TYPE"],
+                           decodeUdevName(properties["ID_FS_LABEL_ENC"]), properties["ID_FS_UUID"],
+                           properties["ID_FS_VERSION"]};
+    contents.tableType = properties["ID_PART_TABLE_TYPE"];
+    return contents;
+}
 
 Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
                     const DiskSources& sources)
 {
     const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
     if (!device)
-        return {superblockFromUdev(number, sources), {}};
+        return contentsFromUdev(number, sources);
     const ByteRange all{0, size};
     Contents contents{readSuperblock(device.get(), all),
                       readPartitionTable(device.get()),
@@ -99,6 +104,7 @@ Contents contentsOf(const fs::path& node, const std::string& number, std::uint64
     contents.space = pellar::spaceUseOf(device.get(), all, contents.superblock.type);
     contents.hasBootSector =
         contents.table && isBootSector(device.get(), *contents.table, contents.superblock);
+    contents.tableType = contents.table ? contents.table->type : "";
     return contents;
 }
 
@@ -147,6 +153,7 @@ void addSuperblock(DiskFacts& facts, const Contents& contents)
         facts.filesystem = superblock.type;
     else if (superblock.type.empty() && contents.hasExtBackup)
         facts.filesystem = "ext4";
+    facts.filesystemVersion = superblock.version;
     facts.label = superblock.label;
     facts.space = contents.space;
     facts.uuid = superblock.isFilesystem() ? superblock.uuid : std::string();
@@ -245,6 +252,8 @@ DiskTree readWhole(const fs::path& device, const DiskSources& sources)
     if (!facts.isWhole) {
         addSuperblock(facts, contents);
         addMount(facts, number, sources);
+    } else {
+        facts.partitionMap = contents.tableType;
     }
     tree.facts = facts;
     return tree;

@@ -123,6 +123,7 @@ ImageContents readContents(const OpenImage& image)
         (table && !isBootSector(image.descriptor.get(), *table, contents.whole.superblock)) ||
         (isUnknown && hasPartitionTableTraces(image.descriptor.get()));
     contents.isMapDamaged = contents.hasPartitionMap && isMapDamaged(image);
+    contents.partitionMap = table ? table->type : "";
     for (const Partition& partition : table ? table->partitions : std::vector<Partition>())
         contents.partitions.push_back(readVolume(image, partition));
     return contents;
@@ -152,6 +153,7 @@ DiskFacts partOfImage(const OpenImage& image, const ImageVolume& volume)
 void addVolume(DiskFacts& facts, const ImageVolume& volume, std::string nameWithoutLabel)
 {
     facts.filesystem = volume.filesystem();
+    facts.filesystemVersion = volume.superblock.version;
     facts.label = volume.superblock.label;
     facts.space = volume.space;
     if (volume.superblock.isFilesystem())
@@ -198,6 +200,7 @@ DiskTree disksOfImage(const OpenImage& image, const ImageContents& contents)
     }
     top.facts.type = diskType::whole;
     top.facts.isWhole = true;
+    top.facts.partitionMap = contents.partitionMap;
     top.facts.hasDamagedMap = contents.isMapDamaged;
     for (const ImageVolume& volume : contents.partitions)
         top.children.push_back(partitionOf(image, volume));

@@ -41,6 +41,7 @@ struct ImageVolume {
 struct ImageContents {
     bool hasPartitionMap = false;  ///< also where it is damaged beyond reading
     bool isMapDamaged = false;
+    std::string partitionMap = {};  ///< its kind, as libblkid names it; empty where unreadable
     /// Of the file as a whole, where there is no partition map.
     ImageVolume whole;
     std::vector<ImageVolume> partitions;
