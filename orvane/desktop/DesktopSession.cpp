@@ -39,7 +39,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
       choices_(parts(), disks_, repairs_, jobPolicy_, [this] { overview_.explainCopying(); }),
       overview_(parts(), disks_, repairs_, choices_, undoing_),
-      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); })
+      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); }),
+      histories_(options_.paths.state / "history.sqlite3", [this] { takeInHistories(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
@@ -200,6 +201,12 @@ void DesktopSession::lockChanged(bool isLocked)
     if (isLocked)
         hints_.refresh();
     else
+        loop_.post([this] {
+            takeInHistories();
+            if (!toOpen_.empty())
+                open({});
+        });
+    if (!isLocked)
         closer_.jobEnded();
 }
 
@@ -226,11 +233,40 @@ void DesktopSession::selectionChanged()
     disks_.refresh(disks_.selected());
 }
 
+void DesktopSession::present()
+{
+    window_.setWindowState(window_.windowState() & ~Qt::WindowMinimized);
+    window_.raise();
+    window_.activateWindow();
+}
+
+// A job has the list for itself.
+void DesktopSession::open(const std::vector<std::string>& names)
+{
+    toOpen_.insert(toOpen_.end(), names.begin(), names.end());
+    if (!controller_.interfaceLock() && hasAppeared_)
+        disks_.open(std::exchange(toOpen_, {}));
+}
+
+// While a job runs, its own records are on their way; the others' are there afterwards.
+void DesktopSession::takeInHistories()
+{
+    if (controller_.interfaceLock() || !host_.historyStore().hasForeignChanges())
+        return;
+    if (host_.histories().takeInOthers())
+        tabs_.reloadLog();
+    window_.disks().synchronize();
+    update();
+}
+
 void DesktopSession::windowAppeared()
 {
     hasAppeared_ = true;
     showWarnings();
     disks_.start();
+    histories_.start();
+    if (!toOpen_.empty())
+        open({});
 }
 
 void DesktopSession::warn(const std::string& sentence)

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/desktop/DiskOverview.h"
+#include "orvane/desktop/HistoryWatch.h"
 #include "orvane/desktop/JobWatch.h"
 #include "orvane/desktop/MenuCommands.h"
 #include "orvane/desktop/ModuleHints.h"
@@ -40,6 +41,10 @@ public:
 
     /// Shows the window; disks are looked for once it is on the screen.
     void show() { window_.show(); }
+    /// Brings the window to the front.
+    void present();
+    /// Opens further disks, as the command line names them; while a job runs, when it is over.
+    void open(const std::vector<std::string>& names);
     /// Ends the program in order, unasked; a job that runs is stopped first. Asked again, the job
     /// is stopped harder.
     void end() { closer_.end(); }
@@ -65,12 +70,14 @@ private:
     void update();
     void selectionChanged();
     void windowAppeared();
+    void takeInHistories();
     void warn(const std::string& sentence);
     void showWarnings();
 
     const SessionOptions options_;
     pellar::RepairPolicy jobPolicy_;     ///< of the job at hand
     std::vector<std::string> warnings_;  ///< not shown yet
+    std::vector<std::string> toOpen_;    ///< when the job is over
     bool hasAppeared_ = false;
 
     QtLoop loop_;
@@ -91,6 +98,7 @@ private:
     RepairChoices choices_;
     DiskOverview overview_;
     MenuCommands commands_;
+    HistoryWatch histories_;
 };
 
 }  // namespace orvane::desktop

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
+#include "orvane/desktop/session/SingleInstance.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/ProgramStart.h"
 #include "orvane/support/loop/SignalReader.h"
@@ -113,18 +114,27 @@ int run(int argc, char** argv)
     if (line.exitStatus)
         return *line.exitStatus;
 
+    const SessionBuses buses = realBuses();
+    SingleInstance instance(buses.session, desktopEntry);
+    if (instance.handOver(line.names))
+        return 0;
     std::optional<ColorScheme> colors;
-    if (const auto bus = realBuses().session())
+    if (const auto bus = buses.session())
         colors.emplace(*bus);
 
     SessionOptions options;
     options.disksToOpen = line.names;
-    options.buses = realBuses();
+    options.buses = buses;
     options.closed = [] {
         QCoreApplication::exit();
     };
     DesktopSession session(std::move(options));
     termination.watch([&session] { session.end(); });
+    instance.setEvents(
+        {[&session] { session.present(); },
+         [&session](const std::vector<std::string>& names) {
+             session.open(names);
+         }});
     session.show();
     return QApplication::exec();
 }

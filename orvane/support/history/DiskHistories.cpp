@@ -283,6 +283,25 @@ void DiskHistories::saveNew()
         save(key, history, now);
 }
 
+// Only what is saved completely is let go; it is read again when it is asked for.
+bool DiskHistories::takeInOthers()
+{
+    saveNew();
+    const std::size_t others = std::erase_if(histories_, [this](const auto& entry) {
+        const auto& [key, history] = entry;
+        const std::size_t known =
+            history.savedCount +
+            (history.older ? history.older->records.size() +
+                                 static_cast<std::size_t>(history.older->left.size())
+                           : 0);
+        const bool isSaved = history.savedCount == history.records.size();
+        return isSaved && static_cast<std::size_t>(store_.recordsOf(key).size()) != known;
+    });
+    if (others > 0)
+        ++revision_;
+    return others > 0;
+}
+
 // A list that was emptied and filled again has another record where the last saved one was.
 bool DiskHistories::hasOnlyGrown(const History& history)
 {

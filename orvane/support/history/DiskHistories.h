@@ -94,6 +94,10 @@ public:
     /// nothing when there is nothing new. What cannot be saved now is tried again the next time.
     void saveNew();
 
+    /// Reads the histories anew to which another program has appended, or that it has cleared; YES
+    /// when there was one. The lists are others then.
+    bool takeInOthers();
+
     /// From now on what is cleared is remembered, and can be brought back until this object goes.
     void rememberCleared() { remembersCleared_ = true; }
     /// What is cleared from now on is brought back by itself: the user has done something else.

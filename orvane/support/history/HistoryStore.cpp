@@ -170,6 +170,20 @@ void HistoryStore::writeLate()
     }
 }
 
+// The number changes with every commit of another connection (https://sqlite.org/pragma.html,
+// data_version).
+bool HistoryStore::hasForeignChanges()
+{
+    Statement question = database_.prepare("PRAGMA data_version");
+    if (!isKept_ || !question.isPrepared() || question.step() != Statement::Step::Row)
+        return false;
+    const std::int64_t version = question.integer(0);
+    const bool isForeign = std::exchange(dataVersion_, version) != version;
+    if (isForeign)
+        ++runsRevision_;
+    return isForeign;
+}
+
 std::vector<Run> HistoryStore::runs(std::string_view key)
 {
     return tables_->runs.runs(tables_->volumes.find(key));

@@ -53,6 +53,9 @@ public:
 
     /// Grows whenever this program writes or removes a run.
     [[nodiscard]] std::uint64_t runsRevision() const { return runsRevision_; }
+    /// Whether another program has written since this was asked last, or the store was opened.
+    [[nodiscard]] bool hasForeignChanges();
+
     /// Grows when a new database had to be begun in the middle: everything is unsaved then.
     [[nodiscard]] std::uint64_t generation() const { return generation_; }
     /// NO when the histories end with the program.
@@ -103,6 +106,7 @@ private:
     bool hasWarned_ = false;
     std::uint64_t generation_ = 0;
     std::uint64_t runsRevision_ = 0;
+    std::int64_t dataVersion_ = 0;  ///< of the database, when it was asked last
     std::vector<LateRun> late_;
 };
 
