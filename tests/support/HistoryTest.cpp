@@ -346,6 +346,31 @@ TEST_F(HistoryTest, WhatAnotherProgramHoldsUpIsWrittenLater)
     EXPECT_EQ(warnings_.size(), 1U);
 }
 
+TEST_F(HistoryTest, WhatAnotherProgramAddsIsTakenIn)
+{
+    HistoryStore mine = open();
+    HistoryStore theirs = open();
+    DiskHistories histories(mine);
+    const std::string key = histories.keyOf(disk_);
+    histories.historyOf(disk_).append(line(1));
+    histories.saveNew();
+    (void)mine.hasForeignChanges();
+    EXPECT_FALSE(mine.hasForeignChanges());
+    histories.historyOf(disk_).append(line(2));
+    EXPECT_FALSE(histories.takeInOthers()) << "what is one’s own is there already";
+    EXPECT_FALSE(mine.hasForeignChanges());
+
+    ASSERT_TRUE(theirs.append(key, lines(3, 5), 0));
+    EXPECT_TRUE(mine.hasForeignChanges());
+    const std::uint64_t before = histories.revision();
+    EXPECT_TRUE(histories.takeInOthers());
+    EXPECT_NE(histories.revision(), before);
+    EXPECT_EQ(histories.historyOf(disk_).size(), 4U);
+    ASSERT_TRUE(theirs.clear(key));
+    EXPECT_TRUE(histories.takeInOthers());
+    EXPECT_EQ(histories.historyOf(disk_).size(), 0U);
+}
+
 TEST_F(HistoryTest, CopiesOfAVolumeAreNotMixed)
 {
     HistoryStore mine = open();

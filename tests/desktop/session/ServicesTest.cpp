@@ -1,12 +1,19 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/session/DesktopNotifier.h"
+#include "orvane/desktop/session/SingleInstance.h"
 #include "orvane/desktop/session/SleepInhibitor.h"
 #include "tests/desktop/session/FakeServices.h"
 #include "tests/desktop/session/PrivateBus.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
+#include <QDBusMessage>
 #include <QTest>
+
+#include <atomic>
+#include <memory>
+#include <thread>
 
 namespace orvane::desktop::test {
 namespace {
@@ -137,6 +144,42 @@ TEST_F(ServicesTest, ALockThatComesTooLateIsGivenBackAtOnce)
     awake.hold("Repairing “c”");
     EXPECT_TRUE(waitUntil([&] { return logind.asked.size() == 3 && logind.held() == 1; }))
         << "the next disk's takes the place of the first";
+}
+
+TEST_F(ServicesTest, TheSecondProgramHandsOverWhatItWasToOpen)
+{
+    int activations = 0;
+    std::vector<std::string> opened;
+    const auto first = std::make_unique<SingleInstance>(bus_.lookup("program"), "org.orvane.Test");
+    EXPECT_FALSE(first->handOver({"/a"})) << "there is nobody else";
+    first->setEvents({[&] { ++activations; },
+                      [&](const std::vector<std::string>& names) {
+                          opened.insert(opened.end(), names.begin(), names.end());
+                      }});
+    const orvane::test::TestDirectory directory;
+    const std::string hostile = directory / "a %41\xff.img";
+    directory.write("a %41\xff.img", "x");
+    std::atomic<int> answer = -1;
+    // It waits for the answer, which comes from this thread.
+    const std::jthread second([&] {
+        SingleInstance other(bus_.lookup("second"), "org.orvane.Test");
+        answer = other.handOver({hostile, "LABEL=ä"}) ? 1 : 0;
+    });
+    ASSERT_TRUE(waitUntil([&] { return answer >= 0; }));
+    EXPECT_EQ(answer, 1);
+    EXPECT_EQ(opened, (std::vector<std::string>{hostile, "LABEL=ä"}));
+    EXPECT_EQ(activations, 1);
+
+    QDBusMessage open = QDBusMessage::createMethodCall(
+        QStringLiteral("org.orvane.Test"), QStringLiteral("/org/orvane/Test"),
+        QStringLiteral("org.freedesktop.Application"), QStringLiteral("Open"));
+    open << QStringList{QStringLiteral("file:///b%20c"), QStringLiteral("http://d/")}
+         << QVariantMap();
+    bus_.connection("server").send(open);
+    EXPECT_TRUE(waitUntil([&] { return opened.size() == 3; }));
+    EXPECT_EQ(opened.back(), "/b c") << "as file managers ask for it; and nothing from elsewhere";
+    SingleInstance nowhere(SessionBuses().session, "org.orvane.Test");
+    EXPECT_FALSE(nowhere.handOver({}));
 }
 
 }  // namespace
