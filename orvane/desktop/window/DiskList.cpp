@@ -86,7 +86,12 @@ public:
         draw(taken, text);
     }
 
-    void drawInTheRest(const QString& text) { draw(left_, text); }
+    bool hasRoomFor(const QString& text) const { return widthOf(text) <= left_.width(); }
+
+    void drawInTheRest(const QString& text, Qt::TextElideMode elision = Qt::ElideMiddle)
+    {
+        draw(left_, text, elision);
+    }
 
     void useFont(const QFont& font, const QColor& color)
     {
@@ -115,14 +120,15 @@ private:
         return QStyle::visualRect(option_.direction, option_.rect, rect);
     }
 
-    void draw(const QRect& rect, const QString& text)
+    void draw(const QRect& rect, const QString& text,
+              Qt::TextElideMode elision = Qt::ElideMiddle)
     {
         // An ellipsis and a letter say nothing.
         const int least = painter_.fontMetrics().averageCharWidth() * 3;
         if (rect.width() < std::min(least, widthOf(text)))
             return;
         const QString shown =
-            painter_.fontMetrics().elidedText(text, Qt::ElideMiddle, rect.width());
+            painter_.fontMetrics().elidedText(text, elision, rect.width());
         painter_.drawText(visual(rect),
                           Qt::AlignVCenter | Qt::TextSingleLine |
                               QStyle::visualAlignment(option_.direction, Qt::AlignLeft),
@@ -240,7 +246,11 @@ void DiskDelegate::drawDisk(QPainter& painter, const QStyleOptionViewItem& optio
     line.setBottom(rest.bottom());
     row.setLine(line, detailFont(option.font), faint);
     row.drawAtEnd(cell(index, DiskColumn::LastCheck).toString());
-    row.drawInTheRest(index.data(DiskTreeModel::DetailsRole).toString());
+    const QString details = index.data(DiskTreeModel::DetailsRole).toString();
+    row.drawInTheRest(row.hasRoomFor(details)
+                          ? details
+                          : index.data(DiskTreeModel::ShortDetailsRole).toString(),
+                      Qt::ElideRight);
     drawProgress(painter, option, index.data(DiskTreeModel::PercentRole).toDouble());
 }
 
