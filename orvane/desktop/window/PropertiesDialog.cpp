@@ -56,7 +56,7 @@ QTextEdit* makeText(const ShownProperties& shown, const QString& name, QWidget* 
     fill(*text->document(), shown.properties, text->palette());
     // Into the table: what lies before it is an empty line.
     text->moveCursor(QTextCursor::Start);
-    text->moveCursor(QTextCursor::NextCell);
+    text->moveCursor(QTextCursor::NextBlock);
     return text;
 }
 
