@@ -39,7 +39,14 @@ DesktopSession::DesktopSession(SessionOptions options)
       undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
       choices_(parts(), disks_, repairs_, jobPolicy_, [this] { overview_.explainCopying(); }),
       overview_(parts(), disks_, repairs_, choices_, undoing_),
-      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); }),
+      files_(options_.buses.session,
+             {options_.openDirectory,
+              [this] {
+                  host_.showSheet("",
+                                  {host_.translator().text("No file manager could be started.")});
+              }}),
+      diskCommands_(parts(), disks_, library_, choices_, undoing_, files_, [this] { update(); }),
+      commands_(parts(), disks_, diskCommands_, [this] { update(); }),
       histories_(options_.paths.state / "history.sqlite3", [this] { takeInHistories(); })
 {
     host_.setWindow(&window_);

@@ -11,6 +11,8 @@
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleSearch.h"
 
+#include <QDesktopServices>
+
 #include <chrono>
 #include <functional>
 #include <string>
@@ -27,6 +29,8 @@ struct SessionOptions {
     pellar::OutputLimits outputLimits;
     SessionBuses buses;
     std::chrono::milliseconds longestGlanceAway = desktop::longestGlanceAway;
+    /// Opens a directory where no file manager answers on the bus.
+    std::function<bool(const QUrl& directory)> openDirectory = QDesktopServices::openUrl;
     std::function<void()> closed;  ///< the window is closed for good
 };
 
@@ -97,6 +101,8 @@ private:
     RepairUndoing undoing_;
     RepairChoices choices_;
     DiskOverview overview_;
+    FileManager files_;
+    DiskCommands diskCommands_;
     MenuCommands commands_;
     HistoryWatch histories_;
 };

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DiskPane.h"
 
+#include "contract/foundation/UTF8.h"
 #include "orvane/support/settings/XDGPaths.h"
 
 #include <algorithm>
@@ -23,16 +24,6 @@ std::vector<DiskTree> readDisks(DiskReader& reader)
     return reader.read(sources);
 }
 
-Check checkOf(const Run& run)
-{
-    const auto started =
-        std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
-    const RunEnd end = run.end.value_or(RunEnd{});
-    return {run.verdict(), end.message,    QDateTime::fromMSecsSinceEpoch(started.count()),
-            run.action,    end.errorCode, end.problems,
-            end.problemKinds};
-}
-
 std::string_view activityIn(pellar::Operation operation)
 {
     switch (operation) {
@@ -45,6 +36,16 @@ std::string_view activityIn(pellar::Operation operation)
 }
 
 }  // namespace
+
+Check checkOf(const Run& run)
+{
+    const auto started =
+        std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
+    const RunEnd end = run.end.value_or(RunEnd{});
+    return {run.verdict(), end.message,   QDateTime::fromMSecsSinceEpoch(started.count()),
+            run.action,    end.errorCode, end.problems,
+            end.problemKinds};
+}
 
 void DiskScan::start()
 {
@@ -84,11 +85,16 @@ DiskPane::DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const Job
       scansSystemDisks_(scansSystemDisks),
       events_(std::move(events)),
       model_(host.sharedDiskController(), states(), host.translator()),
-      images_(host, {[this](const Disk& disk) { list_.select(disk); },
-                     [this](const std::vector<std::string>& sentences) {
-                         host_.showSheet(host_.translator().text("Not everything could be opened."),
-                                         sentences);
+      recent_(host.standardUserDefaults()),
+      images_(host, {[this](const Disk& disk) {
+                         if (!isReopening_)
+                             list_.select(disk);
                      },
+                     [this](const std::string& image) {
+                         if (!isReopening_)
+                             recent_.add(image);
+                     },
+                     [this](const std::vector<std::string>& sentences) { tellFailures(sentences); },
                      [this] {
                          synchronize();
                      }}),
@@ -110,7 +116,15 @@ DiskPane::~DiskPane()
 void DiskPane::synchronize()
 {
     list_.synchronize();
+    // Before the start, what was open when the program ended is still wanted.
+    if (hasStarted_)
+        recent_.keepOpen(images_.openImages());
     events_.changed();
+}
+
+void DiskPane::tellFailures(const std::vector<std::string>& sentences)
+{
+    host_.showSheet(host_.translator().text("Not everything could be opened."), sentences);
 }
 
 // Watched before they are read, so that nothing is missed in between. Without the watch the
@@ -123,6 +137,10 @@ void DiskPane::start()
         list_.setLooking(true);
         scan_.start();
     }
+    isReopening_ = true;
+    images_.open(recent_.toReopen());
+    isReopening_ = false;
+    hasStarted_ = true;
     openNamed(true);
     if (!scansSystemDisks_)
         openNamed(false);
@@ -190,7 +208,7 @@ void DiskPane::release()
     }
     const auto disks = selected();
     const bool mayHaveWritten = std::any_of(
-        disks.begin(), disks.end(), [](const auto& disk) { return !ImageOpener::canEject(*disk); });
+        disks.begin(), disks.end(), [](const auto& disk) { return !ImageOpener::canClose(*disk); });
     // A label or a size may be another one, and no event need have told what a repair has written.
     if (mayHaveWritten && scansSystemDisks_)
         scan_.start();
@@ -245,12 +263,24 @@ std::vector<DiskRequest> DiskPane::requestsFor(DiskAction action) const
     return requests;
 }
 
-bool DiskPane::canDo(DiskAction action) const
+std::string DiskPane::reasonAgainst(DiskAction action) const
 {
+    const Translator& texts = host_.translator();
     const auto disks = selected();
-    const bool holdsImage = std::any_of(
-        disks.begin(), disks.end(), [](const auto& disk) { return ImageOpener::canEject(*disk); });
-    return (action == DiskAction::Eject && holdsImage) || !requestsFor(action).empty();
+    if (disks.empty())
+        return texts.text("Select a disk first.");
+    if (!requestsFor(action).empty())
+        return {};
+    const Disk& disk = *disks.front();
+    const auto objection = objectionTo(action, disk);
+    if (!objection)
+        return texts.text("Not available while the disk is mounted, unmounted or ejected.");
+    if (objection->kind == Refusal::Kind::AlreadySo)
+        return texts.text(action == DiskAction::Mount ? "It is mounted already."
+                                                      : "It is not mounted.");
+    if (action == DiskAction::Eject && ImageOpener::canClose(disk))
+        return texts.text("It is an image file; close it instead.");
+    return texts.sentence("Not available: %@.", {reasonText(*objection, texts)});
 }
 
 // The list follows by itself; read anew all the same, for where the system cannot be watched.
@@ -276,9 +306,44 @@ void DiskPane::doToSelection(DiskAction action)
 {
     if (auto requests = requestsFor(action); !requests.empty())
         carryOut(std::move(requests));
-    if (action == DiskAction::Eject)
-        for (const auto& disk : selected())
-            images_.eject(*disk);
+}
+
+std::vector<std::string> DiskPane::selectedImages() const
+{
+    std::vector<std::string> images;
+    for (const auto& disk : selected())
+        if (const std::string image = disk->facts().path;
+            ImageOpener::canClose(*disk) && std::ranges::count(images, image) == 0)
+            images.push_back(image);
+    return images;
+}
+
+void DiskPane::closeSelectedImages()
+{
+    for (const auto& disk : selected())
+        images_.close(*disk);
+}
+
+std::vector<std::string> DiskPane::recentImages() const
+{
+    const auto open = images_.openImages();
+    auto images = recent_.files();
+    std::erase_if(images, [&](const std::string& image) {
+        return std::ranges::count(open, image) != 0;
+    });
+    return images;
+}
+
+void DiskPane::openRecent(const std::string& image)
+{
+    std::error_code error;
+    if (std::filesystem::exists(image, error) || error) {
+        open({image});
+        return;
+    }
+    recent_.remove(image);
+    tellFailures({host_.translator().sentence(
+        "“%@” is not there any more. It is no longer offered.", {contract::printable(image)})});
 }
 
 }  // namespace orvane::desktop

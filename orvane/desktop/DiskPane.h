@@ -4,6 +4,7 @@
 #include "orvane/desktop/DesktopHost.h"
 #include "orvane/desktop/ImageOpener.h"
 #include "orvane/desktop/KeptRepairs.h"
+#include "orvane/desktop/RecentImages.h"
 #include "orvane/desktop/window/DiskList.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskWatch.h"
@@ -16,6 +17,9 @@
 #include <vector>
 
 namespace orvane::desktop {
+
+/// A run of the history, as the list shows it.
+[[nodiscard]] Check checkOf(const Run& run);
 
 /// Reads the system's disks in a thread of its own, because a sleeping drive lets its reader wait
 /// for seconds. Main thread.
@@ -70,7 +74,16 @@ public:
     /// Looks for disks from now on, and opens those that were named.
     void start();
     void open(const std::vector<std::string>& names) { images_.open(names); }
+    /// Opens an image that was opened before; where it has gone, that is said, and it is forgotten.
+    void openRecent(const std::string& image);
+    /// Those that are not open now.
+    std::vector<std::string> recentImages() const;
+    void forgetRecentImages() { recent_.clear(); }
     void attachAsDevices(const std::vector<std::string>& images);
+    /// Takes the images that are selected, or that what is selected lies in, from the list.
+    void closeSelectedImages();
+    /// Those images, each once.
+    std::vector<std::string> selectedImages() const;
     /// Reads everything anew.
     void rescan();
     /// Reads those of the disks anew that are images.
@@ -82,7 +95,9 @@ public:
     bool selectOnly(const Disk& disk);
     DiskList& list() { return list_; }
 
-    bool canDo(DiskAction action) const;
+    /// Why nothing that is selected can be treated so, in the user's language; empty when
+    /// something can.
+    std::string reasonAgainst(DiskAction action) const;
     void doToSelection(DiskAction action);
 
     /// Until `release`, the selected disks and the others stay listed, whatever becomes of them.
@@ -96,6 +111,7 @@ private:
     std::string noteOn(const Disk& disk);
     void adoptDisks(const std::vector<DiskTree>& disks);
     void openNamed(bool areFiles);
+    void tellFailures(const std::vector<std::string>& sentences);
     void synchronize();
     std::vector<DiskRequest> requestsFor(DiskAction action) const;
     void carryOut(std::vector<DiskRequest> requests);
@@ -109,7 +125,10 @@ private:
     const Events events_;
     bool hasReadDisks_ = false;
     DiskTreeModel model_;
+    RecentImages recent_;
     ImageOpener images_;
+    bool isReopening_ = false;
+    bool hasStarted_ = false;
     DiskScan scan_;
     DiskWatch watch_;
 };

@@ -33,13 +33,24 @@ void ImageOpener::open(const std::vector<std::string>& names)
         const auto& disk = *found;
         if (!first)
             first = disk;
-        if (disk->isOfflineDiskImage())
+        if (disk->isOfflineDiskImage()) {
             read(disk->facts().imagePath);
+            events_.imageOpened(disk->facts().imagePath);
+        }
     }
     if (first)
         events_.opened(*first);
     if (!failures.empty())
         events_.failed(failures);
+}
+
+std::vector<std::string> ImageOpener::openImages() const
+{
+    std::vector<std::string> images;
+    for (const DiskPointer& root : host_.sharedDiskController().roots())
+        if (root->isOfflineDiskImage())
+            images.push_back(root->facts().imagePath);
+    return images;
 }
 
 // Not on the host's workers, which report in their order: a slow image would keep a job waiting
@@ -93,7 +104,7 @@ bool ImageOpener::isOpen(const std::filesystem::path& image) const
 
 void ImageOpener::refresh(const Disk& disk)
 {
-    if (canEject(disk) && isOpen(disk.facts().path))
+    if (canClose(disk) && isOpen(disk.facts().path))
         read(disk.facts().path);
 }
 
@@ -120,14 +131,14 @@ std::string ImageOpener::noteOn(const Disk& disk) const
                                     : texts.sentence("it is attached as %@", {known.loopDevice});
 }
 
-bool ImageOpener::canEject(const Disk& disk)
+bool ImageOpener::canClose(const Disk& disk)
 {
     return disk.facts().storage == contract::DiskReference::Storage::FileRegion;
 }
 
-void ImageOpener::eject(const Disk& disk)
+void ImageOpener::close(const Disk& disk)
 {
-    if (!canEject(disk))
+    if (!canClose(disk))
         return;
     const std::filesystem::path image = disk.facts().path;
     known_.erase(image);
@@ -136,7 +147,7 @@ void ImageOpener::eject(const Disk& disk)
     // What is in the image goes before the image.
     for (const bool isImage : {false, true})
         for (const DiskPointer& root : roots)
-            if (canEject(*root) && root->isOfflineDiskImage() == isImage &&
+            if (canClose(*root) && root->isOfflineDiskImage() == isImage &&
                 root->facts().path == image)
                 disks.ejectDisk(root, true);
 }

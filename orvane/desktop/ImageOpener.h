@@ -22,6 +22,8 @@ public:
     struct Events {
         /// The first of the disks that were opened together.
         std::function<void(const Disk& disk)> opened;
+        /// An image came into the list.
+        std::function<void(const std::string& image)> imageOpened;
         /// One sentence for each that could not be opened.
         std::function<void(const std::vector<std::string>& sentences)> failed;
         /// Something else is known about an image.
@@ -38,15 +40,17 @@ public:
     /// Image files, or anything else that names a disk (orvane/support/disks/DiskLookup.h). What
     /// an image holds is read behind the window's back, and appears when it is known.
     void open(const std::vector<std::string>& names);
+    /// The files of the images that are open, in the list's order.
+    std::vector<std::string> openImages() const;
     /// Reads an open image again: it may have gone, or hold something else by now. Other disks are
     /// left alone.
     void refresh(const Disk& disk);
     void refreshAll();
 
     /// YES for an image file and for what is in one.
-    static bool canEject(const Disk& disk);
+    static bool canClose(const Disk& disk);
     /// Forgets the image that the disk is, or lies in. The file and its history stay.
-    void eject(const Disk& disk);
+    void close(const Disk& disk);
 
     /// What is out of the ordinary about an open image, in a few words of the user's language: it
     /// cannot be read, is a device as well, or its partition map is damaged. Mostly empty.

@@ -43,66 +43,46 @@ void MenuCommands::addMenus()
         &list, &QWidget::customContextMenuRequested, &at_.window,
         [&list, menu = at_.window.menuBar()->findChild<QMenu*>(QLatin1String(diskMenu))](
             const QPoint& place) { menu->popup(list.viewport()->mapToGlobal(place)); });
+    list.events().opened = [this] {
+        diskCommands_.showProperties();
+    };
+    list.events().openImage = [this] {
+        if (!isLocked())
+            openImages();
+    };
 }
 
 void MenuCommands::fillBar()
 {
-    const auto action = [this](const char* objectName, std::string_view title,
-                               std::string_view button) {
-        return MenuCommand{.objectName = objectName,
-                           .title = title,
-                           .shortcut = shortcutOf(button),
-                           .perform = [this, button] { at_.tabs.button(button)->press(); },
-                           .reasonAgainst = [this, button] { return reasonAgainstButton(button); }};
-    };
-    const auto stop = MenuCommand{
-        .objectName = "barStop",
-        .title = "Stop",
-        .shortcut = {},
-        .perform = [this] { at_.tabs.stopJob(); },
-        .reasonAgainst = [this] { return isLocked() ? "" : text("No job runs."); }};
     const auto open = MenuCommand{.objectName = "barOpen",
                                   .title = "Open Image…",
                                   .shortcut = QKeySequence::Open,
                                   .perform = [this] { openImages(); },
                                   .isAvailable = [this] { return !isLocked(); }};
-    auto preview = previewCommand();
+    auto verify = diskCommands_.button("barVerify", "Verify", outlet::verifyDisk);
+    verify.shortcut = verify.shownShortcut;
+    auto repair = diskCommands_.button("barRepair", "Repair", outlet::repairDisk);
+    repair.shortcut = repair.shownShortcut;
+    auto preview = diskCommands_.preview();
     preview.objectName = "barPreview";
     preview.title = "Preview";
-    auto undo = undoCommand("barUndo", "Undo", pellar::Operation::Undo);
+    auto stop = diskCommands_.stop("barStop", "Stop");
+    stop.shortcut = DiskCommands::stopShortcut();
     at_.window.commands().add(
-        {{action("barVerify", "Verify", outlet::verifyDisk), Symbol::Verify, true},
-         {action("barRepair", "Repair", outlet::repairDisk), Symbol::Repair},
+        {{std::move(verify), Symbol::Verify, true},
+         {std::move(repair), Symbol::Repair},
          {std::move(preview), Symbol::Preview},
-         {std::move(undo), Symbol::Undo},
-         {stop, Symbol::Stop},
+         {diskCommands_.undo("barUndo", "Undo", pellar::Operation::Undo), Symbol::Undo},
+         {std::move(stop), Symbol::Stop},
          {open, Symbol::Open, false, true}});
-}
-
-QKeySequence MenuCommands::shortcutOf(std::string_view button)
-{
-    const QtButton* const control = at_.tabs.button(button);
-    return control != nullptr ? control->widget().shortcut() : QKeySequence();
-}
-
-std::string MenuCommands::reasonAgainstButton(std::string_view button)
-{
-    const QtButton* const control = at_.tabs.button(button);
-    if (control == nullptr)
-        return text("Not available for this disk.");
-    if (isLocked())
-        return text("Not available while a job runs.");
-    if (control->isEnabled())
-        return {};
-    return control->reason().empty() ? text("Not available for this disk.") : control->reason();
 }
 
 std::vector<Menu> MenuCommands::menus()
 {
     return {{"&File", fileCommands()},
             {"&Edit", editCommands()},
-            {"Dis&k", diskCommands(), diskMenu},
-            {"&View", {detailsCommand()}},
+            {"Dis&k", diskCommands_.all(), diskMenu},
+            {"&View", viewCommands()},
             {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
                             at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
                         }}}}};
@@ -120,13 +100,15 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
     const auto canPrint = [this] {
         return at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
     };
+    // The Disk menu has the key.
+    MenuCommand closing = diskCommands_.closeImage("closeImageInFile");
+    closing.shownShortcut = DiskCommands::closeShortcut();
     return {
         {"openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }, isFree},
+        recentCommand(),
+        std::move(closing),
         {"attachImage", "&Attach Image as Device…", {}, attach, isFree},
         {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }, isFree},
-        diskCommand("mount", "&Mount", QKeySequence(Qt::CTRL | Qt::Key_M), DiskAction::Mount),
-        diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U), DiskAction::Unmount),
-        diskCommand("eject", "&Eject", QKeySequence(Qt::CTRL | Qt::Key_E), DiskAction::Eject),
         line,
         {"print", "&Print…", QKeySequence::Print, [this] { print(); }, canPrint},
         line,
@@ -167,41 +149,39 @@ std::vector<MenuCommand> MenuCommands::editCommands()
                        verifiesThoroughlyKey)};
 }
 
-std::vector<MenuCommand> MenuCommands::diskCommands()
+MenuCommand MenuCommands::recentCommand()
 {
-    return {buttonCommand("verifyDisk", "&Verify Disk", outlet::verifyDisk),
-            buttonCommand("repairDisk", "&Repair Disk", outlet::repairDisk),
-            previewCommand(),
-            line,
-            undoCommand("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
-            undoCommand("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
-            undoCommand("undoPermissions", "Undo Permi&ssions Repair…", pellar::Operation::Undo,
-                        RepairUndoing::Scope::Permissions),
-            line,
-            mapCommand("verifyMap", "Verify Partition &Map", outlet::verifyDisk),
-            mapCommand("repairMap", "Repair &Partition Map", outlet::repairDisk)};
+    return {.objectName = "openRecent",
+            .title = "Open Recen&t",
+            .shortcut = {},
+            .perform = {},
+            .reasonAgainst = [this] {
+                if (isLocked())
+                    return text("Not available while a job runs.");
+                return disks_.recentImages().empty() ? text("No other image was opened before.")
+                                                     : "";
+            },
+            .fill = [this](QMenu& menu) { fillRecent(menu); }};
 }
 
-MenuCommand MenuCommands::previewCommand()
+// The number in front is the key to press; the tenth has the last digit.
+void MenuCommands::fillRecent(QMenu& menu)
 {
-    return {.objectName = "previewRepair",
-            .title = "Previe&w Repair",
-            .shortcut = {},
-            .perform = [this] { choices_.preview(); },
-            .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }};
-}
-
-MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view title,
-                                      pellar::Operation operation, RepairUndoing::Scope scope)
-{
-    return {.objectName = objectName,
-            .title = title,
-            .shortcut = {},
-            .perform = [this, operation, scope] { undoing_.ask(operation, scope); },
-            .reasonAgainst =
-                [this, operation, scope] {
-                    return undoing_.reasonAgainst(operation, scope);
-                }};
+    int number = 0;
+    for (const std::string& image : disks_.recentImages()) {
+        const QString name = toQtLine(std::filesystem::path(image).filename().native());
+        const QString digit = QString::number(++number % 10);
+        QAction* const action = menu.addAction(QLatin1Char('&') + digit + QLatin1Char(' ') +
+                                               toQtTitle(fromQt(name)));
+        action->setToolTip(toQtToolTip(image));
+        QObject::connect(action, &QAction::triggered, &at_.window,
+                         [this, image] { disks_.openRecent(image); });
+    }
+    menu.addSeparator();
+    QAction* const clear = menu.addAction(toQt(text("C&lear This List")));
+    clear->setObjectName(QStringLiteral("clearRecent"));
+    QObject::connect(clear, &QAction::triggered, &at_.window,
+                     [this] { disks_.forgetRecentImages(); });
 }
 
 MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,
@@ -216,55 +196,22 @@ MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_vie
     return {objectName, title, {}, change, {}, isOn};
 }
 
-MenuCommand MenuCommands::detailsCommand()
+std::vector<MenuCommand> MenuCommands::viewCommands()
 {
     const auto button = [this] {
         return at_.tabs.button(outlet::showDetails);
     };
-    return {"showDetails",
-            "Show &Details",
-            QKeySequence(Qt::CTRL | Qt::Key_D),
-            [button] { button()->press(); },
-            [button] { return button() != nullptr && button()->isEnabled(); },
-            [button] {
-                return button() != nullptr && button()->isChecked();
-            }};
-}
-
-MenuCommand MenuCommands::diskCommand(const char* objectName, std::string_view title,
-                                      QKeySequence shortcut, DiskAction action)
-{
-    // While a job runs, the disks are its own.
-    return {objectName, title, std::move(shortcut),
-            [this, action] { disks_.doToSelection(action); },
-            [this, action] {
-                return !isLocked() && disks_.canDo(action);
-            }};
-}
-
-MenuCommand MenuCommands::buttonCommand(const char* objectName, std::string_view title,
-                                        std::string_view button)
-{
-    return {objectName,
-            title,
-            {},
-            [this, button] { at_.tabs.button(button)->press(); },
-            [this, button] {
-                const QtButton* const control = at_.tabs.button(button);
-                return !isLocked() && control != nullptr && control->isEnabled();
-            }};
-}
-
-MenuCommand MenuCommands::mapCommand(const char* objectName, std::string_view title,
-                                     std::string_view button)
-{
-    return {objectName,
-            title,
-            {},
-            [this, button] { treatMap(button); },
-            [this] {
-                return diskWithMap() != nullptr;
-            }};
+    return {{"showDetails",
+             "Show &Details",
+             QKeySequence(Qt::CTRL | Qt::Key_D),
+             [button] { button()->press(); },
+             [button] { return button() != nullptr && button()->isEnabled(); },
+             [button] {
+                 return button() != nullptr && button()->isChecked();
+             }},
+            {"filterDisks", "&Filter Disks", QKeySequence(Qt::CTRL | Qt::Key_L), [this] {
+                 at_.window.diskPanel().search();
+             }}};
 }
 
 void MenuCommands::openImages()
@@ -331,33 +278,6 @@ void MenuCommands::undoClearing()
 {
     at_.host.histories().restoreCleared();
     disks_.list().synchronize();
-    update_();
-}
-
-// The whole disk that is selected, or that is in the selected image, where a map can be treated.
-std::shared_ptr<Disk> MenuCommands::diskWithMap()
-{
-    const auto disks = disks_.selected();
-    if (disks.size() != 1 || isLocked() || at_.tabs.active() == nullptr)
-        return nullptr;
-    const auto whole =
-        disks.front()->isOfflineDiskImage() ? disks.front()->contents() : disks.front();
-    const bool hasMap = whole && whole->isWhole() && !whole->hasGone() &&
-                        library_.reasonAgainstPartitionMap(*whole->theKRDisk()).empty();
-    return hasMap ? whole : nullptr;
-}
-
-// The module takes the map of what is selected as a whole disk, as it does with a device; of an
-// image it takes the volumes.
-void MenuCommands::treatMap(std::string_view button)
-{
-    at_.controller.setSelection({diskWithMap()});
-    at_.tabs.active()->tellOfSelection();
-    if (QtButton* const control = at_.tabs.button(button))
-        control->press();
-    if (isLocked())
-        return;  // until the job is over
-    at_.controller.setSelection({});
     update_();
 }
 

@@ -137,6 +137,7 @@ void WindowFixture::select(const std::string& image)
 {
     const QModelIndex index = row(image);
     ASSERT_TRUE(index.isValid()) << image;
+    window().disks().scrollTo(index);
     QTest::mouseClick(window().disks().viewport(), Qt::LeftButton, {},
                       window().disks().visualRect(index).center());
 }

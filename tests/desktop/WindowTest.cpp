@@ -137,7 +137,7 @@ TEST_F(WindowTest, AnImageWithPartitionsShowsItsVolumes)
     EXPECT_EQ(verdict(volume), "sound");
     EXPECT_EQ(disks.rowCount(disks.index(0, 0)), 2) << "they stay after the job";
 
-    command("eject").trigger();
+    command("closeImage").trigger();
     // A disk of a job keeps its place until the job is over in every respect.
     EXPECT_TRUE(waitUntil([&disks] { return disks.rowCount() == 0; }));
     EXPECT_FALSE(button("verifyDiskButton").isEnabled()) << "nothing is selected any more";

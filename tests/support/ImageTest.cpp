@@ -69,11 +69,15 @@ TEST(ImageDisks, FormatsAreCalledAsPeopleCallThem)
         const DiskFacts facts = disksIn(image).facts;
         return formatName(facts.filesystem, facts.filesystemVersion);
     };
-    for (const auto& [bits, name] :
-         {std::pair("12", "FAT12"), std::pair("16", "FAT16"), std::pair("32", "FAT32")}) {
-        prepareWith({"mkfs.fat", "-s", bits == std::string("12") ? "64" : "1", "-F", bits,
-                     image.native()});
-        EXPECT_EQ(format(), name);
+    struct FAT {
+        const char* bits;
+        const char* sectorsPerCluster;
+        const char* name;
+    };
+    for (const FAT& fat :
+         {FAT{"12", "64", "FAT12"}, FAT{"16", "8", "FAT16"}, FAT{"32", "1", "FAT32"}}) {
+        prepareWith({"mkfs.fat", "-s", fat.sectorsPerCluster, "-F", fat.bits, image.native()});
+        EXPECT_EQ(format(), fat.name);
     }
     makeExt(image, 0, 64 * mebibyte, "");
     EXPECT_EQ(format(), "ext4");

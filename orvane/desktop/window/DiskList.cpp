@@ -6,6 +6,7 @@
 #include "orvane/desktop/window/DiskRow.h"
 
 #include <QApplication>
+#include <QHeaderView>
 #include <QKeyEvent>
 #include <QPainter>
 #include <QStyledItemDelegate>
@@ -54,6 +55,8 @@ public:
     RowPainter(QPainter& painter, const QStyleOptionViewItem& option)
         : painter_(painter), option_(option)
     {
+        // Names, devices and times are read in their own direction.
+        painter.setLayoutDirection(Qt::LayoutDirectionAuto);
     }
 
     void setLine(const QRect& line, const QFont& font, const QColor& color)
@@ -67,7 +70,7 @@ public:
     {
         if (!text.isEmpty())
             draw(takeFromEnd(std::min(widthOf(text), static_cast<int>(left_.width() * share))),
-                 text);
+                 text, Qt::ElideRight);
     }
 
     void drawAtEnd(const QIcon& icon)
@@ -86,7 +89,12 @@ public:
         draw(taken, text);
     }
 
-    void drawInTheRest(const QString& text) { draw(left_, text); }
+    bool hasRoomFor(const QString& text) const { return widthOf(text) <= left_.width(); }
+
+    void drawInTheRest(const QString& text, Qt::TextElideMode elision = Qt::ElideMiddle)
+    {
+        draw(left_, text, elision);
+    }
 
     void useFont(const QFont& font, const QColor& color)
     {
@@ -115,14 +123,15 @@ private:
         return QStyle::visualRect(option_.direction, option_.rect, rect);
     }
 
-    void draw(const QRect& rect, const QString& text)
+    void draw(const QRect& rect, const QString& text,
+              Qt::TextElideMode elision = Qt::ElideMiddle)
     {
         // An ellipsis and a letter say nothing.
         const int least = painter_.fontMetrics().averageCharWidth() * 3;
         if (rect.width() < std::min(least, widthOf(text)))
             return;
         const QString shown =
-            painter_.fontMetrics().elidedText(text, Qt::ElideMiddle, rect.width());
+            painter_.fontMetrics().elidedText(text, elision, rect.width());
         painter_.drawText(visual(rect),
                           Qt::AlignVCenter | Qt::TextSingleLine |
                               QStyle::visualAlignment(option_.direction, Qt::AlignLeft),
@@ -139,18 +148,29 @@ QVariant cell(const QModelIndex& index, DiskColumn column, int role = Qt::Displa
     return index.siblingAtColumn(static_cast<int>(column)).data(role);
 }
 
-/// A thin line along the lower edge of the row.
-void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, double percent)
+/// A thin bar below the lines of the row, on a track that shows how far there is to go.
+void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, const QRect& lines,
+                  double percent)
 {
     if (percent <= 0)
         return;
-    QRect line = option.rect;
-    line.setTop(line.bottom() - progressHeight + 1);
-    line.setWidth(static_cast<int>(line.width() * percent / 100));
     const bool isSelected = option.state.testFlag(QStyle::State_Selected);
-    painter.fillRect(QStyle::visualRect(option.direction, option.rect, line),
-                     option.palette.color(isSelected ? QPalette::HighlightedText
-                                                     : QPalette::Highlight));
+    QRect track = lines;
+    track.setTop(lines.bottom());
+    track.setHeight(progressHeight);
+    QRect done = track;
+    done.setWidth(static_cast<int>(track.width() * percent / 100));
+    QColor quiet = textColor(option);
+    quiet.setAlphaF(0.2F);
+    const auto draw = [&](const QRect& bar, const QColor& color) {
+        painter.setBrush(color);
+        painter.drawRoundedRect(QStyle::visualRect(option.direction, option.rect, bar),
+                                progressHeight / 2.0, progressHeight / 2.0);
+    };
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.setPen(Qt::NoPen);
+    draw(track, quiet);
+    draw(done, option.palette.color(isSelected ? QPalette::HighlightedText : QPalette::Highlight));
 }
 
 /// Around the row that the keys act on.
@@ -240,8 +260,13 @@ void DiskDelegate::drawDisk(QPainter& painter, const QStyleOptionViewItem& optio
     line.setBottom(rest.bottom());
     row.setLine(line, detailFont(option.font), faint);
     row.drawAtEnd(cell(index, DiskColumn::LastCheck).toString());
-    row.drawInTheRest(index.data(DiskTreeModel::DetailsRole).toString());
-    drawProgress(painter, option, index.data(DiskTreeModel::PercentRole).toDouble());
+    const QString details = index.data(DiskTreeModel::DetailsRole).toString();
+    row.drawInTheRest(row.hasRoomFor(details)
+                          ? details
+                          : index.data(DiskTreeModel::ShortDetailsRole).toString(),
+                      Qt::ElideRight);
+    drawProgress(painter, option, rest,
+                 index.data(DiskTreeModel::PercentRole).toDouble());
 }
 
 QSize DiskDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const
@@ -263,6 +288,7 @@ DiskList::DiskList(const Translator& texts, QWidget* parent)
     setEditTriggers(NoEditTriggers);
     setExpandsOnDoubleClick(false);
     setHeaderHidden(true);
+    setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
     setFrameShape(NoFrame);
     setItemDelegate(new DiskDelegate(this));
     connect(this, &QAbstractItemView::doubleClicked, this, [this] {
@@ -278,6 +304,8 @@ void DiskList::show(DiskTreeModel& disks, std::function<void()> selectionChanged
     // The others are drawn in the first one.
     for (int column = 1; column < diskColumnCount; ++column)
         setColumnHidden(column, true);
+    header()->setMinimumSectionSize(0);
+    header()->setSectionResizeMode(0, QHeaderView::Stretch);
     // Volumes are what the user is here for.
     connect(&disks, &QAbstractItemModel::rowsInserted, this,
             [this](const QModelIndex& parent) { setExpanded(parent, true); });

@@ -54,6 +54,7 @@ DiskPanel::DiskPanel(const Translator& texts, QWidget* parent)
     rows->addLayout(above);
     rows->addWidget(list_, 1);
     setFocusProxy(list_);
+    adoptFont();
 }
 
 void DiskPanel::search()
@@ -61,6 +62,20 @@ void DiskPanel::search()
     field_->show();
     field_->setFocus(Qt::ShortcutFocusReason);
     field_->selectAll();
+}
+
+void DiskPanel::changeEvent(QEvent* event)
+{
+    QWidget::changeEvent(event);
+    if (event->type() == QEvent::FontChange)
+        adoptFont();
+}
+
+// What is beside it may not press it to where no name can be read.
+void DiskPanel::adoptFont()
+{
+    constexpr int fewestCharacters = 20;
+    setMinimumWidth(fontMetrics().averageCharWidth() * fewestCharacters);
 }
 
 void DiskPanel::setCompact(bool isCompact)

@@ -23,9 +23,11 @@ public:
     void setCompact(bool isCompact);
 
 protected:
+    void changeEvent(QEvent* event) override;
     bool eventFilter(QObject* watched, QEvent* event) override;
 
 private:
+    void adoptFont();
     void adoptRoom();
     void leave();
 

@@ -274,7 +274,7 @@ QString columnTitle(DiskColumn column, const Translator& texts)
     return {};
 }
 
-QString rowDetails(const DiskRow& row, const Translator& texts)
+QString rowDetails(const DiskRow& row, const Translator& texts, bool isShort)
 {
     // There is room for a few words.
     if (!row.note.empty())
@@ -283,9 +283,16 @@ QString rowDetails(const DiskRow& row, const Translator& texts)
     if (row.facts.length != 0)
         parts += sizeText(row.facts.length);
     if (!row.facts.mountPoint.empty())
-        parts += toQt(texts.sentence("mounted at %@", {contract::printable(row.facts.mountPoint)}));
-    if (row.facts.hasSMARTError)
-        parts += toQt(texts.text("its drive says that it is failing"));
+        parts += isShort ? toQtLine(row.facts.mountPoint)
+                         : toQt(texts.sentence("mounted at %@",
+                                               {contract::printable(row.facts.mountPoint)}));
+    if (row.facts.hasSMARTError) {
+        // What matters most is not what is cut off.
+        if (isShort)
+            parts.prepend(toQt(texts.text("failing")));
+        else
+            parts += toQt(texts.text("its drive says that it is failing"));
+    }
     return parts.join(QStringLiteral(", "));
 }
 

@@ -180,6 +180,9 @@ DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
         row.label = contents->facts().label;
         row.format = formatOf(*contents);
         row.facts.space = contents->facts().space;
+        row.facts.uuid = contents->facts().uuid;
+        row.facts.partitionMap = contents->facts().partitionMap;
+        row.facts.hasDamagedMap = contents->facts().hasDamagedMap;
     }
     return row;
 }
@@ -378,6 +381,7 @@ QVariant DiskTreeModel::data(const QModelIndex& index, int role) const
             return column == DiskColumn::Name ? rowSummary(row, texts_)
                                               : cellText(row, column, texts_);
         case DetailsRole: return rowDetails(row, texts_);
+        case ShortDetailsRole: return rowDetails(row, texts_, true);
         case PercentRole: return row.percent;
         case NameRole: return namesOf(row).name;
         case BearerRole: return namesOf(row).bearer;

@@ -22,6 +22,8 @@ public:
     using DiskPointer = std::shared_ptr<Disk>;
     /// One line about what the disk is, of any column.
     static constexpr int DetailsRole = Qt::UserRole + 1;
+    /// The same in fewer words.
+    static constexpr int ShortDetailsRole = Qt::UserRole + 6;
     /// How far what is being done to the disk is, in per cent; 0 when nothing is, or it is not
     /// known.
     static constexpr int PercentRole = Qt::UserRole + 2;

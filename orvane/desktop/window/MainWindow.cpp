@@ -4,6 +4,7 @@
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QAbstractButton>
 #include <QApplication>
 #include <QCloseEvent>
 #include <QDropEvent>
@@ -117,13 +118,15 @@ void ProgressArea::setStop(std::function<void()> stop)
 }
 
 MainWindow::MainWindow(const Translator& texts)
-    : commands_(new CommandBar(texts, this)),
+    : texts_(texts),
+      commands_(new CommandBar(texts, this)),
       disks_(new DiskPanel(texts)),
       header_(new DiskHeader),
       banner_(new ResultBanner(texts)),
       tabs_(new QTabWidget),
       splitter_(new QSplitter(Qt::Horizontal)),
-      progress_(new ProgressArea(texts, this))
+      progress_(new ProgressArea(texts, this)),
+      dropNote_(new DropNote(this))
 {
     setObjectName(QStringLiteral("mainWindow"));
     setWindowTitle(QStringLiteral("Orvane"));
@@ -195,16 +198,40 @@ void MainWindow::closeEvent(QCloseEvent* event)
 
 void MainWindow::dragEnterEvent(QDragEnterEvent* event)
 {
-    if (events_.canOpenFiles && events_.canOpenFiles() && !localFiles(event->mimeData()).empty())
-        event->acceptProposedAction();
+    const auto files = localFiles(event->mimeData());
+    if (!events_.canOpenFiles || !events_.canOpenFiles() || files.empty())
+        return;
+    event->acceptProposedAction();
+    const auto count = static_cast<long>(files.size());
+    dropNote_->tell(
+        count == 1 ? toQtLine(texts_.sentence("Drop to open “%@”", {files.front().filename().native()}))
+                   : toQtLine(texts_.sentence("Drop to open %ld files", {count})));
+}
+
+void MainWindow::dragLeaveEvent(QDragLeaveEvent* event)
+{
+    dropNote_->hide();
+    QMainWindow::dragLeaveEvent(event);
 }
 
 void MainWindow::dropEvent(QDropEvent* event)
 {
+    dropNote_->hide();
     if (!events_.canOpenFiles || !events_.canOpenFiles())
         return;
     event->acceptProposedAction();
     events_.filesDropped(localFiles(event->mimeData()));
+}
+
+// Buttons leave Return alone, outside of dialogs. Those who walk there by the keyboard expect it.
+void MainWindow::keyPressEvent(QKeyEvent* event)
+{
+    auto* const button = qobject_cast<QAbstractButton*>(focusWidget());
+    const bool isReturn = event->key() == Qt::Key_Return || event->key() == Qt::Key_Enter;
+    if (isReturn && button != nullptr && !event->isAutoRepeat())
+        button->click();
+    else
+        QMainWindow::keyPressEvent(event);
 }
 
 void MainWindow::paintEvent(QPaintEvent* event)

@@ -5,6 +5,7 @@
 #include "orvane/desktop/window/CommandBar.h"
 #include "orvane/desktop/window/DiskHeader.h"
 #include "orvane/desktop/window/DiskPanel.h"
+#include "orvane/desktop/window/DropNote.h"
 #include "orvane/desktop/window/ElidedLabel.h"
 #include "orvane/desktop/window/ResultBanner.h"
 
@@ -99,7 +100,9 @@ protected:
     void changeEvent(QEvent* event) override;
     void closeEvent(QCloseEvent* event) override;
     void dragEnterEvent(QDragEnterEvent* event) override;
+    void dragLeaveEvent(QDragLeaveEvent* event) override;
     void dropEvent(QDropEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
 
@@ -107,6 +110,7 @@ private:
     void tellOfChange();
     void adoptRoom();
 
+    const Translator& texts_;
     Events events_;
     CommandBar* commands_;
     DiskPanel* disks_;
@@ -115,6 +119,7 @@ private:
     QTabWidget* tabs_;
     QSplitter* splitter_;
     ProgressArea* progress_;
+    DropNote* dropNote_;
     bool isCompact_ = false;
     bool hadAttention_ = true;
     bool hasAppeared_ = false;

@@ -36,18 +36,41 @@ void perform(const MenuCommand& command, QAction& action)
         action.setChecked(command.isOn());
 }
 
+QAction* addSubmenu(QMenu& menu, const MenuCommand& command, const QString& title)
+{
+    QMenu* const submenu = menu.addMenu(title);
+    submenu->setToolTipsVisible(true);
+    QObject::connect(submenu, &QMenu::aboutToShow, submenu, [submenu, fill = command.fill] {
+        submenu->clear();
+        fill(*submenu);
+    });
+    return submenu->menuAction();
+}
+
+QString titleOf(const MenuCommand& command, const Translator& texts)
+{
+    const QString title = toQt(texts.text(command.title));
+    return command.shownShortcut.isEmpty()
+               ? title
+               : title + QLatin1Char('\t') +
+                     command.shownShortcut.toString(QKeySequence::NativeText);
+}
+
 void addCommand(QMenu& menu, const MenuCommand& command, const Translator& texts)
 {
     if (command.title.empty()) {
         menu.addSeparator();
         return;
     }
-    QAction* const action = menu.addAction(toQt(texts.text(command.title)));
+    const QString title = titleOf(command, texts);
+    QAction* const action =
+        command.fill ? addSubmenu(menu, command, title) : menu.addAction(title);
     action->setObjectName(QLatin1String(command.objectName));
     action->setShortcut(command.shortcut);
     action->setCheckable(static_cast<bool>(command.isOn));
-    QObject::connect(action, &QAction::triggered, action,
-                     [command, action] { perform(command, *action); });
+    if (!command.fill)
+        QObject::connect(action, &QAction::triggered, action,
+                         [command, action] { perform(command, *action); });
     QObject::connect(&menu, &QMenu::aboutToShow, action,
                      [command, action] { prepare(command, *action); });
     // A disabled action would not hear its shortcut.

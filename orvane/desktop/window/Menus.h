@@ -5,6 +5,7 @@
 
 #include <QAction>
 #include <QMainWindow>
+#include <QMenu>
 
 #include <functional>
 #include <string>
@@ -25,6 +26,10 @@ struct MenuCommand {
     /// Why the command cannot be given, in the user's language: its tool tip while it is grey. Asked
     /// as `isAvailable` is, and beside it; empty when it can.
     std::function<std::string()> reasonAgainst = {};
+    /// For a command that is a menu of its own: fills it each time that it opens.
+    std::function<void(QMenu& menu)> fill = {};
+    /// Shown, and not heard: a button in the window has it, or the same command in another menu.
+    QKeySequence shownShortcut = {};
 };
 
 /// A menu of the window's menu bar; a command without a title is a line between others.

@@ -11,6 +11,7 @@
 #include <QApplication>
 #include <QLineEdit>
 #include <QMenu>
+#include <QMimeData>
 #include <QPainter>
 #include <QTest>
 
@@ -122,6 +123,117 @@ TEST_F(Pictures, OfALogOfSeveralRuns)
     QTest::qWait(100);
     takePicture("-search");
     EXPECT_GT(logRows().size(), 20U) << "a folded run with a match is open";
+}
+
+/// A machine that no test has: a drive with a system, a stick, and a drive that fails.
+std::vector<DiskTree> machine()
+{
+    const auto disk = [](const char* node, const char* name, std::uint64_t gibibytes) {
+        DiskTree tree;
+        tree.facts.identifier = tree.facts.path = std::string("/dev/") + node;
+        tree.facts.name = name;
+        tree.facts.length = gibibytes << 30U;
+        return tree;
+    };
+    const auto volume = [&](const char* node, const char* label, const char* format,
+                            const char* place, std::uint64_t gibibytes) {
+        DiskTree tree = disk(node, label, gibibytes);
+        tree.facts.type = diskType::volume;
+        tree.facts.label = label;
+        tree.facts.filesystem = format;
+        tree.facts.filesystemVersion = "FAT32";
+        tree.facts.mountPoint = place;
+        if (tree.facts.name.empty())
+            tree.facts.name = node;
+        return tree;
+    };
+    DiskTree drive = disk("nvme0n1", "Example NVMe 1TB", 954);
+    drive.facts.model = "Example NVMe 1TB";
+    drive.facts.partitionMap = "gpt";
+    drive.children = {volume("nvme0n1p1", "EFI", "vfat", "/boot/efi", 1),
+                      volume("nvme0n1p2", "System", "ext4", "/", 100),
+                      volume("nvme0n1p3", "A label that is much longer than any list is wide", "btrfs",
+                             "/home", 853)};
+    drive.children[1].facts.isBootVolume = true;
+    DiskTree stick = disk("sda", "Stick", 15);
+    stick.facts.isEjectable = true;
+    stick.children = {volume("sda1", "HOLIDAYS", "exfat", "", 15)};
+    DiskTree failing = disk("sdb", "Example 2000", 2000);
+    failing.facts.hasSMARTError = true;
+    failing.children = {volume("sdb1", "", "ntfs", "", 2000)};
+    return {drive, stick, failing};
+}
+
+TEST_F(Pictures, OfTheListOfDisks)
+{
+    openInOneSize({});
+    QTest::qWait(50);
+    takePicture("-no-disks");
+    close();
+    const std::string partitioned = makePartitionedImage("Whole Disk");
+    directory_.damage(partitioned + "?offset=1048576", "set_super_value free_blocks_count 7");
+    const std::string letters = makeImage("Letters");
+    openInOneSize({partitioned, letters});
+    session().host().sharedDiskController().synchronize(machine());
+    treat("verifyDiskButton", letters);
+    treat("verifyDiskButton", partitioned);
+    window().disks().setFocus();
+    window().activateWindow();
+    QTest::qWait(200);
+    takePicture("-list");
+    takePictureOfMenu("openImage", "-file-menu");
+    takePictureOfMenu("properties", "-disk-menu");
+    takePictureOfMenu("filterDisks", "-view-menu");
+    command("properties").trigger();
+    QTest::qWait(50);
+    auto* const dialog = window().findChild<QDialog*>(QStringLiteral("propertiesDialog"));
+    save(dialog->grab(), "-properties");
+    dialog->close();
+
+    command("filterDisks").trigger();
+    auto* const field = window().findChild<QLineEdit*>(QStringLiteral("diskFilter"));
+    field->setText(QStringLiteral("fat"));
+    QTest::qWait(50);
+    takePicture("-filter");
+    field->setText(QStringLiteral("zebra"));
+    QTest::qWait(50);
+    takePicture("-filter-nothing");
+    field->clear();
+    window().disks().setFocus();
+
+    QMimeData files;
+    files.setUrls({QUrl::fromLocalFile(QStringLiteral("/home/me/Backups/old-laptop.img"))});
+    QDragEnterEvent enter({10, 10}, Qt::CopyAction, &files, Qt::LeftButton, {});
+    QCoreApplication::sendEvent(&window(), &enter);
+    takePicture("-drop");
+    QDragLeaveEvent leave;
+    QCoreApplication::sendEvent(&window(), &leave);
+
+    window().resize(600, 400);
+    select(partitioned);
+    window().disks().scrollToTop();
+    QTest::qWait(100);
+    takePicture("-small");
+    command("filterDisks").trigger();
+    QTest::qWait(100);
+    takePicture("-small-filter");
+}
+
+TEST_F(Pictures, OfAJobInTheList)
+{
+    const std::string tools = directory_.fakeTools(
+        "say Pass 1: Checking inodes, blocks, and sizes\nprogress 2 1 2 disk\nwait");
+    ::setenv("FIXWELL_TOOL_PATH", tools.c_str(), 1);
+    const std::string partitioned = makePartitionedImage("Whole Disk");
+    openInOneSize({partitioned});
+    session().host().sharedDiskController().synchronize(machine());
+    select(partitioned + "#1");
+    button("verifyDiskButton").press();
+    ASSERT_TRUE(waitUntil([&] { return verdict(partitioned).ends_with("%"); }));
+    QTest::qWait(200);
+    takePicture("-job-in-list");
+    button("verifyDiskButton").press();
+    finishJob();
 }
 
 TEST_F(Pictures, OfARepairThatIsUndone)

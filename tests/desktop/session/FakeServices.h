@@ -51,6 +51,27 @@ signals:
     void ActionInvoked(uint notice, const QString& action);
 };
 
+/// A file manager that shows nothing and keeps what it was asked to show.
+class FakeFileManager : public QObject {
+    Q_OBJECT
+    Q_CLASSINFO("D-Bus Interface", "org.freedesktop.FileManager1")
+
+public:
+    explicit FakeFileManager(QDBusConnection bus)
+    {
+        bus.registerObject(QStringLiteral("/org/freedesktop/FileManager1"), this,
+                           QDBusConnection::ExportAllSlots);
+        bus.registerService(QStringLiteral("org.freedesktop.FileManager1"));
+    }
+
+    QStringList items;
+    QStringList folders;
+
+public slots:
+    void ShowItems(const QStringList& urls, const QString& /*startupID*/) { items += urls; }
+    void ShowFolders(const QStringList& urls, const QString& /*startupID*/) { folders += urls; }
+};
+
 /// logind's locks, which last until their holder closes the descriptor.
 class FakeLogind : public QObject {
     Q_OBJECT
