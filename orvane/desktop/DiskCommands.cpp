@@ -33,7 +33,7 @@ std::vector<MenuCommand> DiskCommands::all()
             preview(),
             undo("undoRepair", "&Undo Repair…", pellar::Operation::Undo),
             undo("finishRepair", "&Finish Repair…", pellar::Operation::Finish),
-            undo("undoPermissions", "Und&o Permissions Repair…", pellar::Operation::Undo,
+            undo("undoPermissions", "Un&do Permissions Repair…", pellar::Operation::Undo,
                  RepairUndoing::Scope::Permissions),
             std::move(stopping),
             line,
