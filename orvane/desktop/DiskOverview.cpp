@@ -76,12 +76,22 @@ ResultSummary DiskOverview::result(const std::vector<DiskRow>& rows)
         return {};
     if (rows.size() > 1)
         return resultOfSeveral(rows, at_.host.translator());
+    // Of a whole disk whose volumes were checked, they are the result.
+    const std::optional<LastCheck>& check = rows.front().lastCheck;
+    if (check && (check->isPartial || !check->part.empty()))
+        return resultOfSeveral(disks_.list().rowsBelow(rows.front()), at_.host.translator());
     const QtButton* const repair = at_.tabs.button(outlet::repairDisk);
-    const KeptRepair kept = kept_.stateOf(pellar::Subject::Filesystem, *disks_.selected().front());
+    const auto kept = [this](pellar::Subject subject) {
+        return kept_.stateOf(subject, *disks_.selected().front());
+    };
+    const auto isKept = [](KeptRepair state) {
+        return state == KeptRepair::Applied || state == KeptRepair::Unknown;
+    };
+    const KeptRepair ofDisk = kept(pellar::Subject::Filesystem);
     return resultOf(rows.front(),
-                    {repair != nullptr && repair->isEnabled(),
-                     kept == KeptRepair::Applied || kept == KeptRepair::Unknown,
-                     kept == KeptRepair::Interrupted},
+                    {repair != nullptr && repair->isEnabled(), isKept(ofDisk),
+                     isKept(kept(pellar::Subject::Permissions)),
+                     ofDisk == KeptRepair::Interrupted},
                     at_.host.translator());
 }
 
@@ -91,6 +101,9 @@ void DiskOverview::take(NextStep step)
         case NextStep::Repair: at_.tabs.button(outlet::repairDisk)->press(); break;
         case NextStep::Preview: choices_.preview(); break;
         case NextStep::Undo: undoing_.ask(pellar::Operation::Undo); break;
+        case NextStep::UndoPermissions:
+            undoing_.ask(pellar::Operation::Undo, RepairUndoing::Scope::Permissions);
+            break;
         case NextStep::Finish: undoing_.ask(pellar::Operation::Finish); break;
         case NextStep::ApplyUnproven: choices_.confirmUnproven(); break;
         case NextStep::RepairDirectly: choices_.confirmDirect(); break;

@@ -32,6 +32,7 @@ constexpr std::array stepTitles{
     StepTitle{NextStep::Repair, "Repair…", Symbol::Repair},
     StepTitle{NextStep::Preview, "Preview Repair", Symbol::Preview},
     StepTitle{NextStep::Undo, "Undo Repair…", Symbol::Undo},
+    StepTitle{NextStep::UndoPermissions, "Undo Repair…", Symbol::Undo},
     StepTitle{NextStep::Finish, "Finish Repair…", Symbol::Finish},
     StepTitle{NextStep::ApplyUnproven, "Apply Anyway…", Symbol::Repair},
     StepTitle{NextStep::RepairDirectly, "Repair Directly…", Symbol::Repair},

@@ -159,8 +159,9 @@ std::vector<NextStep> stepsAfter(const Ending& ending, const DiskRow& disk,
         // A preview has said what there is to say.
         if (ending.operation == Operation::Verify && ending.subject == Subject::Filesystem)
             steps.push_back(NextStep::Preview);
-    } else if (situation.canUndo && ending.is(contract::kPLVerdictRepaired)) {
-        steps.push_back(NextStep::Undo);
+    } else if (ending.is(contract::kPLVerdictRepaired)) {
+        if (isOfDisk ? situation.canUndo : situation.canUndoPermissions)
+            steps.push_back(isOfDisk ? NextStep::Undo : NextStep::UndoPermissions);
     }
     if (isDamaged || ending.is(contract::kPLVerdictRepaired))
         steps.push_back(NextStep::ShowProblems);

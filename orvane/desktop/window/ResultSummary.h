@@ -14,6 +14,7 @@ enum class NextStep {
     Repair,
     Preview,
     Undo,
+    UndoPermissions,  ///< a repair of them
     Finish,
     ApplyUnproven,   ///< a repair that was tried, and may leave damage
     RepairDirectly,  ///< without trying it first
@@ -46,6 +47,7 @@ struct ResultSummary {
 struct ResultSituation {
     bool canRepair = false;
     bool canUndo = false;
+    bool canUndoPermissions = false;  ///< a repair of the permissions of its files
     bool isInterrupted = false;  ///< a repair of it is half written
 };
 
