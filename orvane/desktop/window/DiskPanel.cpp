@@ -32,6 +32,8 @@ DiskPanel::DiskPanel(const Translator& texts, QWidget* parent)
     clear_->setObjectName(QStringLiteral("clearFilter"));
     clear_->setText(toQt(texts.text("Show All Disks")));
     clear_->setVisible(false);
+    // Files that fall on it are meant for the window.
+    field_->setAcceptDrops(false);
     field_->installEventFilter(this);
     connect(clear_, &QAction::triggered, field_, &QLineEdit::clear);
     connect(field_, &QLineEdit::textChanged, this, [this](const QString& text) {
