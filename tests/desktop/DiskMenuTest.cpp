@@ -139,6 +139,7 @@ TEST_F(DiskMenuTest, WhatWasOpenComesBackWhereTheUserWantsIt)
     openWith(options({}));
     ASSERT_TRUE(waitUntil([&] { return rows() == 2; }));
     EXPECT_EQ(takeSheet(), "") << "once";
+    EXPECT_TRUE(window().disks().selectedDisks().empty()) << "nothing was chosen yet";
 }
 
 TEST(RecentImages, KeepsTheNewestTenOfAnyName)
