@@ -97,7 +97,8 @@ void DiskPanel::adoptRoom()
 bool DiskPanel::eventFilter(QObject* watched, QEvent* event)
 {
     if (event->type() == QEvent::FocusIn || event->type() == QEvent::FocusOut)
-        QMetaObject::invokeMethod(this, [this] { adoptRoom(); }, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(
+            this, [this] { adoptRoom(); }, Qt::QueuedConnection);
     if (event->type() != QEvent::KeyPress)
         return QWidget::eventFilter(watched, event);
     switch (static_cast<QKeyEvent*>(event)->key()) {
