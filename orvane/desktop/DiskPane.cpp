@@ -141,6 +141,7 @@ void DiskPane::start()
     images_.open(recent_.toReopen());
     isReopening_ = false;
     hasStarted_ = true;
+    recent_.keepOpen(images_.openImages());
     openNamed(true);
     if (!scansSystemDisks_)
         openNamed(false);

@@ -58,7 +58,7 @@ void MenuCommands::fillBar()
                                   .title = "Open Image…",
                                   .shortcut = QKeySequence::Open,
                                   .perform = [this] { openImages(); },
-                                  .isAvailable = [this] { return !isLocked(); }};
+                                  .reasonAgainst = [this] { return reasonWhileLocked(); }};
     auto verify = diskCommands_.button("barVerify", "Verify", outlet::verifyDisk);
     verify.shortcut = verify.shownShortcut;
     auto repair = diskCommands_.button("barRepair", "Repair", outlet::repairDisk);
@@ -90,27 +90,39 @@ std::vector<Menu> MenuCommands::menus()
 
 std::vector<MenuCommand> MenuCommands::fileCommands()
 {
-    const auto isFree = [this] {
-        return !isLocked();
+    // While a job runs, the list is its own.
+    const auto whenFree = [this](const char* objectName, std::string_view title,
+                                 QKeySequence shortcut, std::function<void()> perform) {
+        return MenuCommand{.objectName = objectName,
+                           .title = title,
+                           .shortcut = std::move(shortcut),
+                           .perform = std::move(perform),
+                           .reasonAgainst = [this] { return reasonWhileLocked(); }};
     };
     const auto attach = [this] {
         chooseImages("Attach Image as Device",
                      [this](const auto& names) { disks_.attachAsDevices(names); });
     };
-    const auto canPrint = [this] {
-        return at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
+    const auto reasonAgainstPrinting = [this] {
+        const bool canPrint =
+            at_.tabs.active() != nullptr && at_.tabs.active()->module().canPrint();
+        return canPrint ? std::string() : text("There is no log to print.");
     };
     // The Disk menu has the key.
     MenuCommand closing = diskCommands_.closeImage("closeImageInFile");
     closing.shownShortcut = DiskCommands::closeShortcut();
     return {
-        {"openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }, isFree},
+        whenFree("openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }),
         recentCommand(),
         std::move(closing),
-        {"attachImage", "&Attach Image as Device…", {}, attach, isFree},
-        {"rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }, isFree},
+        whenFree("attachImage", "&Attach Image as Device…", {}, attach),
+        whenFree("rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }),
         line,
-        {"print", "&Print…", QKeySequence::Print, [this] { print(); }, canPrint},
+        {.objectName = "print",
+         .title = "&Print…",
+         .shortcut = QKeySequence::Print,
+         .perform = [this] { print(); },
+         .reasonAgainst = reasonAgainstPrinting},
         line,
         {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {
              at_.window.close();
@@ -149,6 +161,11 @@ std::vector<MenuCommand> MenuCommands::editCommands()
                        verifiesThoroughlyKey)};
 }
 
+std::string MenuCommands::reasonWhileLocked() const
+{
+    return isLocked() ? text("Not available while a job runs.") : std::string();
+}
+
 MenuCommand MenuCommands::recentCommand()
 {
     return {.objectName = "openRecent",
@@ -157,7 +174,7 @@ MenuCommand MenuCommands::recentCommand()
             .perform = {},
             .reasonAgainst = [this] {
                 if (isLocked())
-                    return text("Not available while a job runs.");
+                    return reasonWhileLocked();
                 return disks_.recentImages().empty() ? text("No other image was opened before.")
                                                      : "";
             },

@@ -42,6 +42,7 @@ private:
                                std::string_view key);
     MenuCommand recentCommand();
 
+    std::string reasonWhileLocked() const;
     bool isLocked() const { return at_.controller.interfaceLock(); }
     void chooseImages(std::string_view title,
                       const std::function<void(const std::vector<std::string>&)>& chosen);

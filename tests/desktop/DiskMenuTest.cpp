@@ -85,7 +85,8 @@ TEST_F(DiskMenuTest, ClosingTakesAnImageFromTheListAndLeavesTheFile)
     EXPECT_FALSE(row(image).isValid());
     EXPECT_TRUE(row(other).isValid());
     EXPECT_TRUE(std::filesystem::exists(image));
-    EXPECT_EQ(session().host().sharedDiskController().roots().size(), 2U) << "nothing is left of it";
+    EXPECT_EQ(session().host().sharedDiskController().roots().size(), 2U)
+        << "nothing is left of it";
 }
 
 TEST_F(DiskMenuTest, ImagesAreOfferedAgainUntilTheyHaveGone)
@@ -139,6 +140,7 @@ TEST_F(DiskMenuTest, WhatWasOpenComesBackWhereTheUserWantsIt)
     openWith(options({}));
     ASSERT_TRUE(waitUntil([&] { return rows() == 2; }));
     EXPECT_EQ(takeSheet(), "") << "once";
+    EXPECT_TRUE(window().disks().selectedDisks().empty()) << "nothing was chosen yet";
 }
 
 TEST(RecentImages, KeepsTheNewestTenOfAnyName)
@@ -232,10 +234,9 @@ TEST_F(DiskMenuTest, PropertiesAndTheReportHoldWhatIsKnown)
     QTest::mouseClick(dialog->findChild<QPushButton*>(QStringLiteral("copyProperties")),
                       Qt::LeftButton);
     const std::string copied = fromQt(QApplication::clipboard()->text());
-    for (const std::string& part :
-         {std::string("Label: a <b>\n"), "File: " + image + "\n", std::string("UUID: "),
-          std::string("Format: ext4\n"), std::string("Size: 8.0 MiB (8"),
-          std::string(": damaged. ")})
+    for (const std::string& part : {std::string("Label: a <b>\n"), "File: " + image + "\n",
+                                    std::string("UUID: "), std::string("Format: ext4\n"),
+                                    std::string("Size: 8.0 MiB (8"), std::string(": damaged. ")})
         EXPECT_NE(copied.find(part), std::string::npos) << part << " in " << copied;
     EXPECT_EQ(copied.find("Health"), std::string::npos) << "a file has no drive that could tell";
     const std::string read = fromQt(dialog->findChild<QTextEdit*>()->toPlainText());

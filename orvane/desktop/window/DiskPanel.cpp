@@ -32,6 +32,8 @@ DiskPanel::DiskPanel(const Translator& texts, QWidget* parent)
     clear_->setObjectName(QStringLiteral("clearFilter"));
     clear_->setText(toQt(texts.text("Show All Disks")));
     clear_->setVisible(false);
+    // Files that fall on it are meant for the window.
+    field_->setAcceptDrops(false);
     field_->installEventFilter(this);
     connect(clear_, &QAction::triggered, field_, &QLineEdit::clear);
     connect(field_, &QLineEdit::textChanged, this, [this](const QString& text) {
@@ -95,7 +97,8 @@ void DiskPanel::adoptRoom()
 bool DiskPanel::eventFilter(QObject* watched, QEvent* event)
 {
     if (event->type() == QEvent::FocusIn || event->type() == QEvent::FocusOut)
-        QMetaObject::invokeMethod(this, [this] { adoptRoom(); }, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(
+            this, [this] { adoptRoom(); }, Qt::QueuedConnection);
     if (event->type() != QEvent::KeyPress)
         return QWidget::eventFilter(watched, event);
     switch (static_cast<QKeyEvent*>(event)->key()) {

@@ -13,11 +13,11 @@ namespace {
 /// "8.0 MiB (8,388,608 bytes)"
 QString exactSize(std::uint64_t bytes, const Translator& texts)
 {
-    return bytes == 0 ? QString()
-                      : toQt(texts.sentence(
-                            "%@ (%@ bytes)",
-                            {fromQt(sizeText(bytes)),
-                             fromQt(QLocale().toString(static_cast<qulonglong>(bytes)))}));
+    return bytes == 0
+               ? QString()
+               : toQt(texts.sentence("%@ (%@ bytes)",
+                                     {fromQt(sizeText(bytes)),
+                                      fromQt(QLocale().toString(static_cast<qulonglong>(bytes)))}));
 }
 
 QString useText(const DiskRow& row, const Translator& texts)
@@ -94,8 +94,7 @@ QString plainText(const std::vector<DiskProperty>& properties)
     QString text;
     for (const DiskProperty& property : properties)
         text += property.name + QStringLiteral(": ") +
-                QString(property.value).replace('\n', QLatin1String("\n    ")) +
-                QLatin1Char('\n');
+                QString(property.value).replace('\n', QLatin1String("\n    ")) + QLatin1Char('\n');
     return text;
 }
 

@@ -33,8 +33,7 @@ void fill(QTextDocument& document, const std::vector<DiskProperty>& properties,
     format.setColumnWidthConstraints({QTextLength(QTextLength::PercentageLength, 26),
                                       QTextLength(QTextLength::PercentageLength, 74)});
     QTextCursor cursor(&document);
-    QTextTable* const table =
-        cursor.insertTable(static_cast<int>(properties.size()), 2, format);
+    QTextTable* const table = cursor.insertTable(static_cast<int>(properties.size()), 2, format);
     QTextCharFormat quiet;
     quiet.setForeground(palette.color(QPalette::PlaceholderText));
     for (int row = 0; row < table->rows(); ++row) {
@@ -67,8 +66,7 @@ QDialog* showProperties(QWidget& window, const ShownProperties& shown, const Tra
     auto* const dialog = new QDialog(&window);
     dialog->setObjectName(QStringLiteral("propertiesDialog"));
     dialog->setAttribute(Qt::WA_DeleteOnClose);
-    dialog->setWindowTitle(
-        toQt(texts.sentence("Properties of “%@”", {fromQt(shown.disk)})));
+    dialog->setWindowTitle(toQt(texts.sentence("Properties of “%@”", {fromQt(shown.disk)})));
 
     auto* const icon = new QLabel(dialog);
     icon->setPixmap(shown.icon.pixmap(iconSide));
@@ -84,17 +82,16 @@ QDialog* showProperties(QWidget& window, const ShownProperties& shown, const Tra
 
     QTextEdit* const text = makeText(shown, dialog->windowTitle(), dialog);
     auto* const buttons = new QDialogButtonBox(dialog);
-    auto* const copy = buttons->addButton(toQtTitle(texts.text("Copy")),
-                                          QDialogButtonBox::ActionRole);
+    auto* const copy =
+        buttons->addButton(toQtTitle(texts.text("Copy")), QDialogButtonBox::ActionRole);
     copy->setObjectName(QStringLiteral("copyProperties"));
     copy->setAutoDefault(false);
-    auto* const close = buttons->addButton(toQtTitle(texts.text("Close")),
-                                           QDialogButtonBox::RejectRole);
+    auto* const close =
+        buttons->addButton(toQtTitle(texts.text("Close")), QDialogButtonBox::RejectRole);
     close->setDefault(true);
-    QObject::connect(copy, &QPushButton::clicked, dialog,
-                     [whole = plainText(shown.properties)] {
-                         QApplication::clipboard()->setText(whole);
-                     });
+    QObject::connect(copy, &QPushButton::clicked, dialog, [whole = plainText(shown.properties)] {
+        QApplication::clipboard()->setText(whole);
+    });
     QObject::connect(buttons, &QDialogButtonBox::rejected, dialog, &QDialog::close);
 
     auto* const rows = new QVBoxLayout(dialog);
@@ -102,8 +99,8 @@ QDialog* showProperties(QWidget& window, const ShownProperties& shown, const Tra
     rows->addWidget(text, 1);
     rows->addWidget(buttons);
     const QFontMetrics metrics = dialog->fontMetrics();
-    dialog->resize(QSize(metrics.averageCharWidth() * widthInCharacters,
-                         metrics.height() * heightInLines));
+    dialog->resize(
+        QSize(metrics.averageCharWidth() * widthInCharacters, metrics.height() * heightInLines));
     dialog->show();
     return dialog;
 }

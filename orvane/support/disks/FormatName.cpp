@@ -27,9 +27,9 @@ std::string nameIn(std::span<const KnownName> names, std::string_view type)
 std::string formatName(std::string_view type, std::string_view version)
 {
     static constexpr std::array names{
-        KnownName{"vfat", "FAT"},       KnownName{"msdos", "FAT"},  KnownName{"exfat", "exFAT"},
-        KnownName{"ntfs", "NTFS"},      KnownName{"ntfs3", "NTFS"}, KnownName{"xfs", "XFS"},
-        KnownName{"btrfs", "Btrfs"},    KnownName{"f2fs", "F2FS"},  KnownName{"jfs", "JFS"},
+        KnownName{"vfat", "FAT"},         KnownName{"msdos", "FAT"},  KnownName{"exfat", "exFAT"},
+        KnownName{"ntfs", "NTFS"},        KnownName{"ntfs3", "NTFS"}, KnownName{"xfs", "XFS"},
+        KnownName{"btrfs", "Btrfs"},      KnownName{"f2fs", "F2FS"},  KnownName{"jfs", "JFS"},
         KnownName{"iso9660", "ISO 9660"}, KnownName{"udf", "UDF"},
     };
     const std::string name = nameIn(names, type);

@@ -120,9 +120,10 @@ TEST_F(Pictures, OfALogOfSeveralRuns)
     QTest::keyClick(&window(), Qt::Key_F, Qt::ControlModifier);
     auto* const field = window().findChild<QLineEdit*>(QStringLiteral("logSearchField"));
     field->setText(QStringLiteral("block"));
+    EXPECT_TRUE(waitUntil([this] { return logRows().size() > 20; }))
+        << "a folded run with a match is open";
     QTest::qWait(100);
     takePicture("-search");
-    EXPECT_GT(logRows().size(), 20U) << "a folded run with a match is open";
 }
 
 /// A machine that no test has: a drive with a system, a stick, and a drive that fails.
