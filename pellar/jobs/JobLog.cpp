@@ -302,16 +302,16 @@ void JobLog::outcomeOfVolume(const Outcome& outcome, Operation operation)
     const bool isUnanswered =
         outcome.verdict == Verdict::Failed || outcome.verdict == Verdict::Inconclusive;
     if (isUnanswered)
-        failure(message);
+        failure(asLine(message));
     else if (!outcome.reason.isEmpty() && outcome.warnings.empty())
-        remark(message);
+        remark(asLine(message));
     const bool isForGood = outcome.code == contract::kPLErrorDamagedForGood ||
                            outcome.code == contract::kPLErrorCutShort;
     verdict(outcome.verdict, operation, isForGood);
     // What a repair cost is the last word, not the success.
     for (const Sentence& warning : outcome.warnings)
-        failure(messageOf({outcome.verdict, outcome.code, 0, warning, {}}, operation, diskName_,
-                          texts_));
+        failure(asLine(messageOf({outcome.verdict, outcome.code, 0, warning, {}}, operation,
+                                 diskName_, texts_)));
     finished(outcome, message);
 }
 

@@ -261,9 +261,9 @@ void PartitionMapScript::report(const Outcome& outcome)
     const std::string message =
         mapMessageOf(outcome, operation, log_.diskName(), context_.texts).in(context_.texts);
     if (outcome.verdict == Verdict::Failed)
-        log_.failure(message);
+        log_.failure(asLine(message));
     else if (!outcome.reason.isEmpty())
-        log_.remark(message);
+        log_.remark(asLine(message));
     const Sentence line = mapVerdictLine(outcome.verdict, operation, log_.diskName());
     if (!line.isEmpty())
         log_.verdict(outcome.code == contract::kPLNoError, log_.text(line));

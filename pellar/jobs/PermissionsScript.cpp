@@ -250,7 +250,7 @@ void PermissionsScript::report(const Outcome& outcome)
     const std::string message =
         permissionsMessageOf(outcome, operation_, log_.diskName(), context_.texts);
     if (outcome.code != contract::kPLNoError && outcome.verdict != Verdict::Stopped)
-        log_.failure(message);
+        log_.failure(asLine(message));
     log_.finished(outcome, message);
 }
 

@@ -213,7 +213,7 @@ void PermissionsUndoScript::report(const Failure& failure)
         const std::string message =
             log_.text({"undid the repair of the permissions on “%1$@”: %2$@", log_.diskName(),
                        log_.text(numbers())});
-        log_.verdict(true, message);
+        log_.verdict(true, asLine(message));
         log_.finished(contract::kPLNoError, 0, contract::kPLVerdictUndone, message);
         return;
     }
@@ -225,7 +225,7 @@ void PermissionsUndoScript::report(const Failure& failure)
                   : Sentence{"cannot undo the repair of the permissions on “%1$@”: %2$@",
                              log_.diskName(), log_.text(failure->reason)});
     if (!isStopped)
-        log_.failure(message);
+        log_.failure(asLine(message));
     log_.finished(*failure, message);
 }
 

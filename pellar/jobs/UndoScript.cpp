@@ -121,7 +121,7 @@ void UndoScript::report(const Failure& failure)
                                 : "finished the repair of “%1$@”",
                        log_.diskName(),
                        {}});
-        log_.verdict(true, message);
+        log_.verdict(true, asLine(message));
         log_.finished(contract::kPLNoError, 0,
                       isUndo() ? contract::kPLVerdictUndone : contract::kPLVerdictRepaired,
                       message);
@@ -133,7 +133,7 @@ void UndoScript::report(const Failure& failure)
                       : Sentence{isUndo() ? "cannot undo the repair of “%1$@”: %2$@"
                                           : "cannot finish the repair of “%1$@”: %2$@",
                                  log_.diskName(), log_.text(failure->reason)});
-    log_.failure(message);
+    log_.failure(asLine(message));
     log_.finished(*failure, message);
 }
 

@@ -127,6 +127,13 @@ contract::Name nameOf(Verdict verdict)
     return contract::kPLVerdictFailed;
 }
 
+std::string asLine(std::string message)
+{
+    if (!message.empty() && message.front() >= 'a' && message.front() <= 'z')
+        message.front() = static_cast<char>(message.front() - 'a' + 'A');
+    return message;
+}
+
 std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,
                       const Texts& texts)
 {

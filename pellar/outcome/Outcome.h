@@ -64,6 +64,9 @@ Outcome outcomeOfRepair(const std::vector<RepairPass>& passes, const Judgement& 
 
 contract::Name nameOf(Verdict verdict);
 
+/// A message as a line of its own: with a capital at the beginning.
+std::string asLine(std::string message);
+
 /// One sentence that names the attempt, the disk and the outcome.
 std::string messageOf(const Outcome& outcome, Operation operation, const std::string& diskName,
                       const Texts& texts);

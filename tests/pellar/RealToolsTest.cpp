@@ -4,6 +4,7 @@
 // its cases are skipped.
 
 #include "contract/pellar/ErrorCodes.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/disks/LoopDevice.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/JobFixture.h"
@@ -322,7 +323,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
             const bool isLoss = test::contains(damage.message, " file");
-            const bool hasWarned = !warnings.empty() && warnings.back() == library.listener.message;
+            const bool hasWarned = !warnings.empty() && warnings.back() == asLine(library.listener.message);
             EXPECT_EQ(hasWarned, isLoss) << damage.message;
         }
         ASSERT_EQ(library.verify(disk), 0);
