@@ -215,10 +215,13 @@ bool LogSearch::isLooking() const
     return !matches_.isComplete() || (isToBeShown && !peer_.model().isComplete());
 }
 
-/// As soon as there is one that can be shown.
+/// As soon as it can be shown: a long log is taken in from its end.
 void LogSearch::showFirst()
 {
-    if (!mustShow_ || matches_.rows().empty())
+    const std::vector<int>& rows = matches_.rows();
+    if (!mustShow_ || rows.empty())
+        return;
+    if (!peer_.model().isComplete() && !peer_.goTo(static_cast<std::size_t>(rows.front())))
         return;
     goOn(true);
     mustShow_ = current_ < 0;

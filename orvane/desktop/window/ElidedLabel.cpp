@@ -41,7 +41,8 @@ void ElidedLabel::resizeEvent(QResizeEvent* event)
 void ElidedLabel::changeEvent(QEvent* event)
 {
     QLabel::changeEvent(event);
-    if (event->type() == QEvent::FontChange)
+    if (event->type() == QEvent::FontChange ||
+        event->type() == QEvent::LayoutDirectionChange)
         fit();
 }
 
@@ -49,6 +50,10 @@ void ElidedLabel::fit()
 {
     const QString shown = fontMetrics().elidedText(fullText_, Qt::ElideMiddle, width());
     setText(shown);
+    // Selectable text would stand on the side of its own direction, away from its sign.
+    const bool isMirrored = layoutDirection() == Qt::RightToLeft;
+    setAlignment((isMirrored ? Qt::AlignRight : Qt::AlignLeft) | Qt::AlignAbsolute |
+                 Qt::AlignVCenter);
     setToolTip(shown == fullText_ ? QString() : toQtToolTip(fromQt(fullText_)));
 }
 
