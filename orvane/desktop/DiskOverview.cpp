@@ -151,7 +151,7 @@ void DiskOverview::explainCopying()
            [command] { QApplication::clipboard()->setText(QString::fromStdString(command)); }},
           {text("Help"),
            [this] {
-               at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
+               at_.host.sharedHelpManager().openHelpAnchor("copying");
            }}},
          text("Close")});
 }

@@ -100,6 +100,7 @@ TEST(HelpBook, EveryLanguageHasTheSamePagesAndEveryLinkLeadsToOne)
                     << match.captured(1).toStdString();
         }
         EXPECT_TRUE(book.pageWith("ovhelp11868").endsWith(QStringLiteral("checking.html")));
+        EXPECT_TRUE(book.pageWith("copying").endsWith(QStringLiteral("before.html")));
     }
 }
 
