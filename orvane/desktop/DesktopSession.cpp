@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
+#include "orvane/desktop/OpenImages.h"
 #include "orvane/desktop/RunNotes.h"
+#include "orvane/support/settings/Switch.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <cstdio>
@@ -25,7 +27,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       ledger_(host_, ledgerEvents()),
       tabs_(host_, window_, controller_),
       repairs_(libraryOptions().trials),
-      disks_(host_, loop_, window_.disks(), ledger_, repairs_, options_.disksToOpen,
+      disks_(host_, loop_, window_.disks(), ledger_, repairs_,
+             disksToOpen(host_, options_.disksToOpen),
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -39,7 +42,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
       choices_(parts(), disks_, repairs_, jobPolicy_, [this] { overview_.explainCopying(); }),
       overview_(parts(), disks_, repairs_, choices_, undoing_),
-      commands_(parts(), disks_, library_, choices_, undoing_, [this] { update(); })
+      dialogs_(parts(), repairs_, libraryOptions().trials, [this] { update(); }),
+      commands_(parts(), disks_, library_, choices_, undoing_, dialogs_, [this] { update(); })
 {
     host_.setWindow(&window_);
     host_.histories().rememberCleared();
@@ -53,6 +57,7 @@ DesktopSession::DesktopSession(SessionOptions options)
 
 DesktopSession::~DesktopSession()
 {
+    rememberImages(host_);
     window_.setEvents({});
     host_.generalPasteboard().setHTMLSource({});
     host_.generalPasteboard().setTextSource({});
@@ -88,13 +93,13 @@ pellar::JobOptions DesktopSession::libraryOptions()
     pellar::JobOptions options =
         orvane::libraryOptions(options_.paths, libraryTexts_, {}, {}, repairAdvice());
     options.outputLimits = options_.outputLimits;
-    options.archiveFetching = {[this] { return fetchesArchives(host_); },
+    options.archiveFetching = {[this] { return fetchesPackageArchives.isOn(host_.standardUserDefaults()); },
                                libraryTexts_.text("The archives of these packages are downloaded "
-                                                  "when “Download Package Archives” is switched "
-                                                  "on in the Edit menu.")};
+                                                  "when “Download package archives” is switched "
+                                                  "on in the preferences.")};
     options.repairPolicy = [this] {
         pellar::RepairPolicy policy = jobPolicy_;
-        policy.isThorough = verifiesThoroughly(host_);
+        policy.isThorough = thoroughVerification.isOn(host_.standardUserDefaults());
         return policy;
     };
     return options;
@@ -217,6 +222,7 @@ void DesktopSession::update()
     tabs_.update();
     hints_.refresh();
     overview_.refresh();
+    dialogs_.refresh();
 }
 
 void DesktopSession::selectionChanged()

@@ -90,6 +90,7 @@ private:
     RepairUndoing undoing_;
     RepairChoices choices_;
     DiskOverview overview_;
+    WindowDialogs dialogs_;
     MenuCommands commands_;
 };
 

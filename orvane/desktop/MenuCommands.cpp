@@ -17,22 +17,10 @@ namespace outlet = contract::outlet;
 
 namespace {
 
-constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
-constexpr std::string_view verifiesThoroughlyKey = "thoroughVerification";
 constexpr const char* diskMenu = "diskMenu";
 const MenuCommand line{};
 
 }  // namespace
-
-bool fetchesArchives(SupportHost& host)
-{
-    return host.standardUserDefaults().objectForKey(fetchesArchivesKey).boolean();
-}
-
-bool verifiesThoroughly(SupportHost& host)
-{
-    return host.standardUserDefaults().objectForKey(verifiesThoroughlyKey).boolean();
-}
 
 void MenuCommands::addMenus()
 {
@@ -162,9 +150,8 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
          canUndo},
         line,
-        settingCommand("fetchArchives", "Download &Package Archives", fetchesArchivesKey),
-        settingCommand("verifyThoroughly", "&Try a Repair When Verifying (Thorough)",
-                       verifiesThoroughlyKey)};
+        {"preferences", "&Preferences…", QKeySequence(Qt::CTRL | Qt::Key_Comma),
+         [this] { dialogs_.showPreferences(); }}};
 }
 
 std::vector<MenuCommand> MenuCommands::diskCommands()
@@ -202,18 +189,6 @@ MenuCommand MenuCommands::undoCommand(const char* objectName, std::string_view t
                 [this, operation, scope] {
                     return undoing_.reasonAgainst(operation, scope);
                 }};
-}
-
-MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,
-                                         std::string_view key)
-{
-    const auto isOn = [this, key] {
-        return at_.host.standardUserDefaults().objectForKey(key).boolean();
-    };
-    const auto change = [this, key, isOn] {
-        at_.host.standardUserDefaults().setObjectForKey(!isOn(), key);
-    };
-    return {objectName, title, {}, change, {}, isOn};
 }
 
 MenuCommand MenuCommands::detailsCommand()

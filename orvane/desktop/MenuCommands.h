@@ -5,6 +5,7 @@
 #include "orvane/desktop/ModuleTabs.h"
 #include "orvane/desktop/RepairChoices.h"
 #include "orvane/desktop/RepairUndoing.h"
+#include "orvane/desktop/WindowDialogs.h"
 #include "orvane/desktop/window/Menus.h"
 
 #include <functional>
@@ -14,23 +15,19 @@
 
 namespace orvane::desktop {
 
-/// Whether the user agrees that archives of packages are fetched over the network.
-[[nodiscard]] bool fetchesArchives(SupportHost& host);
-
-/// Whether a verification that finds nothing tries a repair as well.
-[[nodiscard]] bool verifiesThoroughly(SupportHost& host);
-
 /// What the window's menus do. Main thread.
 class MenuCommands {
 public:
     /// All but `update` outlive this object; it shows what a command has changed.
     MenuCommands(const SessionParts& parts, DiskPane& disks, const pellar::Manager& library,
-                 RepairChoices& choices, RepairUndoing& undoing, std::function<void()> update)
+                 RepairChoices& choices, RepairUndoing& undoing, WindowDialogs& dialogs,
+                 std::function<void()> update)
         : at_(parts),
           disks_(disks),
           library_(library),
           choices_(choices),
           undoing_(undoing),
+          dialogs_(dialogs),
           update_(std::move(update))
     {
     }
@@ -52,8 +49,6 @@ private:
     MenuCommand undoCommand(const char* objectName, std::string_view title,
                             pellar::Operation operation,
                             RepairUndoing::Scope scope = RepairUndoing::Scope::Disk);
-    MenuCommand settingCommand(const char* objectName, std::string_view title,
-                               std::string_view key);
     MenuCommand diskCommand(const char* objectName, std::string_view title, QKeySequence shortcut,
                             DiskAction action);
     MenuCommand buttonCommand(const char* objectName, std::string_view title,
@@ -82,6 +77,7 @@ private:
     const pellar::Manager& library_;
     RepairChoices& choices_;
     RepairUndoing& undoing_;
+    WindowDialogs& dialogs_;
     const std::function<void()> update_;
 };
 

@@ -12,6 +12,7 @@
 #include <QLineEdit>
 #include <QMenu>
 #include <QPainter>
+#include <QTabWidget>
 #include <QTest>
 
 #include <cstdlib>
@@ -130,7 +131,7 @@ TEST_F(Pictures, OfARepairThatIsUndone)
     const std::string interrupted = makeImage("Photos");
     orvane::test::interruptRepair(interrupted, directory_ / "state/repairs/records");
     openInOneSize({image, interrupted});
-    takePictureOfMenu("verifyThoroughly", "-settings");
+    takePictureOfMenu("preferences", "-edit-menu");
     takePicture("-interrupted-row");
     select(interrupted);
     QTest::qWait(300);
@@ -164,6 +165,25 @@ TEST_F(Pictures, OfARepairThatIsNotProven)
     take(NextStep::ApplyUnproven);
     QTest::qWait(100);
     takePicture("-unproven-confirmation");
+}
+
+TEST_F(Pictures, OfTheDialogs)
+{
+    const std::string image = makeDamagedImage("Letters");
+    openInOneSize({image});
+    treat("repairDiskButton", image);
+    const auto dialog = [this](const char* name) -> QWidget& {
+        QTest::qWait(100);
+        return *window().findChild<QWidget*>(QLatin1String(name));
+    };
+    command("preferences").trigger();
+    QWidget& preferences = dialog("preferencesDialog");
+    auto& pages = *preferences.findChild<QTabWidget*>();
+    for (int page = 0; page < pages.count(); ++page) {
+        pages.setCurrentIndex(page);
+        save(dialog("preferencesDialog").grab(), "-preferences-" + std::to_string(page));
+    }
+    preferences.close();
 }
 
 }  // namespace
