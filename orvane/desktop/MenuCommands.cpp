@@ -116,6 +116,8 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
         diskCommand("unmount", "&Unmount", QKeySequence(Qt::CTRL | Qt::Key_U), DiskAction::Unmount),
         diskCommand("eject", "&Eject", QKeySequence(Qt::CTRL | Qt::Key_E), DiskAction::Eject),
         line,
+        {"saveReport", "&Save Report…", QKeySequence::Save, [this] { dialogs_.saveReport(); },
+         [this] { return dialogs_.canSaveReport(); }},
         {"print", "&Print…", QKeySequence::Print, [this] { print(); }, canPrint},
         line,
         {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {

@@ -2,6 +2,7 @@
 #include "orvane/desktop/WindowDialogs.h"
 
 #include "contract/toolkit/ControlNames.h"
+#include "orvane/desktop/toolkit/Text.h"
 
 namespace orvane::desktop {
 namespace {
@@ -18,6 +19,7 @@ void bringToFront(QWidget& dialog)
 WindowDialogs::~WindowDialogs()
 {
     delete preferences_;
+    delete report_;
 }
 
 void WindowDialogs::showPreferences()
@@ -59,6 +61,39 @@ void WindowDialogs::setShowsDetails(bool shows)
         button->press();
     // Where no module is loaded.
     at_.host.sharedPreferences().setShowDetailsInFixwell(shows);
+}
+
+void WindowDialogs::saveReport()
+{
+    if (!canSaveReport())
+        return;
+    const auto disks = disks_.selected();
+    QStringList names;
+    for (const auto& disk : disks)
+        names += toQtLine(disk->displayName());
+    delete report_;
+    report_ = new ReportDialog(
+        names.join(QStringLiteral(", ")), at_.host.sharedPreferences().showDetailsInFixwell(),
+        at_.host.translator(),
+        [this, disks](ReportScope scope, const QString& file) { save(disks, scope, file); },
+        &at_.window);
+    report_->open();
+}
+
+void WindowDialogs::save(const std::vector<std::shared_ptr<Disk>>& disks, ReportScope scope,
+                         const QString& file)
+{
+    // The oldest records belong to it, too.
+    if (at_.host.histories().loadAll())
+        at_.tabs.reloadLog();
+    saver_ = std::make_unique<ReportSaver>(
+        std::make_unique<Report>(disks, at_.host, scope), file, at_.host.translator(), at_.window,
+        [this](const std::string& failure) {
+            saver_.reset();
+            if (!failure.empty())
+                at_.host.showSheet(at_.host.translator().text("The report was not saved."),
+                                   {failure});
+        });
 }
 
 }  // namespace orvane::desktop

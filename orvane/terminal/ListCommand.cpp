@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskFacts.h"
+#include "orvane/support/texts/Quantities.h"
 #include "orvane/terminal/Commands.h"
 #include "orvane/terminal/TerminalText.h"
 

@@ -184,6 +184,9 @@ TEST_F(Pictures, OfTheDialogs)
         save(dialog("preferencesDialog").grab(), "-preferences-" + std::to_string(page));
     }
     preferences.close();
+    command("saveReport").trigger();
+    save(dialog("reportDialog").grab(), "-report");
+    dialog("reportDialog").close();
 }
 
 }  // namespace
