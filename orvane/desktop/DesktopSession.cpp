@@ -1,7 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
+#include "orvane/desktop/OpenImages.h"
 #include "orvane/desktop/RunNotes.h"
+#include "orvane/support/settings/Switch.h"
 #include "pellar/texts/ErrorTexts.h"
 
 #include <cstdio>
@@ -25,7 +27,8 @@ DesktopSession::DesktopSession(SessionOptions options)
       ledger_(host_, ledgerEvents()),
       tabs_(host_, window_, controller_),
       repairs_(libraryOptions().trials),
-      disks_(host_, loop_, window_.disks(), ledger_, repairs_, options_.disksToOpen,
+      disks_(host_, loop_, window_.disks(), ledger_, repairs_,
+             disksToOpen(host_, options_.disksToOpen),
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -46,7 +49,8 @@ DesktopSession::DesktopSession(SessionOptions options)
                                   {host_.translator().text("No file manager could be started.")});
               }}),
       diskCommands_(parts(), disks_, library_, choices_, undoing_, files_, [this] { update(); }),
-      commands_(parts(), disks_, diskCommands_, [this] { update(); }),
+      dialogs_(parts(), disks_, repairs_, libraryOptions().trials, [this] { update(); }),
+      commands_(parts(), disks_, diskCommands_, dialogs_, [this] { update(); }),
       histories_(options_.paths.state / "history.sqlite3", [this] { takeInHistories(); })
 {
     host_.setWindow(&window_);
@@ -61,6 +65,7 @@ DesktopSession::DesktopSession(SessionOptions options)
 
 DesktopSession::~DesktopSession()
 {
+    rememberImages(host_);
     window_.setEvents({});
     host_.generalPasteboard().setHTMLSource({});
     host_.generalPasteboard().setTextSource({});
@@ -96,13 +101,13 @@ pellar::JobOptions DesktopSession::libraryOptions()
     pellar::JobOptions options =
         orvane::libraryOptions(options_.paths, libraryTexts_, {}, {}, repairAdvice());
     options.outputLimits = options_.outputLimits;
-    options.archiveFetching = {[this] { return fetchesArchives(host_); },
+    options.archiveFetching = {[this] { return fetchesPackageArchives.isOn(host_.standardUserDefaults()); },
                                libraryTexts_.text("The archives of these packages are downloaded "
-                                                  "when “Download Package Archives” is switched "
-                                                  "on in the Edit menu.")};
+                                                  "when “Download package archives” is switched "
+                                                  "on in the preferences.")};
     options.repairPolicy = [this] {
         pellar::RepairPolicy policy = jobPolicy_;
-        policy.isThorough = verifiesThoroughly(host_);
+        policy.isThorough = thoroughVerification.isOn(host_.standardUserDefaults());
         return policy;
     };
     return options;
@@ -231,6 +236,7 @@ void DesktopSession::update()
     tabs_.update();
     hints_.refresh();
     overview_.refresh();
+    dialogs_.refresh();
 }
 
 void DesktopSession::selectionChanged()

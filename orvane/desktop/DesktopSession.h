@@ -103,6 +103,7 @@ private:
     DiskOverview overview_;
     FileManager files_;
     DiskCommands diskCommands_;
+    WindowDialogs dialogs_;
     MenuCommands commands_;
     HistoryWatch histories_;
 };

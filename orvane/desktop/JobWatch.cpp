@@ -5,6 +5,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/jobs/UnavailableReason.h"
+#include "orvane/support/settings/Switch.h"
 
 #include <QApplication>
 
@@ -177,6 +178,7 @@ void JobWatch::end()
     const auto runs = std::exchange(job_.runs, {});
     const bool isActive = QApplication::activeWindow() != nullptr;
     if (!runs.empty() && !closer_.isEnding() &&
+        showsNotices.isOn(at_.host.standardUserDefaults()) &&
         isWorthANotice(length, isActive, longestGlanceAway_))
         notifier_.show(noticeOf(runs, at_.host.translator()));
     // Posted, because the module has not finished with the job when it gives the window free.

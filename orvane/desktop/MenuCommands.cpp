@@ -17,22 +17,10 @@ namespace outlet = contract::outlet;
 
 namespace {
 
-constexpr std::string_view fetchesArchivesKey = "fetchesPackageArchives";
-constexpr std::string_view verifiesThoroughlyKey = "thoroughVerification";
 constexpr const char* diskMenu = "diskMenu";
 const MenuCommand line{};
 
 }  // namespace
-
-bool fetchesArchives(SupportHost& host)
-{
-    return host.standardUserDefaults().objectForKey(fetchesArchivesKey).boolean();
-}
-
-bool verifiesThoroughly(SupportHost& host)
-{
-    return host.standardUserDefaults().objectForKey(verifiesThoroughlyKey).boolean();
-}
 
 void MenuCommands::addMenus()
 {
@@ -118,6 +106,8 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
         whenFree("attachImage", "&Attach Image as Device…", {}, attach),
         whenFree("rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }),
         line,
+        {"saveReport", "&Save Report…", QKeySequence::Save, [this] { dialogs_.saveReport(); },
+         [this] { return dialogs_.canSaveReport(); }},
         {.objectName = "print",
          .title = "&Print…",
          .shortcut = QKeySequence::Print,
@@ -156,9 +146,8 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
          canUndo},
         line,
-        settingCommand("fetchArchives", "Download &Package Archives", fetchesArchivesKey),
-        settingCommand("verifyThoroughly", "&Try a Repair When Verifying (Thorough)",
-                       verifiesThoroughlyKey)};
+        {"preferences", "&Preferences…", QKeySequence(Qt::CTRL | Qt::Key_Comma),
+         [this] { dialogs_.showPreferences(); }}};
 }
 
 std::string MenuCommands::reasonWhileLocked() const
@@ -199,18 +188,6 @@ void MenuCommands::fillRecent(QMenu& menu)
     clear->setObjectName(QStringLiteral("clearRecent"));
     QObject::connect(clear, &QAction::triggered, &at_.window,
                      [this] { disks_.forgetRecentImages(); });
-}
-
-MenuCommand MenuCommands::settingCommand(const char* objectName, std::string_view title,
-                                         std::string_view key)
-{
-    const auto isOn = [this, key] {
-        return at_.host.standardUserDefaults().objectForKey(key).boolean();
-    };
-    const auto change = [this, key, isOn] {
-        at_.host.standardUserDefaults().setObjectForKey(!isOn(), key);
-    };
-    return {objectName, title, {}, change, {}, isOn};
 }
 
 std::vector<MenuCommand> MenuCommands::viewCommands()

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "orvane/desktop/DiskCommands.h"
+#include "orvane/desktop/WindowDialogs.h"
 
 #include <functional>
 #include <string>
@@ -10,19 +11,17 @@
 
 namespace orvane::desktop {
 
-/// Whether the user agrees that archives of packages are fetched over the network.
-[[nodiscard]] bool fetchesArchives(SupportHost& host);
-
-/// Whether a verification that finds nothing tries a repair as well.
-[[nodiscard]] bool verifiesThoroughly(SupportHost& host);
-
 /// What the window's menus do. Main thread.
 class MenuCommands {
 public:
     /// All but `update` outlive this object; it shows what a command has changed.
     MenuCommands(const SessionParts& parts, DiskPane& disks, DiskCommands& diskCommands,
-                 std::function<void()> update)
-        : at_(parts), disks_(disks), diskCommands_(diskCommands), update_(std::move(update))
+                 WindowDialogs& dialogs, std::function<void()> update)
+        : at_(parts),
+          disks_(disks),
+          diskCommands_(diskCommands),
+          dialogs_(dialogs),
+          update_(std::move(update))
     {
     }
     MenuCommands(const MenuCommands&) = delete;
@@ -38,8 +37,6 @@ private:
     std::vector<MenuCommand> fileCommands();
     std::vector<MenuCommand> editCommands();
     std::vector<MenuCommand> viewCommands();
-    MenuCommand settingCommand(const char* objectName, std::string_view title,
-                               std::string_view key);
     MenuCommand recentCommand();
 
     std::string reasonWhileLocked() const;
@@ -60,6 +57,7 @@ private:
     const SessionParts at_;
     DiskPane& disks_;
     DiskCommands& diskCommands_;
+    WindowDialogs& dialogs_;
     const std::function<void()> update_;
 };
 

@@ -4,6 +4,7 @@
 #include "contract/pellar/ErrorCodes.h"
 #include "contract/toolkit/ControlNames.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/settings/Switch.h"
 
 #include <QCheckBox>
 
@@ -14,17 +15,11 @@ namespace orvane::desktop {
 
 namespace selector = contract::selector;
 
-bool asksBeforeRepair(SupportHost& host)
-{
-    const contract::Value kept = host.standardUserDefaults().objectForKey(asksBeforeRepairKey);
-    return kept.isNone() || kept.boolean();
-}
-
 bool RepairChoices::mayPerform(std::string_view action)
 {
     const bool isRepair =
         action == selector::repairDisk || action == selector::repairPermissions;
-    if (!isRepair || isConfirmed_ || !asksBeforeRepair(at_.host))
+    if (!isRepair || isConfirmed_ || !asksBeforeRepair.isOn(at_.host.standardUserDefaults()))
         return true;
     askBeforeRepair(action);
     return false;
@@ -94,7 +89,7 @@ void RepairChoices::askBeforeRepair(std::string_view action)
     again->setChecked(true);
     box->setCheckBox(again);
     QObject::connect(again, &QCheckBox::toggled, &at_.window, [this](bool isOn) {
-        at_.host.standardUserDefaults().setObjectForKey(isOn, asksBeforeRepairKey);
+        asksBeforeRepair.set(at_.host.standardUserDefaults(), isOn);
     });
 }
 

@@ -13,10 +13,6 @@
 
 namespace orvane::desktop {
 
-/// Whether the user wants to be asked before a repair begins; until they say otherwise.
-[[nodiscard]] bool asksBeforeRepair(SupportHost& host);
-inline constexpr std::string_view asksBeforeRepairKey = "asksBeforeRepair";
-
 /// What the user can choose about a repair beyond the module's button: to hear first what will be
 /// written, to see what it would do, and, where it came to nothing, what to do instead. Main
 /// thread.

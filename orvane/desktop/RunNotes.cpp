@@ -5,6 +5,7 @@
 #include "contract/foundation/UTF8.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskRow.h"
+#include "orvane/support/texts/Quantities.h"
 
 #include <QDateTime>
 #include <QLocale>
@@ -20,21 +21,6 @@ QString dateText(RecordTimes::Time time)
         std::chrono::duration_cast<std::chrono::milliseconds>(time.time_since_epoch());
     return QLocale().toString(QDateTime::fromMSecsSinceEpoch(milliseconds.count()),
                               QLocale::ShortFormat);
-}
-
-QString durationText(std::chrono::system_clock::duration duration, const Translator& texts)
-{
-    const std::int64_t seconds = std::chrono::duration_cast<std::chrono::seconds>(duration).count();
-    const auto number = [](std::int64_t value) {
-        return std::to_string(value);
-    };
-    if (seconds < 1)
-        return toQt(texts.text("less than a second"));
-    if (seconds < 60)
-        return toQt(texts.sentence("%@ s", {number(seconds)}));
-    if (seconds < 3600)
-        return toQt(texts.sentence("%@ min %@ s", {number(seconds / 60), number(seconds % 60)}));
-    return toQt(texts.sentence("%@ h %@ min", {number(seconds / 3600), number(seconds / 60 % 60)}));
 }
 
 QString problemsText(std::int64_t problems, const Translator& texts)
@@ -54,7 +40,7 @@ RunNote noteOf(const RunOfRecord& known, const Translator& texts)
         const Run& run = *known.run;
         // A clock that was set back in the middle of a run measures nothing.
         if (run.finished && *run.finished >= run.started)
-            details += durationText(*run.finished - run.started, texts);
+            details += toQt(durationText(*run.finished - run.started, texts));
         if (run.end && !run.end->tool.empty())
             details += toQt(contract::printable(run.end->tool));
         if (run.end && run.end->problems > 0)

@@ -52,7 +52,7 @@ CommandLine readCommandLine(int argc, char** argv)
             std::fputs(usage, stdout);
             return {{}, 0};
         } else if (argument == "--version") {
-            std::puts("orvane " ORVANE_VERSION);
+            std::puts(("orvane " + std::string(programVersion())).c_str());
             return {{}, 0};
         } else {
             std::fprintf(stderr, "orvane: there is no option %s\n%s", argv[i], usage);

@@ -10,6 +10,9 @@
 
 namespace orvane {
 
+/// The finished text of a record with its looks, as modules draw, copy and print it.
+inline const contract::Name finalTextKey{"kOV_finalAttributedString_type"};
+
 /// A row of a disk's log, in the form in which the modules keep and draw it (fixwell/messagelog):
 /// the library's message keys and the finished text, one line.
 [[nodiscard]] contract::Dictionary logRecord(std::optional<contract::Name> type,

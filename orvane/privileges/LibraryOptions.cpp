@@ -61,20 +61,23 @@ std::filesystem::path repairsDirectory(const XDGPaths& paths)
 
 void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairAdvice& advice)
 {
-    const RepairSettings settings =
-        readRepairSettings(fileIn(paths.config, settingsFileName));
+    const std::filesystem::path file = fileIn(paths.config, settingsFileName);
     options.trials.room.directory = repairsDirectory(paths);
     options.trials.isPublic = options.trials.room.directory == systemRepairs;
     if (::geteuid() != 0)
         options.trials.systemDirectory = systemRepairs;
-    options.trials.limits = {settings.keptRepairs,
-                             std::chrono::hours(24 * settings.keptRepairDays),
-                             settings.keptRepairMegabytes << 20U};
+    // Read anew, because they may be changed while the program runs.
+    options.trials.limits = [file] {
+        const RepairSettings settings = readRepairSettings(file);
+        return pellar::RecordLimits{settings.keptRepairs,
+                                    std::chrono::hours(24 * settings.keptRepairDays),
+                                    settings.keptRepairMegabytes << 20U};
+    };
     options.trials.howToUndo = advice.undo;
     options.trials.howToUndoPermissions = advice.undoPermissions;
     options.trials.howToApply = advice.apply;
     options.trials.howToRepairDirectly = advice.repairDirectly;
-    options.repairPolicy = [isThorough = settings.thoroughVerification] {
+    options.repairPolicy = [isThorough = readRepairSettings(file).thoroughVerification] {
         pellar::RepairPolicy policy;
         policy.isThorough = isThorough;
         return policy;

@@ -81,4 +81,9 @@ void setInheritanceRight()
     giveStacksRoom();
 }
 
+std::string_view programVersion()
+{
+    return ORVANE_VERSION;
+}
+
 }  // namespace orvane

@@ -18,7 +18,7 @@ struct CommandText {
     const char* text;
 };
 
-constexpr std::array<CommandText, 13> commandTexts{{
+constexpr std::array<CommandText, 14> commandTexts{{
     {Command::Verify, "verify", "Look for damage; write nothing"},
     {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
     {Command::VerifyPermissions, "verify-permissions",
@@ -28,6 +28,7 @@ constexpr std::array<CommandText, 13> commandTexts{{
     {Command::Finish, "finish", "Complete a repair that was interrupted while it was written"},
     {Command::List, "list", "Show disks, their last verdict and what can be done with them"},
     {Command::History, "history", "Show what earlier checks found"},
+    {Command::Report, "report", "Write what is known of disks and their checks, to be passed on"},
     {Command::Mount, "mount", "Mount volumes, where the system chooses to"},
     {Command::Unmount, "unmount", "Unmount volumes"},
     {Command::Eject, "eject", "Unmount all of a drive, and give the medium back"},
@@ -93,6 +94,8 @@ void addRepairOptions(CLI::App& command, Request& request)
 /// What the parser's rules cannot say; none when there is nothing to object to.
 const char* objectionTo(Request& request)
 {
+    if (request.command == Command::Report && request.isJSON)
+        return "a report is for people; “history --json” tells programs the same";
     std::filesystem::path& kept = request.repairPolicy.keptImage;
     if (kept.empty())
         return nullptr;
@@ -123,6 +126,10 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
         disks.required();
     if (text.command == Command::History)
         command.add_flag("--clear", request.clearsHistory, "Forget these disks' histories");
+    if (text.command == Command::Report) {
+        command.add_flag("--html", request.isHTML, "As a page of HTML");
+        command.add_flag("--last", request.isLastRunAlone, "The last check of each disk alone");
+    }
     if (treatsMaps(text.command))
         command.add_flag("--partition-map", request.treatsPartitionMap,
                          "Treat the disk's partition map (GPT or MBR) instead of its volumes");

@@ -31,6 +31,7 @@ enum class Command {
     Finish,
     List,
     History,
+    Report,
     Mount,
     Unmount,
     Eject,
@@ -46,6 +47,8 @@ struct Request {
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
     bool attachesReadOnly = false;
     bool clearsHistory = false;
+    bool isHTML = false;               ///< a report
+    bool isLastRunAlone = false;       ///< in it
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
     bool treatsPermissions = false;    ///< of installed files; to undo alone
     pellar::RepairPolicy repairPolicy;  ///< the image to keep is named by an absolute path

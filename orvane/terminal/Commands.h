@@ -13,6 +13,8 @@ namespace orvane {
 int runCheck(const Request& request, Session& session, Reporter& reporter);
 int runList(const Request& request, Session& session, Reporter& reporter);
 int runHistory(const Request& request, Session& session, Reporter& reporter);
+/// To standard output.
+int runReport(const Request& request, Session& session);
 /// Undo or finish: one disk after the other.
 int runUndo(const Request& request, Session& session, Reporter& reporter);
 /// Mount, unmount, eject or detach: one disk after the other.

@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/texts/Quantities.h"
 #include "orvane/terminal/Commands.h"
 #include "orvane/terminal/TerminalText.h"
 

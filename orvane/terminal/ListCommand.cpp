@@ -2,6 +2,7 @@
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskFacts.h"
 #include "orvane/support/disks/FormatName.h"
+#include "orvane/support/texts/Quantities.h"
 #include "orvane/terminal/Commands.h"
 #include "orvane/terminal/TerminalText.h"
 

@@ -133,27 +133,6 @@ std::string fittedTo(std::string_view text, std::size_t columns)
     return fitted;
 }
 
-std::string byteCount(std::uint64_t bytes)
-{
-    constexpr std::array units{"B", "KiB", "MiB", "GiB", "TiB", "PiB", "EiB"};
-    auto amount = static_cast<double>(bytes);
-    std::size_t unit = 0;
-    for (; amount >= 1000 && unit + 1 < units.size(); ++unit)
-        amount /= 1024;
-    const bool isRound = unit == 0 || amount >= 9.95 || amount == static_cast<int>(amount);
-    return fmt::format("{:.{}f} {}", amount, isRound ? 0 : 1, units[unit]);
-}
-
-std::string localTime(std::chrono::system_clock::time_point time)
-{
-    const std::time_t seconds = std::chrono::system_clock::to_time_t(time);
-    std::tm parts{};
-    std::array<char, 32> text{};
-    if (::localtime_r(&seconds, &parts) == nullptr)
-        return {};
-    return {text.data(), std::strftime(text.data(), text.size(), "%Y-%m-%d %H:%M", &parts)};
-}
-
 std::string progressLine(const JobProgress& progress, std::size_t columns)
 {
     const std::string gauge =

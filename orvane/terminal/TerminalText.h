@@ -25,12 +25,6 @@ std::string shellWord(std::string_view text);
 /// As much of `text`, which must be printable, as fits into `columns` columns.
 std::string fittedTo(std::string_view text, std::size_t columns);
 
-/// "512 B", "1.5 MiB", "40 GiB": at most three digits, in powers of 1024 (IEC 80000-13).
-std::string byteCount(std::uint64_t bytes);
-
-/// "2024-05-06 07:08", the local time.
-std::string localTime(std::chrono::system_clock::time_point time);
-
 /// How far a job is, as the bottom line of a terminal shows it.
 struct JobProgress {
     std::optional<double> percent;  ///< none while there is no telling

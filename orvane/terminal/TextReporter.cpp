@@ -4,6 +4,7 @@
 #include "contract/foundation/Format.h"
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
+#include "orvane/support/texts/Quantities.h"
 #include "orvane/terminal/TerminalText.h"
 
 #include <fmt/format.h>

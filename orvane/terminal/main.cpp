@@ -54,6 +54,7 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
         case Command::Eject:
         case Command::Detach: return runDiskAction(request, session, reporter);
         case Command::Attach: return runAttach(request, session, reporter);
+        case Command::Report: return runReport(request, session);
         default: break;  // what needs the module
     }
     if (const auto loaded = session.loadModule(); !loaded) {

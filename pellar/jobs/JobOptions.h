@@ -54,7 +54,10 @@ struct Trials {
     bool isPublic = false;
     /// Where the administrator keeps repairs for all; empty where it is the room's directory.
     std::filesystem::path systemDirectory = {};
-    RecordLimits limits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
+    /// What may be kept; asked on the job's thread after each repair.
+    std::function<RecordLimits()> limits = [] {
+        return RecordLimits{20, std::chrono::hours(24 * 90), std::uint64_t{4} << 30U};
+    };
     uid_t user = ::geteuid();  ///< who asks, and may take a repair back
     /// Makes a sentence in the user's language about a disk; asked on the job's thread, while the
     /// main thread runs. May be empty, and answer nothing, which is not told.

@@ -173,7 +173,7 @@ void RecordedRestoring::finish()
         return log_.error(notKept(error));
     const Trials& trials = context_.options.trials;
     if (const auto records = openPermissionRecords(trials))
-        records->removeBeyond(trials.limits, std::chrono::system_clock::now());
+        records->removeBeyond(trials.limits(), std::chrono::system_clock::now());
     if (isKept)
         context_.advise(trials.howToUndoPermissions);
 }

@@ -101,7 +101,7 @@ void RecordedWriting::keepWithinLimits(const UndoStore& store, const std::string
             context_.log.remark(removed.error());
         return;
     }
-    store.removeBeyond(trials.limits, std::chrono::system_clock::now());
+    store.removeBeyond(trials.limits(), std::chrono::system_clock::now());
     context_.advise(trials.howToUndo);
 }
 

@@ -7,6 +7,7 @@
 
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/settings/Switch.h"
 #include "pellar/permissions/PermissionRecords.h"
 #include "pellar/probe/DiskProbe.h"
 
@@ -300,7 +301,7 @@ TEST_F(RepairTest, VerifyingThoroughlyIsKeptAndTriesARepair)
     const std::string image = openImage("sound");
     run("verifyDiskButton");
     EXPECT_FALSE(logHolds("Trying a repair"));
-    command("verifyThoroughly").trigger();
+    thoroughVerification.set(session().host().standardUserDefaults(), true);
     close();
     open({image});
     run("verifyDiskButton", image);

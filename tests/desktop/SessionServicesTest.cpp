@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/support/settings/Switch.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/desktop/session/FakeServices.h"
 #include "tests/desktop/session/PrivateBus.h"
@@ -67,9 +68,13 @@ TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWi
         takeSheet();
     };
     verify(true);
+    showsNotices.set(session().host().standardUserDefaults(), false);
+    verify(false);
+    window().show();
+    showsNotices.set(session().host().standardUserDefaults(), true);
     verify(false);
     ASSERT_TRUE(waitUntil([&] { return !notifications_->shown.empty(); }));
-    ASSERT_EQ(notifications_->shown.size(), 1U) << "the first was watched";
+    ASSERT_EQ(notifications_->shown.size(), 1U) << "one was watched, one not wanted";
     EXPECT_EQ(notifications_->shown.front().title, QStringLiteral("Verification of “a <b>”"));
     window().showMinimized();
     EXPECT_TRUE(waitUntil([&] {

@@ -2,6 +2,7 @@
 #include "tests/desktop/WindowFixture.h"
 
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/support/settings/Switch.h"
 #include "tests/support/TestDirectory.h"
 
 #include <QAbstractButton>
@@ -71,7 +72,7 @@ void WindowFixture::openWith(SessionOptions options)
 {
     wasClosed_ = false;
     session_ = std::make_unique<DesktopSession>(std::move(options));
-    session_->host().standardUserDefaults().setObjectForKey(asksFirst_, asksBeforeRepairKey);
+    asksBeforeRepair.set(session_->host().standardUserDefaults(), asksFirst_);
     session_->show();
 }
 

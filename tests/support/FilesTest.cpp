@@ -92,6 +92,8 @@ TEST(RepairSettings, WhatIsNoSensibleNumberIsAsItWas)
     test::write(file, R"({"keptRepairs": -1, "keptRepairDays": "3", "keptRepairMegabytes": 1e30,
                     "thoroughVerification": "perhaps"})");
     EXPECT_EQ(readRepairSettings(file), RepairSettings());
+    test::write(file, R"({"keptRepairs": 1000000, "keptRepairDays": 1000000})");
+    EXPECT_EQ(readRepairSettings(file), (RepairSettings{unlimitedRepairs, mostRepairDays}));
     test::write(file, R"({"keptRepairs": 99999999999999999999})");
     EXPECT_EQ(readRepairSettings(file), RepairSettings());
     test::write(file, "[");

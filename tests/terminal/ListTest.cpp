@@ -68,6 +68,25 @@ TEST_F(HistoryCommandTest, RunsOutliveTheProgramUntilTheyAreCleared)
     EXPECT_EQ(verdicts("b").size(), 1U) << "each image has its own";
 }
 
+TEST_F(HistoryCommandTest, AReportTellsTheDiskAndItsRunsAndFailsWhereItCannotBeWritten)
+{
+    makeDamagedVolume("a");
+    for (const char* const command : {"verify", "repair"})
+        static_cast<void>(run({command, "a"}));
+    const std::string all = run({"report", "a"}).output;
+    EXPECT_LT(all.find("· damaged"), all.find("needs to be repaired")) << all;
+    EXPECT_LT(all.find("needs to be repaired"), all.find("· repaired")) << all;
+    EXPECT_EQ(all.find("never checked"), std::string::npos);
+    EXPECT_EQ(all.find("Checking inodes"), std::string::npos);
+    const std::string last = run({"report", "--last", "--html", "--details", "a"}).output;
+    EXPECT_EQ(last.find("damaged</h3>"), std::string::npos) << last;
+    EXPECT_NE(last.find("repaired</h3>"), std::string::npos) << last;
+    EXPECT_NE(last.find("<li>Checking inodes"), std::string::npos) << last;
+    EXPECT_TRUE(last.ends_with("</html>\n"));
+    EXPECT_EQ(run({"report", "--json", "a"}).status, 16);
+    EXPECT_EQ(run({"report", "nowhere"}).status, 8);
+}
+
 class DiskActionTest : public ProgramTest {
 protected:
     void SetUp() override

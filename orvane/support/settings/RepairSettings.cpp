@@ -5,39 +5,53 @@
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/ValueJSON.h"
 
+#include <algorithm>
+#include <functional>
 #include <string_view>
 
 namespace orvane {
 namespace {
 
-constexpr std::int64_t mostOfAnything = 1'000'000;
+using Lookup = std::function<contract::Value(std::string_view key)>;
 
-void take(const nlohmann::json& settings, std::string_view key, std::uint64_t& number)
+void take(const contract::Value& value, std::uint64_t& number)
 {
-    const auto found = settings.find(key);
-    if (found == settings.end() || !found->is_number_integer())
-        return;
-    const auto value = found->get<std::int64_t>();
-    if (value >= 0 && value <= mostOfAnything)
-        number = static_cast<std::uint64_t>(value);
+    if (value.kind() == contract::Kind::Integer && value.integer() >= 0 &&
+        value.integer() <= static_cast<std::int64_t>(unlimitedRepairs))
+        number = static_cast<std::uint64_t>(value.integer());
+}
+
+RepairSettings settingsFrom(const Lookup& valueOf)
+{
+    RepairSettings read;
+    take(valueOf("keptRepairs"), read.keptRepairs);
+    take(valueOf("keptRepairDays"), read.keptRepairDays);
+    read.keptRepairDays = std::min(read.keptRepairDays, mostRepairDays);
+    take(valueOf("keptRepairMegabytes"), read.keptRepairMegabytes);
+    const contract::Value thorough = valueOf("thoroughVerification");
+    read.thoroughVerification =
+        thorough.kind() == contract::Kind::Boolean && thorough.boolean();
+    return read;
 }
 
 }  // namespace
 
 RepairSettings readRepairSettings(const std::filesystem::path& file)
 {
-    RepairSettings read;
     const auto contents = readWholeFile(file, largestSettingsFile);
     const auto settings = parsedJSON(contents ? *contents : "");
-    if (!settings.is_object())
-        return read;
-    take(settings, "keptRepairs", read.keptRepairs);
-    take(settings, "keptRepairDays", read.keptRepairDays);
-    take(settings, "keptRepairMegabytes", read.keptRepairMegabytes);
-    const auto thorough = settings.find("thoroughVerification");
-    read.thoroughVerification =
-        thorough != settings.end() && thorough->is_boolean() && thorough->get<bool>();
-    return read;
+    return settingsFrom([&settings](std::string_view key) {
+        const auto found = settings.is_object() ? settings.find(key) : settings.end();
+        const bool isPlain =
+            found != settings.end() && (found->is_number_integer() || found->is_boolean());
+        return isPlain ? valueFromJSON(*found) : contract::Value();
+    });
+}
+
+RepairSettings repairSettingsIn(const contract::UserDefaults& settings)
+{
+    return settingsFrom(
+        [&settings](std::string_view key) { return settings.objectForKey(key); });
 }
 
 }  // namespace orvane

@@ -13,6 +13,7 @@
 #include <QMenu>
 #include <QMimeData>
 #include <QPainter>
+#include <QTabWidget>
 #include <QTest>
 
 #include <cstdlib>
@@ -244,7 +245,7 @@ TEST_F(Pictures, OfARepairThatIsUndone)
     const std::string interrupted = makeImage("Photos");
     orvane::test::interruptRepair(interrupted, directory_ / "state/repairs/records");
     openInOneSize({image, interrupted});
-    takePictureOfMenu("verifyThoroughly", "-settings");
+    takePictureOfMenu("preferences", "-edit-menu");
     takePicture("-interrupted-row");
     select(interrupted);
     QTest::qWait(300);
@@ -278,6 +279,28 @@ TEST_F(Pictures, OfARepairThatIsNotProven)
     take(NextStep::ApplyUnproven);
     QTest::qWait(100);
     takePicture("-unproven-confirmation");
+}
+
+TEST_F(Pictures, OfTheDialogs)
+{
+    const std::string image = makeDamagedImage("Letters");
+    openInOneSize({image});
+    treat("repairDiskButton", image);
+    const auto dialog = [this](const char* name) -> QWidget& {
+        QTest::qWait(100);
+        return *window().findChild<QWidget*>(QLatin1String(name));
+    };
+    command("preferences").trigger();
+    QWidget& preferences = dialog("preferencesDialog");
+    auto& pages = *preferences.findChild<QTabWidget*>();
+    for (int page = 0; page < pages.count(); ++page) {
+        pages.setCurrentIndex(page);
+        save(dialog("preferencesDialog").grab(), "-preferences-" + std::to_string(page));
+    }
+    preferences.close();
+    command("saveReport").trigger();
+    save(dialog("reportDialog").grab(), "-report");
+    dialog("reportDialog").close();
 }
 
 }  // namespace

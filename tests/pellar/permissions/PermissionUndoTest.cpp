@@ -384,7 +384,9 @@ TEST_F(PermissionUndo, ARecordIsForItsUserItsSystemAndItsTime)
 
 TEST_F(PermissionUndo, RecordsAreKeptWithinTheirLimits)
 {
-    options_.trials.limits.records = 2;
+    options_.trials.limits = [] {
+        return RecordLimits{2, std::chrono::hours(1), 0};
+    };
     for (int i = 0; i < 3; ++i) {
         damage();
         PermissionBench bench(options_);
