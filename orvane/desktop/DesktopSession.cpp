@@ -42,7 +42,7 @@ DesktopSession::DesktopSession(SessionOptions options)
       undoing_(parts(), disks_, repairs_, libraryTexts_, observedOptions(), [this] { update(); }),
       choices_(parts(), disks_, repairs_, jobPolicy_, [this] { overview_.explainCopying(); }),
       overview_(parts(), disks_, repairs_, choices_, undoing_),
-      dialogs_(parts(), disks_, repairs_, libraryOptions().trials, [this] { update(); }),
+      dialogs_(parts(), disks_, repairs_, libraryOptions(), [this] { update(); }),
       commands_(parts(), disks_, library_, choices_, undoing_, dialogs_, [this] { update(); })
 {
     host_.setWindow(&window_);

@@ -8,6 +8,8 @@
 
 #include <QAccessible>
 #include <QCheckBox>
+#include <QApplication>
+#include <QClipboard>
 #include <QComboBox>
 #include <QDialogButtonBox>
 #include <QFile>
@@ -18,6 +20,7 @@
 #include <QPushButton>
 #include <QRadioButton>
 #include <QStandardPaths>
+#include <QTableWidget>
 
 namespace orvane::desktop::test {
 namespace {
@@ -127,6 +130,27 @@ TEST_F(PreferencesTest, TheImagesOfTheLastTimeComeBackWhereThatIsWanted)
     openWith(options({}));
     QTest::qWait(50);
     EXPECT_EQ(window().disks().model()->rowCount(), 0) << "they were forgotten";
+}
+
+TEST_F(DialogTest, AboutTellsTheToolsWithTheirVersionsAndCopiesThem)
+{
+    open({});
+    command("about").trigger();
+    auto& dialog = control<QDialog>("aboutDialog");
+    auto& tools = *dialog.findChild<QTableWidget*>();
+    ASSERT_TRUE(waitUntil([&tools] { return tools.rowCount() >= 7; }));
+    std::map<std::string, std::string> versions;
+    for (int row = 0; row < tools.rowCount(); ++row)
+        versions[fromQt(tools.item(row, 0)->text())] = fromQt(tools.item(row, 1)->text());
+    EXPECT_TRUE(versions["e2fsck"].starts_with("1.")) << versions["e2fsck"];
+    for (const auto& [tool, version] : versions)
+        EXPECT_NE(version, "unknown") << tool;
+    auto* const buttons = dialog.findChild<QDialogButtonBox*>();
+    for (QAbstractButton* const button : buttons->buttons())
+        if (buttons->buttonRole(button) == QDialogButtonBox::ActionRole)
+            button->click();
+    EXPECT_NE(fromQt(QApplication::clipboard()->text()).find("e2fsck " + versions["e2fsck"]),
+              std::string::npos);
 }
 
 class ReportTest : public DialogTest {
