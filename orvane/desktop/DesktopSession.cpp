@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/DesktopSession.h"
 
-#include "orvane/desktop/OpenImages.h"
 #include "orvane/desktop/RunNotes.h"
 #include "orvane/support/settings/Switch.h"
 #include "pellar/texts/ErrorTexts.h"
@@ -28,7 +27,7 @@ DesktopSession::DesktopSession(SessionOptions options)
       tabs_(host_, window_, controller_),
       repairs_(libraryOptions().trials),
       disks_(host_, loop_, window_.disks(), ledger_, repairs_,
-             disksToOpen(host_, options_.disksToOpen),
+             options_.disksToOpen,
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -49,7 +48,7 @@ DesktopSession::DesktopSession(SessionOptions options)
                                   {host_.translator().text("No file manager could be started.")});
               }}),
       diskCommands_(parts(), disks_, library_, choices_, undoing_, files_, [this] { update(); }),
-      dialogs_(parts(), disks_, repairs_, libraryOptions().trials, [this] { update(); }),
+      dialogs_(parts(), disks_, repairs_, libraryOptions(), [this] { update(); }),
       commands_(parts(), disks_, diskCommands_, dialogs_, [this] { update(); }),
       histories_(options_.paths.state / "history.sqlite3", [this] { takeInHistories(); })
 {
@@ -65,7 +64,6 @@ DesktopSession::DesktopSession(SessionOptions options)
 
 DesktopSession::~DesktopSession()
 {
-    rememberImages(host_);
     window_.setEvents({});
     host_.generalPasteboard().setHTMLSource({});
     host_.generalPasteboard().setTextSource({});

@@ -73,7 +73,8 @@ std::vector<Menu> MenuCommands::menus()
             {"&View", viewCommands()},
             {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
                             at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
-                        }}}}};
+                        }},
+                        {"about", "&About Orvane", {}, [this] { dialogs_.showAbout(); }}}}};
 }
 
 std::vector<MenuCommand> MenuCommands::fileCommands()

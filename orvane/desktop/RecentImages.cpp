@@ -2,6 +2,7 @@
 #include "orvane/desktop/RecentImages.h"
 
 #include "contract/foundation/Array.h"
+#include "orvane/support/settings/Switch.h"
 
 #include <algorithm>
 
@@ -41,8 +42,7 @@ void RecentImages::clear()
 
 std::vector<std::string> RecentImages::toReopen() const
 {
-    return settings_.objectForKey(reopensImagesKey).boolean() ? stored(openKey)
-                                                              : std::vector<std::string>();
+    return reopensImages.isOn(settings_) ? stored(openKey) : std::vector<std::string>();
 }
 
 void RecentImages::keepOpen(const std::vector<std::string>& images)

@@ -9,9 +9,6 @@
 
 namespace orvane::desktop {
 
-/// Whether the images that were open come back with the next start; NO until the user says so.
-inline constexpr std::string_view reopensImagesKey = "reopensImages";
-
 /// The images that were opened before, in the settings: any bytes that are a path. Main thread.
 class RecentImages {
 public:
@@ -27,7 +24,7 @@ public:
     void clear();
 
     /// What was open when `keepOpen` was last called, in its order; nothing where the user does not
-    /// want to have it opened again.
+    /// want to have it opened again (`reopensImages`).
     std::vector<std::string> toReopen() const;
     void keepOpen(const std::vector<std::string>& images);
 

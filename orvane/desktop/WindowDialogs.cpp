@@ -19,6 +19,7 @@ void bringToFront(QWidget& dialog)
 WindowDialogs::~WindowDialogs()
 {
     delete preferences_;
+    delete about_;
     delete report_;
 }
 
@@ -28,6 +29,14 @@ void WindowDialogs::showPreferences()
         preferences_ = new PreferencesDialog(preferences(), &at_.window);
     preferences_->refresh();
     bringToFront(*preferences_);
+}
+
+void WindowDialogs::showAbout()
+{
+    if (!about_)
+        about_ = new AboutDialog(toolPath_, at_.host.mainRunLoop(), at_.host.translator(),
+                                 &at_.window);
+    bringToFront(*about_);
 }
 
 void WindowDialogs::refresh()

@@ -4,6 +4,7 @@
 #include "orvane/desktop/DiskPane.h"
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/ModuleTabs.h"
+#include "orvane/desktop/dialogs/AboutDialog.h"
 #include "orvane/desktop/dialogs/PreferencesDialog.h"
 #include "orvane/desktop/dialogs/ReportDialog.h"
 #include "orvane/desktop/dialogs/ReportSaver.h"
@@ -20,8 +21,8 @@ class WindowDialogs {
 public:
     /// All but `update`, which shows what has changed, outlive this object.
     WindowDialogs(const SessionParts& parts, DiskPane& disks, KeptRepairs& kept,
-                  pellar::Trials trials, std::function<void()> update)
-        : at_(parts), disks_(disks), kept_(kept), trials_(std::move(trials)), update_(std::move(update))
+                  const pellar::JobOptions& library, std::function<void()> update)
+        : at_(parts), disks_(disks), kept_(kept), trials_(library.trials), toolPath_(library.toolPath), update_(std::move(update))
     {
     }
     WindowDialogs(const WindowDialogs&) = delete;
@@ -29,6 +30,8 @@ public:
     ~WindowDialogs();
 
     void showPreferences();
+
+    void showAbout();
 
     /// Of the selected disks.
     void saveReport();
@@ -47,8 +50,10 @@ private:
     DiskPane& disks_;
     KeptRepairs& kept_;
     const pellar::Trials trials_;
+    const std::string toolPath_;
     const std::function<void()> update_;
     QPointer<PreferencesDialog> preferences_;
+    QPointer<AboutDialog> about_;
     QPointer<ReportDialog> report_;
     std::unique_ptr<ReportSaver> saver_;  ///< while a report is saved
 };

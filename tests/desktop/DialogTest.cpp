@@ -8,6 +8,8 @@
 
 #include <QAccessible>
 #include <QCheckBox>
+#include <QApplication>
+#include <QClipboard>
 #include <QComboBox>
 #include <QDialogButtonBox>
 #include <QFile>
@@ -18,6 +20,7 @@
 #include <QPushButton>
 #include <QRadioButton>
 #include <QStandardPaths>
+#include <QTableWidget>
 
 namespace orvane::desktop::test {
 namespace {
@@ -102,31 +105,6 @@ TEST_F(PreferencesTest, SayHowMuchIsKeptOfRepairsAndLimitAndDeleteIt)
     run("repairDiskButton", images[2]);
     EXPECT_EQ(verdict(images[2]), "repaired");
     EXPECT_EQ(keptNow(), "Nothing is kept now.") << "asked for while the program ran";
-}
-
-TEST_F(PreferencesTest, TheImagesOfTheLastTimeComeBackWhereThatIsWanted)
-{
-    const std::vector<std::string> images{makeImage("one"), makeImage("two"), makeImage("three")};
-    const auto openAgain = [this] {
-        close();
-        openWith(options({}));
-        return waitUntil([this] { return window().disks().model()->rowCount() > 0; });
-    };
-    open(images);
-    reopensImages.set(settings(), true);
-    close();
-    std::filesystem::remove(images[1]);
-    ASSERT_TRUE(openAgain());
-    EXPECT_TRUE(row(images[0]).isValid() && row(images[2]).isValid());
-    EXPECT_EQ(sheet(), nullptr) << "the one that has gone is no news";
-    reopensImages.set(settings(), false);
-    close();
-    openWith(options({}));
-    reopensImages.set(settings(), true);
-    close();
-    openWith(options({}));
-    QTest::qWait(50);
-    EXPECT_EQ(window().disks().model()->rowCount(), 0) << "they were forgotten";
 }
 
 class ReportTest : public DialogTest {

@@ -126,7 +126,7 @@ TEST_F(DiskMenuTest, WhatWasOpenComesBackWhereTheUserWantsIt)
     close();
 
     open({one, two});
-    session().host().standardUserDefaults().setObjectForKey(true, reopensImagesKey);
+    reopensImages.set(session().host().standardUserDefaults(), true);
     close();
     std::filesystem::remove(two);
     openWith(options({closed}));

@@ -56,14 +56,14 @@ TEST_F(SessionServicesTest, OnlyARepairKeepsTheMachineAwakeAndOnlyUntilItsEnd)
 TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWindow)
 {
     openWithServices(makeDamagedImage("a <b>"));
-    const auto verify = [this](bool isWatched) {
+    const auto verify = [this](bool isWatched, const char* name = "verifyDiskButton") {
         if (isWatched)
             window().activateWindow();
         else
             window().hide();
         ASSERT_TRUE(
             waitUntil([&] { return (QApplication::activeWindow() != nullptr) == isWatched; }));
-        button("verifyDiskButton").press();
+        button(name).press();
         ASSERT_TRUE(waitForJob());
         takeSheet();
     };
@@ -72,10 +72,10 @@ TEST_F(SessionServicesTest, AJobThatNobodyWatchesIsAnnouncedAndAClickBringsTheWi
     verify(false);
     window().show();
     showsNotices.set(session().host().standardUserDefaults(), true);
-    verify(false);
+    verify(false, "repairDiskButton");
     ASSERT_TRUE(waitUntil([&] { return !notifications_->shown.empty(); }));
     ASSERT_EQ(notifications_->shown.size(), 1U) << "one was watched, one not wanted";
-    EXPECT_EQ(notifications_->shown.front().title, QStringLiteral("Verification of “a <b>”"));
+    EXPECT_EQ(notifications_->shown.front().title, QStringLiteral("Repair of “a <b>”"));
     window().showMinimized();
     EXPECT_TRUE(waitUntil([&] {
         emit notifications_->ActionInvoked(7, QStringLiteral("default"));

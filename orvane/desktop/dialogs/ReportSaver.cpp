@@ -214,7 +214,7 @@ void ReportSaver::end(const std::string& failure)
         return;
     nextSlice_.stop();
     if (progress_)
-        progress_->deleteLater();
+        progress_->hide();
     QTimer::singleShot(0, &nextSlice_, [ended = ended_, failure] { ended(failure); });
 }
 

@@ -298,6 +298,10 @@ TEST_F(Pictures, OfTheDialogs)
         save(dialog("preferencesDialog").grab(), "-preferences-" + std::to_string(page));
     }
     preferences.close();
+    command("about").trigger();
+    QTest::qWait(2000);
+    save(dialog("aboutDialog").grab(), "-about");
+    dialog("aboutDialog").close();
     command("saveReport").trigger();
     save(dialog("reportDialog").grab(), "-report");
     dialog("reportDialog").close();
