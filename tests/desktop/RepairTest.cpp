@@ -126,7 +126,7 @@ TEST_F(RepairTest, ARepairIsPreviewedDoneAndTakenBack)
     EXPECT_TRUE(waitUntil([&] { return sheet() == nullptr; })) << "there is nothing left to ask";
     EXPECT_EQ(verdict(image), "undone");
     EXPECT_TRUE(contentsOf(image) == before) << "it is as it was, to the byte";
-    EXPECT_TRUE(logHolds("undid the repair of “damaged”")) << testing::PrintToString(logRows());
+    EXPECT_TRUE(logHolds("Undid the repair of “damaged”")) << testing::PrintToString(logRows());
     EXPECT_NE(whyGrey("undoRepair"), "") << "what was put back is not kept any longer";
 }
 
