@@ -156,9 +156,25 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
          canUndo},
         line,
+        findCommand(),
+        line,
         settingCommand("fetchArchives", "Download &Package Archives", fetchesArchivesKey),
         settingCommand("verifyThoroughly", "&Try a Repair When Verifying (Thorough)",
                        verifiesThoroughlyKey)};
+}
+
+// The key is the search's own.
+MenuCommand MenuCommands::findCommand()
+{
+    const auto search = [this] {
+        return at_.tabs.interface() != nullptr ? at_.tabs.interface()->search() : nullptr;
+    };
+    return {.objectName = "findInLog",
+            .title = "&Find in the Log",
+            .shortcut = {},
+            .perform = [search] { search()->open(); },
+            .isAvailable = [search] { return search() != nullptr; },
+            .shownShortcut = QKeySequence(Qt::CTRL | Qt::Key_F)};
 }
 
 std::string MenuCommands::reasonWhileLocked() const

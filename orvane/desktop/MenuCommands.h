@@ -41,6 +41,7 @@ private:
     MenuCommand settingCommand(const char* objectName, std::string_view title,
                                std::string_view key);
     MenuCommand recentCommand();
+    MenuCommand findCommand();
 
     std::string reasonWhileLocked() const;
     bool isLocked() const { return at_.controller.interfaceLock(); }
