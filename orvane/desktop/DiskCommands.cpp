@@ -4,6 +4,7 @@
 #include "contract/toolkit/ControlNames.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/PropertiesDialog.h"
+#include "orvane/jobs/UnavailableReason.h"
 
 #include <QApplication>
 #include <QClipboard>
@@ -69,7 +70,12 @@ MenuCommand DiskCommands::preview()
             .title = "Previe&w Repair",
             .shortcut = {},
             .perform = [this] { choices_.preview(); },
-            .reasonAgainst = [this] { return choices_.reasonAgainstPreview(); }};
+            .reasonAgainst = [this] {
+                // Where its button is grey, for the button's reason.
+                const std::string reason = choices_.reasonAgainstPreview();
+                const std::string button = reasonAgainstButton(outlet::repairDisk);
+                return reason.empty() || button.empty() ? reason : button;
+            }};
 }
 
 MenuCommand DiskCommands::undo(const char* objectName, std::string_view title,
@@ -188,6 +194,11 @@ std::string DiskCommands::reasonAgainstButton(std::string_view button)
         return text("Not available while a job runs.");
     if (control->isEnabled())
         return {};
+    // The library's reason says more than the module's.
+    if (const auto disks = disks_.selected(); disks.size() == 1)
+        if (std::string why = whyUnavailable(*disks.front(), library_, at_.host.translator());
+            !why.empty())
+            return why;
     return control->reason().empty() ? text("Not available for this disk.") : control->reason();
 }
 

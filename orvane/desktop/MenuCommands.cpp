@@ -147,8 +147,24 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         {"undoClear", "&Undo Clear History", QKeySequence::Undo, [this] { undoClearing(); },
          canUndo},
         line,
+        findCommand(),
+        line,
         {"preferences", "&Preferences…", QKeySequence(Qt::CTRL | Qt::Key_Comma),
          [this] { dialogs_.showPreferences(); }}};
+}
+
+// The key is the search's own.
+MenuCommand MenuCommands::findCommand()
+{
+    const auto search = [this] {
+        return at_.tabs.interface() != nullptr ? at_.tabs.interface()->search() : nullptr;
+    };
+    return {.objectName = "findInLog",
+            .title = "&Find in the Log",
+            .shortcut = {},
+            .perform = [search] { search()->open(); },
+            .isAvailable = [search] { return search() != nullptr; },
+            .shownShortcut = QKeySequence(Qt::CTRL | Qt::Key_F)};
 }
 
 std::string MenuCommands::reasonWhileLocked() const

@@ -38,6 +38,7 @@ private:
     std::vector<MenuCommand> editCommands();
     std::vector<MenuCommand> viewCommands();
     MenuCommand recentCommand();
+    MenuCommand findCommand();
 
     std::string reasonWhileLocked() const;
     bool isLocked() const { return at_.controller.interfaceLock(); }

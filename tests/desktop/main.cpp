@@ -1,4 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/texts/Language.h"
 
 #include <gtest/gtest.h>
@@ -15,6 +16,7 @@ int main(int argc, char** argv)
     orvane::adoptUserLocale();
     testing::InitGoogleTest(&argc, argv);
     const QApplication application(argc, argv);
+    QApplication::setStyle(new orvane::desktop::FramedStyle);
     QApplication::setQuitOnLastWindowClosed(false);
     return RUN_ALL_TESTS();
 }

@@ -112,6 +112,14 @@ void FramedStyle::drawPrimitive(PrimitiveElement element, const QStyleOption* op
     painter->restore();
 }
 
+int FramedStyle::styleHint(StyleHint hint, const QStyleOption* option, const QWidget* widget,
+                           QStyleHintReturn* answer) const
+{
+    return hint == SH_Menu_AllowActiveAndDisabled
+               ? 1
+               : QProxyStyle::styleHint(hint, option, widget, answer);
+}
+
 QPalette darkPalette()
 {
     QPalette palette(QColor(0x4a, 0x4a, 0x4a), QColor(0x38, 0x38, 0x38));

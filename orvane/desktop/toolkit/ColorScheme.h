@@ -23,13 +23,16 @@ QColor readableOn(const QColor& background, const QColor& wanted);
 QColor mixedColor(const QColor& a, const QColor& b, double share);
 
 /// The style "Fusion" with frames around check boxes and radio buttons that are seen on dark ground
-/// as well (WCAG 2.1, 1.4.11).
+/// as well (WCAG 2.1, 1.4.11), and with menus in which the arrow keys also come to what is grey, so
+/// that its reason can be read.
 class FramedStyle final : public QProxyStyle {
 public:
     FramedStyle();
 
     void drawPrimitive(PrimitiveElement element, const QStyleOption* option, QPainter* painter,
                        const QWidget* widget) const override;
+    int styleHint(StyleHint hint, const QStyleOption* option, const QWidget* widget,
+                  QStyleHintReturn* answer) const override;
 };
 
 /// Light text on dark ground, for the style "Fusion".

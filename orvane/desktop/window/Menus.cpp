@@ -5,6 +5,8 @@
 
 #include <QMenu>
 #include <QMenuBar>
+#include <QTimer>
+#include <QToolTip>
 
 namespace orvane::desktop {
 namespace {
@@ -79,6 +81,20 @@ void addCommand(QMenu& menu, const MenuCommand& command, const Translator& texts
         Qt::QueuedConnection);
 }
 
+/// Why a command is grey, for those who come to it with the arrow keys: the pointer shows it by
+/// itself.
+void tellWhyGrey(QMenu& menu, QAction* action)
+{
+    const QRect place = menu.actionGeometry(action);
+    if (action->isEnabled() || place.contains(menu.mapFromGlobal(QCursor::pos())))
+        return;
+    // Once the menu has settled: what happens to it until then hides a tool tip.
+    QTimer::singleShot(0, action, [&menu, action, place] {
+        if (menu.activeAction() == action)
+            QToolTip::showText(menu.mapToGlobal(place.bottomLeft()), action->toolTip(), &menu);
+    });
+}
+
 }  // namespace
 
 void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Translator& texts)
@@ -87,6 +103,8 @@ void addMenus(QMainWindow& window, const std::vector<Menu>& menus, const Transla
         QMenu* const added = window.menuBar()->addMenu(toQt(texts.text(menu.title)));
         added->setObjectName(QLatin1String(menu.objectName));
         added->setToolTipsVisible(true);
+        QObject::connect(added, &QMenu::hovered, added,
+                         [added](QAction* action) { tellWhyGrey(*added, action); });
         for (const MenuCommand& command : menu.commands)
             addCommand(*added, command, texts);
     }

@@ -12,6 +12,21 @@ namespace {
 
 constexpr int widthInCharacters = 60;
 
+/// The title with a letter of its own, by which the keyboard reaches the answer at once; `taken`
+/// are the others'. Without one where there is none left.
+QString withLetter(const std::string& title, QString& taken)
+{
+    const QString text = toQtLine(title);
+    for (qsizetype i = 0; i < text.size(); ++i) {
+        const QChar letter = text[i].toLower();
+        if (!letter.isLetter() || taken.contains(letter))
+            continue;
+        taken += letter;
+        return toQtTitle(fromQt(text.first(i))) + u'&' + toQtTitle(fromQt(text.sliced(i)));
+    }
+    return toQtTitle(title);
+}
+
 }  // namespace
 
 QMessageBox* ask(QWidget& window, const Question& question)
@@ -29,9 +44,10 @@ QMessageBox* ask(QWidget& window, const Question& question)
     }
     box->setWindowModality(Qt::WindowModal);
     box->setAttribute(Qt::WA_DeleteOnClose);
+    QString letters;
     for (const Question::Answer& answer : question.answers) {
         QPushButton* const button =
-            box->addButton(toQtTitle(answer.title), QMessageBox::DestructiveRole);
+            box->addButton(withLetter(answer.title, letters), QMessageBox::DestructiveRole);
         // Another sheet may follow, or a job begin.
         QObject::connect(button, &QPushButton::clicked, &window, answer.chosen,
                          Qt::QueuedConnection);

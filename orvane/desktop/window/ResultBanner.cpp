@@ -68,9 +68,9 @@ ResultBanner::ResultBanner(const Translator& texts, QWidget* parent)
     title_->setTextFormat(Qt::PlainText);
     for (QLabel* const label : {title_, details_}) {
         label->setWordWrap(true);
-        label->setTextInteractionFlags(Qt::TextBrowserInteraction);
         label->setSizePolicy(QSizePolicy::Ignored, QSizePolicy::Minimum);
     }
+    title_->setTextInteractionFlags(Qt::TextSelectableByMouse);
     connect(details_, &QLabel::linkActivated, this, [this](const QString& link) {
         if (events_.diskChosen)
             events_.diskChosen(fromQt(link));
@@ -128,6 +128,9 @@ void ResultBanner::fill()
         details = links.join(QStringLiteral(", "));
     }
     details_->setText(details);
+    // What nothing can be done with is no stop on the way of the Tab key.
+    details_->setTextInteractionFlags(shown_.disks.empty() ? Qt::TextSelectableByMouse
+                                                           : Qt::TextBrowserInteraction);
     details_->setVisible(!details.isEmpty() && (!isCompact_ || !shown_.disks.empty()));
     setAccessibleName(toQt(shown_.title));
     addButtons();
@@ -144,6 +147,8 @@ void ResultBanner::addButtons()
         }
         delete item;
     }
+    // Where it stands, is where the Tab key comes to it.
+    QWidget* before = details_;
     for (const NextStep step : shown_.steps) {
         const auto* const title = std::ranges::find(stepTitles, step, &StepTitle::step);
         auto* const button = new QPushButton(symbol(title->symbol),
@@ -155,7 +160,10 @@ void ResultBanner::addButtons()
                 events_.stepChosen(step);
         });
         buttons_->addWidget(button);
+        setTabOrder(before, button);
+        before = button;
     }
+    setTabOrder(before, close_);
     buttons_->addStretch(1);
 }
 
