@@ -7,14 +7,22 @@
 #include <QAction>
 #include <QFile>
 #include <QFileInfo>
+#include <QListWidget>
 #include <QRegularExpression>
 #include <QShortcut>
+#include <QSignalBlocker>
+#include <QSplitter>
 #include <QStatusBar>
 #include <QStyle>
+#include <QTextBlock>
 #include <QTextDocument>
 #include <QToolBar>
 #include <QToolButton>
 #include <QUrl>
+
+#include <algorithm>
+#include <functional>
+#include <optional>
 
 namespace orvane::desktop {
 namespace {
@@ -77,13 +85,86 @@ QString HelpBook::plainText(const QString& page)
     return document.toPlainText();
 }
 
+namespace {
+
+constexpr double titleWeight = 100;
+constexpr double headingWeight = 10;
+constexpr int lineLength = 90;  // characters
+
+/// What one word adds to a page's relevance; none where the page does not have it.
+std::optional<double> relevanceOf(const QString& word, const QTextDocument& document)
+{
+    double relevance = 0;
+    bool isThere = false;
+    for (QTextBlock block = document.begin(); block.isValid(); block = block.next()) {
+        const auto count = static_cast<double>(block.text().count(word, Qt::CaseInsensitive));
+        if (count == 0)
+            continue;
+        const int level = block.blockFormat().headingLevel();
+        const double weight = level == 1 ? titleWeight : level > 1 ? headingWeight : 1;
+        const double place = static_cast<double>(block.position()) / document.characterCount();
+        relevance += weight * count + (isThere ? 0 : 1 - place);
+        isThere = true;
+    }
+    return isThere ? std::optional(relevance) : std::nullopt;
+}
+
+/// The text around the word, rather in the running text than in the title.
+QString lineAround(const QString& word, const QTextDocument& document)
+{
+    QString line;
+    for (QTextBlock block = document.begin(); block.isValid(); block = block.next()) {
+        const qsizetype place = block.text().indexOf(word, 0, Qt::CaseInsensitive);
+        if (place < 0)
+            continue;
+        const qsizetype from = std::max<qsizetype>(0, place - lineLength / 3);
+        line = (from > 0 ? QStringLiteral("…") : QString()) +
+               block.text().mid(from, lineLength).simplified() +
+               (from + lineLength < block.text().size() ? QStringLiteral("…") : QString());
+        if (block.blockFormat().headingLevel() != 1)
+            break;
+    }
+    return line;
+}
+
+QString titleOf(const QTextDocument& document)
+{
+    for (QTextBlock block = document.begin(); block.isValid(); block = block.next())
+        if (block.blockFormat().headingLevel() == 1)
+            return block.text();
+    return document.metaInformation(QTextDocument::DocumentTitle);
+}
+
+}  // namespace
+
+std::vector<HelpHit> HelpBook::search(const QString& words) const
+{
+    const QStringList all = words.split(QLatin1Char(' '), Qt::SkipEmptyParts);
+    std::vector<HelpHit> hits;
+    for (const QString& page : all.isEmpty() ? QStringList() : pages()) {
+        QTextDocument document;
+        document.setHtml(readPage(page));
+        HelpHit hit{page, titleOf(document), lineAround(all.front(), document)};
+        const bool hasAll = std::ranges::all_of(all, [&](const QString& word) {
+            const auto relevance = relevanceOf(word, document);
+            hit.relevance += relevance.value_or(0);
+            return relevance.has_value();
+        });
+        if (hasAll)
+            hits.push_back(std::move(hit));
+    }
+    std::ranges::stable_sort(hits, std::ranges::greater(), &HelpHit::relevance);
+    return hits;
+}
+
 HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts,
                        contract::UserDefaults& settings)
     : book_(std::move(book)),
       texts_(texts),
       settings_(settings),
       browser_(new QTextBrowser(this)),
-      findField_(new QLineEdit(this))
+      findField_(new QLineEdit(this)),
+      hits_(new QListWidget(this))
 {
     setWindowTitle(text("Orvane Help"));
     setAttribute(Qt::WA_DeleteOnClose);
@@ -96,7 +177,19 @@ HelpWindow::HelpWindow(HelpBook book, const contract::Bundle& texts,
     browser_->document()->setDocumentMargin(pageMargin);
     browser_->setOpenLinks(false);
     connect(browser_, &QTextBrowser::anchorClicked, this, [this](const QUrl& url) { follow(url); });
-    setCentralWidget(browser_);
+    hits_->setObjectName(QStringLiteral("helpHits"));
+    hits_->setAccessibleName(text("Found pages"));
+    hits_->setWordWrap(true);
+    hits_->setMinimumWidth(fontMetrics().averageCharWidth() * lineLength / 3);
+    hits_->setHorizontalScrollBarPolicy(Qt::ScrollBarAlwaysOff);
+    hits_->hide();
+    connect(hits_, &QListWidget::currentRowChanged, this, [this] { openHit(); });
+    auto* const panes = new QSplitter(this);
+    panes->addWidget(hits_);
+    panes->addWidget(browser_);
+    panes->setStretchFactor(1, 1);
+    panes->setChildrenCollapsible(false);
+    setCentralWidget(panes);
     addTools();
     auto* const escape = new QShortcut(Qt::Key_Escape, this);
     connect(escape, &QShortcut::activated, this, &QWidget::close);
@@ -159,6 +252,7 @@ void HelpWindow::addFindField(QToolBar& bar)
     onKey(Qt::Key_F3, [this] { find(Direction::Forward); });
     onKey(Qt::SHIFT | Qt::Key_F3, [this] { find(Direction::Backward); });
     connect(findField_, &QLineEdit::returnPressed, this, [this] { find(Direction::Forward); });
+    connect(findField_, &QLineEdit::textChanged, this, [this] { listHits(); });
 }
 
 void HelpWindow::open(std::string_view anchor)
@@ -183,34 +277,54 @@ void HelpWindow::follow(const QUrl& link)
         browser_->setSource(place);
 }
 
+void HelpWindow::listHits()
+{
+    const QSignalBlocker still(hits_);
+    const auto hits = book_.search(findField_->text());
+    hits_->clear();
+    for (const HelpHit& hit : hits) {
+        auto* const item = new QListWidgetItem(hit.title + QLatin1Char('\n') + hit.line, hits_);
+        item->setData(Qt::UserRole, hit.page);
+    }
+    hits_->setVisible(!hits.empty());
+    statusBar()->clearMessage();
+    if (hits.empty() && !findField_->text().trimmed().isEmpty())
+        statusBar()->showMessage(toQt(contract::format(
+            texts_.localizedString("“%@” was not found."), {fromQt(findField_->text())})));
+}
+
+void HelpWindow::openHit()
+{
+    const QListWidgetItem* const item = hits_->currentItem();
+    if (item == nullptr)
+        return;
+    browser_->setSource(QUrl::fromLocalFile(item->data(Qt::UserRole).toString()));
+    browser_->moveCursor(QTextCursor::Start);
+    findInPage(Direction::Forward);
+}
+
+// All of it where it stands so on the page, else its first word.
 bool HelpWindow::findInPage(Direction direction)
 {
     QTextDocument::FindFlags flags;
     flags.setFlag(QTextDocument::FindBackward, direction == Direction::Backward);
-    return browser_->find(findField_->text(), flags);
+    const QString wanted = findField_->text().simplified();
+    return browser_->find(wanted, flags) ||
+           browser_->find(wanted.section(QLatin1Char(' '), 0, 0), flags);
 }
 
+// Through the page first, then to the next of those that were found.
 void HelpWindow::find(Direction direction)
 {
-    const QString wanted = findField_->text();
-    statusBar()->clearMessage();
-    if (wanted.isEmpty() || findInPage(direction))
+    const int count = hits_->count();
+    if (count == 0 || (hits_->currentRow() >= 0 && findInPage(direction)))
         return;
-    const QStringList pages = book_.pages();
-    const qsizetype step = direction == Direction::Forward ? 1 : pages.size() - 1;
-    qsizetype at = std::max<qsizetype>(0, pages.indexOf(browser_->source().toLocalFile()));
-    for (qsizetype i = 0; i < pages.size(); ++i) {
-        at = (at + step) % pages.size();
-        if (!HelpBook::plainText(pages[at]).contains(wanted, Qt::CaseInsensitive))
-            continue;
-        browser_->setSource(QUrl::fromLocalFile(pages[at]));
-        browser_->moveCursor(direction == Direction::Forward ? QTextCursor::Start
-                                                             : QTextCursor::End);
-        findInPage(direction);
-        return;
-    }
-    statusBar()->showMessage(
-        toQt(contract::format(texts_.localizedString("“%@” was not found."), {fromQt(wanted)})));
+    const int step = direction == Direction::Forward ? 1 : count - 1;
+    const int from = std::max(hits_->currentRow(), direction == Direction::Forward ? -1 : 0);
+    const int row = (from + step) % count;
+    if (row == hits_->currentRow())
+        openHit();
+    hits_->setCurrentRow(row);
 }
 
 void HelpWindow::closeEvent(QCloseEvent* event)

@@ -6,6 +6,7 @@
 #include "contract/toolkit/Help.h"
 
 #include <QLineEdit>
+#include <QListWidget>
 #include <QMainWindow>
 #include <QPointer>
 #include <QString>
@@ -14,8 +15,17 @@
 
 #include <filesystem>
 #include <string_view>
+#include <vector>
 
 namespace orvane::desktop {
+
+/// A page on which all the words that are looked for stand.
+struct HelpHit {
+    QString page;   ///< its file
+    QString title;
+    QString line;   ///< the text around the first of the words
+    double relevance = 0;
+};
 
 /// The help book in one language: pages of HTML in a directory, with the contents in index.html.
 /// Pages are read when they are asked for. Any thread.
@@ -31,6 +41,10 @@ public:
     QStringList pages() const;
     /// A page's words without its marks; empty when it cannot be read.
     static QString plainText(const QString& page);
+    /// The pages with all of these words, whatever their case, the most relevant first: a word in
+    /// the title counts for more than in a heading, and that for more than elsewhere; the more
+    /// often and the further in front, the better.
+    std::vector<HelpHit> search(const QString& words) const;
 
 private:
     QString page(const QString& name) const;
@@ -39,7 +53,7 @@ private:
 };
 
 /// A window to read the help book in, with a way back and forward, and a search through all of
-/// its pages. A link that leads out of the book is not followed. Main thread.
+/// its pages that lists what it finds as one types. A link that leads out of the book is not followed. Main thread.
 class HelpWindow final : public QMainWindow {
 public:
     /// `texts` and `settings`, which keep the window's size and place, outlive the window.
@@ -60,6 +74,8 @@ private:
     void addTools();
     void addFindField(QToolBar& bar);
     void follow(const QUrl& link);
+    void listHits();
+    void openHit();
     void find(Direction direction);
     bool findInPage(Direction direction);
 
@@ -68,6 +84,7 @@ private:
     contract::UserDefaults& settings_;
     QTextBrowser* browser_;
     QLineEdit* findField_;
+    QListWidget* hits_;  ///< hidden where nothing is looked for
 };
 
 /// The help book in a window of its own; no network and no browser is needed. The book is in the
