@@ -84,8 +84,7 @@ void CommandBar::addButton(BarCommand command)
     button->setAccessibleName(title);
     button->setAutoRaise(true);
     button->setFocusPolicy(Qt::TabFocus);
-    button->setIcon(symbol(command.symbol, command.isPrimary ? QPalette::HighlightedText
-                                                             : QPalette::ButtonText));
+    button->setIcon(symbol(command.symbol));
     connect(button, &QToolButton::clicked, this, [this, perform = command.command.perform] {
         perform();
         refresh();
@@ -102,6 +101,11 @@ void CommandBar::refresh()
         const bool isAvailable =
             reason.empty() && (!command.isAvailable || command.isAvailable());
         button.widget->setEnabled(isAvailable);
+        // On its filled ground; without that, as all others.
+        if (button.command.isPrimary)
+            button.widget->setIcon(symbol(button.command.symbol, isAvailable
+                                                                     ? QPalette::HighlightedText
+                                                                     : QPalette::ButtonText));
         QString toolTip = toQt(texts_.text(command.title));
         if (!command.shortcut.isEmpty())
             toolTip += QStringLiteral(" (") +
