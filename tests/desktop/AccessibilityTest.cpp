@@ -3,12 +3,20 @@
 
 #include "tests/desktop/WindowFixture.h"
 
+#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/desktop/window/WindowColors.h"
+#include "orvane/support/texts/Language.h"
 
 #include <QAccessible>
 #include <QAction>
+#include <QApplication>
+#include <QLabel>
 #include <QMenu>
+#include <QScrollArea>
+#include <QTest>
 
+#include <cstdlib>
 #include <map>
 
 namespace orvane::desktop::test {
@@ -44,7 +52,10 @@ protected:
 
 TEST_F(AccessibilityTest, WhateverTakesTheFocusHasANameAndNoMarksInItsTexts)
 {
-    open({makeImage("sound")});
+    const std::string image = makeDamagedImage("damaged");
+    open({image, makePartitionedImage("partitioned")});
+    run("verifyDiskButton", image);
+    ASSERT_TRUE(waitForStep(NextStep::Repair));
     int focusable = 0;
     walk(QAccessible::queryAccessibleInterface(&window()), [&](QAccessibleInterface& object) {
         const QString description = object.text(QAccessible::Description);
@@ -54,7 +65,7 @@ TEST_F(AccessibilityTest, WhateverTakesTheFocusHasANameAndNoMarksInItsTexts)
         ++focusable;
         EXPECT_FALSE(object.text(QAccessible::Name).isEmpty()) << "role " << object.role();
     });
-    EXPECT_GE(focusable, 8);
+    EXPECT_GE(focusable, 20);
 }
 
 TEST_F(AccessibilityTest, RowsAreReadWithTheirTypeNotByTheirColourAlone)
@@ -73,6 +84,155 @@ TEST_F(AccessibilityTest, RowsAreReadWithTheirTypeNotByTheirColourAlone)
     (void)logRows();
     EXPECT_NE(cells(log()).find("Good result: The volume"), std::string::npos);
 }
+
+TEST_F(AccessibilityTest, WhatCameOutIsReadAsText)
+{
+    const std::string image = makeDamagedImage("damaged");
+    open({image});
+    run("verifyDiskButton", image);
+    ASSERT_TRUE(waitForStep(NextStep::Repair));
+    for (const auto& [name, beginning] :
+         {std::pair("resultTitle", "Damaged: "), {"diskState", "Damaged"}, {"diskTitle", "damaged"}}) {
+        QAccessibleInterface* const label = QAccessible::queryAccessibleInterface(
+            window().findChild<QLabel*>(QLatin1String(name)));
+        EXPECT_EQ(label->role(), QAccessible::StaticText) << name;
+        EXPECT_TRUE(fromQt(label->text(QAccessible::Name)).starts_with(beginning))
+            << fromQt(label->text(QAccessible::Name));
+        EXPECT_FALSE(label->state().invisible) << name;
+    }
+}
+
+class ColorTest : public testing::TestWithParam<bool> {
+protected:
+    static void expectText(const QColor& ground, const QColor& text, const char* what)
+    {
+        EXPECT_EQ(text.alpha(), 255) << what;
+        EXPECT_GE(contrastRatio(ground, text), readableContrast) << what;
+    }
+    static void expectMark(const QColor& ground, const QColor& mark, const char* what)
+    {
+        EXPECT_GE(contrastRatio(ground, mark), visibleContrast) << what;
+    }
+};
+
+// The colours that are drawn, in those that the program itself has.
+TEST_P(ColorTest, TextIsReadableAndMarksAreSeen)
+{
+    QPalette palette = GetParam() ? darkPalette() : QApplication::style()->standardPalette();
+    QApplication::style()->polish(palette);
+    for (const Tone tone : {Tone::Neutral, Tone::Good, Tone::Caution, Tone::Bad}) {
+        const BannerColors banner = bannerColors(tone, palette);
+        expectText(banner.ground, banner.text, "banner");
+        expectText(banner.ground, banner.link, "link in the banner");
+        expectMark(banner.ground, banner.stripe, "stripe of the banner");
+    }
+    for (const auto group : {QPalette::Active, QPalette::Inactive})
+        for (const bool isSelected : {false, true}) {
+            const RowColors row = rowColors(palette, group, isSelected);
+            expectText(row.ground, row.text, isSelected ? "selected row" : "row");
+            expectText(row.ground, row.faint, isSelected ? "selected row, faint" : "row, faint");
+            expectMark(row.track, row.bar, "progress in a row");
+        }
+    expectText(palette.color(QPalette::Base), headingColor(palette), "section of the list");
+    expectText(palette.color(QPalette::Base), palette.color(QPalette::PlaceholderText), "note");
+    expectText(palette.color(QPalette::Window), palette.color(QPalette::WindowText), "header");
+    expectMark(spaceColors(palette).track, spaceColors(palette).used, "used space");
+    for (const bool isMarked : {false, true}) {
+        const PartColors part = partColors(palette, isMarked);
+        expectText(part.ground, part.text, "partition");
+        expectMark(palette.color(QPalette::Window), part.frame, "frame of a partition");
+        const PrimaryColors primary = primaryColors(palette, isMarked);
+        expectText(primary.ground, primary.text, "primary button");
+    }
+}
+
+INSTANTIATE_TEST_SUITE_P(In, ColorTest, testing::Bool(), [](const auto& isDark) {
+    return isDark.param ? "Dark" : "Light";
+});
+
+/// A language, and how much larger the font is.
+class RoomTest : public WindowFixture,
+                 public testing::WithParamInterface<std::tuple<const char*, double>> {
+protected:
+    void SetUp() override
+    {
+        ::setenv("LANGUAGE", std::get<0>(GetParam()), 1);
+        adoptUserLocale();
+        QFont larger = font_;
+        larger.setPointSizeF(font_.pointSizeF() * std::get<1>(GetParam()));
+        QApplication::setFont(larger);
+    }
+    void TearDown() override
+    {
+        close();
+        QApplication::setFont(font_);
+        ::unsetenv("LANGUAGE");
+        adoptUserLocale();
+    }
+
+    static bool isInScrollArea(const QWidget& widget)
+    {
+        for (const QWidget* above = widget.parentWidget(); above != nullptr;
+             above = above->parentWidget())
+            if (qobject_cast<const QScrollArea*>(above) != nullptr)
+                return true;
+        return false;
+    }
+    /// What is not in sight as a whole, and said nowhere else.
+    static std::string fault(const QWidget& widget)
+    {
+        const QSize has = widget.size();
+        const QSize needs = widget.hasHeightForWidth()
+                                ? QSize(0, widget.heightForWidth(has.width()))
+                                : widget.sizeHint();
+        const bool isElided = dynamic_cast<const ElidedLabel*>(&widget) != nullptr;
+        if (needs.height() > has.height())
+            return "too low";
+        if (needs.width() > has.width() && !(isElided && !widget.toolTip().isEmpty()))
+            return "too narrow";
+        return widget.visibleRegion().boundingRect() == widget.rect() ? "" : "cut off";
+    }
+    template <class Widget>
+    int expectRoomForAll()
+    {
+        int looked = 0;
+        for (const Widget* widget : window().template findChildren<Widget*>()) {
+            if (!widget->isVisible() || widget->text().isEmpty() || isInScrollArea(*widget))
+                continue;
+            ++looked;
+            EXPECT_EQ(fault(*widget), "")
+                << fromQt(widget->objectName()) << ": " << fromQt(widget->text()) << " has "
+                << widget->width() << " x " << widget->height() << " of "
+                << widget->sizeHint().width() << " x " << widget->sizeHint().height();
+        }
+        return looked;
+    }
+
+    const QFont font_ = QApplication::font();
+};
+
+TEST_P(RoomTest, NothingIsClipped)
+{
+    const std::string image = makeDamagedImage("A label, longer");
+    open({image, makePartitionedImage("partitioned")});
+    window().resize(1180, 720);
+    run("verifyDiskButton", image);
+    ASSERT_TRUE(waitForStep(NextStep::Repair));
+    const bool isEnglish = result().starts_with("Damaged");
+    EXPECT_EQ(isEnglish, std::string(std::get<0>(GetParam())) != "de") << result();
+    QTest::qWait(0);
+    EXPECT_EQ(window().width(), 1180) << "it needs more";
+    EXPECT_EQ(window().height(), 720) << "it needs more";
+    EXPECT_GE(expectRoomForAll<QLabel>(), 3);
+    EXPECT_GE(expectRoomForAll<QAbstractButton>(), 12);
+}
+
+INSTANTIATE_TEST_SUITE_P(At, RoomTest,
+                         testing::Combine(testing::Values("C", "de"), testing::Values(1.0, 2.0)),
+                         [](const auto& look) {
+                             return std::string(std::get<0>(look.param)) +
+                                    (std::get<1>(look.param) > 1 ? "Large" : "");
+                         });
 
 // Two commands on one key cancel each other out: neither is carried out.
 TEST_F(AccessibilityTest, NoTwoCommandsShareAKey)

@@ -57,9 +57,9 @@ double contrastRatio(const QColor& a, const QColor& b)
     return (lighter + 0.05) / (darker + 0.05);
 }
 
-QColor readableOn(const QColor& background, const QColor& wanted)
+QColor readableOn(const QColor& background, const QColor& wanted, double contrast)
 {
-    if (contrastRatio(background, wanted) >= readableContrast)
+    if (contrastRatio(background, wanted) >= contrast)
         return wanted;
     const bool darkens =
         contrastRatio(background, Qt::black) >= contrastRatio(background, Qt::white);
@@ -73,7 +73,7 @@ QColor readableOn(const QColor& background, const QColor& wanted)
         const QColor candidate =
             QColor::fromHslF(std::max(hue, 0.0F), saturation, lightness + (end - lightness) * part)
                 .toRgb();
-        if (contrastRatio(background, candidate) >= readableContrast)
+        if (contrastRatio(background, candidate) >= contrast)
             return candidate;
     }
     return darkens ? Qt::black : Qt::white;
@@ -110,6 +110,22 @@ void FramedStyle::drawPrimitive(PrimitiveElement element, const QStyleOption* op
     else
         painter->drawRect(frame);
     painter->restore();
+}
+
+void FramedStyle::polish(QPalette& palette)
+{
+    QProxyStyle::polish(palette);
+    for (const auto group : {QPalette::Active, QPalette::Inactive}) {
+        const auto color = [&](QPalette::ColorRole role) {
+            return palette.color(group, role);
+        };
+        palette.setColor(group, QPalette::Highlight,
+                         readableOn(color(QPalette::HighlightedText), color(QPalette::Highlight)));
+        const QColor quiet = color(QPalette::PlaceholderText);
+        const QColor ground = color(QPalette::Base);
+        palette.setColor(group, QPalette::PlaceholderText,
+                         readableOn(ground, mixedColor(ground, quiet, quiet.alphaF())));
+    }
 }
 
 int FramedStyle::styleHint(StyleHint hint, const QStyleOption* option, const QWidget* widget,

@@ -12,12 +12,16 @@ namespace orvane::desktop {
 
 /// The smallest ratio at which text of ordinary size is readable (WCAG 2.1, 1.4.3).
 inline constexpr double readableContrast = 4.5;
+/// The smallest one at which a mark or a frame is seen (1.4.11).
+inline constexpr double visibleContrast = 3;
 
 /// From 1 (the same colour) to 21 (black on white), as WCAG 2.1 defines the contrast ratio.
 double contrastRatio(const QColor& a, const QColor& b);
 
-/// `wanted`, or the nearest lighter or darker colour of its hue that is readable on `background`.
-QColor readableOn(const QColor& background, const QColor& wanted);
+/// `wanted`, or the nearest lighter or darker colour of its hue that has this contrast to
+/// `background`. All are opaque.
+QColor readableOn(const QColor& background, const QColor& wanted,
+                  double contrast = readableContrast);
 
 /// `share` of the way from `a` to `b`.
 QColor mixedColor(const QColor& a, const QColor& b, double share);
@@ -31,6 +35,9 @@ public:
 
     void drawPrimitive(PrimitiveElement element, const QStyleOption* option, QPainter* painter,
                        const QWidget* widget) const override;
+    /// What is selected, and what stands in an empty field, can be read.
+    void polish(QPalette& palette) override;
+    using QProxyStyle::polish;
     int styleHint(StyleHint hint, const QStyleOption* option, const QWidget* widget,
                   QStyleHintReturn* answer) const override;
 };

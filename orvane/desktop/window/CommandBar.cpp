@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/CommandBar.h"
 
-#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/desktop/window/WindowColors.h"
 
 #include <QHBoxLayout>
 #include <QStyleOptionToolButton>
@@ -33,16 +33,15 @@ protected:
             QToolButton::paintEvent(event);
             return;
         }
-        const QColor color = palette().color(QPalette::Highlight);
-        const QColor text = palette().color(QPalette::HighlightedText);
+        const PrimaryColors colors = primaryColors(palette(), isDown() || underMouse());
         QStylePainter painter(this);
         painter.setRenderHint(QPainter::Antialiasing);
         painter.setPen(hasFocus() ? QPen(palette().color(QPalette::WindowText), 1.5) : Qt::NoPen);
-        painter.setBrush(isDown() || underMouse() ? mixedColor(color, text, 0.12) : color);
+        painter.setBrush(colors.ground);
         painter.drawRoundedRect(QRectF(rect()).adjusted(1, 1, -1, -1), rounding, rounding);
         QStyleOptionToolButton option;
         initStyleOption(&option);
-        option.palette.setColor(QPalette::ButtonText, text);
+        option.palette.setColor(QPalette::ButtonText, colors.text);
         option.state &= ~(QStyle::State_MouseOver | QStyle::State_Sunken);
         painter.drawControl(QStyle::CE_ToolButtonLabel, option);
     }
@@ -85,8 +84,7 @@ void CommandBar::addButton(BarCommand command)
     button->setAccessibleName(title);
     button->setAutoRaise(true);
     button->setFocusPolicy(Qt::TabFocus);
-    button->setIcon(symbol(command.symbol, command.isPrimary ? QPalette::HighlightedText
-                                                             : QPalette::ButtonText));
+    button->setIcon(symbol(command.symbol));
     connect(button, &QToolButton::clicked, this, [this, perform = command.command.perform] {
         perform();
         refresh();
@@ -103,6 +101,11 @@ void CommandBar::refresh()
         const bool isAvailable =
             reason.empty() && (!command.isAvailable || command.isAvailable());
         button.widget->setEnabled(isAvailable);
+        // On its filled ground; without that, as all others.
+        if (button.command.isPrimary)
+            button.widget->setIcon(symbol(button.command.symbol, isAvailable
+                                                                     ? QPalette::HighlightedText
+                                                                     : QPalette::ButtonText));
         QString toolTip = toQt(texts_.text(command.title));
         if (!command.shortcut.isEmpty())
             toolTip += QStringLiteral(" (") +

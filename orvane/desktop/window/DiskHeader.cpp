@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/window/DiskHeader.h"
 
-#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
+#include "orvane/desktop/window/WindowColors.h"
 
 #include <QEvent>
 #include <QHBoxLayout>
@@ -49,12 +49,11 @@ void SpaceBar::paintEvent(QPaintEvent* /*event*/)
     QPainterPath frame;
     frame.addRoundedRect(rect(), rounding, rounding);
     painter.setClipPath(frame);
-    painter.fillRect(rect(), mixedColor(palette().color(QPalette::Window),
-                                   palette().color(QPalette::WindowText), 0.18));
+    const SpaceColors colors = spaceColors(palette());
+    painter.fillRect(rect(), colors.track);
     QRect used = rect();
     used.setWidth(std::max(1, static_cast<int>(width() * share_)));
-    painter.fillRect(QStyle::visualRect(layoutDirection(), rect(), used),
-                     palette().color(QPalette::Highlight));
+    painter.fillRect(QStyle::visualRect(layoutDirection(), rect(), used), colors.used);
 }
 
 /// One volume in the bar.
@@ -77,10 +76,9 @@ protected:
     {
         QPainter painter(this);
         painter.setRenderHint(QPainter::Antialiasing);
-        const QColor color = palette().color(QPalette::Highlight);
-        const bool isMarked = hasFocus() || underMouse();
-        painter.setPen(QPen(color, hasFocus() ? 2 : 1));
-        painter.setBrush(mixedColor(palette().color(QPalette::Base), color, isMarked ? 0.3 : 0.14));
+        const PartColors colors = partColors(palette(), hasFocus() || underMouse());
+        painter.setPen(QPen(colors.frame, hasFocus() ? 2 : 1));
+        painter.setBrush(colors.ground);
         painter.drawRoundedRect(QRectF(rect()).adjusted(1, 1, -1, -1), rounding, rounding);
         QRect room = rect().adjusted(6, 0, -6, 0);
         if (!share_.verdict.empty() && room.width() > room.height() / 2) {
@@ -91,7 +89,7 @@ protected:
                 .paint(&painter, QStyle::visualRect(layoutDirection(), rect(), place));
             room.setRight(place.left() - 4);
         }
-        painter.setPen(palette().color(QPalette::Text));
+        painter.setPen(colors.text);
         painter.drawText(QStyle::visualRect(layoutDirection(), rect(), room),
                          Qt::AlignVCenter | Qt::TextSingleLine |
                              QStyle::visualAlignment(layoutDirection(), Qt::AlignLeft),

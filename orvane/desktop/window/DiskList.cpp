@@ -4,6 +4,7 @@
 #include "orvane/desktop/toolkit/StyledLine.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/DiskRow.h"
+#include "orvane/desktop/window/WindowColors.h"
 
 #include <QApplication>
 #include <QHeaderView>
@@ -40,13 +41,12 @@ int heightOfLines(const QFont& font)
     return QFontMetrics(nameFont(font)).height() + QFontMetrics(detailFont(font)).height();
 }
 
-QColor textColor(const QStyleOptionViewItem& option)
+RowColors colorsOf(const QStyleOptionViewItem& option)
 {
-    const auto group =
-        option.state.testFlag(QStyle::State_Active) ? QPalette::Active : QPalette::Inactive;
-    return option.palette.color(group, option.state.testFlag(QStyle::State_Selected)
-                                           ? QPalette::HighlightedText
-                                           : QPalette::Text);
+    return rowColors(
+        option.palette,
+        option.state.testFlag(QStyle::State_Active) ? QPalette::Active : QPalette::Inactive,
+        option.state.testFlag(QStyle::State_Selected));
 }
 
 /// The lines of one row, drawn from the outside in: what stands at the end takes its room first.
@@ -154,14 +154,12 @@ void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, const Q
 {
     if (percent <= 0)
         return;
-    const bool isSelected = option.state.testFlag(QStyle::State_Selected);
+    const RowColors colors = colorsOf(option);
     QRect track = lines;
     track.setTop(lines.bottom());
     track.setHeight(progressHeight);
     QRect done = track;
     done.setWidth(static_cast<int>(track.width() * percent / 100));
-    QColor quiet = textColor(option);
-    quiet.setAlphaF(0.2F);
     const auto draw = [&](const QRect& bar, const QColor& color) {
         painter.setBrush(color);
         painter.drawRoundedRect(QStyle::visualRect(option.direction, option.rect, bar),
@@ -169,8 +167,8 @@ void drawProgress(QPainter& painter, const QStyleOptionViewItem& option, const Q
     };
     painter.setRenderHint(QPainter::Antialiasing);
     painter.setPen(Qt::NoPen);
-    draw(track, quiet);
-    draw(done, option.palette.color(isSelected ? QPalette::HighlightedText : QPalette::Highlight));
+    draw(track, colors.track);
+    draw(done, colors.bar);
 }
 
 /// Around the row that the keys act on.
@@ -179,7 +177,7 @@ void drawFocus(QPainter& painter, const QStyleOptionViewItem& option)
     if (!option.state.testFlag(QStyle::State_HasFocus))
         return;
     painter.setRenderHint(QPainter::Antialiasing);
-    painter.setPen(QPen(textColor(option), 1.5));
+    painter.setPen(QPen(colorsOf(option).text, 1.5));
     painter.setBrush(Qt::NoBrush);
     painter.drawRoundedRect(QRectF(option.rect).adjusted(1.5, 1.5, -1.5, -1.5), 3, 3);
 }
@@ -187,7 +185,7 @@ void drawFocus(QPainter& painter, const QStyleOptionViewItem& option)
 void drawHeading(QPainter& painter, const QStyleOptionViewItem& option)
 {
     painter.setFont(nameFont(detailFont(option.font)));
-    painter.setPen(option.palette.color(QPalette::PlaceholderText));
+    painter.setPen(headingColor(option.palette));
     const QRect line = option.rect.adjusted(margin, margin, -margin, 0);
     painter.drawText(line,
                      Qt::AlignVCenter | Qt::TextSingleLine |
@@ -243,9 +241,9 @@ void DiskDelegate::drawDisk(QPainter& painter, const QStyleOptionViewItem& optio
     option.icon.paint(&painter, QStyle::visualRect(option.direction, option.rect, icon));
     rest.setLeft(icon.right() + 2 * margin);
 
-    const QColor color = textColor(option);
-    QColor faint = color;
-    faint.setAlphaF(0.72F);
+    const RowColors colors = colorsOf(option);
+    const QColor& color = colors.text;
+    const QColor& faint = colors.faint;
     QRect line = rest;
     line.setHeight(QFontMetrics(nameFont(option.font)).height());
     RowPainter row(painter, option);

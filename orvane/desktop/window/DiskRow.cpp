@@ -28,7 +28,7 @@ const QColor metalColor(0xb9, 0xc2, 0xcc);
 const QColor blueColor(0x3d, 0x7e, 0xb8);
 const QColor greenColor(0x2e, 0x8b, 0x45);
 const QColor redColor(0xc6, 0x2f, 0x2f);
-const QColor amberColor(0xc9, 0x8a, 0x10);
+const QColor amberColor(0xb0, 0x74, 0x08);
 
 // In several sizes, so that it is sharp in a menu, in the list, and on denser screens.
 QIcon drawn(const Drawing& draw)

@@ -132,6 +132,9 @@ MainWindow::MainWindow(const Translator& texts)
     setWindowTitle(QStringLiteral("Orvane"));
     setAcceptDrops(true);
     resize(firstSize);
+    // Less than its parts ask for while there is room: what it is made smaller for has them ask less.
+    constexpr int leastHeight = 24;  // lines
+    setMinimumHeight(leastHeight * fontMetrics().height());
 
     addToolBar(commands_);
     setContextMenuPolicy(Qt::NoContextMenu);
@@ -255,7 +258,7 @@ void MainWindow::resizeEvent(QResizeEvent* event)
 // Measured in lines of text, for a large font takes the same room as a small window.
 void MainWindow::adoptRoom()
 {
-    constexpr int roomyHeight = 30;  // lines
+    constexpr int roomyHeight = 40;  // lines
     constexpr int roomyWidth = 110;  // characters
     const QFontMetrics metrics = fontMetrics();
     const bool isCompact = height() < roomyHeight * metrics.height();

@@ -2,9 +2,9 @@
 #include "orvane/desktop/window/ResultBanner.h"
 
 #include "contract/pellar/MessageKeys.h"
-#include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/desktop/toolkit/Text.h"
 #include "orvane/desktop/window/Symbols.h"
+#include "orvane/desktop/window/WindowColors.h"
 
 #include <QEvent>
 #include <QPainter>
@@ -19,7 +19,6 @@ namespace {
 
 constexpr int spacing = 8;      // pixels
 constexpr int stripeWidth = 4;  // pixels
-constexpr double tint = 0.12;   ///< of the tone's colour in the background
 constexpr std::size_t mostLinks = 12;
 
 struct StepTitle {
@@ -167,27 +166,18 @@ void ResultBanner::addButtons()
     buttons_->addStretch(1);
 }
 
-QColor ResultBanner::toneColor() const
-{
-    switch (shown_.tone) {
-        case Tone::Good: return {0x2e, 0x8b, 0x45};
-        case Tone::Caution: return {0xc9, 0x8a, 0x10};
-        case Tone::Bad: return {0xc6, 0x2f, 0x2f};
-        case Tone::Neutral: break;
-    }
-    return palette().color(QPalette::Highlight);
-}
-
-QColor ResultBanner::background() const
-{
-    return mixedColor(palette().color(QPalette::Window), toneColor(), tint);
-}
-
 void ResultBanner::adoptColors()
 {
     QFont bold = font();
     bold.setBold(true);
     title_->setFont(bold);
+    const BannerColors colors = bannerColors(shown_.tone, palette());
+    for (QLabel* const label : {title_, details_}) {
+        QPalette own;
+        own.setColor(QPalette::WindowText, colors.text);
+        own.setColor(QPalette::Link, colors.link);
+        label->setPalette(own);
+    }
     const int side = fontMetrics().height();
     icon_->setPixmap(
         verdictIcon(verdictLike(shown_.tone)).pixmap(QSize(side, side), devicePixelRatioF()));
@@ -205,9 +195,10 @@ void ResultBanner::changeEvent(QEvent* event)
 void ResultBanner::paintEvent(QPaintEvent* /*event*/)
 {
     QPainter painter(this);
-    painter.fillRect(rect(), background());
+    const BannerColors colors = bannerColors(shown_.tone, palette());
+    painter.fillRect(rect(), colors.ground);
     const QRect stripe(0, 0, stripeWidth, height());
-    painter.fillRect(QStyle::visualRect(layoutDirection(), rect(), stripe), toneColor());
+    painter.fillRect(QStyle::visualRect(layoutDirection(), rect(), stripe), colors.stripe);
 }
 
 }  // namespace orvane::desktop

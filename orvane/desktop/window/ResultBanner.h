@@ -40,8 +40,6 @@ private:
     void fill();
     void addButtons();
     void adoptColors();
-    QColor toneColor() const;
-    QColor background() const;
 
     const Translator& texts_;
     Events events_;

@@ -98,6 +98,10 @@ TEST_F(Pictures, OfADamagedDiskThatWasVerified)
     treat("verifyDiskButton", sound);
     treat("verifyDiskButton", damaged);
     takePicture("");
+    window().disks().selectAll();
+    QTest::qWait(50);
+    takePicture("-several");
+    select(damaged);
     session().host().sharedHelpManager().openHelpAnchor("ovhelp11868");
     QTest::qWait(50);
     QWidget& help = *session().host().sharedHelpManager().window();
@@ -187,6 +191,10 @@ TEST_F(Pictures, OfTheListOfDisks)
     takePictureOfMenu("openImage", "-file-menu");
     takePictureOfMenu("properties", "-disk-menu");
     takePictureOfMenu("filterDisks", "-view-menu");
+    select("/dev/sdb");
+    QTest::qWait(50);
+    takePicture("-failing");
+    select(partitioned);
     command("properties").trigger();
     QTest::qWait(50);
     auto* const dialog = window().findChild<QDialog*>(QStringLiteral("propertiesDialog"));
@@ -252,6 +260,7 @@ TEST_F(Pictures, OfARepairThatIsUndone)
     takePicture("-interrupted");
     treat("repairDiskButton", image);
     QTest::qWait(300);
+    takePicture("-repaired");
     takePictureOfMenu("undoRepair", "-menu");
     command("undoRepair").trigger();
     QTest::qWait(100);
