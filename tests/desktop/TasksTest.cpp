@@ -97,19 +97,32 @@ protected:
 
     // By the keyboard: whatever has the focus gets it.
 
+    /// Another program's window may have taken the focus, which here is no step of the user's.
+    QWindow* focused()
+    {
+        const bool isThere = waitUntil([this] {
+            QWidget* const modal = QApplication::activeModalWidget();
+            if (QGuiApplication::focusWindow() == nullptr)
+                (modal != nullptr ? modal : &window())->activateWindow();
+            return QGuiApplication::focusWindow() != nullptr;
+        });
+        EXPECT_TRUE(isThere);
+        return QGuiApplication::focusWindow();
+    }
     void type(QKeyCombination keys)
     {
         ++steps_;
-        QWindow* const window = QGuiApplication::focusWindow();
-        ASSERT_NE(window, nullptr);
-        QTest::keyClick(window, keys.key(), keys.keyboardModifiers());
+        QWindow* const focus = focused();
+        ASSERT_NE(focus, nullptr);
+        QTest::keyClick(focus, keys.key(), keys.keyboardModifiers());
         QCoreApplication::processEvents();
     }
     void typeWord(const char* word)
     {
         ++steps_;
         for (const char* letter = word; *letter != 0; ++letter)
-            QTest::keyClick(QGuiApplication::focusWindow(), *letter);
+            if (QWindow* const focus = focused())
+                QTest::keyClick(focus, *letter);
         QCoreApplication::processEvents();
     }
     /// Goes on with Tab until the widget has the focus.
