@@ -98,6 +98,8 @@ TEST(ResultSummaryOfOne, OffersWhatHelpsAndNothingThatCostsData)
     EXPECT_EQ(resultOf(failing, repairable, Translator()).steps,
               (Steps{NextStep::CopyDisk, NextStep::ShowProblems}))
         << "every attempt may cost more of it";
+    failing.lastCheck.reset();
+    EXPECT_EQ(resultOf(failing, repairable, Translator()).steps, Steps{NextStep::CopyDisk});
     EXPECT_EQ(resultOf(row("x"), repairable, Translator()).title, "") << "it was never checked";
 }
 

@@ -195,6 +195,12 @@ ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,
                            "do not use it."),
                 {NextStep::Finish, NextStep::Undo},
                 {}};
+    if (!disk.lastCheck && disk.facts.hasSMARTError)
+        return {Tone::Caution,
+                texts.text("The drive says that it is failing."),
+                texts.text("Copy what matters before anything else is done to it."),
+                {NextStep::CopyDisk},
+                {}};
     if (!disk.lastCheck || disk.lastCheck->isPartial || !disk.lastCheck->part.empty())
         return {};
     const LastCheck& check = *disk.lastCheck;
