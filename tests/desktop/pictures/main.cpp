@@ -15,6 +15,8 @@
 #include <QPainter>
 #include <QTest>
 
+#include <unistd.h>
+
 #include <cstdlib>
 #include <filesystem>
 
@@ -269,6 +271,21 @@ TEST_F(Pictures, OfARepairThatIsUndone)
     ASSERT_TRUE(waitUntil([&] { return verdict(image) != "" && logRows().size() > 10; }));
     QTest::qWait(300);
     takePicture("-undone");
+}
+
+TEST_F(Pictures, OfAnImageThatCannotBeWritten)
+{
+    if (::geteuid() == 0)
+        GTEST_SKIP() << "root may write everything";
+    const std::string image = makeDamagedImage("Letters");
+    std::filesystem::permissions(image, std::filesystem::perms::owner_read);
+    openInOneSize({image});
+    treat("verifyDiskButton", image);
+    select(image);
+    button("repairDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    QTest::qWait(300);
+    takePicture("-no-rights");
 }
 
 TEST_F(Pictures, OfARepairThatIsNotProven)
