@@ -225,6 +225,13 @@ TEST_P(RoomTest, NothingIsClipped)
     EXPECT_EQ(window().height(), 720) << "it needs more";
     EXPECT_GE(expectRoomForAll<QLabel>(), 3);
     EXPECT_GE(expectRoomForAll<QAbstractButton>(), 12);
+    if (std::get<1>(GetParam()) > 1)
+        return;
+    window().resize(600, 400);
+    QTest::qWait(0);
+    EXPECT_EQ(window().size(), QSize(600, 400)) << "it needs more";
+    EXPECT_GE(expectRoomForAll<QLabel>(), 3);
+    EXPECT_GE(expectRoomForAll<QAbstractButton>(), 12);
 }
 
 INSTANTIATE_TEST_SUITE_P(At, RoomTest,

@@ -16,6 +16,8 @@
 #include <QTabWidget>
 #include <QTest>
 
+#include <unistd.h>
+
 #include <cstdlib>
 #include <filesystem>
 
@@ -271,6 +273,21 @@ TEST_F(Pictures, OfARepairThatIsUndone)
     ASSERT_TRUE(waitUntil([&] { return verdict(image) != "" && logRows().size() > 10; }));
     QTest::qWait(300);
     takePicture("-undone");
+}
+
+TEST_F(Pictures, OfAnImageThatCannotBeWritten)
+{
+    if (::geteuid() == 0)
+        GTEST_SKIP() << "root may write everything";
+    const std::string image = makeDamagedImage("Letters");
+    std::filesystem::permissions(image, std::filesystem::perms::owner_read);
+    openInOneSize({image});
+    treat("verifyDiskButton", image);
+    select(image);
+    button("repairDiskButton").press();
+    ASSERT_TRUE(waitForJob());
+    QTest::qWait(300);
+    takePicture("-no-rights");
 }
 
 TEST_F(Pictures, OfARepairThatIsNotProven)
