@@ -252,6 +252,10 @@ TEST_F(Pictures, OfAJobInTheList)
 TEST_F(Pictures, OfARepairThatIsUndone)
 {
     const std::string image = makeDamagedImage("Letters");
+    // What is inside loses its name, and is collected by the repair.
+    directory_.damage(image, "mkdir /photos");
+    directory_.damage(image, "mkdir /photos/summer");
+    directory_.damage(image, "clri /photos");
     const std::string interrupted = makeImage("Photos");
     orvane::test::interruptRepair(interrupted, directory_ / "state/repairs/records");
     openInOneSize({image, interrupted});
