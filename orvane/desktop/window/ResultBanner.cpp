@@ -35,7 +35,7 @@ constexpr std::array stepTitles{
     StepTitle{NextStep::Finish, "Finish Repair…", Symbol::Finish},
     StepTitle{NextStep::ApplyUnproven, "Apply Anyway…", Symbol::Repair},
     StepTitle{NextStep::RepairDirectly, "Repair Directly…", Symbol::Repair},
-    StepTitle{NextStep::ShowProblems, "Show What Was Found", Symbol::Search},
+    StepTitle{NextStep::ShowProblems, "Show Findings", Symbol::Search},
     StepTitle{NextStep::CopyDisk, "Copy the Disk First…", Symbol::Copy}};
 
 /// The sign that says the same as the tone's colour.
@@ -150,8 +150,9 @@ void ResultBanner::addButtons()
     QWidget* before = details_;
     for (const NextStep step : shown_.steps) {
         const auto* const title = std::ranges::find(stepTitles, step, &StepTitle::step);
-        auto* const button = new QPushButton(symbol(title->symbol),
-                                             toQtTitle(texts_.text(title->title)), this);
+        auto* const button = new QPushButton(toQtTitle(texts_.text(title->title)), this);
+        if (!isCompact_)
+            button->setIcon(symbol(title->symbol));
         button->setObjectName(QStringLiteral("step%1").arg(static_cast<int>(step)));
         button->setAutoDefault(true);
         connect(button, &QPushButton::clicked, this, [this, step] {

@@ -27,7 +27,7 @@ public:
 
     /// Nothing happens where it is shown already; what the user has closed stays closed.
     void show(const ResultSummary& summary);
-    /// Where there is little room: without the details.
+    /// Where there is little room: without the details, and the buttons without their symbols.
     void setCompact(bool isCompact);
 
     const ResultSummary& summary() const { return shown_; }
