@@ -371,6 +371,22 @@ TEST_F(HistoryTest, WhatAnotherProgramAddsIsTakenIn)
     EXPECT_EQ(histories.historyOf(disk_).size(), 0U);
 }
 
+TEST_F(HistoryTest, WhatTheStoreHasDroppedIsNotTakenForAnothersChange)
+{
+    limits_.recordsOfVolume = 10;
+    HistoryStore store = open();
+    DiskHistories histories(store);
+    for (int i = 0; i < 30; ++i) {
+        histories.historyOf(disk_).append(line(i));
+        histories.saveNew();
+    }
+    ASSERT_LT(store.recordsOf(histories.keyOf(disk_)).size(), 30);
+    EXPECT_FALSE(histories.takeInOthers());
+    EXPECT_EQ(histories.historyOf(disk_).size(), 30U);
+    (void)histories.clearHistoryOf(disk_);
+    EXPECT_FALSE(histories.takeInOthers());
+}
+
 TEST_F(HistoryTest, CopiesOfAVolumeAreNotMixed)
 {
     HistoryStore mine = open();

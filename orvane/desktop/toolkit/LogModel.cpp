@@ -15,7 +15,7 @@ namespace {
 using Clock = std::chrono::steady_clock;
 
 // A log of some hundred thousand rows is known at once, and no one waits longer for a longer one.
-constexpr std::chrono::milliseconds firstLook{8};
+constexpr std::chrono::milliseconds firstLook{4};
 constexpr int rowsBetweenTimes = 512;
 
 bool isProblem(const contract::OutlineItem& item)

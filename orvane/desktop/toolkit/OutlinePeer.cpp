@@ -213,7 +213,7 @@ void OutlinePeer::keepPlace(const LogPlace& place)
 
 void OutlinePeer::lookOn()
 {
-    constexpr std::chrono::milliseconds budget{8};
+    constexpr std::chrono::milliseconds budget{4};
     const LogPlace place(*table_, model_);
     const QScopedValueRollback own(isOwnChange_, true);
     const int before = model_.rowCount();

@@ -89,6 +89,7 @@ DiskHistories::History DiskHistories::load(const std::string& key)
     history.records = Array::make();
     store_.load({first, all.end}, history.records, history.times);
     history.savedCount = history.records.size();
+    history.endInStore = all.end;
     history.lastSaved = history.records.back();
     history.starts.take(history.records, history.times);
     if (isGradual) {
@@ -218,6 +219,7 @@ bool DiskHistories::clearHistoryOf(const DiskFacts& disk)
     if (store_.clear(key)) {
         history.savedCount = 0;
         history.lastSaved = {};
+        history.endInStore = store_.recordsOf(key).end;
     }
     return hadAny;
 }
@@ -283,19 +285,15 @@ void DiskHistories::saveNew()
         save(key, history, now);
 }
 
-// Only what is saved completely is let go; it is read again when it is asked for.
+// Only what is saved completely is let go; it is read again when it is asked for. That the store
+// keeps fewer records of a long history than there are in memory is no change of another's.
 bool DiskHistories::takeInOthers()
 {
     saveNew();
     const std::size_t others = std::erase_if(histories_, [this](const auto& entry) {
         const auto& [key, history] = entry;
-        const std::size_t known =
-            history.savedCount +
-            (history.older ? history.older->records.size() +
-                                 static_cast<std::size_t>(history.older->left.size())
-                           : 0);
         const bool isSaved = history.savedCount == history.records.size();
-        return isSaved && static_cast<std::size_t>(store_.recordsOf(key).size()) != known;
+        return isSaved && store_.recordsOf(key).end != history.endInStore;
     });
     if (others > 0)
         ++revision_;
@@ -327,6 +325,7 @@ void DiskHistories::save(const std::string& key, History& history, RecordTimes::
     if (store_.append(key, history.records, history.savedCount, history.times)) {
         history.savedCount = history.records.size();
         history.lastSaved = history.records.back();
+        history.endInStore = store_.recordsOf(key).end;
     }
 }
 

@@ -124,6 +124,7 @@ private:
         RecordTimes times;
         RunStarts starts;
         std::size_t savedCount = 0;
+        std::int64_t endInStore = 0;  ///< of the volume's records there, as far as they are known
         contract::Value lastSaved;
         std::optional<Older> older = std::nullopt;
     };
