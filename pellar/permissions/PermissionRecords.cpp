@@ -38,18 +38,6 @@ int lock(const FileDescriptor& file, int kind)
     return status.st_nlink > 0 ? 0 : ENOENT;  // removed by who had the lock before
 }
 
-/// Keeps two processes from beginning a record under the same name until it is destroyed.
-class BeginningLock {
-public:
-    explicit BeginningLock(int directory) : directory_(directory) { ::flock(directory_, LOCK_EX); }
-    BeginningLock(const BeginningLock&) = delete;
-    BeginningLock& operator=(const BeginningLock&) = delete;
-    ~BeginningLock() { ::flock(directory_, LOCK_UN); }
-
-private:
-    const int directory_;
-};
-
 bool isSameSystem(const PermissionsRun& a, const PermissionsRun& b)
 {
     const RecordedDisk& disk = a.repair.disk;
@@ -180,7 +168,7 @@ Result<PermissionRecords, Sentence> PermissionRecords::open(const std::filesyste
 Result<PermissionRecord, int> PermissionRecords::begin(const PermissionsRun& run) const
 {
     const int directory = directory_->descriptor();
-    const BeginningLock guard(directory);
+    const DirectoryLock guard(directory);
     ::unlinkat(directory, unfinishedName, 0);
     FileDescriptor file(::openat(directory, unfinishedName,
                                  O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));

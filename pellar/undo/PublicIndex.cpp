@@ -38,19 +38,6 @@ std::string publicTextOf(RecordFacts facts)
     return encodeFacts(facts);
 }
 
-/// Keeps the owner's other processes from writing to the index. Of the store's directory, as that
-/// of the index could be locked by anybody.
-class WritingLock {
-public:
-    explicit WritingLock(int records) : records_(records) { ::flock(records_, LOCK_EX); }
-    WritingLock(const WritingLock&) = delete;
-    WritingLock& operator=(const WritingLock&) = delete;
-    ~WritingLock() { ::flock(records_, LOCK_UN); }
-
-private:
-    const int records_;
-};
-
 /// Of all of the file, for writing: one that is only open for reading can ask about it, but can
 /// neither have it nor prevent it (fcntl(2), F_OFD_GETLK).
 struct flock writersLock()
@@ -144,7 +131,8 @@ Result<FileDescriptor, int> PublicIndex::publish(const std::string& id,
     if (!isForEverybody(facts.repair.disk))
         return FileDescriptor();
     const std::string text = publicTextOf(facts);
-    const WritingLock guard(records_->descriptor());
+    // Not the index's own directory, which anybody could lock.
+    const DirectoryLock guard(records_->descriptor());
     ::unlinkat(directory_.descriptor(), unfinishedName, 0);
     FileDescriptor file(::openat(directory_.descriptor(), unfinishedName,
                                  O_RDWR | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0600));
@@ -185,7 +173,7 @@ void PublicIndex::mend(const std::string& id, const RecordFacts& facts) const
 
 int PublicIndex::remove(const std::string& id) const
 {
-    const WritingLock guard(records_->descriptor());
+    const DirectoryLock guard(records_->descriptor());
     if (::unlinkat(directory_.descriptor(), id.c_str(), 0) != 0)
         return errno == ENOENT ? 0 : errno;
     return directory_.sync();
@@ -195,7 +183,7 @@ int PublicIndex::remove(const std::string& id) const
 void PublicIndex::removeOrphans() const
 {
     for (const std::string& id : directory_.names()) {
-        const WritingLock guard(records_->descriptor());
+        const DirectoryLock guard(records_->descriptor());
         struct stat status = {};
         const bool isGone =
             ::fstatat(records_->descriptor(), id.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0 &&

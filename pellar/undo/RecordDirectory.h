@@ -4,6 +4,8 @@
 #include "pellar/outcome/Result.h"
 #include "pellar/process/FileDescriptor.h"
 
+#include <sys/file.h>
+
 #include <cerrno>
 #include <chrono>
 #include <filesystem>
@@ -21,6 +23,20 @@ using SyncFunction = std::function<int(int descriptor)>;
 
 /// All of an open file; EFBIG when it has more bytes than `most`, or another errno.
 [[nodiscard]] Result<std::string, int> readWhole(const FileDescriptor& file, std::uint64_t most);
+
+/// Keeps other processes that take it from working in an open directory until it is destroyed; waits
+/// for those that do (flock(2)).
+class DirectoryLock {
+public:
+    /// The descriptor stays open as long as the lock.
+    explicit DirectoryLock(int directory) : directory_(directory) { ::flock(directory_, LOCK_EX); }
+    DirectoryLock(const DirectoryLock&) = delete;
+    DirectoryLock& operator=(const DirectoryLock&) = delete;
+    ~DirectoryLock() { ::flock(directory_, LOCK_UN); }
+
+private:
+    const int directory_;
+};
 
 /// What `attempt`, which answers a Result with an errno, comes to: made again while another has the
 /// lock (EWOULDBLOCK), for a fifth of a second at most, as a listing takes it for a moment.
