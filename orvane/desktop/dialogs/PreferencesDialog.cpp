@@ -84,7 +84,7 @@ QWidget* PreferencesDialog::checkingPage()
     switches_.push_back({&details, subject_.showsDetails});
     addSwitch(*rows, thoroughVerification, "Verify &thoroughly",
               "A verification that finds nothing also tries a repair, without writing to the disk, "
-              "and tells what it would change. This takes two to three times as long.");
+              "and tells what it would change. This takes longer.");
     addSwitch(*rows, fetchesPackageArchives, "&Download package archives",
               "To verify permissions, the archives of packages that say nothing of them on this "
               "system are fetched from the distribution’s servers.");
