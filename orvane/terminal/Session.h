@@ -5,6 +5,7 @@
 #include "orvane/jobs/HostJob.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/jobs/LibraryTexts.h"
+#include "orvane/jobs/PublishedChecks.h"
 #include "orvane/jobs/RepairRecords.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleLoader.h"
@@ -87,6 +88,8 @@ public:
     const pellar::Manager& library() const { return library_; }
     /// Read when this is first asked.
     const RepairRecords& repairRecords();
+    /// What scheduled checks have found, this user's and the system's; read when this is first asked.
+    const PublishedChecks& publishedChecks();
     const GivenNames& names() const { return names_; }
 
 private:
@@ -124,6 +127,7 @@ private:
     LibraryTexts libraryTexts_;
     pellar::Trials trials_;  ///< as the library has them
     std::optional<RepairRecords> repairRecords_;
+    std::optional<PublishedChecks> publishedChecks_;
     pellar::Manager library_;
     TerminalHost host_;
     JobLedger ledger_;
