@@ -138,6 +138,13 @@ const PublishedChecks& Session::publishedChecks()
     return *publishedChecks_;
 }
 
+const std::vector<CheckTimer>& Session::checkTimers()
+{
+    if (!checkTimers_)
+        checkTimers_ = readCheckTimers();
+    return *checkTimers_;
+}
+
 const RepairRecords& Session::repairRecords()
 {
     if (!repairRecords_)

@@ -9,6 +9,7 @@
 #include "orvane/jobs/RepairRecords.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleLoader.h"
+#include "orvane/support/systemd/CheckTimers.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/PasswordAgent.h"
 #include "orvane/terminal/TerminalHost.h"
@@ -90,6 +91,8 @@ public:
     const RepairRecords& repairRecords();
     /// What scheduled checks have found, this user's and the system's; read when this is first asked.
     const PublishedChecks& publishedChecks();
+    /// When scheduled checks are due; asked for when this is first asked, for two seconds at most.
+    const std::vector<CheckTimer>& checkTimers();
     const GivenNames& names() const { return names_; }
 
 private:
@@ -128,6 +131,7 @@ private:
     pellar::Trials trials_;  ///< as the library has them
     std::optional<RepairRecords> repairRecords_;
     std::optional<PublishedChecks> publishedChecks_;
+    std::optional<std::vector<CheckTimer>> checkTimers_;
     pellar::Manager library_;
     TerminalHost host_;
     JobLedger ledger_;
