@@ -183,10 +183,20 @@ PublishedChecks newestOf(PublishedChecks one, const PublishedChecks& other)
     return one;
 }
 
+// Which of two copies of a volume was which device, nobody knows later: where they differ, either may
+// be this one.
 const Run* publishedRun(const PublishedChecks& checks, std::string_view key)
 {
     const auto found = checks.find(key);
-    return found == checks.end() || !found->second.run ? nullptr : &*found->second.run;
+    if (found == checks.end() || !found->second.run)
+        return nullptr;
+    const PublishedCheck& check = found->second;
+    const auto isOtherAnswer = [&check](const auto& entry) {
+        const PublishedCheck& other = entry.second;
+        return !check.uuid.empty() && other.uuid == check.uuid && other.run &&
+               other.run->verdict() != check.run->verdict();
+    };
+    return std::ranges::any_of(checks, isOtherAnswer) ? nullptr : &*check.run;
 }
 
 // The lock's file is its owner's alone: what others may open, they may lock.

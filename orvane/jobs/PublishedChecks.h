@@ -36,7 +36,8 @@ using PublishedChecks = std::map<std::string, PublishedCheck, std::less<>>;
 /// Of two directories, what is newer of each volume.
 [[nodiscard]] PublishedChecks newestOf(PublishedChecks one, const PublishedChecks& other);
 
-/// The run of the volume; null where none is known. Valid as long as the checks.
+/// The run of the volume; null where none is known, or where copies of the volume (of the same UUID)
+/// were found to be something else. Valid as long as the checks.
 [[nodiscard]] const Run* publishedRun(const PublishedChecks& checks, std::string_view key);
 
 /// Keeps what a check found in place of what was known of the volume; a check without a run leaves

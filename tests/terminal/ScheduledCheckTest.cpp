@@ -42,7 +42,11 @@ TEST(PublishedChecks, AreKeptByVolumeUntilNewerOnesCome)
     ASSERT_TRUE(publishCheck(place, "a", first));
     ASSERT_TRUE(publishCheck(place, "old", check("/dev/old", daysAgo(400), "damaged")));
     const Time eight = daysAgo(8);
-    ASSERT_TRUE(publishCheck(place, "b", check("/dev/b", eight, "sound")));
+    PublishedCheck sound = check("/dev/b", eight, "sound");
+    sound.uuid = "v";
+    ASSERT_TRUE(publishCheck(place, "b", sound));
+    const PublishedChecks copies{{"uuid:u", first}, {"uuid:u@/dev/b", check("/dev/b", eight, "sound")}};
+    EXPECT_EQ(publishedRun(copies, "uuid:u"), nullptr) << "of which of the two is it?";
     PublishedCheck skipped{"/dev/a\xff\n", "u", {}, daysAgo(1)};
     ASSERT_TRUE(publishCheck(place, "a", skipped));
     skipped.run = first.run;
