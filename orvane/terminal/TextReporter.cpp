@@ -27,6 +27,14 @@ bool isStartOfRun(const contract::Dictionary& record)
            !record.has(contract::kFsckMessageType) && record.has(contract::kFsckMessageString);
 }
 
+/// On a terminal, where no mark stands beside it, a tool's line that tells of a problem is red.
+contract::StyledText coloured(const contract::StyledText& text)
+{
+    contract::TextStyle style = text.style();
+    style.color = contract::Color{1, 0, 0, 1};
+    return contract::StyledText::make(text.characters(), style);
+}
+
 std::size_t terminalColumns()
 {
     winsize size{};
@@ -58,7 +66,9 @@ public:
             write("\n");
         }
         hasWrittenRows_ = true;
-        write(terminalText(text, options_.colors));
+        const bool isProblem =
+            record.string(contract::kFsckMessageType) == contract::kFsckProblem.text();
+        write(terminalText(isProblem ? coloured(text) : text, options_.colors));
     }
 
     void rowsWritten() override

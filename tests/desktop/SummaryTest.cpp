@@ -93,6 +93,11 @@ TEST(ResultSummaryOfOne, OffersWhatHelpsAndNothingThatCostsData)
         EXPECT_EQ(summary.tone, c.tone) << c.title;
         EXPECT_EQ(summary.steps, c.steps) << c.title;
     }
+    DiskRow lossy = checked("x", "repaired", "repair");
+    lossy.lastCheck->told.hasLosses = true;
+    EXPECT_EQ(resultOf(lossy, undoable, Translator()).tone, Tone::Caution);
+    EXPECT_EQ(resultOf(lossy, undoable, Translator()).title,
+              "Repaired, but files were lost or moved.");
     DiskRow failing = checked("x", "damaged", "verify", contract::kPLErrorDamaged);
     failing.facts.hasSMARTError = true;
     EXPECT_EQ(resultOf(failing, repairable, Translator()).steps,

@@ -414,27 +414,20 @@ TEST_P(TasksTest, CloseAnImageAndOpenItAgain)
 {
     const std::string image = makeImage("photos");
     begin({image});
-    chooseDisk(image);
     if (isMouse()) {
-        clickMenu("closeImageInFile");
-        clickCommandOfMenu("closeImageInFile");
+        clickRow(image, {}, Qt::RightButton);
+        clickCommandOfMenu("closeImage");
     } else {
+        chooseDisk(image);
         type(Qt::CTRL | Qt::Key_W);
     }
     ASSERT_TRUE(waitUntil([&] { return !row(image).isValid(); }));
-    if (isMouse()) {
-        clickMenu("openImage");
-        clickCommandOfMenu("openRecent");
-        auto* const recent = command("openRecent").menu();
-        ASSERT_TRUE(waitUntil([&] { return recent->isVisible(); }));
-        click(*recent, recent->actionGeometry(recent->actions().front()).center());
-    } else {
-        type(Qt::ALT | Qt::Key_F);
-        type(Qt::Key_T);
-        type(Qt::Key_1);
-    }
+    EXPECT_TRUE(says("photos")) << said();
+    ASSERT_TRUE(waitForStep(NextStep::Reopen));
+    choose(qPrintable(QStringLiteral("step%1").arg(static_cast<int>(NextStep::Reopen))),
+           Qt::CTRL | Qt::SHIFT | Qt::Key_T);
     EXPECT_TRUE(waitUntil([&] { return row(image).isValid(); }));
-    expectSteps(6, 5);
+    expectSteps(3, 3);
 }
 
 INSTANTIATE_TEST_SUITE_P(By, TasksTest, testing::Values(Hand::Mouse, Hand::Keyboard),
