@@ -268,10 +268,10 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
     auto mounts = mountsOf(disk->path, options_.systemPaths);
     const bool isRoot = isMountedAtRoot(mounts);
     const bool staysMounted =
-        isRoot || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
+        isRoot || !options_.unmounts || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
         startScript<LiveVolumeScript>(disk, mounts);
-    else if (mounts.empty() || isRoot)
+    else if (mounts.empty() || isRoot || !options_.unmounts)
         return error;
     else
         startVolume({disk, operation, std::nullopt, std::move(mounts), toolFor(disk->filesystem)});

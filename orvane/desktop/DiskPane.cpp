@@ -84,6 +84,7 @@ DiskPane::DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const Job
       named_(std::move(named)),
       scansSystemDisks_(scansSystemDisks),
       events_(std::move(events)),
+      scheduled_(loop, [this] { synchronize(); }),
       model_(host.sharedDiskController(), states(), host.translator()),
       recent_(host.standardUserDefaults()),
       images_(host, {[this](const Disk& disk) {
@@ -136,6 +137,7 @@ void DiskPane::start()
             host_.log().ov_log(contract::OVLog::error, 0, watching.error().message);
         list_.setLooking(true);
         scan_.start();
+        scheduled_.start();
     }
     isReopening_ = true;
     images_.open(recent_.toReopen());
@@ -222,12 +224,14 @@ DiskStates DiskPane::states()
             [this](const Disk& disk) { return noteOn(disk); },
             [this] {
                 return ledger_.currentRun() != nullptr ? ledger_.currentRun()->percent : 0;
-            }};
+            },
+            [this](const Disk& disk) { return nextCheckOf(disk); }};
 }
 
 std::optional<LastCheck> DiskPane::lastCheckOf(const Disk& disk)
 {
-    auto runs = lastRunsOf(host_.historyStore(), host_.histories().keyOf(disk.facts()));
+    const std::string key = host_.histories().keyOf(disk.facts());
+    auto runs = lastRunsOf(host_.historyStore(), key, scheduled_.lastRun(key));
     // The run that is under way has no end yet, and is told as what it is.
     const bool isAtWork = !activityOn(disk).empty();
     if (!runs || (isAtWork && !runs->told.end))
@@ -236,6 +240,14 @@ std::optional<LastCheck> DiskPane::lastCheckOf(const Disk& disk)
     if (runs->later && !isAtWork)
         check.later = checkOf(*runs->later);
     return check;
+}
+
+std::optional<QDateTime> DiskPane::nextCheckOf(const Disk& disk)
+{
+    const auto next = scheduled_.nextOf(disk);
+    if (!next)
+        return std::nullopt;
+    return QDateTime::fromSecsSinceEpoch(std::chrono::system_clock::to_time_t(*next));
 }
 
 std::string DiskPane::noteOn(const Disk& disk)

@@ -5,6 +5,7 @@
 #include "orvane/desktop/ImageOpener.h"
 #include "orvane/desktop/KeptRepairs.h"
 #include "orvane/desktop/RecentImages.h"
+#include "orvane/desktop/ScheduledChecks.h"
 #include "orvane/desktop/window/DiskList.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/support/disks/DiskWatch.h"
@@ -109,6 +110,7 @@ public:
 private:
     DiskStates states();
     std::optional<LastCheck> lastCheckOf(const Disk& disk);
+    std::optional<QDateTime> nextCheckOf(const Disk& disk);
     std::string activityOn(const Disk& disk);
     std::string noteOn(const Disk& disk);
     void adoptDisks(const std::vector<DiskTree>& disks);
@@ -126,6 +128,7 @@ private:
     const bool scansSystemDisks_;
     const Events events_;
     bool hasReadDisks_ = false;
+    ScheduledChecks scheduled_;
     DiskTreeModel model_;
     std::vector<std::string> closed_;  ///< last, by the user
     RecentImages recent_;

@@ -115,11 +115,31 @@ std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key)
     auto last = store.lastRun(key);
     if (!last || hasAnswer(*last))
         return last ? std::optional(LastRuns{*std::move(last), std::nullopt}) : std::nullopt;
-    const auto runs = store.runs(key);
+    return lastRunsIn(store.runs(key));
+}
+
+std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key, const Run* other)
+{
+    if (other == nullptr)
+        return lastRunsOf(store, key);
+    std::vector<Run> runs = store.runs(key);
+    // Whoever keeps the run itself knows more of it.
+    const auto newer = std::ranges::find_if(
+        runs, [&](const Run& run) { return run.started >= other->started; });
+    if (newer == runs.end() || newer->started != other->started)
+        runs.insert(newer, *other);
+    return lastRunsIn(runs);
+}
+
+std::optional<LastRuns> lastRunsIn(const std::vector<Run>& runs)
+{
+    if (runs.empty())
+        return std::nullopt;
     const auto told = std::find_if(runs.rbegin(), runs.rend(), hasAnswer);
     if (told == runs.rend())
-        return LastRuns{*std::move(last), std::nullopt};
-    return LastRuns{*told, std::move(last)};
+        return LastRuns{runs.back(), std::nullopt};
+    const auto later = told == runs.rbegin() ? std::nullopt : std::optional(runs.back());
+    return LastRuns{*told, later};
 }
 
 void keepUnreached(SupportHost& host, Disk& image, pellar::Operation operation,

@@ -10,6 +10,7 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace orvane {
 
@@ -72,6 +73,11 @@ struct LastRuns {
 
 /// None when there was no run. Main thread.
 [[nodiscard]] std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key);
+/// The same of what is known elsewhere as well: `other` is a run that another user keeps, or null.
+[[nodiscard]] std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key,
+                                                 const Run* other);
+/// The same of these runs, oldest first.
+[[nodiscard]] std::optional<LastRuns> lastRunsIn(const std::vector<Run>& runs);
 
 /// Keeps with an image, as a failed run and as a line of its log, that nothing of it could be
 /// treated. A check that did not take place must not look like one that had nothing to say. Main

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/privileges/LibraryOptions.h"
 
+#include "orvane/jobs/PublishedChecks.h"
 #include "orvane/privileges/MountedSystem.h"
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/modules/ModuleSearch.h"
@@ -48,13 +49,17 @@ std::string toolPathFromEnvironment(const WarningSink& refused)
     return path;
 }
 
-/// Root's repairs are kept with those that the helper makes for others, so that root sees them all;
-/// unless other directories are asked for.
+/// Root works for all, unless other directories are asked for.
+bool worksForAll(const XDGPaths& paths)
+{
+    return ::geteuid() == 0 && !environmentValue("XDG_STATE_HOME") &&
+           paths.state == userXDGPaths().state;
+}
+
+/// Root's repairs are kept with those that the helper makes for others, so that root sees them all.
 std::filesystem::path repairsDirectory(const XDGPaths& paths)
 {
-    const bool isUsual =
-        !environmentValue("XDG_STATE_HOME") && paths.state == userXDGPaths().state;
-    if (::geteuid() == 0 && isUsual)
+    if (worksForAll(paths))
         return systemRepairs;
     return fileIn(paths.state, "repairs");
 }
@@ -85,6 +90,12 @@ void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairA
 }
 
 }  // namespace
+
+std::filesystem::path checksDirectory(const XDGPaths& paths)
+{
+    return worksForAll(paths) ? std::filesystem::path(systemChecks)
+                              : fileIn(paths.state, "checks");
+}
 
 pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
                                   const Asking& asking, const WarningSink& refused,

@@ -12,6 +12,10 @@ namespace orvane {
 /// Where repairs are tried and kept as root, in directories that are root's alone.
 inline constexpr const char* systemRepairs = "/var/lib/orvane/repairs";
 
+/// Where what this user's scheduled checks find is kept for others (orvane/jobs/PublishedChecks.h);
+/// empty where the user has no directory.
+[[nodiscard]] std::filesystem::path checksDirectory(const XDGPaths& paths);
+
 /// How the disk-management library is set up for a user: where it looks for tools, where it keeps
 /// what a repair overwrites and how much of it, and how it gets at disks for which the user has no
 /// right. `texts` outlives the options. The repair policy is the stored settings'. `refused` (may be empty) is told of directories of FIXWELL_TOOL_PATH that

@@ -18,7 +18,7 @@ struct CommandText {
     const char* text;
 };
 
-constexpr std::array<CommandText, 14> commandTexts{{
+constexpr std::array<CommandText, 17> commandTexts{{
     {Command::Verify, "verify", "Look for damage; write nothing"},
     {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
     {Command::VerifyPermissions, "verify-permissions",
@@ -29,6 +29,10 @@ constexpr std::array<CommandText, 14> commandTexts{{
     {Command::List, "list", "Show disks, their last verdict and what can be done with them"},
     {Command::History, "history", "Show what earlier checks found"},
     {Command::Report, "report", "Write what is known of disks and their checks, to be passed on"},
+    {Command::ScheduledCheck, "scheduled-check",
+     "Verify what is not in use, for a timer: unmounts nothing, tells the journal"},
+    {Command::Metrics, "metrics", "Write the last verdicts and times for Prometheus"},
+    {Command::Notify, "notify", "Tell the desktop what scheduled checks have found since it was told last"},
     {Command::Mount, "mount", "Mount volumes, where the system chooses to"},
     {Command::Unmount, "unmount", "Unmount volumes"},
     {Command::Eject, "eject", "Unmount all of a drive, and give the medium back"},
@@ -91,19 +95,45 @@ void addRepairOptions(CLI::App& command, Request& request)
     direct->excludes(unproven);
 }
 
+void addMetricsOptions(CLI::App& command, Request& request)
+{
+    CLI::Option* const output =
+        command.add_option("--output", request.output, "Replace this file instead of printing")
+            ->type_name("FILE");
+    command
+        .add_flag("--if-directory-exists", request.needsNoDirectory,
+                  "Write nothing where there is no directory for the file")
+        ->needs(output);
+}
+
+bool makePathsAbsolute(std::initializer_list<std::filesystem::path*> paths)
+{
+    std::error_code error;
+    for (std::filesystem::path* const path : paths)
+        if (!path->empty())
+            *path = std::filesystem::absolute(*path, error);
+    return !error;
+}
+
 /// What the parser's rules cannot say; none when there is nothing to object to.
 const char* objectionTo(Request& request)
 {
     if (request.command == Command::Report && request.isJSON)
         return "a report is for people; “history --json” tells programs the same";
+    if (request.command == Command::Metrics && request.isJSON)
+        return "metrics have a format of their own; “list --json” tells programs the same";
     std::filesystem::path& kept = request.repairPolicy.keptImage;
-    if (kept.empty())
-        return nullptr;
-    if (request.disks.size() > 1)
+    if (!kept.empty() && request.disks.size() > 1)
         return "--keep takes one disk: there is one file for one volume";
-    std::error_code error;
-    kept = std::filesystem::absolute(kept, error);
-    return error ? "--keep: the current directory cannot be found" : nullptr;
+    return makePathsAbsolute({&kept, &request.output}) ? nullptr
+                                                       : "the current directory cannot be found";
+}
+
+/// Without a disk they are about all of them.
+bool needsDisks(Command command)
+{
+    return command != Command::List && command != Command::ScheduledCheck &&
+           command != Command::Metrics;
 }
 
 bool treatsMaps(Command command)
@@ -115,6 +145,10 @@ bool treatsMaps(Command command)
 void addCommand(CLI::App& app, const CommandText& text, Request& request)
 {
     CLI::App& command = *app.add_subcommand(text.name, text.text);
+    command.callback([&request, chosen = text.command] { request.command = chosen; });
+    command.fallthrough();
+    if (text.command == Command::Notify)
+        return;
     const bool takesImages = text.command == Command::Attach;
     CLI::Option& disks = *command
                               .add_option(takesImages ? "IMAGE" : "DISK", request.disks,
@@ -122,7 +156,7 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
                               ->type_name("");
     if (takesImages)
         command.add_flag("--read-only", request.attachesReadOnly, "Let nobody write to it");
-    if (text.command != Command::List)
+    if (needsDisks(text.command))
         disks.required();
     if (text.command == Command::History)
         command.add_flag("--clear", request.clearsHistory, "Forget these disks' histories");
@@ -147,8 +181,14 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request)
         command.add_flag("--fetch-archives", request.fetchesArchives,
                          "Fetch package archives over the network (with apt) where nothing here "
                          "says what permissions their files have");
-    command.callback([&request, chosen = text.command] { request.command = chosen; });
-    command.fallthrough();
+    if (text.command == Command::ScheduledCheck)
+        command
+            .add_option("--instance", request.unitInstance,
+                        "The disk of a unit, as systemd-escape(1) writes it; or “all”")
+            ->type_name("NAME")
+            ->excludes(&disks);
+    if (text.command == Command::Metrics)
+        addMetricsOptions(command, request);
 }
 
 Ending wrongUsage(std::string_view why)

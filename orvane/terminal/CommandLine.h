@@ -32,6 +32,9 @@ enum class Command {
     List,
     History,
     Report,
+    ScheduledCheck,
+    Metrics,
+    Notify,
     Mount,
     Unmount,
     Eject,
@@ -52,6 +55,9 @@ struct Request {
     bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
     bool treatsPermissions = false;    ///< of installed files; to undo alone
     pellar::RepairPolicy repairPolicy;  ///< the image to keep is named by an absolute path
+    std::optional<std::string> unitInstance;  ///< whose scheduled check it is, as systemd escapes it
+    std::filesystem::path output;  ///< of metrics; absolute, or empty for standard output
+    bool needsNoDirectory = false;  ///< nothing is written where that of `output` is missing
     bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;

@@ -15,6 +15,12 @@ int runList(const Request& request, Session& session, Reporter& reporter);
 int runHistory(const Request& request, Session& session, Reporter& reporter);
 /// To standard output.
 int runReport(const Request& request, Session& session);
+/// Verifies without unmounting anything; a disk that is skipped for that is no failure.
+int runScheduledCheck(const Request& request, Session& session, Reporter& reporter);
+/// To standard output, or to the file that was asked for.
+int runMetrics(const Request& request, Session& session, Reporter& reporter);
+/// Of the checks that are bad news and newer than those that the user was told of.
+int runNotify(Session& session, Reporter& reporter);
 /// Undo or finish: one disk after the other.
 int runUndo(const Request& request, Session& session, Reporter& reporter);
 /// Mount, unmount, eject or detach: one disk after the other.

@@ -125,6 +125,7 @@ public:
                                     ? ordered_json{{"started", disk.later->started},
                                                    {"verdict", textOrNull(disk.later->verdict)}}
                                     : ordered_json(nullptr)},
+               {"nextCheck", textOrNull(disk.nextCheck)},
                {"interruptedRepair", textOrNull(disk.interruptedRepair)},
                {"actions", actions}});
     }

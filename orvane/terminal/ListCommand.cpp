@@ -51,8 +51,11 @@ DiskLine describe(const std::shared_ptr<Disk>& disk, Session& session)
     line.format = formatName(facts.filesystem, facts.filesystemVersion);
     line.bytes = facts.length;
     line.mountPoint = facts.mountPoint;
-    const auto runs =
-        lastRunsOf(session.host().historyStore(), session.host().histories().keyOf(facts));
+    if (const auto next = nextCheckOf(*disk, session.checkTimers()))
+        line.nextCheck = localTime(*next);
+    const std::string key = session.host().histories().keyOf(facts);
+    const auto runs = lastRunsOf(session.host().historyStore(), key,
+                                 publishedRun(session.publishedChecks(), key));
     if (!runs)
         return line;
     line.lastChecked = localTime(runs->told.started);

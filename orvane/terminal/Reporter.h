@@ -41,6 +41,7 @@ struct DiskLine {
         std::string verdict;  ///< empty when it was cut off
     };
     std::optional<Attempt> later = {};
+    std::string nextCheck = {};  ///< local time of the scheduled one; empty where none is known
     /// The record of a repair that was interrupted as it was written; empty: none that is known.
     std::string interruptedRepair = {};
     bool isOthersToUndo = false;  ///< another user asked for that repair

@@ -16,7 +16,8 @@ namespace {
 
 TerminalAlerts::Answer answerFor(const Request& request)
 {
-    if (request.confirms)
+    // A timer's check of the startup disk was asked for when the timer was set.
+    if (request.confirms || request.command == Command::ScheduledCheck)
         return TerminalAlerts::Answer::Confirm;
     const bool canAsk =
         !request.isJSON && ::isatty(STDIN_FILENO) == 1 && ::isatty(STDOUT_FILENO) == 1;
@@ -90,6 +91,7 @@ pellar::JobOptions Session::libraryOptions(const Request& request)
         return policy;
     };
     trials_ = options.trials;
+    options.unmounts = request.command != Command::ScheduledCheck;
     options.observer = &ledger_;
     if (tracesCommands_)
         options.commandTrace = [this](std::string_view line) {
@@ -126,6 +128,21 @@ RepairAdvice Session::repairAdvice() const
                                "%1$@",
                                "repair --direct", disk, names_.namedOf(disk.identifier));
             }};
+}
+
+const PublishedChecks& Session::publishedChecks()
+{
+    if (!publishedChecks_)
+        publishedChecks_ = newestOf(readPublishedChecks(systemChecks),
+                                    readPublishedChecks(checksDirectory(userXDGPaths())));
+    return *publishedChecks_;
+}
+
+const std::vector<CheckTimer>& Session::checkTimers()
+{
+    if (!checkTimers_)
+        checkTimers_ = readCheckTimers();
+    return *checkTimers_;
 }
 
 const RepairRecords& Session::repairRecords()

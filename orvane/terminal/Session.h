@@ -5,9 +5,11 @@
 #include "orvane/jobs/HostJob.h"
 #include "orvane/jobs/JobLedger.h"
 #include "orvane/jobs/LibraryTexts.h"
+#include "orvane/jobs/PublishedChecks.h"
 #include "orvane/jobs/RepairRecords.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleLoader.h"
+#include "orvane/support/systemd/CheckTimers.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/PasswordAgent.h"
 #include "orvane/terminal/TerminalHost.h"
@@ -87,6 +89,10 @@ public:
     const pellar::Manager& library() const { return library_; }
     /// Read when this is first asked.
     const RepairRecords& repairRecords();
+    /// What scheduled checks have found, this user's and the system's; read when this is first asked.
+    const PublishedChecks& publishedChecks();
+    /// When scheduled checks are due; asked for when this is first asked, for two seconds at most.
+    const std::vector<CheckTimer>& checkTimers();
     const GivenNames& names() const { return names_; }
 
 private:
@@ -124,6 +130,8 @@ private:
     LibraryTexts libraryTexts_;
     pellar::Trials trials_;  ///< as the library has them
     std::optional<RepairRecords> repairRecords_;
+    std::optional<PublishedChecks> publishedChecks_;
+    std::optional<std::vector<CheckTimer>> checkTimers_;
     pellar::Manager library_;
     TerminalHost host_;
     JobLedger ledger_;

@@ -144,6 +144,8 @@ public:
         if (disk.later)
             below(sentence("after that, %@: %@",
                            {disk.later->started, verdictText(disk.later->verdict)}));
+        if (!disk.nextCheck.empty())
+            below(sentence("next check %@", {disk.nextCheck}));
         if (!disk.interruptedRepair.empty())
             below(sentence(disk.isOthersToUndo
                                ? "repair interrupted: who asked for it, or an administrator, can "

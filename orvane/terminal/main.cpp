@@ -55,6 +55,8 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
         case Command::Detach: return runDiskAction(request, session, reporter);
         case Command::Attach: return runAttach(request, session, reporter);
         case Command::Report: return runReport(request, session);
+        case Command::Metrics: return runMetrics(request, session, reporter);
+        case Command::Notify: return runNotify(session, reporter);
         default: break;  // what needs the module
     }
     if (const auto loaded = session.loadModule(); !loaded) {
@@ -63,6 +65,7 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     }
     switch (request.command) {
         case Command::List: return runList(request, session, reporter);
+        case Command::ScheduledCheck: return runScheduledCheck(request, session, reporter);
         case Command::Undo:
         case Command::Finish: return runUndo(request, session, reporter);
         case Command::History: return runHistory(request, session, reporter);

@@ -151,6 +151,9 @@ struct JobOptions {
     /// empty. Not called after the PLRepairDisk has been destroyed.
     std::function<void(std::string_view)> commandTrace;
     SystemPaths systemPaths;
+    /// NO: no job unmounts a volume. One that is mounted is verified there where that is possible,
+    /// and no job begins on any other.
+    bool unmounts = true;
     /// The user's. The volume that holds it is verified where it is mounted, in the way in which
     /// that is possible, and not unmounted for it. Empty when there is none.
     std::filesystem::path homeDirectory;

@@ -1,5 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/desktop/QtLoop.h"
+#include "orvane/desktop/ScheduledChecks.h"
+#include "tests/support/BusObject.h"
+#include "tests/support/TestDirectory.h"
 
 #include <gtest/gtest.h>
 
@@ -70,6 +73,30 @@ TEST(QtLoop, ANestedEventLoopGoesOnWithTheTasksBehind)
     });
     ASSERT_TRUE(QTest::qWaitFor([&] { return ran.size() == 3; }, longestWait));
     EXPECT_EQ(ran, (std::vector<std::string>{"dialog opens", "task behind", "dialog closed"}));
+}
+
+TEST(ScheduledChecks, WhatOthersPublishAppearsByItself)
+{
+    const orvane::test::SystemBus none("unix:path=/nonexistent/bus");
+    const orvane::test::TestDirectory directory;
+    const orvane::Run::Time time{std::chrono::system_clock::now()};
+    const orvane::Run sound{"verify", time, time, RunEnd{"sound", 0, ""}};
+    const auto publish = [&](const char* verdict) {
+        orvane::Run run = sound;
+        run.end->verdict = verdict;
+        EXPECT_TRUE(publishCheck(directory.path(), "k", {"/dev/a", "", run, {}}));
+    };
+    QtLoop loop;
+    int changes = 0;
+    ScheduledChecks checks(loop, [&] { ++changes; }, directory.path());
+    publish("sound");
+    EXPECT_EQ(checks.lastRun("k"), nullptr) << "before the start";
+    checks.start();
+    ASSERT_NE(checks.lastRun("k"), nullptr);
+    EXPECT_EQ(changes, 1);
+    publish("damaged");
+    ASSERT_TRUE(QTest::qWaitFor([&] { return changes == 2; }, longestWait));
+    EXPECT_EQ(checks.lastRun("k")->verdict(), "damaged");
 }
 
 }  // namespace

@@ -161,6 +161,28 @@ TEST(SelectionSummaryText, SaysHowItIsAndHowFull)
     EXPECT_TRUE(summary.facts.startsWith(QStringLiteral("2.0 GiB in all")));
 }
 
+TEST(SelectionSummaryText, SaysWhenItIsCheckedNext)
+{
+    // 22 November 2026 is a Sunday.
+    const QDateTime sunday = now.addDays(7), tuesday(QDate(2026, 11, 24), QTime(0, 30));
+    const auto stateWith = [](DiskRow disk, const QDateTime& next) {
+        disk.nextCheck = next;
+        return summaryOf({disk}, {}, now, Translator()).state;
+    };
+    EXPECT_EQ(stateWith(checked("a", "sound"), tuesday),
+              QStringLiteral("Sound · 3 minutes ago · next check on Tuesday"));
+    EXPECT_EQ(stateWith(row("a"), now.addSecs(3600)),
+              QStringLiteral("Never checked · next check today"));
+    EXPECT_EQ(stateWith(row("a"), now.addSecs(86400)),
+              QStringLiteral("Never checked · next check tomorrow"));
+    EXPECT_FALSE(nextCheckText(sunday, now, Translator()).contains(QStringLiteral("Sunday")))
+        << "not this one";
+    EXPECT_EQ(stateWith(row("a"), now.addSecs(-1)), QStringLiteral("Never checked"));
+    DiskRow busy = row("a");
+    busy.activity = "verifying…";
+    EXPECT_EQ(stateWith(busy, tuesday), QStringLiteral("Verifying…"));
+}
+
 TEST(SelectionSummaryText, AgesAreTrue)
 {
     for (const auto& [seconds, text] :

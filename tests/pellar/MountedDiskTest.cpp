@@ -100,6 +100,16 @@ TEST_F(MountedDisk, IsUnmountedForTheJobAndMountedAgainAsItWas)
     }
 }
 
+TEST_F(MountedDisk, StaysWhereItIsWhenNothingIsToBeUnmounted)
+{
+    JobOptions options;
+    options.unmounts = false;
+    test::JobFixture library(options);
+    for (const bool repairs : {false, true})
+        EXPECT_NE(repairs ? library.repair(disk()) : library.verify(disk()), 0);
+    EXPECT_EQ(mounts(), before_);
+}
+
 /// A job in a process of its own, to be killed.
 class OtherProgram {
 public:

@@ -8,6 +8,7 @@
 #include "orvane/support/udisks/UDisks.h"
 #include "pellar/disks/DiskClaim.h"
 #include "tests/support/BusDaemon.h"
+#include "tests/support/BusObject.h"
 #include "tests/support/LoopDevice.h"
 #include "tests/support/TestDirectory.h"
 
@@ -25,17 +26,13 @@ namespace {
 using Kind = Refusal::Kind;
 using pellar::Access;
 using test::LoopDevice;
+using test::SystemBus;
+using test::addMethod;
+using test::addProperties;
+using test::always;
+using test::finish;
 using test::TestDirectory;
 using namespace std::chrono_literals;
-
-/// The bus on which UDisks2 is looked for, until this object ends.
-struct SystemBus {
-    explicit SystemBus(const std::string& address)
-    {
-        ::setenv("DBUS_SYSTEM_BUS_ADDRESS", address.c_str(), 1);
-    }
-    ~SystemBus() { ::unsetenv("DBUS_SYSTEM_BUS_ADDRESS"); }
-};
 
 DiskRequest request(DiskAction action, DiskStep::Kind kind, const std::string& node)
 {
@@ -124,48 +121,6 @@ TEST_F(DirectTest, TheSystemsRootIsLeftAlone)
 }
 
 using Options = std::map<std::string, sdbus::Variant>;
-
-template <class Function>
-void addMethod(sdbus::IObject& object, const char* interface, const char* name, Function function)
-{
-#if ORVANE_SDBUS == 2
-    object.addVTable(sdbus::registerMethod(name).implementedAs(std::move(function)))
-        .forInterface(std::string(interface));
-#else
-    object.registerMethod(name).onInterface(interface).implementedAs(std::move(function));
-#endif
-}
-
-/// Adds properties of one interface, each with what gives its value.
-template <class... Getter>
-void addProperties(sdbus::IObject& object, const char* interface,
-                   std::pair<const char*, Getter>... properties)
-{
-#if ORVANE_SDBUS == 2
-    object.addVTable(sdbus::registerProperty(properties.first).withGetter(properties.second)...)
-        .forInterface(std::string(interface));
-#else
-    (object.registerProperty(properties.first).onInterface(interface).withGetter(properties.second),
-     ...);
-#endif
-}
-
-/// What gives a property its value.
-template <class Value>
-auto always(Value value)
-{
-    return [value] {
-        return value;
-    };
-}
-
-/// When all has been added.
-void finish([[maybe_unused]] sdbus::IObject& object)
-{
-#if ORVANE_SDBUS == 1
-    object.finishRegistration();
-#endif
-}
 
 /// A UDisks2 with one failing drive and one volume on it, which mounts when it is told to.
 class FakeUDisks {

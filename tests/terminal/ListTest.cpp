@@ -25,7 +25,7 @@ TEST_F(ListTest, TellsWhatIsKnownOfAnImage)
     disk["actions"].erase("repair-permissions");
     EXPECT_EQ(disk, nlohmann::json::parse(R"({"event":"disk","disk":"image","name":"Holidays",
         "kind":"disk image","bytes":8388608,"filesystem":"ext4","mountPoint":null,
-        "verdict":"sound","laterAttempt":null,"interruptedRepair":null,
+        "verdict":"sound","laterAttempt":null,"nextCheck":null,"interruptedRepair":null,
         "actions":{"verify":{"available":true,"reason":null},"verify-permissions":{"available":false,
         "reason":"Not available because the selected disk is not mounted."}}})"));
 }

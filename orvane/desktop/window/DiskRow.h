@@ -50,6 +50,10 @@ struct DiskStates {
     std::function<double()> percent = [] {
         return 0.0;
     };
+    /// When it is checked by itself; none where that is not known.
+    std::function<std::optional<QDateTime>(const Disk& disk)> nextCheck = [](const Disk&) {
+        return std::optional<QDateTime>();
+    };
 };
 
 /// Nothing is wrong: sound, or repaired.
@@ -75,6 +79,7 @@ struct DiskRow {
     std::string activity = {};  ///< as of DiskStates
     double percent = 0;         ///< how far that is, from 0 to 100
     std::string note = {};
+    std::optional<QDateTime> nextCheck = {};
 };
 
 /// As the log names it, by its label, and with the file or the device that bears it.

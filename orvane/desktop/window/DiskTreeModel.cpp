@@ -176,6 +176,7 @@ DiskRow DiskTreeModel::rowOf(const DiskPointer& disk) const
     if (!row.activity.empty())
         row.percent = states_.percent();
     row.note = states_.note(*disk);
+    row.nextCheck = states_.nextCheck(*disk);
     if (const DiskPointer contents = disk->isOfflineDiskImage() ? contentsOf(*disk) : nullptr) {
         row.label = contents->facts().label;
         row.format = formatOf(*contents);

@@ -22,14 +22,18 @@ QString stateOf(const DiskRow& row, const QDateTime& now, const Translator& text
     const QString state = stateText(row, texts);
     if (!row.activity.empty())
         return capitalized(state);
+    const QString next = row.nextCheck ? nextCheckText(*row.nextCheck, now, texts) : QString();
+    const auto withNext = [&next](const QString& text) {
+        return next.isEmpty() ? text : text + separator + next;
+    };
     if (!row.lastCheck)
-        return toQt(texts.text("Never checked"));
+        return withNext(toQt(texts.text("Never checked")));
     const LastCheck& check = *row.lastCheck;
     QString text = capitalized(state) + separator + ageText(check.told.started, now, texts);
     if (check.later)
         text += separator + toQt(texts.sentence("then %@",
                                                 {fromQt(verdictText(*check.later, texts))}));
-    return text;
+    return withNext(text);
 }
 
 SelectionSummary summaryOfOne(const DiskRow& row, const QDateTime& now, const Translator& texts)
@@ -175,6 +179,19 @@ QString ageText(const QDateTime& then, const QDateTime& now, const Translator& t
         if (const auto count = static_cast<long>(age / unit.seconds); count > 0)
             return toQt(contract::format(texts.plural(unit.one, unit.many, count), {count}));
     return toQt(texts.text("just now"));
+}
+
+QString nextCheckText(const QDateTime& next, const QDateTime& now, const Translator& texts)
+{
+    const qint64 days = now.date().daysTo(next.date());
+    if (next < now)
+        return {};
+    if (days < 2)
+        return toQt(texts.text(days == 0 ? "next check today" : "next check tomorrow"));
+    const QLocale locale;
+    const QString day = days < 7 ? locale.standaloneDayName(next.date().dayOfWeek())
+                                 : locale.toString(next.date(), QLocale::ShortFormat);
+    return toQt(texts.sentence("next check on %@", {fromQt(day)}));
 }
 
 SelectionSummary summaryOf(const std::vector<DiskRow>& selected, const std::vector<DiskRow>& parts,

@@ -50,6 +50,10 @@ struct SelectionSummary {
 /// "3 minutes ago"; the date where that says more.
 [[nodiscard]] QString ageText(const QDateTime& then, const QDateTime& now, const Translator& texts);
 
+/// "next check on Sunday"; the date where it is further away; empty where it is past.
+[[nodiscard]] QString nextCheckText(const QDateTime& next, const QDateTime& now,
+                                    const Translator& texts);
+
 /// With a capital at the beginning, as a sentence has it.
 [[nodiscard]] QString capitalized(QString text);
 

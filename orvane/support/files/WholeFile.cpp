@@ -30,9 +30,10 @@ public:
     }
 
     /// 0, or the error number.
-    [[nodiscard]] int become(const std::filesystem::path& file, std::string_view contents)
+    [[nodiscard]] int become(const std::filesystem::path& file, std::string_view contents,
+                             mode_t mode)
     {
-        if (!descriptor_)
+        if (!descriptor_ || ::fchmod(descriptor_.get(), mode) != 0)
             return errno;
         if (const int error = writeAll(descriptor_.get(), contents))
             return error;
@@ -63,6 +64,17 @@ std::filesystem::path targetOf(const std::filesystem::path& file)
     std::error_code error;
     const std::filesystem::path target = std::filesystem::weakly_canonical(file, error);
     return error ? file : target;
+}
+
+Result<void, Failure> replace(const std::filesystem::path& named,
+                              const std::filesystem::path& target, std::string_view contents,
+                              mode_t mode)
+{
+    TemporaryFile temporary(target);
+    if (const int error = temporary.become(target, contents, mode))
+        return cannot("write", named.native(), error);
+    syncDirectory(target.has_parent_path() ? target.parent_path() : ".");
+    return {};
 }
 
 }  // namespace
@@ -110,12 +122,13 @@ Result<std::string, int> readWholeFile(const std::filesystem::path& file, std::s
 
 Result<void, Failure> replaceFile(const std::filesystem::path& file, std::string_view contents)
 {
-    const std::filesystem::path target = targetOf(file);
-    TemporaryFile temporary(target);
-    if (const int error = temporary.become(target, contents))
-        return cannot("write", file.native(), error);
-    syncDirectory(target.parent_path());
-    return {};
+    return replace(file, targetOf(file), contents, 0600);
+}
+
+Result<void, Failure> replacePublicFile(const std::filesystem::path& file,
+                                        std::string_view contents)
+{
+    return replace(file, file, contents, 0644);
 }
 
 Result<void, Failure> createPrivateDirectory(const std::filesystem::path& directory)

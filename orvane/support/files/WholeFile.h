@@ -31,6 +31,11 @@ namespace orvane {
 [[nodiscard]] Result<void, Failure> replaceFile(const std::filesystem::path& file,
                                                 std::string_view contents);
 
+/// The same for a file that everybody may read, in a directory that may be another user's: a
+/// symbolic link of this name is replaced, and leads nowhere.
+[[nodiscard]] Result<void, Failure> replacePublicFile(const std::filesystem::path& file,
+                                                      std::string_view contents);
+
 /// Makes the directory and its missing parents, each for the owner alone (mode 0700, as the XDG
 /// Base Directory Specification asks).
 [[nodiscard]] Result<void, Failure> createPrivateDirectory(const std::filesystem::path& directory);

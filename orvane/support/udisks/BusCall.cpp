@@ -17,8 +17,6 @@ namespace {
 using Clock = std::chrono::steady_clock;
 using std::chrono::milliseconds;
 
-constexpr const char* service = "org.freedesktop.UDisks2";
-
 /// Makes a thread's wish to stop something that poll(2) hears.
 class StopDescriptor {
 public:
@@ -87,7 +85,8 @@ BusCall::BusCall(sdbus::IConnection& connection, const BusMethod& method,
                  const Arguments& arguments, milliseconds timeout)
     : connection_(connection),
       proxy_(
-          sdbus::createProxy(connection, BusServiceName(service), sdbus::ObjectPath(method.object)))
+          sdbus::createProxy(connection, BusServiceName(method.service),
+                             sdbus::ObjectPath(method.object)))
 {
     sdbus::MethodCall call = callOf(*proxy_, method);
     arguments(call);

@@ -23,14 +23,15 @@ using BusServiceName = sdbus::ServiceName;
 using BusServiceName = std::string;
 #endif
 
-/// What is called: a method of UDisks2.
+/// What is called: a method of UDisks2, or of another service of the bus.
 struct BusMethod {
     std::string object;
     std::string interface;
     std::string name;
+    std::string service = "org.freedesktop.UDisks2";
 };
 
-/// One call of UDisks2 and the wait for its answer. One thread; the connection outlives it.
+/// One call of a service and the wait for its answer. One thread; the connection outlives it.
 class BusCall {
 public:
     using Arguments = std::function<void(sdbus::MethodCall& call)>;
@@ -42,8 +43,8 @@ public:
     BusCall& operator=(const BusCall&) = delete;
     ~BusCall() { pending_.cancel(); }
 
-    /// Waits until UDisks2 has answered, the call's time is over, `longest` has passed, or the
-    /// thread is asked to stop: the last two are Abandoned, and what UDisks2 does goes on. The
+    /// Waits until the service has answered, the call's time is over, `longest` has passed, or the
+    /// thread is asked to stop: the last two are Abandoned, and what the service does goes on. The
     /// answer borrows from the connection. Throws sdbus::Error when the bus goes away.
     [[nodiscard]] Result<sdbus::MethodReply, Refusal> wait(
         const std::stop_token& stop,
