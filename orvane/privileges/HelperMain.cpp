@@ -101,9 +101,9 @@ int run(const std::vector<std::string>& arguments)
     const auto noEnvironment = [](std::string_view) {
         return std::optional<std::string>();
     };
-    if (const auto bundles = findModuleBundles(moduleDirectories(noEnvironment, program));
-        !bundles.empty())
-        texts.setResultTexts(moduleTexts.emplace(bundles.front() / "locale"));
+    if (const auto bundle = findCheckingModule(moduleDirectories(noEnvironment, program));
+        !bundle.empty())
+        texts.setResultTexts(moduleTexts.emplace(bundle / "locale"));
     runHelperJob(*request, user, texts);
     return 0;
 }

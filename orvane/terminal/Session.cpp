@@ -186,12 +186,12 @@ void Session::expectPassword()
 
 Result<void, Failure> Session::loadModule()
 {
-    const auto bundles = findModuleBundles(
+    const auto bundle = findCheckingModule(
         moduleDirectories(environmentValue, runningExecutable(),
                           [this](const std::string& sentence) { trace(sentence); }));
-    if (bundles.empty())
+    if (bundle.empty())
         return cannot("find", "Fixwell.ovmodule", "no module directory holds it");
-    auto loaded = orvane::loadModule(bundles.front());
+    auto loaded = orvane::loadModule(bundle);
     if (!loaded)
         return loaded.error();
     loaded_ = *std::move(loaded);

@@ -106,5 +106,15 @@ TEST(ModuleSearch, WhereModulesAreLookedFor)
     EXPECT_EQ(directories, expected);
 }
 
+TEST(ModuleSearch, TheCheckingModuleIsNotTheFirstThereIs)
+{
+    const TestDirectory directory;
+    const std::vector<fs::path> directories{directory / "mine", directory / "system"};
+    fs::create_directories(directory / "mine/Another.ovmodule");
+    EXPECT_EQ(findCheckingModule(directories), fs::path());
+    fs::create_directories(directory / "system/Fixwell.ovmodule");
+    EXPECT_EQ(findCheckingModule(directories), directory / "system/Fixwell.ovmodule");
+}
+
 }  // namespace
 }  // namespace orvane

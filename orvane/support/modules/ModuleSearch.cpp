@@ -75,6 +75,13 @@ std::vector<fs::path> findModuleBundles(const std::vector<fs::path>& directories
     return bundles;
 }
 
+fs::path findCheckingModule(const std::vector<fs::path>& directories)
+{
+    const auto bundles = findModuleBundles(directories);
+    const auto found = std::ranges::find(bundles, "Fixwell.ovmodule", &fs::path::filename);
+    return found == bundles.end() ? fs::path() : *found;
+}
+
 fs::path hostBundleDirectory(const fs::path& executable)
 {
     return executable.parent_path().parent_path() / "share" / "orvane";

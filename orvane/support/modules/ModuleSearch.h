@@ -32,4 +32,9 @@ namespace orvane {
 [[nodiscard]] std::vector<std::filesystem::path> findModuleBundles(
     const std::vector<std::filesystem::path>& directories);
 
+/// The bundle of the module that checks disks, whatever other modules are installed; empty when it
+/// is not there.
+[[nodiscard]] std::filesystem::path findCheckingModule(
+    const std::vector<std::filesystem::path>& directories);
+
 }  // namespace orvane

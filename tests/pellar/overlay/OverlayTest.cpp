@@ -183,15 +183,22 @@ TEST(FullCopy, IsTheImageWithWhatWasWrittenToIt)
     EXPECT_TRUE(stopped || stopped.error() == ECANCELED);
 }
 
+constexpr const char* noNamespaces = "user namespaces are not to be had here";
+
+/// An ordinary user needs a user namespace; nobody makes one behind a chroot (user_namespaces(7)).
+bool canPresentAs(uid_t user)
+{
+    return user == 0 ||
+           orvane::test::statusOfChild([] { return ::unshare(CLONE_NEWUSER) == 0 ? 0 : 1; }) == 0;
+}
+
 TEST(OverlayFile, IsOpenedByNameAsAnyUser)
 {
     for (const uid_t user : {uid_t{0}, uid_t{65534}}) {
         if (::geteuid() != 0 && user != ::geteuid())
             continue;
-        // Nobody makes one behind a chroot (user_namespaces(7)).
-        if (user != 0 &&
-            orvane::test::statusOfChild([] { return ::unshare(CLONE_NEWUSER) == 0 ? 0 : 1; }) != 0)
-            GTEST_SKIP() << "user namespaces are not to be had here";
+        if (!canPresentAs(user))
+            GTEST_SKIP() << noNamespaces;
         const OverlayFixture disk;
         // As a program that this user has started: the files of its process are its own.
         EXPECT_EQ(orvane::test::statusOfChild([&] {
@@ -221,6 +228,8 @@ TEST(OverlayFile, IsOpenedByNameAsAnyUser)
 
 TEST(OverlayFile, LeavesOthersWithNothingAtItsEnd)
 {
+    if (!canPresentAs(::geteuid()))
+        GTEST_SKIP() << noNamespaces;
     const OverlayFixture disk;
     auto file = OverlayFile::present(*disk.overlay);
     ASSERT_TRUE(file) << file.error();
@@ -234,6 +243,8 @@ TEST(OverlayFile, LeavesOthersWithNothingAtItsEnd)
 
 TEST(OverlayFile, PassesOnWhatCannotBeReadAndNoMore)
 {
+    if (!canPresentAs(::geteuid()))
+        GTEST_SKIP() << noNamespaces;
     const OverlayFixture disk;
     std::filesystem::resize_file(disk.directory.path("disk"), region.offset + 102'400);
     const auto file = OverlayFile::present(*disk.overlay);
