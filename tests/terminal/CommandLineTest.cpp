@@ -12,7 +12,7 @@ namespace {
 pellar::Result<Request, Ending> readWords(std::vector<const char*> words)
 {
     words.insert(words.begin(), "fixwell");
-    return readCommandLine(static_cast<int>(words.size()), words.data());
+    return readCommandLine(static_cast<int>(words.size()), words.data(), {});
 }
 
 TEST(CommandLine, ARequestIsConfirmedOnDemandOnlyAndMayNameAFileLikeAnOption)
