@@ -3,6 +3,7 @@
 #include "orvane/support/texts/TextColumns.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/ManualCommands.h"
+#include "orvane/terminal/manual/ManPage.h"
 #include "orvane/terminal/manual/PlainText.h"
 #include "tests/terminal/ProgramTest.h"
 
@@ -115,6 +116,70 @@ TEST_F(ManualTest, NearestNamesComeFirstAndStrangersNotAtAll)
     EXPECT_EQ(nearest("ver", known), (std::vector<std::string>{"verify", "verify-permissions"}));
     EXPECT_EQ(nearest("xyz", known), std::vector<std::string>());
     EXPECT_EQ(nearest("", known), std::vector<std::string>());
+}
+
+TEST_F(ManualTest, WhatIsSaidIsNoRequestOfTheManualsFormatter)
+{
+    const auto body = [](const Block& block) {
+        const std::string page = manPage({"x", "1", "y", "z", "d"}, {"", {block}});
+        return page.substr(page.find("y\n") + 2);
+    };
+    using Look = Span::Look;
+    EXPECT_EQ(body({Block::Kind::Paragraph, {{Look::Plain, ".so /etc/passwd"}}}),
+              ".PP\n\\&.so /etc/passwd\n");
+    EXPECT_EQ(body({Block::Kind::Paragraph, {{Look::Plain, "a\\*b – “c” ä"}}}),
+              ".PP\na\\(rs*b \\(en \\(lqc\\(rq \\[u00E4]\n");
+    EXPECT_EQ(body({Block::Kind::Row, {{Look::Verbatim, "--a-b"}}, {{Look::Plain, "well-known -x"}}}),
+              ".TP\n\\fB\\-\\-a\\-b\\fR\nwell-known \\-x\n");
+    EXPECT_EQ(body({Block::Kind::Example, {{Look::Verbatim, "'a\n.b\n"}}}),
+              ".PP\n.RS 4\n.nf\n\\(aqa\n\\&.b\n.fi\n.RE\n");
+    for (const std::string& line :
+         test::linesOf(body({Block::Kind::Paragraph, {{Look::Plain, "a" + std::string(200, ' ') + ".b" + std::string(80, '.') + " .c"}}})))
+        EXPECT_FALSE(line.starts_with('.') && line != ".PP") << line;
+}
+
+TEST_F(ManualTest, MarkdownIsReadAsItIsMeant)
+{
+    const Document page = readMarkdown("# The `x`\n\nSome **strong** [words](y.md),\nand `a|b`.\n\n"
+                                       "| h | i |\n|---|---|\n| `k` | v \\| w |\n\n* one\n* two\n"
+                                       "\n## More\n\n```\nz  z\n```\n");
+    EXPECT_EQ(page.title, "The x");
+    EXPECT_EQ(plainText(page, {}),
+              "The x\n\nSome strong words, and a|b.\n\n  k  v | w\n\n • one\n • two\n\nMore\n    z  z\n");
+}
+
+TEST_F(ManualTest, EveryPageOfTheManualIsCompleteAndFormatsWithoutAWarning)
+{
+    struct Case {
+        std::string_view file;
+        std::vector<std::string_view> sections;
+    };
+    const bool hasFormatter = test::runTool({"groff", "--version"}).status == 0;
+    for (const Case& c :
+         {Case{"man1/fixwell.1", {"NAME", "SYNOPSIS", "DESCRIPTION", "COMMANDS", "OPTIONS", "EXAMPLES",
+                                  "EXIT STATUS", "ENVIRONMENT", "FILES", "SEE ALSO"}},
+          Case{"man1/orvane.1", {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
+                                 "ENVIRONMENT", "FILES", "SEE ALSO"}},
+          Case{"man5/fixwell-json.5", {"NAME", "DESCRIPTION", "SEE ALSO"}},
+          Case{"man8/pellar-helper.8", {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
+                                        "FILES", "SEE ALSO"}}}) {
+        const fs::path file = fs::path(MANUAL_PAGES) / c.file;
+        const std::string page = test::contentsOf(file);
+        std::size_t at = 0;
+        for (const std::string_view section : c.sections) {
+            const std::size_t found = page.find(".SH " + std::string(section) + "\n", at);
+            ASSERT_NE(found, std::string::npos) << c.file << ": " << section << ", in this order";
+            at = found;
+        }
+        EXPECT_EQ(std::count_if(page.begin(), page.end(), [](char byte) { return byte < 0; }), 0);
+        if (!hasFormatter)
+            continue;
+        const auto formatted = test::runTool({"groff", "-man", "-ww", "-Tascii", "-z", file});
+        EXPECT_EQ(formatted.status, 0) << c.file;
+        EXPECT_EQ(formatted.output, "") << c.file;
+    }
+    if (!hasFormatter)
+        GTEST_SKIP() << "the pages are complete; groff, which would format them, is not installed";
 }
 
 /// Everything that the command line says, in the words by which a translation is looked for.

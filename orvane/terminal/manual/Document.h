@@ -25,6 +25,7 @@ std::string wordsOf(const Spans& spans);
 struct Block {
     enum class Kind {
         Heading,
+        Subheading,
         Paragraph,
         Item,       ///< of a list; `mark` is its bullet or its number
         Term,       ///< a line that the definition below it explains

@@ -39,7 +39,7 @@ private:
     /// Rows, items, and a term and what it means, follow each other closely.
     static bool isApart(Kind before, Kind after)
     {
-        return before != Kind::Heading && !(before == after && (after == Kind::Row || after == Kind::Item)) &&
+        return before != Kind::Heading && before != Kind::Subheading && !(before == after && (after == Kind::Row || after == Kind::Item)) &&
                !(before == Kind::Term && after == Kind::Definition);
     }
 
@@ -55,7 +55,8 @@ private:
     void add(const Block& block)
     {
         switch (block.kind) {
-            case Kind::Heading: write(inBold(block.text), 0); break;
+            case Kind::Heading:
+            case Kind::Subheading: write(inBold(block.text), 0); break;
             case Kind::Paragraph: write(block.text, 0); break;
             case Kind::Item:
                 text_ += " " + block.mark + " ";
