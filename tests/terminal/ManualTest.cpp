@@ -200,6 +200,17 @@ TEST_F(VersionTest, TheProgramAndEveryToolAreTold)
         EXPECT_EQ(line.find("not installed"), std::string::npos) << "in German";
 }
 
+TEST_F(VersionTest, AToolThatIsMissingIsToldWithItsPackage)
+{
+    testing::internal::CaptureStdout();
+    EXPECT_EQ(runVersion("/no/such/place", {}, {}), 0);
+    const auto lines = test::linesOf(testing::internal::GetCapturedStdout());
+    ASSERT_EQ(lines.size(), 8U);
+    for (std::size_t i = 1; i < lines.size(); ++i)
+        EXPECT_NE(lines[i].find("not installed: package "), std::string::npos) << lines[i];
+    EXPECT_TRUE(lines[1].ends_with("e2fsprogs")) << lines[1];
+}
+
 /// Everything that the command line says, in the words by which a translation is looked for.
 std::set<std::string> wordsOfTheCommandLine()
 {
