@@ -5,12 +5,10 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/support/texts/Quantities.h"
+#include "orvane/terminal/TerminalLook.h"
 #include "orvane/terminal/TerminalText.h"
 
 #include <fmt/format.h>
-
-#include <sys/ioctl.h>
-#include <unistd.h>
 
 #include <chrono>
 #include <cstdio>
@@ -33,14 +31,6 @@ contract::StyledText coloured(const contract::StyledText& text)
     contract::TextStyle style = text.style();
     style.color = contract::Color{1, 0, 0, 1};
     return contract::StyledText::make(text.characters(), style);
-}
-
-std::size_t terminalColumns()
-{
-    winsize size{};
-    if (::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 1)
-        return size.ws_col - 1U;  // the last column stays free: some terminals wrap there
-    return 79;
 }
 
 /// Speaks to people: rows as they come, and on a terminal one live line at the bottom.
@@ -132,7 +122,7 @@ public:
             facts += "  " + disk.format;
         if (!disk.mountPoint.empty())
             facts += "  " + sentence("mounted at %@", {disk.mountPoint});
-        const std::string name = disk.name.empty() ? "" : "  “" + disk.name + "”";
+        const std::string name = disk.name.empty() ? "" : "  " + sentence("“%@”", {disk.name});
         write(indent + bold(disk.disk) + contract::printable(name + "  " + facts) + "\n");
         const auto below = [&](const std::string& text) {
             write(indent + "    " + text + "\n");
