@@ -129,6 +129,12 @@ TEST(ResultSummaryOfSeveral, CountsThemAndNamesThoseThatAreNotSound)
     EXPECT_EQ(summary.disks[0].identifier, "/dev/b");
     EXPECT_EQ(summary.disks[1].identifier, "/dev/d");
     EXPECT_EQ(resultOfSeveral({row("c")}, Translator()).title, "");
+    DiskRow twin = checked("b", "damaged");
+    twin.label = "b";
+    twin.facts.path = "/images/other.img";
+    EXPECT_EQ(resultOfSeveral({checked("b", "damaged"), twin}, Translator()).disks[1].name,
+              "b (other.img)")
+        << "one name for two disks";
 }
 
 TEST(SelectionSummaryText, SaysHowItIsAndHowFull)

@@ -234,7 +234,9 @@ ResultSummary resultOfSeveral(const std::vector<DiskRow>& disks, const Translato
 {
     ResultSummary summary;
     std::vector<DiskRow> checked;
-    for (const DiskRow& disk : disks) {
+    const QStringList names = distinctNames(disks);
+    for (std::size_t i = 0; i < disks.size(); ++i) {
+        const DiskRow& disk = disks[i];
         if (!disk.activity.empty())
             return {};
         if (!disk.lastCheck)
@@ -244,7 +246,7 @@ ResultSummary resultOfSeveral(const std::vector<DiskRow>& disks, const Translato
         const Tone tone = check.isPartial ? Tone::Neutral : toneOf(endingOf(check.told));
         summary.tone = worse(summary.tone, tone);
         if (tone == Tone::Bad || tone == Tone::Caution)
-            summary.disks.push_back({fromQt(namesOf(disk).name), disk.facts.identifier});
+            summary.disks.push_back({fromQt(names[static_cast<qsizetype>(i)]), disk.facts.identifier});
     }
     if (checked.empty())
         return {};

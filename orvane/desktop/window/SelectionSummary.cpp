@@ -5,8 +5,10 @@
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QHash>
 #include <QLocale>
 
+#include <algorithm>
 #include <array>
 #include <numeric>
 
@@ -94,10 +96,7 @@ SelectionSummary summaryOfSeveral(const std::vector<DiskRow>& rows, const Transl
     QStringList facts;
     if (bytes != 0)
         facts += toQt(texts.sentence("%@ in all", {fromQt(sizeText(bytes))}));
-    QStringList names;
-    for (const DiskRow& row : rows)
-        names += namesOf(row).name;
-    facts += names.join(QStringLiteral(", "));
+    facts += distinctNames(rows).join(QStringLiteral(", "));
     summary.facts = facts.join(separator);
     summary.state = countsOf(rows, texts);
     if (std::ranges::any_of(rows, [](const DiskRow& row) { return row.facts.hasSMARTError; }))
@@ -106,6 +105,17 @@ SelectionSummary summaryOfSeveral(const std::vector<DiskRow>& rows, const Transl
 }
 
 }  // namespace
+
+QStringList distinctNames(const std::vector<DiskRow>& rows)
+{
+    QHash<QString, int> counts;
+    for (const DiskRow& row : rows)
+        ++counts[namesOf(row).name];
+    QStringList names;
+    for (const DiskRow& row : rows)
+        names += counts[namesOf(row).name] > 1 ? nameText(row) : namesOf(row).name;
+    return names;
+}
 
 QString countsOf(const std::vector<DiskRow>& rows, const Translator& texts)
 {
