@@ -135,16 +135,18 @@ std::unique_ptr<Pager> Pager::start(std::vector<std::string> command)
     failure->writeEnd.reset();
     if (id < 0 || !hasStarted(id, failure->readEnd))
         return nullptr;
-    return std::unique_ptr<Pager>(new Pager(id, pages->writeEnd.get()));
+    return std::unique_ptr<Pager>(new Pager(id, std::move(pages->writeEnd)));
 }
 
-Pager::Pager(pid_t id, int input)
+Pager::Pager(pid_t id, FileDescriptor input)
 {
     runningPager = id;
     std::signal(SIGPIPE, SIG_IGN);
     if (::isatty(STDERR_FILENO) == 1)
-        errorsBefore = takePlaceOf(STDERR_FILENO, input);
-    outputBefore = takePlaceOf(STDOUT_FILENO, input);
+        errorsBefore = takePlaceOf(STDERR_FILENO, input.get());
+    outputBefore = takePlaceOf(STDOUT_FILENO, input.get());
+    // Whoever waits for the pager must not hold what it reads from open.
+    input.reset();
     for (const int signal : endingSignals)
         handle(signal, waitAndEnd);
 }

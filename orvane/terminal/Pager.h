@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "pellar/process/FileDescriptor.h"
+
 #include <sys/types.h>
 
 #include <memory>
@@ -29,7 +31,7 @@ public:
     ~Pager();
 
 private:
-    Pager(pid_t id, int input);
+    Pager(pid_t id, pellar::FileDescriptor input);
 };
 
 }  // namespace orvane
