@@ -82,6 +82,10 @@ void settle()
 
 int run(const std::vector<std::string>& arguments)
 {
+    if (arguments == std::vector<std::string>{"--version"}) {
+        std::printf("pellar-helper %s\n", std::string(programVersion()).c_str());
+        return 0;
+    }
     const auto user = userWhoAsked();
     settle();
     const auto request = readHelperArguments(arguments, isBlockDevice);

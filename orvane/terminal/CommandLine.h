@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #pragma once
 
+#include "orvane/terminal/manual/CommandTree.h"
 #include "pellar/jobs/JobOptions.h"
 #include "pellar/outcome/Result.h"
 
@@ -36,7 +37,9 @@ enum class Command {
     Unmount,
     Eject,
     Attach,
-    Detach
+    Detach,
+    Help,
+    Version
 };
 
 enum class Coloring { Auto, Always, Never };
@@ -45,6 +48,8 @@ enum class Coloring { Auto, Always, Never };
 struct Request {
     Command command = Command::List;
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
+    std::string topic;               ///< of the help; empty: what topics there are
+    bool wantsUsage = false;         ///< instead: the command line as a whole (--help)
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool isHTML = false;               ///< a report
@@ -58,18 +63,24 @@ struct Request {
     bool confirms = false;  ///< answers the startup-disk warning
     Coloring coloring = Coloring::Auto;
     bool showsProgress = true;
+    bool usesPager = true;  ///< where the output is long and goes to a terminal
     int logLevel = 0;  ///< developers' lines up to this level go to standard error
     bool tracesCommands = false;
 };
 
-/// Help was asked for, or the arguments are wrong; the program ends with this.
+/// The arguments are wrong; the program ends with this.
 struct Ending {
     int status;
-    std::string text;  ///< for standard output when the status is 0, else for standard error
+    std::string text;  ///< for standard error
 };
 
-/// A relative path is taken from the current directory.
-[[nodiscard]] pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* argv);
+/// A relative path is taken from the current directory. What is wrong is said in the language of
+/// the texts, and names the option or the argument.
+[[nodiscard]] pellar::Result<Request, Ending> readCommandLine(int argc, const char* const* argv,
+                                                              const Translator& texts);
+
+/// What can be said on the command line.
+[[nodiscard]] manual::CommandTree commandTree(const Translator& texts);
 
 /// As the user writes it.
 std::string_view nameOf(Command command);

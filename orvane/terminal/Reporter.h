@@ -111,15 +111,15 @@ public:
                       const std::string& sentence) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
-    /// The last call. NO, with a sentence on standard error, when some of the output could not be
-    /// written.
-    virtual bool end();
+    /// The last call. NO when some of the output could not be written.
+    [[nodiscard]] virtual bool end();
+
+    /// "fixwell: SENTENCE" on standard error, made printable.
+    static void writeError(const std::string& sentence);
 
 protected:
     /// Hands what is buffered to the system, after every burst: a reader sees it at once.
     void flush();
-    /// "fixwell: SENTENCE" on standard error, made printable.
-    static void writeError(const std::string& sentence);
 
 private:
     bool hasLostOutput_ = false;

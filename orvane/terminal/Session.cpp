@@ -35,7 +35,7 @@ Session::Session(const Request& request, Reporter& reporter)
           },
           [this] { host_.histories().saveNew(); }, [this] { reporter_.rowsWritten(); }),
       interface_(logView_),
-      alerts_(loop_, reporter, answerFor(request)),
+      alerts_(loop_, reporter, hostTexts_, answerFor(request)),
       hostTexts_(hostBundleDirectory(runningExecutable()) / "locale"),
       libraryTexts_(hostTexts_),
       library_(loop_, libraryTexts_, libraryOptions(request)),
@@ -173,14 +173,15 @@ Result<void, Failure> Session::loadModule()
         moduleDirectories(environmentValue, runningExecutable(),
                           [this](const std::string& sentence) { trace(sentence); }));
     if (bundle.empty())
-        return cannot("find", "Fixwell.ovmodule", "no module directory holds it");
+        return Failure{texts().text("cannot find ‘Fixwell.ovmodule’: no module directory holds it")};
     auto loaded = orvane::loadModule(bundle);
     if (!loaded)
         return loaded.error();
     loaded_ = *std::move(loaded);
     libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
     if (!shouldRun(loaded_, host_))
-        return cannot("use", "Fixwell", "it is switched off in the settings (OVModule_FXW)");
+        return Failure{texts().text("cannot use ‘Fixwell’: it is switched off in the settings "
+                                    "(OVModule_FXW)")};
     auto made = makeModule(loaded_, host_, *this);
     if (!made)
         return made.error();

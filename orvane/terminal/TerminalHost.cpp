@@ -3,10 +3,30 @@
 
 #include "contract/foundation/UTF8.h"
 
+#include <algorithm>
+#include <cctype>
 #include <cstdio>
 #include <iostream>
 
 namespace orvane {
+namespace {
+
+constexpr const char* table = "Orvane";
+
+/// The word, or its first letter; capitals do not matter where they are Latin.
+bool confirms(std::string_view answer, std::string_view yes)
+{
+    const auto isLike = [](std::string_view one, std::string_view other) {
+        return std::ranges::equal(one, other, [](unsigned char a, unsigned char b) {
+            return std::tolower(a) == std::tolower(b);
+        });
+    };
+    std::string_view rest = yes;
+    contract::takeCharacter(rest);
+    return isLike(answer, yes) || isLike(answer, yes.substr(0, yes.size() - rest.size()));
+}
+
+}  // namespace
 
 class TerminalAlerts::Question final : public contract::Alert,
                                        public std::enable_shared_from_this<Question> {
@@ -37,11 +57,12 @@ private:
         if (alerts_.answer_ != Answer::Ask)
             return alerts_.answer_ == Answer::Confirm;
         alerts_.reporter_.alert(text_.message, text_.informative);
-        std::printf("%s [y/N] ", contract::printable(text_.defaultButton).c_str());
+        std::printf("%s %s ", contract::printable(text_.defaultButton).c_str(),
+                    alerts_.texts_.translate(table, "[y/N]").c_str());
         std::fflush(stdout);
         std::string answer;
         std::getline(std::cin, answer);
-        return answer == "y" || answer == "Y" || answer == "yes";
+        return confirms(answer, "Yes") || confirms(answer, alerts_.texts_.translate(table, "Yes"));
     }
 
     TerminalAlerts& alerts_;

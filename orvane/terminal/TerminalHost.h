@@ -13,14 +13,15 @@
 namespace orvane {
 
 /// Alerts as text. A question is answered by --yes, or asked on the terminal, where only the word
-/// for yes confirms; without a terminal it is answered with the button that Return stands for.
+/// for yes, or its first letter, confirms, in English or in the user's language; without a terminal it is answered with the button that Return stands for.
 class TerminalAlerts final : public contract::Alerts {
 public:
     enum class Answer { Confirm, Ask, Decline };
 
-    /// Both outlive this object.
-    TerminalAlerts(contract::RunLoop& loop, Reporter& reporter, Answer answer)
-        : loop_(loop), reporter_(reporter), answer_(answer)
+    /// All outlive this object; the texts are asked when a question is.
+    TerminalAlerts(contract::RunLoop& loop, Reporter& reporter, const Catalogue& texts,
+                   Answer answer)
+        : loop_(loop), reporter_(reporter), texts_(texts), answer_(answer)
     {
     }
 
@@ -38,6 +39,7 @@ private:
 
     contract::RunLoop& loop_;
     Reporter& reporter_;
+    const Catalogue& texts_;
     Answer answer_;
     bool isAsking_ = false;
     bool wasDeclined_ = false;

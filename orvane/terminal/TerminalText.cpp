@@ -8,7 +8,6 @@
 #include <algorithm>
 #include <array>
 #include <ctime>
-#include <cwchar>
 
 namespace orvane {
 namespace {
@@ -25,12 +24,6 @@ std::string lookOf(const contract::TextStyle& style)
     else if (style.color && style.color->green > style.color->red)
         look += "\x1b[32m";
     return look;
-}
-
-std::size_t columnsOf(char32_t character)
-{
-    const int columns = ::wcwidth(static_cast<wchar_t>(character));
-    return columns < 0 ? 1 : static_cast<std::size_t>(columns);
 }
 
 /// The look is given up before each line end, so that no colour runs into what follows.
@@ -117,20 +110,6 @@ std::string shellWord(std::string_view text)
     for (const char character : shown)
         word += character == '\'' ? std::string("'\\''") : std::string(1, character);
     return word + "'";
-}
-
-std::string fittedTo(std::string_view text, std::size_t columns)
-{
-    std::string fitted;
-    while (!text.empty()) {
-        const char32_t character = contract::takeCharacter(text);
-        const std::size_t width = columnsOf(character);
-        if (width > columns)
-            break;
-        columns -= width;
-        contract::appendUTF8(fitted, character);
-    }
-    return fitted;
 }
 
 std::string progressLine(const JobProgress& progress, std::size_t columns)

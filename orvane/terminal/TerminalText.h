@@ -2,6 +2,7 @@
 #pragma once
 
 #include "contract/foundation/StyledText.h"
+#include "orvane/support/texts/TextColumns.h"
 
 #include <chrono>
 #include <cstdint>
@@ -21,9 +22,6 @@ std::string terminalText(const contract::StyledText& text, bool colors);
 /// One word of a POSIX shell's command line that stands for the text, quoted where it has to be, and
 /// fit to be shown: one with control characters cannot be copied from there, but does no harm.
 std::string shellWord(std::string_view text);
-
-/// As much of `text`, which must be printable, as fits into `columns` columns.
-std::string fittedTo(std::string_view text, std::size_t columns);
 
 /// How far a job is, as the bottom line of a terminal shows it.
 struct JobProgress {

@@ -5,12 +5,10 @@
 #include "contract/foundation/UTF8.h"
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/support/texts/Quantities.h"
+#include "orvane/terminal/TerminalLook.h"
 #include "orvane/terminal/TerminalText.h"
 
 #include <fmt/format.h>
-
-#include <sys/ioctl.h>
-#include <unistd.h>
 
 #include <chrono>
 #include <cstdio>
@@ -25,14 +23,6 @@ bool isStartOfRun(const contract::Dictionary& record)
 {
     return record.integer(contract::kFsckVerbosity) < 0 &&
            !record.has(contract::kFsckMessageType) && record.has(contract::kFsckMessageString);
-}
-
-std::size_t terminalColumns()
-{
-    winsize size{};
-    if (::ioctl(STDOUT_FILENO, TIOCGWINSZ, &size) == 0 && size.ws_col > 1)
-        return size.ws_col - 1U;  // the last column stays free: some terminals wrap there
-    return 79;
 }
 
 /// Speaks to people: rows as they come, and on a terminal one live line at the bottom.

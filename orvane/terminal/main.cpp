@@ -1,14 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "orvane/jobs/LibraryTexts.h"
+#include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/ProgramStart.h"
 #include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
 #include "orvane/terminal/Commands.h"
-
-#include <unistd.h>
+#include "orvane/terminal/ManualCommands.h"
+#include "orvane/terminal/Pager.h"
 
 #include <cstdio>
-#include <cstdlib>
 #include <exception>
 #include <memory>
 #include <utility>
@@ -16,34 +17,36 @@
 namespace orvane {
 namespace {
 
-bool isTerminal()
+Translator translatorOf(const Catalogue& texts)
 {
-    const char* const type = std::getenv("TERM");
-    return ::isatty(STDOUT_FILENO) == 1 && type != nullptr && std::string_view(type) != "dumb";
+    Translator translator;
+    translator.text = [&texts](std::string_view key) {
+        return texts.translate("Orvane", key);
+    };
+    translator.plural = [&texts](std::string_view one, std::string_view many, long count) {
+        return texts.translatePlural("Orvane", one, many, count);
+    };
+    return translator;
 }
 
-/// NO_COLOR is the informal standard for "no colours, please".
-bool wantsColors(const Request& request)
-{
-    if (request.coloring != Coloring::Auto)
-        return request.coloring == Coloring::Always;
-    const char* const noColor = std::getenv("NO_COLOR");
-    return isTerminal() && (noColor == nullptr || *noColor == '\0');
-}
-
-std::unique_ptr<Reporter> makeReporter(const Request& request)
+std::unique_ptr<Reporter> makeReporter(const Request& request, const Translator& texts,
+                                       const TerminalLook& look, bool isPaged)
 {
     if (request.isJSON)
         return makeJSONReporter();
     TextReporterOptions options;
-    options.translate =
-        [texts = std::make_shared<Catalogue>(hostBundleDirectory(runningExecutable()) / "locale")](
-            std::string_view key) {
-            return texts->translate("Orvane", key);
-        };
-    options.colors = wantsColors(request);
-    options.showsProgress = request.showsProgress && isTerminal();
+    options.translate = texts.text;
+    options.colors = look.colors;
+    options.showsProgress = request.showsProgress && look.isTerminal && !isPaged;
     return makeTextReporter(std::move(options));
+}
+
+/// What there may be much of to read.
+bool isToBePaged(const Request& request, const TerminalLook& look)
+{
+    return look.isTerminal && request.usesPager && !request.isJSON &&
+           (request.command == Command::Help || request.command == Command::Report ||
+            (request.command == Command::History && !request.clearsHistory));
 }
 
 int carryOut(const Request& request, Session& session, Reporter& reporter)
@@ -70,23 +73,50 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
     }
 }
 
+int runWithSession(const Request& request, const Translator& texts, const TerminalLook& look,
+                   bool isPaged)
+{
+    const std::unique_ptr<Reporter> reporter = makeReporter(request, texts, look, isPaged);
+    int status = 0;
+    {
+        Session session(request, *reporter);
+        status = carryOut(request, session, *reporter);
+    }
+    if (reporter->end())
+        return status;
+    Reporter::writeError(texts.text("not all of the output could be written"));
+    return status | exitUnchecked;
+}
+
+int runRequest(const Request& request, const std::filesystem::path& bundle,
+               const Catalogue& catalogue)
+{
+    const Translator texts = translatorOf(catalogue);
+    const TerminalLook look = lookOf(request);
+    const auto pager = isToBePaged(request, look)
+                           ? Pager::start(pagerCommand(environmentValue("PAGER")))
+                           : nullptr;
+    switch (request.command) {
+        case Command::Help: return runHelp(request, bundle / "help", texts, look);
+        case Command::Version: 
+            return runVersion(
+                libraryOptions(userXDGPaths(), LibraryTexts(catalogue)).toolPath, texts, look);
+        default: return runWithSession(request, texts, look, pager != nullptr);
+    }
+}
+
 int run(int argc, const char* const* argv)
 {
     setInheritanceRight();
     adoptUserLocale();
-    const auto request = readCommandLine(argc, argv);
+    const std::filesystem::path bundle = hostBundleDirectory(runningExecutable());
+    const Catalogue catalogue(bundle / "locale");
+    const auto request = readCommandLine(argc, argv, translatorOf(catalogue));
     if (!request) {
-        const Ending& ending = request.error();
-        std::fputs(ending.text.c_str(), ending.status == exitSound ? stdout : stderr);
-        return ending.status;
+        std::fputs(request.error().text.c_str(), stderr);
+        return request.error().status;
     }
-    const std::unique_ptr<Reporter> reporter = makeReporter(*request);
-    int status = 0;
-    {
-        Session session(*request, *reporter);
-        status = carryOut(*request, session, *reporter);
-    }
-    return reporter->end() ? status : status | exitUnchecked;
+    return runRequest(*request, bundle, catalogue);
 }
 
 }  // namespace

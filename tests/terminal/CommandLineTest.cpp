@@ -12,7 +12,7 @@ namespace {
 pellar::Result<Request, Ending> readWords(std::vector<const char*> words)
 {
     words.insert(words.begin(), "fixwell");
-    return readCommandLine(static_cast<int>(words.size()), words.data());
+    return readCommandLine(static_cast<int>(words.size()), words.data(), {});
 }
 
 TEST(CommandLine, ARequestIsConfirmedOnDemandOnlyAndMayNameAFileLikeAnOption)
@@ -27,32 +27,47 @@ TEST(CommandLine, ARequestIsConfirmedOnDemandOnlyAndMayNameAFileLikeAnOption)
     EXPECT_EQ(confirmed->disks, (std::vector<std::string>{"a", "LABEL=x y"}));
 }
 
-TEST(CommandLine, WhatIsNotUnderstoodIsWrongUsageAndNotObeyed)
+TEST(CommandLine, WhatIsNotUnderstoodIsNamedAndNotObeyed)
 {
     struct Case {
         std::vector<const char*> words;
+        std::string_view names;
         std::string_view because;
     };
     for (const Case& c :
-         {Case{{}, "no command"}, Case{{"check", "a"}, "no such command"},
-          Case{{"verify"}, "what?"}, Case{{"history", "--clear"}, "whose?"},
-          Case{{"verify", "--clear", "a"}, "only a history is cleared"}, Case{{"attach"}, "what?"},
-          Case{{"mount", "--read-only", "a"}, "only an image is attached so"},
-          Case{{"verify", "--color=pink", "a"}, "no such choice"},
-          Case{{"verify", "--log-level=loud", "a"}, "no number"},
-          Case{{"verify", "--log-level=9", "a"}, "out of range"},
-          Case{{"verify", "--preview", "a"}, "writes nothing anyway"},
-          Case{{"repair", "--preview", "--direct", "a"}, "both writing and not"},
-          Case{{"repair", "--preview", "--apply-unproven", "a"}, "nothing is applied"},
-          Case{{"repair", "--preview", "--no-undo", "a"}, "nothing is to be undone"},
-          Case{{"repair", "--keep", "f", "a"}, "only a preview's is kept"},
-          Case{{"repair", "--preview", "--keep", "f", "a", "b"}, "one file, two volumes"},
-          Case{{"undo", "--preview", "a"}, "of repairs"}, Case{{"finish"}, "what?"},
-          Case{{"verify", "--f\x1b[2Jast", "a"}, "an option with escapes"},
-          Case{{"\x1b]0;title\x07"}, "a command with escapes"}}) {
+         {Case{{}, "command", "no command"}, Case{{"check", "a"}, "“check”", "no such command"},
+          Case{{"verfy", "a"}, "mean “verify”", "nearly one"},
+          Case{{"verify"}, "DISK", "what?"}, Case{{"history", "--clear"}, "DISK", "whose?"},
+          Case{{"verify", "--clear", "a"}, "“verify” has no option “--clear”", "only a history is cleared"},
+          Case{{"verify", "--claer=x"}, "“--claer”", "before what is missing"},
+          Case{{"--clear"}, "“--clear”", "of no command"},
+          Case{{"verify", "--detials", "a"}, "mean “--details”", "nearly one"},
+          Case{{"attach"}, "IMAGE", "what?"}, Case{{"help", "a", "b"}, "“b”", "one at a time"},
+          Case{{"mount", "--read-only", "a"}, "“--read-only”", "only an image is attached so"},
+          Case{{"verify", "--color=--trace", "a"}, "“--color” cannot be “--trace”; it is one of: auto",
+               "no such choice"},
+          Case{{"verify", "a", "--color"}, "“--color”", "none at all"},
+          Case{{"verify", "--json=x", "a"}, "“--json”", "not to be chosen"},
+          Case{{"verify", "--log-level=loud", "a"}, "“--log-level”", "no number"},
+          Case{{"verify", "--log-level=9", "a"}, "“--log-level”", "out of range"},
+          Case{{"verify", "--preview", "a"}, "“--preview”", "writes nothing anyway"},
+          Case{{"repair", "--preview", "--direct", "a"}, "“--preview” and “--direct”",
+               "both writing and not"},
+          Case{{"repair", "--preview", "--apply-unproven", "a"}, "“--apply-unproven”",
+               "nothing is applied"},
+          Case{{"repair", "--preview", "--no-undo", "a"}, "“--no-undo”", "nothing is to be undone"},
+          Case{{"repair", "--keep", "f", "a"}, "“--keep” goes with “--preview”", "only a preview's is kept"},
+          Case{{"repair", "--preview", "--keep", "f", "a", "b"}, "--keep", "one file, two volumes"},
+          Case{{"report", "--json", "a"}, "report --json", "for people"},
+          Case{{"undo", "--preview", "a"}, "“--preview”", "of repairs"},
+          Case{{"finish"}, "DISK", "what?"},
+          Case{{"verify", "--f\x1b[2Jast", "a"}, "--f", "an option with escapes"},
+          Case{{"\x1b]0;title\x07"}, "title", "a command with escapes"}}) {
         const auto read = readWords(c.words);
         ASSERT_FALSE(read) << c.because;
         EXPECT_EQ(read.error().status, 16) << c.because;
+        EXPECT_NE(read.error().text.find(c.names), std::string::npos) << read.error().text;
+        EXPECT_EQ(test::linesOf(read.error().text).size(), 2U) << read.error().text;
         EXPECT_FALSE(test::holdsControls(read.error().text)) << c.because;
     }
 }

@@ -7,33 +7,6 @@
 #include <utility>
 
 namespace orvane {
-namespace {
-
-/// Also those that a language falls back to: "de_AT@euro" is read as "de_AT" and as "de".
-std::vector<std::string> folderNames(std::string_view languages)
-{
-    std::vector<std::string> names;
-    while (!languages.empty()) {
-        std::string_view language = languages.substr(0, languages.find(':'));
-        languages.remove_prefix(std::min(language.size() + 1, languages.size()));
-        language = language.substr(0, language.find('.'));
-        // The texts in the programs are English.
-        if (language == "C" || language == "POSIX" || language == "en" ||
-            language.starts_with("en_"))
-            break;
-        for (const char* const end : {"", "@", "_"}) {
-            const std::string_view name =
-                *end == '\0' ? language : language.substr(0, language.find(*end));
-            if (!name.empty() && name.find('/') == std::string_view::npos &&
-                (names.empty() || names.back() != name))
-                names.emplace_back(name);
-        }
-    }
-    return names;
-}
-
-}  // namespace
-
 Catalogue::Catalogue(std::filesystem::path directory) : directory_(std::move(directory)) {}
 
 const Catalogue::Files& Catalogue::filesOf(std::string_view table) const
@@ -44,7 +17,7 @@ const Catalogue::Files& Catalogue::filesOf(std::string_view table) const
     if (const auto found = files_.find(table); found != files_.end())
         return found->second;
     Files files;
-    std::vector<std::string> languages = folderNames(currentLanguages());
+    std::vector<std::string> languages = languageFolders(currentLanguages());
     languages.emplace_back("en");
     if (!table.empty() && table.find('/') == std::string_view::npos)
         for (const std::string& language : languages)

@@ -77,6 +77,28 @@ std::string currentLanguage()
     return first == "C" ? std::string() : first.substr(0, first.find_first_of(".@"));
 }
 
+std::vector<std::string> languageFolders(std::string_view languages)
+{
+    std::vector<std::string> names;
+    while (!languages.empty()) {
+        std::string_view language = languages.substr(0, languages.find(':'));
+        languages.remove_prefix(std::min(language.size() + 1, languages.size()));
+        language = language.substr(0, language.find('.'));
+        // The texts in the programs are English.
+        if (language == "C" || language == "POSIX" || language == "en" ||
+            language.starts_with("en_"))
+            break;
+        for (const char* const end : {"", "@", "_"}) {
+            const std::string_view name =
+                *end == '\0' ? language : language.substr(0, language.find(*end));
+            if (!name.empty() && name.find('/') == std::string_view::npos &&
+                (names.empty() || names.back() != name))
+                names.emplace_back(name);
+        }
+    }
+    return names;
+}
+
 std::uint64_t languageRevision()
 {
     return revision;

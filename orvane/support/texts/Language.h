@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace orvane {
 
@@ -30,6 +31,11 @@ void setLanguage(const std::string& languages);
 
 /// The first of them, without its character set ("de_DE"); empty for English.
 [[nodiscard]] std::string currentLanguage();
+
+/// The folders in which texts for these languages lie, the best first, with those that each falls
+/// back to: "de_AT@euro" is read as "de_AT" and as "de". English, in which the programs' own texts
+/// are, and what comes after it are left out.
+[[nodiscard]] std::vector<std::string> languageFolders(std::string_view languages);
 
 /// Another number after every setLanguage. Any thread.
 [[nodiscard]] std::uint64_t languageRevision();
