@@ -22,6 +22,8 @@ inline const Name kFsckRepair{"REPAIR"};      ///< a step of a repair
 inline const Name kFsckError{"ERROR"};        ///< a problem that was found
 inline const Name kFsckSuccess{"SUCCESS"};    ///< a good result
 inline const Name kFsckFail{"FAIL"};          ///< a failed operation, or a warning
+/// A line of a tool that tells of a problem. Drawn as plain text: what it comes to is told as an ERROR.
+inline const Name kFsckProblem{"PROBLEM"};
 inline const Name kFsckProgress{"PROGRESS"};  ///< the first parameter is the percentage done
 
 /// How much a record matters. A missing number reads as `main`.
@@ -47,6 +49,9 @@ inline const Name kPLTool{"kPLTool"};
 /// second also where only the least is known.
 inline const Name kPLProblems{"kPLProblems"};
 inline const Name kPLProblemKinds{"kPLProblemKinds"};
+
+/// The result holds, but something was lost or moved for it; the message says what. Absent otherwise.
+inline const Name kPLHasLosses{"kPLHasLosses"};
 
 inline const Name kPLVerdictSound{"sound"};
 inline const Name kPLVerdictDamaged{"damaged"};            ///< damage is left

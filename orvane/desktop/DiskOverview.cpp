@@ -72,8 +72,10 @@ void DiskOverview::showSelection()
 // While a job runs, the status line tells how it goes.
 ResultSummary DiskOverview::result(const std::vector<DiskRow>& rows)
 {
-    if (rows.empty() || at_.controller.interfaceLock())
+    if (at_.controller.interfaceLock())
         return {};
+    if (rows.empty())
+        return resultOfClosing(disks_.closedImages(), at_.host.translator());
     if (rows.size() > 1)
         return resultOfSeveral(rows, at_.host.translator());
     // Of a whole disk whose volumes were checked, they are the result.
@@ -109,6 +111,7 @@ void DiskOverview::take(NextStep step)
         case NextStep::RepairDirectly: choices_.confirmDirect(); break;
         case NextStep::ShowProblems: showProblems(); break;
         case NextStep::CopyDisk: explainCopying(); break;
+        case NextStep::Reopen: disks_.open(disks_.closedImages()); break;
     }
 }
 

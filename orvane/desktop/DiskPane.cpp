@@ -44,7 +44,7 @@ Check checkOf(const Run& run)
     const RunEnd end = run.end.value_or(RunEnd{});
     return {run.verdict(), end.message,   QDateTime::fromMSecsSinceEpoch(started.count()),
             run.action,    end.errorCode, end.problems,
-            end.problemKinds};
+            end.problemKinds, end.hasLosses};
 }
 
 void DiskScan::start()
@@ -321,8 +321,19 @@ std::vector<std::string> DiskPane::selectedImages() const
 
 void DiskPane::closeSelectedImages()
 {
+    closed_ = selectedImages();
     for (const auto& disk : selected())
         images_.close(*disk);
+}
+
+std::vector<std::string> DiskPane::closedImages() const
+{
+    const auto open = images_.openImages();
+    auto images = closed_;
+    std::erase_if(images, [&](const std::string& image) {
+        return std::ranges::count(open, image) != 0;
+    });
+    return images;
 }
 
 std::vector<std::string> DiskPane::recentImages() const

@@ -82,6 +82,8 @@ public:
     void attachAsDevices(const std::vector<std::string>& images);
     /// Takes the images that are selected, or that what is selected lies in, from the list.
     void closeSelectedImages();
+    /// Those that were closed last, as far as they are not open again.
+    std::vector<std::string> closedImages() const;
     /// Those images, each once.
     std::vector<std::string> selectedImages() const;
     /// Reads everything anew.
@@ -125,6 +127,7 @@ private:
     const Events events_;
     bool hasReadDisks_ = false;
     DiskTreeModel model_;
+    std::vector<std::string> closed_;  ///< last, by the user
     RecentImages recent_;
     ImageOpener images_;
     bool isReopening_ = false;

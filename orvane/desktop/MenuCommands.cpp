@@ -104,6 +104,16 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
         whenFree("openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }),
         recentCommand(),
         std::move(closing),
+        {.objectName = "reopenClosed",
+         .title = "R&eopen Closed Image",
+         .shortcut = QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_T),
+         .perform = [this] { disks_.open(disks_.closedImages()); },
+         .reasonAgainst = [this] {
+             const std::string reason = reasonWhileLocked();
+             return !reason.empty() || !disks_.closedImages().empty()
+                        ? reason
+                        : text("No image was closed since this window opened.");
+         }},
         whenFree("attachImage", "&Attach Image as Device…", {}, attach),
         whenFree("rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }),
         line,

@@ -71,7 +71,7 @@ void JobLedger::jobWillFinish(const contract::DiskReferencePointer& /*disk*/,
         verdict = error == 0 ? std::string(contract::kPLVerdictSound.text()) : failedVerdict();
     end({verdict, error, std::string(result.string(contract::kPLMessage)),
          std::string(result.string(contract::kPLTool)), result.integer(contract::kPLProblems),
-         result.integer(contract::kPLProblemKinds)});
+         result.integer(contract::kPLProblemKinds), result.boolean(contract::kPLHasLosses)});
 }
 
 void JobLedger::jobDidProgress(const contract::DiskReferencePointer& /*disk*/, double percent)

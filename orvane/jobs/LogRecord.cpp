@@ -32,7 +32,7 @@ std::optional<contract::Name> typeNamed(std::string_view text)
 {
     for (const contract::Name& name :
          {contract::kFsckVerify, contract::kFsckRepair, contract::kFsckError,
-          contract::kFsckSuccess, contract::kFsckFail})
+          contract::kFsckSuccess, contract::kFsckFail, contract::kFsckProblem})
         if (name.text() == text)
             return name;
     return std::nullopt;

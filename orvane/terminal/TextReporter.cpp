@@ -25,6 +25,14 @@ bool isStartOfRun(const contract::Dictionary& record)
            !record.has(contract::kFsckMessageType) && record.has(contract::kFsckMessageString);
 }
 
+/// On a terminal, where no mark stands beside it, a tool's line that tells of a problem is red.
+contract::StyledText coloured(const contract::StyledText& text)
+{
+    contract::TextStyle style = text.style();
+    style.color = contract::Color{1, 0, 0, 1};
+    return contract::StyledText::make(text.characters(), style);
+}
+
 /// Speaks to people: rows as they come, and on a terminal one live line at the bottom.
 class TextReporter final : public Reporter {
 public:
@@ -48,7 +56,9 @@ public:
             write("\n");
         }
         hasWrittenRows_ = true;
-        write(terminalText(text, options_.colors));
+        const bool isProblem =
+            record.string(contract::kFsckMessageType) == contract::kFsckProblem.text();
+        write(terminalText(isProblem ? coloured(text) : text, options_.colors));
     }
 
     void rowsWritten() override

@@ -218,7 +218,7 @@ void JobLog::detail(std::string_view line)
 void JobLog::problem(std::string_view line)
 {
     if (problems_.admits(line))
-        failure(contract::printable(line));
+        add(Level::Main, contract::kFsckProblem, contract::printable(line));
     else
         detail(line);
 }
@@ -257,7 +257,7 @@ void JobLog::endOfRun()
     if (found_.problems == 0)
         found_ = problems_.tally();
     for (const ProblemLimiter::Remainder& rest : problems_.takeRemainders())
-        add(Level::Main, contract::kFsckFail,
+        add(Level::Main, contract::kFsckProblem,
             texts_.text(rest.kind.empty() ? "… and more problems of other kinds: %1$@"
                                           : "… and %1$@ more like “%2$@”"),
             contract::Array::of({rest.count, contract::printable(rest.kind)}));
@@ -319,13 +319,23 @@ void JobLog::finished(const Outcome& outcome, const std::string& message)
 {
     const Name verdict = nameOf(outcome.verdict);
     trace("result: " + std::string(verdict.text()) + ": " + message);
-    finished(outcome.code, outcome.detail, verdict, message);
+    Dictionary result = resultOf(verdict, message);
+    if (!outcome.warnings.empty())
+        result.set(contract::kPLHasLosses, true);
+    events_.add(Finished{outcome.code, outcome.detail, std::move(result)});
+    events_.flush();
 }
 
 void JobLog::finished(contract::ErrorCode mainError, std::int32_t detailError, Name verdict,
                       const std::string& message)
 {
-    const Dictionary result =
+    events_.add(Finished{mainError, detailError, resultOf(verdict, message)});
+    events_.flush();
+}
+
+Dictionary JobLog::resultOf(Name verdict, const std::string& message) const
+{
+    Dictionary result =
         Dictionary::of({{contract::kPLVerdict, verdict}, {contract::kPLMessage, message}});
     if (!tool_.empty())
         result.set(contract::kPLTool, tool_);
@@ -333,8 +343,7 @@ void JobLog::finished(contract::ErrorCode mainError, std::int32_t detailError, N
         result.set(contract::kPLProblems, found_.problems);
     if (found_.problems > 0 && !found_.hasOtherKinds)
         result.set(contract::kPLProblemKinds, found_.kinds);
-    events_.add(Finished{mainError, detailError, result});
-    events_.flush();
+    return result;
 }
 
 void JobLog::add(Level level, std::optional<Name> type, std::string_view text,

@@ -167,6 +167,8 @@ private:
     /// is.
     enum class Level { Error = -1, Main = 0, Step = 1, Detail = 2 };
 
+    contract::Dictionary resultOf(contract::Name verdict, const std::string& message) const;
+
     /// Without a type when that is empty.
     void add(Level level, std::optional<contract::Name> type, std::string_view text,
              const contract::Array& parameters = {});

@@ -219,7 +219,7 @@ TEST_P(RoomTest, NothingIsClipped)
     run("verifyDiskButton", image);
     ASSERT_TRUE(waitForStep(NextStep::Repair));
     const bool isEnglish = result().starts_with("Damaged");
-    EXPECT_EQ(isEnglish, std::string(std::get<0>(GetParam())) != "de") << result();
+    EXPECT_EQ(isEnglish, std::string(std::get<0>(GetParam())) == "C") << result();
     QTest::qWait(0);
     EXPECT_EQ(window().width(), 1180) << "it needs more";
     EXPECT_EQ(window().height(), 720) << "it needs more";
@@ -235,7 +235,7 @@ TEST_P(RoomTest, NothingIsClipped)
 }
 
 INSTANTIATE_TEST_SUITE_P(At, RoomTest,
-                         testing::Combine(testing::Values("C", "de"), testing::Values(1.0, 2.0)),
+                         testing::Combine(testing::Values("C", "de", "es", "fr", "ja"), testing::Values(1.0, 2.0)),
                          [](const auto& look) {
                              return std::string(std::get<0>(look.param)) +
                                     (std::get<1>(look.param) > 1 ? "Large" : "");

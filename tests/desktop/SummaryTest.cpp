@@ -93,6 +93,11 @@ TEST(ResultSummaryOfOne, OffersWhatHelpsAndNothingThatCostsData)
         EXPECT_EQ(summary.tone, c.tone) << c.title;
         EXPECT_EQ(summary.steps, c.steps) << c.title;
     }
+    DiskRow lossy = checked("x", "repaired", "repair");
+    lossy.lastCheck->told.hasLosses = true;
+    EXPECT_EQ(resultOf(lossy, undoable, Translator()).tone, Tone::Caution);
+    EXPECT_EQ(resultOf(lossy, undoable, Translator()).title,
+              "Repaired, but files were lost or moved.");
     DiskRow failing = checked("x", "damaged", "verify", contract::kPLErrorDamaged);
     failing.facts.hasSMARTError = true;
     EXPECT_EQ(resultOf(failing, repairable, Translator()).steps,
@@ -124,6 +129,12 @@ TEST(ResultSummaryOfSeveral, CountsThemAndNamesThoseThatAreNotSound)
     EXPECT_EQ(summary.disks[0].identifier, "/dev/b");
     EXPECT_EQ(summary.disks[1].identifier, "/dev/d");
     EXPECT_EQ(resultOfSeveral({row("c")}, Translator()).title, "");
+    DiskRow twin = checked("b", "damaged");
+    twin.label = "b";
+    twin.facts.path = "/images/other.img";
+    EXPECT_EQ(resultOfSeveral({checked("b", "damaged"), twin}, Translator()).disks[1].name,
+              "b (other.img)")
+        << "one name for two disks";
 }
 
 TEST(SelectionSummaryText, SaysHowItIsAndHowFull)

@@ -207,14 +207,15 @@ TEST_P(TasksTest, FindOutWhetherAnImageIsSound)
 TEST_P(TasksTest, SeeWhatWasFound)
 {
     const std::string image = makeDamagedImage("letters");
-    beginAfter("verifyDiskButton", image);
+    begin({image});
     chooseDisk(image);
+    choose("barVerify", Qt::CTRL | Qt::SHIFT | Qt::Key_V);
     EXPECT_TRUE(says("Damaged")) << said();
     EXPECT_TRUE(logHolds("Free blocks count wrong")) << testing::PrintToString(logRows());
     EXPECT_FALSE(logHolds("Checking directory structure")) << "it is no problem";
     choose("showDetailsButton", Qt::CTRL | Qt::Key_D);
     EXPECT_TRUE(logHolds("Checking directory structure")) << testing::PrintToString(logRows());
-    expectSteps(2, 2);
+    expectSteps(3, 3);
 }
 
 // All that the banner offers is on the way of the Tab key, in the order in which it stands there.
@@ -256,16 +257,20 @@ TEST_P(TasksTest, PreviewARepair)
     expectSteps(2, 3);
 }
 
-TEST_P(TasksTest, Repair)
+TEST_P(TasksTest, RepairTheImageThatWasJustOpened)
 {
     const std::string image = makeDamagedImage("letters");
-    begin({image});
-    chooseDisk(image);
+    begin({makeImage("photos")});
+    session().open({image});
+    ASSERT_TRUE(waitUntil([&] {
+        return row(image).isValid() && window().disks().currentIndex() == row(image) &&
+               widget("barRepair").isEnabled();
+    })) << "what is opened is selected";
     choose("barRepair", Qt::CTRL | Qt::SHIFT | Qt::Key_R);
     answer("repairQuestion", "Repair");
     EXPECT_TRUE(says("epaired")) << said();
     EXPECT_EQ(verdict(image), "repaired");
-    expectSteps(3, 3);
+    expectSteps(2, 2);
 }
 
 TEST_P(TasksTest, UndoARepair)
@@ -370,19 +375,21 @@ TEST_P(TasksTest, LookForAWordInTheLog)
 TEST_P(TasksTest, CopyAReport)
 {
     const std::string image = makeDamagedImage("letters");
-    beginAfter("verifyDiskButton", image);
+    begin({image});
     QApplication::clipboard()->clear();
+    chooseDisk(image);
+    choose("barVerify", Qt::CTRL | Qt::SHIFT | Qt::Key_V);
+    EXPECT_TRUE(says("Damaged")) << said();
     if (isMouse()) {
         clickRow(image, {}, Qt::RightButton);
         clickCommandOfMenu("copyReport");
     } else {
-        chooseDisk(image);
         type(Qt::CTRL | Qt::SHIFT | Qt::Key_C);
     }
     const std::string report = fromQt(QApplication::clipboard()->text());
     EXPECT_NE(report.find(image), std::string::npos) << report;
     EXPECT_NE(report.find("needs to be repaired"), std::string::npos) << report;
-    expectSteps(2, 2);
+    expectSteps(4, 3);
 }
 
 TEST_P(TasksTest, FindOutWhyRepairIsGrey)
@@ -414,27 +421,20 @@ TEST_P(TasksTest, CloseAnImageAndOpenItAgain)
 {
     const std::string image = makeImage("photos");
     begin({image});
-    chooseDisk(image);
     if (isMouse()) {
-        clickMenu("closeImageInFile");
-        clickCommandOfMenu("closeImageInFile");
+        clickRow(image, {}, Qt::RightButton);
+        clickCommandOfMenu("closeImage");
     } else {
+        chooseDisk(image);
         type(Qt::CTRL | Qt::Key_W);
     }
     ASSERT_TRUE(waitUntil([&] { return !row(image).isValid(); }));
-    if (isMouse()) {
-        clickMenu("openImage");
-        clickCommandOfMenu("openRecent");
-        auto* const recent = command("openRecent").menu();
-        ASSERT_TRUE(waitUntil([&] { return recent->isVisible(); }));
-        click(*recent, recent->actionGeometry(recent->actions().front()).center());
-    } else {
-        type(Qt::ALT | Qt::Key_F);
-        type(Qt::Key_T);
-        type(Qt::Key_1);
-    }
+    EXPECT_TRUE(says("photos")) << said();
+    ASSERT_TRUE(waitForStep(NextStep::Reopen));
+    choose(qPrintable(QStringLiteral("step%1").arg(static_cast<int>(NextStep::Reopen))),
+           Qt::CTRL | Qt::SHIFT | Qt::Key_T);
     EXPECT_TRUE(waitUntil([&] { return row(image).isValid(); }));
-    expectSteps(6, 5);
+    expectSteps(3, 3);
 }
 
 INSTANTIATE_TEST_SUITE_P(By, TasksTest, testing::Values(Hand::Mouse, Hand::Keyboard),

@@ -69,7 +69,10 @@ TEST(Job, VerifyAnswersWhatIsTrue)
         EXPECT_EQ(fixture.heard.error, c.error) << c.script;
         EXPECT_EQ(fixture.heard.verdict, c.verdict) << c.script;
         EXPECT_FALSE(fixture.heard.message.empty()) << c.script;
-        EXPECT_EQ(fixture.heard.textsOf(contract::kFsckFail).size(), c.failures) << c.script;
+        EXPECT_EQ(fixture.heard.textsOf(contract::kFsckFail).size() +
+                      fixture.heard.textsOf(contract::kFsckProblem).size(),
+                  c.failures)
+            << c.script;
         expectOneEnd(fixture);
     }
 }
@@ -234,7 +237,7 @@ TEST(Job, ProblemsThatTheLookHasShownAreNotShownAgain)
     const test::Listener& heard = fixture.library.listener;
     EXPECT_EQ(heard.verdict, "damaged") << "it never says that it has changed anything";
     EXPECT_TRUE(heard.hasPlainLine("The volume “Disk” could not be repaired."));
-    EXPECT_EQ(heard.textsOf(contract::kFsckFail).size(), 2U)
+    EXPECT_EQ(heard.textsOf(contract::kFsckProblem).size(), 2U)
         << "once before the repair, and once for what is left";
     EXPECT_EQ(heard.result.string(contract::kPLTool), "fsck.fat 4.2");
     EXPECT_EQ(heard.result.integer(contract::kPLProblems), 1);

@@ -94,7 +94,8 @@ bool Listener::hasErrorWith(std::string_view part) const
         return contains(line, part);
     };
     return std::ranges::any_of(textsOf(contract::kFsckError), isIn) ||
-           std::ranges::any_of(textsOf(contract::kFsckFail), isIn);
+           std::ranges::any_of(textsOf(contract::kFsckFail), isIn) ||
+           std::ranges::any_of(textsOf(contract::kFsckProblem), isIn);
 }
 
 contract::DiskReferencePointer reference(const std::filesystem::path& image, std::string filesystem,

@@ -86,7 +86,7 @@ TEST(JobLog, ShowsNoControlCharacters)
     fixture.log.problem("\x1b[2Jgone");
     fixture.deliver();
     EXPECT_EQ(fixture.listener.plainLines, std::vector<std::string>{"a\uFFFD]0;title\uFFFD b c\n"});
-    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckFail),
+    EXPECT_EQ(fixture.listener.textsOf(contract::kFsckProblem),
               std::vector<std::string>{"\uFFFD[2Jgone"});
 }
 
@@ -118,7 +118,7 @@ TEST(JobLog, KeepsTenThousandProblemsReadable)
         fixture.log.problem("problem " + std::string(static_cast<std::size_t>(i) + 1, 'x'));
     fixture.log.endOfRun();
     fixture.deliver();
-    const auto errors = fixture.listener.textsOf(contract::kFsckFail);
+    const auto errors = fixture.listener.textsOf(contract::kFsckProblem);
     EXPECT_EQ(errors.size(), ProblemLimiter::shownInAll + 2);
     EXPECT_EQ(errors[100], "… and %1$@ more like “%2$@”");
     EXPECT_EQ(fixture.listener.plainLines.size(), 10'500 - ProblemLimiter::shownInAll)
@@ -159,7 +159,7 @@ TEST(JobLog, ProblemsOfToolsAreNoHeadingsAndAreSummedUpInOne)
         fixture.deliver();
         for (const contract::Dictionary& message : fixture.listener.dictionaries) {
             const bool isProblem =
-                message.string(contract::kFsckMessageType) == contract::kFsckFail.text();
+                message.string(contract::kFsckMessageType) == contract::kFsckProblem.text();
             EXPECT_TRUE(!isProblem || message.integer(contract::kFsckVerbosity) == 0);
         }
         const auto sentences = fixture.listener.textsOf(contract::kFsckError);

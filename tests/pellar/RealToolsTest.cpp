@@ -325,6 +325,7 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
             const bool isLoss = test::contains(damage.message, " file");
             const bool hasWarned = !warnings.empty() && warnings.back() == asLine(library.listener.message);
             EXPECT_EQ(hasWarned, isLoss) << damage.message;
+            EXPECT_EQ(library.listener.result.boolean(contract::kPLHasLosses), isLoss);
         }
         ASSERT_EQ(library.verify(disk), 0);
         EXPECT_EQ(library.listener.verdict, "sound") << "after";

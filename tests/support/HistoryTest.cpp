@@ -246,11 +246,12 @@ TEST_F(HistoryTest, AnEarlierDatabaseGetsTheColumnsItLacks)
         Database file = Database::open(file_);
         ASSERT_TRUE(file.execute(
             "ALTER TABLE runs DROP COLUMN tool; ALTER TABLE runs DROP COLUMN problemKinds;"
+            "ALTER TABLE runs DROP COLUMN losses;"
             "INSERT INTO volumes (key) VALUES ('v');"
             "INSERT INTO runs (volume, started, finished, action, verdict, error, message) "
             "VALUES (1, 5, 6, 'verify', 'damaged', 7, 'why')"));
     }
-    const RunEnd end{"sound", 0, "", "fsck.fat 4.2", 1, 1};
+    const RunEnd end{"repaired", 0, "", "fsck.fat 4.2", 1, 1, true};
     {
         HistoryStore mine = open();
         mine.endRun(mine.beginRun("v", "verify", {}), end, {});

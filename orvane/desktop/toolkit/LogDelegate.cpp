@@ -29,6 +29,7 @@ constexpr double spacing = 8;  // between title and verdict
 constexpr double bandStrength = 0.07;
 constexpr double quietStrength = 0.65;
 const QColor markColor(0xff, 0xdd, 0x57);
+const QColor problemColor(Qt::red);  // of the dot before a tool's line, as of our own sentences
 
 QColor mixed(const QColor& ground, const QColor& above, double strength)
 {
@@ -51,7 +52,8 @@ struct Row {
     StyledLine line;
     QRectF frame;
     bool isHeading = false;
-    bool isEnd = false;  ///< of a run: an empty line
+    bool isEnd = false;      ///< of a run: an empty line
+    bool isProblem = false;  ///< as a tool tells it
 };
 
 /// None where there is nothing to show yet, or any more.
@@ -65,13 +67,14 @@ std::optional<Row> rowAt(const QModelIndex& index)
         return std::nullopt;
     const auto number = static_cast<std::size_t>(model.viewRow(index.row()));
     const contract::Rect frame = view->frameOfCellAtColumnRow(0, number);
+    const contract::OutlineItem item = model.itemAt(index.row());
     return Row{model,
                *view,
                oneLine(textOfRow(*view, number)),
                QRectF(frame.x, frame.y, frame.width, frame.height),
                model.isHeading(index.row()),
-               model.itemAt(index.row()).integer(contract::kFsckVerbosity) ==
-                   contract::verbosity::summary};
+               item.integer(contract::kFsckVerbosity) == contract::verbosity::summary,
+               item.string(contract::kFsckMessageType) == contract::kFsckProblem.text()};
 }
 
 bool isSelected(const QStyleOptionViewItem& option)
@@ -136,6 +139,24 @@ QRectF bodyRect(const QStyleOptionViewItem& option, const QRectF& frame)
 {
     const bool isMirrored = option.direction == Qt::RightToLeft;
     return frame.adjusted(isMirrored ? 0 : indent, 0, isMirrored ? -indent : 0, 0);
+}
+
+/// Before the first line of a row that a tool told as a problem: its text is as plain as any other.
+void paintDot(QPainter& painter, const QStyleOptionViewItem& option, const Row& row,
+              const LineLooks& looks)
+{
+    constexpr double side = 5;
+    const double height = QFontMetricsF(widestFont(row.line, looks)).height();
+    const bool isMirrored = option.direction == Qt::RightToLeft;
+    const double middle = isMirrored ? row.frame.right() - indent / 2 : row.frame.left() + indent / 2;
+    const QColor color =
+        looks.keepsTextColor ? looks.textColor : readableOn(looks.background, problemColor);
+    painter.save();
+    painter.setRenderHint(QPainter::Antialiasing);
+    painter.setPen(Qt::NoPen);
+    painter.setBrush(color);
+    painter.drawEllipse(QPointF(middle, row.frame.top() + height / 2 + 1), side / 2, side / 2);
+    painter.restore();
 }
 
 double heightOf(const StyledLine& line, const LineLooks& looks, double width, double oneLineHeight)
@@ -293,6 +314,8 @@ void LogDelegate::paint(QPainter* painter, const QStyleOptionViewItem& option,
     LineLooks looks = looksOf(option, *row);
     looks.marks = marksIn(row->line.text, searchedIn(option));
     drawWrapped(*painter, bodyRect(option, row->frame), row->line, looks);
+    if (row->isProblem)
+        paintDot(*painter, option, *row, looks);
 }
 
 QSize LogDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const

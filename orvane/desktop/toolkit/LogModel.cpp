@@ -21,7 +21,8 @@ constexpr int rowsBetweenTimes = 512;
 bool isProblem(const contract::OutlineItem& item)
 {
     const std::string_view type = item.string(contract::kFsckMessageType);
-    return type == contract::kFsckError.text() || type == contract::kFsckFail.text();
+    return type == contract::kFsckError.text() || type == contract::kFsckFail.text() ||
+           type == contract::kFsckProblem.text();
 }
 
 bool isSuccess(const contract::OutlineItem& item)

@@ -62,6 +62,7 @@ private:
     void adoptButtons();
     void fill(const contract::Outlet& outlet);
     void limitSplitView();
+    void fitButtons();
     void addHostControls(LogTable& table);
     void makeOutlineView(contract::OutlineView** place, LogTable& table);
     template <class Control, class Widget, class Outlet>

@@ -26,6 +26,7 @@ struct Check {
     std::int32_t errorCode = 0;  ///< of the library
     std::int64_t problems = 0;   ///< that the tool named; 0 when it is not known
     std::int64_t kinds = 0;      ///< of them
+    bool hasLosses = false;      ///< the result cost something; the message says what
 };
 
 /// What is kept of the last actions on a disk, or on the part of it that is worst off.

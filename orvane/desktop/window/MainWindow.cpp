@@ -59,7 +59,7 @@ ProgressArea::ProgressArea(const Translator& texts, QWidget* parent)
     connect(stopButton_, &QPushButton::clicked, this, [this] { stop_(); });
 
     auto* const layout = new QHBoxLayout(this);
-    layout->setContentsMargins(12, 6, 12, 6);
+    layout->setContentsMargins(16, 4, 16, 4);
     layout->setSpacing(12);
     layout->addWidget(label_, 3);
     layout->addWidget(bar_, 2);
@@ -69,6 +69,12 @@ ProgressArea::ProgressArea(const Translator& texts, QWidget* parent)
                      layout->contentsMargins().bottom());
     keepRoomWhenHidden(*bar_);
     keepRoomWhenHidden(*label_);
+    hide();
+}
+
+void ProgressArea::adoptUse()
+{
+    setVisible(isBarActive_ || isTextActive_ || stop_);
 }
 
 void ProgressArea::setBarActive(bool isActive)
@@ -76,11 +82,14 @@ void ProgressArea::setBarActive(bool isActive)
     isBarActive_ = isActive;
     bar_->setVisible(isActive);
     showRange();
+    adoptUse();
 }
 
 void ProgressArea::setTextActive(bool isActive)
 {
+    isTextActive_ = isActive;
     label_->setVisible(isActive);
+    adoptUse();
 }
 
 void ProgressArea::setIndeterminate(bool isIndeterminate)
@@ -115,6 +124,7 @@ void ProgressArea::setStop(std::function<void()> stop)
 {
     stop_ = std::move(stop);
     stopButton_->setVisible(static_cast<bool>(stop_));
+    adoptUse();
 }
 
 MainWindow::MainWindow(const Translator& texts)
@@ -147,6 +157,7 @@ MainWindow::MainWindow(const Translator& texts)
     rows->setSpacing(0);
     rows->addWidget(header_);
     rows->addWidget(banner_);
+    rows->addWidget(progress_);
     rows->addWidget(tabs_, 1);
     splitter_->addWidget(disks_);
     splitter_->addWidget(work);
@@ -155,13 +166,7 @@ MainWindow::MainWindow(const Translator& texts)
     splitter_->setStretchFactor(1, 3);
     splitter_->setSizes({380, 740});
 
-    auto* const content = new QWidget(this);
-    auto* const layout = new QVBoxLayout(content);
-    layout->setContentsMargins(0, 0, 0, 0);
-    layout->setSpacing(0);
-    layout->addWidget(splitter_, 1);
-    layout->addWidget(progress_);
-    setCentralWidget(content);
+    setCentralWidget(splitter_);
 
     connect(tabs_, &QTabWidget::currentChanged, this, [this] { tellOfChange(); });
 }

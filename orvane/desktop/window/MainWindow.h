@@ -23,9 +23,8 @@
 
 namespace orvane::desktop {
 
-/// The window's status line, and beside it the progress bar. Both keep their room when they are
-/// not in use, so that nothing in the window jumps. For a job that no module has a button for, there
-/// is one to stop it.
+/// The status line, and beside it the progress bar, while there is something going on: it stands
+/// where the result will. For a job that no module has a button for, there is one to stop it.
 class ProgressArea final : public QWidget {
 public:
     ProgressArea(const Translator& texts, QWidget* parent);
@@ -43,18 +42,20 @@ public:
 
 private:
     void showRange();
+    void adoptUse();
 
     QProgressBar* bar_;
     ElidedLabel* label_;
     QPushButton* stopButton_;
     std::function<void()> stop_;
     bool isBarActive_ = false;
+    bool isTextActive_ = false;
     bool isIndeterminate_ = true;
     int tenths_ = 0;
 };
 
 /// The host's window: commands at the top, the disks on the left, on the right what is selected,
-/// what came out of the last job on it, and the modules' tabs; progress below.
+/// what came out of the last job on it or how far this one is, and the modules' tabs.
 /// Knows how they lie, not what they do. Main thread.
 class MainWindow final : public QMainWindow {
 public:

@@ -36,7 +36,8 @@ constexpr std::array stepTitles{
     StepTitle{NextStep::ApplyUnproven, "Apply Anyway…", Symbol::Repair},
     StepTitle{NextStep::RepairDirectly, "Repair Directly…", Symbol::Repair},
     StepTitle{NextStep::ShowProblems, "Show Findings", Symbol::Search},
-    StepTitle{NextStep::CopyDisk, "Copy the Disk First…", Symbol::Copy}};
+    StepTitle{NextStep::CopyDisk, "Copy the Disk First…", Symbol::Copy},
+    StepTitle{NextStep::Reopen, "Reopen", Symbol::Open}};
 
 /// The sign that says the same as the tone's colour.
 std::string_view verdictLike(Tone tone)

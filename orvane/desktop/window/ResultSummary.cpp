@@ -12,7 +12,7 @@
 
 #include <algorithm>
 #include <array>
-#include <map>
+#include <filesystem>
 
 namespace orvane::desktop {
 namespace {
@@ -26,6 +26,7 @@ struct Ending {
     Operation operation;
     std::string_view verdict;
     contract::ErrorCode error;
+    bool hasLosses;
 
     bool is(const contract::Name& other) const { return verdict == other.text(); }
 };
@@ -33,7 +34,7 @@ struct Ending {
 Ending endingOf(const Check& check)
 {
     const auto task = pellar::taskNamed(check.action).value_or(pellar::Task{});
-    return {task.subject, task.operation, check.verdict, check.errorCode};
+    return {task.subject, task.operation, check.verdict, check.errorCode, check.hasLosses};
 }
 
 bool isUnreadable(const Ending& ending)
@@ -51,6 +52,8 @@ bool isBeyondRepair(const Ending& ending)
 
 Tone toneOf(const Ending& ending)
 {
+    if (ending.hasLosses)
+        return Tone::Caution;
     if (ending.is(contract::kPLVerdictSound) || ending.is(contract::kPLVerdictRepaired))
         return Tone::Good;
     if (ending.is(contract::kPLVerdictDamaged))
@@ -92,7 +95,8 @@ std::string_view titleOfRepair(const Ending& ending)
     if (ending.error == contract::kPLErrorNotTried)
         return "The repair could not be tried first. Nothing was changed.";
     if (ending.is(contract::kPLVerdictRepaired))
-        return "Repaired. No damage is left.";
+        return ending.hasLosses ? "Repaired, but files were lost or moved."
+                                : "Repaired. No damage is left.";
     if (ending.is(contract::kPLVerdictSound))
         return "No damage was found. Nothing had to be repaired.";
     // What only a preview says: a repair that is done leaves another error.
@@ -210,32 +214,46 @@ ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,
             stepsAfter(ending, disk, situation), {}};
 }
 
+ResultSummary resultOfClosing(const std::vector<std::string>& images, const Translator& texts)
+{
+    if (images.empty())
+        return {};
+    const auto count = static_cast<long>(images.size());
+    const std::string name =
+        contract::printable(std::filesystem::path(images.front()).filename().native());
+    return {Tone::Neutral,
+            count == 1 ? texts.sentence("“%@” was closed.", {name})
+                       : texts.sentence("%ld images were closed.", {count}),
+            texts.text(count == 1 ? "The file and its history stay as they are."
+                                  : "The files and their histories stay as they are."),
+            {NextStep::Reopen},
+            {}};
+}
+
 ResultSummary resultOfSeveral(const std::vector<DiskRow>& disks, const Translator& texts)
 {
     ResultSummary summary;
-    std::map<std::string, long> counts;  // by verdict
-    long checked = 0;
-    for (const DiskRow& disk : disks) {
+    std::vector<DiskRow> checked;
+    const QStringList names = distinctNames(disks);
+    for (std::size_t i = 0; i < disks.size(); ++i) {
+        const DiskRow& disk = disks[i];
         if (!disk.activity.empty())
             return {};
         if (!disk.lastCheck)
             continue;
         const LastCheck& check = *disk.lastCheck;
-        ++checked;
-        ++counts[fromQt(stateText(disk, texts))];
+        checked.push_back(disk);
         const Tone tone = check.isPartial ? Tone::Neutral : toneOf(endingOf(check.told));
         summary.tone = worse(summary.tone, tone);
         if (tone == Tone::Bad || tone == Tone::Caution)
-            summary.disks.push_back({fromQt(namesOf(disk).name), disk.facts.identifier});
+            summary.disks.push_back({fromQt(names[static_cast<qsizetype>(i)]), disk.facts.identifier});
     }
-    if (checked == 0)
+    if (checked.empty())
         return {};
-    std::string all;
-    for (const auto& [state, count] : counts)
-        all += (all.empty() ? "" : ", ") + std::to_string(count) + " " + state;
+    const auto count = static_cast<long>(checked.size());
     summary.title = contract::format(
-        texts.plural("%ld disk was checked: %@.", "%ld disks were checked: %@.", checked),
-        {checked, all});
+        texts.plural("%ld disk was checked: %@.", "%ld disks were checked: %@.", count),
+        {count, fromQt(countsOf(checked, texts))});
     return summary;
 }
 

@@ -20,6 +20,7 @@ enum class NextStep {
     RepairDirectly,  ///< without trying it first
     ShowProblems,
     CopyDisk,
+    Reopen,  ///< what was closed
 };
 
 enum class Tone { Neutral, Good, Caution, Bad };
@@ -53,6 +54,9 @@ struct ResultSituation {
 
 [[nodiscard]] ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,
                                      const Translator& texts);
+/// Of none: the images that were closed last.
+[[nodiscard]] ResultSummary resultOfClosing(const std::vector<std::string>& images,
+                                            const Translator& texts);
 /// Of several; nothing where none of them was checked.
 [[nodiscard]] ResultSummary resultOfSeveral(const std::vector<DiskRow>& disks,
                                             const Translator& texts);

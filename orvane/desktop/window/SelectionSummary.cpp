@@ -5,8 +5,10 @@
 #include "contract/pellar/MessageKeys.h"
 #include "orvane/desktop/toolkit/Text.h"
 
+#include <QHash>
 #include <QLocale>
 
+#include <algorithm>
 #include <array>
 #include <numeric>
 
@@ -79,35 +81,6 @@ void addPartitions(SelectionSummary& summary, const std::vector<DiskRow>& parts,
                                       part.lastCheck ? part.lastCheck->told.verdict : ""});
 }
 
-/// "2 damaged, 1 never checked"
-QString countsOf(const std::vector<DiskRow>& rows, const Translator& texts)
-{
-    const auto count = [&](auto isMeant) {
-        return static_cast<long>(std::count_if(rows.begin(), rows.end(), isMeant));
-    };
-    const auto has = [](std::string_view verdict) {
-        return [verdict](const DiskRow& row) {
-            return row.lastCheck && !row.lastCheck->isPartial &&
-                   row.lastCheck->told.verdict == verdict;
-        };
-    };
-    QStringList parts;
-    const auto add = [&](std::string_view key, long number) {
-        if (number > 0)
-            parts += toQt(texts.sentence(key, {number}));
-    };
-    const long damaged = count(has(contract::kPLVerdictDamaged.text()));
-    const long repaired = count(has(contract::kPLVerdictRepaired.text()));
-    const long sound = count(has(contract::kPLVerdictSound.text()));
-    const long never = count([](const DiskRow& row) { return !row.lastCheck; });
-    add("%ld damaged", damaged);
-    add("%ld repaired", repaired);
-    add("%ld sound", sound);
-    add("%ld never checked", never);
-    add("%ld undecided", static_cast<long>(rows.size()) - damaged - repaired - sound - never);
-    return parts.join(QStringLiteral(", "));
-}
-
 SelectionSummary summaryOfSeveral(const std::vector<DiskRow>& rows, const Translator& texts)
 {
     SelectionSummary summary;
@@ -119,10 +92,7 @@ SelectionSummary summaryOfSeveral(const std::vector<DiskRow>& rows, const Transl
     QStringList facts;
     if (bytes != 0)
         facts += toQt(texts.sentence("%@ in all", {fromQt(sizeText(bytes))}));
-    QStringList names;
-    for (const DiskRow& row : rows)
-        names += namesOf(row).name;
-    facts += names.join(QStringLiteral(", "));
+    facts += distinctNames(rows).join(QStringLiteral(", "));
     summary.facts = facts.join(separator);
     summary.state = countsOf(rows, texts);
     if (std::ranges::any_of(rows, [](const DiskRow& row) { return row.facts.hasSMARTError; }))
@@ -131,6 +101,52 @@ SelectionSummary summaryOfSeveral(const std::vector<DiskRow>& rows, const Transl
 }
 
 }  // namespace
+
+QStringList distinctNames(const std::vector<DiskRow>& rows)
+{
+    QHash<QString, int> counts;
+    for (const DiskRow& row : rows)
+        ++counts[namesOf(row).name];
+    QStringList names;
+    for (const DiskRow& row : rows)
+        names += counts[namesOf(row).name] > 1 ? nameText(row) : namesOf(row).name;
+    return names;
+}
+
+QString countsOf(const std::vector<DiskRow>& rows, const Translator& texts)
+{
+    struct State {
+        std::string_view verdict;
+        std::string_view count;
+    };
+    static constexpr std::string_view partly = "partly checked";
+    static constexpr std::string_view never = "never checked";
+    static const std::array states{State{contract::kPLVerdictDamaged.text(), "%ld damaged"},
+                                   State{contract::kPLVerdictFailed.text(), "%ld failed"},
+                                   State{contract::kPLVerdictInconclusive.text(), "%ld inconclusive"},
+                                   State{contract::kPLVerdictStopped.text(), "%ld stopped"},
+                                   State{"", "%ld cut off"},
+                                   State{contract::kPLVerdictUndone.text(), "%ld undone"},
+                                   State{contract::kPLVerdictRepaired.text(), "%ld repaired"},
+                                   State{contract::kPLVerdictSound.text(), "%ld sound"},
+                                   State{partly, "%ld partly checked"},
+                                   State{never, "%ld never checked"}};
+    const auto stateOf = [](const DiskRow& row) -> std::string_view {
+        return !row.lastCheck              ? never
+               : row.lastCheck->isPartial ? partly
+                                           : std::string_view(row.lastCheck->told.verdict);
+    };
+    QStringList parts;
+    for (const State& state : states)
+        if (const auto number = static_cast<long>(
+                std::ranges::count_if(rows,
+                                      [&](const DiskRow& row) {
+                                          return stateOf(row) == state.verdict;
+                                      }));
+            number > 0)
+            parts += toQt(contract::format(texts.plural(state.count, state.count, number), {number}));
+    return parts.join(QStringLiteral(", "));
+}
 
 QString capitalized(QString text)
 {

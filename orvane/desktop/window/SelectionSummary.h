@@ -41,6 +41,12 @@ struct SelectionSummary {
                                          const std::vector<DiskRow>& parts, const QDateTime& now,
                                          const Translator& texts);
 
+/// Their names, each with the file or device where another of them has the same one.
+[[nodiscard]] QStringList distinctNames(const std::vector<DiskRow>& rows);
+
+/// "2 damaged, 1 never checked": how many of the disks are in which state; the worst come first.
+[[nodiscard]] QString countsOf(const std::vector<DiskRow>& rows, const Translator& texts);
+
 /// "3 minutes ago"; the date where that says more.
 [[nodiscard]] QString ageText(const QDateTime& then, const QDateTime& now, const Translator& texts);
 

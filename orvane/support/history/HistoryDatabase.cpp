@@ -43,10 +43,11 @@ constexpr const char* laterAdditions =
     "CREATE TABLE IF NOT EXISTS openRuns (run INTEGER PRIMARY KEY, owner TEXT NOT NULL)";
 
 // A program of before them reads and writes the table as it did.
-constexpr std::array<std::array<const char*, 2>, 3> laterColumnsOfRuns{
+constexpr std::array<std::array<const char*, 2>, 4> laterColumnsOfRuns{
     {{"tool", "ALTER TABLE runs ADD COLUMN tool TEXT"},
      {"problems", "ALTER TABLE runs ADD COLUMN problems INTEGER"},
-     {"problemKinds", "ALTER TABLE runs ADD COLUMN problemKinds INTEGER"}}};
+     {"problemKinds", "ALTER TABLE runs ADD COLUMN problemKinds INTEGER"},
+     {"losses", "ALTER TABLE runs ADD COLUMN losses INTEGER"}}};
 
 // WAL lets other programs read while one writes. With synchronous = NORMAL what was saved survives
 // the end of the program, however it comes; a power failure may take the last moments. Checkpoints

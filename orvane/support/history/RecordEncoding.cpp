@@ -21,9 +21,10 @@ const Name originKey{"kOV_typeOfOutputKey"};
 const Name finalTextKey{"kOV_finalAttributedString_type"};
 const std::array<Value, 3> origins{Name{"kOV_typeOfOutput_string"}, Name{"kOV_typeOfOutput_dict"},
                                    Name{"kOV_typeOfOutput_OV_addition"}};
-const std::array<Name, 6> types{contract::kFsckVerify, contract::kFsckRepair,
-                                contract::kFsckError,  contract::kFsckSuccess,
-                                contract::kFsckFail,   contract::kFsckProgress};
+const std::array<Name, 7> types{contract::kFsckVerify,  contract::kFsckRepair,
+                                contract::kFsckError,   contract::kFsckSuccess,
+                                contract::kFsckFail,    contract::kFsckProblem,
+                                contract::kFsckProgress};
 
 bool isOrigin(const Value& value)
 {

@@ -75,12 +75,12 @@ RunTable::RunTable(Database& database)
           "DELETE FROM openRuns WHERE run = ? OR run NOT IN (SELECT id FROM runs)")),
       end_(database.prepare(
           "UPDATE runs SET finished = ?, verdict = ?, error = ?, message = ?, "
-          "tool = NULLIF(?, ''), problems = NULLIF(?, 0), problemKinds = NULLIF(?, 0) "
-          "WHERE id = ?")),
+          "tool = NULLIF(?, ''), problems = NULLIF(?, 0), problemKinds = NULLIF(?, 0), "
+          "losses = NULLIF(?, 0) WHERE id = ?")),
       list_(
           database.prepare("SELECT action, started, finished, verdict, error, message, owner, "
-                           "tool, problems, problemKinds FROM runs LEFT JOIN openRuns ON run = id "
-                           "WHERE volume = ? ORDER BY id DESC LIMIT ?")),
+                           "tool, problems, problemKinds, losses FROM runs "
+                           "LEFT JOIN openRuns ON run = id WHERE volume = ? ORDER BY id DESC LIMIT ?")),
       trim_(database.prepare("DELETE FROM runs WHERE volume = ?1 AND id <= (SELECT id FROM runs "
                              "WHERE volume = ?1 ORDER BY id DESC LIMIT 1 OFFSET ?2)")),
       database_(database)
@@ -118,7 +118,8 @@ bool RunTable::end(std::int64_t run, const RunEnd& end, Run::Time finished)
     end_.bind(5, end.tool);
     end_.bind(6, end.problems);
     end_.bind(7, end.problemKinds);
-    end_.bind(8, run);
+    end_.bind(8, std::int64_t{end.hasLosses});
+    end_.bind(9, run);
     close_.bind(1, run);
     Transaction transaction(database_);
     return transaction.hasBegun() && end_.run() && close_.run() && transaction.commit();
@@ -136,7 +137,8 @@ std::vector<Run> RunTable::runs(std::int64_t volume, std::int64_t limit)
             run.end =
                 RunEnd{std::string(list_.text(3)), static_cast<std::int32_t>(list_.integer(4)),
                        std::string(list_.text(5)), std::string(list_.text(7)),
-                       list_.integer(8),           list_.integer(9)};
+                       list_.integer(8),           list_.integer(9),
+                       list_.integer(10) != 0};
         }
         run.isGoingOn = !run.end && isAlive(std::string(list_.text(6)));
         runs.push_back(std::move(run));

@@ -20,6 +20,7 @@ struct RunEnd {
     std::string tool = {};          ///< with its version; empty where none ran, or it is not known
     std::int64_t problems = 0;      ///< that were told of; 0 also where it is not known
     std::int64_t problemKinds = 0;  ///< of how many kinds they are; 0 likewise
+    bool hasLosses = false;         ///< the result cost something; the message says what
 
     friend bool operator==(const RunEnd&, const RunEnd&) = default;
 };

@@ -120,7 +120,7 @@ protected:
         for (const std::string& row : rows) {
             const contract::Dictionary line = record(row, 0);
             if (row.starts_with("problem"))
-                line.set(contract::kFsckMessageType, contract::kFsckFail);
+                line.set(contract::kFsckMessageType, contract::kFsckProblem);
             history.append(line);
         }
         history.append(record("", -2));

@@ -135,7 +135,7 @@ contract::DiskReferencePointer mountedAt(const fs::path& root)
 std::string PermissionBench::problems() const
 {
     std::string all;
-    for (const auto& type : {contract::kFsckError, contract::kFsckFail})
+    for (const auto& type : {contract::kFsckError, contract::kFsckFail, contract::kFsckProblem})
         for (const std::string& line : listener.textsOf(type))
             all += line + '\n';
     return all;
