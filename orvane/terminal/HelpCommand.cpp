@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/files/WholeFile.h"
 #include "orvane/support/texts/Language.h"
+#include "orvane/terminal/Completion.h"
 #include "orvane/terminal/ManualCommands.h"
 #include "orvane/terminal/Reporter.h"
 #include "orvane/terminal/manual/PlainText.h"
@@ -130,6 +131,28 @@ int runHelp(const Request& request, const std::filesystem::path& book, const Tra
     }
     return writePage(
         manual::plainText(*page, {std::min(look.columns, mostColumns), look.colors}), texts);
+}
+
+std::optional<int> runCompletion(const std::vector<std::string>& arguments,
+                                 const std::filesystem::path& book, const DiskSources& disks,
+                                 const Translator& texts)
+{
+    if (arguments.size() < 2 || arguments[0] != "--complete")
+        return std::nullopt;
+    const CompletionSources sources{
+        commandTree(texts), [&disks] { return readSystemDisks(disks); },
+        [&book] {
+            const HelpPages pages(book);
+            std::vector<Candidate> topics;
+            for (const std::string& name : pages.names())
+                topics.push_back({name, pages.page(name).title});
+            return topics;
+        }};
+    if (arguments[1] == "bash" && arguments.size() == 4)
+        return writePage(bashReply(arguments[2], arguments[3], sources), texts);
+    if (arguments[1] == "plain")
+        return writePage(plainReply({arguments.begin() + 2, arguments.end()}, sources), texts);
+    return std::nullopt;
 }
 
 }  // namespace orvane

@@ -122,7 +122,7 @@ public:
             facts += "  " + disk.format;
         if (!disk.mountPoint.empty())
             facts += "  " + sentence("mounted at %@", {disk.mountPoint});
-        const std::string name = disk.name.empty() ? "" : "  “" + disk.name + "”";
+        const std::string name = disk.name.empty() ? "" : "  " + sentence("“%@”", {disk.name});
         write(indent + bold(disk.disk) + contract::printable(name + "  " + facts) + "\n");
         const auto below = [&](const std::string& text) {
             write(indent + "    " + text + "\n");

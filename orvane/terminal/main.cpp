@@ -105,12 +105,24 @@ int runRequest(const Request& request, const std::filesystem::path& bundle,
     }
 }
 
+/// A key is waited for by somebody, and a drive may sleep: what udev knows is enough, where it is.
+DiskSources disksForCompletion()
+{
+    DiskSources sources;
+    std::error_code error;
+    sources.opensDevices = !std::filesystem::exists(sources.udevData, error);
+    return sources;
+}
+
 int run(int argc, const char* const* argv)
 {
     setInheritanceRight();
     adoptUserLocale();
     const std::filesystem::path bundle = hostBundleDirectory(runningExecutable());
     const Catalogue catalogue(bundle / "locale");
+    if (const auto status = runCompletion({argv + 1, argv + argc}, bundle / "help",
+                                          disksForCompletion(), translatorOf(catalogue)))
+        return *status;
     const auto request = readCommandLine(argc, argv, translatorOf(catalogue));
     if (!request) {
         std::fputs(request.error().text.c_str(), stderr);

@@ -182,6 +182,35 @@ TEST_F(ManualTest, EveryPageOfTheManualIsCompleteAndFormatsWithoutAWarning)
         GTEST_SKIP() << "the pages are complete; groff, which would format them, is not installed";
 }
 
+using VersionTest = test::ProgramTest;
+
+TEST_F(VersionTest, TheProgramAndEveryToolAreTold)
+{
+    useTool("say e2fsck 9.8.7 (1-Jan-2026)\nexit 0");
+    environment_["LANG"] = "C.UTF-8";
+    environment_["LANGUAGE"] = "de";
+    const test::RunResult result = run({"--version"});
+    EXPECT_EQ(result.status, 0) << result.errors;
+    const auto lines = test::linesOf(result.output);
+    ASSERT_EQ(lines.size(), 8U) << result.output;
+    EXPECT_EQ(lines[0], "fixwell " PROJECT_VERSION);
+    EXPECT_EQ(lines[1].substr(0, 8), "  e2fsck");
+    EXPECT_NE(lines[1].find("9.8.7"), std::string::npos);
+    for (const std::string& line : lines)
+        EXPECT_EQ(line.find("not installed"), std::string::npos) << "in German";
+}
+
+TEST_F(VersionTest, AToolThatIsMissingIsToldWithItsPackage)
+{
+    testing::internal::CaptureStdout();
+    EXPECT_EQ(runVersion("/no/such/place", {}, {}), 0);
+    const auto lines = test::linesOf(testing::internal::GetCapturedStdout());
+    ASSERT_EQ(lines.size(), 8U);
+    for (std::size_t i = 1; i < lines.size(); ++i)
+        EXPECT_NE(lines[i].find("not installed: package "), std::string::npos) << lines[i];
+    EXPECT_TRUE(lines[1].ends_with("e2fsprogs")) << lines[1];
+}
+
 /// Everything that the command line says, in the words by which a translation is looked for.
 std::set<std::string> wordsOfTheCommandLine()
 {

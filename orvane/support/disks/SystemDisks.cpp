@@ -92,7 +92,8 @@ Contents contentsFromUdev(const std::string& number, const DiskSources& sources)
 Contents contentsOf(const fs::path& node, const std::string& number, std::uint64_t size,
                     const DiskSources& sources)
 {
-    const pellar::FileDescriptor device(::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC));
+    const pellar::FileDescriptor device(
+        sources.opensDevices ? ::open(node.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC) : -1);
     if (!device)
         return contentsFromUdev(number, sources);
     const ByteRange all{0, size};

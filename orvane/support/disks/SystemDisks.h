@@ -17,6 +17,8 @@ struct DiskSources {
     std::filesystem::path udevData = "/run/udev/data";
     std::vector<pellar::Mount> mounts = pellar::currentMounts();
     std::filesystem::path homeDirectory;  ///< of the user; empty when there is none
+    /// NO: only what udev has found out of them is told, and no drive is waited for.
+    bool opensDevices = true;
 };
 
 /// The block devices of this machine, with their partitions. Needs no privileges, but what may
