@@ -112,7 +112,7 @@ Document overviewOf(const CommandTree& tree, const Translator& texts)
 Document helpOn(const CommandEntry& command, const CommandTree& tree, const Translator& texts)
 {
     Document page;
-    page.blocks.push_back({Kind::Paragraph, {{Look::Plain, command.text + "."}}});
+    page.blocks.push_back({Kind::Paragraph, {{Look::Plain, texts.sentence("%@.", {command.text})}}});
     page.blocks.push_back(usageLine(tree.name + " " + command.usage(texts), texts));
     for (const ArgumentEntry& argument : command.arguments)
         page.blocks.push_back(
