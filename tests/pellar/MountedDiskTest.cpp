@@ -157,7 +157,7 @@ TEST_F(MountedDisk, IsMountedAgainWhenTheProgramIsKilled)
         "exit 4");
     OtherProgram repair(test::with(&JobOptions::toolPath, tools), disk(), true);
     ASSERT_TRUE(comesTrue([this] { return mounts().empty(); }));
-    ::usleep(300'000);  // the tool has begun
+    ::usleep(1'000'000);  // the tool has begun
     repair.kill();
     ::usleep(500'000);
     EXPECT_TRUE(mounts().empty()) << "a tool that writes is waited for";
