@@ -54,7 +54,7 @@ BenchHost::BenchHost(const std::filesystem::path& state)
     : logView_(
           loop_, [](const auto&, const auto&) {}, [] {}, [] {}),
       interface_(logView_),
-      alerts_(loop_, reporter_, TerminalAlerts::Answer::Confirm),
+      alerts_(loop_, reporter_, texts_, TerminalAlerts::Answer::Confirm),
       bundle_(runningExecutable().parent_path().parent_path() / "modules" / "Fixwell.ovmodule",
               "FXW"),
       host_(optionsIn(state), loop_, interface_, alerts_, reporter_, false),

@@ -2,6 +2,7 @@
 #pragma once
 
 #include "fixwell/module/OVFXW.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/terminal/TerminalHost.h"
 
 #include <filesystem>
@@ -62,6 +63,7 @@ private:
     TerminalWindow window_;
     LogView logView_;
     TerminalInterface interface_;
+    Catalogue texts_{std::filesystem::path()};
     TerminalAlerts alerts_;
     ModuleBundle bundle_;
     TerminalHost host_;
