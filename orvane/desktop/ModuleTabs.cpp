@@ -82,17 +82,11 @@ bool ModuleTab::isOffered()
 
 bool ModuleTab::stopJob()
 {
-    if (interface_ == nullptr)
+    QtButton* const button = interface_ != nullptr ? interface_->stopButton() : nullptr;
+    if (button == nullptr)
         return false;
-    for (const std::string_view name : contract::outlet::actions) {
-        QtButton* const button = interface_->button(name);
-        if (button != nullptr && button->action() == contract::selector::stop &&
-            button->isEnabled()) {
-            button->press();
-            return true;
-        }
-    }
-    return false;
+    button->press();
+    return true;
 }
 
 void ModuleTabs::load(const std::vector<std::filesystem::path>& bundles,
