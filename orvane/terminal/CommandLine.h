@@ -39,7 +39,9 @@ enum class Command {
     Unmount,
     Eject,
     Attach,
-    Detach
+    Detach,
+    Show,
+    Modules
 };
 
 enum class Coloring { Auto, Always, Never };
@@ -48,6 +50,8 @@ enum class Coloring { Auto, Always, Never };
 struct Request {
     Command command = Command::List;
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
+    std::string module;         ///< to be shown
+    std::string pressedButton;  ///< of it; empty for none
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool isHTML = false;               ///< a report
