@@ -26,8 +26,8 @@ endfunction()
 # orvane_add_module(TARGET NAME name SOURCES file...
 #                   [RESOURCES file...] [CATALOGUES directory] [TABLE table])
 #
-# Builds modules/NAME.ovmodule below the build directory, and installs it where the programs look for
-# modules. The library exports OVModuleEntry() alone (contract/support/ModuleEntry.h) and must not
+# Builds modules/NAME.ovmodule below the build directory (or NAME.ovmodule in ORVANE_MODULE_DIRECTORY,
+# where that is set), and installs it where the programs look for modules. The library exports OVModuleEntry() alone (contract/support/ModuleEntry.h) and must not
 # need anything that is not there when it is loaded.
 #
 # RESOURCES   interface files (*.ui) and whatever else the module's Bundle is asked for
@@ -41,7 +41,11 @@ function(orvane_add_module target)
     if(NOT module_TABLE)
         set(module_TABLE ${module_NAME})
     endif()
-    set(bundle ${CMAKE_BINARY_DIR}/modules/${module_NAME}.ovmodule)
+    set(directory ${CMAKE_BINARY_DIR}/modules)
+    if(ORVANE_MODULE_DIRECTORY)
+        set(directory ${ORVANE_MODULE_DIRECTORY})
+    endif()
+    set(bundle ${directory}/${module_NAME}.ovmodule)
 
     add_library(${target} MODULE ${module_SOURCES})
     target_link_libraries(${target} PRIVATE

@@ -74,6 +74,7 @@ void JobWatch::lockChanged(bool isLocked)
 void JobWatch::begin()
 {
     job_ = {at_.tabs.lastAction(), disks_.selected()};
+    job_.isCheck = at_.tabs.lastActionIsCheck();
     // What the modules see as selected when the window is locked is what the job works on.
     disks_.hold(at_.controller.allSelectedItemsFilterDuplicates(false, true));
 }
@@ -172,6 +173,7 @@ void JobWatch::stopAsked()
 void JobWatch::end()
 {
     wakefulness_.release();
+    at_.tabs.forgetAction();
     showProgress(std::nullopt);
     at_.host.imageAttachment().resumeAttachments();
     const auto length = std::chrono::steady_clock::now() - job_.start;
@@ -191,7 +193,7 @@ void JobWatch::lookBack()
         return;  // the next job has begun
     disks_.release();
     at_.controller.setSelection({});
-    const bool isGivenUp = job_.isStopAsked || closer_.isEnding();
+    const bool isGivenUp = job_.isStopAsked || closer_.isEnding() || !job_.isCheck;
     auto sentences = isGivenUp ? std::vector<std::string>() : keepUnreachedImages();
     if (job_.hasFailed && !job_.isStopAsked && sentences.empty() && job_.reached.empty())
         sentences.push_back(text("Nothing that is selected could be checked."));

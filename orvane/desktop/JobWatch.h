@@ -71,6 +71,7 @@ private:
         std::vector<FinishedRun> runs = {};
         bool isStopAsked = false;
         bool hasFailed = false;  ///< by the module's own report
+        bool isCheck = true;     ///< else a module does something of its own
     };
 
     const SessionParts at_;

@@ -8,6 +8,7 @@
 #include <QLabel>
 
 #include <algorithm>
+#include <array>
 
 namespace orvane::desktop {
 
@@ -82,17 +83,11 @@ bool ModuleTab::isOffered()
 
 bool ModuleTab::stopJob()
 {
-    if (interface_ == nullptr)
+    QtButton* const button = interface_ != nullptr ? interface_->stopButton() : nullptr;
+    if (button == nullptr)
         return false;
-    for (const std::string_view name : contract::outlet::actions) {
-        QtButton* const button = interface_->button(name);
-        if (button != nullptr && button->action() == contract::selector::stop &&
-            button->isEnabled()) {
-            button->press();
-            return true;
-        }
-    }
-    return false;
+    button->press();
+    return true;
 }
 
 void ModuleTabs::load(const std::vector<std::filesystem::path>& bundles,
@@ -140,7 +135,9 @@ void ModuleTabs::add(std::unique_ptr<ModuleTab> tab)
         tab->interface()->setMayPerform([this](std::string_view action) {
             if (mayPerform_ && !mayPerform_(action))
                 return false;
-            lastAction_ = action;
+            // What is pressed while a job runs, begins none.
+            if (!controller_.interfaceLock())
+                lastAction_ = action;
             return true;
         });
     if (tab->interface() != nullptr && tab->interface()->outlinePeer() != nullptr)
@@ -195,6 +192,16 @@ void ModuleTabs::stopHarder()
         stopHostJob_();
     for (const auto& tab : tabs_)
         tab->stopHarder();
+}
+
+bool ModuleTabs::lastActionIsCheck() const
+{
+    namespace selector = contract::selector;
+    static constexpr std::array own{std::string_view(), selector::verifyDisk, selector::repairDisk,
+                                    selector::verifyPermissions, selector::repairPermissions,
+                                    selector::showDetails, selector::clearHistory, selector::help,
+                                    selector::deleteSelected};
+    return std::ranges::find(own, lastAction_) != own.end();
 }
 
 LoadedInterface* ModuleTabs::interface()

@@ -119,8 +119,11 @@ public:
     std::string selectedLogHTML();
     std::string selectedLogText();
 
-    /// The selector that a module performed last.
+    /// The selector that a module performed last, with the window free; empty behind its job.
     const std::string& lastAction() const { return lastAction_; }
+    void forgetAction() { lastAction_.clear(); }
+    /// It was none of another module's, which does no checks.
+    bool lastActionIsCheck() const;
 
 private:
     void add(std::unique_ptr<ModuleTab> tab);

@@ -28,9 +28,12 @@ void WindowCloser::askWhetherToStop()
     const Translator& texts = at_.host.translator();
     question_ = ask(
         at_.window,
-        {"closingQuestion", texts.text("A disk is still being verified or repaired."),
-         texts.text("The job must be stopped before the window can be closed. A repair that is "
-                    "stopped may leave damage behind."),
+        {"closingQuestion",
+         texts.text(isCheck() ? "A disk is still being verified or repaired."
+                              : "A job is still running."),
+         texts.text(isCheck() ? "The job must be stopped before the window can be closed. A repair "
+                                "that is stopped may leave damage behind."
+                              : "The job must be stopped before the window can be closed."),
          {{texts.text("Stop and Quit"), [this] { stopAndClose(); }}},
          texts.text("Keep Open")});
 }
@@ -43,9 +46,14 @@ void WindowCloser::stopAndClose()
     at_.host.mainRunLoop().post([this] {
         if (!at_.controller.interfaceLock())
             at_.window.close();
-        else if (at_.ledger.currentRun() != nullptr)
+        else if (at_.ledger.currentRun() != nullptr || !isCheck())
             at_.tabs.stopJob();
     });
+}
+
+bool WindowCloser::isCheck() const
+{
+    return at_.ledger.currentRun() != nullptr || at_.tabs.lastActionIsCheck();
 }
 
 void WindowCloser::end()

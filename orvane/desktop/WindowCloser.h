@@ -34,6 +34,7 @@ public:
 
 private:
     void askWhetherToStop();
+    bool isCheck() const;
 
     const SessionParts at_;
     const std::function<void()> closed_;

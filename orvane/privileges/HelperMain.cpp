@@ -105,7 +105,7 @@ int run(const std::vector<std::string>& arguments)
     const auto noEnvironment = [](std::string_view) {
         return std::optional<std::string>();
     };
-    if (const auto bundle = findCheckingModule(moduleDirectories(noEnvironment, program));
+    if (const auto bundle = findModule(moduleDirectories(noEnvironment, program), checkingModule);
         !bundle.empty())
         texts.setResultTexts(moduleTexts.emplace(bundle / "locale"));
     runHelperJob(*request, user, texts);

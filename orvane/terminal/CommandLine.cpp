@@ -19,7 +19,7 @@ struct CommandText {
     const char* text;
 };
 
-constexpr std::array<CommandText, 18> commandTexts{{
+constexpr std::array<CommandText, 20> commandTexts{{
     {Command::Verify, "verify", "Look for damage; write nothing"},
     {Command::Repair, "repair", "Repair what can be repaired, then verify again"},
     {Command::VerifyPermissions, "verify-permissions",
@@ -40,6 +40,8 @@ constexpr std::array<CommandText, 18> commandTexts{{
     {Command::Eject, "eject", "Unmount all of a drive, and give the medium back"},
     {Command::Attach, "attach", "Make image files devices of the system, and print their names"},
     {Command::Detach, "detach", "Unmount all of an attached image, and take it off its device"},
+    {Command::Show, "show", "Show what another module says of disks, and press its buttons"},
+    {Command::Modules, "modules", "List the modules that are found, and why one is refused"},
     {Command::Help, "help", "Explain a command or a topic, or list both"},
 }};
 
@@ -186,8 +188,19 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request,
     CLI::App& command = *app.add_subcommand(text.name, texts.text(text.text));
     command.callback([&request, chosen = text.command] { request.command = chosen; });
     command.fallthrough();
-    if (text.command == Command::Notify)
+    if (text.command == Command::Notify || text.command == Command::Modules)
         return;
+    if (text.command == Command::Show) {
+        command.add_option("MODULE", request.module,
+                           texts.text("The module, as “fixwell modules” names it"))
+            ->type_name("")
+            ->required();
+        command
+            .add_option("--press", request.pressedButton,
+                        texts.text("Press this button of the module, and wait until its work is "
+                                   "done"))
+            ->type_name("BUTTON");
+    }
     const bool takesImages = text.command == Command::Attach;
     if (text.command == Command::Help)
         command.add_option("TOPIC", request.topic, texts.text("A command, or a page of the manual"))

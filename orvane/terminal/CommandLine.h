@@ -41,6 +41,8 @@ enum class Command {
     Eject,
     Attach,
     Detach,
+    Show,
+    Modules,
     Help,
     Version
 };
@@ -53,6 +55,8 @@ struct Request {
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
     std::string topic;               ///< of the help; empty: what topics there are
     bool wantsUsage = false;         ///< instead: the command line as a whole (--help)
+    std::string module;         ///< to be shown
+    std::string pressedButton;  ///< of it; empty for none
     bool attachesReadOnly = false;
     bool clearsHistory = false;
     bool isHTML = false;               ///< a report

@@ -27,6 +27,11 @@ int runUndo(const Request& request, Session& session, Reporter& reporter);
 int runDiskAction(const Request& request, Session& session, Reporter& reporter);
 int runAttach(const Request& request, Session& session, Reporter& reporter);
 
+/// Exit status 0 unless a disk was not found, or the button could not be pressed.
+int runShow(const Request& request, Session& session, Reporter& reporter);
+/// Of those that are found; one that cannot be used adds exitUnchecked.
+int runModules(Session& session, Reporter& reporter);
+
 /// Why the button cannot be pressed for the selected disk: that its drive is failing, the module's
 /// reason, or that there is none to be had.
 std::string unavailableReason(Session& session, const TerminalButton& button, const Disk& disk);

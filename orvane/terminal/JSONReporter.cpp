@@ -141,6 +141,28 @@ public:
         flush();
     }
 
+    void shown(const ModuleView& view) override
+    {
+        ordered_json texts = ordered_json::object();
+        for (const auto& [name, text] : view.texts)
+            texts[name] = text;
+        ordered_json buttons = ordered_json::object();
+        for (const ActionLine& button : view.buttons)
+            buttons[button.command] = {{"title", button.title},
+                                       {"available", button.isAvailable},
+                                       {"reason", textOrNull(button.reason)}};
+        write({{"event", "shown"}, {"module", view.module}, {"texts", texts}, {"buttons", buttons}});
+        flush();
+    }
+
+    void found(const ModuleLine& module) override
+    {
+        write({{"event", "module"},
+               {"module", module.name},
+               {"path", module.path},
+               {"refusal", textOrNull(module.refusal)}});
+    }
+
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override
     {
         for (const RunLine& run : runs)

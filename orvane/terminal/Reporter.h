@@ -57,6 +57,21 @@ struct RunLine {
     std::string record = {};  ///< of what the repair overwrote, where it can be undone; mostly empty
 };
 
+/// What a module shows of the selected disks.
+struct ModuleView {
+    std::string module;  ///< its name, as the command line takes it
+    std::string title;
+    std::vector<std::pair<std::string, std::string>> texts;  ///< by the names of its controls
+    std::vector<ActionLine> buttons;  ///< what --press takes
+};
+
+/// One module of `fixwell modules`.
+struct ModuleLine {
+    std::string name;
+    std::string path;
+    std::string refusal;  ///< why it cannot be used; empty when it can
+};
+
 /// What the user called each disk. A volume inside an image is called by the image's name and
 /// its number: "backup.img#2".
 class GivenNames {
@@ -110,6 +125,8 @@ public:
     /// that came of it, or empty.
     virtual void done(const std::string& disk, std::string_view action, const std::string& place,
                       const std::string& sentence) = 0;
+    virtual void shown(const ModuleView& view) = 0;
+    virtual void found(const ModuleLine& module) = 0;
     /// All runs of a disk, oldest first; its records follow.
     virtual void runs(const std::string& disk, const std::vector<RunLine>& runs) = 0;
     /// The last call. NO when some of the output could not be written.

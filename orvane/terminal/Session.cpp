@@ -2,7 +2,6 @@
 #include "orvane/terminal/Session.h"
 
 #include "orvane/support/DiskLookup.h"
-#include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "orvane/terminal/TerminalText.h"
 #include "pellar/texts/ErrorTexts.h"
@@ -152,7 +151,7 @@ const RepairRecords& Session::repairRecords()
     return *repairRecords_;
 }
 
-void Session::trace(std::string_view line)
+void Session::trace(std::string_view line) const
 {
     if (tracesCommands_)
         reporter_.warning(std::string(line));
@@ -184,21 +183,35 @@ void Session::expectPassword()
         agent_ = PasswordAgent::start();
 }
 
-Result<void, Failure> Session::loadModule()
+std::vector<std::filesystem::path> Session::moduleDirectories() const
 {
-    const auto bundle = findCheckingModule(
-        moduleDirectories(environmentValue, runningExecutable(),
-                          [this](const std::string& sentence) { trace(sentence); }));
+    return orvane::moduleDirectories(environmentValue, runningExecutable(),
+                                     [this](const std::string& sentence) { trace(sentence); });
+}
+
+contract::OVDiskPointer Session::workingDisk() const
+{
+    return window_.selection().empty() ? nullptr : window_.selection().front();
+}
+
+Result<void, Failure> Session::loadModule(std::string_view name)
+{
+    const auto bundle = findModule(moduleDirectories(), name);
     if (bundle.empty())
-        return Failure{texts().text("cannot find ‘Fixwell.ovmodule’: no module directory holds it")};
+        return Failure{texts().sentence("cannot find ‘%@’: no module directory holds it",
+                                        {std::string(name) + ".ovmodule"})};
     auto loaded = orvane::loadModule(bundle);
     if (!loaded)
         return loaded.error();
     loaded_ = *std::move(loaded);
     libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
     if (!shouldRun(loaded_, host_))
-        return Failure{texts().text("cannot use ‘Fixwell’: it is switched off in the settings "
-                                    "(OVModule_FXW)")};
+        return Failure{
+            isChecking()
+                ? texts().text("cannot use ‘Fixwell’: it is switched off in the settings "
+                               "(OVModule_FXW)")
+                : texts().sentence("cannot use ‘%@’: it says that it does not run here",
+                                   {loaded_.name})};
     auto made = makeModule(loaded_, host_, *this);
     if (!made)
         return made.error();

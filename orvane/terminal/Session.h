@@ -9,6 +9,7 @@
 #include "orvane/jobs/RepairRecords.h"
 #include "orvane/privileges/LibraryOptions.h"
 #include "orvane/support/modules/ModuleLoader.h"
+#include "orvane/support/modules/ModuleSearch.h"
 #include "orvane/support/systemd/CheckTimers.h"
 #include "orvane/terminal/CommandLine.h"
 #include "orvane/terminal/PasswordAgent.h"
@@ -57,8 +58,8 @@ public:
     Session& operator=(const Session&) = delete;
     ~Session() override;
 
-    /// Loads the module; a sentence when that fails.
-    [[nodiscard]] Result<void, Failure> loadModule();
+    /// Loads the module of this name; a sentence when that fails. Once.
+    [[nodiscard]] Result<void, Failure> loadModule(std::string_view name = checkingModule);
 
     /// The disks that the user means; their later rows and events go by these names. One that
     /// cannot be found is reported, and adds exitUnchecked to `status`. `meant` is asked what a
@@ -73,6 +74,10 @@ public:
     /// What a click on these disks in a list would do.
     void select(const std::vector<DiskPointer>& disks);
     TerminalButton& button(std::string_view outlet) { return interface_.button(outlet); }
+    const TerminalInterface& interface() const { return interface_; }
+    const contract::OVModule& module() const { return *module_; }
+    /// Where modules are looked for.
+    std::vector<std::filesystem::path> moduleDirectories() const;
     /// Presses the button, and returns when the job is over or was declined.
     void pressAndWait(TerminalButton& button);
     /// Does what no module knows, and returns when it is over; how it ended.
@@ -98,7 +103,7 @@ public:
 private:
     bool isActiveTab() const override { return true; }
     contract::OVWindowController& windowController() override { return window_; }
-    contract::OVDiskPointer workingDisk() const override { return nullptr; }
+    contract::OVDiskPointer workingDisk() const override;
     contract::Window& window() override { return window_; }
     contract::Bundle& bundle() override { return *loaded_.bundle; }
     contract::PLManager& pl() override { return library_; }
@@ -107,7 +112,8 @@ private:
     pellar::JobOptions libraryOptions(const Request& request);
     TerminalWindow::Events windowEvents();
     RepairAdvice repairAdvice() const;
-    void trace(std::string_view line);
+    void trace(std::string_view line) const;
+    bool isChecking() const { return loaded_.name == checkingModule; }
     Asking asking();
     [[nodiscard]] Result<DiskPointer, Failure> findDisk(const std::string& name);
     void follow(const contract::DiskReferencePointer& disk);

@@ -121,19 +121,17 @@ void Session::interrupt()
 
 bool Session::pressStop()
 {
-    return !currentDisk_.empty() &&
-           std::any_of(contract::outlet::actions.begin(), contract::outlet::actions.end(),
-                       [this](std::string_view outlet) {
-                           TerminalButton& candidate = button(outlet);
-                           return candidate.action() == contract::selector::stop &&
-                                  interface_.press(candidate);
-                       });
+    // What another module does is known by its button alone: it runs no job of the library's.
+    if (currentDisk_.empty() && isChecking())
+        return false;
+    TerminalButton* const stop = interface_.stopButton();
+    return stop != nullptr && interface_.press(*stop);
 }
 
 TerminalWindow::Events Session::windowEvents()
 {
     return {[this] {
-                if (ledger_.currentRun() != nullptr)
+                if (ledger_.currentRun() != nullptr || !isChecking())
                     reporter_.progress(currentDisk_, window_.percent(), window_.status());
             },
             [this](const contract::Dictionary& report) {

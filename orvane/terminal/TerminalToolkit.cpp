@@ -3,6 +3,8 @@
 
 #include "contract/toolkit/ControlNames.h"
 
+#include <algorithm>
+
 namespace orvane {
 namespace {
 
@@ -27,14 +29,15 @@ bool TerminalInterface::loadInterface(std::string_view /*name*/, contract::Inter
 
 void TerminalInterface::connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner)
 {
+    names_.emplace_back(outlet.name);
     if (auto* const button = std::get_if<contract::Button**>(&outlet.place)) {
         TerminalButton& made = buttons_[std::string(outlet.name)];
         made.setAction(actionInFile(outlet.name));
         **button = &made;
     } else if (auto* const field = std::get_if<contract::TextField**>(&outlet.place)) {
-        **field = &textField_;
+        **field = &textFields_[names_.back()];
     } else if (auto* const view = std::get_if<contract::TextView**>(&outlet.place)) {
-        **view = &textView_;
+        **view = &textViews_[names_.back()];
     } else {
         outlineView_ = owner.makeOutlineView(contract::messageOutlineViewClass, logView_);
         if (!outlineView_)
@@ -55,6 +58,37 @@ TerminalButton& TerminalInterface::button(std::string_view outlet)
 {
     const auto found = buttons_.find(outlet);
     return found == buttons_.end() ? missingButton_ : found->second;
+}
+
+TerminalButton* TerminalInterface::stopButton()
+{
+    const auto found = std::ranges::find_if(buttons_, [](const auto& named) {
+        return named.second.action() == contract::selector::stop && named.second.isEnabled();
+    });
+    return found == buttons_.end() ? nullptr : &found->second;
+}
+
+std::vector<std::pair<std::string, std::string>> TerminalInterface::texts() const
+{
+    std::vector<std::pair<std::string, std::string>> texts;
+    for (const std::string& name : names_) {
+        const auto field = textFields_.find(name);
+        const auto view = textViews_.find(name);
+        if (field != textFields_.end())
+            texts.emplace_back(name, field->second.text());
+        else if (view != textViews_.end())
+            texts.emplace_back(name, view->second.text());
+    }
+    return texts;
+}
+
+std::vector<std::pair<std::string, const TerminalButton*>> TerminalInterface::buttons() const
+{
+    std::vector<std::pair<std::string, const TerminalButton*>> buttons;
+    for (const std::string& name : names_)
+        if (const auto found = buttons_.find(name); found != buttons_.end())
+            buttons.emplace_back(name, &found->second);
+    return buttons;
 }
 
 bool TerminalInterface::press(TerminalButton& button)

@@ -12,6 +12,8 @@
 #include <optional>
 #include <string>
 #include <string_view>
+#include <utility>
+#include <vector>
 
 namespace orvane {
 
@@ -42,23 +44,35 @@ private:
     std::int64_t tag_ = 0;
 };
 
-/// The instructions beside the log; a terminal has its help instead.
+/// Text beside the controls. That of the checking module, beside its log, is not shown: a terminal
+/// has its help instead.
 class TerminalTextField final : public contract::TextField {
 public:
     void setNeedsDisplay(bool /*needsDisplay*/) override {}
     void setEnabled(bool isEnabled) override { isEnabled_ = isEnabled; }
     bool isEnabled() const override { return isEnabled_; }
     void setToolTip(std::string_view /*text*/) override {}
-    void setAttributedStringValue(const contract::StyledText& /*text*/) override {}
+    void setAttributedStringValue(const contract::StyledText& text) override
+    {
+        text_ = text.characters();
+    }
+
+    const std::string& text() const { return text_; }
 
 private:
     bool isEnabled_ = true;
+    std::string text_;
 };
 
 class TerminalTextView final : public contract::TextView {
 public:
     void setNeedsDisplay(bool /*needsDisplay*/) override {}
-    void setString(std::string_view /*text*/) override {}
+    void setString(std::string_view text) override { text_ = text; }
+
+    const std::string& text() const { return text_; }
+
+private:
+    std::string text_;
 };
 
 /// What a window is to a module, for a program that has none: a selection, progress and a status
@@ -72,6 +86,7 @@ public:
 
     void setEvents(Events events) { events_ = std::move(events); }
     void select(std::vector<contract::OVDiskPointer> disks) { selection_ = std::move(disks); }
+    const std::vector<contract::OVDiskPointer>& selection() const { return selection_; }
     /// From 0 to 100; none while there is no telling.
     std::optional<double> percent() const
     {
@@ -138,16 +153,23 @@ public:
     TerminalButton& button(std::string_view outlet);
     /// Sends the button's action to the module, as a click would; NO when the button is disabled.
     bool press(TerminalButton& button);
+    /// The button that stops the module's job now; none when there is none that can be pressed.
+    TerminalButton* stopButton();
+
+    /// What the module shows, by the names of its outlets, in their order: all but the log's rows.
+    std::vector<std::pair<std::string, std::string>> texts() const;
+    std::vector<std::pair<std::string, const TerminalButton*>> buttons() const;
 
 private:
     void connect(const contract::Outlet& outlet, contract::InterfaceOwner& owner);
 
     LogView& logView_;
     contract::InterfaceOwner* owner_ = nullptr;
+    std::vector<std::string> names_;  ///< of the outlets
     std::map<std::string, TerminalButton, std::less<>> buttons_;
     TerminalButton missingButton_;
-    TerminalTextField textField_;
-    TerminalTextView textView_;
+    std::map<std::string, TerminalTextField, std::less<>> textFields_;
+    std::map<std::string, TerminalTextView, std::less<>> textViews_;
     std::unique_ptr<contract::OutlineView> outlineView_;
 };
 

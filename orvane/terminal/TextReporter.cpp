@@ -155,6 +155,28 @@ public:
         flush();
     }
 
+    void shown(const ModuleView& view) override
+    {
+        write(bold(view.title) + "\n");
+        for (const auto& [name, text] : view.texts)
+            if (!text.empty())
+                write("\n" + safeLines(text) + (text.ends_with('\n') ? "" : "\n"));
+        write(view.buttons.empty() ? "" : "\n");
+        for (const ActionLine& button : view.buttons)
+            write(contract::printable(
+                      fmt::format("--press {:<16} {:<24} {}", button.command, button.title,
+                                  button.isAvailable ? sentence("available", {}) : button.reason)) +
+                  "\n");
+        flush();
+    }
+
+    void found(const ModuleLine& module) override
+    {
+        write(bold(module.name) + "  " + contract::printable(module.path) + "\n");
+        if (!module.refusal.empty())
+            write("    " + contract::printable(module.refusal) + "\n");
+    }
+
     void runs(const std::string& disk, const std::vector<RunLine>& runs) override
     {
         endLine();

@@ -60,9 +60,12 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
         case Command::Report: return runReport(request, session);
         case Command::Metrics: return runMetrics(request, session, reporter);
         case Command::Notify: return runNotify(session, reporter);
+        case Command::Modules: return runModules(session, reporter);
         default: break;  // what needs the module
     }
-    if (const auto loaded = session.loadModule(); !loaded) {
+    const bool isShow = request.command == Command::Show;
+    if (const auto loaded = isShow ? session.loadModule(request.module) : session.loadModule();
+        !loaded) {
         reporter.warning(loaded.error().message);
         return exitUnchecked;
     }
@@ -71,6 +74,7 @@ int carryOut(const Request& request, Session& session, Reporter& reporter)
         case Command::ScheduledCheck: return runScheduledCheck(request, session, reporter);
         case Command::Undo:
         case Command::Finish: return runUndo(request, session, reporter);
+        case Command::Show: return runShow(request, session, reporter);
         case Command::History: return runHistory(request, session, reporter);
         default: return runCheck(request, session, reporter);
     }

@@ -180,6 +180,7 @@ const Tool& fsckExfat()
         .repairName = name,
         .package = "exfatprogs",
         .banner = "exfatprogs version : ",
+        .version = {{"-V"}, "exfatprogs version : "},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<ExfatOutput>,

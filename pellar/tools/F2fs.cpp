@@ -130,6 +130,7 @@ const Tool& fsckF2fs()
         .repairName = name,
         .package = "f2fs-tools",
         .habits = {.logReplayedAs = "f2fs"},
+        .version = {{"-V"}, "fsck.f2fs "},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<F2fsOutput>,

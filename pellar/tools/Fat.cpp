@@ -295,6 +295,8 @@ const Tool& fsckFat()
                    .collectedMany = "no damage is left; lost parts were made into %1$@ files "
                                     "(FSCK0000.REC and so on)"},
         .banner = "fsck.fat ",
+        // It has no option for this, and says it before it finds that the device is none.
+        .version = {{"-n", "/dev/null"}, "fsck.fat "},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<FatOutput>,

@@ -66,6 +66,12 @@ struct CollectedFilesReading {
     std::optional<CollectedFile> (*fileIn)(std::string_view line);
 };
 
+/// How a tool is asked for its version, where no disk is to be looked at.
+struct VersionQuestion {
+    std::vector<std::string> arguments = {};  ///< none: it cannot be asked
+    std::string_view banner = {};             ///< what stands before it in the answer
+};
+
 /// A checking tool: what it can do, how it is called, how it answers. The functions keep nothing;
 /// any thread.
 struct Tool {
@@ -77,6 +83,7 @@ struct Tool {
     ToolHabits habits = {};
     /// What stands before its version in one of its first lines; empty where it does not say it.
     std::string_view banner = {};
+    VersionQuestion version = {};
 
     /// Reads the disk a little; never writes.
     VolumeFacts (*examine)(int disk, std::uint64_t offset, std::uint64_t availableBytes);

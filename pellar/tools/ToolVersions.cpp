@@ -4,33 +4,8 @@
 #include "pellar/tools/ToolOutput.h"
 #include "pellar/tools/ToolTable.h"
 
-#include <algorithm>
-#include <array>
-
 namespace pellar {
 namespace {
-
-/// How a tool tells its version, and what stands before it in that line.
-struct VersionReading {
-    std::string_view name;
-    std::vector<std::string> arguments;
-    std::string_view banner;
-};
-
-const auto& readings()
-{
-    static const std::array table{
-        VersionReading{"e2fsck", {"-V"}, "e2fsck "},
-        // It has no option for this, and says it before it finds that the device is none.
-        VersionReading{"fsck.fat", {"-n", "/dev/null"}, "fsck.fat "},
-        VersionReading{"fsck.exfat", {"-V"}, "exfatprogs version : "},
-        VersionReading{"ntfsresize", {"--version"}, "ntfsresize v"},
-        VersionReading{"xfs_repair", {"-V"}, "xfs_repair version "},
-        VersionReading{"btrfs", {"--version"}, "btrfs-progs v"},
-        VersionReading{"fsck.f2fs", {"-V"}, "fsck.f2fs "},
-    };
-    return table;
-}
 
 class VersionListener final : public RunListener {
 public:
@@ -52,15 +27,15 @@ private:
     const std::string_view banner_;
 };
 
-std::string versionOf(const VersionReading& reading, const std::filesystem::path& program,
+std::string versionOf(const VersionQuestion& question, const std::filesystem::path& program,
                       StopSwitch& stop)
 {
     RunRequest request;
-    request.command = {program, reading.arguments};
+    request.command = {program, question.arguments};
     request.limits = {100, 64U << 10U};
     request.silenceLimit = std::chrono::seconds(2);
     request.graceTimes = graceTimesFor(Access::ReadOnly);
-    VersionListener listener(reading.banner);
+    VersionListener listener(question.banner);
     static_cast<void>(runTool(request, stop, listener));
     return listener.version;
 }
@@ -74,9 +49,8 @@ std::vector<InstalledTool> installedTools(std::string_view toolPath, StopSwitch&
         InstalledTool found{tool->name, tool->package};
         const auto program = findProgram(tool->name, toolPath);
         found.isInstalled = !program.empty();
-        const auto reading = std::ranges::find(readings(), tool->name, &VersionReading::name);
-        if (found.isInstalled && reading != readings().end())
-            found.version = versionOf(*reading, program, stop);
+        if (found.isInstalled && !tool->version.arguments.empty())
+            found.version = versionOf(tool->version, program, stop);
         tools.push_back(std::move(found));
     }
     return tools;

@@ -257,6 +257,7 @@ const Tool& xfsRepair()
         .repairName = name,
         .package = "xfsprogs",
         .habits = {.logReplayedAs = "xfs"},
+        .version = {{"-V"}, "xfs_repair version "},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<XfsOutput>,

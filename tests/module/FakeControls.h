@@ -38,12 +38,16 @@ struct FakeButton final : FakeControl<Button> {
 };
 
 struct FakeTextField final : FakeControl<TextField> {
-    void setAttributedStringValue(const StyledText&) override {}
+    std::string text;
+
+    void setAttributedStringValue(const StyledText& value) override { text = value.characters(); }
 };
 
 struct FakeTextView final : TextView {
+    std::string text;
+
     void setNeedsDisplay(bool) override {}
-    void setString(std::string_view) override {}
+    void setString(std::string_view value) override { text = value; }
 };
 
 struct FakeScroller final : Scroller {

@@ -142,7 +142,8 @@ bool FakeHost::loadInterface(std::string_view /*name*/, InterfaceOwner& interfac
     if (hasInterfaceFile) {
         outlinePeer.delegate = owner->outlineViewDelegate();
         outlineView = owner->makeOutlineView("OVFXWMessageOutlineView", outlinePeer);
-        outlineView->setDataSource(outlinePeer.delegate);
+        if (outlineView)
+            outlineView->setDataSource(outlinePeer.delegate);
         const auto connect = [this](const Outlet& outlet) {
             if (auto* const button = std::get_if<Button**>(&outlet.place))
                 **button = &buttons[std::string(outlet.name)];

@@ -111,9 +111,9 @@ TEST(ModuleSearch, TheCheckingModuleIsNotTheFirstThereIs)
     const TestDirectory directory;
     const std::vector<fs::path> directories{directory / "mine", directory / "system"};
     fs::create_directories(directory / "mine/Another.ovmodule");
-    EXPECT_EQ(findCheckingModule(directories), fs::path());
+    EXPECT_EQ(findModule(directories, checkingModule), fs::path());
     fs::create_directories(directory / "system/Fixwell.ovmodule");
-    EXPECT_EQ(findCheckingModule(directories), directory / "system/Fixwell.ovmodule");
+    EXPECT_EQ(findModule(directories, checkingModule), directory / "system/Fixwell.ovmodule");
 }
 
 }  // namespace

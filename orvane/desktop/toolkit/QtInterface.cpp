@@ -385,6 +385,14 @@ QtButton* LoadedInterface::button(std::string_view name)
     return found == buttons_.end() ? nullptr : found->second.get();
 }
 
+QtButton* LoadedInterface::stopButton()
+{
+    const auto found = std::ranges::find_if(buttons_, [](const auto& named) {
+        return named.second->action() == contract::selector::stop && named.second->isEnabled();
+    });
+    return found == buttons_.end() ? nullptr : found->second.get();
+}
+
 void LoadedInterface::disconnect()
 {
     owner_ = nullptr;

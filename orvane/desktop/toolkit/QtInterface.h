@@ -37,6 +37,8 @@ public:
     QWidget& widget() { return *root_; }
     /// None when the file has no button of that name.
     QtButton* button(std::string_view name);
+    /// The one that stops the module's job now; none when there is none that can be pressed.
+    QtButton* stopButton();
     /// Asked before the module performs an action of the user's; where it answers NO, nothing
     /// happens.
     void setMayPerform(std::function<bool(std::string_view action)> asked)

@@ -75,10 +75,10 @@ std::vector<fs::path> findModuleBundles(const std::vector<fs::path>& directories
     return bundles;
 }
 
-fs::path findCheckingModule(const std::vector<fs::path>& directories)
+fs::path findModule(const std::vector<fs::path>& directories, std::string_view name)
 {
     const auto bundles = findModuleBundles(directories);
-    const auto found = std::ranges::find(bundles, "Fixwell.ovmodule", &fs::path::filename);
+    const auto found = std::ranges::find(bundles, name, &fs::path::stem);
     return found == bundles.end() ? fs::path() : *found;
 }
 

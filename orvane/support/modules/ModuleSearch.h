@@ -6,6 +6,7 @@
 
 #include <filesystem>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace orvane {
@@ -32,9 +33,11 @@ namespace orvane {
 [[nodiscard]] std::vector<std::filesystem::path> findModuleBundles(
     const std::vector<std::filesystem::path>& directories);
 
-/// The bundle of the module that checks disks, whatever other modules are installed; empty when it
-/// is not there.
-[[nodiscard]] std::filesystem::path findCheckingModule(
-    const std::vector<std::filesystem::path>& directories);
+/// The module that checks disks, whatever other modules are installed.
+inline constexpr std::string_view checkingModule = "Fixwell";
+
+/// The bundle of the module of that name; empty when it is not there.
+[[nodiscard]] std::filesystem::path findModule(
+    const std::vector<std::filesystem::path>& directories, std::string_view name);
 
 }  // namespace orvane

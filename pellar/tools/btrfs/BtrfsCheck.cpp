@@ -203,6 +203,7 @@ const Tool& btrfsCheck()
              "volume and make this one anew",
              {},
              {}},
+        .version = {{"--version"}, "btrfs-progs v"},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<BtrfsOutput>,

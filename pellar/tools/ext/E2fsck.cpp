@@ -172,6 +172,7 @@ const Tool& e2fsck()
                    .endsInOrder = true,
                    .logReplayedAs = {}},
         .banner = "e2fsck ",
+        .version = {{"-V"}, "e2fsck "},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<E2fsckOutput>,

@@ -179,6 +179,7 @@ const Tool& ntfs()
         .repairName = repairName,
         .package = "ntfs-3g",
         .banner = "ntfsresize v",
+        .version = {{"--version"}, "ntfsresize v"},
         .examine = examine,
         .arguments = arguments,
         .makeReader = readerFor<NtfsOutput>,

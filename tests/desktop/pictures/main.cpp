@@ -6,6 +6,7 @@
 #include "orvane/support/texts/Language.h"
 #include "tests/desktop/WindowFixture.h"
 #include "tests/support/InterruptedRepair.h"
+#include "tests/support/LoopDevice.h"
 #include "tests/support/TestDirectory.h"
 
 #include <QApplication>
@@ -16,6 +17,7 @@
 #include <QTabWidget>
 #include <QTest>
 
+#include <sys/mount.h>
 #include <unistd.h>
 
 #include <cstdlib>
@@ -230,6 +232,46 @@ TEST_F(Pictures, OfTheListOfDisks)
     command("filterDisks").trigger();
     QTest::qWait(100);
     takePicture("-small-filter");
+}
+
+// A volume that is really mounted, as only root can have one.
+TEST_F(Pictures, OfTwoModules)
+{
+    if (const char* const obstacle = orvane::test::LoopDevice::obstacle())
+        GTEST_SKIP() << obstacle;
+    const orvane::test::LoopDevice device(
+        directory_.makeExt("stick", 256 << 20, {"-L", "Holidays"}));
+    const std::filesystem::path place = directory_ / "Holidays";
+    std::filesystem::create_directory(place);
+    if (::mount(device.name().c_str(), place.c_str(), "ext4", 0, nullptr) != 0)
+        GTEST_SKIP() << "a loop device cannot be mounted here";
+    const auto unmounted = std::shared_ptr<void>(nullptr, [place](void*) { ::umount(place.c_str()); });
+    for (const auto& [name, kibibytes] : {std::pair{"Pictures/2025/one.raw", 91'000},
+                                          std::pair{"Pictures/2026/two.raw", 31'000},
+                                          std::pair{"Films/film.mkv", 41'500},
+                                          std::pair{"Letters/letter.odt", 120},
+                                          std::pair{"list.txt", 3}})
+        orvane::test::write(place / name,
+                            std::string(static_cast<std::size_t>(kibibytes) << 10U, 'x'));
+    SessionOptions wanted = options({});
+    wanted.moduleDirectories.insert(wanted.moduleDirectories.begin(), EXAMPLE_MODULES);
+    openWith(std::move(wanted));
+    window().resize(1180, 600);
+    window().splitter().setSizes({420, 760});
+    DiskTree stick = machine()[1];
+    stick.children[0].facts.name = stick.children[0].facts.label = "Holidays";
+    stick.children[0].facts.filesystem = "ext4";
+    stick.children[0].facts.length = 256 << 20;
+    stick.children[0].facts.mountPoint = place;
+    session().host().sharedDiskController().synchronize({machine()[0], stick});
+    select("/dev/sda1");
+    window().tabs().setCurrentIndex(1);
+    QTest::qWait(50);
+    takePicture("-modules-before");
+    button("measureButton").press();
+    EXPECT_TRUE(waitUntil([this] { return button("measureButton").action() == "measure:"; }));
+    QTest::qWait(100);
+    takePicture("-modules");
 }
 
 TEST_F(Pictures, OfAJobInTheList)
