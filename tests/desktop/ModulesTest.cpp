@@ -34,15 +34,20 @@ protected:
         })) << "an image is known with what is in it";
         ASSERT_EQ(window().tabs().count(), 2);
         orvane::test::write(directory_ / "mounted/Pictures/one", std::string(200 << 10, 'x'));
-        DiskTree stick;
-        stick.facts.identifier = stick.facts.path = stick.facts.name = volume;
-        stick.facts.type = diskType::volume;
-        stick.facts.filesystem = "ext4";
-        stick.facts.length = 1 << 30;
-        stick.facts.mountPoint = directory_ / "mounted";
-        session().host().sharedDiskController().synchronize({stick});
+        addVolume(volume, directory_ / "mounted");
         select(volume);
         show(usageTab);
+    }
+    void addVolume(const char* node, const fs::path& mountPoint)
+    {
+        DiskTree tree;
+        tree.facts.identifier = tree.facts.path = tree.facts.name = node;
+        tree.facts.type = diskType::volume;
+        tree.facts.filesystem = "ext4";
+        tree.facts.length = 1 << 30;
+        tree.facts.mountPoint = mountPoint;
+        volumes_.push_back(tree);
+        session().host().sharedDiskController().synchronize(volumes_);
     }
     void show(int tab) { window().tabs().setCurrentIndex(tab); }
     std::string usage()
@@ -56,19 +61,23 @@ protected:
     }
 
     std::string image_;
+    std::vector<DiskTree> volumes_;
 };
 
 TEST_F(ModulesTest, EachTabWorksOnWhatIsSelected)
 {
     openBoth();
     EXPECT_NE(usage().find("mounted at"), std::string::npos) << usage();
+    window().disks().setFocus();
+    command("selectAll").trigger();
+    EXPECT_NE(usage().find("not attached"), std::string::npos) << usage();
     measureButton().press();
     ASSERT_TRUE(waitUntilFree());
     EXPECT_NE(usage().find("Pictures/"), std::string::npos) << usage();
     // What another module has done is no check that did not come about.
     QTest::qWait(50);
     EXPECT_EQ(sheet(), nullptr) << takeSheet();
-    EXPECT_EQ(verdict(volume), "");
+    EXPECT_EQ(verdict(image_), "");
 
     window().disks().clearSelection();
     EXPECT_FALSE(measureButton().isEnabled());
@@ -97,6 +106,9 @@ TEST_F(ModulesTest, AMeasurementHasTheWindowToItselfAndIsStoppedFromEitherTab)
         EXPECT_EQ(measureButton().reason(), "It is being stopped.");
         ASSERT_TRUE(waitUntilFree());
     }
+    // So much lies there that it cannot have been counted when the question is answered.
+    addVolume("/dev/no-such-root", "/");
+    select("/dev/no-such-root");
     show(usageTab);
     measureButton().press();
     window().close();
@@ -104,6 +116,7 @@ TEST_F(ModulesTest, AMeasurementHasTheWindowToItselfAndIsStoppedFromEitherTab)
     EXPECT_EQ(sheet()->text(), "A job is still running.") << "it is no check";
     press(*sheet(), "Stop and Quit");
     EXPECT_TRUE(waitUntil([this] { return wasClosed_; }));
+    EXPECT_NE(usage().find("Stopped after"), std::string::npos) << usage();
 }
 
 TEST_F(ModulesTest, ACheckGoesOnWhileTheOtherTabIsShown)
