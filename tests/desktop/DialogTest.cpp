@@ -21,6 +21,7 @@
 #include <QRadioButton>
 #include <QStandardPaths>
 #include <QTableWidget>
+#include <QTest>
 
 namespace orvane::desktop::test {
 namespace {

@@ -12,6 +12,7 @@
 #include "pellar/probe/DiskProbe.h"
 
 #include <QCheckBox>
+#include <QCoreApplication>
 #include <QMenu>
 #include <QPushButton>
 

@@ -8,6 +8,7 @@
 
 #include <QEvent>
 #include <QPainter>
+#include <QStyle>
 #include <QVBoxLayout>
 
 #include <algorithm>

@@ -8,6 +8,7 @@
 #include <array>
 #include <charconv>
 #include <optional>
+#include <utility>
 
 namespace orvane::manual {
 namespace {

@@ -3,6 +3,7 @@
 #include "orvane/terminal/manual/Document.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace orvane::manual {
 namespace {

@@ -5,6 +5,7 @@
 #include "orvane/support/texts/TextColumns.h"
 
 #include <algorithm>
+#include <utility>
 
 namespace orvane::manual {
 namespace {
