@@ -2,6 +2,7 @@
 #include "orvane/desktop/toolkit/QtInterface.h"
 
 #include "contract/toolkit/ControlNames.h"
+#include "orvane/desktop/toolkit/FittingLayout.h"
 #include "orvane/desktop/toolkit/LogTable.h"
 #include "orvane/desktop/toolkit/Text.h"
 
@@ -17,7 +18,6 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <utility>
 #include <variant>
 
 namespace orvane::desktop {
@@ -92,122 +92,6 @@ std::unique_ptr<QWidget> loadInterfaceFile(const std::filesystem::path& file,
         translate(*widget, texts);
     return root;
 }
-
-/// Keeps the first pane of a split view as high as the text that scrolls in it, and no higher than
-/// it may be, until the user moves the divider: how small the pane may become is for that. Belongs to
-/// the split view, which outlives it.
-class FittingPane final : public QObject {
-public:
-    /// `text` lies in the first pane.
-    FittingPane(QSplitter& splitter, QScrollArea& text)
-        : QObject(&splitter), splitter_(splitter), text_(text)
-    {
-        text.installEventFilter(this);
-        text.widget()->installEventFilter(this);
-        least_ = splitter.widget(0)->minimumHeight();
-        connect(&splitter, &QSplitter::splitterMoved, this, [this] {
-            if (!std::exchange(wasMoved_, true))
-                splitter_.widget(0)->setMinimumHeight(least_);
-        });
-    }
-
-protected:
-    bool eventFilter(QObject* /*watched*/, QEvent* event) override
-    {
-        // The height that is needed depends on the width, and on the text and its font.
-        if (event->type() == QEvent::Resize || event->type() == QEvent::LayoutRequest)
-            fit();
-        return false;
-    }
-
-private:
-    void fit()
-    {
-        const QList<int> sizes = splitter_.sizes();
-        // Giving the pane another height is a reason to ask again.
-        if (wasMoved_ || isFitting_ || sizes.size() < 2 || !splitter_.isVisible())
-            return;
-        // Before they are laid out, the text is higher than the pane that it lies in.
-        const int beside = std::max(0, splitter_.widget(0)->height() - text_.viewport()->height());
-        const int wanted = text_.widget()->heightForWidth(text_.viewport()->width()) + beside;
-        QWidget& pane = *splitter_.widget(0);
-        const int height = std::min(wanted, pane.maximumHeight());
-        isFitting_ = true;
-        pane.setMinimumHeight(std::min(least_, height));
-        if (height != sizes[0])
-            splitter_.setSizes({height, sizes[0] + sizes[1] - height});
-        isFitting_ = false;
-    }
-
-    QSplitter& splitter_;
-    QScrollArea& text_;
-    int least_ = 0;
-    bool wasMoved_ = false;
-    bool isFitting_ = false;
-};
-
-/// Keeps the buttons of a grid in one row where they have room for it, and in two where not. Belongs
-/// to the page, which outlives it.
-class FittingButtons final : public QObject {
-public:
-    /// `actions` lie in the grid by columns, as in the interface file; `beside` stands at the end.
-    FittingButtons(QWidget& page, QGridLayout& grid, std::vector<QWidget*> actions, QWidget* beside)
-        : QObject(&page), page_(page), grid_(grid), actions_(std::move(actions)), beside_(beside)
-    {
-        page.installEventFilter(this);
-        for (QWidget* const button : actions_)
-            button->installEventFilter(this);
-    }
-
-protected:
-    bool eventFilter(QObject* /*watched*/, QEvent* event) override
-    {
-        // A button's title is another while a job runs.
-        if (event->type() == QEvent::Resize || event->type() == QEvent::LayoutRequest)
-            fit();
-        return false;
-    }
-
-private:
-    void fit()
-    {
-        int widest = 0;
-        for (const QWidget* const button : actions_)
-            widest = std::max(widest, button->sizeHint().width());
-        const auto count = static_cast<int>(actions_.size());
-        const int spacing = grid_.horizontalSpacing();
-        const int needed = count * (widest + spacing) +
-                           (beside_ != nullptr ? beside_->sizeHint().width() : 0);
-        const QMargins margins = page_.layout()->contentsMargins();
-        const int room = page_.width() - margins.left() - margins.right();
-        const int rows = needed <= room ? 1 : 2;
-        // One row must not keep the window from being made too narrow for it.
-        const int least = rows == 1 ? widest / 2 : 0;
-        if (std::exchange(least_, least) != least)
-            for (QWidget* const button : actions_)
-                button->setMinimumWidth(least);
-        if (std::exchange(rows_, rows) != rows)
-            place(rows);
-    }
-    void place(int rows)
-    {
-        const auto count = static_cast<int>(actions_.size());
-        const int columns = (count + rows - 1) / rows;
-        for (int i = 0; i < count; ++i)
-            grid_.addWidget(actions_[static_cast<std::size_t>(i)], i % rows, i / rows);
-        if (beside_ != nullptr)
-            grid_.addWidget(beside_, 0, columns);
-        for (int column = 0; column <= count; ++column)
-            grid_.setColumnStretch(column, column < columns ? 1 : 0);
-    }
-
-    QWidget& page_;
-    QGridLayout& grid_;
-    std::vector<QWidget*> actions_;
-    QWidget* beside_;
-    int rows_ = 2;
-    int least_ = 0;
-};
 
 QGridLayout* gridOf(const QWidget& page, QWidget& widget)
 {
