@@ -154,11 +154,12 @@ Pager::Pager(pid_t id, FileDescriptor input)
 Pager::~Pager()
 {
     std::fflush(stdout);
-    giveBack(STDOUT_FILENO, outputBefore);
-    giveBack(STDERR_FILENO, errorsBefore);
-    // While the user reads, a key that interrupts is the pager's alone.
+    // While the user reads, a key that interrupts is the pager's alone. It may be pressed as soon as the
+    // pager sees the end.
     for (const int signal : endingSignals)
         handle(signal, SIG_IGN);
+    giveBack(STDOUT_FILENO, outputBefore);
+    giveBack(STDERR_FILENO, errorsBefore);
     waitForPager();
     for (const int signal : endingSignals)
         handle(signal, SIG_DFL);
