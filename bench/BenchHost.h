@@ -26,6 +26,8 @@ class SilentReporter final : public Reporter {
     void failure(const std::string&, const std::string&) override {}
     void warning(const std::string&) override {}
     void listed(const DiskLine&) override {}
+    void shown(const ModuleView&) override {}
+    void found(const ModuleLine&) override {}
     void done(const std::string&, std::string_view, const std::string&, const std::string&) override
     {
     }
