@@ -3,39 +3,53 @@
 
 #include "contract/foundation/Storage.h"
 
+#include <algorithm>
+#include <cstddef>
+#include <iterator>
 #include <memory>
-#include <new>
 #include <utility>
 
 namespace contract {
 
 Dictionary::Storage::~Storage()
 {
-    std::destroy_n(entries, count);
-    if (capacity != inlineEntries)
-        ::operator delete(entries);
+    if (hasMany)
+        std::destroy_at(&many);
+    else
+        std::destroy_n(few, fewCount);
+}
+
+std::span<Dictionary::Entry> Dictionary::Storage::entries() noexcept
+{
+    return hasMany ? std::span<Entry>(many) : std::span<Entry>(few, fewCount);
 }
 
 void Dictionary::Storage::append(Name key, Value value)
 {
-    if (count == capacity) {
-        auto* const larger =
-            static_cast<Entry*>(::operator new (2 * std::size_t{capacity} * sizeof(Entry)));
-        std::uninitialized_move_n(entries, count, larger);
-        std::destroy_n(entries, count);
-        if (capacity != inlineEntries)
-            ::operator delete(entries);
-        entries = larger;
-        capacity *= 2;
+    if (!hasMany && fewCount < mostFew) {
+        std::construct_at(few + fewCount, key, std::move(value));
+        ++fewCount;
+        return;
     }
-    new (entries + count) Entry{key, std::move(value)};
-    ++count;
+    if (!hasMany) {
+        std::vector<Entry> moved;
+        moved.reserve(2 * mostFew);
+        moved.assign(std::move_iterator(few), std::move_iterator(few + fewCount));
+        std::destroy_n(few, fewCount);
+        std::construct_at(&many, std::move(moved));
+        hasMany = true;
+    }
+    many.push_back({key, std::move(value)});
 }
 
-void Dictionary::Storage::removeAt(std::uint32_t index) noexcept
+void Dictionary::Storage::removeAt(std::size_t index) noexcept
 {
-    std::move(entries + index + 1, entries + count, entries + index);
-    std::destroy_at(entries + --count);
+    if (hasMany) {
+        many.erase(many.begin() + static_cast<std::ptrdiff_t>(index));
+        return;
+    }
+    std::move(few + index + 1, few + fewCount, few + index);
+    std::destroy_at(few + --fewCount);
 }
 
 Dictionary::Storage* Dictionary::storage() const noexcept
@@ -45,6 +59,8 @@ Dictionary::Storage* Dictionary::storage() const noexcept
 
 Dictionary Dictionary::make()
 {
+    // A log holds millions: a pointer more would cost sixteen bytes.
+    static_assert(sizeof(Storage) == sizeof(Node) + Storage::mostFew * sizeof(Entry));
     return Dictionary(NodePointer<Node>::adopting(new Storage));
 }
 
@@ -69,7 +85,7 @@ std::span<const Dictionary::Entry> Dictionary::entries() const noexcept
 {
     if (!node_)
         return {};
-    return {storage()->entries, storage()->count};
+    return storage()->entries();
 }
 
 const Dictionary::Entry* Dictionary::find(Name key) const noexcept
@@ -118,7 +134,7 @@ void Dictionary::set(Name key, Value value) const
 void Dictionary::remove(Name key) const
 {
     if (const Entry* const entry = find(key))
-        storage()->removeAt(static_cast<std::uint32_t>(entry - storage()->entries));
+        storage()->removeAt(static_cast<std::size_t>(entry - entries().data()));
 }
 
 }  // namespace contract

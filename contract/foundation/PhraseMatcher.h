@@ -14,9 +14,9 @@ namespace contract {
 /// Finds which of a few phrases occurs in a line, whatever the case of the letters, in one pass
 /// over the line's bytes and without allocating.
 ///
-/// Case is ignored for the letters of ASCII, Latin-1, Latin Extended-A, modern and Coptic Greek, and
-/// Cyrillic (U+0400 to U+04FF) in UTF-8; other characters, and bytes that are no UTF-8, match themselves alone. An empty phrase
-/// never occurs.
+/// Case is ignored for the letters of ASCII, Latin-1, Latin Extended-A, modern and Coptic Greek,
+/// and Cyrillic (U+0400 to U+04FF) in UTF-8; other characters, and bytes that are no UTF-8, match
+/// themselves alone. An empty phrase never occurs.
 ///
 /// It is an automaton after Aho and Corasick ("Efficient string matching: an aid to
 /// bibliographic search", 1975) over classes of bytes.

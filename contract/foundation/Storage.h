@@ -7,9 +7,12 @@
 #include "contract/foundation/Dictionary.h"
 #include "contract/foundation/StyledText.h"
 
-#include <array>
+#include <cstddef>
+#include <cstdint>
 #include <memory>
+#include <span>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace contract {
@@ -47,29 +50,59 @@ struct Array::Storage : Node {
     std::vector<Value> values;
 };
 
+/// A few entries lie in the node itself, more in a vector in their place.
 struct Dictionary::Storage : Node {
-    static constexpr std::uint32_t inlineEntries = 4;
+    static constexpr std::size_t mostFew = 4;
 
     Storage() : Node(Kind::Dictionary) {}
     ~Storage();
 
-    Entry* begin() noexcept { return entries; }
+    std::span<Entry> entries() noexcept;
     void append(Name key, Value value);
-    void removeAt(std::uint32_t index) noexcept;
+    void removeAt(std::size_t index) noexcept;
 
-    Entry* entries = reinterpret_cast<Entry*>(room);
-    std::uint32_t count = 0;
-    std::uint32_t capacity = inlineEntries;
-    alignas(Entry) std::byte room[inlineEntries * sizeof(Entry)];
+    bool hasMany = false;
+    std::uint8_t fewCount = 0;
+    union {
+        Entry few[mostFew];
+        std::vector<Entry> many;
+    };
 };
 
+/// The characters follow the node in the same piece of memory. A text that does not fit there, or
+/// not any more, or that has several styles, moves to a place of its own.
 struct StyledText::Storage : Node {
-    Storage(std::string_view t, const TextStyle* s) : Node(Kind::StyledText), style(s), text(t) {}
-    Storage(const Storage& other);
+    struct Moved {
+        std::string text;
+        std::vector<Run> runs;  ///< only when there are two styles or more
+        const TextStyle* style;
+    };
 
-    const TextStyle* style;                  ///< of the whole text, or of its first run
-    std::unique_ptr<std::vector<Run>> runs;  ///< only when there are two styles or more
-    std::string text;
+    static Storage* make(std::string_view text, const TextStyle* style);
+    static void destroy(Storage* storage) noexcept;
+
+    std::string_view text() const noexcept;
+    bool hasRuns() const noexcept { return hasMoved && !moved->runs.empty(); }
+    /// Of the whole text, or of its first run.
+    const TextStyle* style() const noexcept { return hasMoved ? moved->style : ownStyle; }
+    void setStyle(const TextStyle* style) noexcept;
+    /// Of the two, runs are added first.
+    void addRuns(const std::vector<Run>& added);
+    void addText(std::string_view characters);
+    Moved& moveOut();
+
+    bool hasMoved : 1 = false;
+    std::uint8_t room : 7 = 0;  ///< bytes behind the characters that an addition may take
+    std::uint16_t length = 0;
+    union {
+        const TextStyle* ownStyle;
+        Moved* moved;
+    };
+
+private:
+    explicit Storage(const TextStyle* style) : Node(Kind::StyledText), ownStyle(style) {}
+    const char* characters() const noexcept { return reinterpret_cast<const char*>(this + 1); }
+    char* characters() noexcept { return reinterpret_cast<char*>(this + 1); }
 };
 
 }  // namespace contract

@@ -6,9 +6,14 @@
 
 #include <algorithm>
 #include <atomic>
+#include <cstddef>
 #include <cstdint>
 #include <deque>
+#include <limits>
+#include <memory>
 #include <mutex>
+#include <new>
+#include <utility>
 #include <vector>
 
 namespace contract {
@@ -40,12 +45,87 @@ TextStyle TextStyle::with(const TextStyle& other) const
             other.paragraph ? other.paragraph : paragraph};
 }
 
-StyledText::Storage::Storage(const Storage& other)
-    : Node(Kind::StyledText),
-      style(other.style),
-      runs(other.runs ? std::make_unique<std::vector<Run>>(*other.runs) : nullptr),
-      text(other.text)
+namespace {
+
+// What the allocator would round up to anyway is room for an addition: most lines get an end.
+constexpr std::size_t roundedSize(std::size_t size)
 {
+    constexpr std::size_t step = 16;
+    constexpr std::size_t head = sizeof(std::size_t);  // the allocator's own
+    return (size + head + step - 1) / step * step - head;
+}
+
+}  // namespace
+
+StyledText::Storage* StyledText::Storage::make(std::string_view text, const TextStyle* style)
+{
+    // A log holds millions: a field more would cost sixteen bytes.
+    static_assert(sizeof(Storage) == 16);
+    constexpr std::size_t mostRoom = 0x7F;
+    const bool fits = text.size() <= std::numeric_limits<std::uint16_t>::max() - mostRoom;
+    const std::string_view here = fits ? text : std::string_view();
+    const std::size_t size = roundedSize(sizeof(Storage) + here.size() + 1);
+    auto* const storage = new (::operator new(size)) Storage(style);
+    here.copy(storage->characters(), here.size());
+    storage->length = static_cast<std::uint16_t>(here.size());
+    storage->room = static_cast<std::uint8_t>(size - sizeof(Storage) - here.size()) & mostRoom;
+    if (!fits)
+        storage->addText(text);
+    return storage;
+}
+
+void StyledText::Storage::destroy(Storage* storage) noexcept
+{
+    if (storage->hasMoved)
+        delete storage->moved;
+    std::destroy_at(storage);
+    ::operator delete(storage);
+}
+
+std::string_view StyledText::Storage::text() const noexcept
+{
+    if (hasMoved)
+        return moved->text;
+    return {characters(), length};
+}
+
+void StyledText::Storage::setStyle(const TextStyle* style) noexcept
+{
+    (hasMoved ? moved->style : ownStyle) = style;
+}
+
+void StyledText::Storage::addRuns(const std::vector<Run>& added)
+{
+    std::vector<Run>& runs = moveOut().runs;
+    if (runs.empty() && !text().empty())
+        runs.push_back({text().size(), style()});
+    for (const Run& run : added) {
+        if (!runs.empty() && runs.back().style == run.style)
+            runs.back().length += run.length;
+        else
+            runs.push_back(run);
+    }
+}
+
+// What is added may be a part of this text.
+void StyledText::Storage::addText(std::string_view added)
+{
+    if (hasMoved || added.size() > room) {
+        moveOut().text.append(added);
+        return;
+    }
+    added.copy(characters() + length, added.size());
+    length = static_cast<std::uint16_t>(length + added.size());
+    room = static_cast<std::uint8_t>(room - added.size()) & 0x7FU;
+}
+
+StyledText::Storage::Moved& StyledText::Storage::moveOut()
+{
+    if (!hasMoved) {
+        moved = new Moved{std::string(text()), {}, ownStyle};
+        hasMoved = true;
+    }
+    return *moved;
 }
 
 StyledText::Storage* StyledText::storage() const noexcept
@@ -55,72 +135,64 @@ StyledText::Storage* StyledText::storage() const noexcept
 
 StyledText StyledText::make(std::string_view characters, const TextStyle& style)
 {
-    return StyledText(NodePointer<Node>::adopting(new Storage(characters, interned(style))));
+    return StyledText(NodePointer<Node>::adopting(Storage::make(characters, interned(style))));
 }
 
 StyledText StyledText::copy() const
 {
-    return node_ ? StyledText(NodePointer<Node>::adopting(new Storage(*storage()))) : StyledText();
+    StyledText copy;
+    if (node_)
+        copy = StyledText(
+            NodePointer<Node>::adopting(Storage::make(storage()->text(), storage()->style())));
+    if (node_ && storage()->hasRuns())
+        copy.storage()->moveOut().runs = storage()->moved->runs;
+    return copy;
 }
 
 std::string_view StyledText::characters() const noexcept
 {
-    return node_ ? std::string_view(storage()->text) : std::string_view();
+    return node_ ? storage()->text() : std::string_view();
 }
 
 std::vector<StyledText::Run> StyledText::runs() const
 {
     if (isEmpty())
         return {};
-    return storage()->runs ? *storage()->runs
-                           : std::vector<Run>{{storage()->text.size(), storage()->style}};
+    return storage()->hasRuns() ? storage()->moved->runs
+                                : std::vector<Run>{{storage()->text().size(), storage()->style()}};
 }
 
 const TextStyle& StyledText::style() const noexcept
 {
     static const TextStyle plain;
-    return node_ ? *storage()->style : plain;
+    return node_ ? *storage()->style() : plain;
 }
 
 void StyledText::append(std::string_view characters) const
 {
-    storage()->text += characters;
-    if (storage()->runs)
-        storage()->runs->back().length += characters.size();
+    if (storage()->hasRuns())
+        storage()->moved->runs.back().length += characters.size();
+    storage()->addText(characters);
 }
 
 void StyledText::append(const StyledText& other) const
 {
     if (other.isEmpty())
         return;
-    if (isEmpty()) {
-        storage()->text = other.characters();
-        storage()->style = other.storage()->style;
-        storage()->runs = other.storage()->runs
-                              ? std::make_unique<std::vector<Run>>(*other.storage()->runs)
-                              : nullptr;
-        return;
-    }
-    const bool isOneStyle =
-        !storage()->runs && !other.storage()->runs && storage()->style == other.storage()->style;
-    if (!isOneStyle) {
-        std::vector<Run> joined = runs();
-        for (const Run& run : other.runs()) {
-            if (joined.back().style == run.style)
-                joined.back().length += run.length;
-            else
-                joined.push_back(run);
-        }
-        storage()->runs = std::make_unique<std::vector<Run>>(std::move(joined));
-    }
-    storage()->text += std::string(other.characters());
+    if (isEmpty())
+        storage()->setStyle(other.storage()->style());
+    const bool isOneStyle = !storage()->hasRuns() && !other.storage()->hasRuns() &&
+                            storage()->style() == other.storage()->style();
+    if (!isOneStyle)
+        storage()->addRuns(other.runs());
+    storage()->addText(other.characters());
 }
 
 void StyledText::addAttributes(const TextStyle& style) const
 {
-    storage()->style = interned(storage()->style->with(style));
-    if (storage()->runs)
-        for (Run& run : *storage()->runs)
+    storage()->setStyle(interned(storage()->style()->with(style)));
+    if (storage()->hasRuns())
+        for (Run& run : storage()->moved->runs)
             run.style = interned(run.style->with(style));
 }
 

@@ -213,7 +213,9 @@ void Node::destroy(Node* node) noexcept
         case Kind::String: delete static_cast<StringNode*>(node); break;
         case Kind::Array: delete static_cast<Array::Storage*>(node); break;
         case Kind::Dictionary: delete static_cast<Dictionary::Storage*>(node); break;
-        case Kind::StyledText: delete static_cast<StyledText::Storage*>(node); break;
+        case Kind::StyledText:
+            StyledText::Storage::destroy(static_cast<StyledText::Storage*>(node));
+            break;
         case Kind::Object: delete static_cast<ObjectNode*>(node); break;
     }
 }

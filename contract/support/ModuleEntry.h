@@ -9,7 +9,7 @@ namespace contract {
 
 /// Grows by one whenever anything in `contract/` changes its shape or meaning. A host loads
 /// only modules of its own version, because they share classes, not merely functions.
-inline constexpr std::uint32_t moduleContractVersion = 2;
+inline constexpr std::uint32_t moduleContractVersion = 3;
 
 /// What a module's shared object exports. The contract version is read first, and nothing else
 /// when it is another one than the host's.

@@ -201,6 +201,26 @@ TEST(StyledTexts, JoinAndStyleTheirRuns)
     EXPECT_EQ(text.runs()[1].style->color, (Color{1, 0, 0, 1})) << "the other text is untouched";
 }
 
+TEST(StyledTexts, GrowAsStringsDo)
+{
+    for (const std::size_t size : {0, 1, 22, 23, 24, 65408, 65409, 65535, 65536}) {
+        std::string expected(size, 'x');
+        const StyledText text = StyledText::make(expected);
+        for (int i = 0; i < 40; ++i) {
+            text.append(i % 2 == 0 ? "\n" : "added");
+            expected += i % 2 == 0 ? "\n" : "added";
+            ASSERT_EQ(text.characters(), expected) << size << " bytes, addition " << i;
+        }
+        text.append(text.characters());
+        EXPECT_EQ(text.characters(), expected + expected) << size;
+        EXPECT_EQ(text.copy().characters(), text.characters()) << size;
+    }
+    const StyledText small = StyledText::make("twice");
+    small.append(small.characters());
+    small.append(small);
+    EXPECT_EQ(small.characters(), "twicetwicetwicetwice");
+}
+
 TEST(RichText, EscapesEverythingThatRTFWouldObey)
 {
     const StyledText text =
