@@ -15,6 +15,7 @@
 #include <chrono>
 #include <cmath>
 #include <thread>
+#include <utility>
 
 namespace orvane {
 namespace {
@@ -122,21 +123,25 @@ TEST_F(HistoryTest, TwoProgramsAddToOneVolume)
 {
     HistoryStore one = open();
     HistoryStore other = open();
-    for (int i = 0; i < 3; ++i) {
-        ASSERT_TRUE(one.append("v", lines(i, i + 1), 0));
-        ASSERT_TRUE(other.append("v", lines(i, i + 1), 0));
+    for (int i = 0; i < 60; i += 20) {
+        ASSERT_TRUE(one.append("v", lines(i, i + 10), 0));
+        ASSERT_TRUE(other.append("v", lines(i + 10, i + 20), 0));
     }
-    EXPECT_EQ(loaded(one, "v").size(), 6U);
+    EXPECT_EQ(exactly(loaded(one, "v")), exactly(lines(0, 60)));
+    EXPECT_EQ(one.recordsOf("v").size(), 60);
 }
 
 TEST_F(HistoryTest, OlderRunsAreDroppedWhole)
 {
     limits_ = {100};
     HistoryStore mine = open();
-    const Array run = lines(0, 29);
-    run.append(summary());
-    for (int i = 0; i < 4; ++i)
-        ASSERT_TRUE(mine.append("v", run, 0));
+    // Saved in portions that do not end where the runs do.
+    const Array all = Array::make();
+    std::size_t saved = 0;
+    for (int i = 0; i < 120; ++i) {
+        all.append(i % 30 < 29 ? line(i % 30) : summary());
+        ASSERT_TRUE(i % 7 != 6 || mine.append("v", all, std::exchange(saved, all.size())));
+    }
     const Array kept = loaded(mine, "v");
     EXPECT_LE(kept.size(), 100U);
     EXPECT_GE(kept.size(), 60U);
@@ -196,6 +201,24 @@ TEST_F(HistoryTest, DamageThatShowsOnlyLaterIsSetAsideAndEverythingSavedAgain)
     EXPECT_EQ(loaded(mine, histories.keyOf(disk_)).size(), 1U) << "saved again in the new database";
 }
 
+TEST_F(HistoryTest, APageThatMakesNoSenseIsDamage)
+{
+    for (const char* const page : {"substr(page, 1, length(page) - 1)", "x'0101'",
+                                   "x'ffffffffffffffffffffff'", "x'010000ffffffffffffffffff01'"}) {
+        const auto file = file_;
+        file_ = directory_ / ("state/" + std::to_string(warnings_.size()));
+        ASSERT_TRUE(open().append("v", lines(0, 100), 0));
+        ASSERT_TRUE(Database::open(file_).execute(
+            ("UPDATE records SET page = " + std::string(page)).c_str()));
+        HistoryStore mine = open();
+        const std::size_t warnings = warnings_.size();
+        EXPECT_LT(loaded(mine, "v").size(), 100U) << "what could still be read";
+        EXPECT_EQ(warnings_.size(), warnings + 1) << page;
+        EXPECT_TRUE(mine.append("v", lines(0, 2), 0) && loaded(mine, "v").size() == 2U) << page;
+        file_ = file;
+    }
+}
+
 TEST_F(HistoryTest, WhatCannotBeKeptHoldsInMemoryWithOneWarning)
 {
     test::write(directory_ / "file", "");
@@ -246,17 +269,26 @@ TEST_F(HistoryTest, AnEarlierDatabaseGetsTheColumnsItLacks)
         Database file = Database::open(file_);
         ASSERT_TRUE(file.execute(
             "ALTER TABLE runs DROP COLUMN tool; ALTER TABLE runs DROP COLUMN problemKinds;"
-            "ALTER TABLE runs DROP COLUMN losses;"
+            "ALTER TABLE runs DROP COLUMN losses; ALTER TABLE records DROP COLUMN page;"
+            "ALTER TABLE records DROP COLUMN pageRecords; PRAGMA user_version = 1;"
             "INSERT INTO volumes (key) VALUES ('v');"
             "INSERT INTO runs (volume, started, finished, action, verdict, error, message) "
-            "VALUES (1, 5, 6, 'verify', 'damaged', 7, 'why')"));
+            "VALUES (1, 5, 6, 'verify', 'damaged', 7, 'why');"
+            "INSERT INTO shapes (shape) VALUES ('[[\"fsck_message\", \"M\", null]]');"
+            "INSERT INTO records (id, shape, message, time) "
+            "VALUES ((1 << 36) + 7, 1, 'of an earlier program', 5)"));
     }
     const RunEnd end{"repaired", 0, "", "fsck.fat 4.2", 1, 1, true};
     {
         HistoryStore mine = open();
         mine.endRun(mine.beginRun("v", "verify", {}), end, {});
+        ASSERT_TRUE(mine.append("v", lines(0, 3), 0));
     }
-    const auto runs = open().runs("v");
+    HistoryStore mine = open();
+    ASSERT_EQ(loaded(mine, "v").size(), 4U);
+    EXPECT_EQ(loaded(mine, "v").front().dictionary().entries()[0].value,
+              Value("of an earlier program"));
+    const auto runs = mine.runs("v");
     ASSERT_EQ(runs.size(), 2U);
     EXPECT_EQ(runs[0].end, (RunEnd{"damaged", 7, "why"})) << "nothing is made up";
     EXPECT_EQ(runs[1].end, end);

@@ -18,7 +18,7 @@
 namespace orvane {
 namespace {
 
-constexpr std::int64_t layoutVersion = 1;
+constexpr std::int64_t layoutVersion = 2;
 
 // "Orvh" in ASCII: tells file(1) and us that the database is a history.
 constexpr const char* layout = R"(
@@ -28,13 +28,19 @@ constexpr const char* layout = R"(
     CREATE TABLE shapes (id INTEGER PRIMARY KEY, shape TEXT NOT NULL UNIQUE);
     CREATE TABLE records (id INTEGER PRIMARY KEY, shape INTEGER NOT NULL, type TEXT,
                           verbosity INTEGER, message TEXT, text TEXT, style INTEGER,
-                          time INTEGER NOT NULL, extra TEXT);
+                          time INTEGER NOT NULL, extra TEXT, pageRecords INTEGER, page BLOB);
     CREATE TABLE runs (id INTEGER PRIMARY KEY, volume INTEGER NOT NULL, started INTEGER NOT NULL,
                        finished INTEGER, action TEXT NOT NULL, verdict TEXT, error INTEGER,
                        message TEXT);
     CREATE INDEX runsOfVolume ON runs (volume, started);
-    PRAGMA user_version = 1;
+    PRAGMA user_version = 2;
 )";
+
+// A program of before would show the first record of a page alone.
+constexpr const char* fromFirstLayout =
+    "ALTER TABLE records ADD COLUMN pageRecords INTEGER;"
+    "ALTER TABLE records ADD COLUMN page BLOB;"
+    "PRAGMA user_version = 2";
 
 // The index finds where runs end without reading every record between. The table has the runs that
 // have no end yet, with the process that they are of.
@@ -106,18 +112,24 @@ bool addColumnsOfRuns(Database& database)
     return isDone && transaction.commit();
 }
 
-/// Another program may make the tables at the same time, hence the second look.
+/// Makes the tables, or makes those of an earlier program ours. Another program may be doing it,
+/// hence the second look.
+bool makeLayout(Database& database, std::int64_t& version)
+{
+    if (version >= layoutVersion)
+        return true;
+    Transaction transaction(database);
+    return transaction.hasBegun() && readVersion(database, version) &&
+           (version != 0 || database.execute(layout)) &&
+           (version != 1 || database.execute(fromFirstLayout)) && transaction.commit() &&
+           readVersion(database, version);
+}
+
 Condition makeReady(Database& database, std::string& reason)
 {
     std::int64_t version = 0;
-    bool isReady =
-        database.isOpen() && database.execute(settings) && readVersion(database, version);
-    if (isReady && version == 0) {
-        Transaction transaction(database);
-        isReady = transaction.hasBegun() && readVersion(database, version) &&
-                  (version != 0 || database.execute(layout)) && transaction.commit() &&
-                  readVersion(database, version);
-    }
+    bool isReady = database.isOpen() && database.execute(settings) &&
+                   readVersion(database, version) && makeLayout(database, version);
     isReady = isReady && database.execute(probe) &&
               (version != layoutVersion ||
                (database.execute(laterAdditions) && addColumnsOfRuns(database)));

@@ -17,7 +17,8 @@ namespace orvane {
 //   styles    the looks of text as JSON, interned
 //   shapes    which keys a record has, in which order, and where their values are, interned
 //   records   id = volume * 2^36 + number of the record within the volume, so a volume's records
-//             lie together in their order, and appending needs no index
+//             lie together in their order, and appending needs no index; records that were saved
+//             together follow the first of them on its page, and have the numbers behind its own
 //   runs      what was done with a volume and how it ended
 
 /// A history database that is ready for use, and whether it is kept in the file.

@@ -74,8 +74,13 @@ RecordRange HistoryStore::recordsOf(std::string_view key)
 
 void HistoryStore::load(RecordRange records, const Array& history, RecordTimes& times)
 {
-    if (records.size() > 0 && !tables_->records.read(records, history, times))
-        failedTo("read the history", lastMishap());
+    if (records.size() == 0 || tables_->records.read(records, history, times))
+        return;
+    // A page that makes no sense is none of SQLite's troubles.
+    const bool isDamage = database_.trouble() == Database::Trouble::None;
+    Mishap mishap = lastMishap();
+    mishap.isDamage = mishap.isDamage || isDamage;
+    failedTo("read the history", mishap);
 }
 
 bool HistoryStore::append(std::string_view key, const Array& history, std::size_t firstNew,

@@ -21,10 +21,9 @@ const Name originKey{"kOV_typeOfOutputKey"};
 const Name finalTextKey{"kOV_finalAttributedString_type"};
 const std::array<Value, 3> origins{Name{"kOV_typeOfOutput_string"}, Name{"kOV_typeOfOutput_dict"},
                                    Name{"kOV_typeOfOutput_OV_addition"}};
-const std::array<Name, 7> types{contract::kFsckVerify,  contract::kFsckRepair,
-                                contract::kFsckError,   contract::kFsckSuccess,
-                                contract::kFsckFail,    contract::kFsckProblem,
-                                contract::kFsckProgress};
+const std::array<Name, 7> types{
+    contract::kFsckVerify, contract::kFsckRepair,  contract::kFsckError,   contract::kFsckSuccess,
+    contract::kFsckFail,   contract::kFsckProblem, contract::kFsckProgress};
 
 bool isOrigin(const Value& value)
 {
@@ -142,7 +141,7 @@ std::optional<RecordShape> RecordShape::fromJSON(std::string_view text)
 RecordColumns columnsOf(const Dictionary& record, const RecordShape& shape, std::string& room)
 {
     RecordColumns columns;
-    nlohmann::json extras = nlohmann::json::array();
+    nlohmann::json extras;
     for (std::size_t i = 0; i < shape.entries.size(); ++i) {
         const Value& value = record.entries()[i].value;
         switch (shape.entries[i].slot) {
@@ -157,7 +156,9 @@ RecordColumns columnsOf(const Dictionary& record, const RecordShape& shape, std:
             case RecordSlot::Extra: extras.push_back(jsonFromValue(value)); break;
         }
     }
-    room = extras.empty() ? std::string() : extras.dump();
+    room.clear();
+    if (!extras.empty())
+        room = extras.dump();
     columns.extra = room;
     return columns;
 }

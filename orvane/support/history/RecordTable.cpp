@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "orvane/support/history/RecordTable.h"
 
+#include "contract/pellar/MessageKeys.h"
+
 #include <algorithm>
 
 namespace orvane {
@@ -9,6 +11,9 @@ namespace {
 // A volume's records have the numbers from `volume << recordBits` on.
 constexpr int recordBits = 36;
 constexpr std::int64_t noRecord = -1;
+
+// In one row; a history is also dropped by whole rows.
+constexpr std::size_t mostOfPage = 256;
 
 std::int64_t firstOf(std::int64_t volume)
 {
@@ -45,14 +50,15 @@ RecordTable::RecordTable(Database& database, std::int64_t mostOfVolume)
     : mostOfVolume_(mostOfVolume),
       vocabulary_(database),
       add_(database.prepare("INSERT INTO records (id, shape, type, verbosity, message, text, "
-                            "style, time, extra) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)")),
-      read_(
-          database.prepare("SELECT shape, type, verbosity, message, text, style, extra, time FROM "
-                           "records WHERE id >= ? AND id < ? ORDER BY id")),
+                            "style, time, extra, pageRecords, page) "
+                            "VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?, ?, ?)")),
+      read_(database.prepare("SELECT shape, type, verbosity, message, text, style, extra, time, "
+                             "page FROM records WHERE id >= ? AND id < ? ORDER BY id")),
       oldest_(
           database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id LIMIT 1")),
       newest_(database.prepare(
-          "SELECT id FROM records WHERE id >= ? AND id < ? ORDER BY id DESC LIMIT 1")),
+          "SELECT id + ifnull(pageRecords, 0) FROM records WHERE id >= ? AND id < ? "
+          "ORDER BY id DESC LIMIT 1")),
       // A summary record, of verbosity -2, closes a run.
       endOfRun_(database.prepare("SELECT id FROM records WHERE id >= ? AND id < ? AND "
                                  "verbosity = -2 ORDER BY id LIMIT 1")),
@@ -79,16 +85,47 @@ bool RecordTable::read(RecordRange records, const contract::Array& history, Reco
     read_.bind(2, records.end);
     Statement::Step step = Statement::Step::Done;
     while ((step = read_.step()) == Statement::Step::Row) {
-        const RecordShape& shape = vocabulary_.shape(read_.integer(0));
-        RecordColumns columns{read_.text(1), read_.integer(2), read_.text(3),
-                              read_.text(4), nullptr,          read_.text(6)};
-        if (!read_.isNothing(5))
-            columns.style = vocabulary_.style(read_.integer(5));
-        history.append(recordFrom(columns, shape));
+        take({read_.integer(0),
+              read_.integer(5),
+              {read_.text(1), read_.integer(2), read_.text(3), read_.text(4), nullptr,
+               read_.text(6)}},
+             history);
+        for (std::string_view page = read_.text(8); !page.empty();) {
+            const auto record = takeFromPage(page);
+            if (!record) {
+                read_.reset();
+                return false;
+            }
+            take(*record, history);
+        }
         times.add(history.size(), Time(std::chrono::milliseconds(read_.integer(7))));
     }
     return step == Statement::Step::Done;
 }
+
+void RecordTable::take(const NumberedColumns& record, const contract::Array& history)
+{
+    RecordColumns columns = record.columns;
+    if (record.style != 0)
+        columns.style = vocabulary_.style(record.style);
+    history.append(recordFrom(columns, vocabulary_.shape(record.shape)));
+}
+
+namespace {
+
+// A summary has a row of its own: there a run ends, and a statement looks for such rows.
+std::size_t recordsOfFirstPage(std::span<const contract::Value> records)
+{
+    const auto isSummary = [](const contract::Value& record) {
+        return record.dictionary().integer(contract::kFsckVerbosity) ==
+               contract::verbosity::summary;
+    };
+    const auto most = records.first(std::min(records.size(), mostOfPage));
+    const auto summary = std::find_if(most.begin(), most.end(), isSummary);
+    return std::max<std::size_t>(1, static_cast<std::size_t>(summary - most.begin()));
+}
+
+}  // namespace
 
 bool RecordTable::append(std::int64_t volume, const contract::Array& history, std::size_t firstNew,
                          const RecordTimes& times, Time now)
@@ -101,36 +138,63 @@ bool RecordTable::append(std::int64_t volume, const contract::Array& history, st
     std::int64_t id = behindNewest(volume);
     auto next = times.stretches.begin();
     std::int64_t time = milliseconds(now);
-    for (std::size_t i = firstNew; i < history.size(); ++i) {
+    for (std::size_t i = firstNew; i < history.size();) {
         for (; next != times.stretches.end() && next->first <= i; ++next)
             time = milliseconds(next->time);
-        if (!insert(id++, history.values()[i].dictionary(), time))
+        const std::size_t end = next != times.stretches.end() ? next->first : history.size();
+        const std::span together = std::span(history.values()).subspan(i, end - i);
+        const std::size_t count = recordsOfFirstPage(together);
+        if (!insert(id, together.first(count), time))
             return false;
+        id += static_cast<std::int64_t>(count);
+        i += count;
     }
     return true;
 }
 
-bool RecordTable::insert(std::int64_t id, const contract::Dictionary& record, std::int64_t time)
+std::optional<NumberedColumns> RecordTable::numbered(const contract::Value& record)
 {
-    const auto* const shape = vocabulary_.shapeOf(record);
+    const contract::Dictionary dictionary = record.dictionary();
+    const auto* const shape = vocabulary_.shapeOf(dictionary);
     if (shape == nullptr)
-        return false;
-    const RecordColumns columns = columnsOf(record, shape->shape, extraRoom_);
-    const std::int64_t style = columns.style != nullptr ? vocabulary_.numberOf(columns.style) : 0;
-    if (columns.style != nullptr && style == 0)
+        return std::nullopt;
+    NumberedColumns result{shape->number, 0, columnsOf(dictionary, shape->shape, extraRoom_)};
+    if (result.columns.style != nullptr)
+        result.style = vocabulary_.numberOf(result.columns.style);
+    const bool isWritten = result.columns.style == nullptr || result.style != 0;
+    return isWritten ? std::optional(result) : std::nullopt;
+}
+
+bool RecordTable::insert(std::int64_t id, std::span<const contract::Value> records,
+                         std::int64_t time)
+{
+    page_.clear();
+    for (const contract::Value& record : records.subspan(1)) {
+        const auto columns = numbered(record);
+        if (!columns)
+            return false;
+        addToPage(page_, *columns);
+    }
+    const auto first = numbered(records.front());
+    if (!first)
         return false;
     add_.bind(1, id);
-    add_.bind(2, shape->number);
-    bindText(add_, 3, columns.type);
-    add_.bind(4, columns.verbosity);
-    bindText(add_, 5, columns.message);
-    bindText(add_, 6, columns.text);
-    if (style != 0)
-        add_.bind(7, style);
+    add_.bind(2, first->shape);
+    bindText(add_, 3, first->columns.type);
+    add_.bind(4, first->columns.verbosity);
+    bindText(add_, 5, first->columns.message);
+    bindText(add_, 6, first->columns.text);
+    if (first->style != 0)
+        add_.bind(7, first->style);
     else
         add_.bindNothing(7);
     add_.bind(8, time);
-    bindText(add_, 9, columns.extra);
+    bindText(add_, 9, first->columns.extra);
+    if (page_.empty())
+        add_.bindNothing(10);
+    else
+        add_.bind(10, static_cast<std::int64_t>(records.size() - 1));
+    bindText(add_, 11, page_);
     return add_.run();
 }
 

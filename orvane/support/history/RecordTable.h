@@ -5,10 +5,13 @@
 #include "orvane/support/disks/DiskHistory.h"
 #include "orvane/support/history/Database.h"
 #include "orvane/support/history/RecordEncoding.h"
+#include "orvane/support/history/RecordPage.h"
 
 #include <chrono>
 #include <cstdint>
 #include <map>
+#include <optional>
+#include <span>
 #include <string>
 
 namespace orvane {
@@ -34,7 +37,7 @@ public:
 
     [[nodiscard]] RecordRange recordsOf(std::int64_t volume);
     /// Appends those of the records that are still there to the history, oldest first, and their
-    /// times to `times`.
+    /// times to `times`. Records that lie on one page are read together, with the first of them.
     [[nodiscard]] bool read(RecordRange records, const contract::Array& history,
                             RecordTimes& times);
     /// Appends the history's records from `firstNew` on to the volume's; where there are no
@@ -51,7 +54,9 @@ private:
     std::int64_t oldest(std::int64_t volume);
     std::int64_t behindNewest(std::int64_t volume);
     std::int64_t endOfRunAt(std::int64_t record, std::int64_t next);
-    bool insert(std::int64_t id, const contract::Dictionary& record, std::int64_t time);
+    bool insert(std::int64_t id, std::span<const contract::Value> records, std::int64_t time);
+    std::optional<NumberedColumns> numbered(const contract::Value& record);
+    void take(const NumberedColumns& record, const contract::Array& history);
     bool makeRoom(std::int64_t volume, std::int64_t added);
     bool dropSurplus(std::int64_t volume, std::int64_t most);
     bool remove(std::int64_t first, std::int64_t end);
@@ -62,6 +67,7 @@ private:
     /// Volumes with more records than they may have: up to where theirs are to be dropped.
     std::map<std::int64_t, std::int64_t> surplus_;
     std::string extraRoom_;
+    std::string page_;
 };
 
 }  // namespace orvane
