@@ -139,6 +139,9 @@ void Report::addChapters(const std::shared_ptr<Disk>& disk, ReportScope scope)
         chapters_, [&disk](const Chapter& chapter) { return chapter.disk == disk; });
     if (isKnown)
         return;
+    // The oldest records belong to it, too.
+    static_cast<void>(disk->fsckHistoryNoChildren());
+    host_.histories().loadAll();
     Chapter chapter{.disk = disk,
                     .runs = host_.historyStore().runs(host_.histories().keyOf(disk->facts())),
                     .records = disk->fsckHistoryNoChildren()};

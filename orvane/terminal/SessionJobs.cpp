@@ -100,6 +100,7 @@ RunEnd Session::carryOut(pellar::Task task, const DiskPointer& disk)
 void Session::writeAllRowsOf(const std::string& name)
 {
     currentDisk_ = name;
+    host_.histories().loadAll();
     logView_.writeAllRows();
 }
 

@@ -91,6 +91,9 @@ TerminalHost::TerminalHost(SupportOptions options, MainLoop& loop, TerminalInter
       alerts_(alerts),
       reporter_(reporter)
 {
+    // A check goes on from the newest ones; who shows a history has the others read.
+    constexpr std::int64_t newestRecords = 128;
+    histories().loadGradually([] {}, newestRecords);
     // Every volume of an image is there when the attachment has returned.
     threads().setAttachesSynchronously(true);
 }

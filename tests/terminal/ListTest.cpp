@@ -85,6 +85,11 @@ TEST_F(HistoryCommandTest, AReportTellsTheDiskAndItsRunsAndFailsWhereItCannotBeW
     EXPECT_TRUE(last.ends_with("</html>\n"));
     EXPECT_EQ(run({"report", "--json", "a"}).status, 16);
     EXPECT_EQ(run({"report", "nowhere"}).status, 8);
+
+    for (int times = 0; times < 16; ++times)
+        static_cast<void>(run({"verify", "a"}));
+    EXPECT_NE(run({"report", "a"}).output.find("needs to be repaired"), std::string::npos)
+        << "a check reads the newest records alone, a report all";
 }
 
 class DiskActionTest : public ProgramTest {

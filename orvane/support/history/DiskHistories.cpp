@@ -58,13 +58,6 @@ std::optional<Run> runBegunAt(const std::vector<RunStarts::Start>& starts, std::
     return found == runs.end() ? std::nullopt : std::optional(*found);
 }
 
-namespace {
-
-// A few milliseconds' worth; more than fits into a window.
-constexpr std::int64_t recordsAtOnce = 4000;
-
-}  // namespace
-
 std::string DiskHistories::keyOf(const DiskFacts& disk)
 {
     const auto& owner = identifiersOfUUIDs_.emplace(disk.uuid, disk.identifier).first->second;
@@ -83,8 +76,8 @@ DiskHistories::History& DiskHistories::find(const DiskFacts& disk)
 DiskHistories::History DiskHistories::load(const std::string& key)
 {
     const RecordRange all = store_.recordsOf(key);
-    const bool isGradual = isIncomplete_ && all.size() > recordsAtOnce;
-    const std::int64_t first = isGradual ? all.end - recordsAtOnce : all.next;
+    const bool isGradual = isIncomplete_ && all.size() > newestRecords_;
+    const std::int64_t first = isGradual ? all.end - newestRecords_ : all.next;
     History history;
     history.records = Array::make();
     store_.load({first, all.end}, history.records, history.times);

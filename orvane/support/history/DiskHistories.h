@@ -60,14 +60,19 @@ private:
 /// the newest ones alone, and the complete list when `loadMore` has read the others.
 class DiskHistories final : public HistoryKeeper {
 public:
+    /// A few milliseconds' worth; more than fits into a window.
+    static constexpr std::int64_t recordsAtOnce = 4000;
+
     /// The store must outlive this object.
     explicit DiskHistories(HistoryStore& store) : store_(store) {}
 
-    /// From now on long histories come in two steps. `isIncomplete` is called when one has begun
-    /// to; the caller must then call `loadMore` until it answers NO.
-    void loadGradually(std::function<void()> isIncomplete)
+    /// From now on histories of more than `newest` records come in two steps. `isIncomplete` is
+    /// called when one has begun to; the caller must then call `loadMore` until there is nothing
+    /// more, or do without the older ones.
+    void loadGradually(std::function<void()> isIncomplete, std::int64_t newest = recordsAtOnce)
     {
         isIncomplete_ = std::move(isIncomplete);
+        newestRecords_ = newest;
     }
     enum class Progress { Nothing, More, Completed };
     /// Reads for a few milliseconds. `Completed`: one of the lists is another now, and there may
@@ -160,6 +165,7 @@ private:
     std::map<std::string, History> histories_;               ///< by key
     std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it
     std::function<void()> isIncomplete_;
+    std::int64_t newestRecords_ = recordsAtOnce;
     bool remembersCleared_ = false;
     std::vector<Cleared> cleared_;  ///< the last one at the end
     std::uint64_t clearing_ = 0;    ///< which of them belong together
