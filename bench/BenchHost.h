@@ -13,7 +13,8 @@ namespace orvane::bench {
 /// Says nothing: what is measured ends before a reporter would begin.
 class SilentReporter final : public Reporter {
     void started(const std::string&, std::string_view, const std::string&) override {}
-    void record(const std::string&, const contract::Dictionary&, const contract::StyledText&) override
+    void record(const std::string&, const contract::Dictionary&,
+                const contract::StyledText&) override
     {
     }
     void rowsWritten() override {}

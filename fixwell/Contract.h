@@ -2,7 +2,8 @@
 #pragma once
 
 // The module speaks the contract's language on every line: here its names need no prefix.
-namespace contract {}
+namespace contract {
+}
 namespace fixwell {
 using namespace contract;
 }  // namespace fixwell

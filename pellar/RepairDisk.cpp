@@ -267,8 +267,8 @@ ErrorCode RepairDisk::beginMounted(const DiskReferencePointer& disk, Operation o
         return error;
     auto mounts = mountsOf(disk->path, options_.systemPaths);
     const bool isRoot = isMountedAtRoot(mounts);
-    const bool staysMounted =
-        isRoot || !options_.unmounts || holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
+    const bool staysMounted = isRoot || !options_.unmounts ||
+                              holdsDirectory(mounts, options_.homeDirectory, options_.systemPaths);
     if (operation == Operation::Verify && staysMounted && mounts.front().filesystem == "btrfs")
         startScript<LiveVolumeScript>(disk, mounts);
     else if (mounts.empty() || isRoot || !options_.unmounts)

@@ -17,12 +17,13 @@ inline const Name kFsckParameters{"parameters"};
 
 // The message types.
 
-inline const Name kFsckVerify{"VERIFY"};      ///< a step of a verification
-inline const Name kFsckRepair{"REPAIR"};      ///< a step of a repair
-inline const Name kFsckError{"ERROR"};        ///< a problem that was found
-inline const Name kFsckSuccess{"SUCCESS"};    ///< a good result
-inline const Name kFsckFail{"FAIL"};          ///< a failed operation, or a warning
-/// A line of a tool that tells of a problem. Drawn as plain text: what it comes to is told as an ERROR.
+inline const Name kFsckVerify{"VERIFY"};    ///< a step of a verification
+inline const Name kFsckRepair{"REPAIR"};    ///< a step of a repair
+inline const Name kFsckError{"ERROR"};      ///< a problem that was found
+inline const Name kFsckSuccess{"SUCCESS"};  ///< a good result
+inline const Name kFsckFail{"FAIL"};        ///< a failed operation, or a warning
+/// A line of a tool that tells of a problem. Drawn as plain text: what it comes to is told as an
+/// ERROR.
 inline const Name kFsckProblem{"PROBLEM"};
 inline const Name kFsckProgress{"PROGRESS"};  ///< the first parameter is the percentage done
 
@@ -50,7 +51,8 @@ inline const Name kPLTool{"kPLTool"};
 inline const Name kPLProblems{"kPLProblems"};
 inline const Name kPLProblemKinds{"kPLProblemKinds"};
 
-/// The result holds, but something was lost or moved for it; the message says what. Absent otherwise.
+/// The result holds, but something was lost or moved for it; the message says what. Absent
+/// otherwise.
 inline const Name kPLHasLosses{"kPLHasLosses"};
 
 inline const Name kPLVerdictSound{"sound"};

@@ -23,7 +23,8 @@ public:
 
     /// One entry of the user's activity log, in lines of its own.
     virtual void log(std::string_view text) = 0;
-    /// Text that is part of an entry: with the host's priority, with or without an end of line added.
+    /// Text that is part of an entry: with the host's priority, with or without an end of line
+    /// added.
     virtual void logPriorityWithEOL(std::string_view text, int priority, bool addsEndOfLine) = 0;
 };
 

@@ -152,9 +152,7 @@ private:
 
     bool isFirstName(const struct statx& status)
     {
-        return linked_
-            .emplace(status.stx_dev_major, status.stx_dev_minor, status.stx_ino)
-            .second;
+        return linked_.emplace(status.stx_dev_major, status.stx_dev_minor, status.stx_ino).second;
     }
 
     void askWhetherToGoOn()

@@ -91,11 +91,14 @@ DiskUsage::Disks DiskUsage::selectedVolumes() const
 {
     Disks volumes;
     const auto add = [&volumes](const OVDiskPointer& disk) {
-        const auto isSame = [&](const OVDiskPointer& other) { return other->isEqual(*disk); };
+        const auto isSame = [&](const OVDiskPointer& other) {
+            return other->isEqual(*disk);
+        };
         if (std::ranges::none_of(volumes, isSame))
             volumes.push_back(disk);
     };
-    for (const OVDiskPointer& disk : windowController().allSelectedItemsFilterDuplicates(false, true)) {
+    for (const OVDiskPointer& disk :
+         windowController().allSelectedItemsFilterDuplicates(false, true)) {
         const Disks parts = diskController().viewablePartitions(disk);
         if (parts.empty() || hasMountPoint(*disk))
             add(disk);
@@ -197,7 +200,9 @@ std::string DiskUsage::textOf(const Disks& volumes) const
 
 void DiskUsage::showButton(const Disks& volumes)
 {
-    const auto isMounted = [](const OVDiskPointer& disk) { return hasMountPoint(*disk); };
+    const auto isMounted = [](const OVDiskPointer& disk) {
+        return hasMountPoint(*disk);
+    };
     std::string_view reason;
     if (run_)
         reason = run_->isStopped ? localizable("It is being stopped.") : "";

@@ -47,8 +47,8 @@ std::string UsageText::bytes(std::uint64_t count) const
     for (; size >= 1024 && unit + 1 < units.size(); ++unit)
         size /= 1024;
     const bool isWhole = unit == 0 || size >= 100 || size == std::floor(size);
-    const contract::Value rounded = isWhole ? contract::Value(std::llround(size))
-                                            : contract::Value(std::round(size * 10) / 10);
+    const contract::Value rounded =
+        isWhole ? contract::Value(std::llround(size)) : contract::Value(std::round(size * 10) / 10);
     return host_.decimalString(rounded) + " " + units.at(unit);
 }
 
@@ -57,18 +57,20 @@ std::string UsageText::ofDisk(const contract::OVDisk& disk) const
     const auto* const filesystem = disk.filesystem();
     const std::string name =
         filesystem != nullptr && !filesystem->filesystemType().empty()
-            ? sentence(localizable("“%@” (%@)"), {printable(disk.displayName()),
-                                                  printable(filesystem->filesystemType())})
+            ? sentence(localizable("“%@” (%@)"),
+                       {printable(disk.displayName()), printable(filesystem->filesystemType())})
             : sentence(localizable("“%@”"), {printable(disk.displayName())});
     if (!contract::hasMountPoint(disk))
-        return sentence(disk.isOfflineDiskImage()
-                            ? localizable("%@: an image file that is not attached; how full it is "
-                                          "can be seen once it is attached and mounted.")
-                            : localizable("%@: not mounted; how full it is can be seen once it is."),
-                        {name}) +
+        return sentence(
+                   disk.isOfflineDiskImage()
+                       ? localizable("%@: an image file that is not attached; how full it is "
+                                     "can be seen once it is attached and mounted.")
+                       : localizable("%@: not mounted; how full it is can be seen once it is."),
+                   {name}) +
                "\n";
     const std::string mountPoint = *disk.mountPoint();
-    std::string text = sentence(localizable("%@, mounted at %@"), {name, printable(mountPoint)}) + "\n";
+    std::string text =
+        sentence(localizable("%@, mounted at %@"), {name, printable(mountPoint)}) + "\n";
     std::error_code error;
     const auto space = std::filesystem::space(mountPoint, error);
     if (error || space.capacity == 0)
@@ -95,11 +97,13 @@ std::string UsageText::ofScan(const ScanResult& scan) const
         text += "    " + rightAligned(bytes(size), sizeColumn) + "  " + name + "\n";
     };
     if (!scan.largest.empty())
-        text += "    " + localized(localizable("What took most of the room when it was measured:")) + "\n";
+        text += "    " +
+                localized(localizable("What took most of the room when it was measured:")) + "\n";
     for (const TopEntry& entry : scan.largest)
         line(entry.bytes, printable(entry.name) + (entry.isDirectory ? "/" : ""));
     if (scan.otherEntries > 0)
-        line(scan.otherBytes, sentence(localizable("all the others (%@)"), {number(scan.otherEntries)}));
+        line(scan.otherBytes,
+             sentence(localizable("all the others (%@)"), {number(scan.otherEntries)}));
     return text + omissions(scan);
 }
 
@@ -121,11 +125,12 @@ std::string UsageText::omissions(const ScanResult& scan) const
     if (scan.tooDeep > 0)
         add(sentence(localizable("Folders too deep to be looked at: %@."), {number(scan.tooDeep)}));
     if (scan.end != ScanResult::End::Complete)
-        add(sentence(scan.end == ScanResult::End::Stopped
-                         ? localizable("Stopped after %@ files and folders: there is more than this.")
-                         : localizable("Given up after %@ files and folders: there are too many to "
-                                       "be measured."),
-                     {number(scan.entries)}));
+        add(sentence(
+            scan.end == ScanResult::End::Stopped
+                ? localizable("Stopped after %@ files and folders: there is more than this.")
+                : localizable("Given up after %@ files and folders: there are too many to "
+                              "be measured."),
+            {number(scan.entries)}));
     return text;
 }
 

@@ -68,11 +68,11 @@ struct ActionButtonTexts {
 
 constexpr std::array<ActionButtonTexts, 4> actionButtonTexts{{
     {localizable("Check whether the structure of the disk’s file system is OK"),
-     localizable("Verify Disk"), localizable("Stop Verify"), selector::verifyDisk, FXWActionVerifyDisk,
-     FXWActionVerifyPartitionMap},
+     localizable("Verify Disk"), localizable("Stop Verify"), selector::verifyDisk,
+     FXWActionVerifyDisk, FXWActionVerifyPartitionMap},
     {localizable("Repair the structure of the disk’s file system, if necessary"),
-     localizable("Repair Disk"), localizable("Stop Repair"), selector::repairDisk, FXWActionRepairDisk,
-     FXWActionRepairPartitionMap},
+     localizable("Repair Disk"), localizable("Stop Repair"), selector::repairDisk,
+     FXWActionRepairDisk, FXWActionRepairPartitionMap},
     {localizable("Check whether the correct permissions are assigned to Tallo-installed files and "
                  "folders"),
      localizable("Verify Disk Permissions"), localizable("Stop Permission Verify"),

@@ -36,8 +36,7 @@ void OVFXW::repairOutputDictionary(const Dictionary& message, std::string_view s
                                    const OVDiskPointer& disk)
 {
     ov_log(
-        OVLog::trace, "repairOutputDictionary for %@: %@\n",
-        [&] { return identifierOf(disk); },
+        OVLog::trace, "repairOutputDictionary for %@: %@\n", [&] { return identifierOf(disk); },
         [&] { return Value(message).description(); });
     const OVDiskPointer inflight = diskOfEntry(inflightItem);
     if (!inflight || !disk || !message) {

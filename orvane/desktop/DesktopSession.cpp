@@ -26,8 +26,7 @@ DesktopSession::DesktopSession(SessionOptions options)
       ledger_(host_, ledgerEvents()),
       tabs_(host_, window_, controller_),
       repairs_(libraryOptions().trials),
-      disks_(host_, loop_, window_.disks(), ledger_, repairs_,
-             options_.disksToOpen,
+      disks_(host_, loop_, window_.disks(), ledger_, repairs_, options_.disksToOpen,
              options_.scansSystemDisks,
              {[this] { selectionChanged(); },
               [this] {
@@ -99,10 +98,11 @@ pellar::JobOptions DesktopSession::libraryOptions()
     pellar::JobOptions options =
         orvane::libraryOptions(options_.paths, libraryTexts_, {}, {}, repairAdvice());
     options.outputLimits = options_.outputLimits;
-    options.archiveFetching = {[this] { return fetchesPackageArchives.isOn(host_.standardUserDefaults()); },
-                               libraryTexts_.text("The archives of these packages are downloaded "
-                                                  "when “Download package archives” is switched "
-                                                  "on in the preferences.")};
+    options.archiveFetching = {
+        [this] { return fetchesPackageArchives.isOn(host_.standardUserDefaults()); },
+        libraryTexts_.text("The archives of these packages are downloaded "
+                           "when “Download package archives” is switched "
+                           "on in the preferences.")};
     options.repairPolicy = [this] {
         pellar::RepairPolicy policy = jobPolicy_;
         policy.isThorough = thoroughVerification.isOn(host_.standardUserDefaults());
@@ -129,12 +129,12 @@ RepairAdvice DesktopSession::repairAdvice()
     all.undo = advice("To take the repair back, choose Undo Repair in the Disk menu.");
     all.undoPermissions =
         advice("To take the repair back, choose Undo Permissions Repair in the Disk menu.");
-    all.apply =
-        advice("“Apply Anyway”, above this log, applies it although it may leave damage. That can "
-               "be undone as well.");
-    all.repairDirectly =
-        advice("“Repair Directly”, above this log, lets the tool write to the disk itself. That "
-               "cannot be undone.");
+    all.apply = advice(
+        "“Apply Anyway”, above this log, applies it although it may leave damage. That can "
+        "be undone as well.");
+    all.repairDirectly = advice(
+        "“Repair Directly”, above this log, lets the tool write to the disk itself. That "
+        "cannot be undone.");
     return all;
 }
 

@@ -70,12 +70,13 @@ MenuCommand DiskCommands::preview()
             .title = "Previe&w Repair",
             .shortcut = {},
             .perform = [this] { choices_.preview(); },
-            .reasonAgainst = [this] {
-                // Where its button is grey, for the button's reason.
-                const std::string reason = choices_.reasonAgainstPreview();
-                const std::string button = reasonAgainstButton(outlet::repairDisk);
-                return reason.empty() || button.empty() ? reason : button;
-            }};
+            .reasonAgainst =
+                [this] {
+                    // Where its button is grey, for the button's reason.
+                    const std::string reason = choices_.reasonAgainstPreview();
+                    const std::string button = reasonAgainstButton(outlet::repairDisk);
+                    return reason.empty() || button.empty() ? reason : button;
+                }};
 }
 
 MenuCommand DiskCommands::undo(const char* objectName, std::string_view title,
@@ -85,9 +86,10 @@ MenuCommand DiskCommands::undo(const char* objectName, std::string_view title,
             .title = title,
             .shortcut = {},
             .perform = [this, operation, scope] { undoing_.ask(operation, scope); },
-            .reasonAgainst = [this, operation, scope] {
-                return undoing_.reasonAgainst(operation, scope);
-            }};
+            .reasonAgainst =
+                [this, operation, scope] {
+                    return undoing_.reasonAgainst(operation, scope);
+                }};
 }
 
 MenuCommand DiskCommands::stop(const char* objectName, std::string_view title)
@@ -96,7 +98,10 @@ MenuCommand DiskCommands::stop(const char* objectName, std::string_view title)
             .title = title,
             .shortcut = {},
             .perform = [this] { at_.tabs.stopJob(); },
-            .reasonAgainst = [this] { return isLocked() ? "" : text("No job runs."); }};
+            .reasonAgainst =
+                [this] {
+                    return isLocked() ? "" : text("No job runs.");
+                }};
 }
 
 MenuCommand DiskCommands::map(const char* objectName, std::string_view title,
@@ -106,7 +111,10 @@ MenuCommand DiskCommands::map(const char* objectName, std::string_view title,
             .title = title,
             .shortcut = {},
             .perform = [this, button] { treatMap(button); },
-            .reasonAgainst = [this] { return reasonAgainstMap(); }};
+            .reasonAgainst =
+                [this] {
+                    return reasonAgainstMap();
+                }};
 }
 
 MenuCommand DiskCommands::action(const char* objectName, std::string_view title,
@@ -117,10 +125,11 @@ MenuCommand DiskCommands::action(const char* objectName, std::string_view title,
             .title = title,
             .shortcut = std::move(shortcut),
             .perform = [this, action] { disks_.doToSelection(action); },
-            .reasonAgainst = [this, action] {
-                const std::string reason = reasonAgainstAll();
-                return reason.empty() ? disks_.reasonAgainst(action) : reason;
-            }};
+            .reasonAgainst =
+                [this, action] {
+                    const std::string reason = reasonAgainstAll();
+                    return reason.empty() ? disks_.reasonAgainst(action) : reason;
+                }};
 }
 
 MenuCommand DiskCommands::attach()
@@ -129,7 +138,10 @@ MenuCommand DiskCommands::attach()
             .title = "&Attach as Device",
             .shortcut = {},
             .perform = [this] { disks_.attachAsDevices(disks_.selectedImages()); },
-            .reasonAgainst = [this] { return reasonAgainstImages(); }};
+            .reasonAgainst =
+                [this] {
+                    return reasonAgainstImages();
+                }};
 }
 
 MenuCommand DiskCommands::closeImage(const char* objectName)
@@ -138,7 +150,10 @@ MenuCommand DiskCommands::closeImage(const char* objectName)
             .title = "&Close Image",
             .shortcut = {},
             .perform = [this] { disks_.closeSelectedImages(); },
-            .reasonAgainst = [this] { return reasonAgainstImages(); }};
+            .reasonAgainst =
+                [this] {
+                    return reasonAgainstImages();
+                }};
 }
 
 MenuCommand DiskCommands::showInFiles()
@@ -147,11 +162,12 @@ MenuCommand DiskCommands::showInFiles()
             .title = "S&how in Files",
             .shortcut = {},
             .perform = [this] { files_.show(placeOfSelection()); },
-            .reasonAgainst = [this] {
-                return placeOfSelection().empty()
-                           ? text("Select one image file, or one volume that is mounted.")
-                           : "";
-            }};
+            .reasonAgainst =
+                [this] {
+                    return placeOfSelection().empty()
+                               ? text("Select one image file, or one volume that is mounted.")
+                               : "";
+                }};
 }
 
 MenuCommand DiskCommands::copyReport()
@@ -159,14 +175,13 @@ MenuCommand DiskCommands::copyReport()
     return {.objectName = "copyReport",
             .title = "C&opy Report",
             .shortcut = QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_C),
-            .perform = [this] {
-                QApplication::clipboard()->setText(toQt(report()));
-            },
-            .reasonAgainst = [this] {
-                return disks_.selected().empty() || at_.tabs.interface() == nullptr
-                           ? text("Select a disk first.")
-                           : "";
-            }};
+            .perform = [this] { QApplication::clipboard()->setText(toQt(report())); },
+            .reasonAgainst =
+                [this] {
+                    return disks_.selected().empty() || at_.tabs.interface() == nullptr
+                               ? text("Select a disk first.")
+                               : "";
+                }};
 }
 
 MenuCommand DiskCommands::properties()
@@ -175,9 +190,10 @@ MenuCommand DiskCommands::properties()
             .title = "Propert&ies…",
             .shortcut = QKeySequence(Qt::ALT | Qt::Key_Return),
             .perform = [this] { showProperties(); },
-            .reasonAgainst = [this] {
-                return disks_.selected().size() == 1 ? "" : text("Select a single disk.");
-            }};
+            .reasonAgainst =
+                [this] {
+                    return disks_.selected().size() == 1 ? "" : text("Select a single disk.");
+                }};
 }
 
 std::string DiskCommands::reasonAgainstAll() const
@@ -227,8 +243,7 @@ std::vector<NamedCheck> DiskCommands::runsOf(const std::shared_ptr<Disk>& disk)
 {
     std::vector<NamedCheck> all;
     const auto add = [&](const Disk& one, const std::string& name) {
-        for (const Run& run :
-             at_.host.historyStore().runs(at_.host.histories().keyOf(one.facts())))
+        for (const Run& run : at_.host.historyStore().runs(at_.host.histories().keyOf(one.facts())))
             all.push_back({name, checkOf(run)});
     };
     const auto& whole = disk->contents() ? disk->contents() : disk;

@@ -31,17 +31,15 @@ std::string quoted(const std::string& path)
 
 }  // namespace
 
-DiskOverview::DiskOverview(const SessionParts& parts, DiskPane& disks,
-                           const KeptRepairs& kept, RepairChoices& choices,
-                           RepairUndoing& undoing)
+DiskOverview::DiskOverview(const SessionParts& parts, DiskPane& disks, const KeptRepairs& kept,
+                           RepairChoices& choices, RepairUndoing& undoing)
     : at_(parts), disks_(disks), kept_(kept), choices_(choices), undoing_(undoing)
 {
     at_.window.header().setChosen([this](const std::string& identifier) { select(identifier); });
-    at_.window.banner().setEvents(
-        {[this](NextStep step) { take(step); },
-         [this](const std::string& identifier) {
-             select(identifier);
-         }});
+    at_.window.banner().setEvents({[this](NextStep step) { take(step); },
+                                   [this](const std::string& identifier) {
+                                       select(identifier);
+                                   }});
     QObject::connect(&clock_, &QTimer::timeout, &clock_, [this] { showSelection(); });
     clock_.start(std::chrono::minutes(1));
 }
@@ -92,8 +90,7 @@ ResultSummary DiskOverview::result(const std::vector<DiskRow>& rows)
     const KeptRepair ofDisk = kept(pellar::Subject::Filesystem);
     return resultOf(rows.front(),
                     {repair != nullptr && repair->isEnabled(), isKept(ofDisk),
-                     isKept(kept(pellar::Subject::Permissions)),
-                     ofDisk == KeptRepair::Interrupted},
+                     isKept(kept(pellar::Subject::Permissions)), ofDisk == KeptRepair::Interrupted},
                     at_.host.translator());
 }
 
@@ -151,7 +148,9 @@ void DiskOverview::explainCopying()
              "open the copy here, and check and repair that.",
              {command}),
          {{text("Copy the Command"),
-           [command] { QApplication::clipboard()->setText(QString::fromStdString(command)); }},
+           [command] {
+               QApplication::clipboard()->setText(QString::fromStdString(command));
+           }},
           {text("Help"),
            [this] {
                at_.host.sharedHelpManager().openHelpAnchor("copying");

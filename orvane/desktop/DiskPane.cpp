@@ -42,8 +42,8 @@ Check checkOf(const Run& run)
     const auto started =
         std::chrono::duration_cast<std::chrono::milliseconds>(run.started.time_since_epoch());
     const RunEnd end = run.end.value_or(RunEnd{});
-    return {run.verdict(), end.message,   QDateTime::fromMSecsSinceEpoch(started.count()),
-            run.action,    end.errorCode, end.problems,
+    return {run.verdict(),    end.message,   QDateTime::fromMSecsSinceEpoch(started.count()),
+            run.action,       end.errorCode, end.problems,
             end.problemKinds, end.hasLosses};
 }
 
@@ -76,7 +76,8 @@ void DiskScan::finish(const std::vector<DiskTree>& disks)
 }
 
 DiskPane::DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
-                   const KeptRepairs& repairs, std::vector<std::string> named, bool scansSystemDisks, Events events)
+                   const KeptRepairs& repairs, std::vector<std::string> named,
+                   bool scansSystemDisks, Events events)
     : host_(host),
       list_(list),
       ledger_(ledger),
@@ -222,10 +223,10 @@ DiskStates DiskPane::states()
     return {[this](const Disk& disk) { return lastCheckOf(disk); },
             [this](const Disk& disk) { return activityOn(disk); },
             [this](const Disk& disk) { return noteOn(disk); },
-            [this] {
-                return ledger_.currentRun() != nullptr ? ledger_.currentRun()->percent : 0;
-            },
-            [this](const Disk& disk) { return nextCheckOf(disk); }};
+            [this] { return ledger_.currentRun() != nullptr ? ledger_.currentRun()->percent : 0; },
+            [this](const Disk& disk) {
+                return nextCheckOf(disk);
+            }};
 }
 
 std::optional<LastCheck> DiskPane::lastCheckOf(const Disk& disk)
@@ -342,9 +343,8 @@ std::vector<std::string> DiskPane::closedImages() const
 {
     const auto open = images_.openImages();
     auto images = closed_;
-    std::erase_if(images, [&](const std::string& image) {
-        return std::ranges::count(open, image) != 0;
-    });
+    std::erase_if(images,
+                  [&](const std::string& image) { return std::ranges::count(open, image) != 0; });
     return images;
 }
 
@@ -352,9 +352,8 @@ std::vector<std::string> DiskPane::recentImages() const
 {
     const auto open = images_.openImages();
     auto images = recent_.files();
-    std::erase_if(images, [&](const std::string& image) {
-        return std::ranges::count(open, image) != 0;
-    });
+    std::erase_if(images,
+                  [&](const std::string& image) { return std::ranges::count(open, image) != 0; });
     return images;
 }
 

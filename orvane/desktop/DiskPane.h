@@ -67,7 +67,8 @@ public:
     /// `named` are opened at the start, as orvane/support/disks/DiskLookup.h takes them. All but
     /// the events and names outlive this object. The list follows the host's disks from here on.
     DiskPane(DesktopHost& host, EventLoop& loop, DiskList& list, const JobLedger& ledger,
-             const KeptRepairs& repairs, std::vector<std::string> named, bool scansSystemDisks, Events events);
+             const KeptRepairs& repairs, std::vector<std::string> named, bool scansSystemDisks,
+             Events events);
     DiskPane(const DiskPane&) = delete;
     DiskPane& operator=(const DiskPane&) = delete;
     ~DiskPane();

@@ -60,7 +60,7 @@ private:
     /// What reaches this object from a reader's thread, as long as it is there.
     struct Lifeline {
         std::mutex lock;
-        EventLoop* loop = nullptr;       ///< guarded; none when the opener has gone
+        EventLoop* loop = nullptr;      ///< guarded; none when the opener has gone
         ImageOpener* opener = nullptr;  ///< main thread
     };
     struct Known {

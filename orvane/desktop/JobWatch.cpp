@@ -53,7 +53,8 @@ JobWatch::JobWatch(const SessionParts& parts, DiskPane& disks, WindowCloser& clo
       longestGlanceAway_(glance),
       updated_(std::move(updated)),
       wakefulness_(buses.system),
-      notifier_({buses.session, desktopEntry, text("Show"), [this] {
+      notifier_({buses.session, desktopEntry, text("Show"),
+                 [this] {
                      QWidget& window = at_.window;
                      window.setWindowState(window.windowState() & ~Qt::WindowMinimized);
                      window.raise();
@@ -113,10 +114,10 @@ void JobWatch::runProgressed(const StartedRun& run)
 void JobWatch::showProgress(std::optional<double> percent)
 {
     const QString name = QApplication::applicationDisplayName();
-    at_.window.setWindowTitle(percent ? QStringLiteral("%1 – %2").arg(
-                                            toQt(percentText(*percent, at_.host.translator())),
-                                            name)
-                                      : name);
+    at_.window.setWindowTitle(percent
+                                  ? QStringLiteral("%1 – %2").arg(
+                                        toQt(percentText(*percent, at_.host.translator())), name)
+                                  : name);
     taskBar_.show(percent);
 }
 
@@ -128,9 +129,9 @@ std::string JobWatch::placeOf(const StartedRun& run)
     });
     std::string place;
     if (job_.disks.size() > 1 && found != job_.disks.end())
-        place = at_.host.translator().sentence(
-            "%ld of %ld", {static_cast<long>(found - job_.disks.begin()) + 1,
-                           static_cast<long>(job_.disks.size())});
+        place = at_.host.translator().sentence("%ld of %ld",
+                                               {static_cast<long>(found - job_.disks.begin()) + 1,
+                                                static_cast<long>(job_.disks.size())});
     const auto disk = at_.host.sharedDiskController().diskNamed(run.identifier);
     const std::string bearer = disk ? disk->facts().path.filename().native() : std::string();
     if (!bearer.empty() && bearer != run.disk)

@@ -46,7 +46,10 @@ void MenuCommands::fillBar()
                                   .title = "Open Image…",
                                   .shortcut = QKeySequence::Open,
                                   .perform = [this] { openImages(); },
-                                  .reasonAgainst = [this] { return reasonWhileLocked(); }};
+                                  .reasonAgainst =
+                                      [this] {
+                                          return reasonWhileLocked();
+                                      }};
     auto verify = diskCommands_.button("barVerify", "Verify", outlet::verifyDisk);
     verify.shortcut = verify.shownShortcut;
     auto repair = diskCommands_.button("barRepair", "Repair", outlet::repairDisk);
@@ -71,10 +74,14 @@ std::vector<Menu> MenuCommands::menus()
             {"&Edit", editCommands()},
             {"Dis&k", diskCommands_.all(), diskMenu},
             {"&View", viewCommands()},
-            {"&Help", {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1), [this] {
-                            at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
-                        }},
-                        {"about", "&About Orvane", {}, [this] { dialogs_.showAbout(); }}}}};
+            {"&Help",
+             {{"help", "Fixwell &Help", QKeySequence(Qt::Key_F1),
+               [this] {
+                   at_.host.sharedHelpManager().openHelpAnchor("ovhelp11868");
+               }},
+              {"about", "&About Orvane", {}, [this] {
+                   dialogs_.showAbout();
+               }}}}};
 }
 
 std::vector<MenuCommand> MenuCommands::fileCommands()
@@ -86,7 +93,9 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
                            .title = title,
                            .shortcut = std::move(shortcut),
                            .perform = std::move(perform),
-                           .reasonAgainst = [this] { return reasonWhileLocked(); }};
+                           .reasonAgainst = [this] {
+                               return reasonWhileLocked();
+                           }};
     };
     const auto attach = [this] {
         chooseImages("Attach Image as Device",
@@ -100,34 +109,36 @@ std::vector<MenuCommand> MenuCommands::fileCommands()
     // The Disk menu has the key.
     MenuCommand closing = diskCommands_.closeImage("closeImageInFile");
     closing.shownShortcut = DiskCommands::closeShortcut();
-    return {
-        whenFree("openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }),
-        recentCommand(),
-        std::move(closing),
-        {.objectName = "reopenClosed",
-         .title = "R&eopen Closed Image",
-         .shortcut = QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_T),
-         .perform = [this] { disks_.open(disks_.closedImages()); },
-         .reasonAgainst = [this] {
-             const std::string reason = reasonWhileLocked();
-             return !reason.empty() || !disks_.closedImages().empty()
-                        ? reason
-                        : text("No image was closed since this window opened.");
-         }},
-        whenFree("attachImage", "&Attach Image as Device…", {}, attach),
-        whenFree("rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }),
-        line,
-        {"saveReport", "&Save Report…", QKeySequence::Save, [this] { dialogs_.saveReport(); },
-         [this] { return dialogs_.canSaveReport(); }},
-        {.objectName = "print",
-         .title = "&Print…",
-         .shortcut = QKeySequence::Print,
-         .perform = [this] { print(); },
-         .reasonAgainst = reasonAgainstPrinting},
-        line,
-        {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {
-             at_.window.close();
-         }}};
+    return {whenFree("openImage", "&Open Image…", QKeySequence::Open, [this] { openImages(); }),
+            recentCommand(),
+            std::move(closing),
+            {.objectName = "reopenClosed",
+             .title = "R&eopen Closed Image",
+             .shortcut = QKeySequence(Qt::CTRL | Qt::SHIFT | Qt::Key_T),
+             .perform = [this] { disks_.open(disks_.closedImages()); },
+             .reasonAgainst =
+                 [this] {
+                     const std::string reason = reasonWhileLocked();
+                     return !reason.empty() || !disks_.closedImages().empty()
+                                ? reason
+                                : text("No image was closed since this window opened.");
+                 }},
+            whenFree("attachImage", "&Attach Image as Device…", {}, attach),
+            whenFree("rescan", "&Rescan Disks", QKeySequence::Refresh, [this] { disks_.rescan(); }),
+            line,
+            {"saveReport", "&Save Report…", QKeySequence::Save, [this] { dialogs_.saveReport(); },
+             [this] {
+                 return dialogs_.canSaveReport();
+             }},
+            {.objectName = "print",
+             .title = "&Print…",
+             .shortcut = QKeySequence::Print,
+             .perform = [this] { print(); },
+             .reasonAgainst = reasonAgainstPrinting},
+            line,
+            {"quit", "&Quit", QKeySequence(Qt::CTRL | Qt::Key_Q), [this] {
+                 at_.window.close();
+             }}};
 }
 
 std::vector<MenuCommand> MenuCommands::editCommands()
@@ -159,8 +170,9 @@ std::vector<MenuCommand> MenuCommands::editCommands()
         line,
         findCommand(),
         line,
-        {"preferences", "&Preferences…", QKeySequence(Qt::CTRL | Qt::Key_Comma),
-         [this] { dialogs_.showPreferences(); }}};
+        {"preferences", "&Preferences…", QKeySequence(Qt::CTRL | Qt::Key_Comma), [this] {
+             dialogs_.showPreferences();
+         }}};
 }
 
 // The key is the search's own.
@@ -188,13 +200,17 @@ MenuCommand MenuCommands::recentCommand()
             .title = "Open Recen&t",
             .shortcut = {},
             .perform = {},
-            .reasonAgainst = [this] {
-                if (isLocked())
-                    return reasonWhileLocked();
-                return disks_.recentImages().empty() ? text("No other image was opened before.")
-                                                     : "";
-            },
-            .fill = [this](QMenu& menu) { fillRecent(menu); }};
+            .reasonAgainst =
+                [this] {
+                    if (isLocked())
+                        return reasonWhileLocked();
+                    return disks_.recentImages().empty() ? text("No other image was opened before.")
+                                                         : "";
+                },
+            .fill =
+                [this](QMenu& menu) {
+                    fillRecent(menu);
+                }};
 }
 
 // The number in front is the key to press; the tenth has the last digit.
@@ -204,8 +220,8 @@ void MenuCommands::fillRecent(QMenu& menu)
     for (const std::string& image : disks_.recentImages()) {
         const QString name = toQtLine(std::filesystem::path(image).filename().native());
         const QString digit = QString::number(++number % 10);
-        QAction* const action = menu.addAction(QLatin1Char('&') + digit + QLatin1Char(' ') +
-                                               toQtTitle(fromQt(name)));
+        QAction* const action =
+            menu.addAction(QLatin1Char('&') + digit + QLatin1Char(' ') + toQtTitle(fromQt(name)));
         action->setToolTip(toQtToolTip(image));
         QObject::connect(action, &QAction::triggered, &at_.window,
                          [this, image] { disks_.openRecent(image); });
@@ -222,9 +238,7 @@ std::vector<MenuCommand> MenuCommands::viewCommands()
     const auto button = [this] {
         return at_.tabs.button(outlet::showDetails);
     };
-    return {{"showDetails",
-             "Show &Details",
-             QKeySequence(Qt::CTRL | Qt::Key_D),
+    return {{"showDetails", "Show &Details", QKeySequence(Qt::CTRL | Qt::Key_D),
              [button] { button()->press(); },
              [button] { return button() != nullptr && button()->isEnabled(); },
              [button] {

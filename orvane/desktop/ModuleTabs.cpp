@@ -13,7 +13,7 @@
 namespace orvane::desktop {
 
 Result<std::unique_ptr<ModuleTab>, Failure> ModuleTab::load(const std::filesystem::path& bundle,
-                                                    const Surroundings& surroundings)
+                                                            const Surroundings& surroundings)
 {
     auto loaded = loadModule(bundle);
     if (!loaded)
@@ -197,9 +197,10 @@ void ModuleTabs::stopHarder()
 bool ModuleTabs::lastActionIsCheck() const
 {
     namespace selector = contract::selector;
-    static constexpr std::array own{std::string_view(), selector::verifyDisk, selector::repairDisk,
-                                    selector::verifyPermissions, selector::repairPermissions,
-                                    selector::showDetails, selector::clearHistory, selector::help,
+    static constexpr std::array own{std::string_view(),          selector::verifyDisk,
+                                    selector::repairDisk,        selector::verifyPermissions,
+                                    selector::repairPermissions, selector::showDetails,
+                                    selector::clearHistory,      selector::help,
                                     selector::deleteSelected};
     return std::ranges::find(own, lastAction_) != own.end();
 }

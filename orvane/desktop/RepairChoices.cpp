@@ -17,8 +17,7 @@ namespace selector = contract::selector;
 
 bool RepairChoices::mayPerform(std::string_view action)
 {
-    const bool isRepair =
-        action == selector::repairDisk || action == selector::repairPermissions;
+    const bool isRepair = action == selector::repairDisk || action == selector::repairPermissions;
     if (!isRepair || isConfirmed_ || !asksBeforeRepair.isOn(at_.host.standardUserDefaults()))
         return true;
     askBeforeRepair(action);
@@ -49,22 +48,25 @@ bool RepairChoices::isUnreadable()
         if (!row.lastCheck)
             return row.facts.hasSMARTError;
         const LastCheck& check = *row.lastCheck;
-        return row.facts.hasSMARTError || (check.later ? *check.later : check.told).errorCode ==
-                                              contract::kPLErrorUnreadable;
+        return row.facts.hasSMARTError ||
+               (check.later ? *check.later : check.told).errorCode == contract::kPLErrorUnreadable;
     });
 }
 
 std::string RepairChoices::meaningOfRepair(std::string_view action)
 {
     if (action == selector::repairPermissions)
-        return text("The permissions, owners and groups of the files of installed packages are set "
-                    "to what the packages say. What they were is kept, so it can be undone.");
+        return text(
+            "The permissions, owners and groups of the files of installed packages are set "
+            "to what the packages say. What they were is kept, so it can be undone.");
     if (!kept_.canTry())
-        return text("The checking tool writes to the disk itself, because there is no place here "
-                    "to try the repair first. That cannot be undone. Copy what matters first.");
-    return text("The repair is tried first, and the result is checked. Only where no damage would "
-                "be left, the disk is written to. What is overwritten is kept, so the repair can "
-                "be undone with “Undo Repair” in the Disk menu.");
+        return text(
+            "The checking tool writes to the disk itself, because there is no place here "
+            "to try the repair first. That cannot be undone. Copy what matters first.");
+    return text(
+        "The repair is tried first, and the result is checked. Only where no damage would "
+        "be left, the disk is written to. What is overwritten is kept, so the repair can "
+        "be undone with “Undo Repair” in the Disk menu.");
 }
 
 // A disk that cannot be read loses by every attempt: for it, no repair is offered.
@@ -75,16 +77,20 @@ void RepairChoices::askBeforeRepair(std::string_view action)
         explainCopying_();
         return;
     }
-    const std::string_view button = isOfDisk ? contract::outlet::repairDisk
-                                             : contract::outlet::repairPermissions;
-    std::vector<Question::Answer> answers{{text("Repair"), [this, button] { press(button); }}};
+    const std::string_view button =
+        isOfDisk ? contract::outlet::repairDisk : contract::outlet::repairPermissions;
+    std::vector<Question::Answer> answers{{text("Repair"), [this, button] {
+                                               press(button);
+                                           }}};
     if (isOfDisk && reasonAgainstPreview().empty())
-        answers.push_back({text("Preview"), [this] { preview(); }});
+        answers.push_back({text("Preview"), [this] {
+                               preview();
+                           }});
     QMessageBox* const box =
-        ask(at_.window, {isOfDisk ? "repairQuestion" : "permissionsQuestion",
-                         sentence(isOfDisk ? "Repair %@?" : "Repair the permissions of %@?",
-                                  nameOfSelection()),
-                         meaningOfRepair(action), std::move(answers), text("Cancel")});
+        ask(at_.window,
+            {isOfDisk ? "repairQuestion" : "permissionsQuestion",
+             sentence(isOfDisk ? "Repair %@?" : "Repair the permissions of %@?", nameOfSelection()),
+             meaningOfRepair(action), std::move(answers), text("Cancel")});
     auto* const again = new QCheckBox(toQtTitle(text("Ask before every repair")));
     again->setChecked(true);
     box->setCheckBox(again);
@@ -127,8 +133,7 @@ void RepairChoices::lockChanged(bool isLocked)
 
 void RepairChoices::confirmUnproven()
 {
-    confirm("unprovenConfirmation",
-            "Apply the repair of “%@”, although it may leave damage?",
+    confirm("unprovenConfirmation", "Apply the repair of “%@”, although it may leave damage?",
             "The volume may stay damaged, and the repair may remove files, or parts of them, that "
             "could still be read before. What it overwrites is kept, so it can be undone.",
             "Apply Repair", &pellar::RepairPolicy::appliesUnproven);

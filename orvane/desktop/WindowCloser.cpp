@@ -34,7 +34,10 @@ void WindowCloser::askWhetherToStop()
          texts.text(isCheck() ? "The job must be stopped before the window can be closed. A repair "
                                 "that is stopped may leave damage behind."
                               : "The job must be stopped before the window can be closed."),
-         {{texts.text("Stop and Quit"), [this] { stopAndClose(); }}},
+         {{texts.text("Stop and Quit"),
+           [this] {
+               stopAndClose();
+           }}},
          texts.text("Keep Open")});
 }
 

@@ -34,8 +34,8 @@ void WindowDialogs::showPreferences()
 void WindowDialogs::showAbout()
 {
     if (!about_)
-        about_ = new AboutDialog(toolPath_, at_.host.mainRunLoop(), at_.host.translator(),
-                                 &at_.window);
+        about_ =
+            new AboutDialog(toolPath_, at_.host.mainRunLoop(), at_.host.translator(), &at_.window);
     bringToFront(*about_);
 }
 
@@ -59,7 +59,9 @@ PreferencesDialog::Subject WindowDialogs::preferences()
                 update_();
                 return left;
             },
-            [this] { at_.host.sharedHelpManager().openHelpAnchor("preferences"); }};
+            [this] {
+                at_.host.sharedHelpManager().openHelpAnchor("preferences");
+            }};
 }
 
 // The module keeps the preference itself when its button is pressed, and the log follows.

@@ -22,7 +22,12 @@ public:
     /// All but `update`, which shows what has changed, outlive this object.
     WindowDialogs(const SessionParts& parts, DiskPane& disks, KeptRepairs& kept,
                   const pellar::JobOptions& library, std::function<void()> update)
-        : at_(parts), disks_(disks), kept_(kept), trials_(library.trials), toolPath_(library.toolPath), update_(std::move(update))
+        : at_(parts),
+          disks_(disks),
+          kept_(kept),
+          trials_(library.trials),
+          toolPath_(library.toolPath),
+          update_(std::move(update))
     {
     }
     WindowDialogs(const WindowDialogs&) = delete;

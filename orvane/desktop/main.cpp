@@ -130,11 +130,10 @@ int run(int argc, char** argv)
     };
     DesktopSession session(std::move(options));
     termination.watch([&session] { session.end(); });
-    instance.setEvents(
-        {[&session] { session.present(); },
-         [&session](const std::vector<std::string>& names) {
-             session.open(names);
-         }});
+    instance.setEvents({[&session] { session.present(); },
+                        [&session](const std::vector<std::string>& names) {
+                            session.open(names);
+                        }});
     session.show();
     return QApplication::exec();
 }

@@ -60,8 +60,8 @@ void HostJob::plAsyncStartedForDisk(const DiskReferencePointer& /*disk*/) {}
 void HostJob::plAsyncMessageForDisk(const DiskReferencePointer& /*disk*/, std::string_view string,
                                     const contract::Dictionary& dictionary)
 {
-    const bool isProgress =
-        dictionary && dictionary.string(contract::kFsckMessageType) == contract::kFsckProgress.text();
+    const bool isProgress = dictionary && dictionary.string(contract::kFsckMessageType) ==
+                                              contract::kFsckProgress.text();
     if (isProgress) {
         const contract::Array parameters = dictionary[contract::kFsckParameters].array();
         if (events_.progressed && !parameters.isEmpty())

@@ -124,8 +124,8 @@ std::optional<LastRuns> lastRunsOf(HistoryStore& store, std::string_view key, co
         return lastRunsOf(store, key);
     std::vector<Run> runs = store.runs(key);
     // Whoever keeps the run itself knows more of it.
-    const auto newer = std::ranges::find_if(
-        runs, [&](const Run& run) { return run.started >= other->started; });
+    const auto newer =
+        std::ranges::find_if(runs, [&](const Run& run) { return run.started >= other->started; });
     if (newer == runs.end() || newer->started != other->started)
         runs.insert(newer, *other);
     return lastRunsIn(runs);

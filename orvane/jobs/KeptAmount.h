@@ -12,7 +12,7 @@ namespace orvane {
 struct KeptAmount {
     std::size_t repairs = 0;
     std::size_t lastingRepairs = 0;  ///< of these, interrupted or in use: they are not deleted
-    std::uint64_t bytes = 0;       ///< of what was overwritten
+    std::uint64_t bytes = 0;         ///< of what was overwritten
 
     friend bool operator==(const KeptAmount&, const KeptAmount&) = default;
 };

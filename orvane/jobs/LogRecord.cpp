@@ -47,8 +47,7 @@ contract::Dictionary logRecord(std::optional<contract::Name> type, const std::st
     contract::Dictionary record = contract::Dictionary::of(
         {{contract::kFsckMessageString, std::string_view(text)},
          {contract::kFsckVerbosity, verbosity},
-         {finalTextKey,
-          contract::StyledText::make(text + "\n", styleOf(typeText, verbosity))}});
+         {finalTextKey, contract::StyledText::make(text + "\n", styleOf(typeText, verbosity))}});
     if (type)
         record.set(contract::kFsckMessageType, *type);
     return record;

@@ -24,9 +24,9 @@ constexpr std::array subjects{SubjectName{Subject::Filesystem, "filesystem"},
                               SubjectName{Subject::PartitionMap, "partition_map"},
                               SubjectName{Subject::Permissions, "permissions"}};
 
-const std::array verdicts{contract::kPLVerdictSound,        contract::kPLVerdictDamaged,
-                          contract::kPLVerdictRepaired,     contract::kPLVerdictInconclusive,
-                          contract::kPLVerdictFailed,       contract::kPLVerdictStopped,
+const std::array verdicts{contract::kPLVerdictSound,    contract::kPLVerdictDamaged,
+                          contract::kPLVerdictRepaired, contract::kPLVerdictInconclusive,
+                          contract::kPLVerdictFailed,   contract::kPLVerdictStopped,
                           contract::kPLVerdictUndone};
 
 /// One subject of one disk.

@@ -12,10 +12,10 @@ namespace orvane {
 
 /// What is told of one volume, or of the partition map of a disk.
 struct MeasuredDisk {
-    std::string device;  ///< its path, of an image the file's; any bytes
-    std::string uuid;    ///< of the file system; any bytes, may be empty
-    std::string label;   ///< any bytes, may be empty
-    std::vector<Run> runs = {};  ///< on it, oldest first
+    std::string device;                     ///< its path, of an image the file's; any bytes
+    std::string uuid;                       ///< of the file system; any bytes, may be empty
+    std::string label;                      ///< any bytes, may be empty
+    std::vector<Run> runs = {};             ///< on it, oldest first
     std::optional<Run::Time> skipped = {};  ///< a scheduled check, after the last run
 };
 

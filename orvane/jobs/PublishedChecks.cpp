@@ -30,7 +30,7 @@ constexpr const char* lockName = ".lock";
 constexpr std::uint64_t largestFile = 4U << 20U;
 constexpr std::chrono::hours longestKept{24 * 366};
 
-const std::array verdicts{contract::kPLVerdictSound,   contract::kPLVerdictDamaged,
+const std::array verdicts{contract::kPLVerdictSound, contract::kPLVerdictDamaged,
                           contract::kPLVerdictInconclusive, contract::kPLVerdictFailed,
                           contract::kPLVerdictStopped};
 
@@ -83,7 +83,9 @@ std::optional<Run> runIn(const json& object)
 {
     const std::string verdict = textIn(object, "verdict");
     const auto started = timeIn(object, "started");
-    const auto isVerdict = [&](const contract::Name& name) { return name.text() == verdict; };
+    const auto isVerdict = [&](const contract::Name& name) {
+        return name.text() == verdict;
+    };
     if (!started || std::ranges::none_of(verdicts, isVerdict))
         return std::nullopt;
     Run run;
@@ -163,8 +165,8 @@ PublishedChecks readPublishedChecks(const std::filesystem::path& directory)
     const auto opened = pellar::StoreDirectory::openExisting(directory);
     if (!opened)
         return {};
-    const FileDescriptor file(::openat(opened->descriptor(), fileName,
-                                       O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    const FileDescriptor file(
+        ::openat(opened->descriptor(), fileName, O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
     struct stat status = {};
     if (!file || ::fstat(file.get(), &status) != 0 || !S_ISREG(status.st_mode) ||
         !pellar::whyOthersCanChange(status).empty())
@@ -183,8 +185,8 @@ PublishedChecks newestOf(PublishedChecks one, const PublishedChecks& other)
     return one;
 }
 
-// Which of two copies of a volume was which device, nobody knows later: where they differ, either may
-// be this one.
+// Which of two copies of a volume was which device, nobody knows later: where they differ, either
+// may be this one.
 const Run* publishedRun(const PublishedChecks& checks, std::string_view key)
 {
     const auto found = checks.find(key);

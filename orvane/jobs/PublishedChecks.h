@@ -18,8 +18,8 @@ inline constexpr const char* systemChecks = "/var/lib/orvane/checks";
 /// Facts about the last scheduled check of a volume. Its label is not among them: who may see the
 /// device can read that there.
 struct PublishedCheck {
-    std::string device;  ///< its path at that time; any bytes
-    std::string uuid;    ///< of the file system; may be empty
+    std::string device;      ///< its path at that time; any bytes
+    std::string uuid;        ///< of the file system; may be empty
     std::optional<Run> run;  ///< with verdict and problems alone; none where all were skipped
     std::optional<Run::Time> skipped;  ///< when the last one was, if that was after the run
 
@@ -36,8 +36,8 @@ using PublishedChecks = std::map<std::string, PublishedCheck, std::less<>>;
 /// Of two directories, what is newer of each volume.
 [[nodiscard]] PublishedChecks newestOf(PublishedChecks one, const PublishedChecks& other);
 
-/// The run of the volume; null where none is known, or where copies of the volume (of the same UUID)
-/// were found to be something else. Valid as long as the checks.
+/// The run of the volume; null where none is known, or where copies of the volume (of the same
+/// UUID) were found to be something else. Valid as long as the checks.
 [[nodiscard]] const Run* publishedRun(const PublishedChecks& checks, std::string_view key);
 
 /// Keeps what a check found in place of what was known of the volume; a check without a run leaves

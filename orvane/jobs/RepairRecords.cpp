@@ -21,8 +21,8 @@ RecordedDisk recordedDisk(const DiskFacts& facts)
 {
     std::error_code error;
     const auto path = std::filesystem::canonical(facts.path, error);
-    return {error ? facts.path : path, facts.offset, facts.length, facts.uuid, facts.filesystem,
-            facts.name};
+    return {error ? facts.path : path, facts.offset, facts.length, facts.uuid,
+            facts.filesystem,          facts.name};
 }
 
 /// A name passes from one device to the next, and a copy of a volume has its UUID: neither is to be
@@ -141,8 +141,9 @@ const Run* runOf(const pellar::RecordedRepair& repair, const std::vector<Run>& r
 {
     const Run* possible = nullptr;
     for (const Run& run : runs) {
-        const bool isInTime = std::chrono::floor<std::chrono::seconds>(run.started) <= repair.time &&
-                              (!run.finished || repair.time <= *run.finished);
+        const bool isInTime =
+            std::chrono::floor<std::chrono::seconds>(run.started) <= repair.time &&
+            (!run.finished || repair.time <= *run.finished);
         if (!isInTime || run.action != nameOf(repair.task) || hasNotWritten(run))
             continue;
         if (possible == nullptr || hasWritten(run) || !hasWritten(*possible))

@@ -36,8 +36,8 @@ std::string prettyNameIn(std::string_view file)
     begin += file[begin] == '\n' ? 1 : 0;
     std::string_view value = file.substr(begin + key.size());
     value = value.substr(0, value.find('\n'));
-    const bool isQuoted = value.size() >= 2 && (value[0] == '"' || value[0] == '\'') &&
-                          value.back() == value.front();
+    const bool isQuoted =
+        value.size() >= 2 && (value[0] == '"' || value[0] == '\'') && value.back() == value.front();
     if (isQuoted)
         value = value.substr(1, value.size() - 2);
     std::string name;
@@ -170,9 +170,9 @@ void Report::limitToLastRun(Chapter& chapter)
     if (chapter.runs.empty())
         return;
     chapter.nextRun = chapter.runs.size() - 1;
-    const auto known =
-        start > 0 ? host_.histories().runOf(chapter.records.at(start - 1).dictionary())
-                  : std::nullopt;
+    const auto known = start > 0
+                           ? host_.histories().runOf(chapter.records.at(start - 1).dictionary())
+                           : std::nullopt;
     if (!known || (known->run && known->run->started != chapter.runs.back().started))
         chapter.next = chapter.end;
 }
@@ -187,8 +187,7 @@ std::string Report::sizeText(std::uint64_t bytes) const
 {
     return host_.translator().sentence(
         "%@ (%@ bytes)",
-        {byteCount(bytes),
-         decimalText(static_cast<std::int64_t>(bytes), currentLanguage())});
+        {byteCount(bytes), decimalText(static_cast<std::int64_t>(bytes), currentLanguage())});
 }
 
 void Report::tellHead()
@@ -214,8 +213,8 @@ void Report::tellDisk(const Disk& disk)
     const DiskFacts& facts = disk.facts();
     const Translator& texts = host_.translator();
     say({Kind::Disk, disk.displayName()});
-    const bool isFile = !facts.imagePath.empty() ||
-                        facts.storage == contract::DiskReference::Storage::FileRegion;
+    const bool isFile =
+        !facts.imagePath.empty() || facts.storage == contract::DiskReference::Storage::FileRegion;
     const auto& path = facts.imagePath.empty() ? facts.path : facts.imagePath;
     fact(isFile ? "File" : "Device", path.native());
     if (isFile && facts.offset != 0)
@@ -224,8 +223,8 @@ void Report::tellDisk(const Disk& disk)
     if (facts.length != 0)
         fact("Size", sizeText(facts.length));
     if (facts.space)
-        fact("Used", texts.sentence("%@ of %@", {byteCount(facts.space->used),
-                                                 byteCount(facts.space->total)}));
+        fact("Used", texts.sentence("%@ of %@",
+                                    {byteCount(facts.space->used), byteCount(facts.space->total)}));
     fact("Mounted at", facts.mountPoint);
     fact("Model", facts.model);
     fact("UUID", facts.uuid);

@@ -47,9 +47,8 @@ struct ComputerFacts {
     std::string kernel;
     std::string distribution;  ///< empty where it is not known
 };
-[[nodiscard]] ComputerFacts computerFacts(
-    const std::vector<std::filesystem::path>& releaseFiles = {"/etc/os-release",
-                                                              "/usr/lib/os-release"});
+[[nodiscard]] ComputerFacts computerFacts(const std::vector<std::filesystem::path>& releaseFiles = {
+                                              "/etc/os-release", "/usr/lib/os-release"});
 
 /// What is known of disks, and what their histories tell, line by line, so that a long history can
 /// be written bit by bit. It tells the histories as they were when it was made, as far as they are

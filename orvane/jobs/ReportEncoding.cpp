@@ -80,8 +80,8 @@ public:
     std::string begin(std::string_view title) override
     {
         return "<!DOCTYPE html>\n<html lang=\"" + escaped(language_) +
-               "\">\n<head><meta charset=\"utf-8\"><title>" + escaped(title) +
-               "</title><style>" + std::string(style) + "</style></head>\n<body>\n";
+               "\">\n<head><meta charset=\"utf-8\"><title>" + escaped(title) + "</title><style>" +
+               std::string(style) + "</style></head>\n<body>\n";
     }
 
     std::string end() override { return closeOpen("") + "</body>\n</html>\n"; }
@@ -94,8 +94,8 @@ public:
             case Kind::Disk: return closeOpen("") + "<h2>" + text + "</h2>\n";
             case Kind::Run: return closeOpen("") + element("h3", line);
             case Kind::Fact:
-                return closeOpen("table") + "<tr><th scope=\"row\">" + escaped(line.name) + "</th>" +
-                       element("td", line, "</tr>\n");
+                return closeOpen("table") + "<tr><th scope=\"row\">" + escaped(line.name) +
+                       "</th>" + element("td", line, "</tr>\n");
             case Kind::Part:
             case Kind::Row: break;
         }

@@ -234,7 +234,9 @@ private:
         if (request_.isOnImage())
             return trials;
         const auto asked = [this](Advice advice) {
-            return [mark = printer_.markOf(advice)](const DiskReference&) { return mark; };
+            return [mark = printer_.markOf(advice)](const DiskReference&) {
+                return mark;
+            };
         };
         trials.howToUndo = asked(Advice::Undo);
         trials.howToUndoPermissions = asked(Advice::Undo);

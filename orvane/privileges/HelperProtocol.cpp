@@ -50,8 +50,7 @@ bool isFor(const PolicyOption& option, Task task)
 /// A preview writes nothing; what is said of writing does not go with it.
 bool contradictsItself(const pellar::RepairPolicy& policy)
 {
-    return (policy.isPreview &&
-            (policy.isDirect || policy.appliesUnproven || !policy.keepsUndo)) ||
+    return (policy.isPreview && (policy.isDirect || policy.appliesUnproven || !policy.keepsUndo)) ||
            (policy.isDirect && policy.appliesUnproven);
 }
 
@@ -296,9 +295,8 @@ std::optional<pellar::Event> eventFromLine(std::string_view line)
 pellar::Message messageOf(Advice advice)
 {
     return {{},
-            contract::Dictionary::of(
-                {{contract::kFsckMessageType, adviceType},
-                 {contract::kFsckVerbosity, static_cast<int>(advice)}})};
+            contract::Dictionary::of({{contract::kFsckMessageType, adviceType},
+                                      {contract::kFsckVerbosity, static_cast<int>(advice)}})};
 }
 
 std::optional<Advice> adviceIn(const pellar::Event& event)

@@ -93,8 +93,7 @@ void setTrials(pellar::JobOptions& options, const XDGPaths& paths, const RepairA
 
 std::filesystem::path checksDirectory(const XDGPaths& paths)
 {
-    return worksForAll(paths) ? std::filesystem::path(systemChecks)
-                              : fileIn(paths.state, "checks");
+    return worksForAll(paths) ? std::filesystem::path(systemChecks) : fileIn(paths.state, "checks");
 }
 
 pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,

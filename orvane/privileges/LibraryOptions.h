@@ -18,8 +18,9 @@ inline constexpr const char* systemRepairs = "/var/lib/orvane/repairs";
 
 /// How the disk-management library is set up for a user: where it looks for tools, where it keeps
 /// what a repair overwrites and how much of it, and how it gets at disks for which the user has no
-/// right. `texts` outlives the options. The repair policy is the stored settings'. `refused` (may be empty) is told of directories of FIXWELL_TOOL_PATH that
-/// do not count, because others could change what root would run from there.
+/// right. `texts` outlives the options. The repair policy is the stored settings'. `refused` (may
+/// be empty) is told of directories of FIXWELL_TOOL_PATH that do not count, because others could
+/// change what root would run from there.
 [[nodiscard]] pellar::JobOptions libraryOptions(const XDGPaths& paths, const pellar::Texts& texts,
                                                 const Asking& asking = {},
                                                 const WarningSink& refused = {},

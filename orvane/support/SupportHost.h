@@ -13,7 +13,6 @@
 #include "orvane/support/settings/SettingsFile.h"
 #include "orvane/support/settings/XDGPaths.h"
 #include "orvane/support/texts/Catalogue.h"
-#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/udisks/DiskOperations.h"
 #include "orvane/support/udisks/DiskReader.h"
 

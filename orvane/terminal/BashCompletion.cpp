@@ -51,7 +51,8 @@ private:
         isEscaped_ = false;
         line_.rest += character;
         // Between double quotes it escapes these alone (bash(1), QUOTING).
-        if (line_.quote == Quote::Double && std::string_view("$`\"\\").find(character) == std::string_view::npos)
+        if (line_.quote == Quote::Double &&
+            std::string_view("$`\"\\").find(character) == std::string_view::npos)
             line_.words.back() += '\\';
         line_.words.back() += character;
     }
@@ -93,8 +94,8 @@ private:
             // What $'…' makes of an escape is not followed: few write it by hand.
             line_.isExpanded = line_.isExpanded || line_.quote == Quote::Dollar;
         } else {
-            line_.isExpanded = line_.isExpanded ||
-                               (line_.quote == Quote::Double && (character == '$' || character == '`'));
+            line_.isExpanded = line_.isExpanded || (line_.quote == Quote::Double &&
+                                                    (character == '$' || character == '`'));
             line_.words.back() += character;
         }
     }
@@ -129,8 +130,8 @@ std::string dollarText(std::string_view text)
     return result;
 }
 
-/// Readline closes the quotes of a word, but not where its last letter looks as if they were closed;
-/// and puts a text that begins with the quote in the place of the one that is there.
+/// Readline closes the quotes of a word, but not where its last letter looks as if they were
+/// closed; and puts a text that begins with the quote in the place of the one that is there.
 std::string readlineText(std::string text, Quote quote)
 {
     if (quote == Quote::None)
@@ -152,11 +153,14 @@ std::vector<Candidate> filesFor(const std::string& word)
         std::error_code ignored;
         const fs::file_status status = entry->status(ignored);
         const bool isDirectory = fs::is_directory(status);
-        const bool isMeant = name.starts_with(begin) && (begin.starts_with('.') || !name.starts_with('.'));
-        if (!isMeant || (!isDirectory && !fs::is_regular_file(status) && !fs::is_block_file(status)))
+        const bool isMeant =
+            name.starts_with(begin) && (begin.starts_with('.') || !name.starts_with('.'));
+        if (!isMeant ||
+            (!isDirectory && !fs::is_regular_file(status) && !fs::is_block_file(status)))
             continue;
         // As it stands it would be an option, or a label.
-        const bool isMistakable = word.empty() && (name.starts_with('-') || name.find('=') != std::string::npos);
+        const bool isMistakable =
+            word.empty() && (name.starts_with('-') || name.find('=') != std::string::npos);
         files.push_back({(isMistakable ? "./" : directory) + name + (isDirectory ? "/" : "")});
     }
     return files;
@@ -180,7 +184,8 @@ std::string bashText(std::string_view text, Quote quote)
         std::string_view rest = text;
         contract::takeCharacter(rest);
         const std::string character(text.substr(0, text.size() - rest.size()));
-        const bool isLetter = character.size() > 1 || lettersAndDigits.find(character) != std::string_view::npos;
+        const bool isLetter =
+            character.size() > 1 || lettersAndDigits.find(character) != std::string_view::npos;
         const char end = quote == Quote::Single ? '\'' : '"';
         if (quote != Quote::None && !isShown(character))
             result += end + ("$'" + dollarText(character) + "'") + end;
@@ -190,15 +195,22 @@ std::string bashText(std::string_view text, Quote quote)
         else if (quote == Quote::Double && character == "!")
             result += "\"'!'\"";
         else if (quote == Quote::Double)
-            result += (std::string_view("$`\"\\").find(character) != std::string_view::npos ? "\\" : "") + character;
+            result +=
+                (std::string_view("$`\"\\").find(character) != std::string_view::npos ? "\\" : "") +
+                character;
         else
-            result += (isLetter || std::string_view("/._-+:=,@%").find(character) != std::string_view::npos ? "" : "\\") + character;
+            result += (isLetter || std::string_view("/._-+:=,@%").find(character) !=
+                                       std::string_view::npos
+                           ? ""
+                           : "\\") +
+                      character;
         text = rest;
     }
     return result;
 }
 
-std::string bashReply(std::string_view line, std::string_view replaced, const CompletionSources& sources)
+std::string bashReply(std::string_view line, std::string_view replaced,
+                      const CompletionSources& sources)
 {
     const ShellLine read = readShellLine(line);
     const std::string& word = read.words.back();

@@ -12,9 +12,9 @@ namespace orvane {
 
 /// What a scheduled check came to for one volume.
 struct CheckResult {
-    std::string name;   ///< of the disk, as the user or the system calls it; any bytes
+    std::string name;  ///< of the disk, as the user or the system calls it; any bytes
     DiskFacts facts;
-    Run run;            ///< where it was checked
+    Run run;              ///< where it was checked
     std::string skipped;  ///< why it was not; empty where it was
 };
 

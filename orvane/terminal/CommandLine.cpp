@@ -34,7 +34,8 @@ constexpr std::array<CommandText, 20> commandTexts{{
     {Command::ScheduledCheck, "scheduled-check",
      "Verify what is not in use, for a timer: unmounts nothing, tells the journal"},
     {Command::Metrics, "metrics", "Write the last verdicts and times for Prometheus"},
-    {Command::Notify, "notify", "Tell the desktop what scheduled checks have found since it was told last"},
+    {Command::Notify, "notify",
+     "Tell the desktop what scheduled checks have found since it was told last"},
     {Command::Mount, "mount", "Mount volumes, where the system chooses to"},
     {Command::Unmount, "unmount", "Unmount volumes"},
     {Command::Eject, "eject", "Unmount all of a drive, and give the medium back"},
@@ -94,14 +95,17 @@ void addSharedOptions(CLI::App& app, Request& request, const Translator& texts)
 void addRepairOptions(CLI::App& command, Request& request, const Translator& texts)
 {
     pellar::RepairPolicy& policy = request.repairPolicy;
-    CLI::Option* const preview =
-        command.add_flag("--preview", policy.isPreview, texts.text("Try the repair, and write nothing"));
-    command.add_option("--keep", policy.keptImage, texts.text("Write the repaired volume to this new file"))
+    CLI::Option* const preview = command.add_flag("--preview", policy.isPreview,
+                                                  texts.text("Try the repair, and write nothing"));
+    command
+        .add_option("--keep", policy.keptImage,
+                    texts.text("Write the repaired volume to this new file"))
         ->type_name("FILE")
         ->needs(preview)
         ->excludes("--partition-map");
-    CLI::Option* const direct = command.add_flag(
-        "--direct", policy.isDirect, texts.text("Let the tool write to the disk itself; cannot be undone"));
+    CLI::Option* const direct =
+        command.add_flag("--direct", policy.isDirect,
+                         texts.text("Let the tool write to the disk itself; cannot be undone"));
     CLI::Option* const unproven =
         command.add_flag("--apply-unproven", policy.appliesUnproven,
                          texts.text("Apply the repair also where it would leave damage"));
@@ -115,11 +119,10 @@ void addRepairOptions(CLI::App& command, Request& request, const Translator& tex
 
 void addMetricsOptions(CLI::App& command, Request& request, const Translator& texts)
 {
-    CLI::Option* const output =
-        command
-            .add_option("--output", request.output,
-                        texts.text("Replace this file instead of printing"))
-            ->type_name("FILE");
+    CLI::Option* const output = command
+                                    .add_option("--output", request.output,
+                                                texts.text("Replace this file instead of printing"))
+                                    ->type_name("FILE");
     command
         .add_flag("--if-directory-exists", request.needsNoDirectory,
                   texts.text("Write nothing where there is no directory for the file"))
@@ -139,11 +142,13 @@ bool makePathsAbsolute(std::initializer_list<std::filesystem::path*> paths)
 std::string objectionTo(Request& request, const Translator& texts)
 {
     if (request.command == Command::Report && request.isJSON)
-        return texts.text("“report --json”: a report is for people; “history --json” tells "
-                          "programs the same");
+        return texts.text(
+            "“report --json”: a report is for people; “history --json” tells "
+            "programs the same");
     if (request.command == Command::Metrics && request.isJSON)
-        return texts.text("“metrics --json”: metrics have a format of their own; “list --json” "
-                          "tells programs the same");
+        return texts.text(
+            "“metrics --json”: metrics have a format of their own; “list --json” "
+            "tells programs the same");
     std::filesystem::path& kept = request.repairPolicy.keptImage;
     if (!kept.empty() && request.disks.size() > 1)
         return texts.text("--keep takes one disk: there is one file for one volume");
@@ -168,12 +173,11 @@ bool treatsMaps(Command command)
 void addDisks(CLI::App& command, Command chosen, Request& request, const Translator& texts)
 {
     const bool takesImages = chosen == Command::Attach;
-    CLI::Option* const disks =
-        command
-            .add_option(takesImages ? "IMAGE" : "DISK", request.disks,
-                        texts.text(takesImages ? imageHelp : diskHelp))
-            ->type_name("")
-            ->required(needsDisks(chosen));
+    CLI::Option* const disks = command
+                                   .add_option(takesImages ? "IMAGE" : "DISK", request.disks,
+                                               texts.text(takesImages ? imageHelp : diskHelp))
+                                   ->type_name("")
+                                   ->required(needsDisks(chosen));
     if (chosen == Command::ScheduledCheck)
         command
             .add_option("--instance", request.unitInstance,
@@ -182,8 +186,7 @@ void addDisks(CLI::App& command, Command chosen, Request& request, const Transla
             ->excludes(disks);
 }
 
-void addCommand(CLI::App& app, const CommandText& text, Request& request,
-                const Translator& texts)
+void addCommand(CLI::App& app, const CommandText& text, Request& request, const Translator& texts)
 {
     CLI::App& command = *app.add_subcommand(text.name, texts.text(text.text));
     command.callback([&request, chosen = text.command] { request.command = chosen; });
@@ -191,8 +194,9 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request,
     if (text.command == Command::Notify || text.command == Command::Modules)
         return;
     if (text.command == Command::Show) {
-        command.add_option("MODULE", request.module,
-                           texts.text("The module, as “fixwell modules” names it"))
+        command
+            .add_option("MODULE", request.module,
+                        texts.text("The module, as “fixwell modules” names it"))
             ->type_name("")
             ->required();
         command
@@ -203,21 +207,26 @@ void addCommand(CLI::App& app, const CommandText& text, Request& request,
     }
     const bool takesImages = text.command == Command::Attach;
     if (text.command == Command::Help)
-        command.add_option("TOPIC", request.topic, texts.text("A command, or a page of the manual"))
+        command
+            .add_option("TOPIC", request.topic, texts.text("A command, or a page of the manual"))
             ->type_name("");
     else
         addDisks(command, text.command, request, texts);
     if (takesImages)
-        command.add_flag("--read-only", request.attachesReadOnly, texts.text("Let nobody write to it"));
+        command.add_flag("--read-only", request.attachesReadOnly,
+                         texts.text("Let nobody write to it"));
     if (text.command == Command::History)
-        command.add_flag("--clear", request.clearsHistory, texts.text("Forget these disks' histories"));
+        command.add_flag("--clear", request.clearsHistory,
+                         texts.text("Forget these disks' histories"));
     if (text.command == Command::Report) {
         command.add_flag("--html", request.isHTML, texts.text("As a page of HTML"));
-        command.add_flag("--last", request.isLastRunAlone, texts.text("The last check of each disk alone"));
+        command.add_flag("--last", request.isLastRunAlone,
+                         texts.text("The last check of each disk alone"));
     }
     if (treatsMaps(text.command))
-        command.add_flag("--partition-map", request.treatsPartitionMap,
-                         texts.text("Treat the disk's partition map (GPT or MBR) instead of its volumes"));
+        command.add_flag(
+            "--partition-map", request.treatsPartitionMap,
+            texts.text("Treat the disk's partition map (GPT or MBR) instead of its volumes"));
     if (text.command == Command::Undo)
         command
             .add_flag("--permissions", request.treatsPermissions,
@@ -327,9 +336,9 @@ manual::CommandTree commandTree(const Translator& texts)
 
 std::string_view nameOf(Command command)
 {
-    const auto found = std::find_if(
-        commandTexts.begin(), commandTexts.end(),
-        [command](const CommandText& text) { return text.command == command; });
+    const auto found =
+        std::find_if(commandTexts.begin(), commandTexts.end(),
+                     [command](const CommandText& text) { return text.command == command; });
     return found == commandTexts.end() ? std::string_view() : found->name;
 }
 

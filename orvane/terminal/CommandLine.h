@@ -55,18 +55,19 @@ struct Request {
     std::vector<std::string> disks;  ///< as named: device, image, mount point, LABEL=, UUID=
     std::string topic;               ///< of the help; empty: what topics there are
     bool wantsUsage = false;         ///< instead: the command line as a whole (--help)
-    std::string module;         ///< to be shown
-    std::string pressedButton;  ///< of it; empty for none
+    std::string module;              ///< to be shown
+    std::string pressedButton;       ///< of it; empty for none
     bool attachesReadOnly = false;
     bool clearsHistory = false;
-    bool isHTML = false;               ///< a report
-    bool isLastRunAlone = false;       ///< in it
-    bool treatsPartitionMap = false;   ///< the disks' maps, not their volumes
-    bool treatsPermissions = false;    ///< of installed files; to undo alone
+    bool isHTML = false;                ///< a report
+    bool isLastRunAlone = false;        ///< in it
+    bool treatsPartitionMap = false;    ///< the disks' maps, not their volumes
+    bool treatsPermissions = false;     ///< of installed files; to undo alone
     pellar::RepairPolicy repairPolicy;  ///< the image to keep is named by an absolute path
-    std::optional<std::string> unitInstance;  ///< whose scheduled check it is, as systemd escapes it
-    std::filesystem::path output;  ///< of metrics; absolute, or empty for standard output
-    bool needsNoDirectory = false;  ///< nothing is written where that of `output` is missing
+    std::optional<std::string>
+        unitInstance;                  ///< whose scheduled check it is, as systemd escapes it
+    std::filesystem::path output;      ///< of metrics; absolute, or empty for standard output
+    bool needsNoDirectory = false;     ///< nothing is written where that of `output` is missing
     bool fetchesArchives = false;      ///< of packages, over the network, to know permissions
     std::optional<bool> showsDetails;  ///< none: as stored in the preferences
     bool isJSON = false;
@@ -74,7 +75,7 @@ struct Request {
     Coloring coloring = Coloring::Auto;
     bool showsProgress = true;
     bool usesPager = true;  ///< where the output is long and goes to a terminal
-    int logLevel = 0;  ///< developers' lines up to this level go to standard error
+    int logLevel = 0;       ///< developers' lines up to this level go to standard error
     bool tracesCommands = false;
 };
 

@@ -112,7 +112,8 @@ private:
         const manual::ArgumentEntry& argument = at_.command->arguments.front();
         if (argument.name == "TOPIC") {
             Offer topics{at_.arguments == 0 ? commands() : std::vector<Candidate>()};
-            for (Candidate& topic : at_.arguments == 0 ? sources_.topics() : std::vector<Candidate>())
+            for (Candidate& topic :
+                 at_.arguments == 0 ? sources_.topics() : std::vector<Candidate>())
                 topics.candidates.push_back(std::move(topic));
             return topics;
         }
@@ -132,7 +133,8 @@ private:
             }
         };
         visit(visit, trees, [&](const DiskFacts& facts) { ++labels[facts.label]; });
-        visit(visit, trees, [&](const DiskFacts& facts) { add(facts, labels[facts.label] == 1, found); });
+        visit(visit, trees,
+              [&](const DiskFacts& facts) { add(facts, labels[facts.label] == 1, found); });
         return found;
     }
 

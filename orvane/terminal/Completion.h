@@ -13,7 +13,7 @@ namespace orvane {
 
 /// What may stand where the user is writing.
 struct Candidate {
-    std::string value;    ///< the whole word, as the program takes it: any bytes but NUL
+    std::string value;      ///< the whole word, as the program takes it: any bytes but NUL
     std::string text = {};  ///< what it is; printable
 
     friend bool operator==(const Candidate&, const Candidate&) = default;
@@ -31,11 +31,12 @@ struct CompletionSources {
     std::function<std::vector<Candidate>()> topics;  ///< of the help, besides commands
 };
 
-/// For the last of the words behind the program's name, which may be empty; it may hold less or more
-/// than what is offered begins with. A label that two disks have is not offered.
+/// For the last of the words behind the program's name, which may be empty; it may hold less or
+/// more than what is offered begins with. A label that two disks have is not offered.
 Offer offerFor(const std::vector<std::string>& words, const CompletionSources& sources);
 
-/// A shell's line that ends where the cursor stands, taken apart without doing anything that it says.
+/// A shell's line that ends where the cursor stands, taken apart without doing anything that it
+/// says.
 struct ShellLine {
     enum class Quote { None, Single, Double, Dollar };  ///< Dollar: $'…'
     std::vector<std::string> words;  ///< as the program would get them; the last may be empty
@@ -49,8 +50,9 @@ ShellLine readShellLine(std::string_view line);
 /// literally, in letters that do nothing to a terminal.
 std::string bashText(std::string_view text, ShellLine::Quote quote);
 
-/// For bash's completion function: a line of flags ("nospace", "files" or both), and a line for each
-/// text that may take the place of `replaced`, which is the end of `line` as readline sees words.
+/// For bash's completion function: a line of flags ("nospace", "files" or both), and a line for
+/// each text that may take the place of `replaced`, which is the end of `line` as readline sees
+/// words.
 std::string bashReply(std::string_view line, std::string_view replaced,
                       const CompletionSources& sources);
 

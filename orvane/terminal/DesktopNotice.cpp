@@ -48,10 +48,9 @@ Result<void, Failure> showOnDesktop(const DesktopNotice& notice)
 {
     try {
         const auto bus = sdbus::createSessionBusConnection();
-        BusCall call(*bus,
-                     {"/org/freedesktop/Notifications", service, "Notify", service},
-                     [&notice](sdbus::MethodCall& message) { addArguments(message, notice); },
-                     longestWait);
+        BusCall call(
+            *bus, {"/org/freedesktop/Notifications", service, "Notify", service},
+            [&notice](sdbus::MethodCall& message) { addArguments(message, notice); }, longestWait);
         if (const auto answer = call.wait({}, longestWait); !answer)
             return failure(answer.error().detail.empty() ? "it does not answer"
                                                          : answer.error().detail);

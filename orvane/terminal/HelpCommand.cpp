@@ -34,7 +34,8 @@ public:
     Document page(std::string_view name) const
     {
         for (const std::string& folder : folders_)
-            if (const auto html = readWholeFile(book_ / folder / (std::string(name) + ".html"), longestPage))
+            if (const auto html =
+                    readWholeFile(book_ / folder / (std::string(name) + ".html"), longestPage))
                 return manual::readHelpPage(*html);
         return {};
     }
@@ -71,18 +72,20 @@ Document listOf(const manual::CommandTree& tree, const HelpPages& pages, const T
     add(Kind::Heading, texts.text("Topics"));
     for (const std::string& name : pages.names())
         add(Kind::Row, name, pages.page(name).title);
-    list.blocks.push_back({Kind::Paragraph,
-                           {{Span::Look::Plain,
-                             texts.text("“fixwell help NAME” explains one of them, “fixwell --help” "
-                                        "lists the options.")}}});
+    list.blocks.push_back(
+        {Kind::Paragraph,
+         {{Span::Look::Plain,
+           texts.text("“fixwell help NAME” explains one of them, “fixwell --help” "
+                      "lists the options.")}}});
     return list;
 }
 
 Document withLinks(Document page, const Translator& texts)
 {
     if (!page.links.empty())
-        page.blocks.push_back({Block::Kind::Paragraph,
-                               {{Span::Look::Plain, texts.sentence("More: %@", {withCommands(page.links)})}}});
+        page.blocks.push_back(
+            {Block::Kind::Paragraph,
+             {{Span::Look::Plain, texts.sentence("More: %@", {withCommands(page.links)})}}});
     return page;
 }
 
@@ -129,8 +132,8 @@ int runHelp(const Request& request, const std::filesystem::path& book, const Tra
         Reporter::writeError(page.error());
         return exitUsage;
     }
-    return writePage(
-        manual::plainText(*page, {std::min(look.columns, mostColumns), look.colors}), texts);
+    return writePage(manual::plainText(*page, {std::min(look.columns, mostColumns), look.colors}),
+                     texts);
 }
 
 std::optional<int> runCompletion(const std::vector<std::string>& arguments,
@@ -139,15 +142,14 @@ std::optional<int> runCompletion(const std::vector<std::string>& arguments,
 {
     if (arguments.size() < 2 || arguments[0] != "--complete")
         return std::nullopt;
-    const CompletionSources sources{
-        commandTree(texts), [&disks] { return readSystemDisks(disks); },
-        [&book] {
-            const HelpPages pages(book);
-            std::vector<Candidate> topics;
-            for (const std::string& name : pages.names())
-                topics.push_back({name, pages.page(name).title});
-            return topics;
-        }};
+    const CompletionSources sources{commandTree(texts), [&disks] { return readSystemDisks(disks); },
+                                    [&book] {
+                                        const HelpPages pages(book);
+                                        std::vector<Candidate> topics;
+                                        for (const std::string& name : pages.names())
+                                            topics.push_back({name, pages.page(name).title});
+                                        return topics;
+                                    }};
     if (arguments[1] == "bash" && arguments.size() == 4)
         return writePage(bashReply(arguments[2], arguments[3], sources), texts);
     if (arguments[1] == "plain")

@@ -151,7 +151,8 @@ public:
             buttons[button.command] = {{"title", button.title},
                                        {"available", button.isAvailable},
                                        {"reason", textOrNull(button.reason)}};
-        write({{"event", "shown"}, {"module", view.module}, {"texts", texts}, {"buttons", buttons}});
+        write(
+            {{"event", "shown"}, {"module", view.module}, {"texts", texts}, {"buttons", buttons}});
         flush();
     }
 

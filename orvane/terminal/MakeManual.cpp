@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 
-// Writes the pages of the manual, at build time: "make-manual DIRECTORY SOURCES DATE". SOURCES is the
-// top of the project. What the program's help says stands there as well; nothing is said twice.
+// Writes the pages of the manual, at build time: "make-manual DIRECTORY SOURCES DATE". SOURCES is
+// the top of the project. What the program's help says stands there as well; nothing is said twice.
 
 #include "orvane/support/ProgramStart.h"
 #include "orvane/terminal/CommandLine.h"
@@ -51,9 +51,8 @@ Block heading(std::string words)
 /// The sections of a page of the help: what stands before the first is the page's own introduction.
 Document sectionsOf(Document page)
 {
-    const auto first = std::find_if(page.blocks.begin(), page.blocks.end(), [](const Block& block) {
-        return block.kind == Kind::Heading;
-    });
+    const auto first = std::find_if(page.blocks.begin(), page.blocks.end(),
+                                    [](const Block& block) { return block.kind == Kind::Heading; });
     page.blocks.erase(page.blocks.begin(), first);
     return page;
 }
@@ -93,7 +92,8 @@ Document pageOfFixwell(const fs::path& sources)
     Document page = readHelpPage(contentsOf(sources / "orvane/resources/manual/fixwell.html"));
     const Document end = splitAt(page, "See also");
     append(page, commandsOf(commandTree(english), english));
-    append(page, sectionsOf(readHelpPage(contentsOf(sources / "orvane/resources/help/en/terminal.html"))));
+    append(page, sectionsOf(
+                     readHelpPage(contentsOf(sources / "orvane/resources/help/en/terminal.html"))));
     append(page, end);
     return page;
 }
@@ -109,8 +109,10 @@ Document pageOfEvents(const fs::path& sources)
 
 void makeAll(const fs::path& directory, const fs::path& sources, const std::string& date)
 {
-    const auto make = [&](const std::string& name, const std::string& section, const Document& page) {
-        const ManPageHead head{name, section, page.title, "Orvane " + std::string(programVersion()), date};
+    const auto make = [&](const std::string& name, const std::string& section,
+                          const Document& page) {
+        const ManPageHead head{name, section, page.title, "Orvane " + std::string(programVersion()),
+                               date};
         writeNew(directory / ("man" + section) / (name + "." + section), manPage(head, page));
     };
     const auto ownPage = [&](const std::string& name) {

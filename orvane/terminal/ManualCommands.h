@@ -26,8 +26,8 @@ int writePage(const std::string& text, const Translator& texts);
 int runHelp(const Request& request, const std::filesystem::path& book, const Translator& texts,
             const TerminalLook& look);
 
-/// "--complete bash LINE REPLACED" or "--complete plain WORD...", which the shells' completions run;
-/// none for any other command line.
+/// "--complete bash LINE REPLACED" or "--complete plain WORD...", which the shells' completions
+/// run; none for any other command line.
 std::optional<int> runCompletion(const std::vector<std::string>& arguments,
                                  const std::filesystem::path& book, const DiskSources& disks,
                                  const Translator& texts);

@@ -50,9 +50,8 @@ private:
         measured.skipped = check.skipped;
         if (!check.run)
             return;
-        const auto newer = std::ranges::find_if(measured.runs, [&](const Run& run) {
-            return run.started >= check.run->started;
-        });
+        const auto newer = std::ranges::find_if(
+            measured.runs, [&](const Run& run) { return run.started >= check.run->started; });
         if (newer == measured.runs.end() || newer->started != check.run->started)
             measured.runs.insert(newer, *check.run);
     }

@@ -53,8 +53,8 @@ bool isNews(const PublishedCheck& check, Time told)
 std::string lineOn(const PublishedCheck& check, const Translator& texts)
 {
     return texts.sentence("%@: %@ (%@)",
-                          {contract::printable(check.device),
-                           texts.text(check.run->end->verdict), localTime(check.run->started)});
+                          {contract::printable(check.device), texts.text(check.run->end->verdict),
+                           localTime(check.run->started)});
 }
 
 }  // namespace

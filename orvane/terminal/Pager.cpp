@@ -154,8 +154,8 @@ Pager::Pager(pid_t id, FileDescriptor input)
 Pager::~Pager()
 {
     std::fflush(stdout);
-    // While the user reads, a key that interrupts is the pager's alone. It may be pressed as soon as the
-    // pager sees the end.
+    // While the user reads, a key that interrupts is the pager's alone. It may be pressed as soon
+    // as the pager sees the end.
     for (const int signal : endingSignals)
         handle(signal, SIG_IGN);
     giveBack(STDOUT_FILENO, outputBefore);

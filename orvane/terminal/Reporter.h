@@ -54,7 +54,8 @@ struct RunLine {
     std::string action;
     std::string verdict;  ///< empty for a run that was cut off with the program
     std::string message;
-    std::string record = {};  ///< of what the repair overwrote, where it can be undone; mostly empty
+    std::string record =
+        {};  ///< of what the repair overwrote, where it can be undone; mostly empty
 };
 
 /// What a module shows of the selected disks.
@@ -62,7 +63,7 @@ struct ModuleView {
     std::string module;  ///< its name, as the command line takes it
     std::string title;
     std::vector<std::pair<std::string, std::string>> texts;  ///< by the names of its controls
-    std::vector<ActionLine> buttons;  ///< what --press takes
+    std::vector<ActionLine> buttons;                         ///< what --press takes
 };
 
 /// One module of `fixwell modules`.

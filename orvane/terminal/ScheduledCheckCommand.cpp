@@ -110,7 +110,8 @@ private:
             return session_.texts().sentence(
                 "It is mounted at %@, and a scheduled check unmounts nothing.",
                 {contract::printable(disk->facts().mountPoint)});
-        // fsck.f2fs opens a disk for writing, though it is to write nothing. A unit may forbid that.
+        // fsck.f2fs opens a disk for writing, though it is to write nothing. A unit may forbid
+        // that.
         if (disk->facts().filesystem == "f2fs" && ::access(disk->facts().path.c_str(), W_OK) != 0)
             return session_.texts().text(
                 "Its tool opens it for writing, though it writes nothing, and that is not allowed "

@@ -77,10 +77,9 @@ SupportOptions Session::supportOptions(const Request& request)
 
 pellar::JobOptions Session::libraryOptions(const Request& request)
 {
-    pellar::JobOptions options =
-        orvane::libraryOptions(userXDGPaths(), libraryTexts_, asking(),
-                               [this](const std::string& sentence) { trace(sentence); },
-                               repairAdvice());
+    pellar::JobOptions options = orvane::libraryOptions(
+        userXDGPaths(), libraryTexts_, asking(),
+        [this](const std::string& sentence) { trace(sentence); }, repairAdvice());
     options.archiveFetching = {[fetches = request.fetchesArchives] { return fetches; },
                                libraryTexts_.text("With --fetch-archives the archives of these "
                                                   "packages are fetched over the network.")};
@@ -118,14 +117,16 @@ RepairAdvice Session::repairAdvice() const
                                names_.nameOf(disk.identifier));
             },
             [this, command](const contract::DiskReference& disk) {
-                return command("To apply it although damage would be left, which can be undone as "
-                               "well: %1$@",
-                               "repair --apply-unproven", disk, names_.namedOf(disk.identifier));
+                return command(
+                    "To apply it although damage would be left, which can be undone as "
+                    "well: %1$@",
+                    "repair --apply-unproven", disk, names_.namedOf(disk.identifier));
             },
             [this, command](const contract::DiskReference& disk) {
-                return command("To let the tool write to the disk itself, which cannot be undone: "
-                               "%1$@",
-                               "repair --direct", disk, names_.namedOf(disk.identifier));
+                return command(
+                    "To let the tool write to the disk itself, which cannot be undone: "
+                    "%1$@",
+                    "repair --direct", disk, names_.namedOf(disk.identifier));
             }};
 }
 
@@ -207,11 +208,10 @@ Result<void, Failure> Session::loadModule(std::string_view name)
     libraryTexts_.setResultTexts(loaded_.bundle->catalogue());
     if (!shouldRun(loaded_, host_))
         return Failure{
-            isChecking()
-                ? texts().text("cannot use ‘Fixwell’: it is switched off in the settings "
-                               "(OVModule_FXW)")
-                : texts().sentence("cannot use ‘%@’: it says that it does not run here",
-                                   {loaded_.name})};
+            isChecking() ? texts().text("cannot use ‘Fixwell’: it is switched off in the settings "
+                                        "(OVModule_FXW)")
+                         : texts().sentence("cannot use ‘%@’: it says that it does not run here",
+                                            {loaded_.name})};
     auto made = makeModule(loaded_, host_, *this);
     if (!made)
         return made.error();

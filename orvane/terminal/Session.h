@@ -94,7 +94,8 @@ public:
     const pellar::Manager& library() const { return library_; }
     /// Read when this is first asked.
     const RepairRecords& repairRecords();
-    /// What scheduled checks have found, this user's and the system's; read when this is first asked.
+    /// What scheduled checks have found, this user's and the system's; read when this is first
+    /// asked.
     const PublishedChecks& publishedChecks();
     /// When scheduled checks are due; asked for when this is first asked, for two seconds at most.
     const std::vector<CheckTimer>& checkTimers();
@@ -143,7 +144,7 @@ private:
     JobLedger ledger_;
     LoadedModule loaded_;
     std::unique_ptr<contract::OVModule> module_;
-    std::string currentDisk_;  ///< what the user calls the disk whose rows are coming
+    std::string currentDisk_;     ///< what the user calls the disk whose rows are coming
     HostJob* hostJob_ = nullptr;  ///< that is under way
     std::optional<RunEnd> unreportedEnd_;
     std::map<std::string, RunEnd> outcomes_;

@@ -37,13 +37,12 @@ bool press(const Request& request, Session& session, Reporter& reporter)
         return commandOf(button.first) == request.pressedButton;
     });
     if (found == buttons.end()) {
-        reporter.warning(cannot("press", request.pressedButton,
-                                request.module + " has no such button").message);
+        reporter.warning(
+            cannot("press", request.pressedButton, request.module + " has no such button").message);
         return false;
     }
     if (!found->second->isEnabled()) {
-        reporter.warning(
-            cannot("press", request.pressedButton, found->second->reason()).message);
+        reporter.warning(cannot("press", request.pressedButton, found->second->reason()).message);
         return false;
     }
     session.pressAndWait(session.button(found->first));

@@ -13,7 +13,8 @@
 namespace orvane {
 
 /// Alerts as text. A question is answered by --yes, or asked on the terminal, where only the word
-/// for yes, or its first letter, confirms, in English or in the user's language; without a terminal it is answered with the button that Return stands for.
+/// for yes, or its first letter, confirms, in English or in the user's language; without a terminal
+/// it is answered with the button that Return stands for.
 class TerminalAlerts final : public contract::Alerts {
 public:
     enum class Answer { Confirm, Ask, Decline };

@@ -19,8 +19,8 @@ std::string safeLines(std::string_view text);
 /// leans that way; without `colors`, the characters alone. Hostile text is made harmless.
 std::string terminalText(const contract::StyledText& text, bool colors);
 
-/// One word of a POSIX shell's command line that stands for the text, quoted where it has to be, and
-/// fit to be shown: one with control characters cannot be copied from there, but does no harm.
+/// One word of a POSIX shell's command line that stands for the text, quoted where it has to be,
+/// and fit to be shown: one with control characters cannot be copied from there, but does no harm.
 std::string shellWord(std::string_view text);
 
 /// How far a job is, as the bottom line of a terminal shows it.

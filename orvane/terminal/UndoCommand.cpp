@@ -96,8 +96,7 @@ pellar::Subject subjectOf(const Request& request)
 {
     if (request.treatsPermissions)
         return pellar::Subject::Permissions;
-    return request.treatsPartitionMap ? pellar::Subject::PartitionMap
-                                      : pellar::Subject::Filesystem;
+    return request.treatsPartitionMap ? pellar::Subject::PartitionMap : pellar::Subject::Filesystem;
 }
 
 int treat(const Request& request, const NamedDisk& named, const std::string& number,
@@ -109,9 +108,9 @@ int treat(const Request& request, const NamedDisk& named, const std::string& num
         reporter.failure(named.name, disk.error());
         return exitUnchecked;
     }
-    const pellar::Task task{subjectOf(request),
-                            request.command == Command::Undo ? pellar::Operation::Undo
-                                                             : pellar::Operation::Finish};
+    const pellar::Task task{subjectOf(request), request.command == Command::Undo
+                                                    ? pellar::Operation::Undo
+                                                    : pellar::Operation::Finish};
     const RunEnd end = session.carryOut(task, *disk);
     if (end.errorCode == contract::kPLNoError)
         return exitSound;

@@ -34,8 +34,9 @@ public:
 
     const manual::OptionEntry* option(std::string_view name) const
     {
-        const auto found = std::find_if(options_.begin(), options_.end(),
-                                        [&](const manual::OptionEntry& entry) { return entry.name == name; });
+        const auto found =
+            std::find_if(options_.begin(), options_.end(),
+                         [&](const manual::OptionEntry& entry) { return entry.name == name; });
         return found == options_.end() ? nullptr : &*found;
     }
 
@@ -112,8 +113,9 @@ std::string notExpected(const CLI::App& parser, const Known& known, const Transl
 }
 
 /// What was not understood comes first: what is missing may be because of it.
-std::string missing(const CLI::App& parser, const Known& known, const std::vector<std::string>& names,
-                    const manual::CommandTree& tree, const Translator& texts)
+std::string missing(const CLI::App& parser, const Known& known,
+                    const std::vector<std::string>& names, const manual::CommandTree& tree,
+                    const Translator& texts)
 {
     for (const std::string& word : parser.remaining(true))
         if (word.starts_with('-'))

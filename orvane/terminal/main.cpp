@@ -105,9 +105,9 @@ int runRequest(const Request& request, const std::filesystem::path& bundle,
                            : nullptr;
     switch (request.command) {
         case Command::Help: return runHelp(request, bundle / "help", texts, look);
-        case Command::Version: 
-            return runVersion(
-                libraryOptions(userXDGPaths(), LibraryTexts(catalogue)).toolPath, texts, look);
+        case Command::Version:
+            return runVersion(libraryOptions(userXDGPaths(), LibraryTexts(catalogue)).toolPath,
+                              texts, look);
         default: return runWithSession(request, texts, look, pager != nullptr);
     }
 }

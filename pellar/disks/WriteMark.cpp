@@ -18,8 +18,9 @@ std::string textOf(const timespec& time)
     return std::to_string(time.tv_sec) + "." + std::to_string(time.tv_nsec);
 }
 
-/// "8 0 64 1 5 0 40 2 0 4 3 ...": the seventh and the fourteenth are the sectors that were written, and
-/// discarded. The numbers of requests are no use: an fsync of ours counts as a write without any.
+/// "8 0 64 1 5 0 40 2 0 4 3 ...": the seventh and the fourteenth are the sectors that were written,
+/// and discarded. The numbers of requests are no use: an fsync of ours counts as a write without
+/// any.
 std::string writesOf(dev_t device)
 {
     std::istringstream numbers(readKernelFile("/sys/dev/block/" + std::to_string(major(device)) +

@@ -21,8 +21,8 @@ struct JobContext {
     JobLog log;
     RepairPolicy policy;
 
-    JobContext(const contract::DiskReference& disk_, const JobOptions& options_, const Texts& texts_,
-               StopSwitch& stop_, EventQueue& events_)
+    JobContext(const contract::DiskReference& disk_, const JobOptions& options_,
+               const Texts& texts_, StopSwitch& stop_, EventQueue& events_)
         : options(options_),
           texts(texts_),
           stop(stop_),

@@ -62,10 +62,10 @@ struct Trials {
     /// Makes a sentence in the user's language about a disk; asked on the job's thread, while the
     /// main thread runs. May be empty, and answer nothing, which is not told.
     using Advice = std::function<std::string(const contract::DiskReference&)>;
-    Advice howToUndo;            ///< how a repair is taken back
+    Advice howToUndo;             ///< how a repair is taken back
     Advice howToUndoPermissions;  ///< how one of permissions is
-    Advice howToApply;           ///< how one is applied that is not proven
-    Advice howToRepairDirectly;  ///< how one is done without a trial
+    Advice howToApply;            ///< how one is applied that is not proven
+    Advice howToRepairDirectly;   ///< how one is done without a trial
 };
 
 inline std::string adviceFor(const contract::DiskReference& disk, const Trials::Advice& advice)

@@ -63,7 +63,7 @@ private:
     std::vector<ToolLine> lines_;
     std::vector<std::uint64_t> logParts_;
     bool namesTool_ = false;  ///< its name is the job's, and its version is not known yet
-    bool isEnded_ = false;  ///< by us, because of the disk
+    bool isEnded_ = false;    ///< by us, because of the disk
 };
 
 }  // namespace pellar

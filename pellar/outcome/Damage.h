@@ -16,8 +16,8 @@ public:
         Contents = 4,      ///< files or directories with parts that make no sense
         SharedBlocks = 8,  ///< two files lay claim to one place on the disk
         Structure = 16,    ///< what the file system itself is built on
-        Unfinished = 32,   ///< it was in use to the last, and it is not known what was being written
-        Unsurveyed = 64,   ///< the check gave up, so there may be much more
+        Unfinished = 32,  ///< it was in use to the last, and it is not known what was being written
+        Unsurveyed = 64,  ///< the check gave up, so there may be much more
     };
 
     constexpr Damage() = default;

@@ -61,7 +61,7 @@ private:
     Extents extents_;
     std::uint64_t keptBytes_ = 0;
     std::uint64_t knownRoom_ = 0;  ///< bytes that may be appended before it is looked again
-    ByteRange known_;  ///< of the disk: a hole, or data, to its end
+    ByteRange known_;              ///< of the disk: a hole, or data, to its end
     bool isKnownHole_ = false;
     std::optional<std::uint64_t> unreadable_;
     bool isOutOfRoom_ = false;

@@ -46,7 +46,8 @@ Outcome outcomeOfMapVerification(const PartitionMap& map, const MapReport& repor
         return unreadableMap(*map.unreadableSector);
     switch (report.verdict) {
         case MapVerdict::None:
-            return failedOutcome(contract::kPLErrorNoPartitionMap, {"there is no partition map", {}, {}});
+            return failedOutcome(contract::kPLErrorNoPartitionMap,
+                                 {"there is no partition map", {}, {}});
         case MapVerdict::Sound: return {Verdict::Sound, contract::kPLNoError, 0, {}, {}};
         case MapVerdict::Repairable:
             return {Verdict::Damaged,

@@ -95,8 +95,8 @@ Superblock readSuperblock(int descriptor, ByteRange range)
     const int result = blkid_do_safeprobe(probe.get());
     if (result != 0)
         return {{}, {}, {}, {}, {}, result == ambivalent};
-    return {valueOf(probe, "USAGE"), valueOf(probe, "TYPE"), valueOf(probe, "LABEL"),
-            valueOf(probe, "UUID"), valueOf(probe, "VERSION"), false};
+    return {valueOf(probe, "USAGE"), valueOf(probe, "TYPE"),    valueOf(probe, "LABEL"),
+            valueOf(probe, "UUID"),  valueOf(probe, "VERSION"), false};
 }
 
 std::optional<PartitionTable> readPartitionTable(int descriptor)

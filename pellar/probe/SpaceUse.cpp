@@ -44,11 +44,11 @@ std::optional<Blocks> readFAT32(int descriptor, std::uint64_t start)
     const std::uint64_t sector = littleEndian(*boot, 11, 2);
     const std::uint64_t perCluster = littleEndian(*boot, 13, 1);
     const std::uint64_t sectors = littleEndian(*boot, 32, 4);
-    const std::uint64_t before = littleEndian(*boot, 14, 2) +
-                                 littleEndian(*boot, 16, 1) * littleEndian(*boot, 36, 4);
+    const std::uint64_t before =
+        littleEndian(*boot, 14, 2) + littleEndian(*boot, 16, 1) * littleEndian(*boot, 36, 4);
     const auto info = readDisk(descriptor, start + littleEndian(*boot, 48, 2) * sector, 512);
-    if (!info || perCluster == 0 || before > sectors ||
-        littleEndian(*info, 0, 4) != 0x41615252 || littleEndian(*info, 484, 4) != 0x61417272)
+    if (!info || perCluster == 0 || before > sectors || littleEndian(*info, 0, 4) != 0x41615252 ||
+        littleEndian(*info, 484, 4) != 0x61417272)
         return std::nullopt;
     return Blocks{sector * perCluster, (sectors - before) / perCluster,
                   littleEndian(*info, 488, 4)};

@@ -24,8 +24,8 @@ using SyncFunction = std::function<int(int descriptor)>;
 /// All of an open file; EFBIG when it has more bytes than `most`, or another errno.
 [[nodiscard]] Result<std::string, int> readWhole(const FileDescriptor& file, std::uint64_t most);
 
-/// Keeps other processes that take it from working in an open directory until it is destroyed; waits
-/// for those that do (flock(2)).
+/// Keeps other processes that take it from working in an open directory until it is destroyed;
+/// waits for those that do (flock(2)).
 class DirectoryLock {
 public:
     /// The descriptor stays open as long as the lock.

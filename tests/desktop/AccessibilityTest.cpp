@@ -91,10 +91,11 @@ TEST_F(AccessibilityTest, WhatCameOutIsReadAsText)
     open({image});
     run("verifyDiskButton", image);
     ASSERT_TRUE(waitForStep(NextStep::Repair));
-    for (const auto& [name, beginning] :
-         {std::pair("resultTitle", "Damaged: "), {"diskState", "Damaged"}, {"diskTitle", "damaged"}}) {
-        QAccessibleInterface* const label = QAccessible::queryAccessibleInterface(
-            window().findChild<QLabel*>(QLatin1String(name)));
+    for (const auto& [name, beginning] : {std::pair("resultTitle", "Damaged: "),
+                                          {"diskState", "Damaged"},
+                                          {"diskTitle", "damaged"}}) {
+        QAccessibleInterface* const label =
+            QAccessible::queryAccessibleInterface(window().findChild<QLabel*>(QLatin1String(name)));
         EXPECT_EQ(label->role(), QAccessible::StaticText) << name;
         EXPECT_TRUE(fromQt(label->text(QAccessible::Name)).starts_with(beginning))
             << fromQt(label->text(QAccessible::Name));
@@ -146,9 +147,8 @@ TEST_P(ColorTest, TextIsReadableAndMarksAreSeen)
     }
 }
 
-INSTANTIATE_TEST_SUITE_P(In, ColorTest, testing::Bool(), [](const auto& isDark) {
-    return isDark.param ? "Dark" : "Light";
-});
+INSTANTIATE_TEST_SUITE_P(In, ColorTest, testing::Bool(),
+                         [](const auto& isDark) { return isDark.param ? "Dark" : "Light"; });
 
 /// A language, and how much larger the font is.
 class RoomTest : public WindowFixture,
@@ -235,7 +235,8 @@ TEST_P(RoomTest, NothingIsClipped)
 }
 
 INSTANTIATE_TEST_SUITE_P(At, RoomTest,
-                         testing::Combine(testing::Values("C", "de", "es", "fr", "ja"), testing::Values(1.0, 2.0)),
+                         testing::Combine(testing::Values("C", "de", "es", "fr", "ja"),
+                                          testing::Values(1.0, 2.0)),
                          [](const auto& look) {
                              return std::string(std::get<0>(look.param)) +
                                     (std::get<1>(look.param) > 1 ? "Large" : "");

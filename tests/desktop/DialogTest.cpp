@@ -7,8 +7,8 @@
 #include "orvane/support/settings/Switch.h"
 
 #include <QAccessible>
-#include <QCheckBox>
 #include <QApplication>
+#include <QCheckBox>
 #include <QClipboard>
 #include <QComboBox>
 #include <QDialogButtonBox>
@@ -121,7 +121,8 @@ protected:
         const auto path = directory_ / file;
         emit window().findChild<QFileDialog*>()->fileSelected(toQt(path.native()));
         const auto isOver = [this] {
-            return window().findChild<QProgressDialog*>(QStringLiteral("reportProgress")) == nullptr;
+            return window().findChild<QProgressDialog*>(QStringLiteral("reportProgress")) ==
+                   nullptr;
         };
         EXPECT_TRUE(waitUntil(isOver));
         return contentsOf(path);

@@ -145,8 +145,8 @@ TEST_F(DiskListTest, AParentSaysWhatItsWorstPartIs)
     for (const Case& c :
          {Case{"sound", "damaged", "", "damaged: a1"}, Case{"damaged", "sound", "", "damaged"},
           Case{"sound", "failed", "", "failed: a1"}, Case{"sound", "sound", "", "sound"},
-          Case{"", "sound", "", "sound"}, Case{"sound", "", "", "partly checked"}, Case{"", "", "", ""},
-          Case{"damaged", "sound", "a1", "verifying…"}}) {
+          Case{"", "sound", "", "sound"}, Case{"sound", "", "", "partly checked"},
+          Case{"", "", "", ""}, Case{"damaged", "sound", "a1", "verifying…"}}) {
         checks_.clear();
         if (!c.verdictOfDisk.empty())
             checks_["a"].told.verdict = c.verdictOfDisk;

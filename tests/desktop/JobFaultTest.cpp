@@ -69,8 +69,9 @@ TEST_F(JobFaultTest, AnImageThatChangedSinceItWasOpenedIsReadAgain)
     fs::rename(makeDamagedImage("second"), image);
     run("verifyDiskButton");
     EXPECT_EQ(verdict(image), "damaged");
-    EXPECT_TRUE(waitUntil(
-        [this] { return window().banner().summary().details.find("“second”") != std::string::npos; }));
+    EXPECT_TRUE(waitUntil([this] {
+        return window().banner().summary().details.find("“second”") != std::string::npos;
+    }));
     EXPECT_EQ(cell(image, DiskColumn::Name), "second (first.img)");
     EXPECT_TRUE(logHolds("needs to be repaired")) << testing::PrintToString(logRows());
     EXPECT_FALSE(logHolds("appears to be OK")) << "that was another volume";

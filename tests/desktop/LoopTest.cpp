@@ -88,7 +88,8 @@ TEST(ScheduledChecks, WhatOthersPublishAppearsByItself)
     };
     QtLoop loop;
     int changes = 0;
-    ScheduledChecks checks(loop, [&] { ++changes; }, directory.path());
+    ScheduledChecks checks(
+        loop, [&] { ++changes; }, directory.path());
     publish("sound");
     EXPECT_EQ(checks.lastRun("k"), nullptr) << "before the start";
     checks.start();

@@ -20,14 +20,15 @@ constexpr const char* volume = "/dev/no-such-volume";
 
 class ModulesTest : public WindowFixture {
 protected:
-    /// The window with both modules, an image, and a volume that is selected and said to be mounted.
+    /// The window with both modules, an image, and a volume that is selected and said to be
+    /// mounted.
     void openBoth()
     {
         image_ = makeImage("Holidays");
         SessionOptions wanted = options({image_});
-        wanted.moduleDirectories.insert(wanted.moduleDirectories.begin(),
-                                        runningExecutable().parent_path().parent_path() /
-                                            "examples");
+        wanted.moduleDirectories.insert(
+            wanted.moduleDirectories.begin(),
+            runningExecutable().parent_path().parent_path() / "examples");
         openWith(std::move(wanted));
         ASSERT_TRUE(waitUntil([&] {
             return session().host().sharedDiskController().roots().size() == 2;
@@ -52,7 +53,8 @@ protected:
     void show(int tab) { window().tabs().setCurrentIndex(tab); }
     std::string usage()
     {
-        return fromQt(window().tabs().widget(usageTab)->findChild<QPlainTextEdit*>()->toPlainText());
+        return fromQt(
+            window().tabs().widget(usageTab)->findChild<QPlainTextEdit*>()->toPlainText());
     }
     QtButton& measureButton() { return button("measureButton"); }
     bool waitUntilFree()

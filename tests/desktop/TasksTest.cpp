@@ -91,8 +91,7 @@ protected:
     void restOn(QWidget& widget)
     {
         ++steps_;
-        QTest::mouseMove(window().windowHandle(),
-                         widget.mapTo(&window(), widget.rect().center()));
+        QTest::mouseMove(window().windowHandle(), widget.mapTo(&window(), widget.rect().center()));
     }
 
     // By the keyboard: whatever has the focus gets it.
@@ -413,7 +412,8 @@ TEST_P(TasksTest, FindOutWhyRepairIsGrey)
         type(Qt::Key_Down);
     }
     EXPECT_TRUE(waitUntil([] { return QToolTip::isVisible(); }));
-    EXPECT_TRUE(QToolTip::text().contains(QStringLiteral("the disk is in use: "))) << fromQt(QToolTip::text());
+    EXPECT_TRUE(QToolTip::text().contains(QStringLiteral("the disk is in use: ")))
+        << fromQt(QToolTip::text());
     expectSteps(2, 3);
 }
 

@@ -183,7 +183,8 @@ std::string WindowFixture::result()
 
 bool WindowFixture::waitForStep(NextStep step)
 {
-    return waitUntil([&] { return std::ranges::count(window().banner().summary().steps, step) != 0; });
+    return waitUntil(
+        [&] { return std::ranges::count(window().banner().summary().steps, step) != 0; });
 }
 
 void WindowFixture::take(NextStep step)

@@ -46,8 +46,7 @@ TEST(Outcome, OfARepairIsWhatTheVerificationFinds)
     for (const Case& c :
          {Case{{nothing}, sound(), Verdict::Sound}, Case{{all}, sound(), Verdict::Repaired},
           Case{{replayed}, sound(), Verdict::Repaired}, Case{{all}, damaged(), Verdict::Damaged},
-          Case{{some, all}, sound(), Verdict::Repaired},
-          Case{{silent}, sound(), Verdict::Repaired},
+          Case{{some, all}, sound(), Verdict::Repaired}, Case{{silent}, sound(), Verdict::Repaired},
           Case{{{killed(), false, false}}, damaged(), Verdict::Damaged}}) {
         const Outcome outcome = outcomeOfRepair(c.passes, c.confirmation);
         EXPECT_EQ(outcome.verdict, c.verdict);

@@ -4,8 +4,8 @@
 // its cases are skipped.
 
 #include "contract/pellar/ErrorCodes.h"
-#include "pellar/outcome/Outcome.h"
 #include "pellar/disks/LoopDevice.h"
+#include "pellar/outcome/Outcome.h"
 #include "pellar/process/Command.h"
 #include "tests/pellar/JobFixture.h"
 #include "tests/support/LoopDevice.h"
@@ -323,7 +323,8 @@ TEST(RealE2fsck, FindsDamageAndRepairsIt)
             EXPECT_EQ(library.listener.message, "repaired “Disk”: " + std::string(damage.message));
             const auto warnings = library.listener.textsOf(contract::kFsckFail);
             const bool isLoss = test::contains(damage.message, " file");
-            const bool hasWarned = !warnings.empty() && warnings.back() == asLine(library.listener.message);
+            const bool hasWarned =
+                !warnings.empty() && warnings.back() == asLine(library.listener.message);
             EXPECT_EQ(hasWarned, isLoss) << damage.message;
             EXPECT_EQ(library.listener.result.boolean(contract::kPLHasLosses), isLoss);
         }

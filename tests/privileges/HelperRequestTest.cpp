@@ -172,15 +172,14 @@ TEST(HelperRequest, NoOptionIsTakenThatDoesNotGoWithTheRest)
         std::vector<std::string> options;
         std::string_view because;
     };
-    for (const Case& c :
-         {Case{"repair", {"--preview", "--direct"}, "both writing and not"},
-          Case{"repair", {"--preview", "--no-undo"}, "nothing is to be undone"},
-          Case{"repair", {"--preview", "--preview"}, "once is enough"},
-          Case{"repair", {"--keep=/etc/shadow"}, "no file is written for a user"},
-          Case{"repair", {"--fetch-archives"}, "of permissions"},
-          Case{"verify", {"--direct"}, "a verification writes nothing"},
-          Case{"undo", {"--direct"}, "of repairs"},
-          Case{"repair-permissions", {"--preview"}, "it would be done for real"}})
+    for (const Case& c : {Case{"repair", {"--preview", "--direct"}, "both writing and not"},
+                          Case{"repair", {"--preview", "--no-undo"}, "nothing is to be undone"},
+                          Case{"repair", {"--preview", "--preview"}, "once is enough"},
+                          Case{"repair", {"--keep=/etc/shadow"}, "no file is written for a user"},
+                          Case{"repair", {"--fetch-archives"}, "of permissions"},
+                          Case{"verify", {"--direct"}, "a verification writes nothing"},
+                          Case{"undo", {"--direct"}, "of repairs"},
+                          Case{"repair-permissions", {"--preview"}, "it would be done for real"}})
         EXPECT_FALSE(onDevice(c.task, c.options)) << c.task << ": " << c.because;
     EXPECT_FALSE(isTaken({"attach-undo", "7", "512", "1024"}, {}))
         << "what is kept of an image is its user's";

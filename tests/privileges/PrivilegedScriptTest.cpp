@@ -26,18 +26,17 @@ protected:
         const auto launcher = workshop_.path("launcher");
         std::ofstream(launcher) << "#!/bin/sh\n" << script << "\n";
         std::filesystem::permissions(launcher, std::filesystem::perms::owner_all);
-        const HelperLaunch how{{launcher.native()},
-                               "",
-                               {[this] { asking_ += "begins "; },
-                                [this] {
-                                    asking_ += "ends ";
-                                }},
-                               {[](const contract::DiskReference& disk) {
-                                    return "type: undo " + disk.name;
-                                },
-                                {},
-                                {},
-                                {}}};
+        const HelperLaunch how{
+            {launcher.native()},
+            "",
+            {[this] { asking_ += "begins "; },
+             [this] {
+                 asking_ += "ends ";
+             }},
+            {[](const contract::DiskReference& disk) { return "type: undo " + disk.name; },
+             {},
+             {},
+             {}}};
         job_ = std::make_unique<pellar::Job>(
             [this, how, job](pellar::StopSwitch& stop, pellar::EventQueue& road) {
                 return std::make_unique<PrivilegedScript>(how, job, texts_, stop, road);

@@ -31,7 +31,8 @@ const std::map<std::string, std::set<std::string>> housesBelow{
     {"orvane/privileges", {"contract", "pellar", "orvane/support", "orvane/jobs"}},
     {"orvane/terminal",
      {"contract", "pellar", "orvane/support", "orvane/jobs", "orvane/privileges"}},
-    {"orvane/desktop", {"contract", "pellar", "orvane/support", "orvane/jobs", "orvane/privileges"}},
+    {"orvane/desktop",
+     {"contract", "pellar", "orvane/support", "orvane/jobs", "orvane/privileges"}},
 };
 
 std::string folderOf(const std::string& file)
@@ -69,7 +70,8 @@ void findCircles(const Includes& folders, std::vector<std::string>& path,
                  std::set<std::string>& finished, std::vector<std::string>& faults)
 {
     const auto next = folders.find(path.back());
-    for (const std::string& folder : next == folders.end() ? std::set<std::string>() : next->second) {
+    for (const std::string& folder :
+         next == folders.end() ? std::set<std::string>() : next->second) {
         const auto met = std::find(path.begin(), path.end(), folder);
         if (met != path.end()) {
             std::string circle;
@@ -136,23 +138,27 @@ TEST(Includes, AFaultIsFound)
         std::string_view because;
     };
     for (const Case& c : {
-             Case{{{"pellar/a/x.cpp", {"pellar/a/x.h", "pellar/b/y.h", "contract/z.h"}}}, 0, "fine"},
+             Case{
+                 {{"pellar/a/x.cpp", {"pellar/a/x.h", "pellar/b/y.h", "contract/z.h"}}}, 0, "fine"},
              Case{{{"pellar/a/x.h", {"orvane/support/y.h"}}}, 1, "up"},
              Case{{{"orvane/terminal/x.h", {"orvane/desktop/y.h"}}}, 1, "sideways"},
              Case{{{"orvane/terminal/x.h", {"fixwell/module/OVFXW.h"}}}, 1, "into the module"},
              Case{{{"fixwell/jobs/x.h", {"pellar/Manager.h"}}}, 1, "out of the module"},
-             Case{{{"pellar/a/x.h", {"pellar/b/y.h"}}, {"pellar/b/z.h", {"pellar/a/w.h"}}}, 1,
+             Case{{{"pellar/a/x.h", {"pellar/b/y.h"}}, {"pellar/b/z.h", {"pellar/a/w.h"}}},
+                  1,
                   "a circle of two folders"},
              Case{{{"pellar/a/x.h", {"pellar/b/y.h"}},
                    {"pellar/b/z.h", {"pellar/c/w.h"}},
                    {"pellar/c/w.h", {"pellar/a/v.h"}}},
                   1,
                   "of three"},
-             Case{{{"pellar/x.h", {"pellar/a/y.h"}}, {"pellar/a/y.h", {"pellar/z.h"}}}, 1,
+             Case{{{"pellar/x.h", {"pellar/a/y.h"}}, {"pellar/a/y.h", {"pellar/z.h"}}},
+                  1,
                   "with the folder above"},
              Case{{{"fixwell/module/OVFXW.h", {"fixwell/jobs/x.h"}},
                    {"fixwell/jobs/y.cpp", {"fixwell/module/OVFXW.h"}}},
-                  0, "the controller's part"},
+                  0,
+                  "the controller's part"},
          })
         EXPECT_EQ(faultsIn(c.planted).size(), c.faults) << c.because;
 }

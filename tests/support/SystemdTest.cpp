@@ -36,7 +36,8 @@ std::vector<std::pair<std::string, std::string>> fieldsIn(std::string_view text)
         if (text.data()[-1] == '\n') {
             length = 0;
             for (int i = 7; i >= 0; --i)
-                length = length << 8U | static_cast<unsigned char>(text[static_cast<std::size_t>(i)]);
+                length =
+                    length << 8U | static_cast<unsigned char>(text[static_cast<std::size_t>(i)]);
             text.remove_prefix(8);
         }
         fields.emplace_back(name, text.substr(0, length));
@@ -57,9 +58,11 @@ TEST(Journal, NoValueBecomesAFieldOfItsOwn)
     ASSERT_EQ(::bind(journal.get(), reinterpret_cast<sockaddr*>(&address), sizeof address), 0);
 
     const std::string hostile("x\nPRIORITY=0\n\xff\0", 15);
-    ASSERT_TRUE(writeToJournal(
-        {{"MESSAGE", "a=b"}, {"FIXWELL_LABEL", hostile}, {"EMPTY", ""}, {"LONG", std::string(1 << 20, '\n')}},
-        path));
+    ASSERT_TRUE(writeToJournal({{"MESSAGE", "a=b"},
+                                {"FIXWELL_LABEL", hostile},
+                                {"EMPTY", ""},
+                                {"LONG", std::string(1 << 20, '\n')}},
+                               path));
     std::string text(1 << 20, '\0');
     text.resize(static_cast<std::size_t>(::recv(journal.get(), text.data(), text.size(), 0)));
     const auto fields = fieldsIn(text);
@@ -100,9 +103,12 @@ std::shared_ptr<Disk> volume(const std::string& path, const std::string& mountPo
     facts.mountPoint = mountPoint;
     facts.type = diskType::volume;
     facts.storage = contract::DiskReference::Storage::BlockDevice;
-    return std::make_shared<Disk>(facts, Disk::Surroundings{[](std::string_view type) {
-        return FilesystemCapabilities{type == "btrfs" || type == "ext4", true, type == "btrfs"};
-    }, nullptr});
+    return std::make_shared<Disk>(
+        facts, Disk::Surroundings{[](std::string_view type) {
+                                      return FilesystemCapabilities{
+                                          type == "btrfs" || type == "ext4", true, type == "btrfs"};
+                                  },
+                                  nullptr});
 }
 
 TEST(CheckTimers, TheFirstOfThoseThatAreAboutADiskIsItsNext)
@@ -113,12 +119,12 @@ TEST(CheckTimers, TheFirstOfThoseThatAreAboutADiskIsItsNext)
         std::optional<Time> next;
         std::string_view because;
     };
-    for (const Case& c :
-         {Case{{}, std::nullopt, "no timers"}, Case{{{"/dev/sdc1", sunday}}, std::nullopt, "another"},
-          Case{{{"/dev/sdb1", sunday}}, sunday, "by its path"},
-          Case{{{"LABEL=Photos", sunday}}, sunday, "by its label"},
-          Case{{{"LABEL=", sunday}}, std::nullopt, "of no label"},
-          Case{{{"UUID=1234", monday}, {"all", sunday}}, sunday, "the sooner one"}})
+    for (const Case& c : {Case{{}, std::nullopt, "no timers"},
+                          Case{{{"/dev/sdc1", sunday}}, std::nullopt, "another"},
+                          Case{{{"/dev/sdb1", sunday}}, sunday, "by its path"},
+                          Case{{{"LABEL=Photos", sunday}}, sunday, "by its label"},
+                          Case{{{"LABEL=", sunday}}, std::nullopt, "of no label"},
+                          Case{{{"UUID=1234", monday}, {"all", sunday}}, sunday, "the sooner one"}})
         EXPECT_EQ(nextCheckOf(*volume("/dev/sdb1"), c.timers), c.next) << c.because;
 
     auto facts = volume("/dev/sdb1", "/mnt")->facts();
@@ -136,9 +142,9 @@ TEST(CheckTimers, TheFirstOfThoseThatAreAboutADiskIsItsNext)
     EXPECT_FALSE(with("swap")) << "nothing verifies it";
 }
 
-using Unit = sdbus::Struct<std::string, std::string, std::string, std::string, std::string,
-                           std::string, sdbus::ObjectPath, std::uint32_t, std::string,
-                           sdbus::ObjectPath>;
+using Unit =
+    sdbus::Struct<std::string, std::string, std::string, std::string, std::string, std::string,
+                  sdbus::ObjectPath, std::uint32_t, std::string, sdbus::ObjectPath>;
 
 /// A service manager with timers, by their units; each says when it is due.
 class FakeManager {
@@ -157,15 +163,16 @@ public:
             test::finish(*objects_.back());
         }
         objects_.push_back(sdbus::createObject(*connection_, sdbus::ObjectPath(top)));
-        test::addMethod(*objects_.back(), "org.freedesktop.systemd1.Manager", "ListUnitsByPatterns",
-                        [this](sdbus::Result<std::vector<Unit>>&& result,
-                               const std::vector<std::string>& /*states*/,
-                               const std::vector<std::string>& patterns) {
-                            if (answers && patterns == std::vector<std::string>{"fixwell-check@*.timer"})
-                                result.returnResults(units_);
-                            else
-                                unanswered_.push_back(std::move(result));
-                        });
+        test::addMethod(
+            *objects_.back(), "org.freedesktop.systemd1.Manager", "ListUnitsByPatterns",
+            [this](sdbus::Result<std::vector<Unit>>&& result,
+                   const std::vector<std::string>& /*states*/,
+                   const std::vector<std::string>& patterns) {
+                if (answers && patterns == std::vector<std::string>{"fixwell-check@*.timer"})
+                    result.returnResults(units_);
+                else
+                    unanswered_.push_back(std::move(result));
+            });
         test::finish(*objects_.back());
         connection_->requestName(BusServiceName("org.freedesktop.systemd1"));
         connection_->enterEventLoopAsync();

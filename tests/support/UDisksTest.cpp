@@ -25,12 +25,12 @@ namespace {
 
 using Kind = Refusal::Kind;
 using pellar::Access;
-using test::LoopDevice;
-using test::SystemBus;
 using test::addMethod;
 using test::addProperties;
 using test::always;
 using test::finish;
+using test::LoopDevice;
+using test::SystemBus;
 using test::TestDirectory;
 using namespace std::chrono_literals;
 

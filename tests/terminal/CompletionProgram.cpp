@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Stands for fixwell where a shell's completions run it: the same, with the disks of a directory, in
-// the environment's COMPLETION_DISKS.
+// Stands for fixwell where a shell's completions run it: the same, with the disks of a directory,
+// in the environment's COMPLETION_DISKS.
 #include "orvane/support/texts/Language.h"
 #include "orvane/terminal/ManualCommands.h"
 

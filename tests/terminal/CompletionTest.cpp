@@ -17,11 +17,33 @@ namespace {
 namespace fs = std::filesystem;
 
 /// Labels that a shell would do something with, or a terminal.
-const std::vector<std::string> hostileLabels{
-    "My Photos", "it's \"odd\"", "$(touch pwned)", "`touch pwned`", "a;touch pwned&", "x|touch pwned",
-    "line\nend", "tab\there", "!!", "!touch", "back\\slash\\", "~", "日本 ディスク", "\x1b[2J\x07",
-    "*", "-x", "#c", "\xff\xfe 1", "${HOME}", "a=b:c", "{a,b}", ">pwned", "\xe2\x80\xaegnp", "'", "\"",
-    "''\"\"$'\\n'", "end "};
+const std::vector<std::string> hostileLabels{"My Photos",
+                                             "it's \"odd\"",
+                                             "$(touch pwned)",
+                                             "`touch pwned`",
+                                             "a;touch pwned&",
+                                             "x|touch pwned",
+                                             "line\nend",
+                                             "tab\there",
+                                             "!!",
+                                             "!touch",
+                                             "back\\slash\\",
+                                             "~",
+                                             "日本 ディスク",
+                                             "\x1b[2J\x07",
+                                             "*",
+                                             "-x",
+                                             "#c",
+                                             "\xff\xfe 1",
+                                             "${HOME}",
+                                             "a=b:c",
+                                             "{a,b}",
+                                             ">pwned",
+                                             "\xe2\x80\xaegnp",
+                                             "'",
+                                             "\"",
+                                             "''\"\"$'\\n'",
+                                             "end "};
 
 DiskFacts volume(const std::string& path, const std::string& label, const std::string& uuid = {})
 {
@@ -37,7 +59,9 @@ DiskFacts volume(const std::string& path, const std::string& label, const std::s
 CompletionSources sourcesWith(std::vector<DiskTree> disks)
 {
     return {commandTree({}), [disks] { return disks; },
-            [] { return std::vector<Candidate>{{"verdicts", "What the answers mean"}}; }};
+            [] {
+                return std::vector<Candidate>{{"verdicts", "What the answers mean"}};
+            }};
 }
 
 std::vector<std::string> valuesOf(const Offer& offer)
@@ -63,28 +87,36 @@ TEST(Completion, WhatIsOfferedGoesByWhatIsThere)
         bool takesFiles;
         std::string_view because;
     };
-    for (const Case& c : {
-             Case{{""}, {"verify", "help", "list"}, {"--json", "/dev/sdb"}, false, "a command"},
-             Case{{"--color", "never", ""}, {"verify"}, {"never"}, false, "an option came before"},
-             Case{{"--color", ""}, {"auto", "always", "never"}, {"verify"}, false, "its value"},
-             Case{{"--color=a"}, {"--color=auto"}, {"auto"}, false, "the same in one word"},
-             Case{{"verify", "--"}, {"--thorough", "--json"}, {"--preview", "verify"}, false, "options"},
-             Case{{"verify", "--", "-"}, {"/dev/sdb1"}, {"--json"}, true, "no options any more"},
-             Case{{"repair", "--preview", "--keep", ""}, {}, {"/dev/sdb1", "--keep"}, true, "a file"},
-             Case{{"verify", "/dev/sdb1", ""},
-                  {"/dev/sdb", "/dev/sdb2", "/dev/sdc", "LABEL=Photos", "/mnt/photos"},
-                  {"LABEL=two", "UUID=1-2", "LABEL="}, true, "disks; not what two of them are called"},
-             Case{{"mount", "U"}, {"UUID=1-2"}, {}, true, "asked for"},
-             Case{{"attach", ""}, {}, {"/dev/sdb"}, true, "images alone"},
-             Case{{"help", ""}, {"verify", "verdicts"}, {"/dev/sdb"}, false, "topics"},
-             Case{{"help", "verify", ""}, {}, {"verdicts"}, false, "one is enough"},
-             Case{{"no-such-command", ""}, {"verify"}, {"/dev/sdb"}, false, "still none"}}) {
+    for (const Case& c :
+         {Case{{""}, {"verify", "help", "list"}, {"--json", "/dev/sdb"}, false, "a command"},
+          Case{{"--color", "never", ""}, {"verify"}, {"never"}, false, "an option came before"},
+          Case{{"--color", ""}, {"auto", "always", "never"}, {"verify"}, false, "its value"},
+          Case{{"--color=a"}, {"--color=auto"}, {"auto"}, false, "the same in one word"},
+          Case{{"verify", "--"},
+               {"--thorough", "--json"},
+               {"--preview", "verify"},
+               false,
+               "options"},
+          Case{{"verify", "--", "-"}, {"/dev/sdb1"}, {"--json"}, true, "no options any more"},
+          Case{{"repair", "--preview", "--keep", ""}, {}, {"/dev/sdb1", "--keep"}, true, "a file"},
+          Case{{"verify", "/dev/sdb1", ""},
+               {"/dev/sdb", "/dev/sdb2", "/dev/sdc", "LABEL=Photos", "/mnt/photos"},
+               {"LABEL=two", "UUID=1-2", "LABEL="},
+               true,
+               "disks; not what two of them are called"},
+          Case{{"mount", "U"}, {"UUID=1-2"}, {}, true, "asked for"},
+          Case{{"attach", ""}, {}, {"/dev/sdb"}, true, "images alone"},
+          Case{{"help", ""}, {"verify", "verdicts"}, {"/dev/sdb"}, false, "topics"},
+          Case{{"help", "verify", ""}, {}, {"verdicts"}, false, "one is enough"},
+          Case{{"no-such-command", ""}, {"verify"}, {"/dev/sdb"}, false, "still none"}}) {
         const Offer offer = offerFor(c.words, sources);
         const Words values = valuesOf(offer);
         for (const std::string& value : c.has)
-            EXPECT_EQ(std::count(values.begin(), values.end(), value), 1) << value << ": " << c.because;
+            EXPECT_EQ(std::count(values.begin(), values.end(), value), 1)
+                << value << ": " << c.because;
         for (const std::string& value : c.hasNot)
-            EXPECT_EQ(std::count(values.begin(), values.end(), value), 0) << value << ": " << c.because;
+            EXPECT_EQ(std::count(values.begin(), values.end(), value), 0)
+                << value << ": " << c.because;
         EXPECT_EQ(offer.takesFiles, c.takesFiles) << c.because;
     }
 }
@@ -95,12 +127,13 @@ TEST(Completion, WhatIsWrittenForBashIsReadBackTheSame)
     using Quote = ShellLine::Quote;
     for (const std::string& label : hostileLabels) {
         const std::string& text = label;
-        for (const auto& [opening, quote, closing] :
-             {std::tuple{"", Quote::None, ""}, {"'", Quote::Single, "'"}, {"\"", Quote::Double, "\""}}) {
+        for (const auto& [opening, quote, closing] : {std::tuple{"", Quote::None, ""},
+                                                      {"'", Quote::Single, "'"},
+                                                      {"\"", Quote::Double, "\""}}) {
             const std::string written = bashText(text, quote);
             EXPECT_FALSE(test::holdsControls(written)) << written;
-            const auto echoed = test::runTool(
-                {"bash", "-c", "printf %s " + (opening + written + closing)});
+            const auto echoed =
+                test::runTool({"bash", "-c", "printf %s " + (opening + written + closing)});
             EXPECT_EQ(echoed.output, text) << written;
             const ShellLine line = readShellLine("fixwell verify " + (opening + written));
             const bool isPlain = written.find("$'") == std::string::npos;
@@ -123,7 +156,8 @@ protected:
         fs::create_directories(directory_ / "home");
         test::write(directory_ / "start",
                     "cd home; PS1='ready> '; HISTFILE=; bind 'set enable-bracketed-paste off'\n"
-                    "source " COMPLETIONS "/fixwell.bash\n"
+                    "source " COMPLETIONS
+                    "/fixwell.bash\n"
                     "fixwell() { printf '%s\\0' \"$@\" >\"$OUT\"; }\n");
     }
 
@@ -140,8 +174,10 @@ protected:
         constexpr std::string_view digits = "0123456789abcdef";
         for (const unsigned char byte : label)
             encoded += {'\\', 'x', digits[byte / 16], digits[byte % 16]};
-        test::write(directory_ / "udev/b8:1", "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=ext4\n"
-                                              "E:ID_FS_UUID=12-34\nE:ID_FS_LABEL_ENC=" + encoded + "\n");
+        test::write(directory_ / "udev/b8:1",
+                    "E:ID_FS_USAGE=filesystem\nE:ID_FS_TYPE=ext4\n"
+                    "E:ID_FS_UUID=12-34\nE:ID_FS_LABEL_ENC=" +
+                        encoded + "\n");
     }
 
     /// The words that came of each line that was typed and sent off, without the program's name.
@@ -183,9 +219,11 @@ private:
         const std::string directory = "HOME=" + directory_.path().native();
         const std::string start = directory_ / "start";
         static_cast<void>(::chdir(directory_.path().c_str()));
-        const std::array<const char*, 8> environment{path.c_str(), disks.c_str(), kept.c_str(), directory.c_str(),
-                                                     "TERM=dumb", "LANG=C.UTF-8", "HISTFILE=", nullptr};
-        const std::array<const char*, 6> arguments{"bash", "--noprofile", "--rcfile", start.c_str(), "-i", nullptr};
+        const std::array<const char*, 8> environment{
+            path.c_str(), disks.c_str(),  kept.c_str(), directory.c_str(),
+            "TERM=dumb",  "LANG=C.UTF-8", "HISTFILE=",  nullptr};
+        const std::array<const char*, 6> arguments{"bash",        "--noprofile", "--rcfile",
+                                                   start.c_str(), "-i",          nullptr};
         ::execve("/bin/bash", const_cast<char* const*>(arguments.data()),
                  const_cast<char* const*>(environment.data()));
         ::_exit(127);
@@ -228,7 +266,8 @@ TEST_F(BashCompletionTest, AHostileLabelBecomesOneLiteralWord)
 {
     for (const std::string& label : hostileLabels) {
         setLabel(label);
-        const std::vector<std::string> openings{"LABEL=", "L", "\"LABEL=", "'LABEL=", "LABEL=\"", "LABEL='"};
+        const std::vector<std::string> openings{
+            "LABEL=", "L", "\"LABEL=", "'LABEL=", "LABEL=\"", "LABEL='"};
         std::vector<std::string> lines;
         for (const std::string& opening : openings)
             lines.push_back("fixwell verify " + opening + "\t");
@@ -260,7 +299,8 @@ TEST_F(BashCompletionTest, WordsOptionsAndFilesAreCompleted)
         {"fixwell verify 'my\t", {"verify", "my image.img"}},
         {"fixwell verify sub\t\t", {"verify", "sub dir/$(touch pwned).img"}},
         {"fixwell verify ~/home/my\t", {"verify", (home() / "my image.img").native()}},
-        {"fixwell repair --preview --keep my\tx", {"repair", "--preview", "--keep", "my image.img", "x"}},
+        {"fixwell repair --preview --keep my\tx",
+         {"repair", "--preview", "--keep", "my image.img", "x"}},
         {"fixwell help verd\t", {"help", "verdicts"}},
         {"fixwell help my\t", {"help", "my"}}};
     std::vector<std::string> lines;

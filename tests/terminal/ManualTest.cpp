@@ -91,27 +91,29 @@ TEST_F(ManualTest, MarksBecomeWhatTheyMean)
 TEST_F(ManualTest, LinesEndWhereTheColumnsDo)
 {
     const auto linesOf = [](std::string text) {
-        return test::linesOf(plainText(Document{"", {{Block::Kind::Paragraph, {{{}, std::move(text)}}}}}, {20, false}));
+        return test::linesOf(plainText(
+            Document{"", {{Block::Kind::Paragraph, {{{}, std::move(text)}}}}}, {20, false}));
     };
     using Lines = std::vector<std::string>;
     EXPECT_EQ(linesOf("twelve words of a sentence"), (Lines{"twelve words of a", "sentence"}));
     EXPECT_EQ(linesOf("äöüäöüäöüäöüäöüä abc d"), (Lines{"äöüäöüäöüäöüäöüä abc", "d"}));
     EXPECT_EQ(linesOf("a-word-that-is-longer-than-a-line b"),
               (Lines{"a-word-that-is-longer-than-a-line", "b"}));
-    EXPECT_EQ(linesOf("日本語の文章は空白なしで続く。"), (Lines{"日本語の文章は空白な", "しで続く。"}));
+    EXPECT_EQ(linesOf("日本語の文章は空白なしで続く。"),
+              (Lines{"日本語の文章は空白な", "しで続く。"}));
     EXPECT_EQ(linesOf("日本語の文章は空白な。続く"), (Lines{"日本語の文章は空白", "な。続く"}))
         << "a full stop never begins a line";
     Document rows;
     for (const char* const name : {"a", "longer"})
         rows.blocks.push_back({Block::Kind::Row, {{{}, name}}, {{{}, "some words"}}});
-    EXPECT_EQ(plainText(rows, {20, false}),
-              "  a       some words\n  longer  some words\n");
+    EXPECT_EQ(plainText(rows, {20, false}), "  a       some words\n  longer  some words\n");
     EXPECT_EQ(test::linesOf(plainText(rows, {1, false})).size(), 2U) << "no columns to speak of";
 }
 
 TEST_F(ManualTest, NearestNamesComeFirstAndStrangersNotAtAll)
 {
-    const std::vector<std::string> known{"verify", "repair", "verify-permissions", "undo", "report"};
+    const std::vector<std::string> known{"verify", "repair", "verify-permissions", "undo",
+                                         "report"};
     EXPECT_EQ(nearest("repiar", known), (std::vector<std::string>{"repair"}));
     EXPECT_EQ(nearest("ver", known), (std::vector<std::string>{"verify", "verify-permissions"}));
     EXPECT_EQ(nearest("xyz", known), std::vector<std::string>());
@@ -129,23 +131,27 @@ TEST_F(ManualTest, WhatIsSaidIsNoRequestOfTheManualsFormatter)
               ".PP\n\\&.so /etc/passwd\n");
     EXPECT_EQ(body({Block::Kind::Paragraph, {{Look::Plain, "a\\*b – “c” ä"}}}),
               ".PP\na\\(rs*b \\(en \\(lqc\\(rq \\[u00E4]\n");
-    EXPECT_EQ(body({Block::Kind::Row, {{Look::Verbatim, "--a-b"}}, {{Look::Plain, "well-known -x"}}}),
-              ".TP\n\\fB\\-\\-a\\-b\\fR\nwell-known \\-x\n");
+    EXPECT_EQ(
+        body({Block::Kind::Row, {{Look::Verbatim, "--a-b"}}, {{Look::Plain, "well-known -x"}}}),
+        ".TP\n\\fB\\-\\-a\\-b\\fR\nwell-known \\-x\n");
     EXPECT_EQ(body({Block::Kind::Example, {{Look::Verbatim, "'a\n.b\n"}}}),
               ".PP\n.RS 4\n.nf\n\\(aqa\n\\&.b\n.fi\n.RE\n");
-    for (const std::string& line :
-         test::linesOf(body({Block::Kind::Paragraph, {{Look::Plain, "a" + std::string(200, ' ') + ".b" + std::string(80, '.') + " .c"}}})))
+    for (const std::string& line : test::linesOf(body(
+             {Block::Kind::Paragraph,
+              {{Look::Plain, "a" + std::string(200, ' ') + ".b" + std::string(80, '.') + " .c"}}})))
         EXPECT_FALSE(line.starts_with('.') && line != ".PP") << line;
 }
 
 TEST_F(ManualTest, MarkdownIsReadAsItIsMeant)
 {
-    const Document page = readMarkdown("# The `x`\n\nSome **strong** [words](y.md),\nand `a|b`.\n\n"
-                                       "| h | i |\n|---|---|\n| `k` | v \\| w |\n\n* one\n* two\n"
-                                       "\n## More\n\n```\nz  z\n```\n");
+    const Document page = readMarkdown(
+        "# The `x`\n\nSome **strong** [words](y.md),\nand `a|b`.\n\n"
+        "| h | i |\n|---|---|\n| `k` | v \\| w |\n\n* one\n* two\n"
+        "\n## More\n\n```\nz  z\n```\n");
     EXPECT_EQ(page.title, "The x");
-    EXPECT_EQ(plainText(page, {}),
-              "The x\n\nSome strong words, and a|b.\n\n  k  v | w\n\n • one\n • two\n\nMore\n    z  z\n");
+    EXPECT_EQ(
+        plainText(page, {}),
+        "The x\n\nSome strong words, and a|b.\n\n  k  v | w\n\n • one\n • two\n\nMore\n    z  z\n");
 }
 
 TEST_F(ManualTest, EveryPageOfTheManualIsCompleteAndFormatsWithoutAWarning)
@@ -155,14 +161,16 @@ TEST_F(ManualTest, EveryPageOfTheManualIsCompleteAndFormatsWithoutAWarning)
         std::vector<std::string_view> sections;
     };
     const bool hasFormatter = test::runTool({"groff", "--version"}).status == 0;
-    for (const Case& c :
-         {Case{"man1/fixwell.1", {"NAME", "SYNOPSIS", "DESCRIPTION", "COMMANDS", "OPTIONS", "EXAMPLES",
-                                  "EXIT STATUS", "ENVIRONMENT", "FILES", "SEE ALSO"}},
-          Case{"man1/orvane.1", {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
-                                 "ENVIRONMENT", "FILES", "SEE ALSO"}},
-          Case{"man5/fixwell-json.5", {"NAME", "DESCRIPTION", "SEE ALSO"}},
-          Case{"man8/pellar-helper.8", {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
-                                        "FILES", "SEE ALSO"}}}) {
+    for (const Case& c : {Case{"man1/fixwell.1",
+                               {"NAME", "SYNOPSIS", "DESCRIPTION", "COMMANDS", "OPTIONS",
+                                "EXAMPLES", "EXIT STATUS", "ENVIRONMENT", "FILES", "SEE ALSO"}},
+                          Case{"man1/orvane.1",
+                               {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
+                                "ENVIRONMENT", "FILES", "SEE ALSO"}},
+                          Case{"man5/fixwell-json.5", {"NAME", "DESCRIPTION", "SEE ALSO"}},
+                          Case{"man8/pellar-helper.8",
+                               {"NAME", "SYNOPSIS", "DESCRIPTION", "OPTIONS", "EXIT STATUS",
+                                "FILES", "SEE ALSO"}}}) {
         const fs::path file = fs::path(MANUAL_PAGES) / c.file;
         const std::string page = test::contentsOf(file);
         std::size_t at = 0;
@@ -221,11 +229,19 @@ std::set<std::string> wordsOfTheCommandLine()
         return std::string(key);
     };
     Request request;
-    std::vector<std::vector<const char*>> lines{
-        {},  {"verfy"}, {"-x"}, {"verify"}, {"verify", "--f"}, {"help", "a", "b"},
-        {"verify", "--json=x", "a"}, {"verify", "--color"}, {"verify", "--color=x", "a"},
-        {"repair", "--keep", "f", "a"}, {"repair", "--preview", "--direct", "a"},
-        {"repair", "--preview", "--keep", "f", "a", "b"}, {"report", "--json", "a"}};
+    std::vector<std::vector<const char*>> lines{{},
+                                                {"verfy"},
+                                                {"-x"},
+                                                {"verify"},
+                                                {"verify", "--f"},
+                                                {"help", "a", "b"},
+                                                {"verify", "--json=x", "a"},
+                                                {"verify", "--color"},
+                                                {"verify", "--color=x", "a"},
+                                                {"repair", "--keep", "f", "a"},
+                                                {"repair", "--preview", "--direct", "a"},
+                                                {"repair", "--preview", "--keep", "f", "a", "b"},
+                                                {"report", "--json", "a"}};
     for (auto& words : lines) {
         words.insert(words.begin(), "fixwell");
         EXPECT_FALSE(readCommandLine(static_cast<int>(words.size()), words.data(), recorder));

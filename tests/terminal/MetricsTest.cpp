@@ -31,9 +31,12 @@ using Lines = std::vector<std::string>;
 
 TEST(Metrics, ALabelStaysOneLabel)
 {
-    const std::string text = expositionOf(
-        {{"/dev/a\"b", "", "x\"} 1\nfixwell_verdict{verdict=\"sound\"} 1\\\n\xff\xc0", {run("verify", 1s, "damaged")}}},
-        "1.0");
+    const std::string text =
+        expositionOf({{"/dev/a\"b",
+                       "",
+                       "x\"} 1\nfixwell_verdict{verdict=\"sound\"} 1\\\n\xff\xc0",
+                       {run("verify", 1s, "damaged")}}},
+                     "1.0");
     EXPECT_EQ(seriesWith("fixwell_problems", text),
               Lines{R"(fixwell_problems{device="/dev/a\"b",uuid="",)"
                     R"(label="x\"} 1\nfixwell_verdict{verdict=\"sound\"} 1\\\n)"
@@ -44,10 +47,11 @@ TEST(Metrics, ALabelStaysOneLabel)
 // A collector refuses a whole file in which a series stands twice, or a family in two pieces.
 TEST(Metrics, EachSeriesStandsOnceBelowItsFamily)
 {
-    const std::vector<orvane::Run> runs{run("verify", 1s, "sound"), run("verify-permissions", 2s, "sound"),
-                                run("verify-partition-map", 3s, "failed")};
-    const std::string text =
-        expositionOf({{"/dev/a", "", "", runs}, {"/dev/a", "", "", runs}, {"/dev/b", "", "", {}}}, "1");
+    const std::vector<orvane::Run> runs{run("verify", 1s, "sound"),
+                                        run("verify-permissions", 2s, "sound"),
+                                        run("verify-partition-map", 3s, "failed")};
+    const std::string text = expositionOf(
+        {{"/dev/a", "", "", runs}, {"/dev/a", "", "", runs}, {"/dev/b", "", "", {}}}, "1");
     std::set<std::string> names, families;
     std::string family;
     for (const std::string& line : test::linesOf(text)) {
@@ -65,8 +69,12 @@ TEST(Metrics, EachSeriesStandsOnceBelowItsFamily)
 
 TEST(Metrics, WhatWasStoppedOrSkippedLeavesTheVerdictAndItsTime)
 {
-    MeasuredDisk disk{"/dev/a", "u", "l", {run("verify", 1s, "sound"), run("verify", 2s, "damaged", 7),
-                       run("verify-permissions", 3s, "sound"), run("verify", 4s, "stopped")}, orvane::Run::Time(5s)};
+    MeasuredDisk disk{"/dev/a",
+                      "u",
+                      "l",
+                      {run("verify", 1s, "sound"), run("verify", 2s, "damaged", 7),
+                       run("verify-permissions", 3s, "sound"), run("verify", 4s, "stopped")},
+                      orvane::Run::Time(5s)};
     const std::string text = expositionOf({disk}, "1");
     const std::string labels = R"(device="/dev/a",uuid="u",label="l",check="filesystem")";
     const auto series = [&](const std::string& name) {
@@ -81,9 +89,11 @@ TEST(Metrics, WhatWasStoppedOrSkippedLeavesTheVerdictAndItsTime)
     Lines ones = seriesWith("verdict=", text);
     EXPECT_EQ(ones.size(), 14U);
     std::erase_if(ones, [](const std::string& line) { return !line.ends_with("} 1"); });
-    EXPECT_EQ(ones,
-              (Lines{"fixwell_verdict{" + labels + R"(,verdict="damaged"} 1)",
-                     R"(fixwell_verdict{device="/dev/a",uuid="u",label="l",check="permissions",verdict="sound"} 1)"}));
+    EXPECT_EQ(
+        ones,
+        (Lines{
+            "fixwell_verdict{" + labels + R"(,verdict="damaged"} 1)",
+            R"(fixwell_verdict{device="/dev/a",uuid="u",label="l",check="permissions",verdict="sound"} 1)"}));
 }
 
 using MetricsTest = test::ProgramTest;
@@ -98,14 +108,17 @@ TEST_F(MetricsTest, AFileIsReplacedWholeAndReadableByAll)
     EXPECT_EQ(written.status, 0) << written.errors;
     const std::string text = test::contentsOf(path("a.prom"));
     EXPECT_EQ(text, run({"metrics", "image"}).output);
-    EXPECT_EQ(seriesWith(R"(label="Holidays",check="filesystem",verdict="sound"} 1)", text).size(), 1U) << text;
+    EXPECT_EQ(seriesWith(R"(label="Holidays",check="filesystem",verdict="sound"} 1)", text).size(),
+              1U)
+        << text;
     EXPECT_EQ(test::contentsOf(path("target")), "precious") << "a link is replaced, not followed";
     struct stat status = {};
     ASSERT_EQ(::lstat(path("a.prom").c_str(), &status), 0);
     EXPECT_EQ(status.st_mode, S_IFREG | 0644U);
 
     EXPECT_EQ(run({"metrics", "--output", "none/a.prom", "image"}).status, 8);
-    EXPECT_EQ(run({"metrics", "--output", "none/a.prom", "--if-directory-exists", "image"}).status, 0);
+    EXPECT_EQ(run({"metrics", "--output", "none/a.prom", "--if-directory-exists", "image"}).status,
+              0);
     EXPECT_FALSE(std::filesystem::exists(path("none")));
 }
 

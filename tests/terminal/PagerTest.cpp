@@ -38,14 +38,13 @@ TEST_F(PagerTest, LongOutputGoesThroughItOnATerminalAlone)
         bool isPaged;
         std::string_view because;
     };
-    for (const Case& c : {Case{{"history", "sound"}, true, "may be long"},
-                          Case{{"report", "sound"}, true, "the same"},
-                          Case{{"help", "disks"}, true, "the same"},
-                          Case{{"help", "--no-pager", "disks"}, false, "not wanted"},
-                          Case{{"history", "--json", "sound"}, false, "for programs"},
-                          Case{{"history", "--clear", "sound"}, false, "nothing to read"},
-                          Case{{"list", "sound"}, false, "short"},
-                          Case{{"help", "--help"}, false, "short"}}) {
+    for (const Case& c :
+         {Case{{"history", "sound"}, true, "may be long"},
+          Case{{"report", "sound"}, true, "the same"}, Case{{"help", "disks"}, true, "the same"},
+          Case{{"help", "--no-pager", "disks"}, false, "not wanted"},
+          Case{{"history", "--json", "sound"}, false, "for programs"},
+          Case{{"history", "--clear", "sound"}, false, "nothing to read"},
+          Case{{"list", "sound"}, false, "short"}, Case{{"help", "--help"}, false, "short"}}) {
         const RunResult result = runOnTerminal(c.arguments);
         EXPECT_EQ(result.status, 0) << c.because;
         EXPECT_EQ(result.output.find("paged:") != std::string::npos, c.isPaged)
@@ -73,10 +72,12 @@ TEST_F(PagerTest, ColoursAreHeededThere)
 {
     usePager("cat -v");
     EXPECT_NE(runOnTerminal({"help", "disks"}).output.find("^[[1m"), std::string::npos);
-    EXPECT_EQ(runOnTerminal({"help", "--color=never", "disks"}).output.find("^["), std::string::npos);
+    EXPECT_EQ(runOnTerminal({"help", "--color=never", "disks"}).output.find("^["),
+              std::string::npos);
     environment_["NO_COLOR"] = "1";
     EXPECT_EQ(runOnTerminal({"help", "disks"}).output.find("^["), std::string::npos);
-    EXPECT_EQ(runOnTerminal({"help", "disks", "--no-pager"}).output.find('\x1b'), std::string::npos);
+    EXPECT_EQ(runOnTerminal({"help", "disks", "--no-pager"}).output.find('\x1b'),
+              std::string::npos);
 }
 
 /// A history that no pipe holds.
@@ -111,11 +112,12 @@ TEST_F(LongHistoryTest, AnInterruptionWaitsForThePager)
         int signal;
         std::string_view because;
     };
-    for (const Case& c :
-         {Case{"trap '' INT; touch began; until [ -e go ]; do sleep 0.02; done; cat >all; touch ended",
-               SIGINT, "while there is more to be written"},
-          Case{"trap '' INT; cat >all; touch began; until [ -e go ]; do sleep 0.02; done; touch ended",
-               0, "while all is written, and somebody reads"}}) {
+    for (const Case& c : {Case{"trap '' INT; touch began; until [ -e go ]; do sleep 0.02; done; "
+                               "cat >all; touch ended",
+                               SIGINT, "while there is more to be written"},
+                          Case{"trap '' INT; cat >all; touch began; until [ -e go ]; do sleep "
+                               "0.02; done; touch ended",
+                               0, "while all is written, and somebody reads"}}) {
         for (const char* const name : {"began", "go", "ended"})
             std::filesystem::remove(path(name));
         usePager(std::string(c.script));

@@ -30,7 +30,8 @@ Time daysAgo(int days)
 
 PublishedCheck check(const std::string& device, Time started, const char* verdict)
 {
-    return {device, "u", Run{"verify", started, started + hours(1), RunEnd{verdict, 0, "", "", 3}}, {}};
+    return {
+        device, "u", Run{"verify", started, started + hours(1), RunEnd{verdict, 0, "", "", 3}}, {}};
 }
 
 TEST(PublishedChecks, AreKeptByVolumeUntilNewerOnesCome)
@@ -45,7 +46,8 @@ TEST(PublishedChecks, AreKeptByVolumeUntilNewerOnesCome)
     PublishedCheck sound = check("/dev/b", eight, "sound");
     sound.uuid = "v";
     ASSERT_TRUE(publishCheck(place, "b", sound));
-    const PublishedChecks copies{{"uuid:u", first}, {"uuid:u@/dev/b", check("/dev/b", eight, "sound")}};
+    const PublishedChecks copies{{"uuid:u", first},
+                                 {"uuid:u@/dev/b", check("/dev/b", eight, "sound")}};
     EXPECT_EQ(publishedRun(copies, "uuid:u"), nullptr) << "of which of the two is it?";
     PublishedCheck skipped{"/dev/a\xff\n", "u", {}, daysAgo(1)};
     ASSERT_TRUE(publishCheck(place, "a", skipped));
@@ -97,8 +99,9 @@ TEST(PublishedChecks, NothingIsBelievedThatOthersCouldHaveWritten)
     ::chmod(place.c_str(), 0755);
     EXPECT_EQ(readPublishedChecks(place).size(), 1U);
     for (const std::string& text :
-         {std::string("{\"a\":{\"verdict\":\"excellent\",\"started\":1}}"), std::string("[[["), std::string(),
-          std::string("{\"a\":7}"), std::string("{\"a\":{\"verdict\":\"sound\",\"started\":-1}}"),
+         {std::string("{\"a\":{\"verdict\":\"excellent\",\"started\":1}}"), std::string("[[["),
+          std::string(), std::string("{\"a\":7}"),
+          std::string("{\"a\":{\"verdict\":\"sound\",\"started\":-1}}"),
           std::string("{\"a\":{\"verdict\":\"sound\",\"started\":1e300}}"),
           std::string("{\"a\":{\"verdict\":\"sound\",\"started\":9223372036854775807}}")}) {
         test::write(file, text);
@@ -161,7 +164,8 @@ TEST_F(ScheduledCheckTest, DamageFailsAndEveryResultIsPublished)
     EXPECT_EQ(Events(both.output).count("done"), 2U);
     EXPECT_EQ(run({"scheduled-check", "good"}).status, 0);
     EXPECT_EQ(run({"scheduled-check", R"(--instance=)" + std::string("good")}).status, 0);
-    EXPECT_EQ(run({"scheduled-check", "--instance=nowhere"}).status, 8) << "a disk that died is no skip";
+    EXPECT_EQ(run({"scheduled-check", "--instance=nowhere"}).status, 8)
+        << "a disk that died is no skip";
     const std::string metrics = run({"metrics", "good", "bad"}).output;
     EXPECT_EQ(test::countOf("verdict=\"damaged\"} 1", metrics), 1U) << metrics;
     EXPECT_EQ(test::countOf("verdict=\"sound\"} 1", metrics), 1U) << metrics;
@@ -179,14 +183,18 @@ TEST_F(ScheduledCheckTest, WhatIsMountedIsLeftAloneAndIsNoFailure)
     EXPECT_EQ(skipped.status, 0) << skipped.errors;
     const auto done = Events(skipped.output).named("done");
     EXPECT_EQ(done.size(), 1U);
-    EXPECT_NE(done.at(0)["message"].get<std::string>().find(path("place").native()), std::string::npos);
+    EXPECT_NE(done.at(0)["message"].get<std::string>().find(path("place").native()),
+              std::string::npos);
     EXPECT_EQ(Events(skipped.output).count("started"), 0U);
     EXPECT_EQ(::umount2(path("place").c_str(), 0), 0) << "it is still mounted";
-    EXPECT_EQ(test::countOf("fixwell_last_skipped_timestamp_seconds{", run({"metrics", device.name()}).output), 1U);
+    EXPECT_EQ(test::countOf("fixwell_last_skipped_timestamp_seconds{",
+                            run({"metrics", device.name()}).output),
+              1U);
 
     // Others have it, which shows only as it is opened.
     {
-        const pellar::FileDescriptor holder(::open(device.name().c_str(), O_RDWR | O_EXCL | O_CLOEXEC));
+        const pellar::FileDescriptor holder(
+            ::open(device.name().c_str(), O_RDWR | O_EXCL | O_CLOEXEC));
         const auto held = run({"scheduled-check", "--json", device.name()});
         EXPECT_EQ(held.status, 0) << held.output << held.errors;
         EXPECT_EQ(Events(held.output).named("done").at(0)["action"], "skip");
@@ -200,15 +208,17 @@ class FakeNotifications {
 public:
     explicit FakeNotifications(const std::string& address)
         : connection_(sdbus::createSessionBusConnectionWithAddress(address)),
-          object_(sdbus::createObject(*connection_, sdbus::ObjectPath("/org/freedesktop/Notifications")))
+          object_(sdbus::createObject(*connection_,
+                                      sdbus::ObjectPath("/org/freedesktop/Notifications")))
     {
-        test::addMethod(*object_, "org.freedesktop.Notifications", "Notify",
-                        [this](const std::string&, std::uint32_t, const std::string&, const std::string&,
-                               const std::string& body, const std::vector<std::string>&,
-                               const std::map<std::string, sdbus::Variant>&, std::int32_t) {
-                            body_ = body;
-                            return std::uint32_t(++count);
-                        });
+        test::addMethod(
+            *object_, "org.freedesktop.Notifications", "Notify",
+            [this](const std::string&, std::uint32_t, const std::string&, const std::string&,
+                   const std::string& body, const std::vector<std::string>&,
+                   const std::map<std::string, sdbus::Variant>&, std::int32_t) {
+                body_ = body;
+                return std::uint32_t(++count);
+            });
         test::finish(*object_);
         connection_->requestName(BusServiceName("org.freedesktop.Notifications"));
         connection_->enterEventLoopAsync();

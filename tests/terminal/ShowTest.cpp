@@ -85,7 +85,8 @@ TEST_F(ShowTest, PressesAButtonAndWaitsForWhatItFinds)
     write(path("place") / "\x1b[31mpictures\n/one", std::string(300 << 10, 'x'));
     const RunResult result = run({"show", "DiskUsage", "--press", "measure", device.name()});
     EXPECT_EQ(result.status, 0) << result.errors;
-    EXPECT_NE(result.output.find("\uFFFD[31mpictures\uFFFD/\n"), std::string::npos) << result.output;
+    EXPECT_NE(result.output.find("\uFFFD[31mpictures\uFFFD/\n"), std::string::npos)
+        << result.output;
     EXPECT_NE(result.output.find(" used ("), std::string::npos);
     EXPECT_FALSE(holdsControls(result.output));
 }

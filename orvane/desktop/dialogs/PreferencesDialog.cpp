@@ -70,7 +70,9 @@ void PreferencesDialog::addSwitch(SettingRows& rows, const Switch& kept, std::st
     QCheckBox& box = rows.addSwitch(kept.key.data(), text(title), text(meaning));
     connect(&box, &QCheckBox::toggled, this,
             [kept, &settings](bool isOn) { kept.set(settings, isOn); });
-    switches_.push_back({&box, [kept, &settings] { return kept.isOn(settings); }});
+    switches_.push_back({&box, [kept, &settings] {
+                             return kept.isOn(settings);
+                         }});
 }
 
 QWidget* PreferencesDialog::checkingPage()
@@ -112,9 +114,10 @@ QWidget* PreferencesDialog::repairsPage()
 QWidget* PreferencesDialog::programPage()
 {
     auto* const rows = new SettingRows(this);
-    addSwitch(*rows, showsNotices, "&Notices when a job ends",
-              "When a job took longer than a moment and you were not looking, the desktop tells you "
-              "how it went.");
+    addSwitch(
+        *rows, showsNotices, "&Notices when a job ends",
+        "When a job took longer than a moment and you were not looking, the desktop tells you "
+        "how it went.");
     addSwitch(*rows, reopensImages, "&Open the images of the last time",
               "The disk images that are in the list when the program ends are there again at the "
               "next start.");
@@ -139,11 +142,11 @@ NumberChoice PreferencesDialog::days(std::uint64_t number) const
     if (number >= mostRepairDays)
         return {number, text("unlimited time")};
     if (number % 365 == 0)
-        return {number, toQt(contract::format(
-                            subject_.texts.plural("%ld year", "%ld years", count / 365),
-                            {count / 365}))};
-    return {number, toQt(contract::format(subject_.texts.plural("%ld day", "%ld days", count),
-                                          {count}))};
+        return {number,
+                toQt(contract::format(subject_.texts.plural("%ld year", "%ld years", count / 365),
+                                      {count / 365}))};
+    return {number,
+            toQt(contract::format(subject_.texts.plural("%ld day", "%ld days", count), {count}))};
 }
 
 NumberChoice PreferencesDialog::repairs(std::uint64_t number) const
@@ -166,10 +169,10 @@ void PreferencesDialog::fillLimits(const RepairSettings& kept)
 {
     fill(*days_, {days(0), days(7), days(30), days(90), days(365), days(mostRepairDays)},
          days(kept.keptRepairDays));
-    fill(*repairs_,
-         {repairs(0), repairs(5), repairs(20), repairs(50), repairs(200),
-          repairs(unlimitedRepairs)},
-         repairs(kept.keptRepairs));
+    fill(
+        *repairs_,
+        {repairs(0), repairs(5), repairs(20), repairs(50), repairs(200), repairs(unlimitedRepairs)},
+        repairs(kept.keptRepairs));
     fill(*megabytes_,
          {megabytes(0), megabytes(512), megabytes(1024), megabytes(4096), megabytes(16384),
           megabytes(65536), megabytes(unlimitedRepairs)},
@@ -220,7 +223,10 @@ void PreferencesDialog::askToDelete()
                 subject_.texts.sentence("Delete what is kept of repairs (%@)?", {amountText(kept)}),
                 subject_.texts.text("These repairs can then not be undone any more. The disks stay "
                                     "as they are. A repair that was interrupted stays, too."),
-                {{subject_.texts.text("Delete"), [this] { showKept(subject_.deleteKept()); }}},
+                {{subject_.texts.text("Delete"),
+                  [this] {
+                      showKept(subject_.deleteKept());
+                  }}},
                 subject_.texts.text("Cancel")});
 }
 

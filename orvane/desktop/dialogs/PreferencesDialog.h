@@ -2,8 +2,8 @@
 #pragma once
 
 #include "contract/support/OVPreferences.h"
-#include "orvane/jobs/KeptAmount.h"
 #include "orvane/desktop/dialogs/SettingRows.h"
+#include "orvane/jobs/KeptAmount.h"
 #include "orvane/support/settings/RepairSettings.h"
 #include "orvane/support/settings/Switch.h"
 #include "orvane/support/texts/Catalogue.h"

@@ -32,8 +32,7 @@ QString nameFor(QString subject)
             c = QLatin1Char('-');
     while (subject.startsWith(QLatin1Char('.')))
         subject.remove(0, 1);
-    return subject.left(longest) + QLatin1Char(' ') +
-           QDate::currentDate().toString(Qt::ISODate);
+    return subject.left(longest) + QLatin1Char(' ') + QDate::currentDate().toString(Qt::ISODate);
 }
 
 }  // namespace
@@ -54,11 +53,12 @@ ReportDialog::ReportDialog(const QString& subject, bool showsDetails, const Tran
     auto* const rows = new QVBoxLayout(this);
     rows->setContentsMargins(2 * gridUnit, 2 * gridUnit, 2 * gridUnit, 2 * gridUnit);
     rows->setSpacing(gridUnit);
-    rows->addWidget(makeNote(
-        toQt(texts.sentence("A report on %@ tells what is known of it, of this computer, and of its "
-                            "checks and repairs, to be kept or passed on.",
-                            {fromQt(subject)})),
-        this));
+    rows->addWidget(
+        makeNote(toQt(texts.sentence(
+                     "A report on %@ tells what is known of it, of this computer, and of its "
+                     "checks and repairs, to be kept or passed on.",
+                     {fromQt(subject)})),
+                 this));
     rows->addSpacing(gridUnit);
     auto* const all = new QRadioButton(text("&All checks and repairs"), this);
     all->setObjectName(QStringLiteral("allRuns"));

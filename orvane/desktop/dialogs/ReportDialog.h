@@ -18,8 +18,8 @@ public:
     using Chosen = std::function<void(ReportScope scope, const QString& file)>;
 
     /// `subject` is what the report is about, one line. The texts outlive the dialog.
-    ReportDialog(const QString& subject, bool showsDetails, const Translator& texts,
-                 Chosen chosen, QWidget* parent);
+    ReportDialog(const QString& subject, bool showsDetails, const Translator& texts, Chosen chosen,
+                 QWidget* parent);
 
 private:
     QString text(std::string_view key) const;

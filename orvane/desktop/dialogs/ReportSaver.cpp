@@ -16,10 +16,10 @@ namespace {
 using Kind = ReportLine::Kind;
 using Tone = ReportLine::Tone;
 
-constexpr int slice = 20;            // milliseconds
-constexpr int linesAtOnce = 50;      // between two looks at the clock
+constexpr int slice = 20;        // milliseconds
+constexpr int linesAtOnce = 50;  // between two looks at the clock
 constexpr int progressSteps = 1000;
-constexpr double paperMargin = 15;   // millimetres
+constexpr double paperMargin = 15;        // millimetres
 constexpr qint64 copiedAtOnce = 1 << 20;  // bytes
 
 std::unique_ptr<ReportEncoding> encodingFor(const QString& file)
@@ -156,11 +156,11 @@ void ReportSaver::beginPages()
     info.horizontalPagination = contract::Pagination::Fit;
     info.isHorizontallyCentered = false;
     info.isVerticallyCentered = false;
-    const PrintHeader header{
-        toQt(report_->title()), toQt(zonedTime(std::chrono::system_clock::now())),
-        [this](int page, int pages) {
-            return toQt(texts_.sentence("Page %ld of %ld", {page, pages}));
-        }};
+    const PrintHeader header{toQt(report_->title()),
+                             toQt(zonedTime(std::chrono::system_clock::now())),
+                             [this](int page, int pages) {
+                                 return toQt(texts_.sentence("Page %ld of %ld", {page, pages}));
+                             }};
     printing_ = std::make_unique<PrintJob>(*printer_, std::exchange(rows_, {}),
                                            contract::Font::system(11), info, header);
     phase_ = Phase::Print;

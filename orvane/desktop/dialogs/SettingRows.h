@@ -22,8 +22,8 @@ inline constexpr int gridUnit = 8;
 /// A sentence of plain text, wrapped.
 [[nodiscard]] QLabel* makeNote(const QString& text, QWidget* parent);
 
-/// Gives the dialog this width, or the one that it needs, and the height that its wrapped texts take
-/// then, as the least: pages and dialogs do not ask for that by themselves.
+/// Gives the dialog this width, or the one that it needs, and the height that its wrapped texts
+/// take then, as the least: pages and dialogs do not ask for that by themselves.
 void fitToTexts(QWidget& dialog, int widthInCharacters);
 
 /// One of the values that can be chosen, in words.

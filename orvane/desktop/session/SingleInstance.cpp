@@ -31,8 +31,8 @@ std::string independent(const std::string& name)
 // Bytes that are no UTF-8 are kept as a URI keeps them.
 QString toText(const std::string& name)
 {
-    return QString::fromLatin1(QUrl::toPercentEncoding(QString::fromLatin1(
-        name.data(), static_cast<qsizetype>(name.size()))));
+    return QString::fromLatin1(QUrl::toPercentEncoding(
+        QString::fromLatin1(name.data(), static_cast<qsizetype>(name.size()))));
 }
 
 std::string fromText(const QString& text)
@@ -72,8 +72,8 @@ bool SingleInstance::handOver(const std::vector<std::string>& names)
     for (const std::string& name : names)
         texts += toText(independent(name));
     const QVariantMap platformData{{activationToken, qEnvironmentVariable("XDG_ACTIVATION_TOKEN")}};
-    QDBusMessage call = QDBusMessage::createMethodCall(name_, path_, interface,
-                                                       QStringLiteral("ActivateAction"));
+    QDBusMessage call =
+        QDBusMessage::createMethodCall(name_, path_, interface, QStringLiteral("ActivateAction"));
     call << openAction << QVariantList{texts} << platformData;
     return bus_->call(call, QDBus::Block, longestWait).type() == QDBusMessage::ReplyMessage;
 }

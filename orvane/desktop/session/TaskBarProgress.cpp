@@ -17,10 +17,9 @@ void TaskBarProgress::show(std::optional<double> percent)
     auto bus = bus_();
     if (!bus)
         return;
-    QDBusMessage update =
-        QDBusMessage::createSignal(QStringLiteral("/org/orvane/Orvane"),
-                                   QStringLiteral("com.canonical.Unity.LauncherEntry"),
-                                   QStringLiteral("Update"));
+    QDBusMessage update = QDBusMessage::createSignal(
+        QStringLiteral("/org/orvane/Orvane"), QStringLiteral("com.canonical.Unity.LauncherEntry"),
+        QStringLiteral("Update"));
     update << QStringLiteral("application://%1.desktop").arg(QString::fromStdString(entry_))
            << QVariantMap{{QStringLiteral("progress"), wanted < 0 ? 0.0 : wanted / 100.0},
                           {QStringLiteral("progress-visible"), wanted >= 0}};

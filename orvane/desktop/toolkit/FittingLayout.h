@@ -10,7 +10,8 @@
 
 namespace orvane::desktop {
 
-/// Lays something out anew whenever one of the widgets that it watches has another size, or wants one.
+/// Lays something out anew whenever one of the widgets that it watches has another size, or wants
+/// one.
 class Fitting : public QObject {
 public:
     using QObject::QObject;
@@ -24,8 +25,8 @@ protected:
 };
 
 /// Keeps the first pane of a split view as high as the text that scrolls in it, and no higher than
-/// it may be, until the user moves the divider: how small the pane may become is for that. Belongs to
-/// the split view, which outlives it.
+/// it may be, until the user moves the divider: how small the pane may become is for that. Belongs
+/// to the split view, which outlives it.
 class FittingPane final : public Fitting {
 public:
     /// `text` lies in the first pane.
@@ -41,8 +42,8 @@ private:
     bool isFitting_ = false;
 };
 
-/// Keeps the buttons of a grid in one row where they have room for it, and in two where not. Belongs
-/// to the page, which outlives it.
+/// Keeps the buttons of a grid in one row where they have room for it, and in two where not.
+/// Belongs to the page, which outlives it.
 class FittingButtons final : public Fitting {
 public:
     /// `actions` lie in the grid by columns of two; `beside`, which may be none, stands at the end.

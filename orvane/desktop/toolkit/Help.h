@@ -21,9 +21,9 @@ namespace orvane::desktop {
 
 /// A page on which all the words that are looked for stand.
 struct HelpHit {
-    QString page;   ///< its file
+    QString page;  ///< its file
     QString title;
-    QString line;   ///< the text around the first of the words
+    QString line;  ///< the text around the first of the words
     double relevance = 0;
 };
 
@@ -53,7 +53,8 @@ private:
 };
 
 /// A window to read the help book in, with a way back and forward, and a search through all of
-/// its pages that lists what it finds as one types. A link that leads out of the book is not followed. Main thread.
+/// its pages that lists what it finds as one types. A link that leads out of the book is not
+/// followed. Main thread.
 class HelpWindow final : public QMainWindow {
 public:
     /// `texts` and `settings`, which keep the window's size and place, outlive the window.

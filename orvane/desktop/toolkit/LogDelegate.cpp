@@ -148,7 +148,8 @@ void paintDot(QPainter& painter, const QStyleOptionViewItem& option, const Row& 
     constexpr double side = 5;
     const double height = QFontMetricsF(widestFont(row.line, looks)).height();
     const bool isMirrored = option.direction == Qt::RightToLeft;
-    const double middle = isMirrored ? row.frame.right() - indent / 2 : row.frame.left() + indent / 2;
+    const double middle =
+        isMirrored ? row.frame.right() - indent / 2 : row.frame.left() + indent / 2;
     const QColor color =
         looks.keepsTextColor ? looks.textColor : readableOn(looks.background, problemColor);
     painter.save();

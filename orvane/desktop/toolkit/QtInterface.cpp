@@ -251,7 +251,8 @@ void LoadedInterface::fitButtons()
         return;
     QWidget* beside = nullptr;
     for (int i = 0; i < grid->count(); ++i)
-        if (QWidget* const other = grid->itemAt(i)->widget(); std::ranges::count(actions, other) == 0)
+        if (QWidget* const other = grid->itemAt(i)->widget();
+            std::ranges::count(actions, other) == 0)
             beside = other;
     new FittingButtons(*root_, *grid, std::move(actions), beside);
 }

@@ -21,10 +21,7 @@ class PrimaryButton final : public QToolButton {
 public:
     using QToolButton::QToolButton;
 
-    QSize sizeHint() const override
-    {
-        return QToolButton::sizeHint() + QSize(2 * margin, 0);
-    }
+    QSize sizeHint() const override { return QToolButton::sizeHint() + QSize(2 * margin, 0); }
 
 protected:
     void paintEvent(QPaintEvent* event) override
@@ -76,8 +73,7 @@ void CommandBar::add(std::vector<BarCommand> commands)
 
 void CommandBar::addButton(BarCommand command)
 {
-    QToolButton* const button =
-        command.isPrimary ? new PrimaryButton(this) : new QToolButton(this);
+    QToolButton* const button = command.isPrimary ? new PrimaryButton(this) : new QToolButton(this);
     button->setObjectName(QLatin1String(command.command.objectName));
     const QString title = toQt(texts_.text(command.command.title));
     button->setText(toQtTitle(fromQt(title)));
@@ -98,8 +94,7 @@ void CommandBar::refresh()
     for (const Button& button : buttons_) {
         const MenuCommand& command = button.command.command;
         const std::string reason = command.reasonAgainst ? command.reasonAgainst() : std::string();
-        const bool isAvailable =
-            reason.empty() && (!command.isAvailable || command.isAvailable());
+        const bool isAvailable = reason.empty() && (!command.isAvailable || command.isAvailable());
         button.widget->setEnabled(isAvailable);
         // On its filled ground; without that, as all others.
         if (button.command.isPrimary)
@@ -108,8 +103,8 @@ void CommandBar::refresh()
                                                                      : QPalette::ButtonText));
         QString toolTip = toQt(texts_.text(command.title));
         if (!command.shortcut.isEmpty())
-            toolTip += QStringLiteral(" (") +
-                       command.shortcut.toString(QKeySequence::NativeText) + QLatin1Char(')');
+            toolTip += QStringLiteral(" (") + command.shortcut.toString(QKeySequence::NativeText) +
+                       QLatin1Char(')');
         if (!reason.empty())
             toolTip += QStringLiteral("\n\n") + toQt(reason);
         button.widget->setToolTip(toQtToolTip(fromQt(toolTip)));

@@ -17,12 +17,12 @@
 namespace orvane::desktop {
 namespace {
 
-constexpr int spacing = 8;       // pixels; the grid of the window
-constexpr int iconSide = 40;     // pixels
-constexpr int barHeight = 8;     // pixels
-constexpr int leastPart = 28;    // pixels, so that it can be hit
-constexpr int partSpacing = 3;   // pixels
-constexpr double rounding = 4;   // pixels
+constexpr int spacing = 8;      // pixels; the grid of the window
+constexpr int iconSide = 40;    // pixels
+constexpr int barHeight = 8;    // pixels
+constexpr int leastPart = 28;   // pixels, so that it can be hit
+constexpr int partSpacing = 3;  // pixels
+constexpr double rounding = 4;  // pixels
 constexpr double titleScale = 1.35;
 
 }  // namespace
@@ -205,10 +205,10 @@ void DiskHeader::show(const SelectionSummary& summary, const QIcon& icon)
     state_->setFullText(summary.state);
     facts_->setFullText(summary.facts);
     const int side = fontMetrics().ascent();
-    stateIcon_->setPixmap(summary.verdict.empty()
-                              ? QPixmap()
-                              : verdictIcon(summary.verdict)
-                                    .pixmap(QSize(side, side), devicePixelRatioF()));
+    stateIcon_->setPixmap(
+        summary.verdict.empty()
+            ? QPixmap()
+            : verdictIcon(summary.verdict).pixmap(QSize(side, side), devicePixelRatioF()));
     icon_->setPixmap(icon.pixmap(QSize(iconSide, iconSide), devicePixelRatioF()));
     warning_->setText(summary.warning);
     if (summary.space) {

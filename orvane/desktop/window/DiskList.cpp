@@ -18,8 +18,8 @@
 namespace orvane::desktop {
 namespace {
 
-constexpr int margin = 5;  // pixels, around a row and between its parts
-constexpr int progressHeight = 3;  // pixels
+constexpr int margin = 5;                      // pixels, around a row and between its parts
+constexpr int progressHeight = 3;              // pixels
 constexpr double greatestShareOfState = 0.55;  // of the line that the name stands on
 
 QFont nameFont(const QFont& font)
@@ -106,8 +106,7 @@ private:
     // Whole pixels hold what was measured in fractions of them.
     int widthOf(const QString& text) const
     {
-        return static_cast<int>(
-                   std::ceil(QFontMetricsF(painter_.font()).horizontalAdvance(text))) +
+        return static_cast<int>(std::ceil(QFontMetricsF(painter_.font()).horizontalAdvance(text))) +
                1;
     }
 
@@ -123,15 +122,13 @@ private:
         return QStyle::visualRect(option_.direction, option_.rect, rect);
     }
 
-    void draw(const QRect& rect, const QString& text,
-              Qt::TextElideMode elision = Qt::ElideMiddle)
+    void draw(const QRect& rect, const QString& text, Qt::TextElideMode elision = Qt::ElideMiddle)
     {
         // An ellipsis and a letter say nothing.
         const int least = painter_.fontMetrics().averageCharWidth() * 3;
         if (rect.width() < std::min(least, widthOf(text)))
             return;
-        const QString shown =
-            painter_.fontMetrics().elidedText(text, elision, rect.width());
+        const QString shown = painter_.fontMetrics().elidedText(text, elision, rect.width());
         painter_.drawText(visual(rect),
                           Qt::AlignVCenter | Qt::TextSingleLine |
                               QStyle::visualAlignment(option_.direction, Qt::AlignLeft),
@@ -259,12 +256,10 @@ void DiskDelegate::drawDisk(QPainter& painter, const QStyleOptionViewItem& optio
     row.setLine(line, detailFont(option.font), faint);
     row.drawAtEnd(cell(index, DiskColumn::LastCheck).toString());
     const QString details = index.data(DiskTreeModel::DetailsRole).toString();
-    row.drawInTheRest(row.hasRoomFor(details)
-                          ? details
-                          : index.data(DiskTreeModel::ShortDetailsRole).toString(),
-                      Qt::ElideRight);
-    drawProgress(painter, option, rest,
-                 index.data(DiskTreeModel::PercentRole).toDouble());
+    row.drawInTheRest(
+        row.hasRoomFor(details) ? details : index.data(DiskTreeModel::ShortDetailsRole).toString(),
+        Qt::ElideRight);
+    drawProgress(painter, option, rest, index.data(DiskTreeModel::PercentRole).toDouble());
 }
 
 QSize DiskDelegate::sizeHint(const QStyleOptionViewItem& option, const QModelIndex& index) const

@@ -167,14 +167,14 @@ DiskNames namesOf(const DiskRow& row)
 QString nameText(const DiskRow& row)
 {
     const DiskNames names = namesOf(row);
-    return names.bearer.isEmpty() ? names.name
-                                  : names.name + QStringLiteral(" (") + names.bearer + QLatin1Char(')');
+    return names.bearer.isEmpty()
+               ? names.name
+               : names.name + QStringLiteral(" (") + names.bearer + QLatin1Char(')');
 }
 
 QString formatText(const DiskRow& row, const Translator& texts)
 {
-    return row.format.empty() ? toQt(texts.text(kindText(row.facts.type)))
-                                  : toQtLine(row.format);
+    return row.format.empty() ? toQt(texts.text(kindText(row.facts.type))) : toQtLine(row.format);
 }
 
 QString sizeText(std::uint64_t bytes)
@@ -331,16 +331,16 @@ QString rowToolTip(const DiskRow& row, const Translator& texts)
 
 QString searchText(const DiskRow& row, const Translator& texts)
 {
-    return QStringList{nameText(row),
-                       toQtLine(row.facts.name),
-                       toQtLine(row.facts.path.native()),
-                       formatText(row, texts),
-                       toQtLine(row.facts.model),
-                       toQtLine(row.facts.mountPoint),
-                       stateText(row, texts),
-                       row.lastCheck || !row.activity.empty() ? QString()
-                                                              : toQt(texts.text("never checked")),
-                       toQtLine(row.note)}
+    return QStringList{
+        nameText(row),
+        toQtLine(row.facts.name),
+        toQtLine(row.facts.path.native()),
+        formatText(row, texts),
+        toQtLine(row.facts.model),
+        toQtLine(row.facts.mountPoint),
+        stateText(row, texts),
+        row.lastCheck || !row.activity.empty() ? QString() : toQt(texts.text("never checked")),
+        toQtLine(row.note)}
         .join(QLatin1Char('\n'));
 }
 

@@ -104,8 +104,7 @@ struct DiskNames {
 [[nodiscard]] QString columnTitle(DiskColumn column, const Translator& texts);
 /// What the disk is: its format or kind, size and mount point, and what is odd about it. `isShort`:
 /// with fewer words, where there is no room for them.
-[[nodiscard]] QString rowDetails(const DiskRow& row, const Translator& texts,
-                                 bool isShort = false);
+[[nodiscard]] QString rowDetails(const DiskRow& row, const Translator& texts, bool isShort = false);
 /// Everything in one line, for those who hear it.
 [[nodiscard]] QString rowSummary(const DiskRow& row, const Translator& texts);
 /// Everything there is to say, on several lines of plain text.

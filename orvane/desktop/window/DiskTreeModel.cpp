@@ -256,8 +256,7 @@ void DiskTreeModel::showProgress(Node& node, const QModelIndex& at)
     }
 }
 
-void DiskTreeModel::removeGone(Node& node, const QModelIndex& at,
-                               const Subjects& wanted)
+void DiskTreeModel::removeGone(Node& node, const QModelIndex& at, const Subjects& wanted)
 {
     for (int row = static_cast<int>(node.children.size()) - 1; row >= 0; --row) {
         const auto place = node.children.begin() + row;
@@ -269,8 +268,7 @@ void DiskTreeModel::removeGone(Node& node, const QModelIndex& at,
     }
 }
 
-void DiskTreeModel::synchronize(Node& node, const QModelIndex& at,
-                                const Subjects& wanted)
+void DiskTreeModel::synchronize(Node& node, const QModelIndex& at, const Subjects& wanted)
 {
     const auto rowFor = [this](const Subject& subject) {
         return subject.disk ? rowOf(subject.disk) : DiskRow();

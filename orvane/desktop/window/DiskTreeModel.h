@@ -15,8 +15,8 @@
 namespace orvane::desktop {
 
 /// The disks that the host knows, as a tree: whole disks and image files with their volumes. Where
-/// there are both, each kind stands below a heading, a row that can be neither reached nor selected.
-/// The rows follow the controller only when `synchronize` is called. Main thread.
+/// there are both, each kind stands below a heading, a row that can be neither reached nor
+/// selected. The rows follow the controller only when `synchronize` is called. Main thread.
 class DiskTreeModel final : public QAbstractItemModel {
 public:
     using DiskPointer = std::shared_ptr<Disk>;

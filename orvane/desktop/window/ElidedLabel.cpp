@@ -41,8 +41,7 @@ void ElidedLabel::resizeEvent(QResizeEvent* event)
 void ElidedLabel::changeEvent(QEvent* event)
 {
     QLabel::changeEvent(event);
-    if (event->type() == QEvent::FontChange ||
-        event->type() == QEvent::LayoutDirectionChange)
+    if (event->type() == QEvent::FontChange || event->type() == QEvent::LayoutDirectionChange)
         fit();
 }
 

@@ -142,7 +142,8 @@ MainWindow::MainWindow(const Translator& texts)
     setWindowTitle(QStringLiteral("Orvane"));
     setAcceptDrops(true);
     resize(firstSize);
-    // Less than its parts ask for while there is room: what it is made smaller for has them ask less.
+    // Less than its parts ask for while there is room: what it is made smaller for has them ask
+    // less.
     constexpr int leastHeight = 24;  // lines
     setMinimumHeight(leastHeight * fontMetrics().height());
 
@@ -211,9 +212,9 @@ void MainWindow::dragEnterEvent(QDragEnterEvent* event)
         return;
     event->acceptProposedAction();
     const auto count = static_cast<long>(files.size());
-    dropNote_->tell(
-        count == 1 ? toQtLine(texts_.sentence("Drop to open “%@”", {files.front().filename().native()}))
-                   : toQtLine(texts_.sentence("Drop to open %ld files", {count})));
+    dropNote_->tell(count == 1 ? toQtLine(texts_.sentence("Drop to open “%@”",
+                                                          {files.front().filename().native()}))
+                               : toQtLine(texts_.sentence("Drop to open %ld files", {count})));
 }
 
 void MainWindow::dragLeaveEvent(QDragLeaveEvent* event)

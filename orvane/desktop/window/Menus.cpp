@@ -65,8 +65,7 @@ void addCommand(QMenu& menu, const MenuCommand& command, const Translator& texts
         return;
     }
     const QString title = titleOf(command, texts);
-    QAction* const action =
-        command.fill ? addSubmenu(menu, command, title) : menu.addAction(title);
+    QAction* const action = command.fill ? addSubmenu(menu, command, title) : menu.addAction(title);
     action->setObjectName(QLatin1String(command.objectName));
     action->setShortcut(command.shortcut);
     action->setCheckable(static_cast<bool>(command.isOn));

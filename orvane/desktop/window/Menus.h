@@ -23,8 +23,8 @@ struct MenuCommand {
     std::function<bool()> isAvailable = {};
     /// For a command that is a switch: its state, asked when the menu opens.
     std::function<bool()> isOn = {};
-    /// Why the command cannot be given, in the user's language: its tool tip while it is grey. Asked
-    /// as `isAvailable` is, and beside it; empty when it can.
+    /// Why the command cannot be given, in the user's language: its tool tip while it is grey.
+    /// Asked as `isAvailable` is, and beside it; empty when it can.
     std::function<std::string()> reasonAgainst = {};
     /// For a command that is a menu of its own: fills it each time that it opens.
     std::function<void(QMenu& menu)> fill = {};

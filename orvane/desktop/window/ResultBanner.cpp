@@ -124,8 +124,8 @@ void ResultBanner::fill()
                          .arg(toQt(shown_.disks[i].identifier).toHtmlEscaped(),
                               toQt(shown_.disks[i].name).toHtmlEscaped());
         if (shown_.disks.size() > mostLinks)
-            links += toQt(texts_.sentence(
-                "and %ld more", {static_cast<long>(shown_.disks.size() - mostLinks)}));
+            links += toQt(texts_.sentence("and %ld more",
+                                          {static_cast<long>(shown_.disks.size() - mostLinks)}));
         details = links.join(QStringLiteral(", "));
     }
     details_->setText(details);

@@ -210,8 +210,11 @@ ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,
     const LastCheck& check = *disk.lastCheck;
     const Check& last = check.later ? *check.later : check.told;
     const Ending ending = endingOf(last);
-    return {toneOf(ending), titleOf(last, ending, texts), asSentence(last.message),
-            stepsAfter(ending, disk, situation), {}};
+    return {toneOf(ending),
+            titleOf(last, ending, texts),
+            asSentence(last.message),
+            stepsAfter(ending, disk, situation),
+            {}};
 }
 
 ResultSummary resultOfClosing(const std::vector<std::string>& images, const Translator& texts)
@@ -246,7 +249,8 @@ ResultSummary resultOfSeveral(const std::vector<DiskRow>& disks, const Translato
         const Tone tone = check.isPartial ? Tone::Neutral : toneOf(endingOf(check.told));
         summary.tone = worse(summary.tone, tone);
         if (tone == Tone::Bad || tone == Tone::Caution)
-            summary.disks.push_back({fromQt(names[static_cast<qsizetype>(i)]), disk.facts.identifier});
+            summary.disks.push_back(
+                {fromQt(names[static_cast<qsizetype>(i)]), disk.facts.identifier});
     }
     if (checked.empty())
         return {};

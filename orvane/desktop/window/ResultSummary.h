@@ -49,7 +49,7 @@ struct ResultSituation {
     bool canRepair = false;
     bool canUndo = false;
     bool canUndoPermissions = false;  ///< a repair of the permissions of its files
-    bool isInterrupted = false;  ///< a repair of it is half written
+    bool isInterrupted = false;       ///< a repair of it is half written
 };
 
 [[nodiscard]] ResultSummary resultOf(const DiskRow& disk, const ResultSituation& situation,

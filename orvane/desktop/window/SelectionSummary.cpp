@@ -31,8 +31,8 @@ QString stateOf(const DiskRow& row, const QDateTime& now, const Translator& text
     const LastCheck& check = *row.lastCheck;
     QString text = capitalized(state) + separator + ageText(check.told.started, now, texts);
     if (check.later)
-        text += separator + toQt(texts.sentence("then %@",
-                                                {fromQt(verdictText(*check.later, texts))}));
+        text +=
+            separator + toQt(texts.sentence("then %@", {fromQt(verdictText(*check.later, texts))}));
     return withNext(text);
 }
 
@@ -71,9 +71,9 @@ void addSpace(SelectionSummary& summary, const DiskRow& row, const Translator& t
     if (!row.facts.space || (isDoubtful && row.facts.mountPoint.empty()))
         return;
     summary.space = row.facts.space;
-    summary.spaceText = toQt(texts.sentence("%@ of %@ used",
-                                            {fromQt(sizeText(summary.space->used)),
-                                             fromQt(sizeText(summary.space->total))}));
+    summary.spaceText =
+        toQt(texts.sentence("%@ of %@ used", {fromQt(sizeText(summary.space->used)),
+                                              fromQt(sizeText(summary.space->total))}));
 }
 
 void addPartitions(SelectionSummary& summary, const std::vector<DiskRow>& parts,
@@ -125,30 +125,29 @@ QString countsOf(const std::vector<DiskRow>& rows, const Translator& texts)
     };
     static constexpr std::string_view partly = "partly checked";
     static constexpr std::string_view never = "never checked";
-    static const std::array states{State{contract::kPLVerdictDamaged.text(), "%ld damaged"},
-                                   State{contract::kPLVerdictFailed.text(), "%ld failed"},
-                                   State{contract::kPLVerdictInconclusive.text(), "%ld inconclusive"},
-                                   State{contract::kPLVerdictStopped.text(), "%ld stopped"},
-                                   State{"", "%ld cut off"},
-                                   State{contract::kPLVerdictUndone.text(), "%ld undone"},
-                                   State{contract::kPLVerdictRepaired.text(), "%ld repaired"},
-                                   State{contract::kPLVerdictSound.text(), "%ld sound"},
-                                   State{partly, "%ld partly checked"},
-                                   State{never, "%ld never checked"}};
+    static const std::array states{
+        State{contract::kPLVerdictDamaged.text(), "%ld damaged"},
+        State{contract::kPLVerdictFailed.text(), "%ld failed"},
+        State{contract::kPLVerdictInconclusive.text(), "%ld inconclusive"},
+        State{contract::kPLVerdictStopped.text(), "%ld stopped"},
+        State{"", "%ld cut off"},
+        State{contract::kPLVerdictUndone.text(), "%ld undone"},
+        State{contract::kPLVerdictRepaired.text(), "%ld repaired"},
+        State{contract::kPLVerdictSound.text(), "%ld sound"},
+        State{partly, "%ld partly checked"},
+        State{never, "%ld never checked"}};
     const auto stateOf = [](const DiskRow& row) -> std::string_view {
-        return !row.lastCheck              ? never
+        return !row.lastCheck             ? never
                : row.lastCheck->isPartial ? partly
-                                           : std::string_view(row.lastCheck->told.verdict);
+                                          : std::string_view(row.lastCheck->told.verdict);
     };
     QStringList parts;
     for (const State& state : states)
-        if (const auto number = static_cast<long>(
-                std::ranges::count_if(rows,
-                                      [&](const DiskRow& row) {
-                                          return stateOf(row) == state.verdict;
-                                      }));
+        if (const auto number = static_cast<long>(std::ranges::count_if(
+                rows, [&](const DiskRow& row) { return stateOf(row) == state.verdict; }));
             number > 0)
-            parts += toQt(contract::format(texts.plural(state.count, state.count, number), {number}));
+            parts +=
+                toQt(contract::format(texts.plural(state.count, state.count, number), {number}));
     return parts.join(QStringLiteral(", "));
 }
 
@@ -200,7 +199,12 @@ SelectionSummary summaryOf(const std::vector<DiskRow>& selected, const std::vect
     if (selected.empty())
         return {toQt(texts.text("No disk is selected")),
                 toQt(texts.text("Select disks in the list, or open an image.")),
-                {}, {}, {}, {}, {}, {}};
+                {},
+                {},
+                {},
+                {},
+                {},
+                {}};
     if (selected.size() > 1)
         return summaryOfSeveral(selected, texts);
     SelectionSummary summary = summaryOfOne(selected.front(), now, texts);

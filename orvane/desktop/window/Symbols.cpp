@@ -80,13 +80,8 @@ QPainterPath turn(bool isMirrored)
 
 QPainterPath folder()
 {
-    return lines({{{1.6, 12.6},
-                   {1.6, 3.2},
-                   {6, 3.2},
-                   {7.6, 5.2},
-                   {14.4, 5.2},
-                   {14.4, 12.6},
-                   {1.6, 12.6}}});
+    return lines(
+        {{{1.6, 12.6}, {1.6, 3.2}, {6, 3.2}, {7.6, 5.2}, {14.4, 5.2}, {14.4, 12.6}, {1.6, 12.6}}});
 }
 
 QPainterPath sheetWithLines()
@@ -104,8 +99,10 @@ QPainterPath twoSheets()
 
 QPainterPath sliders()
 {
-    QPainterPath path = lines({{{1.8, 4.6}, {7.6, 4.6}}, {{12, 4.6}, {14.2, 4.6}},
-                               {{1.8, 11.4}, {4, 11.4}}, {{8.4, 11.4}, {14.2, 11.4}}});
+    QPainterPath path = lines({{{1.8, 4.6}, {7.6, 4.6}},
+                               {{12, 4.6}, {14.2, 4.6}},
+                               {{1.8, 11.4}, {4, 11.4}},
+                               {{8.4, 11.4}, {14.2, 11.4}}});
     path.addEllipse(QPointF(9.8, 4.6), 2, 2);
     path.addEllipse(QPointF(6.2, 11.4), 2, 2);
     return path;

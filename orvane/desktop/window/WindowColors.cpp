@@ -39,8 +39,7 @@ RowColors rowColors(const QPalette& palette, QPalette::ColorGroup group, bool is
     RowColors colors;
     colors.ground = palette.color(group, isSelected ? QPalette::Highlight : QPalette::Base);
     colors.text = palette.color(group, isSelected ? QPalette::HighlightedText : QPalette::Text);
-    colors.faint =
-        readableOn(colors.ground, mixedColor(colors.ground, colors.text, faintShare));
+    colors.faint = readableOn(colors.ground, mixedColor(colors.ground, colors.text, faintShare));
     colors.track = mixedColor(colors.ground, colors.text, trackShare);
     colors.bar = readableOn(colors.track,
                             isSelected ? colors.text : palette.color(group, QPalette::Highlight),
@@ -58,8 +57,8 @@ QColor headingColor(const QPalette& palette)
 PartColors partColors(const QPalette& palette, bool isMarked)
 {
     const QColor color = palette.color(QPalette::Highlight);
-    const QColor ground = mixedColor(palette.color(QPalette::Base), color,
-                                     isMarked ? markedTint : partTint);
+    const QColor ground =
+        mixedColor(palette.color(QPalette::Base), color, isMarked ? markedTint : partTint);
     return {ground, readableOn(ground, palette.color(QPalette::Text)),
             readableOn(palette.color(QPalette::Window), color, visibleContrast)};
 }

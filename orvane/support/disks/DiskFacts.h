@@ -44,7 +44,7 @@ struct DiskFacts : contract::DiskReference {
     bool isShown = true;
 
     std::string label = {};
-    std::string uuid = {};  ///< of the file system
+    std::string uuid = {};               ///< of the file system
     std::string filesystemVersion = {};  ///< as libblkid names it; mostly empty
     /// Of a volume, as it says itself; none where it does not, or cannot be read.
     std::optional<pellar::SpaceUse> space = {};

@@ -284,10 +284,9 @@ std::optional<DiskFacts> readBlockDevice(const fs::path& node, const DiskSources
     DiskFacts facts = baseFacts(device, node);
     const Contents contents = contentsOf(node, number, facts.length, sources);
     const bool isPartition = !attribute(device, "partition").empty();
-    facts.type = isPartition
-                     ? diskType::volume
-                     : typeOfWhole(device, contents, false,
-                                   mountOf(facts, number, sources).has_value());
+    facts.type = isPartition ? diskType::volume
+                             : typeOfWhole(device, contents, false,
+                                           mountOf(facts, number, sources).has_value());
     facts.isWhole = facts.type == diskType::whole;
     addSuperblock(facts, contents);
     addMount(facts, number, sources);

@@ -77,10 +77,10 @@ RunTable::RunTable(Database& database)
           "UPDATE runs SET finished = ?, verdict = ?, error = ?, message = ?, "
           "tool = NULLIF(?, ''), problems = NULLIF(?, 0), problemKinds = NULLIF(?, 0), "
           "losses = NULLIF(?, 0) WHERE id = ?")),
-      list_(
-          database.prepare("SELECT action, started, finished, verdict, error, message, owner, "
-                           "tool, problems, problemKinds, losses FROM runs "
-                           "LEFT JOIN openRuns ON run = id WHERE volume = ? ORDER BY id DESC LIMIT ?")),
+      list_(database.prepare(
+          "SELECT action, started, finished, verdict, error, message, owner, "
+          "tool, problems, problemKinds, losses FROM runs "
+          "LEFT JOIN openRuns ON run = id WHERE volume = ? ORDER BY id DESC LIMIT ?")),
       trim_(database.prepare("DELETE FROM runs WHERE volume = ?1 AND id <= (SELECT id FROM runs "
                              "WHERE volume = ?1 ORDER BY id DESC LIMIT 1 OFFSET ?2)")),
       database_(database)

@@ -16,7 +16,7 @@ namespace orvane {
 struct RunEnd {
     std::string verdict;  ///< one of the library's verdicts
     std::int32_t errorCode = 0;
-    std::string message;  ///< one sentence; empty when there was nothing to say
+    std::string message;            ///< one sentence; empty when there was nothing to say
     std::string tool = {};          ///< with its version; empty where none ran, or it is not known
     std::int64_t problems = 0;      ///< that were told of; 0 also where it is not known
     std::int64_t problemKinds = 0;  ///< of how many kinds they are; 0 likewise

@@ -11,7 +11,9 @@ contract::RunLoop::Task AwaitedTask::taskFor(const std::shared_ptr<AwaitedTask>&
     // Given up when the last copy of the task is destroyed; harmless after it has run.
     const std::shared_ptr<AwaitedTask> ticket(awaited.get(),
                                               [awaited](AwaitedTask* it) { it->abandon(); });
-    return [ticket, task = std::move(task)] { ticket->run(task); };
+    return [ticket, task = std::move(task)] {
+        ticket->run(task);
+    };
 }
 
 void AwaitedTask::run(const contract::RunLoop::Task& task)

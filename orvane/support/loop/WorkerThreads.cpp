@@ -72,7 +72,7 @@ void WorkerThreads::detachNewThread(contract::RunLoop::Task task)
     {
         const std::lock_guard guard(lock_);
         const bool isFirst = std::all_of(workers_.begin(), workers_.end(),
-                                                [](const auto& other) { return other->isOver; });
+                                         [](const auto& other) { return other->isOver; });
         worker = workers_.emplace_back(std::make_unique<Worker>(*this)).get();
         worker->isFirst = isFirst;
     }

@@ -29,8 +29,7 @@ RepairSettings settingsFrom(const Lookup& valueOf)
     read.keptRepairDays = std::min(read.keptRepairDays, mostRepairDays);
     take(valueOf("keptRepairMegabytes"), read.keptRepairMegabytes);
     const contract::Value thorough = valueOf("thoroughVerification");
-    read.thoroughVerification =
-        thorough.kind() == contract::Kind::Boolean && thorough.boolean();
+    read.thoroughVerification = thorough.kind() == contract::Kind::Boolean && thorough.boolean();
     return read;
 }
 
@@ -50,8 +49,7 @@ RepairSettings readRepairSettings(const std::filesystem::path& file)
 
 RepairSettings repairSettingsIn(const contract::UserDefaults& settings)
 {
-    return settingsFrom(
-        [&settings](std::string_view key) { return settings.objectForKey(key); });
+    return settingsFrom([&settings](std::string_view key) { return settings.objectForKey(key); });
 }
 
 }  // namespace orvane

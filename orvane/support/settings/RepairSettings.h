@@ -15,8 +15,8 @@ inline constexpr std::uint64_t mostRepairDays = 36'500;
 
 /// What of the stored settings (SettingsFile) is about repairs. The keys are the fields' names.
 struct RepairSettings {
-    std::uint64_t keptRepairs = 20;  ///< of all disks together, that can be undone
-    std::uint64_t keptRepairDays = 90;   ///< at most `mostRepairDays`
+    std::uint64_t keptRepairs = 20;            ///< of all disks together, that can be undone
+    std::uint64_t keptRepairDays = 90;         ///< at most `mostRepairDays`
     std::uint64_t keptRepairMegabytes = 4096;  ///< of 2^20 bytes, all repairs together
     /// A verification that finds nothing tries a repair as well.
     bool thoroughVerification = false;

@@ -14,9 +14,9 @@ namespace {
 using Clock = std::chrono::steady_clock;
 using std::chrono::milliseconds;
 /// A unit of ListUnitsByPatterns: its name is the first, its object the seventh.
-using Unit = sdbus::Struct<std::string, std::string, std::string, std::string, std::string,
-                           std::string, sdbus::ObjectPath, std::uint32_t, std::string,
-                           sdbus::ObjectPath>;
+using Unit =
+    sdbus::Struct<std::string, std::string, std::string, std::string, std::string, std::string,
+                  sdbus::ObjectPath, std::uint32_t, std::string, sdbus::ObjectPath>;
 
 constexpr std::string_view prefix = "fixwell-check@";
 constexpr std::string_view suffix = ".timer";
@@ -58,12 +58,10 @@ std::vector<Unit> waitingTimers(TimerQuestions& manager)
     const std::vector<std::string> states{"active"};
     const std::vector<std::string> patterns{std::string(prefix) + "*" + std::string(suffix)};
     auto units = manager
-                     .ask<std::vector<Unit>>({"/org/freedesktop/systemd1",
-                                              "org.freedesktop.systemd1.Manager",
-                                              "ListUnitsByPatterns", service},
-                                             [&](sdbus::MethodCall& call) {
-                                                 call << states << patterns;
-                                             })
+                     .ask<std::vector<Unit>>(
+                         {"/org/freedesktop/systemd1", "org.freedesktop.systemd1.Manager",
+                          "ListUnitsByPatterns", service},
+                         [&](sdbus::MethodCall& call) { call << states << patterns; })
                      .value_or(std::vector<Unit>());
     if (units.size() > mostTimers)
         units.resize(mostTimers);
@@ -124,9 +122,7 @@ std::string nameOfInstance(std::string_view instance)
             std::from_chars(digits.begin(), digits.end(), byte, 16).ptr == digits.end();
         if (isEscape)
             i += 3;
-        name += isEscape             ? static_cast<char>(byte)
-                : instance[i] == '-' ? '/'
-                                     : instance[i];
+        name += isEscape ? static_cast<char>(byte) : instance[i] == '-' ? '/' : instance[i];
     }
     return name.starts_with("dev/") ? "/" + name : name;
 }
@@ -146,9 +142,8 @@ std::vector<CheckTimer> readCheckTimers(const std::stop_token& stop)
             const std::uint64_t next = nextElapseOf(unit, manager);
             constexpr std::uint64_t latest = 253402300799000000;  // the end of the year 9999
             if (next != 0 && next <= latest)
-                timers.push_back({nameOfInstance(instance),
-                                  std::chrono::system_clock::time_point(
-                                      std::chrono::microseconds(next))});
+                timers.push_back({nameOfInstance(instance), std::chrono::system_clock::time_point(
+                                                                std::chrono::microseconds(next))});
         }
     } catch (const sdbus::Error&) {
         // There is no bus, or it went away: what is known until then.

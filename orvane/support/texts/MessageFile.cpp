@@ -36,19 +36,58 @@ private:
     };
     // Longer signs before those that they begin with.
     static constexpr std::array operators{
-        Operator{"||", 1, [](auto a, auto b) { return 0UL + (a != 0 || b != 0); }},
-        Operator{"&&", 2, [](auto a, auto b) { return 0UL + (a != 0 && b != 0); }},
-        Operator{"==", 3, [](auto a, auto b) { return 0UL + (a == b); }},
-        Operator{"!=", 3, [](auto a, auto b) { return 0UL + (a != b); }},
-        Operator{"<=", 4, [](auto a, auto b) { return 0UL + (a <= b); }},
-        Operator{">=", 4, [](auto a, auto b) { return 0UL + (a >= b); }},
-        Operator{"<", 4, [](auto a, auto b) { return 0UL + (a < b); }},
-        Operator{">", 4, [](auto a, auto b) { return 0UL + (a > b); }},
-        Operator{"+", 5, [](auto a, auto b) { return a + b; }},
-        Operator{"-", 5, [](auto a, auto b) { return a - b; }},
-        Operator{"*", 6, [](auto a, auto b) { return a * b; }},
-        Operator{"/", 6, [](auto a, auto b) { return b == 0 ? 0 : a / b; }},
-        Operator{"%", 6, [](auto a, auto b) { return b == 0 ? 0 : a % b; }},
+        Operator{"||", 1,
+                 [](auto a, auto b) {
+                     return 0UL + (a != 0 || b != 0);
+                 }},
+        Operator{"&&", 2,
+                 [](auto a, auto b) {
+                     return 0UL + (a != 0 && b != 0);
+                 }},
+        Operator{"==", 3,
+                 [](auto a, auto b) {
+                     return 0UL + (a == b);
+                 }},
+        Operator{"!=", 3,
+                 [](auto a, auto b) {
+                     return 0UL + (a != b);
+                 }},
+        Operator{"<=", 4,
+                 [](auto a, auto b) {
+                     return 0UL + (a <= b);
+                 }},
+        Operator{">=", 4,
+                 [](auto a, auto b) {
+                     return 0UL + (a >= b);
+                 }},
+        Operator{"<", 4,
+                 [](auto a, auto b) {
+                     return 0UL + (a < b);
+                 }},
+        Operator{">", 4,
+                 [](auto a, auto b) {
+                     return 0UL + (a > b);
+                 }},
+        Operator{"+", 5,
+                 [](auto a, auto b) {
+                     return a + b;
+                 }},
+        Operator{"-", 5,
+                 [](auto a, auto b) {
+                     return a - b;
+                 }},
+        Operator{"*", 6,
+                 [](auto a, auto b) {
+                     return a * b;
+                 }},
+        Operator{"/", 6,
+                 [](auto a, auto b) {
+                     return b == 0 ? 0 : a / b;
+                 }},
+        Operator{"%", 6,
+                 [](auto a, auto b) {
+                     return b == 0 ? 0 : a % b;
+                 }},
     };
 
     unsigned long choice()

@@ -44,8 +44,7 @@ std::string zonedTime(std::chrono::system_clock::time_point time)
 
 std::string durationText(std::chrono::system_clock::duration duration, const Translator& texts)
 {
-    const std::int64_t seconds =
-        std::chrono::duration_cast<std::chrono::seconds>(duration).count();
+    const std::int64_t seconds = std::chrono::duration_cast<std::chrono::seconds>(duration).count();
     const auto number = [](std::int64_t value) {
         return std::to_string(value);
     };

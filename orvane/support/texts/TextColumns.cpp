@@ -11,7 +11,8 @@ namespace {
 constexpr std::string_view blanks = " \t\r\n";
 
 // The most common of JIS X 4051's characters that may not begin, or end, a line.
-constexpr std::u32string_view neverFirst = U"、。，．・：；？！」』）］｝】〉》”’ー々ぁぃぅぇぉっゃゅょァィゥェォッャュョ";
+constexpr std::u32string_view neverFirst =
+    U"、。，．・：；？！」』）］｝】〉》”’ー々ぁぃぅぇぉっゃゅょァィゥェォッャュョ";
 constexpr std::u32string_view neverLast = U"「『（［｛【〈《“‘";
 
 bool isWide(char32_t character)

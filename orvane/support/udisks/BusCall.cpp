@@ -84,9 +84,8 @@ bool processNext(sdbus::IConnection& connection)
 BusCall::BusCall(sdbus::IConnection& connection, const BusMethod& method,
                  const Arguments& arguments, milliseconds timeout)
     : connection_(connection),
-      proxy_(
-          sdbus::createProxy(connection, BusServiceName(method.service),
-                             sdbus::ObjectPath(method.object)))
+      proxy_(sdbus::createProxy(connection, BusServiceName(method.service),
+                                sdbus::ObjectPath(method.object)))
 {
     sdbus::MethodCall call = callOf(*proxy_, method);
     arguments(call);

@@ -67,9 +67,9 @@ std::string CommandEntry::usage(const Translator& texts) const
 
 const CommandEntry* CommandTree::find(std::string_view command) const
 {
-    const auto found = std::find_if(commands.begin(), commands.end(), [&](const CommandEntry& entry) {
-        return entry.name == command;
-    });
+    const auto found =
+        std::find_if(commands.begin(), commands.end(),
+                     [&](const CommandEntry& entry) { return entry.name == command; });
     return found == commands.end() ? nullptr : &*found;
 }
 
@@ -90,7 +90,8 @@ std::vector<Block> rowsOf(const std::vector<OptionEntry>& options, const Transla
 {
     std::vector<Block> rows;
     for (const OptionEntry& option : options)
-        rows.push_back({Kind::Row, {{Look::Verbatim, option.usage(texts)}}, {{Look::Plain, option.text}}});
+        rows.push_back(
+            {Kind::Row, {{Look::Verbatim, option.usage(texts)}}, {{Look::Plain, option.text}}});
     return rows;
 }
 
@@ -113,11 +114,13 @@ Document overviewOf(const CommandTree& tree, const Translator& texts)
 Document helpOn(const CommandEntry& command, const CommandTree& tree, const Translator& texts)
 {
     Document page;
-    page.blocks.push_back({Kind::Paragraph, {{Look::Plain, texts.sentence("%@.", {command.text})}}});
+    page.blocks.push_back(
+        {Kind::Paragraph, {{Look::Plain, texts.sentence("%@.", {command.text})}}});
     page.blocks.push_back(usageLine(tree.name + " " + command.usage(texts), texts));
     for (const ArgumentEntry& argument : command.arguments)
-        page.blocks.push_back(
-            {Kind::Row, {{Look::Verbatim, texts.text(argument.name)}}, {{Look::Plain, argument.text}}});
+        page.blocks.push_back({Kind::Row,
+                               {{Look::Verbatim, texts.text(argument.name)}},
+                               {{Look::Plain, argument.text}}});
     if (!command.options.empty()) {
         page.blocks.push_back(heading(texts, "Options"));
         append(page.blocks, rowsOf(command.options, texts));

@@ -12,9 +12,9 @@ namespace orvane::manual {
 
 /// An option of a command, or of all of them.
 struct OptionEntry {
-    std::string name;     ///< "--details"
+    std::string name;            ///< "--details"
     std::string shortName = {};  ///< "-h"; mostly empty
-    std::string value;    ///< what it takes: choices ("auto|never"), or a name (FILE); empty: nothing
+    std::string value;  ///< what it takes: choices ("auto|never"), or a name (FILE); empty: nothing
     std::string text;
 
     /// "--color auto|never", in the language of the texts.
@@ -62,7 +62,8 @@ Document helpOn(const CommandEntry& command, const CommandTree& tree, const Tran
 /// A row for each: its usage and its text.
 std::vector<Block> rowsOf(const std::vector<OptionEntry>& options, const Translator& texts);
 
-/// Those of `known` that the word may have been meant to be, the nearest first; none that is far off.
+/// Those of `known` that the word may have been meant to be, the nearest first; none that is far
+/// off.
 std::vector<std::string> nearest(std::string_view word, const std::vector<std::string>& known);
 
 }  // namespace orvane::manual

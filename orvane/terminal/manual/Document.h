@@ -27,11 +27,11 @@ struct Block {
         Heading,
         Subheading,
         Paragraph,
-        Item,       ///< of a list; `mark` is its bullet or its number
-        Term,       ///< a line that the definition below it explains
+        Item,  ///< of a list; `mark` is its bullet or its number
+        Term,  ///< a line that the definition below it explains
         Definition,
-        Row,        ///< `text`, and `explanation` beside it
-        Example,    ///< lines to be kept as they are
+        Row,      ///< `text`, and `explanation` beside it
+        Example,  ///< lines to be kept as they are
     };
     Kind kind = Kind::Paragraph;
     Spans text;

@@ -32,7 +32,9 @@ std::string decoded(std::string_view name)
     std::string text;
     if (name.starts_with('#') &&
         std::from_chars(digits.data(), digits.data() + digits.size(), number,
-                        isHexadecimal ? 16 : 10).ec == std::errc() && number <= 0x10FFFF)
+                        isHexadecimal ? 16 : 10)
+                .ec == std::errc() &&
+        number <= 0x10FFFF)
         contract::appendUTF8(text, static_cast<char32_t>(number));
     return text.empty() ? "&" + std::string(name) + ";" : text;
 }
@@ -70,9 +72,9 @@ public:
     Document read(std::string_view html)
     {
         while (!html.empty()) {
-            const std::size_t end = html.starts_with("<!--")    ? html.find("-->")
-                                    : html.front() == '<' ? html.find('>')
-                                                                : std::string_view::npos;
+            const std::size_t end = html.starts_with("<!--") ? html.find("-->")
+                                    : html.front() == '<'    ? html.find('>')
+                                                             : std::string_view::npos;
             if (end == std::string_view::npos) {
                 const std::size_t length = std::max<std::size_t>(html.find('<', 1), 1);
                 text_ += withoutEntities(html.substr(0, length));
@@ -120,7 +122,8 @@ private:
             block_.mark = mark;
         std::string page(attribute(tag, "href"));
         page = page.substr(0, page.find(".html"));
-        if (!page.empty() && std::find(page_.links.begin(), page_.links.end(), page) == page_.links.end())
+        if (!page.empty() &&
+            std::find(page_.links.begin(), page_.links.end(), page) == page_.links.end())
             page_.links.push_back(page);
         return true;
     }
@@ -189,8 +192,8 @@ private:
     void endBlock()
     {
         // What stands between two blocks belongs to none.
-        const bool isBetween = block_.text.empty() &&
-                               text_.find_first_not_of(" \t\r\n") == std::string::npos;
+        const bool isBetween =
+            block_.text.empty() && text_.find_first_not_of(" \t\r\n") == std::string::npos;
         if (isBetween)
             text_.clear();
         endSpan();

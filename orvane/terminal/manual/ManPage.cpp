@@ -43,7 +43,8 @@ std::string escaped(std::string_view text, bool isVerbatim)
     std::string result;
     char32_t before = U' ';
     contract::forEachCharacter(text, [&](char32_t character) {
-        const bool beginsWord = before == U' ' || before == U'“' || before == U'-' || before == U'(';
+        const bool beginsWord =
+            before == U' ' || before == U'“' || before == U'-' || before == U'(';
         if (character == U'\\')
             result += "\\(rs";
         else if (character == U'-' && (isVerbatim || beginsWord))

@@ -27,7 +27,8 @@ public:
         if (!page.title.empty())
             write({{Span::Look::Bold, page.title}}, 0);
         for (std::size_t i = 0; i < page.blocks.size(); ++i) {
-            if (page.blocks[i].kind == Kind::Row && (i == 0 || page.blocks[i - 1].kind != Kind::Row))
+            if (page.blocks[i].kind == Kind::Row &&
+                (i == 0 || page.blocks[i - 1].kind != Kind::Row))
                 nameColumns_ = columnsOfNames(page.blocks, i);
             if (i > 0 ? isApart(page.blocks[i - 1].kind, page.blocks[i].kind) : !page.title.empty())
                 text_ += '\n';
@@ -40,7 +41,8 @@ private:
     /// Rows, items, and a term and what it means, follow each other closely.
     static bool isApart(Kind before, Kind after)
     {
-        return before != Kind::Heading && before != Kind::Subheading && !(before == after && (after == Kind::Row || after == Kind::Item)) &&
+        return before != Kind::Heading && before != Kind::Subheading &&
+               !(before == after && (after == Kind::Row || after == Kind::Item)) &&
                !(before == Kind::Term && after == Kind::Definition);
     }
 
@@ -48,7 +50,8 @@ private:
     {
         std::size_t widest = 0;
         for (std::size_t i = first; i < blocks.size() && blocks[i].kind == Kind::Row; ++i)
-            if (const std::size_t columns = columnsOf(wordsOf(blocks[i].text)); columns <= longestName)
+            if (const std::size_t columns = columnsOf(wordsOf(blocks[i].text));
+                columns <= longestName)
                 widest = std::max(widest, columns);
         return widest;
     }
@@ -127,7 +130,8 @@ private:
         // A word may go on in the next span, so pieces are put together before they are laid out.
         for (const Spans& word : wordsIn(spans)) {
             const std::string letters = wordsOf(word);
-            const std::size_t width = columnsOf(letters.substr(0, letters.find_last_not_of(' ') + 1));
+            const std::size_t width =
+                columnsOf(letters.substr(0, letters.find_last_not_of(' ') + 1));
             if (!isLineStart && column_ + pending + width > layout_.columns) {
                 turn(look, Span::Look::Plain);
                 text_ += '\n' + indent(margin);

@@ -163,8 +163,8 @@ std::vector<DiskTree> machine()
     drive.facts.partitionMap = "gpt";
     drive.children = {volume("nvme0n1p1", "EFI", "vfat", "/boot/efi", 1),
                       volume("nvme0n1p2", "System", "ext4", "/", 100),
-                      volume("nvme0n1p3", "A label that is much longer than any list is wide", "btrfs",
-                             "/home", 853)};
+                      volume("nvme0n1p3", "A label that is much longer than any list is wide",
+                             "btrfs", "/home", 853)};
     drive.children[1].facts.isBootVolume = true;
     DiskTree stick = disk("sda", "Stick", 15);
     stick.facts.isEjectable = true;
@@ -245,12 +245,12 @@ TEST_F(Pictures, OfTwoModules)
     std::filesystem::create_directory(place);
     if (::mount(device.name().c_str(), place.c_str(), "ext4", 0, nullptr) != 0)
         GTEST_SKIP() << "a loop device cannot be mounted here";
-    const auto unmounted = std::shared_ptr<void>(nullptr, [place](void*) { ::umount(place.c_str()); });
-    for (const auto& [name, kibibytes] : {std::pair{"Pictures/2025/one.raw", 91'000},
-                                          std::pair{"Pictures/2026/two.raw", 31'000},
-                                          std::pair{"Films/film.mkv", 41'500},
-                                          std::pair{"Letters/letter.odt", 120},
-                                          std::pair{"list.txt", 3}})
+    const auto unmounted =
+        std::shared_ptr<void>(nullptr, [place](void*) { ::umount(place.c_str()); });
+    for (const auto& [name, kibibytes] :
+         {std::pair{"Pictures/2025/one.raw", 91'000}, std::pair{"Pictures/2026/two.raw", 31'000},
+          std::pair{"Films/film.mkv", 41'500}, std::pair{"Letters/letter.odt", 120},
+          std::pair{"list.txt", 3}})
         orvane::test::write(place / name,
                             std::string(static_cast<std::size_t>(kibibytes) << 10U, 'x'));
     SessionOptions wanted = options({});

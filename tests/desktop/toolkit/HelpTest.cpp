@@ -8,8 +8,8 @@
 
 #include <QFile>
 #include <QLineEdit>
-#include <QRegularExpression>
 #include <QListWidget>
+#include <QRegularExpression>
 #include <QTest>
 
 #include <gtest/gtest.h>
@@ -93,7 +93,8 @@ TEST(HelpBook, EveryLanguageHasTheSamePagesAndEveryLinkLeadsToOne)
             EXPECT_FALSE(HelpBook::plainText(pages[i]).isEmpty()) << pages[i].toStdString();
             EXPECT_EQ(skeleton(pages[i]), skeleton(english[i])) << pages[i].toStdString();
             // Colours are the palette's, and nothing comes from elsewhere.
-            for (const char* const forbidden : {"color:", "color=", "style=", "<img", "<script", "http:"})
+            for (const char* const forbidden :
+                 {"color:", "color=", "style=", "<img", "<script", "http:"})
                 EXPECT_FALSE(contentsOf(pages[i]).contains(QLatin1String(forbidden)))
                     << pages[i].toStdString() << " has " << forbidden;
             for (const auto& match : link.globalMatch(contentsOf(pages[i])))

@@ -63,14 +63,8 @@ struct World {
     }
 
     fs::path storePath() const { return directory / "store"; }
-    void open(SyncFunction sync)
-    {
-        store = *UndoStore::open(storePath(), std::move(sync));
-    }
-    UndoRecord save()
-    {
-        return *store->save(repairOf(), ranges, disk, view);
-    }
+    void open(SyncFunction sync) { store = *UndoStore::open(storePath(), std::move(sync)); }
+    UndoRecord save() { return *store->save(repairOf(), ranges, disk, view); }
     std::string apply()
     {
         UndoRecord record = save();
