@@ -1,9 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
+#include "contract/foundation/Format.h"
+#include "contract/foundation/UTF8.h"
 #include "orvane/desktop/DesktopSession.h"
 #include "orvane/desktop/session/SingleInstance.h"
 #include "orvane/desktop/toolkit/ColorScheme.h"
 #include "orvane/support/ProgramStart.h"
 #include "orvane/support/loop/SignalReader.h"
+#include "orvane/support/modules/ModuleSearch.h"
+#include "orvane/support/texts/Catalogue.h"
 #include "orvane/support/texts/Language.h"
 
 #include <QApplication>
@@ -15,22 +19,40 @@
 #include <exception>
 #include <functional>
 #include <optional>
+#include <string>
 #include <string_view>
+#include <vector>
 
 namespace orvane::desktop {
 namespace {
 
 constexpr int exitWrongUsage = 2;
 
-constexpr const char* usage =
-    "Usage: orvane [IMAGE...]\n"
-    "Opens the window for checking and repairing disks, with these disk images in its list.\n"
-    "A device, a mount point, LABEL=... or UUID=... selects that disk.\n"
-    "\n"
-    "  --help       shows this\n"
-    "  --version    shows the version\n"
-    "\n"
-    "“fixwell” does the same in a terminal.\n";
+class UsageTexts {
+public:
+    std::string usage() const
+    {
+        return contract::format(text("Usage: %@"), {"orvane [IMAGE…]"}) + "\n" +
+               text(
+                   "Opens the window for checking and repairing disks, with these disk images in "
+                   "its list.") +
+               "\n" + text("A device, a mount point, LABEL=… or UUID=… selects that disk.") +
+               "\n\n  --help       " + text("Show this help") + "\n  --version    " +
+               text("Show the version") + "\n\n" + text("“fixwell” does the same in a terminal.") +
+               "\n";
+    }
+    std::string unknown(std::string_view option) const
+    {
+        return "orvane: " +
+               contract::format(text("there is no option %@"), {contract::printable(option)}) +
+               "\n" + usage();
+    }
+
+private:
+    std::string text(std::string_view key) const { return texts_.translate("Orvane", key); }
+
+    const Catalogue texts_{hostBundleDirectory(runningExecutable()) / "locale"};
+};
 
 /// What is left of the command line when Qt has taken its own options.
 struct CommandLine {
@@ -49,13 +71,13 @@ CommandLine readCommandLine(int argc, char** argv)
         } else if (argument == "--") {
             takesOptions = false;
         } else if (argument == "--help" || argument == "-h") {
-            std::fputs(usage, stdout);
+            std::fputs(UsageTexts().usage().c_str(), stdout);
             return {{}, 0};
         } else if (argument == "--version") {
             std::puts(("orvane " + std::string(programVersion())).c_str());
             return {{}, 0};
         } else {
-            std::fprintf(stderr, "orvane: there is no option %s\n%s", argv[i], usage);
+            std::fputs(UsageTexts().unknown(argument).c_str(), stderr);
             return {{}, exitWrongUsage};
         }
     }
