@@ -43,8 +43,7 @@ public:
     }
     std::string unknown(std::string_view option) const
     {
-        return "orvane: " +
-               contract::format(text("there is no option %@"), {contract::printable(option)}) +
+        return contract::format(text("There is no option “%@”."), {contract::printable(option)}) +
                "\n" + usage();
     }
 
