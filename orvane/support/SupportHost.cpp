@@ -50,6 +50,7 @@ SupportHost::SupportHost(SupportOptions options, EventLoop& loop)
 {
     if (options_.historyCompleted)
         histories_.loadGradually([this] { loadHistoriesLater(); });
+    histories_.askForDevices([this](const std::string& uuid) { return devicesWith(uuid); });
     connectDisks();
 }
 
@@ -84,6 +85,17 @@ Result<void, Failure> SupportHost::start(DiskAction action, const Disk& disk)
                                   warn(failure);
                           });
     return {};
+}
+
+std::vector<std::string> SupportHost::devicesWith(const std::string& uuid) const
+{
+    std::vector<std::string> devices;
+    for (const auto& root : disks_.roots())
+        for (const auto& disk : withParts(root))
+            if (disk->facts().uuid == uuid &&
+                disk->facts().storage == contract::DiskReference::Storage::BlockDevice)
+                devices.push_back(disk->facts().identifier);
+    return devices;
 }
 
 void SupportHost::loadHistoriesLater()

@@ -84,6 +84,7 @@ private:
     void warn(const std::string& sentence);
     void connectDisks();
     Result<void, Failure> start(DiskAction action, const Disk& disk);
+    std::vector<std::string> devicesWith(const std::string& uuid) const;
     void loadHistoriesLater();
     void loadHistories();
 

@@ -432,6 +432,15 @@ TEST_F(HistoryTest, CopiesOfAVolumeAreNotMixed)
     DiskFacts copy = image;
     copy.identifier = "/b.img#1";
     EXPECT_NE(DiskHistories(mine).keyOf(image), DiskHistories(mine).keyOf(copy));
+
+    DiskHistories others(mine);
+    others.askForDevices([](const std::string&) {
+        return std::vector<std::string>{"/dev/sda1", "/dev/sdb1"};
+    });
+    image.uuid = "u";
+    EXPECT_NE(others.keyOf(image), key);
+    EXPECT_NE(others.keyOf(device("/dev/sdb1", "u")), key) << "it is there though nobody asked";
+    EXPECT_EQ(others.keyOf(device("/dev/sda1", "u")), key);
 }
 
 TEST_F(HistoryTest, ALongOneComesInTwoStepsAndTakesNewRecordsInBetween)

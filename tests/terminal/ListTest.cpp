@@ -143,5 +143,21 @@ TEST_F(DiskActionTest, AnImageIsAttachedMountedAndDetached)
     EXPECT_EQ(run({"verify", image}).status, 0);
 }
 
+TEST_F(DiskActionTest, ACopyOfADiskHasItsOwnVerdict)
+{
+    const auto image = makeDamagedVolume("disk.img");
+    std::filesystem::copy_file(image, path("copy.img"));
+    const LoopDevice disk(image);
+    const LoopDevice copy(path("copy.img"));
+    EXPECT_EQ(run({"verify", copy.name()}).status, 4);
+    for (const std::vector<std::string>& asked :
+         {std::vector{disk.name(), copy.name()}, {copy.name(), disk.name()}}) {
+        std::vector<std::string> arguments{"list", "--json"};
+        arguments.insert(arguments.end(), asked.begin(), asked.end());
+        for (const auto& one : Events(run(arguments).output).named("disk"))
+            EXPECT_EQ(one["lastChecked"].is_null(), one["disk"] == disk.name()) << one;
+    }
+}
+
 }  // namespace
 }  // namespace orvane::test

@@ -60,8 +60,15 @@ std::optional<Run> runBegunAt(const std::vector<RunStarts::Start>& starts, std::
 
 std::string DiskHistories::keyOf(const DiskFacts& disk)
 {
-    const auto& owner = identifiersOfUUIDs_.emplace(disk.uuid, disk.identifier).first->second;
-    return historyKeyOf(disk, owner != disk.identifier);
+    if (disk.storage == contract::DiskReference::Storage::FileRegion)
+        return historyKeyOf(disk, true);
+    auto owner = identifiersOfUUIDs_.find(disk.uuid);
+    if (owner == identifiersOfUUIDs_.end()) {
+        const auto devices = devices_ ? devices_(disk.uuid) : std::vector<std::string>();
+        const std::string& first = devices.empty() ? disk.identifier : devices.front();
+        owner = identifiersOfUUIDs_.emplace(disk.uuid, first).first;
+    }
+    return historyKeyOf(disk, owner->second != disk.identifier);
 }
 
 DiskHistories::History& DiskHistories::find(const DiskFacts& disk)

@@ -112,6 +112,12 @@ public:
     /// The lists are others now.
     void restoreCleared();
 
+    /// The identifiers of the devices that are there with a UUID, in an order that every program
+    /// gives them.
+    using Devices = std::function<std::vector<std::string>(const std::string& uuid)>;
+    /// Who can tell it, so that copies of a device are told apart alike by every program, whichever
+    /// of them it is asked about.
+    void askForDevices(Devices devices) { devices_ = std::move(devices); }
     /// What the disk's runs and records are filed under; the same for as long as the program runs.
     std::string keyOf(const DiskFacts& disk);
 
@@ -163,7 +169,8 @@ private:
     std::string lastKey_;  ///< where `runOf` found something last
     std::size_t lastPlace_ = 0;
     std::map<std::string, History> histories_;               ///< by key
-    std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first disk that had it
+    std::map<std::string, std::string> identifiersOfUUIDs_;  ///< of the first device that has it
+    Devices devices_;
     std::function<void()> isIncomplete_;
     std::int64_t newestRecords_ = recordsAtOnce;
     bool remembersCleared_ = false;
