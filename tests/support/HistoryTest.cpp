@@ -114,6 +114,12 @@ TEST_F(HistoryTest, RecordsComeBackAsTheyWere)
     ASSERT_TRUE(open().append("v", history, 0));
     HistoryStore reopened = open();
     EXPECT_EQ(exactly(loaded(reopened, "v")), exactly(history));
+
+    RecordTimes ofALongerList;
+    ofALongerList.add(7, {});
+    ofALongerList.add(9, RecordTimes::Time(std::chrono::seconds(1)));
+    ASSERT_TRUE(reopened.append("shorter", lines(0, 3), 0, ofALongerList));
+    EXPECT_EQ(loaded(reopened, "shorter").size(), 3U);
     struct stat status = {};
     ASSERT_EQ(::stat(file_.c_str(), &status), 0);
     EXPECT_EQ(status.st_mode & 0777U, 0600U);

@@ -141,7 +141,8 @@ bool RecordTable::append(std::int64_t volume, const contract::Array& history, st
     for (std::size_t i = firstNew; i < history.size();) {
         for (; next != times.stretches.end() && next->first <= i; ++next)
             time = milliseconds(next->time);
-        const std::size_t end = next != times.stretches.end() ? next->first : history.size();
+        const std::size_t end =
+            next != times.stretches.end() ? std::min(next->first, history.size()) : history.size();
         const std::span together = std::span(history.values()).subspan(i, end - i);
         const std::size_t count = recordsOfFirstPage(together);
         if (!insert(id, together.first(count), time))
